@@ -1,0 +1,211 @@
+#include "HostCli.h"
+
+#include "Application.h"
+#include "ConsoleUserInterface.h"
+#include "DrawingFiles.h"
+#include "HostDocument.h"
+#include "drawing/Database.h"
+#include "sdk/LispInterface.h"
+
+#include <QFileInfo>
+
+#include <unistd.h>
+
+namespace zvhost {
+
+namespace {
+
+const Subcommand kSubcommands[] = {
+    {"lisp", "lisp [FILE.lsp]   run a LISP file, or an interactive LISP prompt",
+     runLispSubcommand},
+};
+
+const char* const kUsage =
+    "usage: zvhost [options] DRAWING [COMMAND ...]\n"
+    "       zvhost SUBCOMMAND [ARGS ...]\n"
+    "\n"
+    "Opens DRAWING as the active document (a path that does not exist starts a new, empty\n"
+    "drawing that will carry that name), loads the ZVListas module, and runs each COMMAND\n"
+    "by name as a user typing it. The drawing is saved only when asked to.\n"
+    "\n"
+    "options:\n"
+    "  -o, --output FILE     save the drawing to FILE after the commands (atomically)\n"
+    "  --in-place            save the drawing over DRAWING after the commands\n"
+    "  --load FILE.lsp       load a LISP file into the document (repeatable, in order)\n"
+    "  --eval EXPR           evaluate a LISP expression in the document (repeatable,\n"
+    "                        after the --load files)\n"
+    "  --answer NAME=VALUE   a scripted answer to a question, picker or file dialog\n"
+    "                        (repeatable); e.g. template=lists/bornes.grt,\n"
+    "                        question:89=yes, strips=X1,X2, prompt:Client=ACME.\n"
+    "                        A question without an answer gets what a cancelling user\n"
+    "                        would give, and a line on stderr names the missing answer\n"
+    "  --quiet               no progress bar\n"
+    "  --module FILE         load this module instead of the ZVListas module beside zvhost\n"
+    "  --no-module           load no module\n"
+    "  --commands            list the commands of the document and exit\n"
+    "  -h, --help            this text\n"
+    "\n"
+    "exit status: 0 on success; 1 when the drawing can't be read or saved (nothing is\n"
+    "overwritten) or a module can't be loaded; 2 for a usage error or an unknown command.\n";
+
+struct Options {
+    QString drawing;
+    QStringList commands;
+    QString output;
+    bool inPlace = false;
+    QStringList loads;
+    QStringList evals;
+    QStringList answers;
+    bool quiet = false;
+    QString module;
+    bool noModule = false;
+    bool listCommands = false;
+};
+
+void printHelp(QTextStream& out) {
+    out << kUsage << "\nsubcommands:\n";
+    for (const Subcommand& sub : kSubcommands) out << "  zvhost " << sub.synopsis << "\n";
+}
+
+// Parses the options; an empty text on success, else what is wrong.
+QString parseOptions(const QStringList& args, Options& options) {
+    for (int i = 0; i < args.size(); ++i) {
+        const QString& arg = args[i];
+        auto value = [&](QString& into) {
+            if (i + 1 >= args.size()) return false;
+            into = args[++i];
+            return true;
+        };
+        QString text;
+        if (arg == "-o" || arg == "--output") {
+            if (!value(options.output)) return arg + " needs a file";
+        } else if (arg == "--in-place") {
+            options.inPlace = true;
+        } else if (arg == "--load") {
+            if (!value(text)) return "--load needs a file";
+            options.loads << text;
+        } else if (arg == "--eval") {
+            if (!value(text)) return "--eval needs an expression";
+            options.evals << text;
+        } else if (arg == "--answer") {
+            if (!value(text) || text.indexOf('=') <= 0) return "--answer needs NAME=VALUE";
+            options.answers << text;
+        } else if (arg == "--quiet") {
+            options.quiet = true;
+        } else if (arg == "--module") {
+            if (!value(options.module)) return "--module needs a file";
+        } else if (arg == "--no-module") {
+            options.noModule = true;
+        } else if (arg == "--commands") {
+            options.listCommands = true;
+        } else if (arg.startsWith('-') && arg.size() > 1) {
+            return "unknown option " + arg;
+        } else if (options.drawing.isEmpty()) {
+            options.drawing = arg;
+        } else {
+            options.commands << arg;
+        }
+    }
+    if (options.drawing.isEmpty()) return "no drawing given";
+    if (options.inPlace && !options.output.isEmpty()) return "-o and --in-place exclude each other";
+    return {};
+}
+
+// Evaluates the --load files and --eval expressions; false when one fails.
+bool runLisp(HostDocument& document, const Options& options, QTextStream& err) {
+    if (options.loads.isEmpty() && options.evals.isEmpty()) return true;
+    zvsdk::LispInterface* lisp = document.lisp();
+    if (!lisp) {
+        err << "zvhost: LISP is not available in this build\n";
+        return false;
+    }
+    for (const QString& file : options.loads) {
+        QString quoted = QFileInfo(file).absoluteFilePath();
+        quoted.replace('\\', "\\\\").replace('"', "\\\"");
+        if (!lisp->lispEvaluate("(load \"" + quoted + "\")")) {
+            err << "zvhost: " << file << ": could not be loaded\n";
+            return false;
+        }
+    }
+    for (const QString& expression : options.evals) {
+        if (!lisp->lispEvaluate(expression)) return false;
+    }
+    return true;
+}
+
+int runDrawing(const Options& options, QTextStream& out, QTextStream& err) {
+    const bool terminal = !options.quiet && isatty(STDOUT_FILENO);
+    auto ui = std::make_unique<ConsoleUserInterface>(out, err, terminal);
+    for (const QString& answer : options.answers) ui->addAnswer(answer);
+    Application app(std::move(ui), out);
+
+    std::unique_ptr<zvdb::Database> database;
+    if (QFileInfo::exists(options.drawing)) {
+        QString error;
+        database = readDrawing(options.drawing, &error);
+        if (!database) {
+            err << "zvhost: " << error << "\n";
+            return kExitFailure;
+        }
+    }
+    HostDocument* document =
+        app.openDocument(QFileInfo(options.drawing).absoluteFilePath(), std::move(database));
+
+    if (!options.noModule) {
+        const QString module = options.module.isEmpty()
+                                   ? app.executableFolder() + "/libzvlistas.so"
+                                   : options.module;
+        QString error;
+        if (!app.loadModule(module, &error)) {
+            err << "zvhost: cannot load module: " << error << "\n";
+            return kExitFailure;
+        }
+    }
+    if (options.listCommands) {
+        for (const QString& name : document->commandNames()) out << name << "\n";
+        return kExitOk;
+    }
+    if (!runLisp(*document, options, err)) return kExitFailure;
+    for (const QString& command : options.commands) {
+        if (!document->execute(command)) {
+            err << "zvhost: unknown command: " << command << "\n";
+            return kExitUsage;
+        }
+    }
+    const QString target = options.inPlace ? options.drawing : options.output;
+    if (target.isEmpty()) return kExitOk;
+    QString error;
+    if (!writeDrawing(*document->database(), target, &error)) {
+        err << "zvhost: cannot save: " << error << "\n";
+        return kExitFailure;
+    }
+    return kExitOk;
+}
+
+}  // namespace
+
+int runHost(const QStringList& args, QTextStream& out, QTextStream& err, QTextStream& in) {
+    if (args.isEmpty()) {
+        err << kUsage;
+        return kExitUsage;
+    }
+    if (args.contains("-h") || args.contains("--help")) {
+        printHelp(out);
+        return kExitOk;
+    }
+    for (const Subcommand& sub : kSubcommands) {
+        if (args.first() == QLatin1String(sub.name)) {
+            CliContext context{args.mid(1), out, err, in};
+            return sub.run(context);
+        }
+    }
+    Options options;
+    const QString problem = parseOptions(args, options);
+    if (!problem.isEmpty()) {
+        err << "zvhost: " << problem << "\n" << kUsage;
+        return kExitUsage;
+    }
+    return runDrawing(options, out, err);
+}
+
+}  // namespace zvhost

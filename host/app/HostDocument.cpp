@@ -1,0 +1,58 @@
+#include "HostDocument.h"
+
+#include "Application.h"
+#include "drawing/Database.h"
+#include "sdk/LispInterface.h"
+#include "sdk/UserInterface.h"
+
+namespace zvhost {
+
+HostDocument::HostDocument(Application& app, const QString& fileName,
+                           std::unique_ptr<zvdb::Database> database)
+    : app_(app), fileName_(fileName), database_(std::move(database)) {}
+
+HostDocument::~HostDocument() = default;
+
+void HostDocument::addCommand(const QString& name, zvsdk::CommandHandler handler) {
+    commands_.insert(name.toUpper(), std::move(handler));
+}
+
+void HostDocument::removeCommand(const QString& name) { commands_.remove(name.toUpper()); }
+
+bool HostDocument::hasCommand(const QString& name) const {
+    return commands_.contains(name.toUpper());
+}
+
+QStringList HostDocument::commandNames() const {
+    QStringList names = commands_.keys();
+    names.sort();
+    return names;
+}
+
+bool HostDocument::execute(const QString& name) {
+    auto it = commands_.constFind(name.toUpper());
+    if (it == commands_.constEnd()) return app_.runHostCommand(*this, {name});
+    zvsdk::CommandHandler handler = it.value();  // the handler may remove commands
+    handler();
+    return true;
+}
+
+bool HostDocument::runCommand(const QStringList& tokens) {
+    return app_.runHostCommand(*this, tokens);
+}
+
+void HostDocument::printMessage(const QString& text) { app_.commandLine(text); }
+
+void HostDocument::setLisp(std::unique_ptr<zvsdk::LispInterface> lisp) {
+    lisp_ = std::move(lisp);
+}
+
+int HostDocument::pickEntity(const QString& prompt, zvsdk::EntityName* picked) {
+    // Picking on screen needs a view; the command-line host has none to pick from.
+    std::optional<QString> answer = app_.userInterface()->answer("pick", prompt);
+    Q_UNUSED(answer);
+    if (picked) *picked = {};
+    return zvsdk::RTCAN;
+}
+
+}  // namespace zvhost

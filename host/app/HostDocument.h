@@ -1,0 +1,48 @@
+#pragma once
+// One open drawing of the host: its commands, command line, LISP environment and database.
+#include "sdk/Document.h"
+
+#include <QHash>
+
+#include <memory>
+
+namespace zvhost {
+
+class Application;
+
+class HostDocument : public zvsdk::Document {
+public:
+    HostDocument(Application& app, const QString& fileName,
+                 std::unique_ptr<zvdb::Database> database);
+    ~HostDocument() override;
+
+    QString fileName() const override { return fileName_; }
+    void setFileName(const QString& fileName) { fileName_ = fileName; }
+    zvdb::Database* database() override { return database_.get(); }
+
+    void addCommand(const QString& name, zvsdk::CommandHandler handler) override;
+    void removeCommand(const QString& name) override;
+    bool hasCommand(const QString& name) const override;
+    QStringList commandNames() const;
+    void startCommand() override { ++commandsStarted_; }
+    int commandsStarted() const { return commandsStarted_; }
+    bool runCommand(const QStringList& tokens) override;
+    // Runs a command by name as a user typing it; false when no such command exists.
+    bool execute(const QString& name);
+
+    void printMessage(const QString& text) override;
+    zvsdk::LispInterface* lisp() override { return lisp_.get(); }
+    void setLisp(std::unique_ptr<zvsdk::LispInterface> lisp);
+    int pickEntity(const QString& prompt, zvsdk::EntityName* picked) override;
+
+private:
+    Application& app_;
+    QString fileName_;
+    std::unique_ptr<zvdb::Database> database_;
+    std::unique_ptr<zvsdk::LispInterface> lisp_;
+    // Command names compare without regard to case, as users type them.
+    QHash<QString, zvsdk::CommandHandler> commands_;
+    int commandsStarted_ = 0;
+};
+
+}  // namespace zvhost

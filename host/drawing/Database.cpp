@@ -1,0 +1,8 @@
+#include "Database.h"
+
+namespace zvdb {
+
+Database::Database() = default;
+Database::~Database() = default;
+
+}  // namespace zvdb

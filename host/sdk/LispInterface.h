@@ -1,0 +1,22 @@
+#pragma once
+// The document's LISP interface, as a module sees it.
+#include "ResultBuffer.h"
+
+namespace zvsdk {
+
+class LispInterface {
+public:
+    virtual ~LispInterface() = default;
+    // RTNORM and a new chain (the caller frees it), or RTERROR when the symbol is unbound.
+    virtual int lispGetSymbol(const QString& name, ResultBuffer** value) = 0;
+    // The host copies the chain; the caller keeps its own. A null chain sets nil.
+    virtual int lispPutSymbol(const QString& name, const ResultBuffer* value) = 0;
+    // Calls the function named by the first node with the rest as arguments. The result
+    // chain belongs to the caller; null when the call failed or answered nothing.
+    virtual ResultBuffer* lispInvoke(const ResultBuffer* call) = 0;
+    // Evaluates LISP text in the document; a failure is printed on the command line.
+    virtual bool lispEvaluate(const QString& text) = 0;
+    virtual void releaseResultBuffer(ResultBuffer* chain) { releaseChain(chain); }
+};
+
+}  // namespace zvsdk

@@ -1,0 +1,34 @@
+#pragma once
+// What the host shows a user: message boxes, questions, file dialogs, pickers, progress.
+// The command-line host answers from scripted answers; a desktop host shows windows.
+#include <QString>
+#include <QStringList>
+
+#include <optional>
+
+namespace zvsdk {
+
+class UserInterface {
+public:
+    virtual ~UserInterface() = default;
+    virtual void messageBox(const QString& text, const QString& title) = 0;
+    // A yes/no question; `name` is how a script answers it (e.g. "question:89").
+    virtual bool askYesNo(const QString& name, const QString& text, bool cancelAnswer) = 0;
+    // A file dialog. `filter` is in the host's "Desc ( *.ext );;" form. `name` says what
+    // is asked ("template", "export"...). Empty text when the user cancels.
+    virtual QString fileDialog(const QString& name, bool open, const QString& filter,
+                               const QString& startPath, const QString& title) = 0;
+    // A free answer by name (pickers, prompts); nothing when the user cancels.
+    virtual std::optional<QString> answer(const QString& name, const QString& prompt) = 0;
+
+    // The progress surface: one bar and one line of text (the title until a text is set).
+    virtual void showProgress(const QString& title) = 0;
+    virtual void setProgress(int percent, const QString& line) = 0;
+    virtual void closeProgress() = 0;
+    // Lets the host handle at most `maxEvents` pending window events.
+    virtual void processEvents(int maxEvents) = 0;
+    // The main window's enable call.
+    virtual void enableMainWindow(bool enable) = 0;
+};
+
+}  // namespace zvsdk

@@ -1,0 +1,54 @@
+#include "CETemplateLisp.h"
+
+#include "cad/CICad.h"
+#include "readers/CEItemLista.h"
+
+#include <QRegularExpression>
+
+bool CETemplateLisp::Carregar() {
+    zvsdk::ResultBuffer* resultado = CICad::zvInvokeLista("ZVCarregaTemplate", {Caminho()});
+    const bool carregou = resultado && resultado->restype == zvsdk::RTT;
+    CICad::LiberaLista(resultado);
+    return carregou;
+}
+
+int CETemplateLisp::LerInteiro(const QString& simbolo) { return CICad::GetIntLisp(simbolo, 0); }
+
+double CETemplateLisp::LerReal(const QString& simbolo) { return CICad::GetRealLisp(simbolo, 0.0); }
+
+QString CETemplateLisp::LerTexto(const QString& simbolo) {
+    return CICad::GetStringLisp(simbolo, QString());
+}
+
+QStringList CETemplateLisp::LerListaTexto(const QString& simbolo) {
+    return CICad::GetListaLisp(simbolo);
+}
+
+bool CETemplateLisp::LerLogico(const QString& simbolo) { return CICad::GetBoolLisp(simbolo); }
+
+void CETemplateLisp::LerPonto(const QString& simbolo, double& x, double& y) {
+    const QStringList partes = LerTexto(simbolo).split(',');
+    x = TextoParaReal(partes.value(0));
+    y = TextoParaReal(partes.value(1));
+}
+
+bool CETemplateLisp::FiltraItem(const CEItemLista& item) {
+    const QString filtro = LerTexto("*FILTRO_TEMPLATE*").trimmed();
+    if (filtro.isEmpty()) return true;
+    item.paraLisp();
+    CICad::AvaliaLisp("(progn (setq INVOKELISP_LISTAS_TMP " + filtro + " ) (princ))");
+    zvsdk::ResultBuffer* valor = CICad::LeSimboloLisp("INVOKELISP_LISTAS_TMP");
+    CEItemLista::limparLisp();
+    // Anything but nil passes, 0 and "" too.
+    const bool passa = valor && valor->restype != zvsdk::RTNIL && valor->restype != zvsdk::RTNONE;
+    CICad::LiberaLista(valor);
+    return passa;
+}
+
+double CETemplateLisp::TextoParaReal(const QString& texto) {
+    // Whatever the locale, the decimal mark of a template is the point.
+    static const QRegularExpression numero(
+        QStringLiteral("^[+-]?(\\d+\\.?\\d*|\\.\\d+)([eE][+-]?\\d+)?"));
+    const QRegularExpressionMatch m = numero.match(texto.trimmed());
+    return m.hasMatch() ? m.captured(0).toDouble() : 0.0;
+}

@@ -1,0 +1,62 @@
+#include "CCDriverLista.h"
+
+#include "cad/CICad.h"
+
+namespace {
+
+// Message printed where a list or export is not part of this build yet.
+constexpr int kMensagemIndisponivel = 900;
+
+struct Driver {
+    const char* simboloUsarPadrao;  // null: always ask
+    const char* simboloNomePadrao;
+    const char* tipoArquivo;
+    const char* extensao;
+};
+
+Driver DriverDe(TipoLista tipo) {
+    switch (tipo) {
+        case TipoLista::Bornes:
+            return {"*USAR_DEF_LISTA_BORNES*", "*DEF_LISTA_BORNES*", "ZV Terminal Table Template",
+                    "grt"};
+        case TipoLista::BornesDesenho:
+            return {"*USAR_DEF_LISTA_BOR_DES*", "*DEF_LISTA_BOR_DES*",
+                    "ZV Terminal Drawing Template", "grx"};
+        case TipoLista::Fios:
+            return {"*USAR_DEF_LISTA_FIOS*", "*DEF_LISTA_FIOS*", "ZV Wire Table Template", "grw"};
+        case TipoLista::Materiais:
+            return {"*USAR_DEF_LISTA_MATERIAL*", "*DEF_LISTA_MATERIAL*",
+                    "ZV Material Table Template", "grf"};
+        case TipoLista::Cabos:
+            return {"*USAR_DEF_LISTA_CABOS*", "*DEF_LISTA_CABOS*", "ZV Cable Table Template",
+                    "grc"};
+        case TipoLista::DiagramaTopografico:
+            break;
+    }
+    return {nullptr, nullptr, "ZV Diagram Template", "dtp"};
+}
+
+}  // namespace
+
+QString CCDriverLista::EscolherModelo(TipoLista tipo) {
+    const Driver driver = DriverDe(tipo);
+    const QString pasta = CICad::GetStringLisp("*DIR_ZVCFG_TEMPL*");
+    // The folder symbol carries its own closing separator: nothing goes in between.
+    if (driver.simboloUsarPadrao && CICad::GetBoolLisp(driver.simboloUsarPadrao))
+        return pasta + CICad::GetStringLisp(driver.simboloNomePadrao);
+    const QString extensao = driver.extensao;
+    const QString filtro = QString(driver.tipoArquivo) + "|*." + extensao;
+    return CICad::DialogoArquivo(true, filtro, pasta, driver.tipoArquivo, "template");
+}
+
+void CCDriverLista::Executar(TipoLista tipo) {
+    const QString caminho = EscolherModelo(tipo);
+    if (caminho.isEmpty()) return;
+    // The readers and writers of the lists join the drivers here as they are built.
+    CICad::ImprimeMensagem(kMensagemIndisponivel);
+}
+
+void CCDriverLista::Exporta(const QString& tipo) {
+    Q_UNUSED(tipo);
+    CICad::ImprimeMensagem(kMensagemIndisponivel);
+}

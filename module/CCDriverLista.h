@@ -1,0 +1,16 @@
+#pragma once
+// The drivers of the list commands: each picks a template, composes its reader and writer
+// and runs the pipeline.
+#include <QString>
+
+enum class TipoLista { Bornes, BornesDesenho, Fios, Materiais, Cabos, DiagramaTopografico };
+
+class CCDriverLista {
+public:
+    // The template path of a list: the default when its flag is set, else the user's pick;
+    // empty when there is none.
+    static QString EscolherModelo(TipoLista tipo);
+    static void Executar(TipoLista tipo);
+    // The export driver, by its type word.
+    static void Exporta(const QString& tipo);
+};

@@ -1,0 +1,53 @@
+#include "CIProgress.h"
+
+#include "host/sdk/SystemServices.h"
+#include "host/sdk/UserInterface.h"
+
+#include <QThread>
+
+namespace {
+
+constexpr qint64 kAbreSozinhaMs = 2000;
+constexpr qint64 kTempoMinimoMs = 3000;
+constexpr int kEsperaMs = 50;
+constexpr int kEventosPorPasso = 100;
+
+zvsdk::UserInterface* Interface() {
+    zvsdk::SystemServices* servicos = zvsdk::systemServices();
+    return servicos ? servicos->userInterface() : nullptr;
+}
+
+}  // namespace
+
+CIProgress::CIProgress(const QString& titulo) : titulo_(titulo) { criacao_.start(); }
+
+CIProgress::~CIProgress() {
+    if (aberta_) Fechar();
+}
+
+void CIProgress::Mostrar() {
+    if (aberta_) return;
+    aberta_ = true;
+    if (zvsdk::UserInterface* ui = Interface()) ui->showProgress(titulo_);
+}
+
+void CIProgress::Definir(int percentual, const QString& texto) {
+    percentual_ = percentual;
+    if (!aberta_) {
+        if (criacao_.elapsed() > kAbreSozinhaMs) Mostrar();
+        return;
+    }
+    zvsdk::UserInterface* ui = Interface();
+    if (!ui) return;
+    ui->setProgress(percentual, texto.isEmpty() ? titulo_ : titulo_ + " ( " + texto + " )");
+    ui->processEvents(kEventosPorPasso);
+}
+
+void CIProgress::Fechar() {
+    zvsdk::UserInterface* ui = Interface();
+    if (ui) ui->processEvents(kEventosPorPasso);
+    if (!aberta_) return;
+    if (criacao_.elapsed() < kTempoMinimoMs) QThread::msleep(kEsperaMs);
+    aberta_ = false;
+    if (ui) ui->closeProgress();
+}

@@ -1,0 +1,30 @@
+#pragma once
+// The progress surface of a run: a bar from 0 to 100 and one line of text. A new one is
+// silent; it opens when asked, or by itself when a run passes two seconds.
+#include <QElapsedTimer>
+#include <QString>
+
+class CIProgress {
+public:
+    explicit CIProgress(const QString& titulo = QStringLiteral("ZVListas"));
+    ~CIProgress();
+    CIProgress(const CIProgress&) = delete;
+    CIProgress& operator=(const CIProgress&) = delete;
+
+    void Mostrar();
+    // Stores the percent; an open window shows "title ( text )" and lets the host handle
+    // at most 100 pending events.
+    void Definir(int percentual, const QString& texto = QString());
+    // Pumps pending events and closes; a window open less than three seconds after its
+    // creation waits 50 ms once, so a fast run does not just flicker.
+    void Fechar();
+
+    int Percentual() const { return percentual_; }
+    bool Aberta() const { return aberta_; }
+
+private:
+    QString titulo_;
+    QElapsedTimer criacao_;
+    int percentual_ = 0;
+    bool aberta_ = false;
+};

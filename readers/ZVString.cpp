@@ -1,0 +1,76 @@
+#include "ZVString.h"
+
+#include <cstdio>
+
+QStringList ZVString::Divide(const QString& separadores) const {
+    QStringList tokens;
+    int inicio = -1;
+    for (int i = 0; i <= size(); ++i) {
+        const bool separa = i == size() || separadores.contains(at(i));
+        if (separa && inicio >= 0) {
+            tokens << mid(inicio, i - inicio);
+            inicio = -1;
+        } else if (!separa && inicio < 0) {
+            inicio = i;
+        }
+    }
+    return tokens;
+}
+
+bool ZVString::DivideEmDois(const QString& separadores, QString& primeiro,
+                            QString& segundo) const {
+    const QStringList tokens = Divide(separadores);
+    if (tokens.size() != 1 && tokens.size() != 2) return false;
+    primeiro = tokens[0];
+    segundo = tokens.size() == 2 ? tokens[1] : QString();
+    return true;
+}
+
+bool ZVString::DivideEmTres(const QString& separadores, QString& primeiro, QString& segundo,
+                            QString& terceiro) const {
+    const QStringList tokens = Divide(separadores);
+    if (tokens.size() != 3) return false;
+    primeiro = tokens[0];
+    segundo = tokens[1];
+    terceiro = tokens[2];
+    return true;
+}
+
+ZVString ZVString::DeReal(double valor, int precisao) {
+    char buffer[512];
+    if (precisao >= 0)
+        std::snprintf(buffer, sizeof buffer, "%.*f", precisao, valor);
+    else
+        std::snprintf(buffer, sizeof buffer, "%f", valor);
+    return ZVString(QString::fromLatin1(buffer));
+}
+
+ZVString ZVString::DeHandle(std::uint64_t handle) {
+    return ZVString(QString::number(qulonglong(handle), 16).toUpper());
+}
+
+std::uint64_t ZVString::ParaHandle() const {
+    bool ok = false;
+    const qulonglong handle = toULongLong(&ok, 16);
+    return ok ? handle : 0;
+}
+
+QString ZVString::FormaNatural(const QString& texto) {
+    constexpr int kLargura = 10;
+    QString natural;
+    natural.reserve(texto.size() + kLargura);
+    const QChar* p = texto.constData();
+    const QChar* fim = p + texto.size();
+    while (p < fim) {
+        const QChar* inicio = p;
+        while (p < fim && p->unicode() >= '0' && p->unicode() <= '9') ++p;
+        const int digitos = int(p - inicio);
+        if (digitos == 0) {
+            natural += *p++;
+            continue;
+        }
+        if (digitos < kLargura) natural += QString(kLargura - digitos, '0');
+        natural.append(inicio, digitos);
+    }
+    return natural;
+}
