@@ -42,11 +42,14 @@ void GravaSimbolo(const QString& nome, const ResultBuffer* valor,
 ResultBuffer* Chamada(const QString& funcao, const QStringList& args) {
     ResultBuffer* cabeca = zvsdk::newString(funcao);
     ResultBuffer* cauda = cabeca;
-    for (const QString& arg : args.mid(0, 9)) cauda = cauda->rbnext = zvsdk::newString(arg);
+    for (const QString& arg : args.mid(0, 9))
+        cauda = cauda->rbnext = zvsdk::newString(arg);
     return cabeca;
 }
 
-QString DoisDigitos(int valor) { return QString::number(valor).rightJustified(2, '0'); }
+QString DoisDigitos(int valor) {
+    return QString::number(valor).rightJustified(2, '0');
+}
 
 }  // namespace
 
@@ -73,13 +76,15 @@ void CICad::Log(const QString& linha) {
     const QTime hora = agora.time();
     const QString texto = DoisDigitos(dia.day()) + "/" + DoisDigitos(dia.month()) + "/" +
                           DoisDigitos(dia.year() % 100) + " " + DoisDigitos(hora.hour()) + ":" +
-                          DoisDigitos(hora.minute()) + ":" + DoisDigitos(hora.second()) +
-                          " - PID" + QString::number(getpid()) + " - " + linha + "\n";
+                          DoisDigitos(hora.minute()) + ":" + DoisDigitos(hora.second()) + " - PID" +
+                          QString::number(getpid()) + " - " + linha + "\n";
     arquivo.write(texto.toUtf8());
     arquivo.flush();
 }
 
-ResultBuffer* CICad::LeSimboloLisp(const QString& nome) { return LeSimbolo(nome); }
+ResultBuffer* CICad::LeSimboloLisp(const QString& nome) {
+    return LeSimbolo(nome);
+}
 
 QString CICad::GetStringLisp(const QString& nome, const QString& padrao) {
     ResultBuffer* valor = LeSimbolo(nome);
@@ -115,7 +120,9 @@ bool CICad::GetBoolLisp(const QString& nome, zvsdk::Document* documento) {
     return resultado;
 }
 
-bool CICad::GetBoolLisp(const QString& nome) { return GetBoolLisp(nome, zvsdk::activeDocument()); }
+bool CICad::GetBoolLisp(const QString& nome) {
+    return GetBoolLisp(nome, zvsdk::activeDocument());
+}
 
 QStringList CICad::GetListaLisp(const QString& nome) {
     ResultBuffer* valor = LeSimbolo(nome);
@@ -153,7 +160,8 @@ void CICad::SetRealLisp(const QString& nome, double valor) {
 void CICad::SetListaLisp(const QString& nome, const QStringList& lista) {
     ResultBuffer* cabeca = zvsdk::newNode(zvsdk::RTLB);
     ResultBuffer* cauda = cabeca;
-    for (const QString& texto : lista) cauda = cauda->rbnext = zvsdk::newString(texto);
+    for (const QString& texto : lista)
+        cauda = cauda->rbnext = zvsdk::newString(texto);
     cauda->rbnext = zvsdk::newNode(zvsdk::RTLE);
     GravaSimbolo(nome, cabeca);
     zvsdk::releaseChain(cabeca);
@@ -168,7 +176,9 @@ ResultBuffer* CICad::InvokeChain(const ResultBuffer* chamada) {
     return lisp ? lisp->lispInvoke(chamada) : nullptr;
 }
 
-void CICad::LiberaLista(ResultBuffer* lista) { zvsdk::releaseChain(lista); }
+void CICad::LiberaLista(ResultBuffer* lista) {
+    zvsdk::releaseChain(lista);
+}
 
 ResultBuffer* CICad::zvInvokeLista(const QString& funcao, const QStringList& args) {
     if (!zvsdk::activeDocument()) return nullptr;
@@ -212,7 +222,8 @@ bool CICad::AvaliaLisp(const QString& texto) {
 }
 
 const ResultBuffer* CICad::NoDaLista(const ResultBuffer* lista, int posicao) {
-    for (; lista && posicao > 0; --posicao) lista = lista->rbnext;
+    for (; lista && posicao > 0; --posicao)
+        lista = lista->rbnext;
     return posicao == 0 ? lista : nullptr;
 }
 

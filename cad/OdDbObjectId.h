@@ -27,7 +27,6 @@ private:
 template <>
 struct std::hash<OdDbObjectId> {
     size_t operator()(const OdDbObjectId& id) const noexcept {
-        return std::hash<std::uint64_t>()(id.handle()) ^
-               std::hash<const void*>()(id.database());
+        return std::hash<std::uint64_t>()(id.handle()) ^ std::hash<const void*>()(id.database());
     }
 };

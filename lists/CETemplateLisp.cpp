@@ -12,9 +12,13 @@ bool CETemplateLisp::Carregar() {
     return carregou;
 }
 
-int CETemplateLisp::LerInteiro(const QString& simbolo) { return CICad::GetIntLisp(simbolo, 0); }
+int CETemplateLisp::LerInteiro(const QString& simbolo) {
+    return CICad::GetIntLisp(simbolo, 0);
+}
 
-double CETemplateLisp::LerReal(const QString& simbolo) { return CICad::GetRealLisp(simbolo, 0.0); }
+double CETemplateLisp::LerReal(const QString& simbolo) {
+    return CICad::GetRealLisp(simbolo, 0.0);
+}
 
 QString CETemplateLisp::LerTexto(const QString& simbolo) {
     return CICad::GetStringLisp(simbolo, QString());
@@ -24,7 +28,9 @@ QStringList CETemplateLisp::LerListaTexto(const QString& simbolo) {
     return CICad::GetListaLisp(simbolo);
 }
 
-bool CETemplateLisp::LerLogico(const QString& simbolo) { return CICad::GetBoolLisp(simbolo); }
+bool CETemplateLisp::LerLogico(const QString& simbolo) {
+    return CICad::GetBoolLisp(simbolo);
+}
 
 void CETemplateLisp::LerPonto(const QString& simbolo, double& x, double& y) {
     const QStringList partes = LerTexto(simbolo).split(',');

@@ -54,10 +54,12 @@ void CCEntryPoint::documentToBeDestroyed(zvsdk::Document* documento) {
 
 void CCEntryPoint::AdicionarComandos(zvsdk::Document* documento) {
     if (!documento) return;
-    for (const QString& nome : ordem_) documento->addCommand(nome, tabela_.value(nome));
+    for (const QString& nome : ordem_)
+        documento->addCommand(nome, tabela_.value(nome));
 }
 
 void CCEntryPoint::RemoverComandos(zvsdk::Document* documento) {
     if (!documento) return;
-    for (const QString& nome : ordem_) documento->removeCommand(nome);
+    for (const QString& nome : ordem_)
+        documento->removeCommand(nome);
 }

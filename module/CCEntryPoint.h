@@ -1,8 +1,8 @@
 #pragma once
 // Reusable plug-in base: keeps a command table and puts its commands on every open
 // document and on every later one.
-#include "host/sdk/DocumentManager.h"
 #include "host/sdk/Document.h"
+#include "host/sdk/DocumentManager.h"
 #include "host/sdk/RxModule.h"
 
 #include <QHash>

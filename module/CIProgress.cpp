@@ -19,7 +19,9 @@ zvsdk::UserInterface* Interface() {
 
 }  // namespace
 
-CIProgress::CIProgress(const QString& titulo) : titulo_(titulo) { criacao_.start(); }
+CIProgress::CIProgress(const QString& titulo) : titulo_(titulo) {
+    criacao_.start();
+}
 
 CIProgress::~CIProgress() {
     if (aberta_) Fechar();

@@ -6,7 +6,9 @@ namespace {
 CZVListasApp* instancia = nullptr;
 }
 
-CZVListasApp* CZVListasApp::Instancia() { return instancia; }
+CZVListasApp* CZVListasApp::Instancia() {
+    return instancia;
+}
 
 CZVListasApp* CZVListasApp::CriarInstancia() {
     if (!instancia) instancia = new CZVListasApp;

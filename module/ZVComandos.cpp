@@ -14,9 +14,12 @@ enum class Preflight { Listas, Diagrama, Exportacao };
 
 bool RodarPreflight(Preflight tipo) {
     switch (tipo) {
-        case Preflight::Listas: return ZVPreflight::PreflightListas(false);
-        case Preflight::Diagrama: return ZVPreflight::PreflightListas(true);
-        case Preflight::Exportacao: return ZVPreflight::PreflightExportacao();
+        case Preflight::Listas:
+            return ZVPreflight::PreflightListas(false);
+        case Preflight::Diagrama:
+            return ZVPreflight::PreflightListas(true);
+        case Preflight::Exportacao:
+            return ZVPreflight::PreflightExportacao();
     }
     return false;
 }
@@ -46,17 +49,39 @@ int Exporta(const char* tipo) {
 
 namespace ZVComandos {
 
-int GerarListaBornesGrf() { return Lista(TipoLista::Bornes); }
-int GerarListaBornesDwg() { return Lista(TipoLista::BornesDesenho); }
-int GerarListaFiosGrf() { return Lista(TipoLista::Fios); }
-int GerarListaMateriaisGrf() { return Lista(TipoLista::Materiais); }
-int GerarListaCabosGrf() { return Lista(TipoLista::Cabos); }
-int Exportacao() { return Exporta(""); }
-int ExportacaoFios() { return Exporta("FIOS"); }
-int ExportacaoAnilhas() { return Exporta("ANILHAS"); }
-int ExportacaoBornes() { return Exporta("BORNES"); }
-int ExportacaoMateriais() { return Exporta("TUDO"); }
-int ExportacaoCabos() { return Exporta("CABOS"); }
+int GerarListaBornesGrf() {
+    return Lista(TipoLista::Bornes);
+}
+int GerarListaBornesDwg() {
+    return Lista(TipoLista::BornesDesenho);
+}
+int GerarListaFiosGrf() {
+    return Lista(TipoLista::Fios);
+}
+int GerarListaMateriaisGrf() {
+    return Lista(TipoLista::Materiais);
+}
+int GerarListaCabosGrf() {
+    return Lista(TipoLista::Cabos);
+}
+int Exportacao() {
+    return Exporta("");
+}
+int ExportacaoFios() {
+    return Exporta("FIOS");
+}
+int ExportacaoAnilhas() {
+    return Exporta("ANILHAS");
+}
+int ExportacaoBornes() {
+    return Exporta("BORNES");
+}
+int ExportacaoMateriais() {
+    return Exporta("TUDO");
+}
+int ExportacaoCabos() {
+    return Exporta("CABOS");
+}
 
 int DiagramaTopografico() {
     return RodarComando(Preflight::Diagrama,

@@ -29,7 +29,9 @@ bool PreflightListas(bool diagrama) {
     return Preflight("PBLBLNRUNONLSTS", diagrama ? 328 : 326);
 }
 
-bool PreflightExportacao() { return Preflight("PBLBLNRUNONEXPORT", 327); }
+bool PreflightExportacao() {
+    return Preflight("PBLBLNRUNONEXPORT", 327);
+}
 
 void Bracket(int abrir) {
     // The page state is saved and restored here once the facade has pages to show.

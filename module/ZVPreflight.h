@@ -8,7 +8,11 @@ bool PreflightListas(bool diagrama);
 bool PreflightExportacao();
 // 1 opens the bracket (all pages hidden), 0 closes it (the user's page shown again).
 void Bracket(int abrir);
-inline void AbrirBracket() { Bracket(1); }
-inline void FecharBracket() { Bracket(0); }
+inline void AbrirBracket() {
+    Bracket(1);
+}
+inline void FecharBracket() {
+    Bracket(0);
+}
 
 }  // namespace ZVPreflight

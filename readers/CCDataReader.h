@@ -21,6 +21,7 @@ public:
     virtual void LerLadoFim(CEItemLista& item, const OdDbObjectId& id) = 0;
     // The items of a database, of all pages or only those named; null when there is nothing.
     // The caller owns the vector and its items.
-    virtual VetorItens* LerDados(zvdb::Database* database, const std::optional<QStringList>& paginas,
-                                 CETemplate& modelo, CIProgress& progresso) = 0;
+    virtual VetorItens* LerDados(zvdb::Database* database,
+                                 const std::optional<QStringList>& paginas, CETemplate& modelo,
+                                 CIProgress& progresso) = 0;
 };

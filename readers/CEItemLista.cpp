@@ -47,10 +47,13 @@ void CEItemLista::paraLisp() const {
     zvsdk::releaseChain(ename);
 }
 
-void CEItemLista::limparLisp() { CICad::SetNilLisp("reg"); }
+void CEItemLista::limparLisp() {
+    CICad::SetNilLisp("reg");
+}
 
 QString CEItemLista::textoCampos() const {
     QString texto;
-    for (auto it = campos.constBegin(); it != campos.constEnd(); ++it) texto += it.key() + ' ';
+    for (auto it = campos.constBegin(); it != campos.constEnd(); ++it)
+        texto += it.key() + ' ';
     return texto;
 }

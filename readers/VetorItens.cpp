@@ -46,8 +46,8 @@ int VetorItens::compararItens(const CEItemLista* a, const CEItemLista* b,
     for (const QString& campo : campos) {
         const QString va = Campo(a, campo);
         const QString vb = Campo(b, campo);
-        const int c = CompararChaves({ZVString::FormaNatural(va), va},
-                                     {ZVString::FormaNatural(vb), vb});
+        const int c =
+            CompararChaves({ZVString::FormaNatural(va), va}, {ZVString::FormaNatural(vb), vb});
         if (c != 0) return c;
     }
     return 0;
@@ -64,7 +64,8 @@ void VetorItens::ordenar(const QStringList& campos) {
             chaves[i * k + c] = {ZVString::FormaNatural(valor), std::move(valor)};
         }
     std::vector<size_t> ordem(size());
-    for (size_t i = 0; i < ordem.size(); ++i) ordem[i] = i;
+    for (size_t i = 0; i < ordem.size(); ++i)
+        ordem[i] = i;
     std::sort(ordem.begin(), ordem.end(), [&](size_t a, size_t b) {
         for (size_t c = 0; c < k; ++c)
             if (const int r = CompararChaves(chaves[a * k + c], chaves[b * k + c]); r != 0)
@@ -72,11 +73,14 @@ void VetorItens::ordenar(const QStringList& campos) {
         return false;
     });
     std::vector<CEItemLista*> ordenado(size());
-    for (size_t i = 0; i < ordem.size(); ++i) ordenado[i] = (*this)[ordem[i]];
+    for (size_t i = 0; i < ordem.size(); ++i)
+        ordenado[i] = (*this)[ordem[i]];
     std::copy(ordenado.begin(), ordenado.end(), begin());
 }
 
-void VetorItens::inverter() { std::reverse(begin(), end()); }
+void VetorItens::inverter() {
+    std::reverse(begin(), end());
+}
 
 VetorItens VetorItens::filtrar(const std::vector<std::pair<QString, QString>>& pares) const {
     VetorItens resultado;
@@ -90,6 +94,7 @@ VetorItens VetorItens::filtrar(const std::vector<std::pair<QString, QString>>& p
 }
 
 void VetorItens::destruirItens() {
-    for (CEItemLista* item : *this) delete item;
+    for (CEItemLista* item : *this)
+        delete item;
     clear();
 }

@@ -17,8 +17,7 @@ QStringList ZVString::Divide(const QString& separadores) const {
     return tokens;
 }
 
-bool ZVString::DivideEmDois(const QString& separadores, QString& primeiro,
-                            QString& segundo) const {
+bool ZVString::DivideEmDois(const QString& separadores, QString& primeiro, QString& segundo) const {
     const QStringList tokens = Divide(separadores);
     if (tokens.size() != 1 && tokens.size() != 2) return false;
     primeiro = tokens[0];
@@ -63,7 +62,8 @@ QString ZVString::FormaNatural(const QString& texto) {
     const QChar* fim = p + texto.size();
     while (p < fim) {
         const QChar* inicio = p;
-        while (p < fim && p->unicode() >= '0' && p->unicode() <= '9') ++p;
+        while (p < fim && p->unicode() >= '0' && p->unicode() <= '9')
+            ++p;
         const int digitos = int(p - inicio);
         if (digitos == 0) {
             natural += *p++;

@@ -23,11 +23,14 @@ Application::Application(std::unique_ptr<zvsdk::UserInterface> ui, QTextStream& 
 
 Application::~Application() {
     unloadModules();
-    while (!documents_.empty()) closeDocument(documents_.back().get());
+    while (!documents_.empty())
+        closeDocument(documents_.back().get());
     if (theApplication == this) theApplication = nullptr;
 }
 
-Application* Application::instance() { return theApplication; }
+Application* Application::instance() {
+    return theApplication;
+}
 
 QString Application::executableFolder() const {
     if (!executableFolder_.isEmpty()) return executableFolder_;
@@ -39,7 +42,9 @@ zvsdk::Document* Application::document(int index) const {
     return documents_[size_t(index)].get();
 }
 
-zvsdk::Document* Application::activeDocument() const { return active_; }
+zvsdk::Document* Application::activeDocument() const {
+    return active_;
+}
 
 void Application::addReactor(zvsdk::DocumentManagerReactor* reactor) {
     if (std::find(reactors_.begin(), reactors_.end(), reactor) == reactors_.end())
@@ -48,6 +53,10 @@ void Application::addReactor(zvsdk::DocumentManagerReactor* reactor) {
 
 void Application::removeReactor(zvsdk::DocumentManagerReactor* reactor) {
     reactors_.erase(std::remove(reactors_.begin(), reactors_.end(), reactor), reactors_.end());
+}
+
+HostDocument* Application::openDocument(const QString& fileName) {
+    return openDocument(fileName, nullptr);
 }
 
 HostDocument* Application::openDocument(const QString& fileName,
@@ -59,14 +68,16 @@ HostDocument* Application::openDocument(const QString& fileName,
     if (documentSetup_) documentSetup_(*document);
     // A reactor may remove itself while it is told: walk a copy.
     const auto reactors = reactors_;
-    for (auto* reactor : reactors) reactor->documentCreated(document);
+    for (auto* reactor : reactors)
+        reactor->documentCreated(document);
     setActiveDocument(document);
     return document;
 }
 
 void Application::closeDocument(HostDocument* document) {
     const auto reactors = reactors_;
-    for (auto* reactor : reactors) reactor->documentToBeDestroyed(document);
+    for (auto* reactor : reactors)
+        reactor->documentToBeDestroyed(document);
     auto it = std::find_if(documents_.begin(), documents_.end(),
                            [document](const auto& d) { return d.get() == document; });
     if (it == documents_.end()) return;
@@ -79,7 +90,8 @@ void Application::setActiveDocument(HostDocument* document) {
     active_ = document;
     if (!document) return;
     const auto reactors = reactors_;
-    for (auto* reactor : reactors) reactor->documentActivated(document);
+    for (auto* reactor : reactors)
+        reactor->documentActivated(document);
 }
 
 bool Application::loadModule(const QString& path, QString* error) {
@@ -105,7 +117,8 @@ bool Application::runHostCommand(HostDocument& document, const QStringList& toke
     if (tokens.isEmpty()) return false;
     // "_." and "_" only say: the command's global, built-in name.
     QString name = tokens.first().toUpper();
-    while (name.startsWith('_') || name.startsWith('.')) name.remove(0, 1);
+    while (name.startsWith('_') || name.startsWith('.'))
+        name.remove(0, 1);
     auto it = hostCommands_.constFind(name);
     if (it == hostCommands_.constEnd()) return false;
     return it.value()(document, tokens.mid(1));
@@ -124,7 +137,9 @@ void Application::commandLine(const QString& text) {
 
 namespace zvsdk {
 
-SystemServices* systemServices() { return zvhost::Application::instance(); }
+SystemServices* systemServices() {
+    return zvhost::Application::instance();
+}
 
 Document* activeDocument() {
     auto* app = zvhost::Application::instance();

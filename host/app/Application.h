@@ -42,8 +42,8 @@ public:
     void removeReactor(zvsdk::DocumentManagerReactor* reactor) override;
 
     // Opens a document on a database (a new, empty one when null); it becomes active.
-    HostDocument* openDocument(const QString& fileName,
-                               std::unique_ptr<zvdb::Database> database = nullptr);
+    HostDocument* openDocument(const QString& fileName, std::unique_ptr<zvdb::Database> database);
+    HostDocument* openDocument(const QString& fileName);
     void closeDocument(HostDocument* document);
     void setActiveDocument(HostDocument* document);
     HostDocument* hostDocument(int index) const { return documents_.at(size_t(index)).get(); }

@@ -71,16 +71,19 @@ void ConsoleUserInterface::showProgress(const QString& title) {
     progressTitle_ = title;
     progressPercent_ = 0;
     progressText_.clear();
+    if (progressLog_) err_ << "progress: open " << title << "\n";
     drawProgress();
 }
 
 void ConsoleUserInterface::setProgress(int percent, const QString& text) {
     progressPercent_ = qBound(0, percent, 100);
     progressText_ = text;
+    if (progressLog_) err_ << "progress: " << progressPercent_ << "% " << text << "\n";
     if (progressOpen_) drawProgress();
 }
 
 void ConsoleUserInterface::closeProgress() {
+    if (progressLog_ && progressOpen_) err_ << "progress: close\n";
     if (progressOpen_ && progressOnTerminal_) {
         // Wipe the bar so the command line goes on in a clean line.
         out_ << "\r\033[2K";

@@ -32,6 +32,8 @@ public:
     void processEvents(int maxEvents) override;
     void enableMainWindow(bool enable) override { mainWindowEnabled_ = enable; }
     bool mainWindowEnabled() const { return mainWindowEnabled_; }
+    // Every progress step as a line on stderr, for logs and scripts.
+    void setProgressLog(bool on) { progressLog_ = on; }
 
 private:
     void missing(const QString& name, const QString& what);
@@ -46,6 +48,7 @@ private:
     QString progressText_;
     int progressPercent_ = 0;
     bool mainWindowEnabled_ = true;
+    bool progressLog_ = false;
 };
 
 }  // namespace zvhost

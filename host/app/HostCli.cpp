@@ -16,8 +16,7 @@ namespace zvhost {
 namespace {
 
 const Subcommand kSubcommands[] = {
-    {"lisp", "lisp [FILE.lsp]   run a LISP file, or an interactive LISP prompt",
-     runLispSubcommand},
+    {"lisp", "lisp [FILE.lsp]   run a LISP file, or an interactive LISP prompt", runLispSubcommand},
 };
 
 const char* const kUsage =
@@ -40,6 +39,7 @@ const char* const kUsage =
     "                        A question without an answer gets what a cancelling user\n"
     "                        would give, and a line on stderr names the missing answer\n"
     "  --quiet               no progress bar\n"
+    "  --progress-log        write every progress step as a line on stderr\n"
     "  --module FILE         load this module instead of the ZVListas module beside zvhost\n"
     "  --no-module           load no module\n"
     "  --commands            list the commands of the document and exit\n"
@@ -57,6 +57,7 @@ struct Options {
     QStringList evals;
     QStringList answers;
     bool quiet = false;
+    bool progressLog = false;
     QString module;
     bool noModule = false;
     bool listCommands = false;
@@ -64,7 +65,8 @@ struct Options {
 
 void printHelp(QTextStream& out) {
     out << kUsage << "\nsubcommands:\n";
-    for (const Subcommand& sub : kSubcommands) out << "  zvhost " << sub.synopsis << "\n";
+    for (const Subcommand& sub : kSubcommands)
+        out << "  zvhost " << sub.synopsis << "\n";
 }
 
 // Parses the options; an empty text on success, else what is wrong.
@@ -92,6 +94,8 @@ QString parseOptions(const QStringList& args, Options& options) {
             options.answers << text;
         } else if (arg == "--quiet") {
             options.quiet = true;
+        } else if (arg == "--progress-log") {
+            options.progressLog = true;
         } else if (arg == "--module") {
             if (!value(options.module)) return "--module needs a file";
         } else if (arg == "--no-module") {
@@ -136,7 +140,9 @@ bool runLisp(HostDocument& document, const Options& options, QTextStream& err) {
 int runDrawing(const Options& options, QTextStream& out, QTextStream& err) {
     const bool terminal = !options.quiet && isatty(STDOUT_FILENO);
     auto ui = std::make_unique<ConsoleUserInterface>(out, err, terminal);
-    for (const QString& answer : options.answers) ui->addAnswer(answer);
+    for (const QString& answer : options.answers)
+        ui->addAnswer(answer);
+    ui->setProgressLog(options.progressLog);
     Application app(std::move(ui), out);
 
     std::unique_ptr<zvdb::Database> database;
@@ -152,9 +158,8 @@ int runDrawing(const Options& options, QTextStream& out, QTextStream& err) {
         app.openDocument(QFileInfo(options.drawing).absoluteFilePath(), std::move(database));
 
     if (!options.noModule) {
-        const QString module = options.module.isEmpty()
-                                   ? app.executableFolder() + "/libzvlistas.so"
-                                   : options.module;
+        const QString module =
+            options.module.isEmpty() ? app.executableFolder() + "/libzvlistas.so" : options.module;
         QString error;
         if (!app.loadModule(module, &error)) {
             err << "zvhost: cannot load module: " << error << "\n";
@@ -162,7 +167,8 @@ int runDrawing(const Options& options, QTextStream& out, QTextStream& err) {
         }
     }
     if (options.listCommands) {
-        for (const QString& name : document->commandNames()) out << name << "\n";
+        for (const QString& name : document->commandNames())
+            out << name << "\n";
         return kExitOk;
     }
     if (!runLisp(*document, options, err)) return kExitFailure;

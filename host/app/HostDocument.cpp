@@ -14,25 +14,29 @@ HostDocument::HostDocument(Application& app, const QString& fileName,
 HostDocument::~HostDocument() = default;
 
 void HostDocument::addCommand(const QString& name, zvsdk::CommandHandler handler) {
-    commands_.insert(name.toUpper(), std::move(handler));
+    commands_.insert(name.toUpper(), {name, std::move(handler)});
 }
 
-void HostDocument::removeCommand(const QString& name) { commands_.remove(name.toUpper()); }
+void HostDocument::removeCommand(const QString& name) {
+    commands_.remove(name.toUpper());
+}
 
 bool HostDocument::hasCommand(const QString& name) const {
     return commands_.contains(name.toUpper());
 }
 
 QStringList HostDocument::commandNames() const {
-    QStringList names = commands_.keys();
-    names.sort();
+    QStringList names;
+    for (const Command& command : commands_)
+        names << command.name;
+    names.sort(Qt::CaseInsensitive);
     return names;
 }
 
 bool HostDocument::execute(const QString& name) {
     auto it = commands_.constFind(name.toUpper());
     if (it == commands_.constEnd()) return app_.runHostCommand(*this, {name});
-    zvsdk::CommandHandler handler = it.value();  // the handler may remove commands
+    zvsdk::CommandHandler handler = it.value().handler;  // it may remove commands
     handler();
     return true;
 }
@@ -41,7 +45,9 @@ bool HostDocument::runCommand(const QStringList& tokens) {
     return app_.runHostCommand(*this, tokens);
 }
 
-void HostDocument::printMessage(const QString& text) { app_.commandLine(text); }
+void HostDocument::printMessage(const QString& text) {
+    app_.commandLine(text);
+}
 
 void HostDocument::setLisp(std::unique_ptr<zvsdk::LispInterface> lisp) {
     lisp_ = std::move(lisp);

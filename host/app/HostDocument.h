@@ -40,8 +40,13 @@ private:
     QString fileName_;
     std::unique_ptr<zvdb::Database> database_;
     std::unique_ptr<zvsdk::LispInterface> lisp_;
-    // Command names compare without regard to case, as users type them.
-    QHash<QString, zvsdk::CommandHandler> commands_;
+    // Command names compare without regard to case, as users type them; the name is kept
+    // as it was registered.
+    struct Command {
+        QString name;
+        zvsdk::CommandHandler handler;
+    };
+    QHash<QString, Command> commands_;
     int commandsStarted_ = 0;
 };
 

@@ -10,7 +10,9 @@ namespace zvhost {
 
 ModuleLoader::ModuleLoader(const QString& path) : path_(path) {}
 
-ModuleLoader::~ModuleLoader() { unload(); }
+ModuleLoader::~ModuleLoader() {
+    unload();
+}
 
 bool ModuleLoader::load(QString* error) {
     const QByteArray file = QFileInfo(path_).absoluteFilePath().toLocal8Bit();
@@ -22,8 +24,9 @@ bool ModuleLoader::load(QString* error) {
     auto create = reinterpret_cast<ZvCreateModuleObject>(dlsym(handle_, "odrxCreateModuleObject"));
     auto version = reinterpret_cast<ZvGetApiVersion>(dlsym(handle_, "odrxGetAPIVersion"));
     if (!create || !version) {
-        *error = QStringLiteral("%1 is not a module: it does not export odrxCreateModuleObject "
-                                "and odrxGetAPIVersion")
+        *error = QStringLiteral(
+                     "%1 is not a module: it does not export odrxCreateModuleObject "
+                     "and odrxGetAPIVersion")
                      .arg(path_);
     } else if (version() != zvsdk::kApiVersion) {
         *error = QStringLiteral("%1 was built for host interface %2; this host has %3")

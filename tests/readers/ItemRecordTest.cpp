@@ -1,0 +1,196 @@
+// Item records, their fields, the natural ordering and the vector operations.
+#include "readers/CEItemLista.h"
+#include "readers/VetorItens.h"
+#include "readers/ZVString.h"
+
+#include "QtPrinters.h"
+
+#include <gtest/gtest.h>
+
+#include <memory>
+
+namespace {
+
+// Items owned by the test; the vectors only point at them.
+class Itens {
+public:
+    CEItemLista* novo(std::initializer_list<std::pair<const char*, const char*>> campos) {
+        auto item = std::make_unique<CEItemLista>();
+        for (const auto& [k, v] : campos)
+            item->definirCampo(k, v);
+        donos_.push_back(std::move(item));
+        return donos_.back().get();
+    }
+
+private:
+    std::vector<std::unique_ptr<CEItemLista>> donos_;
+};
+
+QStringList Valores(const VetorItens& v, const QString& campo) {
+    QStringList valores;
+    for (const CEItemLista* item : v)
+        valores << item->valorCampo(campo);
+    return valores;
+}
+
+TEST(ZVStringTest, SplitTreatsSeparatorsAsASetAndDropsEmptyTokens) {
+    EXPECT_EQ(ZVString("$$ESQ$0001$$A$").Divide("$"), QStringList({"ESQ", "0001", "A"}));
+    EXPECT_EQ(ZVString("a;b,c").Divide(",;"), QStringList({"a", "b", "c"}));
+    EXPECT_TRUE(ZVString(";;;").Divide(";").isEmpty());
+}
+
+TEST(ZVStringTest, SplitInTwoAndThreeLeaveOutputsAloneOnTheWrongCount) {
+    QString a = "old-a", b = "old-b", c = "old-c";
+    EXPECT_TRUE(ZVString("KEY").DivideEmDois("\f", a, b));
+    EXPECT_EQ(a, "KEY");
+    EXPECT_EQ(b, "");
+    a = "old-a", b = "old-b";
+    EXPECT_FALSE(ZVString("x\fy\fz").DivideEmDois("\f", a, b));
+    EXPECT_EQ(a, "old-a");
+    EXPECT_EQ(b, "old-b");
+    EXPECT_FALSE(ZVString("x\fy").DivideEmTres("\f", a, b, c));
+    EXPECT_EQ(c, "old-c");
+    EXPECT_TRUE(ZVString("x\fy\fz").DivideEmTres("\f", a, b, c));
+    EXPECT_EQ(QStringList({a, b, c}), QStringList({"x", "y", "z"}));
+}
+
+TEST(ZVStringTest, PrefixNumbersAndHandles) {
+    EXPECT_TRUE(ZVString("BORNE_X").ComecaCom("BORNE"));
+    EXPECT_FALSE(ZVString("BOR").ComecaCom("BORNE"));
+    EXPECT_FALSE(ZVString("borne").ComecaCom("BORNE"));
+    EXPECT_EQ(ZVString::DeReal(2.5), "2.500000");
+    EXPECT_EQ(ZVString::DeReal(2.456, 2), "2.46");
+    EXPECT_EQ(ZVString::DeReal(7.0, 0), "7");
+    EXPECT_EQ(ZVString::DeHandle(0x2AF), "2AF");
+    EXPECT_EQ(ZVString("2af").ParaHandle(), 0x2AFu);
+    EXPECT_EQ(ZVString("xyz").ParaHandle(), 0u);
+}
+
+TEST(ZVStringTest, NaturalFormPadsShortDigitRunsOnly) {
+    EXPECT_EQ(ZVString::FormaNatural("X2"), "X0000000002");
+    EXPECT_EQ(ZVString::FormaNatural("A10B7"), "A0000000010B0000000007");
+    EXPECT_EQ(ZVString::FormaNatural("123456789012"), "123456789012");
+    EXPECT_EQ(ZVString::FormaNatural("0123456789"), "0123456789");
+    EXPECT_EQ(ZVString::FormaNatural(""), "");
+}
+
+TEST(ItemRecordTest, FieldAccessDistinguishesEmptyFromAbsent) {
+    CEItemLista item;
+    item.definirCampo("REGUA", "");
+    QString valor = "unchanged";
+    EXPECT_TRUE(item.obterCampo("REGUA", valor));
+    EXPECT_EQ(valor, "");
+    valor = "unchanged";
+    EXPECT_FALSE(item.obterCampo("NUMERO", valor));
+    EXPECT_EQ(valor, "unchanged");
+    EXPECT_FALSE(obterCampo(nullptr, "REGUA", valor));
+    EXPECT_EQ(item.valorCampo("NUMERO"), "");
+    item.definirCampoInteiro("QTD", -3);
+    item.definirCampoReal("LENGTH", 1.25, 1);
+    EXPECT_EQ(item.valorCampo("QTD"), "-3");
+    EXPECT_EQ(item.valorCampo("LENGTH"), "1.2");
+}
+
+TEST(ItemRecordTest, CopiesOverwriteAndSuffixGetsItsUnderscore) {
+    CEItemLista origem, destino;
+    origem.definirCampo("TAG", "K1");
+    origem.definirCampo("LAYER", "ESQ$1$A");
+    destino.definirCampo("TAG", "old");
+    destino.copiarCampos(origem);
+    EXPECT_EQ(destino.valorCampo("TAG"), "K1");
+    destino.copiarCamposComSufixo(origem, "FIM");
+    EXPECT_EQ(destino.valorCampo("TAG_FIM"), "K1");
+    EXPECT_EQ(destino.valorCampo("LAYER_FIM"), "ESQ$1$A");
+    EXPECT_FALSE(destino.temCampo("TAG__FIM"));
+    CEItemLista semSufixo;
+    semSufixo.copiarCamposComSufixo(origem, "");
+    EXPECT_EQ(semSufixo.valorCampo("TAG"), "K1");
+    EXPECT_EQ(semSufixo.campos.size(), 2);
+    const QString nomes = destino.textoCampos();
+    EXPECT_EQ(nomes.count(' '), destino.campos.size());
+    EXPECT_TRUE(nomes.contains("TAG_FIM "));
+}
+
+TEST(OrderingTest, NumbersSortNaturallyAndLeadingZerosTieOnRawText) {
+    Itens itens;
+    VetorItens v{itens.novo({{"N", "10"}}), itens.novo({{"N", "2"}}), itens.novo({{"N", "1"}}),
+                 itens.novo({{"N", "01"}}), itens.novo({{"N", "X"}})};
+    v.ordenar({"N"});
+    EXPECT_EQ(Valores(v, "N"), QStringList({"01", "1", "2", "10", "X"}));
+}
+
+TEST(OrderingTest, LongDigitRunsSortByTheirCodeUnits) {
+    Itens itens;
+    // Twelve digits stay unpadded: "9" padded to "0000000009" sorts before them, and the
+    // two long runs compare as text.
+    VetorItens v{itens.novo({{"N", "200000000000"}}), itens.novo({{"N", "9"}}),
+                 itens.novo({{"N", "100000000000"}})};
+    v.ordenar({"N"});
+    EXPECT_EQ(Valores(v, "N"), QStringList({"9", "100000000000", "200000000000"}));
+}
+
+TEST(OrderingTest, LaterKeysDecideOnlyTiesAndAbsentFieldsAreEmpty) {
+    Itens itens;
+    VetorItens v{itens.novo({{"R", "X2"}, {"N", "1"}}), itens.novo({{"R", "X10"}, {"N", "1"}}),
+                 itens.novo({{"R", "X2"}, {"N", "0"}}), itens.novo({{"N", "5"}})};
+    v.ordenar({"R", "N"});
+    EXPECT_EQ(Valores(v, "R"), QStringList({"", "X2", "X2", "X10"}));
+    EXPECT_EQ(Valores(v, "N"), QStringList({"5", "0", "1", "1"}));
+    // A field that neither item has does not decide.
+    EXPECT_EQ(VetorItens::compararItens(v[1], v[1], {"MISSING"}), 0);
+    EXPECT_LT(VetorItens::compararItens(v[1], v[2], {"MISSING", "N"}), 0);
+}
+
+TEST(OrderingTest, CaseAndCodeUnitsDecideBeforeAnythingElse) {
+    Itens itens;
+    VetorItens v{itens.novo({{"T", "b"}}), itens.novo({{"T", "B"}}), itens.novo({{"T", "a"}}),
+                 itens.novo({{"T", QString::fromUtf8("Á").toUtf8().constData()}})};
+    v.ordenar({"T"});
+    EXPECT_EQ(Valores(v, "T"), QStringList({"B", "a", "b", QString::fromUtf8("Á")}));
+}
+
+TEST(VectorTest, MergeKeepsPointersOnceInOrder) {
+    Itens itens;
+    CEItemLista* a = itens.novo({{"N", "a"}});
+    CEItemLista* b = itens.novo({{"N", "b"}});
+    CEItemLista* c = itens.novo({{"N", "a"}});  // same content as a, another item
+    VetorItens destino{a};
+    VetorItens origem{b, a, c, b};
+    destino.juntarSemRepetir(origem);
+    EXPECT_EQ(destino, VetorItens({a, b, c}));
+    destino.juntarSemRepetir(origem);
+    EXPECT_EQ(destino, VetorItens({a, b, c}));
+}
+
+TEST(VectorTest, InsertRemoveReverse) {
+    Itens itens;
+    CEItemLista* a = itens.novo({});
+    CEItemLista* b = itens.novo({});
+    CEItemLista* c = itens.novo({});
+    CEItemLista* d = itens.novo({});
+    VetorItens v{a, d};
+    v.inserirVariosEm(VetorItens{b, c}, 1);
+    EXPECT_EQ(v, VetorItens({a, c, b, d}));
+    v.removerEm(1);
+    EXPECT_EQ(v, VetorItens({a, b, d}));
+    v.removerEm(9);
+    EXPECT_EQ(v.size(), 3u);
+    v.inserirEm(c, 0);
+    EXPECT_EQ(v, VetorItens({c, a, b, d}));
+    v.inverter();
+    EXPECT_EQ(v, VetorItens({d, b, a, c}));
+}
+
+TEST(VectorTest, FilterSharesItemsAndKeepsOrder) {
+    Itens itens;
+    CEItemLista* x1a = itens.novo({{"REGUA", "X1"}, {"LADO", "A"}});
+    CEItemLista* x2 = itens.novo({{"REGUA", "X2"}, {"LADO", "A"}});
+    CEItemLista* x1b = itens.novo({{"REGUA", "X1"}, {"LADO", "B"}});
+    CEItemLista* x1a2 = itens.novo({{"REGUA", "X1"}, {"LADO", "A"}});
+    VetorItens v{x1a, nullptr, x2, x1b, x1a2};
+    EXPECT_EQ(v.filtrar({{"REGUA", "X1"}}), VetorItens({x1a, x1b, x1a2}));
+    EXPECT_EQ(v.filtrar({{"REGUA", "X1"}, {"LADO", "A"}}), VetorItens({x1a, x1a2}));
+    EXPECT_TRUE(v.filtrar({{"REGUA", "X9"}}).empty());
+}
+
+}  // namespace
