@@ -18,10 +18,16 @@ std::mutex& Trava() {
 
 const char* const kArquivo = "FV/FVREG2022SP0.xml";
 
-QDomDocument Carrega() {
+// The whole file, parsed; `ilegivel` tells a file that holds something but doesn't parse.
+QDomDocument Carrega(bool* ilegivel = nullptr) {
     QDomDocument documento;
     QFile arquivo(CIRegistro::ArquivoRegistro());
-    if (arquivo.open(QIODevice::ReadOnly)) documento.setContent(&arquivo);
+    bool falhou = false;
+    if (arquivo.open(QIODevice::ReadOnly))
+        falhou = !documento.setContent(&arquivo) && arquivo.size() > 0;
+    else
+        falhou = arquivo.exists();
+    if (ilegivel) *ilegivel = falhou;
     return documento;
 }
 
@@ -74,7 +80,10 @@ QString CIRegistro::LerRegistro(const QString& chave) {
 
 void CIRegistro::GravarRegistro(const QString& chave, const QString& valor) {
     std::lock_guard<std::mutex> guarda(Trava());
-    QDomDocument documento = Carrega();
+    bool ilegivel = false;
+    QDomDocument documento = Carrega(&ilegivel);
+    // The other modules' keys live in the same file: one we can't read is never replaced.
+    if (ilegivel) return;
     if (documento.documentElement().isNull())
         documento.appendChild(documento.createElement("registros"));
     QDomElement e = Registro(documento, chave);
@@ -102,7 +111,8 @@ QString CIRegistro::DBPass() {
 
 void CIRegistro::SetDBPass(const QString& senha) {
     QByteArray bytes;
-    for (QChar c : Transforma(senha)) bytes.append(char(c.unicode() >> 8)).append(char(c.unicode()));
+    for (QChar c : Transforma(senha))
+        bytes.append(char(c.unicode() >> 8)).append(char(c.unicode()));
     GravarRegistro("DBPass", QString::fromLatin1(bytes.toHex()));
 }
 
@@ -111,7 +121,8 @@ int CIRegistro::IdiomaMenuSel() {
     const QString texto = LerRegistro("IdiomaMenuSel").trimmed();
     int fim = 0;
     if (fim < texto.size() && (texto[fim] == '-' || texto[fim] == '+')) ++fim;
-    while (fim < texto.size() && texto[fim].isDigit()) ++fim;
+    while (fim < texto.size() && texto[fim] >= '0' && texto[fim] <= '9')
+        ++fim;
     return texto.left(fim).toInt();
 }
 
