@@ -1,8 +1,38 @@
 #include "CEConexaoCatalogo.h"
 
+#include "CEAtualizacaoCatalogo.h"
+#include "cad/CICad.h"
+#include "settings/CIMensagens.h"
+
+#include <QFileInfo>
+#include <QVariant>
+#include <QtSql/QSqlError>
+#include <QtSql/QSqlField>
+#include <QtSql/QSqlQuery>
+#include <QtSql/QSqlRecord>
+
 namespace {
+
 CEConexaoCatalogo* conexao = nullptr;
+
+// How long a failed opening keeps the engine alone, in milliseconds.
+const qint64 kPausaAposFalha = 10000;
+// Messages of section ZVLISTAS.
+const int kMsgSemMotorLocal = 950;
+const int kMsgSemDriver = 951;
+
+QString TextoDe(const QVariant& valor) {
+    if (valor.isNull()) return {};
+    if (valor.type() == QVariant::Bool) return valor.toBool() ? "1" : "0";
+    if (valor.type() == QVariant::Double) return QString::number(valor.toDouble(), 'g', 15);
+    return valor.toString();
 }
+
+QString DescricaoErro(const QSqlError& erro) {
+    return erro.databaseText().isEmpty() ? erro.driverText() : erro.databaseText();
+}
+
+}  // namespace
 
 CEConexaoCatalogo* CEConexaoCatalogo::ObterCatalogo() {
     if (!conexao) conexao = new CEConexaoCatalogo;
@@ -14,4 +44,141 @@ void CEConexaoCatalogo::LiberarCatalogo() {
     conexao = nullptr;
 }
 
-bool CEConexaoCatalogo::Existe() { return conexao != nullptr; }
+bool CEConexaoCatalogo::Existe() {
+    return conexao != nullptr;
+}
+
+CEConexaoCatalogo::CEConexaoCatalogo()
+    : nome_(QString("zvcatalogo-%1").arg(quintptr(this), 0, 16)) {}
+
+CEConexaoCatalogo::~CEConexaoCatalogo() {
+    Fechar();
+}
+
+QString CEConexaoCatalogo::InstrucaoCortada(const QString& instrucao) {
+    return instrucao.size() >= 51 ? instrucao.left(47) + "..." : instrucao;
+}
+
+CERegistrosCatalogo CEConexaoCatalogo::Consultar(const QString& instrucao, bool atualizar,
+                                                 bool mostrar) {
+    if (!Conectar()) return {};
+    CERegistrosCatalogo registros = Rodar(instrucao);
+    if (registros.Executada()) return registros;
+    if (atualizar) {
+        // A failing statement is how an old catalogue shows: upgrade it and try once more.
+        CEAtualizacaoCatalogo(*this).Executar();
+        return Consultar(instrucao, false, true);
+    }
+    if (mostrar) CICad::MessageBox("SQL ERROR: " + erro_ + "\n \n " + InstrucaoCortada(instrucao));
+    return {};
+}
+
+bool CEConexaoCatalogo::Executar(const QString& instrucao) {
+    if (!Conectar()) return false;
+    if (Rodar(instrucao).Executada()) return true;
+    CICad::Log("Catalogue statement failed: " + erro_ + " - " + instrucao);
+    return false;
+}
+
+bool CEConexaoCatalogo::Conectar() {
+    if (banco_.isOpen()) return true;
+    if (falhaAbertura_.isValid() && !falhaAbertura_.hasExpired(kPausaAposFalha)) return false;
+    dialeto_ = CEDialetoCatalogo::DaConfiguracao();
+    if (dialeto_.motor() == CEDialetoCatalogo::LocalDb) return AvisoLocalDb();
+    const CEDialetoCatalogo::Ligacao ligacao = dialeto_.LigacaoDaConfiguracao();
+    texto_ = ligacao.texto;
+    if (ligacao.driver.isEmpty()) return false;
+    // A catalogue file that isn't there opens nothing and says nothing.
+    const bool arquivo =
+        dialeto_.motor() == CEDialetoCatalogo::Sqlite || dialeto_.motor() == CEDialetoCatalogo::Mdb;
+    if (arquivo && !QFileInfo(ligacao.arquivo).isFile()) return false;
+    if (!QSqlDatabase::isDriverAvailable(ligacao.driver)) {
+        CICad::MessageBox(CIMensagens::Mensagem("ZVLISTAS", kMsgSemDriver) + "\n" + ligacao.driver);
+        falhaAbertura_.start();
+        return false;
+    }
+    return Abrir(ligacao);
+}
+
+bool CEConexaoCatalogo::AvisoLocalDb() {
+    if (!avisouLocalDb_) CICad::ImprimeMensagem(kMsgSemMotorLocal);
+    avisouLocalDb_ = true;
+    return false;
+}
+
+bool CEConexaoCatalogo::Abrir(const CEDialetoCatalogo::Ligacao& ligacao) {
+    banco_ = QSqlDatabase::addDatabase(ligacao.driver, nome_);
+    banco_.setDatabaseName(ligacao.texto);
+    // Access files are read-only here: upgrades that would write fail like any statement.
+    if (dialeto_.motor() == CEDialetoCatalogo::Mdb)
+        banco_.setConnectOptions("SQL_ATTR_ACCESS_MODE=SQL_MODE_READ_ONLY");
+    if (banco_.open(ligacao.usuario, ligacao.senha)) {
+        dialeto_.DefinirServidor(banco_.driver()->dbmsType());
+        CICad::Log("Catalogue opened: " + dialeto_.PalavraDoMotor(dialeto_.motor()) + " " +
+                   TextoConexao());
+        return true;
+    }
+    const QSqlError erro = banco_.lastError();
+    CICad::MessageBox("Connection Error\nCode = " + erro.nativeErrorCode() +
+                      "\nCode meaning = " + erro.driverText() + "\nSource = " + ligacao.driver +
+                      "\nDescription = " + erro.databaseText());
+    Fechar();
+    falhaAbertura_.start();
+    return false;
+}
+
+void CEConexaoCatalogo::Fechar() {
+    if (!banco_.isValid()) return;
+    banco_.close();
+    banco_ = QSqlDatabase();
+    QSqlDatabase::removeDatabase(nome_);
+}
+
+CERegistrosCatalogo CEConexaoCatalogo::Rodar(const QString& instrucao) {
+    ++enviadas_;
+    ultima_ = instrucao;
+    erro_.clear();
+    QSqlQuery consulta(banco_);
+    consulta.setForwardOnly(true);
+    if (!consulta.exec(instrucao)) {
+        erro_ = DescricaoErro(consulta.lastError());
+        return {};
+    }
+    const QSqlRecord registro = consulta.record();
+    QStringList nomes;
+    for (int i = 0; i < registro.count(); ++i)
+        nomes << dialeto_.NomeColuna(registro.fieldName(i));
+    CERegistrosCatalogo registros(nomes);
+    while (consulta.next()) {
+        QStringList valores;
+        for (int i = 0; i < nomes.size(); ++i)
+            valores << TextoDe(consulta.value(i));
+        registros.AdicionarLinha(valores);
+    }
+    return registros;
+}
+
+bool CEConexaoCatalogo::ExisteTabela(const QString& tabela) {
+    return Conectar() && Rodar("SELECT * FROM " + tabela + " WHERE 1=0").Executada();
+}
+
+bool CEConexaoCatalogo::ExisteColuna(const QString& tabela, const QString& coluna) {
+    return Conectar() && Rodar("SELECT " + coluna + " FROM " + tabela + " WHERE 1=0").Executada();
+}
+
+int CEConexaoCatalogo::LarguraColuna(const QString& tabela, const QString& coluna) {
+    if (!Conectar()) return -1;
+    const QString consulta = dialeto_.ConsultaLargura(tabela, coluna);
+    if (!consulta.isEmpty()) {
+        const QString largura = Rodar(consulta).Primeiro("CHARACTER_MAXIMUM_LENGTH");
+        if (!largura.isEmpty()) return largura.toInt();
+    }
+    // The driver's own description of the table, under the name as given or folded.
+    for (const QString& nome : {tabela, tabela.toLower()}) {
+        const QSqlRecord registro = banco_.record(nome);
+        for (int i = 0; i < registro.count(); ++i)
+            if (registro.fieldName(i).compare(coluna, Qt::CaseInsensitive) == 0)
+                return registro.field(i).length();
+    }
+    return -1;
+}

@@ -1,0 +1,141 @@
+#include "CEConsultasCatalogo.h"
+
+#include "CEConexaoCatalogo.h"
+#include "settings/CIRegistro.h"
+
+#include <QChar>
+
+const char* const CEConsultasCatalogo::kTabelaComp = "BDUSER";
+const char* const CEConsultasCatalogo::kChaveComp = "USER_KEY";
+const char* const CEConsultasCatalogo::kTabelaFio = "BDWUSER";
+const char* const CEConsultasCatalogo::kChaveFio = "WUSER_KEY";
+const char* const CEConsultasCatalogo::kTabelaCabo = "BDCUSER";
+const char* const CEConsultasCatalogo::kChaveCabo = "CUSER_KEY";
+
+namespace {
+const QChar kSeparador(0x000C);
+}
+
+CEConsultasCatalogo::CEConsultasCatalogo() : conexao_(*CEConexaoCatalogo::ObterCatalogo()) {}
+
+CEConsultasCatalogo::CEConsultasCatalogo(CEConexaoCatalogo& conexao) : conexao_(conexao) {}
+
+QString CEConsultasCatalogo::Idioma() {
+    return CIRegistro::LibLang();
+}
+
+QString CEConsultasCatalogo::Primeiro(const QString& instrucao, const QString& coluna) const {
+    return conexao_.Consultar(instrucao, true).Primeiro(coluna);
+}
+
+QString CEConsultasCatalogo::DescricaoComp(const QString& chave) const {
+    return Primeiro("select rtrim(MENU_DESCR) as MENU_DESCR from BDMENUS where MENU_KEY = '" +
+                        chave + "' AND MENU_KEY_LANG = '" + Idioma() + "'",
+                    "MENU_DESCR");
+}
+
+QString CEConsultasCatalogo::DescricaoFio(const QString& chave) const {
+    return Primeiro("select rtrim(WENU_DESCR) as WENU_DESCR from BDWENUS where WENU_KEY = '" +
+                        chave + "' AND WENU_KEY_LANG = '" + Idioma() + "'",
+                    "WENU_DESCR");
+}
+
+QString CEConsultasCatalogo::DescricaoCabo(const QString& chave) const {
+    return Primeiro("select rtrim(CENU_DESCR) as CENU_DESCR from BDCENU where CENU_KEY = '" +
+                        chave + "' AND CENU_KEY_LANG = '" + Idioma() + "'",
+                    "CENU_DESCR");
+}
+
+QString CEConsultasCatalogo::ListaComp(const QString& chave, const QString& norma) const {
+    // The tab after "and" is part of the statement as it has always been sent.
+    return Primeiro(
+        "select ZV_LISTA from BDZV where ZV_KEY='" + chave + "' and\tZV_KEY_NOR ='" + norma + "'",
+        "ZV_LISTA");
+}
+
+QString CEConsultasCatalogo::ListaFio(const QString& chave, const QString& norma) const {
+    return Primeiro("select WIRE_LISTA from BDWIRE where WIRE_KEY='" + chave +
+                        "' and WIRE_NORMA ='" + norma + "'",
+                    "WIRE_LISTA");
+}
+
+QString CEConsultasCatalogo::ListaCabo(const QString& chave, const QString& norma) const {
+    return Primeiro("select CABO_LISTA from BDCABO2 where CABO_KEY='" + chave +
+                        "' and CABO_NORMA ='" + norma + "'",
+                    "CABO_LISTA");
+}
+
+QStringList CEConsultasCatalogo::ColunasUsuario(const QString& tabela, const QString& colunaChave,
+                                                const QString& chave) const {
+    const CERegistrosCatalogo linhas = conexao_.Consultar(
+        "SELECT * FROM " + tabela + " WHERE " + colunaChave + " = '" + chave + "'", true);
+    QStringList colunas;
+    if (linhas.Vazio()) return colunas;
+    for (int i = 0; i < linhas.Colunas(); ++i)
+        colunas << linhas.NomesColunas()[i] + kSeparador + linhas.Valor(0, i);
+    return colunas;
+}
+
+QStringList CEConsultasCatalogo::ColunasComp(const QString& chave) const {
+    return ColunasUsuario(kTabelaComp, kChaveComp, chave);
+}
+
+QStringList CEConsultasCatalogo::ColunasFio(const QString& chave) const {
+    return ColunasUsuario(kTabelaFio, kChaveFio, chave);
+}
+
+QStringList CEConsultasCatalogo::ColunasCabo(const QString& chave) const {
+    return ColunasUsuario(kTabelaCabo, kChaveCabo, chave);
+}
+
+QString CEConsultasCatalogo::MaterialSap(const QString& chave) const {
+    return Primeiro("select MATSAP_MAT from BDMATSAP where MATSAP_TIPO = 'C' AND MATSAP_ZVKEY = '" +
+                        chave + "'",
+                    "MATSAP_MAT");
+}
+
+QStringList CEConsultasCatalogo::AcessoriosDe(const QString& chave) const {
+    const CERegistrosCatalogo linhas = conexao_.Consultar(
+        "select VL_KEY_B, VL_QTDE from BDVINCL where VL_KEY_A = '" + chave + "'", true);
+    QStringList acessorios;
+    for (int i = 0; i < linhas.Linhas(); ++i)
+        acessorios << linhas.Valor(i, "VL_KEY_B") + "#" + linhas.Valor(i, "VL_QTDE");
+    return acessorios;
+}
+
+QString CEConsultasCatalogo::TipoComp(const QString& chave) const {
+    return Primeiro(" select TIPO_KEY from BDTIPOCOMP where COMP_KEY='" + chave + "'", "TIPO_KEY");
+}
+
+QString CEConsultasCatalogo::BlocoRepresentacao(const QString& chave, const QString& norma,
+                                                const QString& representacao) const {
+    return Primeiro("select BLK_BLOCO from BDBLOCOS where BLK_ZV_KEY='" + chave +
+                        "' and BLK_NORMA='" + norma + "' and BLK_REP_KEY='" + representacao + "'",
+                    "BLK_BLOCO");
+}
+
+QString CEConsultasCatalogo::GrupoNome(const QString& grupo, const QString& idioma) const {
+    return Primeiro("select NAME from BDGROUP where GROUP_KEY=" + grupo + " and LANG=" + idioma,
+                    "NAME");
+}
+
+QString CEConsultasCatalogo::GrupoDescricao(const QString& grupo, const QString& idioma) const {
+    return Primeiro("select DESC_ATT from BDPAGE, BDGROUP where PAGE_KEY=PAGE and GROUP_KEY=" +
+                        grupo + " and LANG=" + idioma,
+                    "DESC_ATT");
+}
+
+QString CEConsultasCatalogo::GrupoSequencial(const QString& grupo, const QString& idioma) const {
+    return Primeiro("select REF_SEQ from BDPAGE, BDGROUP where PAGE_KEY=PAGE and GROUP_KEY=" +
+                        grupo + " and LANG=" + idioma,
+                    "REF_SEQ");
+}
+
+QString CEConsultasCatalogo::PromptCampo(const QString& campo, bool fio) const {
+    const QString prompt =
+        fio ? Primeiro("SELECT WDIC_PROMP FROM BDWDIC WHERE WDIC_FIELD='" + campo + "'",
+                       "WDIC_PROMP")
+            : Primeiro("SELECT DIC_PROMPT FROM BDDIC WHERE DIC_FIELD='" + campo + "'",
+                       "DIC_PROMPT");
+    return prompt.trimmed().isEmpty() ? campo : prompt.trimmed();
+}
