@@ -1,0 +1,392 @@
+#include "Interpreter.h"
+
+#include "Builtins.h"
+#include "LispFile.h"
+#include "Printer.h"
+#include "Reader.h"
+#include "SmallVector.h"
+
+#include <QFileInfo>
+
+namespace zvlisp {
+
+// Counts nested calls; past the limit the evaluation ends in an error, not a crash.
+class DepthGuard {
+public:
+    explicit DepthGuard(Interpreter& in) : in_(in) {
+        if (++in_.depth_ > in_.maxDepth_) {
+            --in_.depth_;
+            in_.fail("stack overflow");
+        }
+        in_.tick();
+    }
+    ~DepthGuard() { --in_.depth_; }
+
+private:
+    Interpreter& in_;
+};
+
+Interpreter::Interpreter() {
+    t_ = intern("T");
+    t_->value = Value::symbol(t_);
+    t_->assigned = true;
+    quiet_ = intern("");
+    lambda_ = intern("LAMBDA");
+    errorHandler_ = intern("*ERROR*");
+    registerBuiltins();
+}
+
+Interpreter::~Interpreter() = default;
+
+void Interpreter::registerBuiltins() {
+    registerSpecialForms(*this);
+    registerCoreBuiltins(*this);
+    registerMathBuiltins(*this);
+    registerListBuiltins(*this);
+    registerStringBuiltins(*this);
+    registerFileBuiltins(*this);
+}
+
+void Interpreter::define(const QString& name, NativeFn fn, int minArgs, int maxArgs) {
+    Symbol* symbol = intern(name);
+    symbol->value = Value::object(
+        Type::Native, new NativeFunction(symbol->name, minArgs, maxArgs, std::move(fn)));
+    symbol->assigned = true;
+}
+
+void Interpreter::defineSpecial(const QString& name, SpecialForm form) {
+    intern(name)->special = form;
+}
+
+void Interpreter::setGlobal(const QString& name, Value value) {
+    Symbol* symbol = intern(name);
+    symbol->value = std::move(value);
+    symbol->assigned = true;
+}
+
+Value Interpreter::global(const QString& name) const {
+    const Symbol* symbol = findSymbol(name);
+    return symbol ? symbol->value : Value();
+}
+
+void Interpreter::poll() {
+    if (cancel_.exchange(false, std::memory_order_relaxed) || (cancelCheck_ && cancelCheck_())) {
+        LispError error("Function cancelled");
+        error.uncatchable = true;
+        if (catchDepth_ == 0) error.handled = callErrorHandler(error.message());
+        throw error;
+    }
+}
+
+// ---- evaluation
+
+Value Interpreter::eval(const Value& form) {
+    switch (form.type()) {
+        case Type::Symbol:
+            return form.asSymbol()->value;
+        case Type::Cons:
+            return evalCall(form);
+        default:
+            return form;
+    }
+}
+
+Value Interpreter::evalBody(const Value& forms) {
+    Value result;
+    for (const Value* cell = &forms; cell->isCons(); cell = &cell->asCons()->cdr)
+        result = eval(cell->asCons()->car);
+    return result;
+}
+
+Value Interpreter::evalCall(const Value& form) {
+    DepthGuard guard(*this);
+    const Cons* cell = form.asCons();
+    Value function;
+    if (cell->car.isSymbol()) {
+        Symbol* symbol = cell->car.asSymbol();
+        if (symbol->special) return symbol->special(*this, cell->cdr);
+        function = symbol->value;
+        if (function.isNil()) fail("no function definition: " + symbol->name);
+    } else {
+        function = eval(cell->car);
+    }
+    if (!function.isFunction()) function = toFunction(function);
+    SmallVector<Value, 6> args;
+    const Value* arg = &cell->cdr;
+    for (; arg->isCons(); arg = &arg->asCons()->cdr)
+        args.push_back(eval(arg->asCons()->car));
+    if (!arg->isNil()) badType("listp", *arg);
+    return invoke(function, Args(args.data(), args.size()));
+}
+
+Value Interpreter::invoke(const Value& function, Args args) {
+    if (function.type() == Type::User)
+        return callUser(*static_cast<UserFunction*>(function.asObject()), args);
+    const auto& native = *static_cast<NativeFunction*>(function.asObject());
+    if (args.size() < native.minArgs) fail("too few arguments");
+    if (native.maxArgs != kVariadic && args.size() > native.maxArgs) fail("too many arguments");
+    return native.fn(*this, args);
+}
+
+void Interpreter::Bindings::bind(Symbol* symbol, Value value) {
+    saved_.push_back({symbol, std::move(symbol->value), symbol->assigned});
+    symbol->value = std::move(value);
+    symbol->assigned = true;
+}
+
+Interpreter::Bindings::~Bindings() {
+    for (int i = saved_.size() - 1; i >= 0; --i) {
+        Binding& saved = saved_[i];
+        saved.symbol->value = std::move(saved.value);
+        saved.symbol->assigned = saved.assigned;
+    }
+}
+
+Value Interpreter::callUser(UserFunction& function, Args args) {
+    const int count = int(function.params.size());
+    if (args.size() < count) fail("too few arguments");
+    if (args.size() > count) fail("too many arguments");
+    Bindings bindings;
+    for (int i = 0; i < count; ++i)
+        if (!function.repeated[size_t(i)]) bindings.bind(function.params[size_t(i)], args[i]);
+    for (Symbol* local : function.locals)
+        bindings.bind(local, Value());
+    return evalBody(function.body);
+}
+
+Value Interpreter::apply(const Value& function, Args args) {
+    DepthGuard guard(*this);
+    const Value resolved = function.isFunction() ? function : toFunction(function);
+    return invoke(resolved, args);
+}
+
+Value Interpreter::call(const QString& name, std::initializer_list<Value> args) {
+    return apply(Value::symbol(intern(name)), Args(args.begin(), int(args.size())));
+}
+
+Value Interpreter::makeLambda(const QString& name, const Value& params, const Value& body) {
+    auto* function = new UserFunction;
+    Value result = Value::object(Type::User, function);
+    function->name = name;
+    function->body = body;
+    bool pastSlash = false;
+    for (const Value* cell = &params; !cell->isNil(); cell = &cell->asCons()->cdr) {
+        if (!cell->isCons()) badType("listp", params);
+        Symbol* symbol = toSym(cell->asCons()->car);
+        if (symbol->name == QLatin1String("/")) {
+            pastSlash = true;
+            continue;
+        }
+        // The first occurrence of a name wins; a later one is ignored.
+        auto seen = [&](const std::vector<Symbol*>& list) {
+            return std::find(list.begin(), list.end(), symbol) != list.end();
+        };
+        const bool repeated = seen(function->params) || seen(function->locals);
+        if (!pastSlash) {
+            function->params.push_back(symbol);
+            function->repeated.push_back(repeated);
+        } else if (!repeated) {
+            function->locals.push_back(symbol);
+        }
+    }
+    return result;
+}
+
+Value Interpreter::toFunction(const Value& function) {
+    switch (function.type()) {
+        case Type::Native:
+        case Type::User:
+            return function;
+        case Type::Symbol: {
+            const Value& value = function.asSymbol()->value;
+            if (value.isFunction()) return value;
+            if (value.isCons()) return toFunction(value);
+            fail("no function definition: " + function.asSymbol()->name);
+        }
+        case Type::Cons: {
+            const Value& head = car(function);
+            // (lambda (args) body...) quoted, or a defun-q list ((args / locals) body...).
+            if (head.isSymbol() && head.asSymbol() == lambda_)
+                return makeLambda("lambda", car(cdr(function)), cdr(cdr(function)));
+            if (head.isList()) return makeLambda("defun-q", head, cdr(function));
+            break;
+        }
+        default:
+            break;
+    }
+    fail("bad function: " + Printer::prin1(function));
+}
+
+// ---- text
+
+Value Interpreter::read(const QString& text) {
+    Reader reader(symbols_, text);
+    Value form;
+    try {
+        reader.next(form);
+    } catch (LispError& error) {
+        fail(error.message());
+    }
+    return form;
+}
+
+Value Interpreter::evalText(const QString& text, const QString& file) {
+    Reader reader(symbols_, text, file);
+    Value result;
+    struct Where {
+        QString& file;
+        int& line;
+        QString oldFile = file;
+        int oldLine = line;
+        ~Where() {
+            file = oldFile;
+            line = oldLine;
+        }
+    } where{whereFile_, whereLine_};
+    for (;;) {
+        Value form;
+        try {
+            if (!reader.next(form)) break;
+        } catch (LispError& error) {
+            if (catchDepth_ == 0 && !error.handled) {
+                error.handled = true;
+                report(error);
+            }
+            throw;
+        }
+        if (!file.isEmpty()) {
+            whereFile_ = file;
+            whereLine_ = reader.formLine();
+        }
+        try {
+            result = eval(form);
+        } catch (LispError& error) {
+            if (error.file.isEmpty() && !file.isEmpty()) {
+                error.file = file;
+                error.line = reader.formLine();
+            }
+            throw;
+        }
+    }
+    return result;
+}
+
+bool Interpreter::evaluate(const QString& text, Value* result) {
+    try {
+        Value last = evalText(text);
+        if (result) *result = std::move(last);
+        return true;
+    } catch (LispError& error) {
+        if (!error.handled) report(error);
+        cancel_.store(false, std::memory_order_relaxed);
+        return false;
+    }
+}
+
+Value Interpreter::load(const QString& name) {
+    const QString path = findFile(LispFile::withLspExtension(name));
+    if (path.isEmpty()) fail("LOAD failed: " + Printer::quoted(name));
+    QString text;
+    if (!LispFile::readText(path, &text)) fail("LOAD failed: " + Printer::quoted(name));
+    if (loading_.size() >= 64) fail("LOAD failed: nested too deep: " + Printer::quoted(name));
+    loading_.push_back(QFileInfo(path).absolutePath());
+    struct Pop {
+        QStringList& list;
+        ~Pop() { list.removeLast(); }
+    } pop{loading_};
+    return evalText(text, path);
+}
+
+QString Interpreter::findFile(const QString& name) const {
+    QStringList folders = searchPaths_;
+    if (!loading_.isEmpty()) folders.prepend(loading_.last());
+    return LispFile::find(name, folders);
+}
+
+// ---- errors
+
+bool Interpreter::callErrorHandler(const QString& message) {
+    const Value handler = errorHandler_->value;
+    if (handler.isNil() || inErrorHandler_) return false;
+    inErrorHandler_ = true;
+    maxDepth_ += 200;  // room for the handler when the stack limit was the error
+    try {
+        const Value text = Value::string(message);
+        invoke(toFunction(handler), Args(&text, 1));
+    } catch (LispError& nested) {
+        write("; error: " + nested.message() + "\n");
+    }
+    maxDepth_ -= 200;
+    inErrorHandler_ = false;
+    return true;
+}
+
+void Interpreter::fail(const QString& message) {
+    LispError error(message);
+    if (catchDepth_ == 0) {
+        error.handled = true;
+        report(error);
+    }
+    throw error;
+}
+
+void Interpreter::report(LispError& error) {
+    error.handled = true;
+    if (callErrorHandler(error.message())) return;
+    write("; error: " + error.message() + "\n");
+    const QString file = error.file.isEmpty() ? whereFile_ : error.file;
+    const int line = error.file.isEmpty() ? whereLine_ : error.line;
+    if (!file.isEmpty()) write("; in " + file + ", line " + QString::number(line) + "\n");
+}
+
+void Interpreter::badType(const char* what, const Value& value) {
+    fail(QLatin1String("bad argument type: ") + QLatin1String(what) + ' ' + Printer::prin1(value));
+}
+
+// ---- argument checks
+
+std::int32_t Interpreter::toInt(const Value& v) {
+    if (!v.isInt()) badType("fixnump:", v);
+    return v.asInt();
+}
+
+double Interpreter::toNumber(const Value& v) {
+    if (!v.isNumber()) badType("numberp:", v);
+    return v.asNumber();
+}
+
+const QString& Interpreter::toStr(const Value& v) {
+    if (!v.isString()) badType("stringp", v);
+    return v.asString();
+}
+
+Symbol* Interpreter::toSym(const Value& v) {
+    if (!v.isSymbol()) badType("symbolp", v);
+    return v.asSymbol();
+}
+
+void Interpreter::checkList(const Value& v) {
+    if (!v.isList()) badType("listp", v);
+}
+
+std::vector<Value> Interpreter::toVector(const Value& list) {
+    std::vector<Value> items;
+    const Value* cell = &list;
+    for (; cell->isCons(); cell = &cell->asCons()->cdr)
+        items.push_back(cell->asCons()->car);
+    if (!cell->isNil()) badType("listp", list);
+    return items;
+}
+
+Value Interpreter::fromVector(const std::vector<Value>& items) {
+    Value list;
+    for (auto it = items.rbegin(); it != items.rend(); ++it)
+        list = Value::cons(*it, std::move(list));
+    return list;
+}
+
+void Interpreter::write(const QString& text) {
+    if (output_ && !text.isEmpty()) output_(text);
+}
+
+}  // namespace zvlisp
