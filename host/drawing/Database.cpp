@@ -1,8 +1,302 @@
 #include "Database.h"
 
+#include "Attribute.h"
+#include "BlockRecord.h"
+#include "BlockReference.h"
+#include "Dictionary.h"
+#include "DrawingSkeleton.h"
+#include "DxfLoader.h"
+#include "LayerRecord.h"
+#include "Polyline.h"
+#include "SymbolTable.h"
+#include "TagValues.h"
+#include "XRecord.h"
+
 namespace zvdb {
 
-Database::Database() = default;
+Database::Database(Blank) : header_(arena_) {}
+
+Database::Database() : Database(Blank{}) {
+    DxfLoader::loadInto(*this, DrawingSkeleton::text());
+}
+
 Database::~Database() = default;
+
+std::string_view Database::version() const {
+    return header_.text("$ACADVER", "AC1009");
+}
+
+void Database::setVersion(std::string_view version) {
+    header_.setText("$ACADVER", 1, version);
+}
+
+DbObject* Database::objectByHandle(std::uint64_t handle) const {
+    if (handle == 0) return nullptr;
+    const auto it = byHandle_.find(handle);
+    if (it == byHandle_.end() || it->second->isErased()) return nullptr;
+    return it->second;
+}
+
+Entity* Database::entityByHandle(std::uint64_t handle) const {
+    return dynamic_cast<Entity*>(objectByHandle(handle));
+}
+
+void Database::noteHandle(std::uint64_t handle) {
+    if (handle >= nextHandle_) nextHandle_ = handle + 1;
+}
+
+DbObject* Database::adopt(std::unique_ptr<DbObject> object) {
+    DbObject* raw = object.get();
+    storage_.push_back(std::move(object));
+    if (raw->handle() != 0) {
+        byHandle_.emplace(raw->handle(), raw);
+        noteHandle(raw->handle());
+    }
+    return raw;
+}
+
+std::size_t Database::storageBytes() const {
+    return arena_.bytesUsed() + fileTags_.capacity() * sizeof(Tag) +
+           storage_.size() * (sizeof(Entity) + 48) + byHandle_.size() * 32;
+}
+
+// Tables -----------------------------------------------------------------------------------
+
+SymbolTable* Database::addTable(std::string_view name, DbObject* head) {
+    tables_.push_back(std::make_unique<SymbolTable>(name, head));
+    return tables_.back().get();
+}
+
+SymbolTable* Database::table(std::string_view name) const {
+    for (const auto& t : tables_)
+        if (TagValues::sameName(t->name(), name)) return t.get();
+    return nullptr;
+}
+
+LayerRecord* Database::layer(std::string_view name) const {
+    SymbolTable* layers = table("LAYER");
+    return layers ? dynamic_cast<LayerRecord*>(layers->find(name)) : nullptr;
+}
+
+std::vector<LayerRecord*> Database::layers() const {
+    std::vector<LayerRecord*> result;
+    if (SymbolTable* t = table("LAYER"))
+        for (DbObject* record : t->records())
+            if (auto* layer = dynamic_cast<LayerRecord*>(record)) result.push_back(layer);
+    return result;
+}
+
+DbObject* Database::createTableRecord(std::string_view tableName, std::string_view name,
+                                      std::string_view subclass, const std::vector<Tag>& more) {
+    SymbolTable* t = table(tableName);
+    if (!t) return nullptr;
+    TagListBuilder tags(arena_);
+    const std::string_view type = t->name();
+    tags.text(0, type).handle(type == "DIMSTYLE" ? 105 : 5, allocateHandle());
+    tags.handle(330, t->head() ? t->head()->handle() : 0);
+    tags.text(100, "AcDbSymbolTableRecord").text(100, subclass).text(2, name).integer(70, 0);
+    tags.append(more);
+    DbObject* record =
+        adopt(DxfLoader::makeOwnedObject(*this, tags.take(), DxfLoader::Context::Table));
+    t->add(record);
+    return record;
+}
+
+LayerRecord* Database::createLayer(std::string_view name) {
+    if (LayerRecord* existing = layer(name)) return existing;
+    TagListBuilder more(arena_);
+    more.integer(62, 7).text(6, "Continuous").integer(370, -3);
+    if (LayerRecord* zero = layer("0"); zero && zero->has(390)) more.text(390, zero->text(390));
+    return static_cast<LayerRecord*>(
+        createTableRecord("LAYER", name, "AcDbLayerTableRecord", more.take()));
+}
+
+BlockRecord* Database::block(std::string_view name) const {
+    SymbolTable* blocks = table("BLOCK_RECORD");
+    return blocks ? dynamic_cast<BlockRecord*>(blocks->find(name)) : nullptr;
+}
+
+std::vector<BlockRecord*> Database::blocks() const {
+    std::vector<BlockRecord*> result;
+    if (SymbolTable* t = table("BLOCK_RECORD"))
+        for (DbObject* record : t->records())
+            if (auto* block = dynamic_cast<BlockRecord*>(record)) result.push_back(block);
+    return result;
+}
+
+BlockRecord* Database::modelSpace() const {
+    return block("*Model_Space");
+}
+
+BlockRecord* Database::paperSpace() const {
+    return block("*Paper_Space");
+}
+
+BlockRecord* Database::createBlock(std::string_view name, const Point3& basePoint) {
+    if (BlockRecord* existing = block(name)) return existing;
+    TagListBuilder more(arena_);
+    more.integer(280, 1).integer(281, 0);
+    auto* record = static_cast<BlockRecord*>(
+        createTableRecord("BLOCK_RECORD", name, "AcDbBlockTableRecord", more.take()));
+    TagListBuilder begin(arena_);
+    begin.text(0, "BLOCK").handle(5, allocateHandle()).handle(330, record->handle());
+    begin.text(100, "AcDbEntity").text(8, "0").text(100, "AcDbBlockBegin").text(2, name);
+    begin.integer(70, 0).point(10, basePoint).text(3, name).text(1, "");
+    auto* blockBegin = static_cast<Entity*>(
+        adopt(DxfLoader::makeOwnedObject(*this, begin.take(), DxfLoader::Context::Entity)));
+    TagListBuilder end(arena_);
+    end.text(0, "ENDBLK").handle(5, allocateHandle()).handle(330, record->handle());
+    end.text(100, "AcDbEntity").text(8, "0").text(100, "AcDbBlockEnd");
+    auto* blockEnd = static_cast<Entity*>(
+        adopt(DxfLoader::makeOwnedObject(*this, end.take(), DxfLoader::Context::Entity)));
+    record->setBlockBegin(blockBegin);
+    record->setBlockEnd(blockEnd);
+    return record;
+}
+
+void Database::forgetBlock(BlockRecord& record) {
+    if (SymbolTable* t = table("BLOCK_RECORD")) t->reindex();
+    (void)record;
+}
+
+bool Database::isApplicationRegistered(std::string_view application) const {
+    SymbolTable* appids = table("APPID");
+    return appids && appids->find(application);
+}
+
+bool Database::registerApplication(std::string_view application) {
+    if (application.empty() || isApplicationRegistered(application)) return false;
+    return createTableRecord("APPID", application, "AcDbRegAppTableRecord") != nullptr;
+}
+
+// System variables -------------------------------------------------------------------------
+
+std::string_view Database::currentLayer() const {
+    return header_.text("$CLAYER", "0");
+}
+
+bool Database::setCurrentLayer(std::string_view name) {
+    LayerRecord* record = layer(name);
+    if (!record) return false;
+    header_.setText("$CLAYER", 8, record->name());
+    return true;
+}
+
+// Objects ----------------------------------------------------------------------------------
+
+Dictionary* Database::namedObjects() const {
+    return dynamic_cast<Dictionary*>(objectByHandle(namedObjects_));
+}
+
+Dictionary* Database::dictionaryAt(std::span<const std::string> path, bool create) {
+    Dictionary* current = namedObjects();
+    for (const std::string& name : path) {
+        if (!current) return nullptr;
+        current = create ? current->getOrCreateDictionary(name) : current->getDictionary(name);
+    }
+    return current;
+}
+
+XRecord* Database::xrecordAt(std::span<const std::string> path, bool create) {
+    if (path.empty()) return nullptr;
+    Dictionary* parent = dictionaryAt(path.first(path.size() - 1), create);
+    if (!parent) return nullptr;
+    return create ? parent->getOrCreateXRecord(path.back()) : parent->getXRecord(path.back());
+}
+
+DbObject* Database::createObject(std::string_view type, const std::vector<Tag>& body,
+                                 DbObject& owner) {
+    TagListBuilder tags(arena_);
+    tags.text(0, type).handle(5, allocateHandle()).handle(330, owner.handle()).append(body);
+    DbObject* object =
+        adopt(DxfLoader::makeOwnedObject(*this, tags.take(), DxfLoader::Context::Object));
+    objects_.push_back(object);
+    return object;
+}
+
+Dictionary* Database::createDictionary(DbObject& owner, bool hardOwner) {
+    TagListBuilder body(arena_);
+    body.text(100, "AcDbDictionary");
+    if (hardOwner) body.integer(280, 1);
+    body.integer(281, 1);
+    return static_cast<Dictionary*>(createObject("DICTIONARY", body.take(), owner));
+}
+
+XRecord* Database::createXRecord(DbObject& owner) {
+    TagListBuilder body(arena_);
+    body.text(100, "AcDbXrecord").integer(280, 1);
+    return static_cast<XRecord*>(createObject("XRECORD", body.take(), owner));
+}
+
+std::vector<DbObject*> Database::objects() const {
+    std::vector<DbObject*> result;
+    result.reserve(objects_.size());
+    for (DbObject* object : objects_)
+        if (!object->isErased()) result.push_back(object);
+    return result;
+}
+
+// Entities ---------------------------------------------------------------------------------
+
+std::vector<Tag> Database::entityHead(std::string_view type, std::uint64_t handle,
+                                      std::uint64_t owner, std::string_view layer,
+                                      bool paperSpace) {
+    TagListBuilder tags(arena_);
+    tags.text(0, type).handle(5, handle).handle(330, owner).text(100, "AcDbEntity");
+    if (paperSpace) tags.integer(67, 1);
+    tags.text(8, layer.empty() ? std::string_view("0") : layer);
+    return tags.take();
+}
+
+Entity* Database::addEntity(BlockRecord& block, std::string_view type, const std::vector<Tag>& body,
+                            std::string_view layer) {
+    std::vector<Tag> tags =
+        entityHead(type, allocateHandle(), block.handle(), layer, block.isPaperSpace());
+    for (const Tag& tag : body)
+        tags.push_back(Tag{tag.code, store(tag.value)});
+    auto* entity = static_cast<Entity*>(
+        adopt(DxfLoader::makeOwnedObject(*this, tags, DxfLoader::Context::Entity)));
+    block.appendEntity(entity);
+    return entity;
+}
+
+void Database::ensureSeqend(Entity& parent) {
+    if (parent.seqend()) return;
+    auto seqend = DxfLoader::makeOwnedObject(*this,
+                                             entityHead("SEQEND", allocateHandle(), parent.handle(),
+                                                        parent.layer(), parent.inPaperSpace()),
+                                             DxfLoader::Context::Entity);
+    auto* raw = static_cast<Entity*>(adopt(std::move(seqend)));
+    parent.setSeqend(raw);
+}
+
+Attribute* Database::addAttribute(BlockReference& reference, const std::vector<Tag>& body,
+                                  std::string_view layer) {
+    std::vector<Tag> tags =
+        entityHead("ATTRIB", allocateHandle(), reference.handle(), layer, reference.inPaperSpace());
+    tags.push_back(Tag{100, "AcDbText"});
+    for (const Tag& tag : body)
+        tags.push_back(Tag{tag.code, store(tag.value)});
+    auto* attribute = static_cast<Attribute*>(
+        adopt(DxfLoader::makeOwnedObject(*this, tags, DxfLoader::Context::Entity)));
+    reference.addSubEntity(attribute);
+    if (reference.integer(66) != 1) reference.setInteger(66, 1, "AcDbBlockReference");
+    ensureSeqend(reference);
+    return attribute;
+}
+
+Entity* Database::addVertex(Polyline& polyline, const Point3& p) {
+    std::vector<Tag> tags = entityHead("VERTEX", allocateHandle(), polyline.handle(),
+                                       polyline.layer(), polyline.inPaperSpace());
+    TagListBuilder body(arena_);
+    body.text(100, "AcDbVertex").text(100, "AcDb2dVertex").point(10, p).integer(70, 0);
+    for (const Tag& tag : body.take())
+        tags.push_back(tag);
+    auto* vertex = static_cast<Entity*>(
+        adopt(DxfLoader::makeOwnedObject(*this, tags, DxfLoader::Context::Entity)));
+    polyline.addSubEntity(vertex);
+    ensureSeqend(polyline);
+    return vertex;
+}
 
 }  // namespace zvdb

@@ -1,11 +1,146 @@
 #pragma once
-// The drawing database of one document.
+// The drawing database of one document: header variables, tables, blocks with their
+// entities, and the objects (dictionaries, Xrecords and everything else), each object found
+// by its handle. Handles are unique and stay the same for the life of the database; an
+// erased object is no longer found.
+//
+// A new Database is an empty drawing (AC1027). DxfLoader reads one from a file and
+// DxfWriter writes it back; objects we do not know are kept as their tags.
+#include "Geometry.h"
+#include "HeaderVariables.h"
+#include "StringArena.h"
+#include "Tag.h"
+
+#include <cstdint>
+#include <memory>
+#include <span>
+#include <string>
+#include <string_view>
+#include <unordered_map>
+#include <vector>
+
 namespace zvdb {
+
+class Attribute;
+class BlockRecord;
+class BlockReference;
+class DbObject;
+class Dictionary;
+class Entity;
+class LayerRecord;
+class Polyline;
+class SymbolTable;
+class XRecord;
 
 class Database {
 public:
     Database();
     ~Database();
+    Database(const Database&) = delete;
+    Database& operator=(const Database&) = delete;
+
+    // "AC1027" and so on; new drawings are AC1027.
+    std::string_view version() const;
+    void setVersion(std::string_view version);
+    HeaderVariables& header() { return header_; }
+    const HeaderVariables& header() const { return header_; }
+    // Repairs made while reading (missing handles, missing SEQENDs...), one line each.
+    const std::vector<std::string>& warnings() const { return warnings_; }
+
+    // Objects by handle ----------------------------------------------------------------------
+    DbObject* objectByHandle(std::uint64_t handle) const;
+    Entity* entityByHandle(std::uint64_t handle) const;
+    // The next free handle ($HANDSEED), above every handle in use.
+    std::uint64_t handleSeed() const { return nextHandle_; }
+    std::size_t objectCount() const { return storage_.size(); }
+
+    // Tables -------------------------------------------------------------------------------
+    SymbolTable* table(std::string_view name) const;  // "LAYER", "BLOCK_RECORD"...
+    const std::vector<std::unique_ptr<SymbolTable>>& tables() const { return tables_; }
+    LayerRecord* layer(std::string_view name) const;
+    std::vector<LayerRecord*> layers() const;
+    // The layer of this name, made when missing (colour 7, Continuous).
+    LayerRecord* createLayer(std::string_view name);
+    BlockRecord* block(std::string_view name) const;
+    std::vector<BlockRecord*> blocks() const;
+    // A new empty block definition; the existing one when the name is taken.
+    BlockRecord* createBlock(std::string_view name, const Point3& basePoint = {});
+    BlockRecord* modelSpace() const;
+    BlockRecord* paperSpace() const;
+    bool isApplicationRegistered(std::string_view application) const;
+    // Adds the APPID record when missing; true when it was added.
+    bool registerApplication(std::string_view application);
+    // A new record at the end of a table: type, name, its subclass marker and further tags.
+    DbObject* createTableRecord(std::string_view tableName, std::string_view name,
+                                std::string_view subclass, const std::vector<Tag>& more = {});
+
+    // System variables kept in the header ------------------------------------------------
+    std::string_view currentLayer() const;
+    // False (and nothing changed) when there is no such layer.
+    bool setCurrentLayer(std::string_view name);
+
+    // Objects section -------------------------------------------------------------------------
+    Dictionary* namedObjects() const;
+    // The dictionary at the path of names below the named-objects dictionary; missing levels
+    // are made when `create` is set, else the answer is null.
+    Dictionary* dictionaryAt(std::span<const std::string> path, bool create);
+    // The Xrecord at the path (the last name is the Xrecord's entry).
+    XRecord* xrecordAt(std::span<const std::string> path, bool create);
+    // New objects at the end of the OBJECTS section, owned by `owner` (not yet an entry of
+    // it: put them in a dictionary with Dictionary::setAt).
+    Dictionary* createDictionary(DbObject& owner, bool hardOwner = false);
+    XRecord* createXRecord(DbObject& owner);
+    DbObject* createObject(std::string_view type, const std::vector<Tag>& body, DbObject& owner);
+    std::vector<DbObject*> objects() const;  // in section order, erased left out
+
+    // Building blocks for the typed classes -----------------------------------------------
+    // A new entity at the end of `block`: `body` holds the tags after the entity's common
+    // ones (its subclass marker first).
+    Entity* addEntity(BlockRecord& block, std::string_view type, const std::vector<Tag>& body,
+                      std::string_view layer);
+    Attribute* addAttribute(BlockReference& reference, const std::vector<Tag>& body,
+                            std::string_view layer);
+    Entity* addVertex(Polyline& polyline, const Point3& p);
+    StringArena& arena() { return arena_; }
+    std::string_view store(std::string_view text) { return arena_.store(text); }
+
+    // Memory held by tag storage, for the benchmarks.
+    std::size_t storageBytes() const;
+
+private:
+    friend class BlockRecord;
+    friend class DxfLoader;
+    friend class DxfWriter;
+    friend class DeepCloner;
+    struct Blank {};
+    explicit Database(Blank);
+
+    struct RawSection {
+        std::string name;
+        std::vector<Tag> tags;
+    };
+
+    DbObject* adopt(std::unique_ptr<DbObject> object);
+    std::uint64_t allocateHandle() { return nextHandle_++; }
+    void noteHandle(std::uint64_t handle);
+    void forgetBlock(BlockRecord& record);
+    void ensureSeqend(Entity& parent);
+    std::vector<Tag> entityHead(std::string_view type, std::uint64_t handle, std::uint64_t owner,
+                                std::string_view layer, bool paperSpace);
+    SymbolTable* addTable(std::string_view name, DbObject* head);
+
+    StringArena arena_;
+    HeaderVariables header_;
+    std::vector<Tag> fileTags_;
+    std::vector<std::unique_ptr<DbObject>> storage_;
+    std::unordered_map<std::uint64_t, DbObject*> byHandle_;
+    std::uint64_t nextHandle_ = 1;
+    std::vector<std::unique_ptr<SymbolTable>> tables_;
+    std::vector<DbObject*> objects_;
+    std::vector<RawSection> rawSections_;
+    std::vector<std::string> sectionOrder_;
+    std::vector<std::string> warnings_;
+    std::uint64_t namedObjects_ = 0;
 };
 
 }  // namespace zvdb

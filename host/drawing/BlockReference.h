@@ -1,0 +1,37 @@
+#pragma once
+// An INSERT: a reference to a block definition, with its attributes.
+#include "Entity.h"
+
+namespace zvdb {
+
+class Attribute;
+class BlockRecord;
+
+class BlockReference : public Entity {
+public:
+    using Entity::Entity;
+
+    std::string_view blockName() const { return text(2); }
+    BlockRecord* definition() const;
+    Point3 position() const { return point(10); }
+    void setPosition(const Point3& p) { setPoint(10, p, "AcDbBlockReference"); }
+    Point3 scale() const { return {real(41, 1.0), real(42, 1.0), real(43, 1.0)}; }
+    void setScale(const Point3& scale);
+    double rotation() const { return real(50); }  // degrees
+    void setRotation(double degrees) { setReal(50, degrees, "AcDbBlockReference"); }
+    Point3 extrusion() const { return point(210, Point3{0, 0, 1}); }
+    // From the block definition's coordinates to the coordinates of the reference's owner.
+    Transform transform() const;
+
+    // Attributes in order, erased ones left out.
+    std::vector<Attribute*> attributes() const;
+    // The first attribute with the tag, ignoring case; null when none.
+    Attribute* attribute(std::string_view tag) const;
+    Attribute* addAttribute(std::string_view tag, std::string_view value, const Point3& position,
+                            double height);
+    // A new attribute made from a definition of the block: its properties, placed by the
+    // reference's transform, with the definition's default value.
+    Attribute* addAttributeFromDefinition(const Attribute& definition);
+};
+
+}  // namespace zvdb

@@ -1,0 +1,450 @@
+#include "DbObject.h"
+
+#include "Database.h"
+#include "Dictionary.h"
+#include "TagValues.h"
+
+#include <algorithm>
+
+namespace zvdb {
+
+namespace {
+
+bool opensGroup(const Tag& tag) {
+    return tag.code == 102 && !tag.value.empty() && tag.value[0] == '{';
+}
+bool closesGroup(const Tag& tag) {
+    return tag.code == 102 && !tag.value.empty() && tag.value[0] == '}';
+}
+
+}  // namespace
+
+DbObject::DbObject(Database& database, std::span<const Tag> tags)
+    : database_(&database),
+      fileTags_(tags.data()),
+      fileCount_(static_cast<std::uint32_t>(tags.size())) {
+    cacheIdentity();
+}
+
+DbObject::~DbObject() = default;
+
+std::span<const Tag> DbObject::tags() const {
+    if (owned_) return own_;
+    return {fileTags_, fileCount_};
+}
+
+std::vector<Tag>& DbObject::editTags() {
+    if (!owned_) {
+        own_.assign(fileTags_, fileTags_ + fileCount_);
+        owned_ = true;
+        fileTags_ = nullptr;
+        fileCount_ = 0;
+    }
+    return own_;
+}
+
+void DbObject::takeTags(std::vector<Tag> tags) {
+    own_ = std::move(tags);
+    owned_ = true;
+    fileTags_ = nullptr;
+    fileCount_ = 0;
+    cacheIdentity();
+}
+
+std::string_view DbObject::store(std::string_view text) const {
+    return database_->store(text);
+}
+
+std::string_view DbObject::type() const {
+    const auto all = tags();
+    return all.empty() ? std::string_view() : all[0].value;
+}
+
+void DbObject::cacheIdentity() {
+    const auto all = tags();
+    const int handleCode = type() == "DIMSTYLE" ? 105 : 5;
+    handle_ = 0;
+    owner_ = 0;
+    bool inGroup = false;
+    for (std::size_t i = 1; i < all.size(); ++i) {
+        const Tag& tag = all[i];
+        if (tag.code == 100 || tag.code == 1001) break;
+        if (opensGroup(tag))
+            inGroup = true;
+        else if (closesGroup(tag))
+            inGroup = false;
+        else if (inGroup)
+            continue;
+        else if (tag.code == handleCode && handle_ == 0)
+            handle_ = TagValues::toHandle(tag.value);
+        else if (tag.code == 330 && owner_ == 0)
+            owner_ = TagValues::toHandle(tag.value);
+    }
+}
+
+DbObject* DbObject::owner() const {
+    return database_->objectByHandle(owner_);
+}
+
+void DbObject::setOwner(std::uint64_t owner) {
+    owner_ = owner;
+    const std::string_view value = store(TagValues::fromHandle(owner));
+    auto& all = editTags();
+    bool inGroup = false;
+    std::size_t i = 1;
+    for (; i < all.size(); ++i) {
+        const Tag& tag = all[i];
+        if (opensGroup(tag)) {
+            inGroup = true;
+        } else if (closesGroup(tag)) {
+            inGroup = false;
+        } else if (inGroup) {
+            continue;
+        } else if (tag.code == 330) {
+            all[i].value = value;
+            return;
+        } else if (tag.code != 5 && tag.code != 105) {
+            break;
+        }
+    }
+    all.insert(all.begin() + static_cast<std::ptrdiff_t>(i), Tag{330, value});
+}
+
+void DbObject::setHandle(std::uint64_t handle) {
+    handle_ = handle;
+    const std::int16_t code = type() == "DIMSTYLE" ? 105 : 5;
+    const std::string_view value = store(TagValues::fromHandle(handle));
+    auto& all = editTags();
+    for (std::size_t i = 1; i < all.size() && i < 4; ++i) {
+        if (all[i].code == code) {
+            all[i].value = value;
+            return;
+        }
+    }
+    all.insert(all.begin() + (all.empty() ? 0 : 1), Tag{code, value});
+}
+
+std::size_t DbObject::headerEnd() const {
+    const auto all = tags();
+    const int handleCode = type() == "DIMSTYLE" ? 105 : 5;
+    std::size_t i = 1;
+    bool inGroup = false;
+    for (; i < all.size(); ++i) {
+        const Tag& tag = all[i];
+        if (opensGroup(tag))
+            inGroup = true;
+        else if (closesGroup(tag))
+            inGroup = false;
+        else if (!inGroup && tag.code != handleCode && tag.code != 330)
+            break;
+    }
+    return i;
+}
+
+std::size_t DbObject::appGroupEnd(std::string_view group) const {
+    const auto all = tags();
+    for (std::size_t i = 1; i < all.size(); ++i) {
+        if (all[i].code == 100 || all[i].code == 1001) break;
+        if (opensGroup(all[i]) && all[i].value.substr(1) == group) {
+            for (std::size_t k = i + 1; k < all.size(); ++k)
+                if (closesGroup(all[k])) return k;
+            return 0;
+        }
+    }
+    return 0;
+}
+
+std::size_t DbObject::xdataStart() const {
+    const auto all = tags();
+    if (type() == "XRECORD") return all.size();
+    for (std::size_t i = 1; i < all.size(); ++i)
+        if (all[i].code == 1001) return i;
+    return all.size();
+}
+
+int DbObject::indexOf(int code, std::size_t from) const {
+    const auto all = tags();
+    const std::size_t end = code >= 1000 ? all.size() : xdataStart();
+    bool inGroup = false;
+    for (std::size_t i = 1; i < end; ++i) {
+        const Tag& tag = all[i];
+        if (opensGroup(tag)) {
+            inGroup = true;
+        } else if (closesGroup(tag)) {
+            inGroup = false;
+        } else if (!inGroup && tag.code == code && i >= from) {
+            return static_cast<int>(i);
+        }
+    }
+    return -1;
+}
+
+std::string_view DbObject::text(int code, std::string_view fallback) const {
+    const int i = indexOf(code);
+    return i < 0 ? fallback : tags()[static_cast<std::size_t>(i)].value;
+}
+
+double DbObject::real(int code, double fallback) const {
+    const int i = indexOf(code);
+    return i < 0 ? fallback
+                 : TagValues::toReal(tags()[static_cast<std::size_t>(i)].value, fallback);
+}
+
+long long DbObject::integer(int code, long long fallback) const {
+    const int i = indexOf(code);
+    return i < 0 ? fallback
+                 : TagValues::toInteger(tags()[static_cast<std::size_t>(i)].value, fallback);
+}
+
+Point3 DbObject::point(int code, const Point3& fallback) const {
+    const int i = indexOf(code);
+    if (i < 0) return fallback;
+    const auto all = tags();
+    Point3 p{TagValues::toReal(all[static_cast<std::size_t>(i)].value), 0.0, 0.0};
+    std::size_t k = static_cast<std::size_t>(i) + 1;
+    if (k < all.size() && all[k].code == code + 10) p.y = TagValues::toReal(all[k++].value);
+    if (k < all.size() && all[k].code == code + 20) p.z = TagValues::toReal(all[k].value);
+    return p;
+}
+
+std::uint64_t DbObject::handleAt(int code) const {
+    return TagValues::toHandle(text(code));
+}
+
+std::size_t DbObject::subclassEnd(std::string_view subclass) const {
+    const auto all = tags();
+    const std::size_t end = xdataStart();
+    if (subclass.empty()) return end;
+    for (std::size_t i = 1; i < end; ++i) {
+        if (all[i].code == 100 && all[i].value == subclass) {
+            std::size_t k = i + 1;
+            while (k < end && all[k].code != 100)
+                ++k;
+            return k;
+        }
+    }
+    return end;
+}
+
+void DbObject::setTagValue(int code, std::string_view value, std::string_view subclass) {
+    const int i = indexOf(code);
+    const std::string_view stored = store(value);
+    if (i >= 0) {
+        editTags()[static_cast<std::size_t>(i)].value = stored;
+        return;
+    }
+    const std::size_t at = subclassEnd(subclass);
+    auto& all = editTags();
+    all.insert(all.begin() + static_cast<std::ptrdiff_t>(at),
+               Tag{static_cast<std::int16_t>(code), stored});
+}
+
+void DbObject::setText(int code, std::string_view value, std::string_view subclass) {
+    setTagValue(code, value, subclass);
+}
+
+void DbObject::setReal(int code, double value, std::string_view subclass) {
+    setTagValue(code, TagValues::fromReal(value), subclass);
+}
+
+void DbObject::setInteger(int code, long long value, std::string_view subclass) {
+    setTagValue(code, TagValues::fromInteger(value), subclass);
+}
+
+void DbObject::setPoint(int code, const Point3& p, std::string_view subclass, bool withZ) {
+    const int i = indexOf(code);
+    if (i < 0) {
+        const std::size_t at = subclassEnd(subclass);
+        TagListBuilder builder(database_->arena());
+        builder.point(code, p, withZ);
+        const auto added = builder.take();
+        auto& all = editTags();
+        all.insert(all.begin() + static_cast<std::ptrdiff_t>(at), added.begin(), added.end());
+        return;
+    }
+    auto& all = editTags();
+    std::size_t k = static_cast<std::size_t>(i);
+    all[k].value = store(TagValues::fromReal(p.x));
+    const double rest[2] = {p.y, p.z};
+    for (int axis = 0; axis < (withZ ? 2 : 1); ++axis) {
+        const std::int16_t axisCode = static_cast<std::int16_t>(code + 10 * (axis + 1));
+        const std::string_view value = store(TagValues::fromReal(rest[axis]));
+        if (k + 1 < all.size() && all[k + 1].code == axisCode) {
+            all[++k].value = value;
+        } else {
+            all.insert(all.begin() + static_cast<std::ptrdiff_t>(++k), Tag{axisCode, value});
+        }
+    }
+}
+
+void DbObject::removeAll(int code) {
+    for (int i = indexOf(code); i >= 0; i = indexOf(code, static_cast<std::size_t>(i))) {
+        auto& all = editTags();
+        all.erase(all.begin() + i);
+    }
+}
+
+void DbObject::replaceTags(std::span<const Tag> tags) {
+    std::vector<Tag> copy;
+    copy.reserve(tags.size());
+    for (const Tag& tag : tags)
+        copy.push_back(Tag{tag.code, store(tag.value)});
+    editTags() = std::move(copy);
+    cacheIdentity();
+}
+
+// Extended data ---------------------------------------------------------------------------
+
+std::vector<std::string_view> DbObject::xdataApplications() const {
+    std::vector<std::string_view> names;
+    const auto all = tags();
+    for (std::size_t i = xdataStart(); i < all.size(); ++i)
+        if (all[i].code == 1001) names.push_back(all[i].value);
+    return names;
+}
+
+bool DbObject::hasXData(std::string_view application) const {
+    for (std::string_view name : xdataApplications())
+        if (TagValues::sameName(name, application)) return true;
+    return false;
+}
+
+std::vector<std::vector<Tag>> DbObject::xdataGroups(std::string_view application) const {
+    std::vector<std::vector<Tag>> groups;
+    const auto all = tags();
+    std::vector<Tag>* current = nullptr;
+    for (std::size_t i = xdataStart(); i < all.size(); ++i) {
+        if (all[i].code == 1001) {
+            current = nullptr;
+            if (TagValues::sameName(all[i].value, application)) current = &groups.emplace_back();
+        } else if (current) {
+            current->push_back(all[i]);
+        }
+    }
+    return groups;
+}
+
+std::vector<Tag> DbObject::xdata(std::string_view application) const {
+    auto groups = xdataGroups(application);
+    return groups.empty() ? std::vector<Tag>() : std::move(groups.front());
+}
+
+void DbObject::setXData(std::string_view application, std::span<const Tag> items) {
+    database_->registerApplication(application);
+    const std::size_t start = xdataStart();
+    auto& all = editTags();
+    std::size_t begin = all.size(), end = all.size();
+    for (std::size_t i = start; i < all.size(); ++i) {
+        if (all[i].code == 1001 && TagValues::sameName(all[i].value, application)) {
+            begin = i;
+            end = i + 1;
+            while (end < all.size() && all[end].code != 1001)
+                ++end;
+            break;
+        }
+    }
+    std::vector<Tag> group;
+    group.reserve(items.size() + 1);
+    group.push_back(Tag{1001, store(application)});
+    for (const Tag& item : items)
+        group.push_back(Tag{item.code, store(item.value)});
+    all.erase(all.begin() + static_cast<std::ptrdiff_t>(begin),
+              all.begin() + static_cast<std::ptrdiff_t>(end));
+    all.insert(all.begin() + static_cast<std::ptrdiff_t>(begin), group.begin(), group.end());
+}
+
+void DbObject::addXData(std::string_view application, std::span<const Tag> items) {
+    database_->registerApplication(application);
+    auto& all = editTags();
+    all.push_back(Tag{1001, store(application)});
+    for (const Tag& item : items)
+        all.push_back(Tag{item.code, store(item.value)});
+}
+
+bool DbObject::removeXData(std::string_view application) {
+    if (!hasXData(application)) return false;
+    const std::size_t start = xdataStart();
+    auto& all = editTags();
+    std::vector<Tag> kept(all.begin(), all.begin() + static_cast<std::ptrdiff_t>(start));
+    bool skipping = false;
+    for (std::size_t i = start; i < all.size(); ++i) {
+        if (all[i].code == 1001) skipping = TagValues::sameName(all[i].value, application);
+        if (!skipping) kept.push_back(all[i]);
+    }
+    all = std::move(kept);
+    return true;
+}
+
+// Extension dictionary and reactors -------------------------------------------------------
+
+std::uint64_t DbObject::extensionDictionaryHandle() const {
+    const std::size_t close = appGroupEnd("ACAD_XDICTIONARY");
+    if (close == 0) return 0;
+    const auto all = tags();
+    for (std::size_t i = close; i-- > 1;) {
+        if (opensGroup(all[i])) break;
+        if (all[i].code == 360) return TagValues::toHandle(all[i].value);
+    }
+    return 0;
+}
+
+Dictionary* DbObject::extensionDictionary() const {
+    return dynamic_cast<Dictionary*>(database_->objectByHandle(extensionDictionaryHandle()));
+}
+
+Dictionary* DbObject::getOrCreateExtensionDictionary() {
+    if (Dictionary* existing = extensionDictionary()) return existing;
+    Dictionary* dictionary = database_->createDictionary(*this, true);
+    const std::size_t reactorsEnd = appGroupEnd("ACAD_REACTORS");
+    std::size_t at = reactorsEnd ? reactorsEnd + 1 : std::min<std::size_t>(2, tags().size());
+    auto& all = editTags();
+    // Drop a stale group (its dictionary is gone) before adding the new one.
+    if (const std::size_t stale = appGroupEnd("ACAD_XDICTIONARY")) {
+        std::size_t open = stale;
+        while (open > 0 && !opensGroup(all[open]))
+            --open;
+        all.erase(all.begin() + static_cast<std::ptrdiff_t>(open),
+                  all.begin() + static_cast<std::ptrdiff_t>(stale) + 1);
+        if (at > open) at = open;
+    }
+    const Tag group[3] = {Tag{102, "{ACAD_XDICTIONARY"},
+                          Tag{360, store(TagValues::fromHandle(dictionary->handle()))},
+                          Tag{102, "}"}};
+    all.insert(all.begin() + static_cast<std::ptrdiff_t>(at), group, group + 3);
+    return dictionary;
+}
+
+std::vector<std::uint64_t> DbObject::reactors() const {
+    std::vector<std::uint64_t> handles;
+    const std::size_t close = appGroupEnd("ACAD_REACTORS");
+    if (close == 0) return handles;
+    const auto all = tags();
+    std::size_t open = close;
+    while (open > 0 && !opensGroup(all[open]))
+        --open;
+    for (std::size_t i = open + 1; i < close; ++i)
+        if (all[i].code == 330) handles.push_back(TagValues::toHandle(all[i].value));
+    return handles;
+}
+
+void DbObject::addReactor(std::uint64_t handle) {
+    const std::string_view value = store(TagValues::fromHandle(handle));
+    const std::size_t close = appGroupEnd("ACAD_REACTORS");
+    auto& all = editTags();
+    if (close) {
+        all.insert(all.begin() + static_cast<std::ptrdiff_t>(close), Tag{330, value});
+        return;
+    }
+    const std::size_t at = std::min<std::size_t>(2, all.size());
+    const Tag group[3] = {Tag{102, "{ACAD_REACTORS"}, Tag{330, value}, Tag{102, "}"}};
+    all.insert(all.begin() + static_cast<std::ptrdiff_t>(at), group, group + 3);
+}
+
+void DbObject::erase() {
+    if (erased_) return;
+    erased_ = true;
+    if (Dictionary* xdict = extensionDictionary()) xdict->erase();
+    if (auto* dictionary = dynamic_cast<Dictionary*>(owner())) dictionary->forgetEntry(handle_);
+}
+
+}  // namespace zvdb

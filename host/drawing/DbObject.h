@@ -1,0 +1,114 @@
+#pragma once
+// One object of a drawing: a table record, an entity or an object of the OBJECTS section.
+// Its tags are the truth; typed classes read and write them, so groups we do not know stay
+// where they were. Tags read from a file are shared with the file buffer until the object
+// is first changed.
+#include "Geometry.h"
+#include "Tag.h"
+
+#include <cstdint>
+#include <span>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace zvdb {
+
+class Database;
+class Dictionary;
+
+class DbObject {
+public:
+    DbObject(Database& database, std::span<const Tag> tags);
+    virtual ~DbObject();
+    DbObject(const DbObject&) = delete;
+    DbObject& operator=(const DbObject&) = delete;
+
+    Database& database() const { return *database_; }
+    std::string_view type() const;  // "LINE", "DICTIONARY", "LAYER"...
+    bool isType(std::string_view type) const { return this->type() == type; }
+    std::uint64_t handle() const { return handle_; }
+    std::uint64_t ownerHandle() const { return owner_; }
+    DbObject* owner() const;
+    void setOwner(std::uint64_t owner);
+    bool isErased() const { return erased_; }
+    // Erases the object and what it owns (sub-entities, extension dictionary); an entry of
+    // a dictionary leaves it.
+    virtual void erase();
+
+    // Tags --------------------------------------------------------------------------------
+    std::span<const Tag> tags() const;
+    // Index of the first extended-data tag (1001), or the tag count.
+    std::size_t xdataStart() const;
+    // Index of the first tag with the code, outside application groups (102) and before the
+    // extended data, from `from` on; -1 when absent.
+    int indexOf(int code, std::size_t from = 1) const;
+    bool has(int code) const { return indexOf(code) >= 0; }
+    std::string_view text(int code, std::string_view fallback = {}) const;
+    double real(int code, double fallback = 0.0) const;
+    long long integer(int code, long long fallback = 0) const;
+    // A point from `code`, `code + 10` and `code + 20`.
+    Point3 point(int code, const Point3& fallback = {}) const;
+    std::uint64_t handleAt(int code) const;
+
+    // Sets the first tag with the code, or adds one at the end of `subclass` (a subclass
+    // marker, code 100), or before the extended data when there is no such subclass.
+    void setText(int code, std::string_view value, std::string_view subclass = {});
+    void setReal(int code, double value, std::string_view subclass = {});
+    void setInteger(int code, long long value, std::string_view subclass = {});
+    void setPoint(int code, const Point3& p, std::string_view subclass = {}, bool withZ = true);
+    void removeAll(int code);
+    // Replaces all tags; values are copied into the database's storage.
+    void replaceTags(std::span<const Tag> tags);
+    // The tags for editing in place; values put in must come from Database::store().
+    std::vector<Tag>& editTags();
+
+    // Extended data ----------------------------------------------------------------------
+    // Application names in order of appearance (a name twice when it has two groups).
+    std::vector<std::string_view> xdataApplications() const;
+    bool hasXData(std::string_view application) const;
+    // The items after the application name of its first group; empty when absent.
+    std::vector<Tag> xdata(std::string_view application) const;
+    std::vector<std::vector<Tag>> xdataGroups(std::string_view application) const;
+    // Replaces the application's first group (later groups stay) or appends one; the
+    // application is registered in the APPID table.
+    void setXData(std::string_view application, std::span<const Tag> items);
+    // Adds a further group even if the application has one.
+    void addXData(std::string_view application, std::span<const Tag> items);
+    bool removeXData(std::string_view application);
+
+    // Extension dictionary and reactors --------------------------------------------------
+    std::uint64_t extensionDictionaryHandle() const;
+    Dictionary* extensionDictionary() const;
+    Dictionary* getOrCreateExtensionDictionary();
+    std::vector<std::uint64_t> reactors() const;
+    void addReactor(std::uint64_t handle);
+
+protected:
+    friend class Database;
+    friend class DxfLoader;
+    void setHandle(std::uint64_t handle);
+    void markErased() { erased_ = true; }
+    // Makes the object own these tags (values already in the database's storage).
+    void takeTags(std::vector<Tag> tags);
+    std::string_view store(std::string_view text) const;
+    // Index after the object's opening groups (handle, application groups, owner).
+    std::size_t headerEnd() const;
+    std::size_t subclassEnd(std::string_view subclass) const;
+    std::size_t appGroupEnd(std::string_view group) const;  // index of its "102 }" or 0
+
+private:
+    void setTagValue(int code, std::string_view value, std::string_view subclass);
+    void cacheIdentity();
+
+    Database* database_;
+    const Tag* fileTags_ = nullptr;
+    std::uint32_t fileCount_ = 0;
+    bool owned_ = false;
+    bool erased_ = false;
+    std::vector<Tag> own_;
+    std::uint64_t handle_ = 0;
+    std::uint64_t owner_ = 0;
+};
+
+}  // namespace zvdb

@@ -1,0 +1,434 @@
+#include "DxfLoader.h"
+
+#include "Attribute.h"
+#include "BlockRecord.h"
+#include "BlockReference.h"
+#include "Dictionary.h"
+#include "DxfError.h"
+#include "LayerRecord.h"
+#include "Polyline.h"
+#include "SymbolTable.h"
+#include "TagReader.h"
+#include "TagValues.h"
+#include "TextCodec.h"
+#include "TextEntity.h"
+#include "XRecord.h"
+
+#include <fstream>
+#include <sstream>
+
+namespace zvdb {
+
+namespace {
+
+bool isTag(const Tag& tag, int code, std::string_view value) {
+    return tag.code == code && tag.value == value;
+}
+
+template <typename T>
+std::unique_ptr<DbObject> make(Database& database, std::span<const Tag> tags) {
+    return std::make_unique<T>(database, tags);
+}
+
+}  // namespace
+
+// Construction ------------------------------------------------------------------------------
+
+std::unique_ptr<DbObject> DxfLoader::makeObject(Database& database, std::span<const Tag> tags,
+                                                Context context) {
+    const std::string_view type = tags.empty() ? std::string_view() : tags[0].value;
+    switch (context) {
+        case Context::Table:
+            if (type == "LAYER") return make<LayerRecord>(database, tags);
+            if (type == "BLOCK_RECORD") return make<BlockRecord>(database, tags);
+            return make<DbObject>(database, tags);
+        case Context::Entity:
+            if (type == "INSERT") return make<BlockReference>(database, tags);
+            if (type == "ATTRIB" || type == "ATTDEF") return make<Attribute>(database, tags);
+            if (type == "LWPOLYLINE" || type == "POLYLINE") return make<Polyline>(database, tags);
+            if (type == "TEXT" || type == "MTEXT") return make<TextEntity>(database, tags);
+            return make<Entity>(database, tags);
+        case Context::Object:
+            if (type == "DICTIONARY" || type == "ACDBDICTIONARYWDFLT")
+                return make<Dictionary>(database, tags);
+            if (type == "XRECORD") return make<XRecord>(database, tags);
+            return make<DbObject>(database, tags);
+    }
+    return make<DbObject>(database, tags);
+}
+
+std::unique_ptr<DbObject> DxfLoader::makeOwnedObject(Database& database, std::vector<Tag> tags,
+                                                     Context context) {
+    auto object = makeObject(database, std::span<const Tag>(tags.data(), 1), context);
+    object->takeTags(std::move(tags));
+    return object;
+}
+
+std::unique_ptr<Database> DxfLoader::load(std::string bytes) {
+    std::unique_ptr<Database> database(new Database(Database::Blank{}));
+    loadInto(*database, std::move(bytes));
+    return database;
+}
+
+std::unique_ptr<Database> DxfLoader::loadFile(const std::string& path) {
+    std::ifstream in(path, std::ios::binary);
+    if (!in) throw DxfError(path + ": cannot be opened");
+    in.seekg(0, std::ios::end);
+    const auto size = in.tellg();
+    in.seekg(0);
+    std::string bytes(static_cast<std::size_t>(size), '\0');
+    if (!in.read(bytes.data(), size)) throw DxfError(path + ": cannot be read");
+    return load(std::move(bytes));
+}
+
+void DxfLoader::loadInto(Database& database, std::string bytes) {
+    DxfLoader loader(database);
+    loader.run(std::move(bytes));
+}
+
+void DxfLoader::run(std::string bytes) {
+    if (bytes.empty()) throw DxfError("the file is empty");
+    text_ = db_.arena_.adopt(std::move(bytes));
+    binary_ = TagReader::isBinary(text_);
+    db_.fileTags_ =
+        binary_ ? TagReader::readBinary(text_, db_.arena_) : TagReader::readAscii(text_);
+    if (db_.fileTags_.empty()) throw DxfError("line 1: the file holds no DXF data");
+    fixEncoding();
+    readSections();
+    finish();
+}
+
+std::string DxfLoader::where(std::size_t tagIndex) const {
+    if (binary_) return "tag " + std::to_string(tagIndex + 1);
+    return "line " + std::to_string(2 * tagIndex + 1);
+}
+
+std::string DxfLoader::where(const DbObject& object) const {
+    const Tag* first = object.tags().data();
+    const auto& all = db_.fileTags_;
+    if (first >= all.data() && first < all.data() + all.size())
+        return where(static_cast<std::size_t>(first - all.data()));
+    return "a new object";
+}
+
+// Encoding ----------------------------------------------------------------------------------
+
+void DxfLoader::fixEncoding() {
+    auto& tags = db_.fileTags_;
+    std::string_view version = "AC1009", codePage = "ANSI_1252";
+    for (std::size_t i = 0; i + 1 < tags.size() && i < 4000; ++i) {
+        if (isTag(tags[i], 9, "$ACADVER")) version = tags[i + 1].value;
+        if (isTag(tags[i], 9, "$DWGCODEPAGE")) codePage = tags[i + 1].value;
+        if (isTag(tags[i], 0, "ENDSEC")) break;
+    }
+    const bool unicode = version >= "AC1021";
+    if (!binary_ && TextCodec::isAscii(text_)) return;
+    bool anyHigh = false, allUtf8 = true;
+    for (const Tag& tag : tags) {
+        if (!isTextCode(tag.code) || TextCodec::isAscii(tag.value)) continue;
+        anyHigh = true;
+        if (!TextCodec::isValidUtf8(tag.value)) allUtf8 = false;
+    }
+    if (!anyHigh) return;
+    const bool utf8 = allUtf8;
+    if (!unicode && utf8) {
+        db_.warnings_.push_back("the code page says " + std::string(codePage) +
+                                " but the text is UTF-8; read as UTF-8");
+    } else if (unicode && !utf8) {
+        db_.warnings_.push_back("the text is not UTF-8 as " + std::string(version) +
+                                " requires; read in code page " + std::string(codePage));
+    }
+    if (!utf8) {
+        for (Tag& tag : tags)
+            if (isTextCode(tag.code) && !TextCodec::isAscii(tag.value))
+                tag.value = db_.store(TextCodec::toUtf8(tag.value, codePage));
+    }
+    if (unicode) return;
+    std::string decoded;
+    for (Tag& tag : tags)
+        if (isTextCode(tag.code) && TextCodec::decodeEscapes(tag.value, decoded))
+            tag.value = db_.store(decoded);
+}
+
+// Sections ----------------------------------------------------------------------------------
+
+std::size_t DxfLoader::sectionEnd(std::size_t begin, std::string_view name) const {
+    const auto& tags = db_.fileTags_;
+    for (std::size_t i = begin; i < tags.size(); ++i) {
+        if (tags[i].code != 0) continue;
+        if (tags[i].value == "ENDSEC") return i;
+        if (tags[i].value == "SECTION" || tags[i].value == "EOF")
+            throw DxfError(where(i) + ": expected ENDSEC to close section " + std::string(name) +
+                           ", found " + std::string(tags[i].value));
+    }
+    throw DxfError(where(tags.size()) + ": the file ends inside section " + std::string(name) +
+                   " (ENDSEC expected)");
+}
+
+void DxfLoader::readSections() {
+    const auto& tags = db_.fileTags_;
+    std::size_t i = 0;
+    bool sawEof = false;
+    while (i < tags.size()) {
+        if (isTag(tags[i], 0, "EOF")) {
+            sawEof = true;
+            break;
+        }
+        if (!isTag(tags[i], 0, "SECTION"))
+            throw DxfError(where(i) + ": expected 0/SECTION, found " +
+                           std::to_string(tags[i].code) + "/" +
+                           std::string(tags[i].value.substr(0, 40)));
+        if (i + 1 >= tags.size() || tags[i + 1].code != 2)
+            throw DxfError(where(i + 1) + ": expected the section name (group code 2)");
+        const std::string_view name = tags[i + 1].value;
+        const std::size_t begin = i + 2, end = sectionEnd(begin, name);
+        db_.sectionOrder_.emplace_back(name);
+        if (name == "HEADER")
+            readHeader(begin, end);
+        else if (name == "TABLES")
+            readTables(begin, end);
+        else if (name == "BLOCKS")
+            readBlocks(begin, end);
+        else if (name == "ENTITIES")
+            readEntities(begin, end);
+        else if (name == "OBJECTS")
+            readObjects(begin, end);
+        else
+            db_.rawSections_.push_back(
+                {std::string(name), std::vector<Tag>(tags.begin() + begin, tags.begin() + end)});
+        i = end + 1;
+    }
+    if (!sawEof) db_.warnings_.push_back("the file has no EOF after its last section");
+}
+
+void DxfLoader::readHeader(std::size_t begin, std::size_t end) {
+    const auto& tags = db_.fileTags_;
+    std::string_view name;
+    std::vector<Tag> values;
+    for (std::size_t i = begin; i <= end; ++i) {
+        if (i == end || tags[i].code == 9) {
+            if (!name.empty()) db_.header_.setValues(name, std::move(values));
+            values.clear();
+            if (i < end) name = tags[i].value;
+            continue;
+        }
+        if (name.empty())
+            throw DxfError(where(i) + ": expected a header variable name (group code 9)");
+        values.push_back(tags[i]);
+    }
+}
+
+std::size_t DxfLoader::nextObject(std::size_t from, std::size_t end) const {
+    const auto& tags = db_.fileTags_;
+    std::size_t i = from + 1;
+    while (i < end && tags[i].code != 0)
+        ++i;
+    return i;
+}
+
+DbObject* DxfLoader::adopt(std::size_t begin, std::size_t end, Context context) {
+    const auto& tags = db_.fileTags_;
+    auto object = makeObject(db_, std::span<const Tag>(tags.data() + begin, end - begin), context);
+    const std::uint64_t handle = object->handle();
+    if (handle != 0) {
+        if (DbObject* first = db_.byHandle_.count(handle) ? db_.byHandle_.at(handle) : nullptr)
+            throw DxfError(where(begin) + ": handle " + TagValues::fromHandle(handle) +
+                           " is used twice (first at " + where(*first) + ")");
+    }
+    DbObject* raw = db_.adopt(std::move(object));
+    if (handle == 0 && modern()) withoutHandle_.push_back(raw);
+    return raw;
+}
+
+void DxfLoader::readTables(std::size_t begin, std::size_t end) {
+    const auto& tags = db_.fileTags_;
+    SymbolTable* current = nullptr;
+    for (std::size_t i = begin; i < end;) {
+        if (tags[i].code != 0)
+            throw DxfError(where(i) + ": expected 0/TABLE, found group code " +
+                           std::to_string(tags[i].code));
+        const std::size_t next = nextObject(i, end);
+        if (tags[i].value == "TABLE") {
+            if (i + 1 >= next || tags[i + 1].code != 2)
+                throw DxfError(where(i + 1) + ": expected the table name (group code 2)");
+            DbObject* head = adopt(i, next, Context::Object);
+            current = db_.addTable(tags[i + 1].value, head);
+        } else if (tags[i].value == "ENDTAB") {
+            current = nullptr;
+        } else {
+            if (!current)
+                throw DxfError(where(i) + ": table record " + std::string(tags[i].value) +
+                               " outside a TABLE");
+            current->add(adopt(i, next, Context::Table));
+        }
+        i = next;
+    }
+}
+
+BlockRecord* DxfLoader::syntheticBlock(std::string_view name) {
+    SymbolTable* records = db_.table("BLOCK_RECORD");
+    if (!records) {
+        // R12 files have no block records; they are kept in memory only.
+        records = db_.addTable("BLOCK_RECORD", nullptr);
+        db_.tables_.back()->setWritten(false);
+    }
+    if (auto* existing = dynamic_cast<BlockRecord*>(records->find(name))) return existing;
+    TagListBuilder tags(db_.arena_);
+    tags.text(0, "BLOCK_RECORD")
+        .text(100, "AcDbSymbolTableRecord")
+        .text(100, "AcDbBlockTableRecord")
+        .text(2, name);
+    auto* record =
+        static_cast<BlockRecord*>(db_.adopt(makeOwnedObject(db_, tags.take(), Context::Table)));
+    if (modern()) {
+        record->setHandle(db_.allocateHandle());
+        db_.byHandle_.emplace(record->handle(), record);
+        db_.warnings_.push_back("block " + std::string(name) +
+                                " had no BLOCK_RECORD; one was added");
+    }
+    records->add(record);
+    return record;
+}
+
+BlockRecord* DxfLoader::blockFor(Entity& blockBegin) {
+    if (auto* record = dynamic_cast<BlockRecord*>(db_.objectByHandle(blockBegin.ownerHandle())))
+        return record;
+    const std::string_view name = blockBegin.text(2);
+    if (BlockRecord* record = db_.block(name)) return record;
+    return syntheticBlock(name);
+}
+
+void DxfLoader::closeOpenParent() {
+    if (openParent_ && !openParent_->seqend()) {
+        db_.ensureSeqend(*openParent_);
+        ++repairedSeqends_;
+    }
+    openParent_ = nullptr;
+}
+
+void DxfLoader::placeEntity(Entity* entity, BlockRecord* block) {
+    const std::string_view type = entity->type();
+    const bool child = (type == "ATTRIB" && openParent_ && openParent_->isType("INSERT")) ||
+                       (type == "VERTEX" && openParent_ && openParent_->isType("POLYLINE"));
+    if (child) {
+        openParent_->addSubEntity(entity);
+        return;
+    }
+    if (type == "SEQEND" && openParent_) {
+        openParent_->setSeqend(entity);
+        openParent_ = nullptr;
+        return;
+    }
+    closeOpenParent();
+    if (!block) block = db_.modelSpace();
+    if (!block) block = syntheticBlock("*Model_Space");
+    block->appendEntity(entity);
+    if (type == "POLYLINE" || (type == "INSERT" && entity->integer(66) == 1)) openParent_ = entity;
+}
+
+void DxfLoader::readBlocks(std::size_t begin, std::size_t end) {
+    const auto& tags = db_.fileTags_;
+    BlockRecord* block = nullptr;
+    for (std::size_t i = begin; i < end;) {
+        if (tags[i].code != 0)
+            throw DxfError(where(i) + ": expected an entity (group code 0), found group code " +
+                           std::to_string(tags[i].code));
+        const std::size_t next = nextObject(i, end);
+        auto* entity = static_cast<Entity*>(adopt(i, next, Context::Entity));
+        if (entity->isType("BLOCK")) {
+            if (block)
+                throw DxfError(where(i) + ": BLOCK inside block " + std::string(block->name()) +
+                               " (ENDBLK expected)");
+            block = blockFor(*entity);
+            block->setBlockBegin(entity);
+        } else if (entity->isType("ENDBLK")) {
+            if (!block) throw DxfError(where(i) + ": ENDBLK without BLOCK");
+            closeOpenParent();
+            block->setBlockEnd(entity);
+            block = nullptr;
+        } else {
+            if (!block)
+                throw DxfError(where(i) + ": entity " + std::string(entity->type()) +
+                               " outside a block (BLOCK expected)");
+            placeEntity(entity, block);
+        }
+        i = next;
+    }
+    if (block)
+        throw DxfError(where(end) + ": block " + std::string(block->name()) + " has no ENDBLK");
+}
+
+void DxfLoader::readEntities(std::size_t begin, std::size_t end) {
+    const auto& tags = db_.fileTags_;
+    BlockRecord* model = db_.modelSpace();
+    BlockRecord* paper = db_.paperSpace();
+    for (std::size_t i = begin; i < end;) {
+        if (tags[i].code != 0)
+            throw DxfError(where(i) + ": expected an entity (group code 0), found group code " +
+                           std::to_string(tags[i].code));
+        const std::size_t next = nextObject(i, end);
+        auto* entity = static_cast<Entity*>(adopt(i, next, Context::Entity));
+        BlockRecord* block = dynamic_cast<BlockRecord*>(db_.objectByHandle(entity->ownerHandle()));
+        if (!block) {
+            if (entity->inPaperSpace()) {
+                if (!paper) paper = syntheticBlock("*Paper_Space");
+                block = paper;
+            } else {
+                if (!model) model = syntheticBlock("*Model_Space");
+                block = model;
+            }
+        }
+        placeEntity(entity, block);
+        i = next;
+    }
+    closeOpenParent();
+}
+
+void DxfLoader::readObjects(std::size_t begin, std::size_t end) {
+    const auto& tags = db_.fileTags_;
+    for (std::size_t i = begin; i < end;) {
+        if (tags[i].code != 0)
+            throw DxfError(where(i) + ": expected an object (group code 0), found group code " +
+                           std::to_string(tags[i].code));
+        const std::size_t next = nextObject(i, end);
+        DbObject* object = adopt(i, next, Context::Object);
+        if (db_.objects_.empty() && object->isType("DICTIONARY"))
+            db_.namedObjects_ = object->handle();
+        db_.objects_.push_back(object);
+        i = next;
+    }
+}
+
+// Repairs after reading ---------------------------------------------------------------------
+
+void DxfLoader::finish() {
+    const std::uint64_t seed = TagValues::toHandle(db_.header_.text("$HANDSEED"));
+    if (seed > db_.nextHandle_) db_.nextHandle_ = seed;
+    if (!withoutHandle_.empty()) {
+        for (DbObject* object : withoutHandle_) {
+            object->setHandle(db_.allocateHandle());
+            db_.byHandle_.emplace(object->handle(), object);
+        }
+        db_.warnings_.push_back(std::to_string(withoutHandle_.size()) +
+                                " objects had no handle; new handles were given");
+    }
+    if (repairedSeqends_)
+        db_.warnings_.push_back(std::to_string(repairedSeqends_) +
+                                " missing SEQEND entities were added");
+    // Every extended-data application must be registered.
+    std::vector<std::string> missing;
+    if (db_.table("APPID")) {
+        for (const auto& object : db_.storage_) {
+            for (std::string_view app : object->xdataApplications()) {
+                if (db_.isApplicationRegistered(app)) continue;
+                missing.emplace_back(app);
+                db_.registerApplication(app);
+            }
+        }
+    }
+    for (const std::string& app : missing)
+        db_.warnings_.push_back("extended-data application " + app +
+                                " was not in the APPID table; it was added");
+}
+
+}  // namespace zvdb

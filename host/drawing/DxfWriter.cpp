@@ -1,0 +1,197 @@
+#include "DxfWriter.h"
+
+#include "BlockRecord.h"
+#include "Database.h"
+#include "DxfError.h"
+#include "Entity.h"
+#include "SymbolTable.h"
+#include "TagValues.h"
+#include "TextCodec.h"
+
+#include <QFileInfo>
+#include <QSaveFile>
+
+#include <unordered_set>
+
+namespace zvdb {
+
+std::string DxfWriter::toText(Database& database) {
+    DxfWriter writer(database);
+    writer.prepare();
+    writer.write();
+    return std::move(writer.out_);
+}
+
+void DxfWriter::saveFile(Database& database, const std::string& path) {
+    const std::string text = toText(database);
+    QSaveFile file(QString::fromStdString(path));
+    if (!file.open(QIODevice::WriteOnly))
+        throw DxfError(path + ": cannot be written: " + file.errorString().toStdString());
+    if (file.write(text.data(), static_cast<qint64>(text.size())) !=
+            static_cast<qint64>(text.size()) ||
+        !file.commit())
+        throw DxfError(path + ": cannot be written: " + file.errorString().toStdString());
+}
+
+void DxfWriter::prepare() {
+    // Register every application that extended data names.
+    std::unordered_set<std::string> seen;
+    std::vector<std::string> apps;
+    for (const auto& object : db_.storage_) {
+        if (object->isErased()) continue;
+        const auto tags = object->tags();
+        for (std::size_t i = 1; i < tags.size(); ++i) {
+            if (tags[i].code != 1001 || object->isType("XRECORD")) continue;
+            if (seen.insert(std::string(tags[i].value)).second) apps.emplace_back(tags[i].value);
+        }
+    }
+    for (const std::string& app : apps)
+        db_.registerApplication(app);
+    for (const auto& table : db_.tables_) {
+        if (table->head() && table->head()->has(70))
+            table->head()->setInteger(70, static_cast<long long>(table->size()));
+    }
+    db_.header_.setText("$HANDSEED", 5, TagValues::fromHandle(db_.handleSeed()));
+    legacyEncoding_ = db_.version() < "AC1021";
+    codePage_ = std::string(db_.header_.text("$DWGCODEPAGE", "ANSI_1252"));
+}
+
+void DxfWriter::tag(int code, std::string_view value) {
+    char buffer[16];
+    int n = 0;
+    char digits[16];
+    int c = code < 0 ? -code : code;
+    do {
+        digits[n++] = static_cast<char>('0' + c % 10);
+        c /= 10;
+    } while (c);
+    if (code < 0) digits[n++] = '-';
+    int len = 0;
+    for (int pad = n; pad < 3; ++pad)
+        buffer[len++] = ' ';
+    while (n)
+        buffer[len++] = digits[--n];
+    buffer[len++] = '\n';
+    out_.append(buffer, static_cast<std::size_t>(len));
+    if (legacyEncoding_ && !TextCodec::isAscii(value)) {
+        out_ += TextCodec::fromUtf8(value, codePage_);
+    } else {
+        out_.append(value);
+    }
+    out_ += '\n';
+}
+
+void DxfWriter::write() {
+    out_.reserve(db_.arena_.bytesUsed() + 1024 * 1024);
+    std::vector<std::string> order = db_.sectionOrder_;
+    for (const char* name : {"HEADER", "CLASSES", "TABLES", "BLOCKS", "ENTITIES", "OBJECTS"}) {
+        bool present = false;
+        for (const std::string& s : order)
+            present = present || s == name;
+        const bool needed =
+            std::string_view(name) != "CLASSES" && std::string_view(name) != "OBJECTS";
+        if (!present && (needed || db_.version() >= "AC1015")) order.push_back(name);
+    }
+    for (const std::string& name : order) {
+        if (name == "HEADER")
+            writeHeader();
+        else if (name == "TABLES")
+            writeTables();
+        else if (name == "BLOCKS")
+            writeBlocks();
+        else if (name == "ENTITIES")
+            writeEntities();
+        else if (name == "OBJECTS")
+            writeObjects();
+        else
+            writeRaw(name);
+    }
+    tag(0, "EOF");
+}
+
+void DxfWriter::writeHeader() {
+    tag(0, "SECTION");
+    tag(2, "HEADER");
+    for (const auto& variable : db_.header_.variables()) {
+        tag(9, variable.name);
+        for (const Tag& value : variable.values)
+            tag(value.code, value.value);
+    }
+    tag(0, "ENDSEC");
+}
+
+void DxfWriter::writeRaw(const std::string& name) {
+    tag(0, "SECTION");
+    tag(2, name);
+    for (const auto& section : db_.rawSections_)
+        if (section.name == name)
+            for (const Tag& t : section.tags)
+                tag(t.code, t.value);
+    tag(0, "ENDSEC");
+}
+
+void DxfWriter::writeObject(const DbObject& object) {
+    if (object.isErased()) return;
+    for (const Tag& t : object.tags())
+        tag(t.code, t.value);
+}
+
+void DxfWriter::writeEntity(const Entity& entity) {
+    if (entity.isErased()) return;
+    writeObject(entity);
+    for (const Entity* sub : entity.subEntities())
+        writeObject(*sub);
+    if (entity.seqend()) writeObject(*entity.seqend());
+}
+
+void DxfWriter::writeTables() {
+    tag(0, "SECTION");
+    tag(2, "TABLES");
+    for (const auto& table : db_.tables_) {
+        if (!table->isWritten()) continue;
+        if (table->head())
+            writeObject(*table->head());
+        else {
+            tag(0, "TABLE");
+            tag(2, table->name());
+        }
+        for (const DbObject* record : table->records())
+            writeObject(*record);
+        tag(0, "ENDTAB");
+    }
+    tag(0, "ENDSEC");
+}
+
+void DxfWriter::writeBlocks() {
+    tag(0, "SECTION");
+    tag(2, "BLOCKS");
+    for (const BlockRecord* block : db_.blocks()) {
+        if (!block->blockBegin()) continue;
+        writeObject(*block->blockBegin());
+        if (!block->isLayout() || (block->isPaperSpace() && block != db_.paperSpace()))
+            for (const Entity* entity : block->allEntities())
+                writeEntity(*entity);
+        if (block->blockEnd()) writeObject(*block->blockEnd());
+    }
+    tag(0, "ENDSEC");
+}
+
+void DxfWriter::writeEntities() {
+    tag(0, "SECTION");
+    tag(2, "ENTITIES");
+    for (const BlockRecord* block : {db_.modelSpace(), db_.paperSpace()})
+        if (block)
+            for (const Entity* entity : block->allEntities())
+                writeEntity(*entity);
+    tag(0, "ENDSEC");
+}
+
+void DxfWriter::writeObjects() {
+    tag(0, "SECTION");
+    tag(2, "OBJECTS");
+    for (const DbObject* object : db_.objects_)
+        writeObject(*object);
+    tag(0, "ENDSEC");
+}
+
+}  // namespace zvdb

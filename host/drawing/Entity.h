@@ -1,0 +1,47 @@
+#pragma once
+// A graphical entity of a block (model space, paper space or a block definition). Entities
+// that carry others (an INSERT its ATTRIBs, a POLYLINE its VERTEXes) hold them in order,
+// with the closing SEQEND.
+#include "DbObject.h"
+
+namespace zvdb {
+
+class BlockRecord;
+
+class Entity : public DbObject {
+public:
+    using DbObject::DbObject;
+
+    std::string_view layer() const { return text(8, "0"); }
+    void setLayer(std::string_view layer) { setText(8, layer, "AcDbEntity"); }
+    // ACI colour; 256 is "by layer", 0 "by block".
+    int color() const { return static_cast<int>(integer(62, 256)); }
+    void setColor(int color) { setInteger(62, color, "AcDbEntity"); }
+    std::string_view linetype() const { return text(6, "BYLAYER"); }
+    void setLinetype(std::string_view linetype) { setText(6, linetype, "AcDbEntity"); }
+    bool inPaperSpace() const { return integer(67) == 1; }
+    // The block record that holds the entity (for a sub-entity, its parent's).
+    BlockRecord* block() const;
+    // The INSERT of an ATTRIB, the POLYLINE of a VERTEX or SEQEND; else null.
+    Entity* parent() const { return parent_; }
+    // ATTRIBs or VERTEXes, erased ones included; see liveSubEntities().
+    const std::vector<Entity*>& subEntities() const { return subs_; }
+    std::vector<Entity*> liveSubEntities() const;
+    Entity* seqend() const { return seqend_; }
+    void erase() override;
+
+protected:
+    friend class Database;
+    friend class DxfLoader;
+    friend class BlockRecord;
+    friend class DeepCloner;
+    void addSubEntity(Entity* sub);
+    void setSeqend(Entity* seqend);
+
+private:
+    std::vector<Entity*> subs_;
+    Entity* seqend_ = nullptr;
+    Entity* parent_ = nullptr;
+};
+
+}  // namespace zvdb

@@ -1,0 +1,116 @@
+#include "TagValues.h"
+
+#include "StringArena.h"
+
+#include <charconv>
+#include <cmath>
+
+namespace zvdb {
+
+namespace {
+
+std::string_view trimmed(std::string_view text) {
+    while (!text.empty() && (text.front() == ' ' || text.front() == '\t'))
+        text.remove_prefix(1);
+    while (!text.empty() && (text.back() == ' ' || text.back() == '\t' || text.back() == '\r'))
+        text.remove_suffix(1);
+    if (!text.empty() && text.front() == '+') text.remove_prefix(1);
+    return text;
+}
+
+char upper(char c) {
+    return c >= 'a' && c <= 'z' ? static_cast<char>(c - 32) : c;
+}
+
+}  // namespace
+
+double TagValues::toReal(std::string_view text, double fallback) {
+    text = trimmed(text);
+    double value = fallback;
+    const auto result = std::from_chars(text.data(), text.data() + text.size(), value);
+    return result.ec == std::errc() ? value : fallback;
+}
+
+long long TagValues::toInteger(std::string_view text, long long fallback) {
+    text = trimmed(text);
+    long long value = fallback;
+    const auto result = std::from_chars(text.data(), text.data() + text.size(), value);
+    if (result.ec == std::errc()) return value;
+    // Some writers put reals where integers belong.
+    const double real = toReal(text, static_cast<double>(fallback));
+    return static_cast<long long>(std::llround(real));
+}
+
+std::uint64_t TagValues::toHandle(std::string_view text) {
+    text = trimmed(text);
+    std::uint64_t value = 0;
+    const auto result = std::from_chars(text.data(), text.data() + text.size(), value, 16);
+    return result.ec == std::errc() && result.ptr == text.data() + text.size() ? value : 0;
+}
+
+std::string TagValues::fromReal(double value) {
+    char buffer[40];
+    const auto result = std::to_chars(buffer, buffer + sizeof buffer, value);
+    std::string text(buffer, result.ptr);
+    if (text.find_first_of(".en") == std::string::npos) text += ".0";
+    return text;
+}
+
+std::string TagValues::fromInteger(long long value) {
+    return std::to_string(value);
+}
+
+std::string TagValues::fromHandle(std::uint64_t handle) {
+    char buffer[24];
+    const auto result = std::to_chars(buffer, buffer + sizeof buffer, handle, 16);
+    std::string text(buffer, result.ptr);
+    for (char& c : text)
+        c = upper(c);
+    return text;
+}
+
+bool TagValues::sameName(std::string_view a, std::string_view b) {
+    if (a.size() != b.size()) return false;
+    for (std::size_t i = 0; i < a.size(); ++i)
+        if (upper(a[i]) != upper(b[i])) return false;
+    return true;
+}
+
+std::string TagValues::upperName(std::string_view name) {
+    std::string text(name);
+    for (char& c : text)
+        c = upper(c);
+    return text;
+}
+
+TagListBuilder& TagListBuilder::text(int code, std::string_view value) {
+    tags_.push_back(Tag{static_cast<std::int16_t>(code), arena_.store(value)});
+    return *this;
+}
+
+TagListBuilder& TagListBuilder::real(int code, double value) {
+    return text(code, TagValues::fromReal(value));
+}
+
+TagListBuilder& TagListBuilder::integer(int code, long long value) {
+    return text(code, TagValues::fromInteger(value));
+}
+
+TagListBuilder& TagListBuilder::handle(int code, std::uint64_t value) {
+    return text(code, TagValues::fromHandle(value));
+}
+
+TagListBuilder& TagListBuilder::point(int code, const Point3& p, bool withZ) {
+    real(code, p.x);
+    real(code + 10, p.y);
+    if (withZ) real(code + 20, p.z);
+    return *this;
+}
+
+TagListBuilder& TagListBuilder::append(const std::vector<Tag>& tags) {
+    for (const Tag& tag : tags)
+        text(tag.code, tag.value);
+    return *this;
+}
+
+}  // namespace zvdb
