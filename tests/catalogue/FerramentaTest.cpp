@@ -1,0 +1,126 @@
+// The catalogue tool, called in the process and through "zvhost catalogue".
+#include "CatalogoTeste.h"
+
+#include "settings/CIRegistro.h"
+
+#include <QFile>
+#include <QProcess>
+
+namespace {
+
+class FerramentaTest : public CatalogoTeste {};
+
+TEST_F(FerramentaTest, CheckTellsEngineOpeningVersionAndUpgrades) {
+    UsarDemo();
+    QString saida, erros;
+    EXPECT_EQ(Ferramenta({"--check"}, &saida, &erros), 0) << erros.toStdString();
+    EXPECT_TRUE(saida.contains("engine: SQLITE\n"));
+    EXPECT_TRUE(saida.contains("connection: " + Pasta() + "/catalogo.db\n"));
+    EXPECT_TRUE(saida.contains("opens: yes\n"));
+    EXPECT_TRUE(saida.contains("schema version: 2022.0\n"));
+    EXPECT_TRUE(saida.contains("upgrades to run: none\n")) << saida.toStdString();
+
+    ASSERT_TRUE(Construir(Pasta() + "/antigo.db", {QString(ZV_TEST_DIR) + "/catalogo-antigo.sql"}));
+    CIRegistro::SetDBName("antigo.db");
+    saida.clear();
+    EXPECT_EQ(Ferramenta({"--check"}, &saida), 0);
+    EXPECT_TRUE(saida.contains("schema version: 2009.1\n"));
+    EXPECT_TRUE(saida.contains("  2: create table BDTIPOCOMP\n")) << saida.toStdString();
+    // Checking changes nothing.
+    saida.clear();
+    Ferramenta({"--check"}, &saida);
+    EXPECT_TRUE(saida.contains("  2: create table BDTIPOCOMP\n"));
+}
+
+TEST_F(FerramentaTest, CheckWithoutACatalogueSaysWhy) {
+    QString saida, erros;
+    EXPECT_EQ(Ferramenta({"--check"}, &saida, &erros), 1);
+    EXPECT_TRUE(erros.contains("no catalogue is configured")) << erros.toStdString();
+    UsarSqlite("falta.db", "1");
+    erros.clear();
+    EXPECT_EQ(Ferramenta({"--check"}, &saida, &erros), 1);
+    EXPECT_TRUE(erros.contains("the catalogue file does not exist: " + Pasta() + "/falta.db"));
+}
+
+TEST_F(FerramentaTest, SqlPrintsRowsAndLookupRunsTheReadersPath) {
+    UsarDemo("2");
+    QString saida, erros;
+    EXPECT_EQ(
+        Ferramenta({"--sql", "select TIPO_KEY, COMP_KEY from BDTIPOCOMP where TIPO_KEY = '17'"},
+                   &saida, &erros),
+        0);
+    EXPECT_EQ(saida, "TIPO_KEY\tCOMP_KEY\n17\t8001\n17\t8002\n");
+    saida.clear();
+    EXPECT_EQ(Ferramenta({"--lookup", "DescricaoComp", "7001"}, &saida), 0);
+    EXPECT_EQ(saida, "Switch-mode power supply 24 V DC 5 A\n");
+    saida.clear();
+    EXPECT_EQ(Ferramenta({"--lookup", "ListaComp", "7001", "1"}, &saida), 0);
+    EXPECT_EQ(saida, "S\n");
+    saida.clear();
+    EXPECT_EQ(Ferramenta({"--lookup", "AcessoriosDe", "8001"}, &saida), 0);
+    EXPECT_EQ(saida, "8003#3\n");
+    saida.clear();
+    EXPECT_EQ(Ferramenta({"--lookup", "ColunasCabo", "20004"}, &saida), 0);
+    EXPECT_TRUE(saida.contains("BLINDADO=S\n")) << saida.toStdString();
+    saida.clear();
+    erros.clear();
+    EXPECT_EQ(Ferramenta({"--lookup", "TipoComp", "4242"}, &saida, &erros), 0);
+    EXPECT_TRUE(erros.contains("empty answer"));
+    EXPECT_EQ(Ferramenta({"--lookup", "ListaComp", "7001"}, &saida, &erros), 2);
+    EXPECT_EQ(Ferramenta({"--lookup", "Nada", "1"}, &saida, &erros), 2);
+    EXPECT_EQ(Ferramenta({"--sql", "select NADA from BDZV"}, &saida, &erros), 1);
+    EXPECT_TRUE(Caixas().contains("SQL ERROR: "));
+}
+
+TEST_F(FerramentaTest, BuildReplacesTheFileOnlyWhenEveryStatementRan) {
+    const QString arquivo = Pasta() + "/catalogo.db";
+    ASSERT_TRUE(Construir(arquivo, ScriptsDemo()));
+    QFile quebrado(Pasta() + "/quebrado.sql");
+    ASSERT_TRUE(quebrado.open(QIODevice::WriteOnly));
+    quebrado.write("create table X (A varchar(2));\ninsert into NADA values (1);\n");
+    quebrado.close();
+    QFile antes(arquivo);
+    ASSERT_TRUE(antes.open(QIODevice::ReadOnly));
+    const QByteArray conteudo = antes.readAll();
+    antes.close();
+    QString saida, erros;
+    EXPECT_EQ(Ferramenta({"--build", arquivo, quebrado.fileName()}, &saida, &erros), 1);
+    EXPECT_TRUE(erros.contains("insert into NADA")) << erros.toStdString();
+    QFile depois(arquivo);
+    ASSERT_TRUE(depois.open(QIODevice::ReadOnly));
+    EXPECT_EQ(depois.readAll(), conteudo);
+    EXPECT_FALSE(QFile::exists(arquivo + ".part"));
+}
+
+TEST_F(FerramentaTest, SetWritesOnlyCatalogueSettings) {
+    QString saida, erros;
+    EXPECT_EQ(Ferramenta({"--set", "Database=SQLITE", "DBPass=s3gredo", "libLang=3"}, &saida), 0);
+    EXPECT_EQ(CIRegistro::Database(), "SQLITE");
+    EXPECT_EQ(CIRegistro::DBPass(), "s3gredo");
+    EXPECT_NE(CIRegistro::LerRegistro("DBPass"), "s3gredo");
+    EXPECT_EQ(CIRegistro::LibLang(), "3");
+    EXPECT_EQ(Ferramenta({"--set", "Database=MDB", "VersionIN=9"}, &saida, &erros), 2);
+    EXPECT_EQ(CIRegistro::Database(), "SQLITE");  // nothing written when one is refused
+    EXPECT_EQ(Ferramenta({}, &saida, &erros), 2);
+    EXPECT_TRUE(erros.contains("usage: zvhost catalogue"));
+}
+
+TEST_F(FerramentaTest, TheHostSubcommandRunsTheModulesTool) {
+    UsarDemo("3");
+    QProcess zvhost;
+    zvhost.setProgram(QString(ZV_BIN_DIR) + "/zvhost");
+    zvhost.setArguments({"catalogue", "--lookup", "DescricaoComp", "7001"});
+    zvhost.start();
+    ASSERT_TRUE(zvhost.waitForFinished(60000));
+    EXPECT_EQ(zvhost.exitCode(), 0) << zvhost.readAllStandardError().toStdString();
+    EXPECT_EQ(QString::fromUtf8(zvhost.readAllStandardOutput()), "Fuente conmutada 24 V CC 5 A\n");
+
+    // A failing statement shows its message box on stderr.
+    zvhost.setArguments({"catalogue", "--sql", "select NADA from BDZV"});
+    zvhost.start();
+    ASSERT_TRUE(zvhost.waitForFinished(60000));
+    EXPECT_EQ(zvhost.exitCode(), 1);
+    EXPECT_TRUE(zvhost.readAllStandardError().contains("SQL ERROR: "));
+}
+
+}  // namespace
