@@ -17,6 +17,10 @@ namespace {
 
 const Subcommand kSubcommands[] = {
     {"lisp", "lisp [FILE.lsp]   run a LISP file, or an interactive LISP prompt", runLispSubcommand},
+    {"catalogue",
+     "catalogue --check | --sql STATEMENT | --lookup OPERATION ARG...   the catalogue the\n"
+     "                    settings name: engine and schema, one statement, one look-up",
+     runCatalogueSubcommand},
 };
 
 const char* const kUsage =
