@@ -1,17 +1,30 @@
 #include "DrawingFiles.h"
 
 #include "drawing/Database.h"
+#include "drawing/DxfError.h"
+#include "drawing/DxfLoader.h"
+#include "drawing/DxfWriter.h"
 
 namespace zvhost {
 
 std::unique_ptr<zvdb::Database> readDrawing(const QString& path, QString* error) {
-    *error = QStringLiteral("%1: reading drawing files is not available in this build").arg(path);
+    try {
+        return zvdb::DxfLoader::loadFile(path.toStdString());
+    } catch (const zvdb::DxfError& e) {
+        *error = path + ": " + QString::fromStdString(e.what());
+    } catch (const std::bad_alloc&) {
+        *error = path + ": not enough memory to read the drawing";
+    }
     return nullptr;
 }
 
 bool writeDrawing(zvdb::Database& database, const QString& path, QString* error) {
-    Q_UNUSED(database);
-    *error = QStringLiteral("%1: writing drawing files is not available in this build").arg(path);
+    try {
+        zvdb::DxfWriter::saveFile(database, path.toStdString());
+        return true;
+    } catch (const zvdb::DxfError& e) {
+        *error = QString::fromStdString(e.what());
+    }
     return false;
 }
 

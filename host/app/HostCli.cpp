@@ -17,6 +17,8 @@ namespace {
 
 const Subcommand kSubcommands[] = {
     {"lisp", "lisp [FILE.lsp]   run a LISP file, or an interactive LISP prompt", runLispSubcommand},
+    {"dxf-info", "dxf-info DRAWING  version, entity counts, layers, blocks and dictionaries",
+     runDxfInfoSubcommand},
     {"catalogue",
      "catalogue --check | --sql STATEMENT | --lookup OPERATION ARG...   the catalogue the\n"
      "                    settings name: engine and schema, one statement, one look-up",

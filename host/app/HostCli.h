@@ -27,6 +27,7 @@ int runHost(const QStringList& args, QTextStream& out, QTextStream& err, QTextSt
 
 // Subcommands; each lives in a file of its own and is listed in HostCli.cpp.
 int runLispSubcommand(CliContext& context);
+int runDxfInfoSubcommand(CliContext& context);
 int runCatalogueSubcommand(CliContext& context);
 
 }  // namespace zvhost
