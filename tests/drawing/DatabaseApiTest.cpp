@@ -1,0 +1,374 @@
+// The database API that the CAD facade uses: layers, blocks and references, extended data,
+// dictionaries, handles, erasing, cloning and extents. Drawings changed through it are
+// written and checked by ezdxf (audit and content).
+#include "PythonChecker.h"
+#include "drawing/Attribute.h"
+#include "drawing/BlockRecord.h"
+#include "drawing/BlockReference.h"
+#include "drawing/Database.h"
+#include "drawing/DeepCloner.h"
+#include "drawing/Dictionary.h"
+#include "drawing/DxfLoader.h"
+#include "drawing/DxfWriter.h"
+#include "drawing/Extents.h"
+#include "drawing/LayerRecord.h"
+#include "drawing/Polyline.h"
+#include "drawing/TextEntity.h"
+#include "drawing/XRecord.h"
+
+#include <gtest/gtest.h>
+
+#include <QJsonArray>
+#include <QJsonDocument>
+#include <QJsonObject>
+
+using namespace zvdb;
+using zvtest::PythonChecker;
+
+namespace {
+
+// Writes the database and answers what ezdxf sees in the file.
+QJsonObject inspect(Database& database) {
+    const QString path = PythonChecker::scratchFolder() + "/drawing.dxf";
+    DxfWriter::saveFile(database, path.toStdString());
+    QString output;
+    const int status = PythonChecker::run("inspect_dxf.py", {path}, &output);
+    EXPECT_EQ(status, 0) << output.toStdString();
+    return QJsonDocument::fromJson(output.toUtf8()).object();
+}
+
+std::unique_ptr<Database> reloaded(Database& database) {
+    return DxfLoader::load(DxfWriter::toText(database));
+}
+
+Tag tag(int code, std::string_view value) {
+    return Tag{static_cast<std::int16_t>(code), value};
+}
+
+class DatabaseApi : public ::testing::Test {
+protected:
+    void SetUp() override {
+        const QString missing = PythonChecker::missing();
+        ASSERT_TRUE(missing.isEmpty()) << missing.toStdString();
+    }
+    Database db;
+};
+
+TEST_F(DatabaseApi, NewDrawingIsAnEmptyR2013DrawingThatEzdxfAccepts) {
+    EXPECT_EQ(db.version(), "AC1027");
+    ASSERT_NE(db.layer("0"), nullptr);
+    ASSERT_NE(db.modelSpace(), nullptr);
+    ASSERT_NE(db.paperSpace(), nullptr);
+    EXPECT_EQ(db.modelSpace()->entityCount(), 0u);
+    ASSERT_NE(db.namedObjects(), nullptr);
+    EXPECT_NE(db.namedObjects()->getDictionary("ACAD_GROUP"), nullptr);
+    const QJsonObject seen = inspect(db);
+    EXPECT_EQ(seen["version"].toString(), "AC1027");
+    EXPECT_TRUE(seen["modelspace"].toArray().isEmpty());
+}
+
+TEST_F(DatabaseApi, LayersKeepTheirStatesAndExtendedData) {
+    LayerRecord* page = db.createLayer("PAGE$1");
+    EXPECT_EQ(db.createLayer("page$1"), page) << "names are found without regard to case";
+    db.createLayer("PAGE$1$SELO")->setFrozen(true);
+    db.createLayer("HIDDEN")->setOff(true);
+    db.createLayer("LOCKED")->setLocked(true);
+    const Tag mark[] = {tag(1000, "CAPA")};
+    page->setXData("KVR_ZV_CAPA", mark);
+    EXPECT_TRUE(db.isApplicationRegistered("KVR_ZV_CAPA"));
+    EXPECT_TRUE(db.setCurrentLayer("PAGE$1"));
+    EXPECT_FALSE(db.setCurrentLayer("NO SUCH LAYER"));
+    EXPECT_EQ(db.currentLayer(), "PAGE$1");
+    EXPECT_TRUE(db.layer("PAGE$1$SELO")->isFrozen());
+    db.layer("PAGE$1$SELO")->setFrozen(false);
+    EXPECT_FALSE(db.layer("PAGE$1$SELO")->isFrozen());
+    db.layer("PAGE$1$SELO")->setFrozen(true);
+    EXPECT_TRUE(db.layer("HIDDEN")->isOff());
+    EXPECT_EQ(db.layer("HIDDEN")->color(), 7);
+
+    const QJsonObject layers = inspect(db)["layers"].toObject();
+    EXPECT_TRUE(layers["PAGE$1$SELO"].toObject()["frozen"].toBool());
+    EXPECT_TRUE(layers["HIDDEN"].toObject()["off"].toBool());
+    EXPECT_TRUE(layers["LOCKED"].toObject()["locked"].toBool());
+    EXPECT_FALSE(layers["PAGE$1"].toObject()["frozen"].toBool());
+    EXPECT_EQ(layers["PAGE$1"]
+                  .toObject()["xdata"]
+                  .toObject()["KVR_ZV_CAPA"]
+                  .toArray()[1]
+                  .toArray()[1]
+                  .toString(),
+              "CAPA");
+    std::vector<std::string> names;
+    for (LayerRecord* layer : db.layers())
+        names.emplace_back(layer->name());
+    EXPECT_EQ(names, (std::vector<std::string>{"0", "PAGE$1", "PAGE$1$SELO", "HIDDEN", "LOCKED"}));
+}
+
+// A block with two attribute definitions, referenced twice in model space.
+BlockReference* insertTerminal(Database& db, const Point3& at, std::string_view number) {
+    BlockRecord* block = db.block("BORNE");
+    if (!block) {
+        block = db.createBlock("BORNE", {1, 1, 0});
+        block->addLine({0, 0, 0}, {4, 0, 0});
+        block->addAttributeDefinition("REGUA", "Strip", "X1", {0, 2, 0}, 2.5);
+        block->addAttributeDefinition("NUMERO", "Number", "", {0, 5, 0}, 2.5);
+    }
+    BlockReference* reference =
+        db.modelSpace()->addBlockReference(*block, at, {2, 2, 1}, 90, "PAGE");
+    for (Attribute* definition : block->attributeDefinitions())
+        reference->addAttributeFromDefinition(*definition);
+    reference->attribute("numero")->setTextValue(number);
+    return reference;
+}
+
+TEST_F(DatabaseApi, BlockReferencesCarryAttributesFromTheirDefinitions) {
+    db.createLayer("PAGE");
+    BlockReference* first = insertTerminal(db, {10, 20, 0}, "1");
+    insertTerminal(db, {50, 20, 0}, "2");
+    ASSERT_EQ(first->attributes().size(), 2u);
+    EXPECT_EQ(first->attribute("REGUA")->textValue(), "X1");
+    EXPECT_EQ(first->attribute("Numero")->textValue(), "1");
+    EXPECT_EQ(first->attribute("NOPE"), nullptr);
+    ASSERT_NE(first->seqend(), nullptr);
+    EXPECT_EQ(first->attributes()[0]->ownerHandle(), first->handle());
+    EXPECT_EQ(first->seqend()->ownerHandle(), first->handle());
+    // Block (1,2) lands at base-relative (0,1), scaled by 2, turned by 90 degrees.
+    const Point3 p = first->attribute("REGUA")->position();
+    EXPECT_NEAR(p.x, 10 - 2, 1e-9);
+    EXPECT_NEAR(p.y, 20 - 2, 1e-9);
+    EXPECT_EQ(db.block("BORNE")->attributeDefinitions()[0]->prompt(), "Strip");
+
+    const QJsonArray model = inspect(db)["modelspace"].toArray();
+    ASSERT_EQ(model.size(), 2);
+    const QJsonObject seen = model[0].toObject();
+    EXPECT_EQ(seen["name"].toString(), "BORNE");
+    EXPECT_EQ(seen["layer"].toString(), "PAGE");
+    const QJsonArray attribs = seen["attribs"].toArray();
+    ASSERT_EQ(attribs.size(), 2);
+    EXPECT_EQ(attribs[0].toArray()[0].toString(), "REGUA");
+    EXPECT_EQ(attribs[1].toArray()[1].toString(), "1");
+    EXPECT_TRUE(seen["seqend"].toBool());
+}
+
+TEST_F(DatabaseApi, ExtendedDataKeepsApplicationsAndRepeatedGroups) {
+    Entity* wire = db.modelSpace()->addLwPolyline({{0, 0, 0}, {5, 0, 0}}, false);
+    const Tag a[] = {tag(1000, "W1"), tag(1070, "3")};
+    const Tag b[] = {tag(1000, "first")};
+    const Tag c[] = {tag(1000, "second")};
+    wire->setXData("KVR_ZV_WIRE", a);
+    wire->setXData("ZV_OTHER", b);
+    wire->addXData("ZV_OTHER", c);
+    EXPECT_EQ(wire->xdataGroups("zv_other").size(), 2u);
+    EXPECT_EQ(wire->xdata("ZV_OTHER")[0].value, "first");
+    const Tag replaced[] = {tag(1000, "changed")};
+    wire->setXData("ZV_OTHER", replaced);
+    ASSERT_EQ(wire->xdataGroups("ZV_OTHER").size(), 2u);
+    EXPECT_EQ(wire->xdataGroups("ZV_OTHER")[0][0].value, "changed");
+    EXPECT_EQ(wire->xdataGroups("ZV_OTHER")[1][0].value, "second");
+    EXPECT_EQ(wire->xdata("KVR_ZV_WIRE").size(), 2u);
+    EXPECT_EQ(wire->xdata("MISSING").size(), 0u);
+
+    auto again = reloaded(db);
+    Entity* read = again->entityByHandle(wire->handle());
+    ASSERT_NE(read, nullptr);
+    EXPECT_EQ(read->xdataApplications(),
+              (std::vector<std::string_view>{"KVR_ZV_WIRE", "ZV_OTHER", "ZV_OTHER"}));
+    EXPECT_TRUE(read->removeXData("ZV_OTHER"));
+    EXPECT_FALSE(read->hasXData("ZV_OTHER"));
+    EXPECT_TRUE(read->hasXData("kvr_zv_wire"));
+
+    const QJsonObject seen = inspect(db);
+    const QJsonObject xdata = seen["modelspace"].toArray()[0].toObject()["xdata"].toObject();
+    EXPECT_EQ(xdata["KVR_ZV_WIRE"].toArray()[1].toArray()[1].toString(), "W1");
+    EXPECT_TRUE(seen["appids"].toArray().contains("ZV_OTHER"));
+}
+
+TEST_F(DatabaseApi, DictionariesAndXrecordsByPath) {
+    const std::vector<std::string> none = {"ZV_DATA_MGR", "CELayoutRotasFios"};
+    EXPECT_EQ(db.dictionaryAt(none, false), nullptr);
+    Dictionary* cls = db.dictionaryAt(none, true);
+    ASSERT_NE(cls, nullptr);
+    EXPECT_EQ(db.dictionaryAt(none, false), cls);
+    const std::vector<std::string> path = {"ZV_DATA_MGR", "CELayoutRotasFios", "41", "strKeyFio"};
+    XRecord* record = db.xrecordAt(path, true);
+    ASSERT_NE(record, nullptr);
+    const Tag data[] = {tag(1000, "W41")};
+    record->setData(data);
+    EXPECT_EQ(db.xrecordAt(path, false)->data()[0].value, "W41");
+    cls->getOrCreateDictionary("77")->getOrCreateXRecord("strKeyFio");
+    EXPECT_EQ(cls->size(), 2u);
+    cls->getDictionary("77")->erase();
+    EXPECT_EQ(cls->size(), 1u) << "an erased dictionary leaves its parent";
+    EXPECT_EQ(cls->get("77"), nullptr);
+
+    Entity* line = db.modelSpace()->addLine({0, 0, 0}, {1, 1, 0});
+    Dictionary* xdict = line->getOrCreateExtensionDictionary();
+    EXPECT_EQ(line->extensionDictionary(), xdict);
+    EXPECT_EQ(xdict->ownerHandle(), line->handle());
+    xdict->getOrCreateXRecord("NOTE")->setData(data);
+
+    const QJsonObject seen = inspect(db);
+    const QJsonObject tree = seen["dictionaries"].toObject()["ZV_DATA_MGR"].toObject();
+    const QJsonArray stored =
+        tree["CELayoutRotasFios"].toObject()["41"].toObject()["strKeyFio"].toArray();
+    ASSERT_EQ(stored.size(), 1);
+    EXPECT_EQ(stored[0].toArray()[1].toString(), "W41");
+    EXPECT_FALSE(tree["CELayoutRotasFios"].toObject().contains("77"));
+    const QJsonObject lineSeen = seen["modelspace"].toArray()[0].toObject();
+    EXPECT_TRUE(lineSeen["xdict"].toObject().contains("NOTE"));
+}
+
+TEST_F(DatabaseApi, HandlesAreUniqueStableAndErasedObjectsVanish) {
+    db.createLayer("PAGE");
+    BlockReference* reference = insertTerminal(db, {0, 0, 0}, "1");
+    Entity* line = db.modelSpace()->addLine({0, 0, 0}, {1, 0, 0});
+    const std::uint64_t handle = line->handle();
+    EXPECT_EQ(db.objectByHandle(handle), line);
+    EXPECT_GE(db.handleSeed(), handle + 1);
+    Attribute* attribute = reference->attributes()[0];
+    const std::uint64_t attributeHandle = attribute->handle();
+    reference->erase();
+    line->erase();
+    EXPECT_EQ(db.objectByHandle(handle), nullptr);
+    EXPECT_EQ(db.objectByHandle(attributeHandle), nullptr) << "attributes go with their reference";
+    EXPECT_EQ(db.modelSpace()->entityCount(), 0u);
+
+    auto again = reloaded(db);
+    EXPECT_EQ(again->modelSpace()->entityCount(), 0u);
+    EXPECT_EQ(again->objectByHandle(handle), nullptr);
+    EXPECT_GE(again->handleSeed(), db.handleSeed());
+    Entity* fresh = again->modelSpace()->addPoint({1, 1, 0});
+    EXPECT_GE(fresh->handle(), db.handleSeed()) << "handles are never reused";
+}
+
+TEST_F(DatabaseApi, DeepCloneBringsBlocksLayersAndTranslatesHandles) {
+    Database source;
+    source.createLayer("SYMBOLS")->setColor(3);
+    BlockRecord* inner = source.createBlock("INNER");
+    inner->addCircle({0, 0, 0}, 1, "SYMBOLS");
+    BlockRecord* outer = source.createBlock("OUTER", {5, 5, 0});
+    outer->addBlockReference(*inner, {1, 1, 0});
+    outer->addAttributeDefinition("TAG", "Tag", "K1", {0, 0, 0}, 1.0);
+    Entity* marked = outer->addLine({0, 0, 0}, {2, 0, 0}, "SYMBOLS");
+    const Tag item[] = {tag(1000, "kept")};
+    marked->setXData("KVR_ZV", item);
+    marked->getOrCreateExtensionDictionary()->getOrCreateXRecord("R");
+
+    DeepCloner cloner(source, db);
+    BlockRecord* copy = cloner.cloneBlock(*outer);
+    ASSERT_NE(copy, nullptr);
+    EXPECT_EQ(copy->name(), "OUTER");
+    EXPECT_EQ(copy->basePoint(), (Point3{5, 5, 0}));
+    ASSERT_NE(db.block("INNER"), nullptr) << "nested blocks come along";
+    ASSERT_NE(db.layer("SYMBOLS"), nullptr);
+    EXPECT_EQ(db.layer("SYMBOLS")->color(), 3);
+    const auto entities = copy->entities();
+    ASSERT_EQ(entities.size(), 3u);
+    for (Entity* entity : entities)
+        EXPECT_EQ(entity->ownerHandle(), copy->handle());
+    const std::uint64_t lineCopy = cloner.translated(marked->handle());
+    ASSERT_NE(lineCopy, 0u);
+    Entity* copiedLine = db.entityByHandle(lineCopy);
+    ASSERT_NE(copiedLine, nullptr);
+    EXPECT_EQ(copiedLine->xdata("KVR_ZV")[0].value, "kept");
+    ASSERT_NE(copiedLine->extensionDictionary(), nullptr);
+    EXPECT_EQ(copiedLine->extensionDictionary()->ownerHandle(), lineCopy);
+    EXPECT_NE(copiedLine->extensionDictionary()->getXRecord("R"), nullptr);
+    EXPECT_EQ(cloner.cloneBlock(*outer), copy) << "a block already there is not copied again";
+
+    BlockReference* placed = db.modelSpace()->addBlockReference(*copy, {0, 0, 0});
+    placed->addAttributeFromDefinition(*copy->attributeDefinitions()[0]);
+    const QJsonObject seen = inspect(db);
+    EXPECT_EQ(seen["blocks"].toObject()["OUTER"].toArray().size(), 3);
+    EXPECT_EQ(
+        seen["modelspace"].toArray()[0].toObject()["attribs"].toArray()[0].toArray()[1].toString(),
+        "K1");
+}
+
+TEST_F(DatabaseApi, ModelSpaceOfAFileBecomesABlock) {
+    Database file;
+    file.modelSpace()->addLine({0, 0, 0}, {3, 0, 0});
+    file.modelSpace()->addCircle({1, 1, 0}, 0.5);
+    DeepCloner cloner(file, db);
+    BlockRecord* block = cloner.cloneModelSpaceAsBlock("SIMBOLO");
+    ASSERT_NE(block, nullptr);
+    EXPECT_EQ(block->entityCount(), 2u);
+    EXPECT_EQ(db.modelSpace()->entityCount(), 0u);
+    const QJsonObject seen = inspect(db);
+    EXPECT_EQ(seen["blocks"].toObject()["SIMBOLO"].toArray().size(), 2);
+}
+
+TEST_F(DatabaseApi, ExtentsOfEntitiesAndBlocks) {
+    BlockRecord* ms = db.modelSpace();
+    BoundingBox box = Extents::ofEntity(*ms->addLine({1, 2, 0}, {-3, 5, 0}), false);
+    EXPECT_EQ(box.min, (Point3{-3, 2, 0}));
+    EXPECT_EQ(box.max, (Point3{1, 5, 0}));
+    box = Extents::ofEntity(*ms->addCircle({10, 10, 0}, 2), false);
+    EXPECT_EQ(box.min, (Point3{8, 8, 0}));
+    box = Extents::ofEntity(*ms->addLwPolyline({{0, 0, 0}, {4, -1, 0}, {2, 7, 0}}, true), false);
+    EXPECT_EQ(box.max, (Point3{4, 7, 0}));
+    box = Extents::ofEntity(*ms->addArc({0, 0, 0}, 1, 0, 90), false);
+    EXPECT_NEAR(box.min.x, 0, 1e-12);
+    EXPECT_NEAR(box.max.y, 1, 1e-12);
+
+    BlockRecord* block = db.createBlock("SQUARE", {1, 1, 0});
+    block->addLine({1, 1, 0}, {3, 1, 0});
+    block->addLine({3, 1, 0}, {3, 3, 0});
+    const BoundingBox own = Extents::ofBlock(*block);
+    EXPECT_EQ(own.min, (Point3{1, 1, 0}));
+    EXPECT_EQ(own.max, (Point3{3, 3, 0}));
+    BlockReference* reference = ms->addBlockReference(*block, {10, 0, 0}, {2, 2, 1}, 90);
+    box = Extents::ofEntity(*reference, false);
+    EXPECT_NEAR(box.min.x, 6, 1e-9);
+    EXPECT_NEAR(box.max.x, 10, 1e-9);
+    EXPECT_NEAR(box.min.y, 0, 1e-9);
+    EXPECT_NEAR(box.max.y, 4, 1e-9);
+    const Point3 moved = reference->transform().apply({3, 1, 0});
+    EXPECT_NEAR(moved.x, 10, 1e-9);
+    EXPECT_NEAR(moved.y, 4, 1e-9);
+    EXPECT_TRUE(Extents::ofEntity(*ms->addMText({0, 0, 0}, 1, "abc"), false).max.x > 0);
+}
+
+TEST_F(DatabaseApi, TextsPolylinesAndLongMText) {
+    BlockRecord* ms = db.modelSpace();
+    std::string longText;
+    for (int i = 0; i < 120; ++i)
+        longText += "ção-";
+    TextEntity* mtext = ms->addMText({0, 0, 0}, 2.5, longText);
+    EXPECT_EQ(mtext->content(), longText);
+    for (const Tag& t : mtext->tags()) {
+        if (t.code == 1 || t.code == 3) {
+            EXPECT_LE(t.value.size(), 250u);
+        }
+    }
+    TextEntity* text = ms->addText({1, 1, 0}, 2, "Página 1");
+    text->setContent("Página 2");
+    Polyline* lw = ms->addLwPolyline({{0, 0, 0}, {1, 0, 0}}, false);
+    lw->setVertices({{0, 0, 0}, {2, 0, 0}, {2, 2, 0}});
+    lw->setClosed(true);
+    EXPECT_EQ(lw->vertices().size(), 3u);
+    EXPECT_TRUE(lw->isClosed());
+
+    const QJsonArray model = inspect(db)["modelspace"].toArray();
+    ASSERT_EQ(model.size(), 3);
+    EXPECT_EQ(model[0].toObject()["text"].toString().toStdString(), longText);
+    EXPECT_EQ(model[1].toObject()["text"].toString(), QString("Página 2"));
+    EXPECT_EQ(model[2].toObject()["points"].toArray().size(), 3);
+}
+
+TEST_F(DatabaseApi, OldVersionsAreWrittenInTheirCodePage) {
+    db.setVersion("AC1015");
+    db.modelSpace()->addText({0, 0, 0}, 1, "Ação Ω");
+    const std::string text = DxfWriter::toText(db);
+    EXPECT_NE(text.find("A\xE7\xE3o \\U+03A9"), std::string::npos) << "cp1252 bytes and an escape";
+    auto again = DxfLoader::load(text);
+    const auto entities = again->modelSpace()->entities();
+    ASSERT_EQ(entities.size(), 1u);
+    EXPECT_EQ(static_cast<TextEntity*>(entities[0])->content(), "Ação Ω");
+    const QJsonObject seen = inspect(db);
+    // ezdxf leaves the escape as it stands in TEXT
+    EXPECT_EQ(seen["modelspace"].toArray()[0].toObject()["text"].toString(),
+              QString("Ação \\U+03A9"));
+}
+
+}  // namespace
