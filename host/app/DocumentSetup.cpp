@@ -1,12 +1,20 @@
 #include "DocumentSetup.h"
 
+#include "DocumentLisp.h"
 #include "HostDocument.h"
+
+#include <QFileInfo>
 
 namespace zvhost {
 
 void setUpDocument(HostDocument& document) {
-    // The LISP environment and the product's functions are installed here as they land.
-    Q_UNUSED(document);
+    // The LISP environment prints on the document's command line; load and findfile look
+    // in the drawing's folder after the current one.
+    auto lisp = std::make_unique<DocumentLisp>(
+        [&document](const QString& text) { document.printMessage(text); });
+    if (!document.fileName().isEmpty())
+        lisp->interpreter().searchPaths() << QFileInfo(document.fileName()).absolutePath();
+    document.setLisp(std::move(lisp));
 }
 
 }  // namespace zvhost

@@ -1,10 +1,94 @@
+// zvhost lisp [FILE.lsp]: runs a LISP file in a new document, or reads, evaluates and
+// prints expressions from the standard input until it ends. An expression may span lines;
+// an error is reported and the session goes on; Ctrl-C cancels a running evaluation.
+#include "Application.h"
+#include "ConsoleUserInterface.h"
+#include "DocumentLisp.h"
 #include "HostCli.h"
+#include "HostDocument.h"
+#include "lisp/Printer.h"
+
+#include <QFileInfo>
+
+#include <atomic>
+#include <csignal>
+
+#include <unistd.h>
 
 namespace zvhost {
 
+namespace {
+
+std::atomic<zvlisp::Interpreter*> interrupted{nullptr};
+
+void onInterrupt(int) {
+    if (zvlisp::Interpreter* lisp = interrupted.load()) lisp->requestCancel();
+}
+
+// Evaluates what was typed; false when the text needs more lines to be complete (at the
+// end of the input, `last`, it is reported as it is).
+bool evaluateTyped(zvlisp::Interpreter& lisp, const QString& text, QTextStream& out,
+                   bool last = false) {
+    zvlisp::Value forms;
+    try {
+        forms = lisp.readAll(text);
+    } catch (zvlisp::LispError& error) {
+        if (error.incompleteInput && !last) return false;
+        lisp.report(error);
+        return true;
+    }
+    for (const zvlisp::Value* cell = &forms; cell->isCons(); cell = &cell->asCons()->cdr) {
+        zvlisp::Value result;
+        if (!lisp.evaluateForms(zvlisp::Value::cons(cell->asCons()->car, zvlisp::Value()), &result))
+            continue;
+        if (result.isSymbol() && result.asSymbol()->name.isEmpty()) continue;  // (princ)
+        out << zvlisp::Printer::prin1(result) << "\n";
+    }
+    out.flush();
+    return true;
+}
+
+int repl(zvlisp::Interpreter& lisp, CliContext& context) {
+    const bool terminal = isatty(STDIN_FILENO);
+    interrupted = &lisp;
+    auto previous = std::signal(SIGINT, onInterrupt);
+    QString pending;
+    for (;;) {
+        if (terminal) {
+            context.out << (pending.isEmpty() ? "_$ " : "   ");
+            context.out.flush();
+        }
+        const QString line = context.in.readLine();
+        if (line.isNull()) break;
+        pending += line + "\n";
+        if (evaluateTyped(lisp, pending, context.out)) pending.clear();
+    }
+    if (!pending.trimmed().isEmpty()) evaluateTyped(lisp, pending, context.out, true);
+    std::signal(SIGINT, previous);
+    interrupted = nullptr;
+    return kExitOk;
+}
+
+}  // namespace
+
 int runLispSubcommand(CliContext& context) {
-    context.err << "zvhost: LISP is not available in this build\n";
-    return kExitFailure;
+    if (context.args.size() > 1 || (context.args.size() == 1 && context.args[0].startsWith('-'))) {
+        context.err << "usage: zvhost lisp [FILE.lsp]\n";
+        return kExitUsage;
+    }
+    Application app(std::make_unique<ConsoleUserInterface>(context.out, context.err, false),
+                    context.out);
+    HostDocument* document = app.openDocument(QString());
+    auto* lisp = dynamic_cast<DocumentLisp*>(document->lisp());
+    if (!lisp) {
+        context.err << "zvhost: LISP is not available in this build\n";
+        return kExitFailure;
+    }
+    if (context.args.isEmpty()) return repl(lisp->interpreter(), context);
+    const QString path = QFileInfo(context.args[0]).absoluteFilePath();
+    const bool ok = lisp->interpreter().evaluate("(load " + zvlisp::Printer::quoted(path) + ")");
+    context.out.flush();
+    return ok ? kExitOk : kExitFailure;
 }
 
 }  // namespace zvhost

@@ -271,9 +271,10 @@ Value Interpreter::evalText(const QString& text, const QString& file) {
     return result;
 }
 
-bool Interpreter::evaluate(const QString& text, Value* result) {
+template <typename Body>
+bool Interpreter::topLevel(Body body, Value* result) {
     try {
-        Value last = evalText(text);
+        Value last = body();
         if (result) *result = std::move(last);
         return true;
     } catch (LispError& error) {
@@ -281,6 +282,27 @@ bool Interpreter::evaluate(const QString& text, Value* result) {
         cancel_.store(false, std::memory_order_relaxed);
         return false;
     }
+}
+
+bool Interpreter::evaluate(const QString& text, Value* result) {
+    return topLevel([&] { return evalText(text); }, result);
+}
+
+bool Interpreter::applyTopLevel(const Value& function, Args args, Value* result) {
+    return topLevel([&] { return apply(function, args); }, result);
+}
+
+bool Interpreter::evaluateForms(const Value& forms, Value* result) {
+    return topLevel([&] { return evalBody(forms); }, result);
+}
+
+Value Interpreter::readAll(const QString& text) {
+    Reader reader(symbols_, text);
+    ListBuilder forms;
+    Value form;
+    while (reader.next(form))
+        forms.add(std::move(form));
+    return forms.take();
 }
 
 Value Interpreter::load(const QString& name) {
@@ -314,7 +336,8 @@ bool Interpreter::callErrorHandler(const QString& message) {
         const Value text = Value::string(message);
         invoke(toFunction(handler), Args(&text, 1));
     } catch (LispError& nested) {
-        write("; error: " + nested.message() + "\n");
+        if (!nested.handled)
+            write((atLineStart_ ? "; error: " : "\n; error: ") + nested.message() + "\n");
     }
     maxDepth_ -= 200;
     inErrorHandler_ = false;
@@ -333,7 +356,7 @@ void Interpreter::fail(const QString& message) {
 void Interpreter::report(LispError& error) {
     error.handled = true;
     if (callErrorHandler(error.message())) return;
-    write("; error: " + error.message() + "\n");
+    write((atLineStart_ ? "; error: " : "\n; error: ") + error.message() + "\n");
     const QString file = error.file.isEmpty() ? whereFile_ : error.file;
     const int line = error.file.isEmpty() ? whereLine_ : error.line;
     if (!file.isEmpty()) write("; in " + file + ", line " + QString::number(line) + "\n");
@@ -386,7 +409,9 @@ Value Interpreter::fromVector(const std::vector<Value>& items) {
 }
 
 void Interpreter::write(const QString& text) {
-    if (output_ && !text.isEmpty()) output_(text);
+    if (text.isEmpty()) return;
+    atLineStart_ = text.endsWith('\n');
+    if (output_) output_(text);
 }
 
 }  // namespace zvlisp

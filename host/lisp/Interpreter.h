@@ -68,8 +68,14 @@ public:
     // As evalText, but an error is reported (by *error* or on the command line) and
     // answered with false. The last value goes to `result`.
     bool evaluate(const QString& text, Value* result = nullptr);
+    // apply() with errors reported as evaluate() does; false after an error.
+    bool applyTopLevel(const Value& function, Args args, Value* result = nullptr);
+    // The forms of a list evaluated as evaluate() does, errors reported.
+    bool evaluateForms(const Value& forms, Value* result = nullptr);
     // The first form of the text, not evaluated; nil for blank text.
     Value read(const QString& text);
+    // All forms of the text as a list, not evaluated; a malformed text throws, unreported.
+    Value readAll(const QString& text);
     // Loads a LISP file found by the .lsp search; throws when missing or failing.
     Value load(const QString& name);
     // Turns what apply accepts into a function object, or fails with "bad function".
@@ -133,6 +139,8 @@ public:
 private:
     friend class DepthGuard;
     Value evalCall(const Value& form);
+    template <typename Body>
+    bool topLevel(Body body, Value* result);
     Value invoke(const Value& function, Args args);
     Value callUser(UserFunction& function, Args args);
     bool callErrorHandler(const QString& message);
@@ -145,6 +153,7 @@ private:
     Symbol* lambda_ = nullptr;
     Symbol* errorHandler_ = nullptr;
     std::function<void(const QString&)> output_;
+    bool atLineStart_ = true;  // errors begin on a line of their own
     QStringList searchPaths_;
     QStringList loading_;  // folders of the files being loaded, innermost last
     // The file and line of the top-level form being evaluated, for error messages.

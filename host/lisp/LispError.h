@@ -16,6 +16,8 @@ public:
     bool handled = false;
     // Cancellation goes through vl-catch-all-apply to the top level.
     bool uncatchable = false;
+    // The text ended inside a list, string or comment: more text could complete it.
+    bool incompleteInput = false;
     // Where the top-level form that failed was read, when it came from a file.
     QString file;
     int line = 0;

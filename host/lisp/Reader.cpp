@@ -67,6 +67,7 @@ void Reader::fail(const QString& message, bool atEnd) {
     LispError error(message);
     error.file = file_;
     error.line = line_;
+    error.incompleteInput = atEnd;
     throw error;
 }
 

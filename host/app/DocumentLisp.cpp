@@ -1,0 +1,65 @@
+#include "DocumentLisp.h"
+
+#include "LispChains.h"
+
+namespace zvhost {
+
+namespace {
+// Texts remembered before the memory starts over; a run uses a handful.
+constexpr int kMaxReadTexts = 512;
+}  // namespace
+
+DocumentLisp::DocumentLisp(std::function<void(const QString&)> output) {
+    lisp_.setOutput(std::move(output));
+}
+
+int DocumentLisp::lispGetSymbol(const QString& name, zvsdk::ResultBuffer** value) {
+    if (value) *value = nullptr;
+    const zvlisp::Symbol* symbol = lisp_.findSymbol(name);
+    if (!symbol || !symbol->assigned || !value) return zvsdk::RTERROR;
+    try {
+        *value = LispChains::toChain(symbol->value);
+    } catch (const zvlisp::LispError&) {
+        return zvsdk::RTERROR;
+    }
+    return zvsdk::RTNORM;
+}
+
+int DocumentLisp::lispPutSymbol(const QString& name, const zvsdk::ResultBuffer* value) {
+    if (name.isEmpty()) return zvsdk::RTERROR;
+    lisp_.setGlobal(name, LispChains::value(lisp_, value));
+    return zvsdk::RTNORM;
+}
+
+zvsdk::ResultBuffer* DocumentLisp::lispInvoke(const zvsdk::ResultBuffer* call) {
+    if (!call || call->restype != zvsdk::RTSTR) return nullptr;
+    const std::vector<zvlisp::Value> args = LispChains::values(lisp_, call->rbnext);
+    const zvlisp::Value function = zvlisp::Value::symbol(lisp_.intern(call->rstring));
+    zvlisp::Value result;
+    if (!lisp_.applyTopLevel(function, zvlisp::Args(args.data(), int(args.size())), &result))
+        return nullptr;
+    try {
+        return LispChains::toChain(result);
+    } catch (const zvlisp::LispError&) {
+        return nullptr;
+    }
+}
+
+bool DocumentLisp::lispEvaluate(const QString& text) {
+    auto it = readTexts_.constFind(text);
+    if (it == readTexts_.constEnd()) {
+        zvlisp::Value forms;
+        try {
+            forms = lisp_.readAll(text);
+        } catch (zvlisp::LispError& error) {
+            lisp_.report(error);
+            return false;
+        }
+        if (readTexts_.size() >= kMaxReadTexts) readTexts_.clear();
+        it = readTexts_.insert(text, forms);
+    }
+    const zvlisp::Value forms = it.value();
+    return lisp_.evaluateForms(forms);
+}
+
+}  // namespace zvhost

@@ -1,0 +1,35 @@
+#pragma once
+// A document's LISP environment behind the SDK's LISP interface: one interpreter per
+// document, its output on the document's command line, values crossing as result-buffer
+// chains (see LispChains). Host code reaches the interpreter to add functions:
+//     documentLisp->interpreter().define("name", fn, minArgs, maxArgs);
+#include "lisp/Interpreter.h"
+#include "sdk/LispInterface.h"
+
+#include <QHash>
+
+#include <functional>
+
+namespace zvhost {
+
+class DocumentLisp : public zvsdk::LispInterface {
+public:
+    explicit DocumentLisp(std::function<void(const QString&)> output);
+
+    zvlisp::Interpreter& interpreter() { return lisp_; }
+
+    // RTERROR and no chain for a symbol never set; a symbol set to nil answers RTNORM
+    // with one 5019 node.
+    int lispGetSymbol(const QString& name, zvsdk::ResultBuffer** value) override;
+    int lispPutSymbol(const QString& name, const zvsdk::ResultBuffer* value) override;
+    // Errors are printed on the command line and answered with null.
+    zvsdk::ResultBuffer* lispInvoke(const zvsdk::ResultBuffer* call) override;
+    // The same text is read once: a list run evaluates one expression per item.
+    bool lispEvaluate(const QString& text) override;
+
+private:
+    zvlisp::Interpreter lisp_;
+    QHash<QString, zvlisp::Value> readTexts_;
+};
+
+}  // namespace zvhost
