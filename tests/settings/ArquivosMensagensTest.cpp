@@ -161,7 +161,7 @@ TEST_F(ArquivosMensagensTest, TextsAreReadyToShow) {
                 EXPECT_FALSE(texto.contains("PRODUCTNAME]")) << numero;
     // The languages differ where they should, and the paper names must not.
     EXPECT_EQ(Textos("ZVLISTAS", 63),
-              (std::array<QString, 3>{"Lista concluída.", "List finished.", "Lista terminada."}));
+              (std::array<QString, 3>{"Lista gerada.", "List created.", "Lista generada."}));
     for (int papel = 0xBA; papel <= 0xC3; ++papel) {
         const std::array<QString, 3> textos = Textos("ZVLISTAS", papel);
         EXPECT_TRUE(textos[0] == textos[1] && textos[1] == textos[2]) << papel;
