@@ -412,6 +412,8 @@ void DxfLoader::finish() {
         db_.warnings_.push_back(std::to_string(withoutHandle_.size()) +
                                 " objects had no handle; new handles were given");
     }
+    // Every drawing has a model space, even a file with no ENTITIES section.
+    if (!db_.modelSpace()) syntheticBlock("*Model_Space");
     if (repairedSeqends_)
         db_.warnings_.push_back(std::to_string(repairedSeqends_) +
                                 " missing SEQEND entities were added");
