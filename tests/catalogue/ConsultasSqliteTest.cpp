@@ -48,7 +48,7 @@ TEST_F(ConsultasSqliteTest, ListFlagsMaterialTypeAndBlocks) {
     EXPECT_EQ(consultas.MaterialSap("10001"), "");  // wires carry type F, not C
     EXPECT_EQ(consultas.TipoComp("1001"), "5");
     EXPECT_EQ(consultas.TipoComp("8502"), "18");
-    EXPECT_EQ(consultas.BlocoRepresentacao("1001", "1", "2"), "REGUA_UK2_5_GY");
+    EXPECT_EQ(consultas.BlocoRepresentacao("1001", "1", "2"), "REGUA_BX2_5_GY");
     EXPECT_EQ(consultas.BlocoRepresentacao("2001", "2", "1"), "TOPO_CT09_10_24DC");
     EXPECT_EQ(consultas.BlocoRepresentacao("7401", "1", "1"), "");  // motors have no front view
 }
@@ -119,8 +119,8 @@ TEST_F(ConsultasSqliteTest, TheCacheAsksOncePerKeyAndUpperCasesFlags) {
     EXPECT_EQ(cache.ListaComp("7777", "1"), "S");
     EXPECT_EQ(cache.Consultas().ListaComp("7777", "1"), "s");
     EXPECT_EQ(cache.ListaComp("7777", "2"), "");
-    EXPECT_EQ(cache.BlocoRepresentacao("1001", "1", "1"), "TOPO_UK2_5_GY");
-    EXPECT_EQ(cache.BlocoRepresentacao("1001", "1", "2"), "REGUA_UK2_5_GY");
+    EXPECT_EQ(cache.BlocoRepresentacao("1001", "1", "1"), "TOPO_BX2_5_GY");
+    EXPECT_EQ(cache.BlocoRepresentacao("1001", "1", "2"), "REGUA_BX2_5_GY");
 }
 
 TEST_F(ConsultasSqliteTest, AQuoteInAKeyBreaksItsStatementAndAnswersEmpty) {

@@ -198,7 +198,7 @@ TEST_F(PostgresTest, EveryLookUpAnswersThroughOdbc) {
     EXPECT_EQ(consultas.MaterialSap("7001"), "100070011");
     EXPECT_EQ(consultas.AcessoriosDe("6003"), (QStringList{"6202#2", "6203#0"}));
     EXPECT_EQ(consultas.TipoComp("1001"), "5");
-    EXPECT_EQ(consultas.BlocoRepresentacao("1001", "1", "2"), "REGUA_UK2_5_GY");
+    EXPECT_EQ(consultas.BlocoRepresentacao("1001", "1", "2"), "REGUA_BX2_5_GY");
     EXPECT_EQ(consultas.GrupoNome("3", "2"), "Power diagrams");
     EXPECT_EQ(consultas.GrupoDescricao("6", "1"), "TITULO_LISTA");
     EXPECT_EQ(consultas.GrupoSequencial("6", "1"), "1");
