@@ -86,6 +86,11 @@ void CIRegistro::GravarRegistro(const QString& chave, const QString& valor) {
     if (ilegivel) return;
     if (documento.documentElement().isNull())
         documento.appendChild(documento.createElement("registros"));
+    // The parse drops the declaration; the file keeps saying that it is UTF-8.
+    if (!documento.firstChild().isProcessingInstruction())
+        documento.insertBefore(
+            documento.createProcessingInstruction("xml", "version=\"1.0\" encoding=\"UTF-8\""),
+            documento.firstChild());
     QDomElement e = Registro(documento, chave);
     if (e.isNull()) {
         e = documento.createElement("registro");

@@ -74,6 +74,9 @@ TEST_F(CIRegistroTest, WritingWithoutAFileCreatesItsFolderAndAUtf8File) {
     CIRegistro::SetVersionIN("2022 SP0 – versão");
     CIRegistro::SetDatabase("SQLSERVER");
     EXPECT_EQ(Registros(), QStringList({"VersionIN=2022 SP0 – versão", "Database=SQLSERVER"}));
+    const QByteArray inicio = Le(Arquivo()).left(Le(Arquivo()).indexOf("?>"));
+    EXPECT_TRUE(inicio.startsWith("<?xml ") && inicio.contains("encoding=")) << inicio.data();
+    EXPECT_TRUE(inicio.contains("UTF-8")) << inicio.data();
     EXPECT_TRUE(Le(Arquivo()).contains(QString("versão").toUtf8()));
     EXPECT_EQ(CIRegistro::VersionIN(), "2022 SP0 – versão");
 }
