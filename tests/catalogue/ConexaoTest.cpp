@@ -9,6 +9,7 @@
 #include "settings/CIMensagens.h"
 #include "settings/CIRegistro.h"
 
+#include <QFile>
 #include <QFileInfo>
 
 namespace {
@@ -29,6 +30,20 @@ TEST_F(ConexaoTest, EnginesThatOpenNothingAnswerEmptyAndSilently) {
     EXPECT_FALSE(QFileInfo::exists(Pasta() + "/nao-existe.db"));
     EXPECT_TRUE(Caixas().isEmpty()) << Caixas().toStdString();
     EXPECT_TRUE(LinhaComando().isEmpty()) << LinhaComando().toStdString();
+}
+
+TEST_F(ConexaoTest, AFileThatIsNoDatabaseIsReportedAndLeftAsItWas) {
+    const QByteArray texto = "isto não é um catálogo\n";
+    QFile arquivo(Pasta() + "/texto.db");
+    ASSERT_TRUE(arquivo.open(QIODevice::WriteOnly));
+    arquivo.write(texto);
+    arquivo.close();
+    UsarSqlite("texto.db", "1");
+    CEConsultasCatalogo consultas;
+    EXPECT_EQ(consultas.DescricaoComp("7001"), "");
+    EXPECT_EQ(Caixas().count("SQL ERROR: "), 1) << Caixas().toStdString();
+    ASSERT_TRUE(arquivo.open(QIODevice::ReadOnly));
+    EXPECT_EQ(arquivo.readAll(), texto);
 }
 
 TEST_F(ConexaoTest, LocalDbSaysOnceWhyItOpensNothing) {

@@ -68,6 +68,13 @@ TEST_F(FerramentaTest, SqlPrintsRowsAndLookupRunsTheReadersPath) {
     EXPECT_TRUE(erros.contains("empty answer"));
     EXPECT_EQ(Ferramenta({"--lookup", "ListaComp", "7001"}, &saida, &erros), 2);
     EXPECT_EQ(Ferramenta({"--lookup", "Nada", "1"}, &saida, &erros), 2);
+    saida.clear();
+    EXPECT_EQ(Ferramenta({"--sql", "update BDZV set ZV_LISTA = 'N' where ZV_KEY = '7001'"}, &saida),
+              0);
+    EXPECT_EQ(saida, "statement ran\n");
+    saida.clear();
+    EXPECT_EQ(Ferramenta({"--lookup", "ListaComp", "7001", "1"}, &saida), 0);
+    EXPECT_EQ(saida, "N\n");
     EXPECT_EQ(Ferramenta({"--sql", "select NADA from BDZV"}, &saida, &erros), 1);
     EXPECT_TRUE(Caixas().contains("SQL ERROR: "));
 }
