@@ -40,15 +40,13 @@ struct NativeFunction : Object {
 };
 
 struct UserFunction : Object {
+    UserFunction() : Object(Holds::Body) {}
     QString name;
     std::vector<Symbol*> params;
     // Parallel to params: a repeated parameter takes its argument but binds nothing.
     std::vector<bool> repeated;
     std::vector<Symbol*> locals;
     Value body;  // the list of forms
-    void detachChildren(void (*drop)(Object*)) override {
-        if (Object* o = body.detach()) drop(o);
-    }
 };
 
 }  // namespace zvlisp

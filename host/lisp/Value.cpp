@@ -1,32 +1,105 @@
 #include "Value.h"
 
+#include "Function.h"
+
 #include <vector>
 
 namespace zvlisp {
 
 namespace {
 
-// Objects waiting to be freed; only the outermost freeObject drains it.
-thread_local std::vector<Object*> pending;
-thread_local bool draining = false;
+// Blocks of one size for the small objects. The free list is a plain thread-local pointer
+// (cheap to reach); the chunks behind it are freed when the thread ends.
+constexpr std::size_t kBlock = 48;
 
-void dropChild(Object* object) {
-    if (--object->refs == 0) pending.push_back(object);
+struct FreeBlock {
+    FreeBlock* next;
+};
+
+thread_local FreeBlock* freeBlocks __attribute__((tls_model("initial-exec"))) = nullptr;
+
+struct Chunks {
+    std::vector<void*> list;
+    ~Chunks() {
+        for (void* chunk : list)
+            ::operator delete(chunk);
+        freeBlocks = nullptr;
+    }
+};
+
+thread_local Chunks chunks;
+
+void refill() {
+    constexpr std::size_t kCount = 1024;
+    char* chunk = static_cast<char*>(::operator new(kBlock* kCount));
+    chunks.list.push_back(chunk);
+    for (std::size_t i = 0; i < kCount; ++i) {
+        auto* block = reinterpret_cast<FreeBlock*>(chunk + i * kBlock);
+        block->next = freeBlocks;
+        freeBlocks = block;
+    }
+}
+
+// Objects whose freeing was put off because the structure was too deep to recurse.
+thread_local std::vector<Object*> deferred;
+thread_local int deferredCount __attribute__((tls_model("initial-exec"))) = 0;
+
+constexpr int kMaxFreeDepth = 500;
+
+void release(Object* object, int depth);
+
+void drop(Value& value, int depth) {
+    if (Object* child = value.detach(); child && --child->refs == 0) {
+        if (depth < kMaxFreeDepth)
+            release(child, depth + 1);
+        else {
+            deferred.push_back(child);
+            ++deferredCount;
+        }
+    }
+}
+
+// Frees an object; down a list's tail by iteration, into its elements by recursion.
+void release(Object* object, int depth) {
+    while (object) {
+        Object* next = nullptr;
+        if (object->holds == Object::Holds::CarAndCdr) {
+            auto* cell = static_cast<Cons*>(object);
+            drop(cell->car, depth);
+            if (Object* tail = cell->cdr.detach(); tail && --tail->refs == 0) next = tail;
+        } else if (object->holds == Object::Holds::Body) {
+            drop(static_cast<UserFunction*>(object)->body, depth);
+        }
+        delete object;
+        object = next;
+    }
 }
 
 }  // namespace
 
+void* Object::operator new(std::size_t size) {
+    if (size > kBlock) return ::operator new(size);
+    if (!freeBlocks) refill();
+    FreeBlock* block = freeBlocks;
+    freeBlocks = block->next;
+    return block;
+}
+
+void Object::operator delete(void* block, std::size_t size) {
+    if (size > kBlock) return ::operator delete(block);
+    auto* free = static_cast<FreeBlock*>(block);
+    free->next = freeBlocks;
+    freeBlocks = free;
+}
+
 void freeObject(Object* object) {
-    pending.push_back(object);
-    if (draining) return;
-    draining = true;
-    while (!pending.empty()) {
-        Object* next = pending.back();
-        pending.pop_back();
-        next->detachChildren(dropChild);
-        delete next;
+    release(object, 0);
+    while (deferredCount > 0) {
+        Object* next = deferred.back();
+        deferred.pop_back();
+        --deferredCount;
+        release(next, 0);
     }
-    draining = false;
 }
 
 bool Value::same(const Value& other) const {

@@ -7,6 +7,7 @@
 
 #include <QString>
 
+#include <cstddef>
 #include <cstdint>
 #include <utility>
 
@@ -117,12 +118,19 @@ private:
     } u_;
 };
 
-// A heap object; its count says how many values refer to it.
+// A heap object; its count says how many values refer to it. Small objects (conses,
+// strings) come from a free list of the thread: a list run makes and drops thousands per
+// item. Values belong to the thread that made them.
 struct Object {
+    // What values the object holds, so freeing can reach them: none, a cons's two, a
+    // function's body.
+    enum class Holds : std::uint8_t { Nothing, CarAndCdr, Body };
+    explicit Object(Holds h = Holds::Nothing) : holds(h) {}
     std::uint32_t refs = 0;
+    Holds holds;
     virtual ~Object() = default;
-    // Hands over the objects this one refers to, to free them without recursion.
-    virtual void detachChildren(void (*drop)(Object*)) { (void)drop; }
+    static void* operator new(std::size_t size);
+    static void operator delete(void* block, std::size_t size);
 };
 
 struct StringObject : Object {
@@ -131,11 +139,7 @@ struct StringObject : Object {
 };
 
 struct Cons : Object {
-    Cons(Value a, Value d) : car(std::move(a)), cdr(std::move(d)) {}
-    void detachChildren(void (*drop)(Object*)) override {
-        if (Object* o = car.detach()) drop(o);
-        if (Object* o = cdr.detach()) drop(o);
-    }
+    Cons(Value a, Value d) : Object(Holds::CarAndCdr), car(std::move(a)), cdr(std::move(d)) {}
     Value car;
     Value cdr;
 };
