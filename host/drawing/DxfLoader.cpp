@@ -16,6 +16,7 @@
 
 #include <fstream>
 #include <sstream>
+#include <unordered_set>
 
 namespace zvdb {
 
@@ -93,6 +94,11 @@ void DxfLoader::run(std::string bytes) {
     db_.fileTags_ =
         binary_ ? TagReader::readBinary(text_, db_.arena_) : TagReader::readAscii(text_);
     if (db_.fileTags_.empty()) throw DxfError("line 1: the file holds no DXF data");
+    std::size_t objects = 0;
+    for (const Tag& tag : db_.fileTags_)
+        objects += tag.code == 0 ? 1 : 0;
+    db_.byHandle_.reserve(objects);
+    db_.storage_.reserve(objects);
     fixEncoding();
     readSections();
     finish();
@@ -420,11 +426,14 @@ void DxfLoader::finish() {
     // Every extended-data application must be registered.
     std::vector<std::string> missing;
     if (db_.table("APPID")) {
+        std::unordered_set<std::string_view> checked;
         for (const auto& object : db_.storage_) {
-            for (std::string_view app : object->xdataApplications()) {
-                if (db_.isApplicationRegistered(app)) continue;
-                missing.emplace_back(app);
-                db_.registerApplication(app);
+            if (object->isType("XRECORD")) continue;
+            for (const Tag& tag : object->tags()) {
+                if (tag.code != 1001 || !checked.insert(tag.value).second) continue;
+                if (db_.isApplicationRegistered(tag.value)) continue;
+                missing.emplace_back(tag.value);
+                db_.registerApplication(tag.value);
             }
         }
     }

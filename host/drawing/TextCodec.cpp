@@ -5,6 +5,7 @@
 #include <QString>
 #include <QTextCodec>
 
+#include <cstdint>
 #include <cstdio>
 #include <cstring>
 
@@ -107,9 +108,18 @@ bool TextCodec::isKnownCodePage(std::string_view dwgCodePage) {
 }
 
 bool TextCodec::isAscii(std::string_view bytes) {
-    for (unsigned char c : bytes)
-        if (c >= 0x80) return false;
-    return true;
+    const char* p = bytes.data();
+    std::size_t n = bytes.size();
+    // Eight bytes at a time: any high bit means a byte above 0x7F.
+    std::uint64_t any = 0;
+    for (; n >= 8; p += 8, n -= 8) {
+        std::uint64_t word;
+        std::memcpy(&word, p, 8);
+        any |= word;
+    }
+    for (; n; ++p, --n)
+        any |= static_cast<unsigned char>(*p);
+    return (any & 0x8080808080808080ULL) == 0;
 }
 
 bool TextCodec::isValidUtf8(std::string_view bytes) {
