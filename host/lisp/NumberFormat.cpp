@@ -53,23 +53,25 @@ QString NumberFormat::feetAndInches(double value, int mode, int precision, int d
     long long feet = (long long)(total / 12.0);
     double inches = total - double(feet) * 12.0;
     QString inchText;
+    bool zeroInches = false;
     if (mode == 3) {
         inchText = QString::asprintf("%.*f", precision, inches);
         if (inchText.toDouble() >= 12.0) {
             ++feet;
-            inches = 0.0;
             inchText = QString::asprintf("%.*f", precision, 0.0);
         }
+        zeroInches = inchText.toDouble() == 0.0;
         inchText = trimZeros(inchText, dimzin & 8);
     } else {
         const long long denominator = 1LL << std::clamp(precision, 0, 8);
-        if (std::llround(inches * double(denominator)) >= 12 * denominator) {
+        long long steps = std::llround(inches * double(denominator));
+        if (steps >= 12 * denominator) {
             ++feet;
-            inches = 0.0;
+            steps = 0;
         }
-        inchText = fraction(inches, precision, true, nullptr);
+        zeroInches = steps == 0;
+        inchText = fraction(double(steps) / double(denominator), precision, true, nullptr);
     }
-    const bool zeroInches = std::fabs(inches) < 1e-12 || inchText.toDouble() == 0.0;
     const bool suppressFeet = (dimzin & 3) == 0 || (dimzin & 3) == 3;
     const bool suppressInches = (dimzin & 3) == 0 || (dimzin & 3) == 2;
     QString text;

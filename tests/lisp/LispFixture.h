@@ -6,6 +6,10 @@
 
 #include <gtest/gtest.h>
 
+#include <ostream>
+
+inline void PrintTo(const QString& text, std::ostream* out) { *out << text.toStdString(); }
+
 class LispFixture : public ::testing::Test {
 protected:
     LispFixture() {
