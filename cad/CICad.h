@@ -1,17 +1,176 @@
 #pragma once
 // The facade: everything the list logic needs of the host, as operations without state.
 // Each works on the active document, or on the database handed in.
+#include "OdDbObjectId.h"
 #include "host/sdk/ResultBuffer.h"
 
 #include <QString>
 #include <QStringList>
 
+#include <memory>
+#include <vector>
+
 namespace zvsdk {
 class Document;
 }
+namespace zv {
+class CEAtributo;
+class CEListaAtributos;
+}  // namespace zv
+
+// One item of extended data behind its application's name: the group code, its text, and
+// for points (1010 and on) the coordinates.
+struct CEItemXData {
+    int codigo = 0;
+    QString texto;
+    double x = 0.0, y = 0.0, z = 0.0;
+};
+using CEListaXData = std::vector<CEItemXData>;
+
+// A point of the drawing.
+struct CEPonto {
+    double x = 0.0, y = 0.0, z = 0.0;
+};
+
+// The rows of the three-language tag table.
+enum class CampoTraduzido {
+    Relacao = 1,
+    Ligacao,
+    Fio,
+    Cabo,
+    Regua,
+    Numero,
+    PosicaoContato,
+    Pino,
+    Distancia
+};
 
 class CICad {
 public:
+    // ---- databases
+    // The override when one is set, else the active document's database, else null.
+    static zvdb::Database* GetDatabase();
+    static void SetDatabaseOverride(zvdb::Database* database);
+
+    // ---- layers
+    static QStringList GetLayers(zvdb::Database* database = nullptr);
+    static QString GetLayerCorrente(zvdb::Database* database = nullptr);
+    static QString SetLayerCorrente(const QString& nome, zvdb::Database* database = nullptr);
+    static bool ExisteLayer(const QString& nome, zvdb::Database* database = nullptr);
+    static void CriaLayer(const QString& nome, zvdb::Database* database = nullptr);
+    static void DescongelaLayer(const QString& nome, zvdb::Database* database = nullptr);
+    static void LigaLayer(const QString& nome, zvdb::Database* database = nullptr);
+    static void DestravaLayer(const QString& nome, zvdb::Database* database = nullptr);
+    static void CongelaLayer(const QString& nome);
+    static void CongelaTodosLayers();
+    static void ApagarEntidadesLayer(const QString& nome);
+
+    // ---- pages
+    // The first non-empty piece of a page layer's name, cut at "$".
+    static QString NomeBase(const QString& layer);
+    // 0 shown, 1 "0" or a missing layer, 2 the page could not be made current.
+    static int MostraPagina(const QString& layer, bool zoom);
+    static void TrocaPagina(const QString& layer);
+    static bool IsPaginaCapa(const QString& layer);
+    static bool IsPaginaIndice(const QString& layer);
+    static void MarcaPagina(const QString& layer, const QString& palavra);
+
+    // ---- views
+    static void ZoomExtents();
+    static int Regenera();
+    // Runs a host command from its tokens; false when the host does not know it.
+    static bool Comando(const QStringList& tokens);
+
+    // ---- files: "DADOS\\x.dwg" paths resolved for this platform
+    // Backslashes become slashes; a ".dwg" that does not exist is looked for as ".dxf".
+    static QString ResolveArquivo(const QString& caminho);
+    static bool ExisteArquivo(const QString& caminho);
+
+    // ---- blocks and references
+    static bool GetBlocoId(const QString& nome, OdDbObjectId& id,
+                           zvdb::Database* database = nullptr);
+    static QString GetNomeBloco(const OdDbObjectId& referencia);
+    static OdDbObjectId CarregaBloco(const QString& nome, const QString& arquivo);
+    static bool RecarregaBloco(const QString& arquivo, const QString& nome);
+    static OdDbObjectId InsereBloco(const QString& arquivo, const QString& nome,
+                                    const QString& layer, double x, double y, double z,
+                                    double rotacao);
+    static std::unique_ptr<zv::CEListaAtributos> GetDefinicoesAtributos(const QString& arquivo,
+                                                                        const QString& nome);
+    static OdDbObjectId GetReferenciaNoLayer(const QString& nome, const QString& layer);
+    static QString GetValorSimboloPagina(const QString& tag, const QString& nome,
+                                         const QString& layer);
+    static bool GetExtensao(const OdDbObjectId& entidade, double& xMax, double& xMin, double& yMax,
+                            double& yMin, bool comAtributos);
+    static bool GetExtensaoBloco(const OdDbObjectId& bloco, double& xMax, double& xMin,
+                                 double& yMax, double& yMin);
+
+    // ---- attributes
+    static void GetAtributos(const OdDbObjectId& referencia,
+                             std::unique_ptr<zv::CEListaAtributos>& lista, bool comPrompts,
+                             bool usarPadroes, const QString& prefixo = QString());
+    static void GetAtributosPorId(const OdDbObjectId& id,
+                                  std::unique_ptr<zv::CEListaAtributos>& lista, bool comPrompts,
+                                  bool usarPadroes, const QString& prefixo = QString());
+    static void GetAtributosConstantes(const OdDbObjectId& referencia,
+                                       std::unique_ptr<zv::CEListaAtributos>& lista);
+    static std::unique_ptr<zv::CEAtributo> GetAtributo(const QString& tag,
+                                                       const OdDbObjectId& referencia,
+                                                       bool comPrompt = false);
+    static std::unique_ptr<zv::CEAtributo> GetAtributoEntidade(const QString& tag,
+                                                               const OdDbObjectId& entidade,
+                                                               bool comPrompt = false);
+    static std::unique_ptr<zv::CEAtributo> GetAtributoVirtual(const QString& tag,
+                                                              const OdDbObjectId& entidade);
+    static int GetAtributosVirtuais(const OdDbObjectId& id,
+                                    std::unique_ptr<zv::CEListaAtributos>& lista);
+    // 0 found, 2 absent.
+    static int GetAtributoTraduzido(CampoTraduzido campo, const OdDbObjectId& referencia,
+                                    std::unique_ptr<zv::CEAtributo>& atributo,
+                                    bool comPrompt = false);
+    static QString TagTraduzida(CampoTraduzido campo, int indice);
+    // Is the tag one of the wire field's tags ("FIO" too)?
+    static bool EhTagFio(const QString& tag);
+    static QString GetPromptAtributo(const QString& tag, const OdDbObjectId& bloco,
+                                     const QString& padrao, int ocorrencia);
+    static QString GetDefaultAtributo(const QString& tag, const OdDbObjectId& bloco);
+    static void SetAtributo(const OdDbObjectId& referencia, const QString& tag,
+                            const QString& valor);
+    // Writes the values of a list back by tag, in order of occurrence.
+    static void SetAtributosLista(const OdDbObjectId& referencia,
+                                  const zv::CEListaAtributos& lista);
+    static void CriarAtributos(const OdDbObjectId& definicao, const OdDbObjectId& referencia);
+    // The attribute's own value and invisibility, written to the drawing.
+    static void SetValorAtributo(const OdDbObjectId& atributo, const QString& valor);
+    static bool SetInvisivelAtributo(const OdDbObjectId& atributo, bool invisivel);
+
+    // ---- extended data, masters, project settings
+    static void RegistraApp(const QString& aplicacao, zvdb::Database* database = nullptr);
+    static bool TemXData(const OdDbObjectId& id, const QString& aplicacao);
+    // The items behind the application's name; empty when the object has none.
+    static CEListaXData GetXData(const OdDbObjectId& id, const QString& aplicacao);
+    static void SetXData(const OdDbObjectId& id, const QString& aplicacao,
+                         const CEListaXData& itens);
+    static OdDbObjectId GetSimboloMestre(zvdb::Database* database, const OdDbObjectId& entidade);
+    static bool GetCircuitoLocal(const OdDbObjectId& entidade, int& numero);
+    static bool GetCircuitoLocalInfo(int numero, QString& a, QString& b, QString& c);
+    static OdDbObjectId IdDoHandle(const QString& handle, zvdb::Database* database = nullptr);
+
+    static int GetOrdemGrupos();
+    static void SetOrdemGrupos(int ordem);
+    static int GetOrdemPaginas(const QString& grupo);
+    static void SetOrdemPaginas(const QString& grupo, int ordem);
+    static int GetNumeracaoPaginas();
+    static void SetNumeracaoPaginas(int modo);
+    static QString GetCfgProjeto();
+    static void SetCfgProjeto(const QString& nome);
+    static CEListaXData GetPaineisDefinidos();
+    static void SetPaineisDefinidos(const CEListaXData& paineis);
+    // The "ZV_CABOS" dictionary, made when missing.
+    static OdDbObjectId GetDicionarioCabos(zvdb::Database* database = nullptr);
+    // The version stamp of "ZV_VERSAO"; empty when there is none.
+    static QString GetVersao(zvdb::Database* database = nullptr);
+
     // ---- command line, messages and log
     // Prints text on the active document's command line, exactly as given.
     static void Imprime(const QString& texto);

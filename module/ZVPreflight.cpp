@@ -1,11 +1,15 @@
 #include "ZVPreflight.h"
 
 #include "cad/CICad.h"
+#include "host/sdk/Document.h"
 #include "host/sdk/SystemServices.h"
 #include "host/sdk/UserInterface.h"
 #include "settings/CIMensagens.h"
 
 namespace {
+
+// The page the user was on when the last bracket opened; it outlives the commands.
+QString paginaSalva;
 
 void HabilitaJanelaPrincipal() {
     zvsdk::SystemServices* servicos = zvsdk::systemServices();
@@ -21,6 +25,42 @@ bool Preflight(const QString& simbolo, int mensagem) {
     return construiu;
 }
 
+// Layer "0" current and every page frozen: the state readers and writers work in.
+void CongelaPaginas() {
+    CICad::DescongelaLayer("0");
+    CICad::SetLayerCorrente("0");
+    CICad::CongelaTodosLayers();
+}
+
+void Abrir() {
+    paginaSalva = CICad::GetLayerCorrente(CICad::GetDatabase());
+    CongelaPaginas();
+    // A tiny window at the origin keeps regenerations cheap while the run works.
+    if (zvsdk::activeDocument() && zvsdk::systemServices())
+        CICad::Comando({"_.zoom", "_W", "0,0,0", "0.5,0.5,0"});
+    CICad::Regenera();
+}
+
+QString PrimeiraPagina() {
+    zvsdk::ResultBuffer* resposta = CICad::zvInvokeLista("getprimeirapagina");
+    QString pagina;
+    for (const zvsdk::ResultBuffer* no = resposta; no && pagina.isEmpty(); no = no->rbnext)
+        if (no->restype == zvsdk::RTSTR) pagina = no->rstring;
+    CICad::LiberaLista(resposta);
+    return pagina;
+}
+
+void Fechar() {
+    CongelaPaginas();
+    if (CICad::MostraPagina(paginaSalva, true) == 1) {
+        // The page is gone (or was "0"): the user lands on the first page.
+        paginaSalva = PrimeiraPagina();
+        CICad::MostraPagina(paginaSalva, true);
+    }
+    CICad::zvInvokeVoid("atualizarpaginas");
+    CICad::zvInvokeVoid("Descongela_as_layers_da_pagina", {paginaSalva});
+}
+
 }  // namespace
 
 namespace ZVPreflight {
@@ -34,8 +74,10 @@ bool PreflightExportacao() {
 }
 
 void Bracket(int abrir) {
-    // The page state is saved and restored here once the facade has pages to show.
-    Q_UNUSED(abrir);
+    if (abrir)
+        Abrir();
+    else
+        Fechar();
 }
 
 }  // namespace ZVPreflight

@@ -3,6 +3,7 @@
 #include "DocumentSetup.h"
 #include "HostDocument.h"
 #include "ModuleLoader.h"
+#include "ViewCommands.h"
 #include "drawing/Database.h"
 #include "sdk/UserInterface.h"
 
@@ -19,6 +20,7 @@ Application* theApplication = nullptr;
 Application::Application(std::unique_ptr<zvsdk::UserInterface> ui, QTextStream& out)
     : ui_(std::move(ui)), out_(out) {
     theApplication = this;
+    registerViewCommands(*this);
 }
 
 Application::~Application() {

@@ -35,6 +35,13 @@ public:
     void setLisp(std::unique_ptr<zvsdk::LispInterface> lisp);
     int pickEntity(const QString& prompt, zvsdk::EntityName* picked) override;
 
+    // The part of the drawing the document shows, in drawing units.
+    struct View {
+        double minX = 0.0, minY = 0.0, maxX = 1.0, maxY = 1.0;
+    };
+    const View& view() const { return view_; }
+    void setView(const View& view) { view_ = view; }
+
 private:
     Application& app_;
     QString fileName_;
@@ -48,6 +55,7 @@ private:
     };
     QHash<QString, Command> commands_;
     int commandsStarted_ = 0;
+    View view_;
 };
 
 }  // namespace zvhost

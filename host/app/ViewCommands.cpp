@@ -1,0 +1,65 @@
+#include "ViewCommands.h"
+
+#include "Application.h"
+#include "HostDocument.h"
+#include "drawing/BlockRecord.h"
+#include "drawing/Database.h"
+#include "drawing/Entity.h"
+#include "drawing/Extents.h"
+#include "drawing/LayerRecord.h"
+
+#include <QStringList>
+
+namespace zvhost {
+
+namespace {
+
+// "x,y[,z]" as a point; false when it is not one.
+bool parsePoint(const QString& text, double& x, double& y) {
+    const QStringList parts = text.split(',');
+    bool okX = false, okY = false;
+    if (parts.size() < 2) return false;
+    x = parts[0].trimmed().toDouble(&okX);
+    y = parts[1].trimmed().toDouble(&okY);
+    return okX && okY;
+}
+
+bool zoomWindow(HostDocument& document, const QStringList& corners) {
+    double x1, y1, x2, y2;
+    if (corners.size() < 2 || !parsePoint(corners[0], x1, y1) || !parsePoint(corners[1], x2, y2))
+        return false;
+    document.setView({qMin(x1, x2), qMin(y1, y2), qMax(x1, x2), qMax(y1, y2)});
+    return true;
+}
+
+// What shows: model-space entities on layers that are not frozen.
+bool zoomExtents(HostDocument& document) {
+    zvdb::Database* db = document.database();
+    if (!db || !db->modelSpace()) return false;
+    zvdb::BoundingBox box;
+    for (const zvdb::Entity* entity : db->modelSpace()->entities()) {
+        const zvdb::LayerRecord* layer = db->layer(entity->layer());
+        if (layer && layer->isFrozen()) continue;
+        box.add(zvdb::Extents::ofEntity(*entity, true));
+    }
+    if (box.isEmpty()) box = zvdb::BoundingBox{{0, 0, 0}, {1, 1, 0}};
+    document.setView({box.min.x, box.min.y, box.max.x, box.max.y});
+    return true;
+}
+
+bool zoom(HostDocument& document, const QStringList& args) {
+    const QString option = args.value(0).toUpper().remove('_');
+    if (option == "W" || option == "WINDOW") return zoomWindow(document, args.mid(1));
+    if (option == "E" || option == "EXTENTS") return zoomExtents(document);
+    return false;
+}
+
+}  // namespace
+
+void registerViewCommands(Application& app) {
+    app.registerHostCommand("ZOOM", zoom);
+    // Nothing is drawn on screen by this host: a regeneration has nothing to repaint.
+    app.registerHostCommand("REGEN", [](HostDocument&, const QStringList&) { return true; });
+}
+
+}  // namespace zvhost
