@@ -265,6 +265,9 @@ void DxfLoader::readTables(std::size_t begin, std::size_t end) {
             if (!current)
                 throw DxfError(where(i) + ": table record " + std::string(tags[i].value) +
                                " outside a TABLE");
+            if (tags[i].value != current->name())
+                throw DxfError(where(i) + ": a " + std::string(tags[i].value) +
+                               " record in table " + std::string(current->name()));
             current->add(adopt(i, next, Context::Table));
         }
         i = next;
