@@ -2,6 +2,7 @@
 
 #include "BlockRecord.h"
 #include "Database.h"
+#include "TagValues.h"
 
 namespace zvdb {
 
@@ -24,6 +25,62 @@ void Entity::erase() {
     for (Entity* sub : subs_)
         sub->erase();
     if (seqend_) seqend_->erase();
+}
+
+namespace {
+
+// Point codes that hold positions, by entity type (others hold vectors or nothing).
+std::vector<int> positionCodes(std::string_view type) {
+    if (type == "LINE" || type == "TEXT" || type == "ATTRIB" || type == "ATTDEF") return {10, 11};
+    if (type == "SOLID" || type == "TRACE" || type == "3DFACE") return {10, 11, 12, 13};
+    if (type == "CIRCLE" || type == "ARC" || type == "POINT" || type == "INSERT" ||
+        type == "MTEXT" || type == "ELLIPSE" || type == "VERTEX")
+        return {10};
+    return {};
+}
+
+bool inObjectCoordinates(std::string_view type) {
+    return type == "CIRCLE" || type == "ARC" || type == "TEXT" || type == "ATTRIB" ||
+           type == "ATTDEF" || type == "INSERT" || type == "SOLID" || type == "TRACE" ||
+           type == "LWPOLYLINE";
+}
+
+}  // namespace
+
+bool Entity::moveBy(const Point3& offset) {
+    const std::string_view type = this->type();
+    Point3 move = offset;
+    if (inObjectCoordinates(type)) {
+        // The object coordinate system is orthonormal: its inverse is its transpose.
+        const Transform ocs = Transform::fromOcs(point(210, {0, 0, 1}));
+        const auto& m = ocs.linear;
+        move = {m[0] * offset.x + m[3] * offset.y + m[6] * offset.z,
+                m[1] * offset.x + m[4] * offset.y + m[7] * offset.z,
+                m[2] * offset.x + m[5] * offset.y + m[8] * offset.z};
+    }
+    if (type == "LWPOLYLINE") {
+        auto& all = editTags();
+        const std::size_t end = xdataStart();
+        for (std::size_t i = 1; i < end; ++i) {
+            const double delta = all[i].code == 10 ? move.x : all[i].code == 20 ? move.y : 0.0;
+            if (delta != 0.0 && (all[i].code == 10 || all[i].code == 20))
+                all[i].value = store(TagValues::fromReal(TagValues::toReal(all[i].value) + delta));
+        }
+        if (move.z != 0.0) setReal(38, real(38) + move.z, "AcDbPolyline");
+        return true;
+    }
+    if (type == "POLYLINE") {
+        for (Entity* vertex : subs_)
+            vertex->moveBy(offset);
+        return true;
+    }
+    const std::vector<int> codes = positionCodes(type);
+    if (codes.empty()) return false;
+    for (int code : codes)
+        if (has(code)) setPoint(code, point(code) + move);
+    for (Entity* sub : subs_)
+        sub->moveBy(offset);
+    return true;
 }
 
 void Entity::addSubEntity(Entity* sub) {

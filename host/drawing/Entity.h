@@ -29,6 +29,9 @@ public:
     std::vector<Entity*> liveSubEntities() const;
     Entity* seqend() const { return seqend_; }
     void erase() override;
+    // Moves the entity (and its attributes or vertices) by a world offset; false for kinds
+    // whose geometry is not known here (they stay where they are).
+    bool moveBy(const Point3& offset);
 
 protected:
     friend class Database;

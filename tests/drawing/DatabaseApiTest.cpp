@@ -329,6 +329,27 @@ TEST_F(DatabaseApi, ExtentsOfEntitiesAndBlocks) {
     EXPECT_TRUE(Extents::ofEntity(*ms->addMText({0, 0, 0}, 1, "abc"), false).max.x > 0);
 }
 
+TEST_F(DatabaseApi, EntitiesMoveByAnOffset) {
+    BlockRecord* block = db.createBlock("MOVED", {5, 5, 0});
+    Entity* line = block->addLine({5, 5, 0}, {7, 5, 0});
+    Polyline* wire = block->addLwPolyline({{5, 5, 0}, {6, 9, 0}}, false);
+    Entity* circle = block->addCircle({6, 6, 0}, 1);
+    Attribute* definition = block->addAttributeDefinition("T", "", "", {5, 8, 0}, 1);
+    Entity* unknown = db.addEntity(*block, "ACME_THING", {}, "0");
+    for (Entity* entity : block->entities()) {
+        if (entity != unknown) {
+            EXPECT_TRUE(entity->moveBy({-5, -5, 0}));
+        }
+    }
+    EXPECT_FALSE(unknown->moveBy({-5, -5, 0}));
+    block->setBasePoint({0, 0, 0});
+    EXPECT_EQ(line->point(11), (Point3{2, 0, 0}));
+    EXPECT_EQ(wire->vertices()[1], (Point3{1, 4, 0}));
+    EXPECT_EQ(circle->point(10), (Point3{1, 1, 0}));
+    EXPECT_EQ(definition->position(), (Point3{0, 3, 0}));
+    EXPECT_EQ(Extents::ofBlock(*block).min, (Point3{0, 0, 0}));
+}
+
 TEST_F(DatabaseApi, TextsPolylinesAndLongMText) {
     BlockRecord* ms = db.modelSpace();
     std::string longText;
