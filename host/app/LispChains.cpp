@@ -10,7 +10,7 @@ using zvsdk::ResultBuffer;
 
 namespace {
 
-constexpr int kMaxDepth = 10000;
+constexpr int kMaxDepth = 2000;
 
 void push(ResultBuffer**& tail, ResultBuffer* node) {
     *tail = node;

@@ -8,7 +8,7 @@
 namespace zvlisp {
 
 bool Equality::equal(const Value& a, const Value& b, double fuzz, int depth) {
-    if (depth > 10000) throw LispError("stack overflow");
+    if (depth > 2000) throw LispError("stack overflow");
     if (a.isNumber() && b.isNumber()) return std::fabs(a.asNumber() - b.asNumber()) <= fuzz;
     if (a.type() != b.type()) return false;
     switch (a.type()) {

@@ -8,13 +8,42 @@
 
 #include <QFileInfo>
 
+#include <pthread.h>
+
 namespace zvlisp {
 
-// Counts nested calls; past the limit the evaluation ends in an error, not a crash.
+namespace {
+
+// The stack this thread may use for evaluation: its size less a margin for the error
+// handler and reporting.
+long stackLimitOfThread() {
+    static thread_local long limit __attribute__((tls_model("initial-exec"))) = 0;
+    if (limit == 0) {
+        size_t size = 8 << 20;
+        pthread_attr_t attr;
+        if (pthread_getattr_np(pthread_self(), &attr) == 0) {
+            pthread_attr_getstacksize(&attr, &size);
+            pthread_attr_destroy(&attr);
+        }
+        constexpr long kMargin = 1 << 20;
+        limit = std::max(long(size) - kMargin, long(size) / 2);
+    }
+    return limit;
+}
+
+}  // namespace
+
+// Counts nested calls; past the limit, or near the end of the stack, the evaluation ends
+// in an error, not a crash.
 class DepthGuard {
 public:
     explicit DepthGuard(Interpreter& in) : in_(in) {
-        if (++in_.depth_ > in_.maxDepth_) {
+        const char marker = 0;
+        if (in_.depth_ == 0) {
+            in_.stackBase_ = &marker;
+            in_.stackLimit_ = stackLimitOfThread();
+        }
+        if (++in_.depth_ > in_.maxDepth_ || in_.stackBase_ - &marker > in_.stackLimit_) {
             --in_.depth_;
             in_.fail("stack overflow");
         }
@@ -331,7 +360,9 @@ bool Interpreter::callErrorHandler(const QString& message) {
     const Value handler = errorHandler_->value;
     if (handler.isNil() || inErrorHandler_) return false;
     inErrorHandler_ = true;
-    maxDepth_ += 200;  // room for the handler when the stack limit was the error
+    // Room for the handler when the depth or the stack was the error.
+    maxDepth_ += 200;
+    stackLimit_ += 256 << 10;
     try {
         const Value text = Value::string(message);
         invoke(toFunction(handler), Args(&text, 1));
@@ -340,6 +371,7 @@ bool Interpreter::callErrorHandler(const QString& message) {
             write((atLineStart_ ? "; error: " : "\n; error: ") + nested.message() + "\n");
     }
     maxDepth_ -= 200;
+    stackLimit_ -= 256 << 10;
     inErrorHandler_ = false;
     return true;
 }

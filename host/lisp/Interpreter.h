@@ -88,7 +88,8 @@ public:
     [[noreturn]] void badType(const char* what, const Value& value);
     // What the top level does with an error that reached it.
     void report(LispError& error);
-    // Depth of nested calls before "stack overflow"; the host's stack must hold it.
+    // Depth of nested calls before "stack overflow". Whatever the depth, evaluation stops
+    // before the thread's stack runs out (1 MB is kept for error handling).
     void setMaxDepth(int depth) { maxDepth_ = depth; }
     // Stops the running evaluation with "Function cancelled" at the next call or loop
     // step; safe from another thread or a signal handler.
@@ -124,6 +125,8 @@ public:
     QString findFile(const QString& name) const;
 
     Units units;
+    // strcat fails with "string too long" beyond this many characters.
+    int maxStringLength = 64 << 20;
 
     // Helpers for the evaluator's special forms.
     Value makeLambda(const QString& name, const Value& params, const Value& body);
@@ -160,7 +163,9 @@ private:
     QString whereFile_;
     int whereLine_ = 0;
     int depth_ = 0;
-    int maxDepth_ = 3000;
+    int maxDepth_ = 1000000;
+    const char* stackBase_ = nullptr;  // where the outermost evaluation began
+    long stackLimit_ = 0;              // bytes of stack evaluation may use
     int catchDepth_ = 0;
     bool inErrorHandler_ = false;
     unsigned steps_ = 0;

@@ -10,7 +10,7 @@ namespace zvlisp {
 
 namespace {
 // A structure nested deeper than this is reported instead of overflowing the stack.
-constexpr int kMaxDepth = 10000;
+constexpr int kMaxDepth = 2000;
 
 QString address(const void* p) {
     return QString::number(quintptr(p), 16).rightJustified(8, '0');
