@@ -556,6 +556,12 @@ bool LeAtributoVirtual(QString registro, QString& tag, QString& valor, bool& inv
 
 }  // namespace
 
+double CICad::Simples(double valor) {
+    // Through memory: GCC 12 drops float round trips of vectorised pairs at -O2 and above.
+    volatile float simples = static_cast<float>(valor);
+    return simples;
+}
+
 zvdb::Database* CICad::GetDatabase() {
     if (databaseOverride) return databaseOverride;
     zvsdk::Document* documento = zvsdk::activeDocument();
@@ -795,8 +801,8 @@ OdDbObjectId CICad::InsereBloco(const QString& arquivo, const QString& nome, con
     zvdb::BlockRecord* modelo = db->modelSpace();
     if (!definicao || !modelo) return {};
     // Insertion points and rotations go through single precision on purpose.
-    const zvdb::Point3 ponto{double(float(x)), double(float(y)), double(float(z))};
-    const double graus = double(float(rotacao)) * 180.0 / M_PI;
+    const zvdb::Point3 ponto{Simples(x), Simples(y), Simples(z)};
+    const double graus = Simples(rotacao) * 180.0 / M_PI;
     zvdb::BlockReference* ref =
         modelo->addBlockReference(*definicao, ponto, {1, 1, 1}, graus, U8(layer));
     CriarAtributos(bloco, Id(ref));

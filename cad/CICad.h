@@ -47,6 +47,9 @@ enum class CampoTraduzido {
 
 class CICad {
 public:
+    // A coordinate through single precision, as insertion points and layouts keep them.
+    static double Simples(double valor);
+
     // ---- databases
     // The override when one is set, else the active document's database, else null.
     static zvdb::Database* GetDatabase();

@@ -1,0 +1,317 @@
+// The facade on drawings built by the tests: pages, blocks, attributes, extended data,
+// masters, project settings and the object store.
+#include "FacadeFixture.h"
+#include "QtPrinters.h"
+#include "cad/CELayoutRotasFios.h"
+#include "cad/CICad.h"
+#include "drawing/Dictionary.h"
+#include "drawing/Polyline.h"
+#include "drawing/TextEntity.h"
+#include "readers/ZVString.h"
+
+#include <cmath>
+#include "readers/CEAtributo.h"
+#include "readers/CEListaAtributos.h"
+
+#include <QFile>
+
+namespace {
+
+class PaginasTest : public FacadeFixture {
+protected:
+    void SetUp() override {
+        FacadeFixture::SetUp();
+        for (const char* nome : {"ESQ$0001$A", "ESQ$0002$A", "ESQ$DE", "ESQ$FORMATO", "ESQ$SELO",
+                                 "CAPA$0001$A", "CAPA$DE", "CAPA$FORMATO", "CAPA$SELO", "SOLTO"})
+            db().createLayer(nome);
+    }
+};
+
+TEST_F(PaginasTest, ShowingAPageThawsItAndItsCompanionsOnly) {
+    EXPECT_EQ(CICad::MostraPagina("ESQ$0002$A", false), 0);
+    EXPECT_EQ(descongelados(),
+              QStringList({"0", "ESQ$0002$A", "ESQ$DE", "ESQ$FORMATO", "ESQ$SELO"}));
+    EXPECT_EQ(CICad::GetLayerCorrente(), "ESQ$0002$A");
+}
+
+TEST_F(PaginasTest, ACoverKeepsItsTitleBlockFrozen) {
+    CICad::MarcaPagina("CAPA$0001$A", "CAPA");
+    EXPECT_TRUE(CICad::IsPaginaCapa("CAPA$0001$A"));
+    EXPECT_FALSE(CICad::IsPaginaIndice("CAPA$0001$A"));
+    EXPECT_EQ(CICad::MostraPagina("CAPA$0001$A", true), 0);
+    EXPECT_EQ(descongelados(), QStringList({"0", "CAPA$0001$A", "CAPA$DE", "CAPA$FORMATO"}));
+    // Any other word marks nothing.
+    CICad::MarcaPagina("ESQ$0001$A", "OUTRA");
+    EXPECT_FALSE(CICad::IsPaginaCapa("ESQ$0001$A"));
+    EXPECT_FALSE(CICad::IsPaginaIndice("ESQ$0001$A"));
+}
+
+TEST_F(PaginasTest, LayerZeroAndUnknownLayersChangeNothing) {
+    CICad::MostraPagina("ESQ$0001$A", false);
+    const QStringList antes = descongelados();
+    EXPECT_EQ(CICad::MostraPagina("0", true), 1);
+    EXPECT_EQ(CICad::MostraPagina("NAO$EXISTE$X", true), 1);
+    EXPECT_EQ(descongelados(), antes);
+}
+
+TEST_F(PaginasTest, SwappingFreezesOnlyTheOldPageAndItsCompanions) {
+    CICad::MostraPagina("ESQ$0001$A", false);
+    CICad::DescongelaLayer("SOLTO");
+    CICad::TrocaPagina("CAPA$0001$A");
+    EXPECT_EQ(descongelados(),
+              QStringList({"0", "CAPA$0001$A", "CAPA$DE", "CAPA$FORMATO", "CAPA$SELO", "SOLTO"}));
+    EXPECT_EQ(CICad::GetLayerCorrente(), "CAPA$0001$A");
+}
+
+TEST_F(PaginasTest, BaseNamesAndLayerOperations) {
+    EXPECT_EQ(CICad::NomeBase("ESQ$0001$A"), "ESQ");
+    EXPECT_EQ(CICad::NomeBase("SOLTO"), "SOLTO");
+    EXPECT_EQ(CICad::NomeBase("$ESQ$1"), "ESQ");
+    CICad::CriaLayer("");
+    CICad::CriaLayer("NOVO");
+    EXPECT_TRUE(CICad::ExisteLayer("NOVO"));
+    CICad::CongelaTodosLayers();
+    EXPECT_EQ(descongelados(), QStringList({"0"}));
+    // The current layer comes back thawed.
+    EXPECT_EQ(CICad::SetLayerCorrente("NOVO"), "NOVO");
+    EXPECT_EQ(descongelados(), QStringList({"0", "NOVO"}));
+}
+
+TEST_F(FacadeFixture, BlockFilesWithTwoLayersOrNestedReferencesAreRefused) {
+    const QString duasCamadas = arquivoBloco("DUAS", {"TAG"}, [](zvdb::Database& b) {
+        b.createLayer("OUTRA");
+        b.modelSpace()->addLine({0, 0, 0}, {1, 1, 0}, "OUTRA");
+    });
+    const QString aninhado = arquivoBloco("ANINHADO", {"TAG"}, [](zvdb::Database& b) {
+        zvdb::BlockRecord* interno = b.createBlock("INTERNO");
+        interno->addCircle({0, 0, 0}, 1);
+        b.modelSpace()->addBlockReference(*interno, {5, 5, 0});
+    });
+    EXPECT_TRUE(CICad::CarregaBloco("DUAS", duasCamadas).isNull());
+    EXPECT_TRUE(CICad::CarregaBloco("ANINHADO", aninhado).isNull());
+    EXPECT_FALSE(db().block("DUAS"));
+    const QString texto = saida();
+    EXPECT_TRUE(texto.contains("DUAS = " + duasCamadas)) << texto.toStdString();
+    EXPECT_TRUE(texto.contains("ANINHADO = " + aninhado));
+    EXPECT_EQ(texto.count('\n'), 4);
+}
+
+TEST_F(FacadeFixture, ABlockFileLoadsAtTheOriginThroughItsWindowsPath) {
+    const QString caminho = arquivoBloco("BORNE_A", {"REGUA", "NUMERO"}, [](zvdb::Database& b) {
+        b.header().setPoint("$INSBASE", {5, 5, 0});
+    });
+    // The product names its files with backslashes and ".dwg"; the ".dxf" beside answers.
+    QString windows = caminho;
+    windows.replace('/', '\\').replace(".dxf", ".dwg");
+    EXPECT_TRUE(CICad::ExisteArquivo(windows));
+    const OdDbObjectId id = CICad::CarregaBloco("BORNE_A", windows);
+    ASSERT_FALSE(id.isNull());
+    zvdb::BlockRecord* bloco = db().block("BORNE_A");
+    ASSERT_TRUE(bloco);
+    EXPECT_EQ(bloco->basePoint(), (zvdb::Point3{0, 0, 0}));
+    bool achouLinha = false;
+    for (zvdb::Entity* e : bloco->entities())
+        if (e->isType("LINE")) {
+            achouLinha = true;
+            EXPECT_EQ(e->point(10), (zvdb::Point3{-5, -5, 0}));
+            EXPECT_EQ(e->point(11), (zvdb::Point3{5, -5, 0}));
+        }
+    EXPECT_TRUE(achouLinha);
+}
+
+TEST_F(FacadeFixture, ARealDwgFileIsRefusedWithAMessage) {
+    QFile dwg(arquivo("REAL.dwg"));
+    ASSERT_TRUE(dwg.open(QIODevice::WriteOnly));
+    dwg.write("AC1032\0\0\0binary", 16);
+    dwg.close();
+    EXPECT_TRUE(CICad::CarregaBloco("REAL", arquivo("REAL.dwg")).isNull());
+    EXPECT_TRUE(saida().contains("this edition reads DXF drawings only"));
+}
+
+TEST_F(FacadeFixture, InsertingMakesAttributesAndKeepsSinglePrecision) {
+    const QString caminho = arquivoBloco("BORNE_B", {"REGUA", "NUMERO"});
+    const OdDbObjectId ref =
+        CICad::InsereBloco(caminho, "BORNE_B", "ESQ$0001$A", 0.1, 1234.567891234, 0, 0.3);
+    ASSERT_FALSE(ref.isNull());
+    EXPECT_TRUE(CICad::ExisteLayer("ESQ$0001$A"));
+    auto* referencia = dynamic_cast<zvdb::BlockReference*>(db().objectByHandle(ref.handle()));
+    ASSERT_TRUE(referencia);
+    EXPECT_EQ(referencia->position().x, 0.10000000149011612);
+    EXPECT_EQ(referencia->position().y, 1234.5678710937500);
+    EXPECT_NEAR(referencia->rotation(), double(float(0.3)) * 180.0 / M_PI, 1e-9);
+    std::unique_ptr<zv::CEListaAtributos> atributos;
+    CICad::GetAtributos(ref, atributos, true, false);
+    ASSERT_TRUE(atributos);
+    ASSERT_EQ(atributos->Quantidade(), 2);
+    EXPECT_EQ((*atributos)[0].GetTag(), "REGUA");
+    EXPECT_EQ((*atributos)[0].GetPrompt(), "prompt REGUA");
+    EXPECT_THROW((*atributos)[2], std::invalid_argument);
+    // A missing file gives no reference and changes nothing but the layer table.
+    EXPECT_TRUE(CICad::InsereBloco(arquivo("FALTA.dxf"), "FALTA", "NOVA", 0, 0, 0, 0).isNull());
+    EXPECT_TRUE(CICad::ExisteLayer("NOVA"));
+    EXPECT_FALSE(db().block("FALTA"));
+}
+
+TEST_F(FacadeFixture, RedefiningABlockKeepsValuesAndDropsRemovedTags) {
+    const QString v1 = arquivoBloco("REGUA_V1", {"REGUA", "NUMERO", "VELHO"});
+    const OdDbObjectId ref = CICad::InsereBloco(v1, "BORNE_C", "0", 0, 0, 0, 0);
+    CICad::SetAtributo(ref, "regua", "X1");
+    CICad::SetAtributo(ref, "NUMERO", "12");
+    CICad::SetAtributo(ref, "VELHO", "fora");
+    const QString v2 = arquivoBloco("REGUA_V2", {"NUMERO", "REGUA", "NOVO"});
+    ASSERT_TRUE(CICad::RecarregaBloco(v2, "BORNE_C"));
+    std::unique_ptr<zv::CEListaAtributos> atributos;
+    CICad::GetAtributos(ref, atributos, false, false);
+    ASSERT_TRUE(atributos);
+    QStringList pares;
+    for (int i = 0; i < atributos->Quantidade(); ++i)
+        pares << (*atributos)[i].GetTag() + "=" + (*atributos)[i].GetValor();
+    EXPECT_EQ(pares, QStringList({"NUMERO=12", "REGUA=X1", "NOVO="}));
+    // The temporary block is gone.
+    for (zvdb::BlockRecord* bloco : db().blocks())
+        EXPECT_FALSE(QString::fromStdString(std::string(bloco->name())).startsWith("ZV_TMP_"));
+}
+
+TEST_F(FacadeFixture, AttributesByLanguageTriple) {
+    const QString caminho = arquivoBloco("TERMINAL_EN", {"STRIP", "NUMBER"});
+    const OdDbObjectId ref = CICad::InsereBloco(caminho, "TERMINAL_EN", "0", 0, 0, 0, 0);
+    CICad::SetAtributo(ref, "STRIP", "  X7 ");
+    std::unique_ptr<zv::CEAtributo> atributo;
+    EXPECT_EQ(CICad::GetAtributoTraduzido(CampoTraduzido::Regua, ref, atributo), 0);
+    ASSERT_TRUE(atributo);
+    EXPECT_EQ(atributo->GetTag(), "STRIP");
+    EXPECT_EQ(atributo->GetValor(), "X7");
+    std::unique_ptr<zv::CEAtributo> pino;
+    EXPECT_EQ(CICad::GetAtributoTraduzido(CampoTraduzido::Pino, ref, pino), 2);
+    EXPECT_FALSE(pino);
+    EXPECT_EQ(CICad::TagTraduzida(CampoTraduzido::Regua, 9), "REGUA");
+    EXPECT_TRUE(CICad::EhTagFio("fio"));
+    EXPECT_TRUE(CICad::EhTagFio("Alambre"));
+    EXPECT_FALSE(CICad::EhTagFio("CABLE"));
+    // Setting a value through the record writes the drawing.
+    atributo->SetValor("X8");
+    EXPECT_EQ(CICad::GetAtributo("strip", ref)->GetValor(), "X8");
+}
+
+TEST_F(FacadeFixture, VirtualAttributesFillEmptyFieldsWithABlank) {
+    zvdb::Entity* fio = db().modelSpace()->addLwPolyline({{0, 0, 0}, {10, 0, 0}}, false);
+    const OdDbObjectId id(&db(), fio->handle());
+    const QChar ff(0x0C);
+    CICad::SetXData(id, "KVR_ZV_ATT_VIRTUAL",
+                    {{1000, QString("TAG") + ff + ff + "s"},
+                     {1000, QString("CABO") + ff + "101" + ff + "N"},
+                     {1000, QString("QUEBRADO") + ff + "x"}});
+    std::unique_ptr<zv::CEListaAtributos> lista;
+    EXPECT_EQ(CICad::GetAtributosVirtuais(id, lista), 0);
+    ASSERT_EQ(lista->Quantidade(), 2);
+    EXPECT_EQ((*lista)[0].GetValor(), " ");
+    EXPECT_TRUE((*lista)[0].IsInvisivel());
+    EXPECT_FALSE((*lista)[1].IsInvisivel());
+    const auto cabo = CICad::GetAtributoEntidade("CABO", id);
+    ASSERT_TRUE(cabo);
+    EXPECT_EQ(cabo->GetValor(), "101");
+    EXPECT_TRUE(cabo->GetId().isNull());
+    EXPECT_FALSE(CICad::GetAtributoVirtual("QUEBRADO", id));
+    EXPECT_EQ(CICad::GetAtributosVirtuais(OdDbObjectId(), lista), 1);
+}
+
+TEST_F(FacadeFixture, MastersResolveThroughEachApplication) {
+    zvdb::BlockRecord* ms = db().modelSpace();
+    auto id = [this](zvdb::DbObject* o) { return OdDbObjectId(&db(), o->handle()); };
+    const OdDbObjectId mestre = id(ms->addCircle({0, 0, 0}, 1));
+    const QString h = ZVString::DeHandle(mestre.handle());
+    CICad::SetXData(mestre, "KVR_ZV", {{1000, "7001"}});
+    struct Caso {
+        const char* aplicacao;
+        CEListaXData itens;
+    };
+    const Caso casos[] = {{"KVR_LAYOUT_PAINEL", {{1000, h}}},
+                          {"KVR_ZV_UNIFILAR", {{1005, h}}},
+                          {"KVR_ZV_REPRESENTACAO", {{1000, "-50"}, {1000, h}}},
+                          {"KVR_ZV_ANILHAFIO", {{1000, h}}},
+                          {"KVR_ZV_ANILHACABO", {{1000, h}}}};
+    for (const Caso& caso : casos) {
+        const OdDbObjectId representacao = id(ms->addPoint({1, 1, 0}));
+        CICad::SetXData(representacao, caso.aplicacao, caso.itens);
+        EXPECT_EQ(CICad::GetSimboloMestre(&db(), representacao), mestre) << caso.aplicacao;
+    }
+    EXPECT_EQ(CICad::GetSimboloMestre(&db(), mestre), mestre);
+    // A representation with one item only, or pointing at an erased master, has none.
+    const OdDbObjectId curta = id(ms->addPoint({2, 2, 0}));
+    CICad::SetXData(curta, "KVR_ZV_REPRESENTACAO", {{1000, h}});
+    EXPECT_TRUE(CICad::GetSimboloMestre(&db(), curta).isNull());
+    int circuito = 0;
+    EXPECT_TRUE(CICad::GetCircuitoLocal(mestre, circuito));
+    EXPECT_EQ(circuito, 1);
+    CICad::SetXData(mestre, "KVR_ZV_CIRCLOC", {{1071, "3"}});
+    EXPECT_TRUE(CICad::GetCircuitoLocal(mestre, circuito));
+    EXPECT_EQ(circuito, 3);
+    db().objectByHandle(mestre.handle())->erase();
+    const OdDbObjectId orfa = id(ms->addPoint({3, 3, 0}));
+    CICad::SetXData(orfa, "KVR_ZV_ANILHAFIO", {{1000, h}});
+    EXPECT_TRUE(CICad::GetSimboloMestre(&db(), orfa).isNull());
+    EXPECT_FALSE(CICad::GetCircuitoLocal(orfa, circuito));
+}
+
+TEST_F(FacadeFixture, ProjectSettingsLiveOnThePointOfZvFreeze) {
+    EXPECT_EQ(CICad::GetOrdemGrupos(), 0);
+    CICad::SetOrdemGrupos(3);
+    CICad::SetOrdemPaginas("ESQ", 7);
+    CICad::SetCfgProjeto("painel.cfg");
+    EXPECT_EQ(CICad::GetOrdemGrupos(), 3);
+    EXPECT_EQ(CICad::GetOrdemPaginas("ESQ"), 7);
+    EXPECT_EQ(CICad::GetOrdemPaginas("OUTRO"), 0);
+    EXPECT_EQ(CICad::GetCfgProjeto(), "painel.cfg");
+    int pontos = 0;
+    for (zvdb::Entity* e : db().modelSpace()->entities())
+        if (e->isType("POINT") && e->layer() == "ZV_FREEZE") ++pontos;
+    EXPECT_EQ(pontos, 1);
+    CICad::SetNumeracaoPaginas(1);
+    EXPECT_EQ(CICad::GetNumeracaoPaginas(), 1);
+}
+
+TEST_F(FacadeFixture, TheStoreIsMadeByAReadAndKeepsRecords) {
+    EXPECT_FALSE(db().namedObjects()->get("ZV_DATA_MGR"));
+    EXPECT_TRUE(ZVData::CESerializable::CarregarClasse("CELayoutRotasFios").empty());
+    zvdb::Dictionary* loja = db().namedObjects()->getDictionary("ZV_DATA_MGR");
+    ASSERT_TRUE(loja);
+    EXPECT_TRUE(loja->getDictionary("CELayoutRotasFios"));
+
+    CELayoutRotasFios rota;
+    rota.strKeyFio = "101";
+    rota.strRotaData = "2A:1-2B:2-P1-P2-P3$3C-4D-X:Y:Z";
+    rota.Gravar();
+    EXPECT_TRUE(ZVData::CESerializable::Existe(rota.Chave(), "CELayoutRotasFios"));
+    const auto objetos = ZVData::CESerializable::CarregarClasse("CELayoutRotasFios");
+    ASSERT_EQ(objetos.size(), 1u);
+    EXPECT_EQ(objetos[0].first, rota.Chave());
+    CELayoutRotasFios lida;
+    lida.Carregar(objetos[0].second);
+    EXPECT_EQ(lida.strKeyFio, "101");
+    EXPECT_EQ(lida.strRotaData, rota.strRotaData);
+    // A second object gets another key; erasing one leaves the other.
+    CELayoutRotasFios outra;
+    EXPECT_NE(outra.Chave(), rota.Chave());
+    outra.Gravar();
+    rota.Apagar();
+    EXPECT_FALSE(ZVData::CESerializable::Existe(rota.Chave(), "CELayoutRotasFios"));
+    EXPECT_EQ(ZVData::CESerializable::CarregarClasse("CELayoutRotasFios").size(), 1u);
+    ZVData::CESerializable::ApagarClasse("CELayoutRotasFios");
+    EXPECT_FALSE(ZVData::CESerializable::Existe(outra.Chave(), "CELayoutRotasFios"));
+}
+
+TEST_F(FacadeFixture, ExtentsOfEntitiesAndReferences) {
+    zvdb::BlockRecord* ms = db().modelSpace();
+    double xMax, xMin, yMax, yMin;
+    const OdDbObjectId linha(&db(), ms->addLine({1, 2, 0}, {4, -1, 0})->handle());
+    ASSERT_TRUE(CICad::GetExtensao(linha, xMax, xMin, yMax, yMin, false));
+    EXPECT_EQ(QList<double>({xMax, xMin, yMax, yMin}), QList<double>({4, 1, 2, -1}));
+    const OdDbObjectId texto(&db(), ms->addText({0, 0, 0}, 2.5, "X1")->handle());
+    EXPECT_FALSE(CICad::GetExtensao(texto, xMax, xMin, yMax, yMin, false));
+    const QString caminho = arquivoBloco("CAIXA", {});
+    const OdDbObjectId ref = CICad::InsereBloco(caminho, "CAIXA", "0", 100, 50, 0, 0);
+    ASSERT_TRUE(CICad::GetExtensao(ref, xMax, xMin, yMax, yMin, false));
+    EXPECT_EQ(QList<double>({xMax, xMin, yMax, yMin}), QList<double>({110, 100, 50, 50}));
+}
+
+}  // namespace
