@@ -63,6 +63,7 @@ protected:
     friend class DxfLoader;
     friend class DxfWriter;
     friend class DeepCloner;
+    friend class R12Upgrade;
     void setBlockBegin(Entity* begin) { begin_ = begin; }
     void setBlockEnd(Entity* end) { end_ = end; }
     void appendEntity(Entity* entity);

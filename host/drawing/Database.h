@@ -112,6 +112,7 @@ private:
     friend class DxfLoader;
     friend class DxfWriter;
     friend class DeepCloner;
+    friend class R12Upgrade;
     struct Blank {};
     explicit Database(Blank);
 

@@ -7,6 +7,7 @@
 #include "DxfError.h"
 #include "LayerRecord.h"
 #include "Polyline.h"
+#include "R12Upgrade.h"
 #include "SymbolTable.h"
 #include "TagReader.h"
 #include "TagValues.h"
@@ -68,6 +69,7 @@ std::unique_ptr<DbObject> DxfLoader::makeOwnedObject(Database& database, std::ve
 std::unique_ptr<Database> DxfLoader::load(std::string bytes) {
     std::unique_ptr<Database> database(new Database(Database::Blank{}));
     loadInto(*database, std::move(bytes));
+    if (database->version() < "AC1015") return R12Upgrade::upgrade(*database);
     return database;
 }
 

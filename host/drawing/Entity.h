@@ -38,6 +38,7 @@ protected:
     friend class DxfLoader;
     friend class BlockRecord;
     friend class DeepCloner;
+    friend class R12Upgrade;
     void addSubEntity(Entity* sub);
     void setSeqend(Entity* seqend);
 

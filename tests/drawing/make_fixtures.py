@@ -73,6 +73,26 @@ def build(version):
     return doc
 
 
+def build_r12():
+    doc = ezdxf.new("R12")
+    doc.appids.new("KVR_ZV")
+    doc.layers.new("PAGE$1", dxfattribs={"color": 3})
+    doc.layers.new("FROZEN").freeze()
+    block = doc.blocks.new("BORNE_X", base_point=(1, 2))
+    block.add_line((0, 0), (10, 0))
+    block.add_attdef("REGUA", (0, 5), dxfattribs={"height": 2.5, "prompt": "Strip"})
+    msp = doc.modelspace()
+    line = msp.add_line((0, 0), (5, 5), dxfattribs={"layer": "PAGE$1"})
+    ref = msp.add_blockref("BORNE_X", (30, 0), dxfattribs={"layer": "PAGE$1"})
+    ref.add_attrib("REGUA", "X9", (30, 5))
+    ref.set_xdata("KVR_ZV", [(1000, "item"), (1005, line.dxf.handle)])
+    msp.add_polyline2d([(0, 0), (5, 5), (9, 1)], dxfattribs={"layer": "PAGE$1"})
+    msp.add_text(TEXT, dxfattribs={"height": 3})
+    msp.add_circle((1, 1), 2)
+    msp.add_arc((1, 1), 2, 0, 90)
+    return doc
+
+
 def inject(path, version):
     """Puts an unknown entity, an unknown object and an unknown group code into the text."""
     encoding = "utf8" if version >= "R2007" else "cp1252"
@@ -121,6 +141,7 @@ def main():
         path = os.path.join(folder, "fixture_%s.dxf" % version)
         doc.saveas(path)
         inject(path, version)
+    build_r12().saveas(os.path.join(folder, "fixture_R12.dxf"))
     # a binary DXF of the same drawing
     build("R2010").saveas(os.path.join(folder, "binary_R2010.dxf"), fmt="bin")
 
