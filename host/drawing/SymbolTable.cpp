@@ -34,7 +34,8 @@ std::size_t SymbolTable::size() const {
 
 void SymbolTable::add(DbObject* record) {
     records_.push_back(record);
-    byName_.try_emplace(TagValues::upperName(recordName(*record)), record);
+    const auto [it, added] = byName_.try_emplace(TagValues::upperName(recordName(*record)), record);
+    if (!added && it->second->isErased()) it->second = record;  // the name is free again
 }
 
 void SymbolTable::reindex() {

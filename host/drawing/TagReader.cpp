@@ -2,6 +2,7 @@
 
 #include "DxfError.h"
 
+#include <algorithm>
 #include <charconv>
 #include <cstring>
 
@@ -131,7 +132,7 @@ bool TagReader::isBinary(std::string_view data) {
 
 std::vector<Tag> TagReader::readAscii(std::string_view text) {
     std::vector<Tag> tags;
-    tags.reserve(text.size() / 14 + 16);
+    tags.reserve(static_cast<std::size_t>(std::count(text.begin(), text.end(), '\n')) / 2 + 2);
     const char* p = text.data();
     const char* end = p + text.size();
     if (text.size() >= 3 && std::memcmp(p, "\xEF\xBB\xBF", 3) == 0) p += 3;

@@ -84,6 +84,11 @@ TEST_F(DatabaseApi, LayersKeepTheirStatesAndExtendedData) {
     EXPECT_FALSE(db.layer("PAGE$1$SELO")->isFrozen());
     db.layer("PAGE$1$SELO")->setFrozen(true);
     EXPECT_TRUE(db.layer("HIDDEN")->isOff());
+    db.layer("LOCKED")->erase();
+    EXPECT_EQ(db.layer("LOCKED"), nullptr);
+    LayerRecord* again = db.createLayer("LOCKED");
+    EXPECT_EQ(db.layer("locked"), again) << "an erased name can be used again";
+    again->setLocked(true);
     EXPECT_EQ(db.layer("HIDDEN")->color(), 7);
 
     const QJsonObject layers = inspect(db)["layers"].toObject();
