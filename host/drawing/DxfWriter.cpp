@@ -2,6 +2,7 @@
 
 #include "BlockRecord.h"
 #include "Database.h"
+#include "Dictionary.h"
 #include "DxfError.h"
 #include "Entity.h"
 #include "SymbolTable.h"
@@ -132,8 +133,22 @@ void DxfWriter::writeRaw(const std::string& name) {
 
 void DxfWriter::writeObject(const DbObject& object) {
     if (object.isErased()) return;
-    for (const Tag& t : object.tags())
-        tag(t.code, t.value);
+    const auto tags = object.tags();
+    const bool dictionary = dynamic_cast<const Dictionary*>(&object) != nullptr;
+    for (std::size_t i = 0; i < tags.size(); ++i) {
+        // An entry whose object was erased is left out with its name.
+        if (dictionary && tags[i].code == 3 && i + 1 < tags.size() && isErasedObject(tags[i + 1])) {
+            ++i;
+            continue;
+        }
+        tag(tags[i].code, tags[i].value);
+    }
+}
+
+bool DxfWriter::isErasedObject(const Tag& pointer) const {
+    if (pointer.code != 350 && pointer.code != 360) return false;
+    const auto it = db_.byHandle_.find(TagValues::toHandle(pointer.value));
+    return it != db_.byHandle_.end() && it->second->isErased();
 }
 
 void DxfWriter::writeEntity(const Entity& entity) {

@@ -5,6 +5,8 @@
 // characters it lacks; R2007 and later in UTF-8.
 #include <string>
 
+#include "Tag.h"
+
 namespace zvdb {
 
 class Database;
@@ -28,6 +30,7 @@ private:
     void writeObject(const class DbObject& object);
     void writeEntity(const class Entity& entity);
     void tag(int code, std::string_view value);
+    bool isErasedObject(const Tag& pointer) const;
 
     Database& db_;
     std::string out_;

@@ -205,6 +205,12 @@ TEST_F(DatabaseApi, DictionariesAndXrecordsByPath) {
     cls->getDictionary("77")->erase();
     EXPECT_EQ(cls->size(), 1u) << "an erased dictionary leaves its parent";
     EXPECT_EQ(cls->get("77"), nullptr);
+    // An entry that only points at an object (not its owner) is dropped when it is erased.
+    XRecord* shared = cls->getOrCreateXRecord("shared");
+    db.namedObjects()->getOrCreateDictionary("OTHER")->setAt("alias", *shared);
+    shared->setOwner(cls->handle());
+    shared->erase();
+    EXPECT_EQ(DxfWriter::toText(db).find("alias"), std::string::npos);
 
     Entity* line = db.modelSpace()->addLine({0, 0, 0}, {1, 1, 0});
     Dictionary* xdict = line->getOrCreateExtensionDictionary();
