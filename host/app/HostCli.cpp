@@ -23,6 +23,10 @@ const Subcommand kSubcommands[] = {
      "catalogue --check | --sql STATEMENT | --lookup OPERATION ARG...   the catalogue the\n"
      "                    settings name: engine and schema, one statement, one look-up",
      runCatalogueSubcommand},
+    {"generate",
+     "generate --out FILE.dxf [--seed N] [--terminals N] [--pages N] [--data DIR]\n"
+     "                    a sample project; --blocks DIR writes the product's block drawings",
+     runGenerateSubcommand},
 };
 
 const char* const kUsage =

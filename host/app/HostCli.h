@@ -29,5 +29,6 @@ int runHost(const QStringList& args, QTextStream& out, QTextStream& err, QTextSt
 int runLispSubcommand(CliContext& context);
 int runDxfInfoSubcommand(CliContext& context);
 int runCatalogueSubcommand(CliContext& context);
+int runGenerateSubcommand(CliContext& context);
 
 }  // namespace zvhost

@@ -1,0 +1,84 @@
+#include "sample/StripPlanner.h"
+
+#include <cstdio>
+#include <utility>
+
+namespace zvsample {
+
+namespace {
+
+const TagSet kTagSets[3] = {{"REGUA", "NUMERO"}, {"STRIP", "NUMBER"}, {"REGLETA", "NUMERO"}};
+
+struct TerminalKind {
+    const char* key;
+    const char* block;
+};
+// Mostly feed-through terminals, now and then neutral, earth, disconnect and fuse ones.
+const TerminalKind kKinds[] = {{"1001", "BORNE_PASSAGEM"}, {"1001", "BORNE_PASSAGEM"},
+                               {"1001", "BORNE_PASSAGEM"}, {"1002", "BORNE_PASSAGEM"},
+                               {"1010", "BORNE_PASSAGEM"}, {"1004", "BORNE_NEUTRO"},
+                               {"1005", "BORNE_TERRA"},    {"1007", "BORNE_SECCIONAVEL"},
+                               {"1008", "BORNE_FUSIVEL"},  {"1009", "BORNE_DOIS_NIVEIS"}};
+
+// "n+1,n+2" style list of the group's other members.
+std::string jumperText(int first, int size, int self) {
+    char buffer[64];
+    int used = 0;
+    for (int n = first; n < first + size; ++n) {
+        if (n == self) continue;
+        used += std::snprintf(buffer + used, sizeof buffer - static_cast<std::size_t>(used),
+                              used ? ",%d" : "%d", n);
+    }
+    return std::string(buffer, static_cast<std::size_t>(used));
+}
+
+}  // namespace
+
+const TagSet& tagSet(int language) {
+    return kTagSets[language >= 0 && language < 3 ? language : 0];
+}
+
+StripPlanner::StripPlanner(SampleRandom& random, std::string prefix, int firstStrip)
+    : random_(random), prefix_(std::move(prefix)), stripIndex_(firstStrip - 1) {}
+
+void StripPlanner::startStrip() {
+    ++stripIndex_;
+    left_ = random_.between(12, 40);
+    next_ = random_.chance(15) ? random_.between(2, 9) : 1;
+    jumperLeft_ = 0;
+    stripName_.assign(prefix_).append(std::to_string(stripIndex_));
+}
+
+std::vector<PlannedTerminal> StripPlanner::plan(int count) {
+    std::vector<PlannedTerminal> terminals;
+    terminals.reserve(static_cast<std::size_t>(count));
+    int groupFirst = 0, groupSize = 0;
+    for (int i = 0; i < count; ++i) {
+        if (left_ == 0) startStrip();
+        PlannedTerminal t;
+        t.language = stripIndex_ % 3;
+        t.standard.assign(1, t.language == 1 ? '2' : '1');
+        t.strip = stripName_;
+        if (jumperLeft_ == 0 && random_.chance(4)) next_ += random_.between(1, 2);  // a gap
+        t.number = next_++;
+        if (jumperLeft_ == 0 && left_ >= 3 && random_.chance(12)) {
+            groupFirst = t.number;
+            groupSize = random_.between(2, 3);
+            jumperLeft_ = groupSize;
+        }
+        if (jumperLeft_ > 0) {
+            t.jumper = jumperText(groupFirst, groupSize, t.number);
+            --jumperLeft_;
+        }
+        const TerminalKind& kind = kKinds[random_.below(10)];
+        t.key = kind.key;
+        t.block = kind.block;
+        if (random_.chance(5)) t.block = "BOR-PASSAGEM";
+        t.inverted = random_.chance(5);
+        --left_;
+        terminals.push_back(std::move(t));
+    }
+    return terminals;
+}
+
+}  // namespace zvsample
