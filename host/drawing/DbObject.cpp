@@ -157,9 +157,13 @@ std::size_t DbObject::appGroupEnd(std::string_view group) const {
 std::size_t DbObject::xdataStart() const {
     const auto all = tags();
     if (type() == "XRECORD") return all.size();
-    for (std::size_t i = 1; i < all.size(); ++i)
-        if (all[i].code == 1001) return i;
-    return all.size();
+    // Extended data is the run of codes 1000 and above at the end, opened by a 1001.
+    std::size_t start = all.size();
+    while (start > 1 && all[start - 1].code >= 1000)
+        --start;
+    while (start < all.size() && all[start].code != 1001)
+        ++start;
+    return start;
 }
 
 int DbObject::indexOf(int code, std::size_t from) const {

@@ -34,8 +34,9 @@ const Dictionary::Index& Dictionary::index() const {
         const std::size_t end = xdataStart();
         for (std::size_t i = headerEnd(); i + 1 < end; ++i) {
             if (all[i].code == 3 && isEntryPointer(all[i + 1].code)) {
-                index_->byName.try_emplace(TagValues::upperName(all[i].value),
-                                           TagValues::toHandle(all[i + 1].value));
+                const std::uint64_t handle = TagValues::toHandle(all[i + 1].value);
+                if (index_->byName.try_emplace(TagValues::upperName(all[i].value), handle).second)
+                    index_->positionOf.try_emplace(handle, i);
                 ++i;
             }
         }
@@ -63,13 +64,13 @@ XRecord* Dictionary::getXRecord(std::string_view name) const {
 }
 
 void Dictionary::setAt(std::string_view name, DbObject& object) {
-    if (DbObject* old = get(name); old && old != &object) {
+    const auto& byName = index().byName;
+    if (const auto it = byName.find(TagValues::upperName(name)); it != byName.end()) {
+        DbObject* old = database().objectByHandle(it->second);
+        if (old == &object) return;
         remove(name);
-        old->erase();
-    } else if (old == &object) {
-        return;
+        if (old) old->erase();
     }
-    remove(name);  // a stale entry whose object is gone
     object.setOwner(handle());
     const std::int16_t code = isHardOwner() ? 360 : 350;
     const std::size_t at = xdataStart();
@@ -77,39 +78,34 @@ void Dictionary::setAt(std::string_view name, DbObject& object) {
                           Tag{code, store(TagValues::fromHandle(object.handle()))}};
     auto& all = editTags();
     all.insert(all.begin() + static_cast<std::ptrdiff_t>(at), entry, entry + 2);
-    index();
     index_->byName[TagValues::upperName(name)] = object.handle();
+    index_->positionOf[object.handle()] = at;
+}
+
+void Dictionary::removeAt(std::size_t position) {
+    auto& all = editTags();
+    index_->byName.erase(TagValues::upperName(all[position].value));
+    index_->positionOf.erase(TagValues::toHandle(all[position + 1].value));
+    all[position].code = kRemovedTag;
+    all[position + 1].code = kRemovedTag;
+    if (++removedMarks_ < 64 || removedMarks_ * 2 < index_->byName.size()) return;
+    std::erase_if(all, [](const Tag& tag) { return tag.code == kRemovedTag; });
+    removedMarks_ = 0;
+    index_.reset();
 }
 
 bool Dictionary::remove(std::string_view name) {
-    const auto all = tags();
-    const std::size_t end = xdataStart();
-    for (std::size_t i = headerEnd(); i + 1 < end; ++i) {
-        if (all[i].code == 3 && isEntryPointer(all[i + 1].code) &&
-            TagValues::sameName(all[i].value, name)) {
-            auto& edit = editTags();
-            edit.erase(edit.begin() + static_cast<std::ptrdiff_t>(i),
-                       edit.begin() + static_cast<std::ptrdiff_t>(i) + 2);
-            index_.reset();
-            return true;
-        }
-    }
-    return false;
+    const auto& byName = index().byName;
+    const auto it = byName.find(TagValues::upperName(name));
+    if (it == byName.end()) return false;
+    removeAt(index_->positionOf.at(it->second));
+    return true;
 }
 
 void Dictionary::forgetEntry(std::uint64_t handle) {
-    const auto all = tags();
-    const std::size_t end = xdataStart();
-    for (std::size_t i = headerEnd(); i + 1 < end; ++i) {
-        if (all[i].code == 3 && isEntryPointer(all[i + 1].code) &&
-            TagValues::toHandle(all[i + 1].value) == handle) {
-            auto& edit = editTags();
-            edit.erase(edit.begin() + static_cast<std::ptrdiff_t>(i),
-                       edit.begin() + static_cast<std::ptrdiff_t>(i) + 2);
-            index_.reset();
-            return;
-        }
-    }
+    const auto& positions = index().positionOf;
+    const auto it = positions.find(handle);
+    if (it != positions.end()) removeAt(it->second);
 }
 
 Dictionary* Dictionary::getOrCreateDictionary(std::string_view name) {
@@ -124,6 +120,14 @@ XRecord* Dictionary::getOrCreateXRecord(std::string_view name) {
     XRecord* created = database().createXRecord(*this);
     setAt(name, *created);
     return created;
+}
+
+bool Dictionary::isHardOwner() const {
+    // The flag stands before the entries; a long dictionary is not searched to its end.
+    const auto all = tags();
+    for (std::size_t i = headerEnd(); i < all.size() && all[i].code != 3; ++i)
+        if (all[i].code == 280) return TagValues::toInteger(all[i].value) == 1;
+    return false;
 }
 
 void Dictionary::erase() {

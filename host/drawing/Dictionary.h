@@ -36,7 +36,7 @@ public:
     // The sub-dictionary of this name, made when missing.
     Dictionary* getOrCreateDictionary(std::string_view name);
     XRecord* getOrCreateXRecord(std::string_view name);
-    bool isHardOwner() const { return integer(280) == 1; }
+    bool isHardOwner() const;
     // Erases the dictionary and the objects it owns.
     void erase() override;
 
@@ -45,11 +45,17 @@ protected:
     void forgetEntry(std::uint64_t handle);
 
 private:
+    // Entries by name, and the tag position of each entry by its object's handle.
     struct Index {
         std::unordered_map<std::string, std::uint64_t> byName;
+        std::unordered_map<std::uint64_t, std::size_t> positionOf;
     };
     const Index& index() const;
+    // Takes the entry at a tag position out; the two tags stay as removed marks (left out by
+    // the writer) until there are many, then they are swept away at once.
+    void removeAt(std::size_t position);
     mutable std::unique_ptr<Index> index_;
+    std::size_t removedMarks_ = 0;
 };
 
 }  // namespace zvdb

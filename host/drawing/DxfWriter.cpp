@@ -141,7 +141,7 @@ void DxfWriter::writeObject(const DbObject& object) {
             ++i;
             continue;
         }
-        tag(tags[i].code, tags[i].value);
+        if (tags[i].code != kRemovedTag) tag(tags[i].code, tags[i].value);
     }
 }
 

@@ -15,6 +15,9 @@ struct Tag {
 };
 
 // How a group code's value is stored in binary DXF.
+// The code of a tag that was taken out of an object and is no longer written.
+inline constexpr std::int16_t kRemovedTag = -32768;
+
 enum class ValueKind { String, Real, Int16, Int32, Int64, Bool, Binary, Handle };
 
 ValueKind valueKind(int code);

@@ -229,6 +229,22 @@ TEST_F(DatabaseApi, DictionariesAndXrecordsByPath) {
     EXPECT_TRUE(lineSeen["xdict"].toObject().contains("NOTE"));
 }
 
+TEST_F(DatabaseApi, ADictionaryHoldsAHundredThousandEntries) {
+    const std::vector<std::string> path = {"ESQ_VIRTUAL_ZV"};
+    Dictionary* store = db.dictionaryAt(path, true);
+    for (int i = 0; i < 100000; ++i)
+        store->getOrCreateXRecord(std::to_string(i));
+    EXPECT_EQ(store->size(), 100000u);
+    EXPECT_NE(store->getXRecord("99999"), nullptr);
+    for (int i = 0; i < 100000; i += 2)
+        store->getXRecord(std::to_string(i))->erase();
+    EXPECT_EQ(store->size(), 50000u);
+    EXPECT_EQ(store->getXRecord("2"), nullptr);
+    EXPECT_NE(store->getXRecord("3"), nullptr);
+    auto again = reloaded(db);
+    EXPECT_EQ(again->dictionaryAt(path, false)->size(), 50000u);
+}
+
 TEST_F(DatabaseApi, HandlesAreUniqueStableAndErasedObjectsVanish) {
     db.createLayer("PAGE");
     BlockReference* reference = insertTerminal(db, {0, 0, 0}, "1");
