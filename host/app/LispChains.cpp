@@ -1,6 +1,7 @@
 #include "LispChains.h"
 
 #include "lisp/Printer.h"
+#include "lisp/SmallVector.h"
 
 namespace zvhost {
 
@@ -113,36 +114,36 @@ Value LispChains::atom(zvlisp::Interpreter& lisp, const ResultBuffer& node) {
     }
 }
 
-std::vector<Value> LispChains::values(zvlisp::Interpreter& lisp, const ResultBuffer* chain) {
+template <typename Emit>
+void LispChains::read(zvlisp::Interpreter& lisp, const ResultBuffer* chain, Emit emitTop) {
     struct Level {
         zvlisp::ListBuilder list;
         bool dotted = false;
     };
-    std::vector<Level> open;
-    std::vector<Value> top;
+    zvlisp::SmallVector<Level, 8> open;
     auto emit = [&](Value v) {
         if (open.empty())
-            top.push_back(std::move(v));
+            emitTop(std::move(v));
         else if (open.back().dotted)
             open.back().list.setTail(std::move(v));
         else
             open.back().list.add(std::move(v));
     };
+    auto close = [&] {
+        Value list = open.back().list.take();
+        open.pop_back();
+        emit(std::move(list));
+    };
     for (const ResultBuffer* node = chain; node; node = node->rbnext) {
         switch (node->restype) {
             case zvsdk::RTLB:
-                open.emplace_back();
+                open.push_back(Level());
                 break;
             case zvsdk::RTDOTE:
                 if (!open.empty() && !open.back().list.empty()) open.back().dotted = true;
                 break;
             case zvsdk::RTLE:
-                if (open.empty()) break;  // an unmatched end is ignored
-                {
-                    Value list = open.back().list.take();
-                    open.pop_back();
-                    emit(std::move(list));
-                }
+                if (!open.empty()) close();  // an unmatched end is ignored
                 break;
             case zvsdk::RTNONE:
                 break;
@@ -150,19 +151,29 @@ std::vector<Value> LispChains::values(zvlisp::Interpreter& lisp, const ResultBuf
                 emit(atom(lisp, *node));
         }
     }
-    while (!open.empty()) {  // unclosed lists end with the chain
-        Value list = open.back().list.take();
-        open.pop_back();
-        emit(std::move(list));
-    }
+    while (!open.empty())
+        close();  // unclosed lists end with the chain
+}
+
+std::vector<Value> LispChains::values(zvlisp::Interpreter& lisp, const ResultBuffer* chain) {
+    std::vector<Value> top;
+    read(lisp, chain, [&](Value v) { top.push_back(std::move(v)); });
     return top;
 }
 
 Value LispChains::value(zvlisp::Interpreter& lisp, const ResultBuffer* chain) {
-    std::vector<Value> all = values(lisp, chain);
-    if (all.empty()) return Value();
-    if (all.size() == 1) return std::move(all.front());
-    return zvlisp::Interpreter::fromVector(all);
+    Value first;
+    zvlisp::ListBuilder several;
+    int count = 0;
+    read(lisp, chain, [&](Value v) {
+        if (++count == 1) {
+            first = std::move(v);
+            return;
+        }
+        if (count == 2) several.add(first);
+        several.add(std::move(v));
+    });
+    return count > 1 ? several.take() : first;
 }
 
 }  // namespace zvhost

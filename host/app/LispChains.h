@@ -23,6 +23,9 @@ public:
     static zvlisp::Value value(zvlisp::Interpreter& lisp, const zvsdk::ResultBuffer* chain);
 
 private:
+    // Calls `emit` with each top-level value of the chain.
+    template <typename Emit>
+    static void read(zvlisp::Interpreter& lisp, const zvsdk::ResultBuffer* chain, Emit emit);
     static void append(const zvlisp::Value& value, zvsdk::ResultBuffer**& tail, int depth);
     static zvlisp::Value atom(zvlisp::Interpreter& lisp, const zvsdk::ResultBuffer& node);
 };

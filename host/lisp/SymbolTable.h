@@ -24,7 +24,11 @@ public:
     std::vector<Symbol*> all();
 
 private:
+    Symbol* lookUp(const QString& name) const;
+
     QHash<QString, Symbol*> byName_;
+    // Names as code spells them ("reg" for REG), to skip upper-casing on every look-up.
+    QHash<QString, Symbol*> bySpelling_;
     std::deque<Symbol> symbols_;
 };
 
