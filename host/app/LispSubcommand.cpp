@@ -42,7 +42,11 @@ bool evaluateTyped(zvlisp::Interpreter& lisp, const QString& text, QTextStream& 
         if (!lisp.evaluateForms(zvlisp::Value::cons(cell->asCons()->car, zvlisp::Value()), &result))
             continue;
         if (result.isSymbol() && result.asSymbol()->name.isEmpty()) continue;  // (princ)
-        out << zvlisp::Printer::prin1(result) << "\n";
+        try {
+            out << zvlisp::Printer::prin1(result) << "\n";
+        } catch (zvlisp::LispError& error) {  // nested too deep to print
+            lisp.report(error);
+        }
     }
     out.flush();
     return true;

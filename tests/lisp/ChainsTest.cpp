@@ -92,10 +92,12 @@ TEST(LispSubcommandTest, RunsAFileAndReportsFailure) {
 
 TEST(LispSubcommandTest, PromptSessionGoesOnAfterErrors) {
     QString outText, errText;
-    QString inText = "(setq a 2)\n(car a)\n(defun sq (x)\n  (* x x))\n(sq a) (princ)\n\"open";
+    QString inText =
+        "(setq a 2)\n(car a)\n(defun sq (x)\n  (* x x))\n(sq a) (princ)\n"
+        "(repeat 3000 (setq deep (list deep)))\n\"open";
     QTextStream out(&outText), err(&errText), in(&inText);
     EXPECT_EQ(zvhost::runHost({"lisp"}, out, err, in), zvhost::kExitOk);
     EXPECT_EQ(outText,
               "2\n; error: bad argument type: consp 2\nSQ\n4\n"
-              "; error: malformed string on input\n");
+              "; error: stack overflow\n; error: malformed string on input\n");
 }
