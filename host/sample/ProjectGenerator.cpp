@@ -287,8 +287,7 @@ void ProjectGenerator::Impl::writeSettings() {
     setXData(*point, "KVR_ZV_CFG", XDataItems().text("demo.cfg"));
     setXData(*point, "KVR_ZV_PAINEL", XDataItems().text("PAINEL_1"));
     zvdb::Dictionary* root = db_->namedObjects();
-    zvdb::XRecord* stamp = root->getOrCreateXRecord("ZV_VERSAO");
-    stamp->setData(XDataItems().add(1, "ZVListas").tags());
+    zvdb::Dictionary* stamp = root->getOrCreateDictionary("ZV_VERSAO");
     setXData(*stamp, "ZV_VERSAO", XDataItems().text("ZVListas").text("2022.0"));
 }
 
@@ -555,6 +554,13 @@ void ProjectGenerator::Impl::drawPowerPage() {
         setXData(*bar, "KVR_ZV", XDataItems().text(keyText("8001", "1")));
         setXData(*bar, "KVR_ZV_PTS_CORTE", XDataItems().point({20, busY[i]}).point({320, busY[i]}));
     }
+    std::vector<SymbolAttribute> earthTaps = {{"RELACAO", "-WPE", {0, 2}}};
+    for (int m = 0; m < motors; ++m)
+        earthTaps.push_back({"LIGACAO" + std::to_string(m + 1), "PE", {50.0 + m * 120, 0}});
+    zvdb::BlockReference* earth =
+        symbols_->insert("BUS_BARRAMENTO_PE", {20, 255}, layer, earthTaps);
+    setXData(*earth, "KVR_ZV", XDataItems().text(keyText("8001", "1")));
+    setXData(*earth, "KVR_ZV_PTS_CORTE", XDataItems().point({20, 255}).point({320, 255}));
     std::vector<std::size_t> coils;
     for (std::size_t k = 0; k < masters_.size() && coils.size() < 2; ++k)
         if (masters_[k].key == "2001" || masters_[k].key == "2005") coils.push_back(k);
@@ -592,7 +598,10 @@ void ProjectGenerator::Impl::drawPowerPage() {
             t.standard = "1";
             drawTerminal(layer, {x, 80}, t);
             drawLead(layer, {{x, 70}, {x, 40}}, "20005", record, i + 1);
-            if (i == 3) continue;
+            if (i == 3) {
+                drawWire(layer, "PE", {{x, 255}, {x, 80}}, "10015", "1");
+                continue;
+            }
             drawWire(layer, "L" + std::to_string(i + 1), {{x, busY[i]}, {x, 240}}, "10011", "1");
             const std::string out = nextWire(), mid = nextWire(), down = nextWire();
             if (!coils.empty()) {
