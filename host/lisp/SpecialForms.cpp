@@ -2,6 +2,8 @@
 #include "Builtins.h"
 #include "Interpreter.h"
 
+#include <algorithm>
+
 namespace zvlisp {
 
 namespace {
@@ -144,6 +146,17 @@ void registerSpecialForms(Interpreter& in) {
     in.defineSpecial("foreach", foreach);
     in.defineSpecial("and", andForm);
     in.defineSpecial("or", orForm);
+    // (apply 'and list) and (apply 'or list) are common: as values, and, or and progn are
+    // functions of evaluated arguments.
+    in.define("and", [](Interpreter& in, Args a) {
+        return in.boolean(
+            std::none_of(a.begin(), a.end(), [](const Value& v) { return v.isNil(); }));
+    });
+    in.define("or", [](Interpreter& in, Args a) {
+        return in.boolean(
+            std::any_of(a.begin(), a.end(), [](const Value& v) { return !v.isNil(); }));
+    });
+    in.define("progn", [](Interpreter&, Args a) { return a.size() ? a[a.size() - 1] : Value(); });
     in.defineSpecial("lambda", lambda);
     in.defineSpecial("defun", defun);
     in.defineSpecial("defun-q", defunQ);

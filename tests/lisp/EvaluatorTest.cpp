@@ -58,6 +58,9 @@ TEST_F(EvaluatorTest, ControlForms) {
     EXPECT_EQ(ev("(or nil 5)"), "T");
     EXPECT_EQ(ev("(or)"), "nil");
     EXPECT_EQ(ev("(progn 1 2 3)"), "3");
+    EXPECT_EQ(ev("(apply 'and (mapcar 'numberp '(1 2.0)))"), "T");
+    EXPECT_EQ(ev("(apply 'or '(nil nil))"), "nil");
+    EXPECT_EQ(ev("(and nil (car 1))"), "nil");  // as a form it still stops early
     EXPECT_EQ(ev("(eval '(+ 1 2))"), "3");
     EXPECT_EQ(ev("(setq a 1 b (+ a 1))"), "2");
     EXPECT_EQ(ev("(setq a)"), "ERROR: too few arguments");
