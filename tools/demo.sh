@@ -14,6 +14,15 @@ echo "== the demo catalogue (SQLite) from data/catalogue"
 "$BIN/zvhost" catalogue --set Database=SQLITE NetworkZV="$ZV_DATA_DIR/" DBName=catalogo.db \
     libLang=1
 "$BIN/zvhost" catalogue --check
-echo "== zvhost: a new drawing, the module loaded, the terminal list command"
-"$BIN/zvhost" --quiet "$OUT/demo.dxf" gerarListaBornesGrf
+echo "== the demo project and the product data (blocks, templates, configuration)"
+PRODUCT="$OUT/produto"
+rm -rf "$PRODUCT"
+mkdir -p "$PRODUCT"
+cp -r "$ROOT/data/templates" "$ROOT/data/config" "$PRODUCT/"
+"$BIN/zvhost" generate --out "$OUT/demo.dxf" --seed 1 --terminals 120 --pages 10 \
+    --data "$PRODUCT"
+export ZV_PRODUCT_DIR="$PRODUCT/"
+echo "== zvhost: the demo project, the module loaded, the terminal list command"
+"$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$OUT/demo.dxf" \
+    -o "$OUT/demo-listas.dxf" gerarListaBornesGrf
 echo "== results in $OUT"
