@@ -4,6 +4,7 @@
 #include "OdDbObjectId.h"
 #include "host/sdk/ResultBuffer.h"
 
+#include <QHash>
 #include <QString>
 #include <QStringList>
 
@@ -146,6 +147,35 @@ public:
     // The attribute's own value and invisibility, written to the drawing.
     static void SetValorAtributo(const OdDbObjectId& atributo, const QString& valor);
     static bool SetInvisivelAtributo(const OdDbObjectId& atributo, bool invisivel);
+
+    // ---- entities, as the readers see them
+    // The DXF type: "INSERT", "LWPOLYLINE", "POLYLINE", "XRECORD"...; empty for no object.
+    static QString TipoEntidade(const OdDbObjectId& id);
+    static bool EhReferencia(const OdDbObjectId& id);
+    static bool EhPolilinha(const OdDbObjectId& id);
+    static QString GetLayerEntidade(const OdDbObjectId& id);
+    // The vertices of a polyline, in the drawing's coordinates.
+    static std::vector<CEPonto> GetVertices(const OdDbObjectId& polilinha);
+    static CEPonto GetPosicao(const OdDbObjectId& referencia);
+    // In radians.
+    static double GetRotacao(const OdDbObjectId& referencia);
+    // The insertion point of a text or attribute.
+    static CEPonto GetPosicaoTexto(const OdDbObjectId& texto);
+    static OdDbObjectId GetDono(const OdDbObjectId& id);
+    static OdDbObjectId GetModelSpace(zvdb::Database* database = nullptr);
+    // Block definitions in table order, layouts included.
+    static std::vector<std::pair<QString, OdDbObjectId>> GetBlocos(
+        zvdb::Database* database = nullptr);
+    // Every block reference of the drawing by block name (upper case), in drawing order,
+    // gathered in one walk.
+    static QHash<QString, std::vector<OdDbObjectId>> GetReferenciasPorBloco(
+        zvdb::Database* database = nullptr);
+    // The entries of a dictionary below the named-objects dictionary; nothing when the
+    // path does not exist (it is not made).
+    static std::vector<std::pair<QString, OdDbObjectId>> GetEntradasDicionario(
+        const QStringList& caminho, zvdb::Database* database = nullptr);
+    // Equal within the drawing's tolerance.
+    static bool PontosIguais(const CEPonto& a, const CEPonto& b);
 
     // ---- extended data, masters, project settings
     static void RegistraApp(const QString& aplicacao, zvdb::Database* database = nullptr);

@@ -1,27 +1,109 @@
 #pragma once
-// A reader turns what lies in a drawing into list items.
+// The base of every reader: the project's connectivity as the product's LISP side answers
+// it, kept in maps for one run, with point and neighbour queries on it; and the building of
+// items from drawing entities, their attributes, extended data and catalogue data.
 #include "VetorItens.h"
+#include "cad/CICad.h"
+#include "catalogue/CECacheCatalogo.h"
 
+#include <QHash>
 #include <QStringList>
 
+#include <memory>
 #include <optional>
+#include <vector>
 
 namespace zvdb {
 class Database;
 }
+namespace zv {
+class CEAtributo;
+}
 class CETemplate;
 class CIProgress;
-class OdDbObjectId;
 
 class CCDataReader {
 public:
-    virtual ~CCDataReader() = default;
-    // The element next to a terminal at its start and at its end.
-    virtual void LerLadoIni(CEItemLista& item, const OdDbObjectId& id) = 0;
-    virtual void LerLadoFim(CEItemLista& item, const OdDbObjectId& id) = 0;
+    // Field separator of extended-data texts and catalogue rows.
+    static const QChar kSeparador;
+
+    CCDataReader();
+    virtual ~CCDataReader();
+    CCDataReader(const CCDataReader&) = delete;
+    CCDataReader& operator=(const CCDataReader&) = delete;
+
+    // What the item knows of one side of the entity, and of the other.
+    virtual void LerLadoIni(CEItemLista& item, const OdDbObjectId& entidade,
+                            CETemplate& modelo) = 0;
+    virtual void LerLadoFim(CEItemLista& item, const OdDbObjectId& entidade,
+                            CETemplate& modelo) = 0;
     // The items of a database, of all pages or only those named; null when there is nothing.
-    // The caller owns the vector and its items.
     virtual VetorItens* LerDados(zvdb::Database* database,
                                  const std::optional<QStringList>& paginas, CETemplate& modelo,
                                  CIProgress& progresso) = 0;
+
+    // ---- connections
+    void CarregaConexoesFios();
+    void CarregaConexoesCabos();
+    const QStringList* ListaConexoes(const QString& fio) const;
+    const QStringList* ListaConexoesCompletas(const QString& fio) const;
+    const std::vector<CEPonto>* PontosConexao(const QString& fio) const;
+    CEPonto PontoDaConexao(const QString& fio, const QString& elemento) const;
+    CEPonto PontoDaConexaoCompleta(const QString& fio, const QString& texto) const;
+    // The wire of the layer under the point; null when there is none.
+    OdDbObjectId FioNoPonto(const QString& layer, const CEPonto& ponto);
+    QString NumeroDoFio(const OdDbObjectId& entidade) const;
+    bool EhFioNumerado(const OdDbObjectId& entidade) const;
+    // The handle of the element next to the entity along the wire through the point.
+    QString VizinhoNaConexao(const OdDbObjectId& entidade, const CEPonto& ponto, bool anterior);
+    CEPonto PontoDeCorte(const OdDbObjectId& referencia) const;
+    std::unique_ptr<zv::CEAtributo> AtributoConexaoProximo(const OdDbObjectId& elemento,
+                                                           const CEPonto& ponto) const;
+    VetorItens* LeDicionarioCabos(zvdb::Database* database);
+    bool EhEquipamento(const OdDbObjectId& id) const;
+
+    // ---- items from entities
+    QString ChaveDaEntidade(const OdDbObjectId& entidade) const;
+    QString NormaDaEntidade(const OdDbObjectId& entidade) const;
+    void LeColunasUsuario(const QString& sufixo, CEItemLista& item, const QStringList& colunas);
+    void LeBloco(const QString& sufixo, CEItemLista& item, const OdDbObjectId& referencia,
+                 CETemplate* modelo);
+    void LeFio(const QString& sufixo, CEItemLista& item, const OdDbObjectId& polilinha,
+               CETemplate* modelo);
+    void LeEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
+                    CETemplate* modelo);
+    CEItemLista* CriaItemBloco(const OdDbObjectId& referencia, CETemplate& modelo);
+    CEItemLista* CriaItemFio(const OdDbObjectId& polilinha, CETemplate& modelo);
+    CEItemLista* CriaItemVirtual(const OdDbObjectId& registro);
+    CEItemLista* CriaItemEntidade(const OdDbObjectId& entidade, CETemplate& modelo);
+    CEItemLista* CriaItemChave(const QString& relacao, const QString& chave, const QString& norma);
+
+    // The position text of the project's grid, or "??".
+    QString Posicao(const OdDbObjectId& entidade) const;
+    // LAYER, GRUPO and PAGINA under the suffix.
+    static void LeLayer(const QString& sufixo, CEItemLista& item, const QString& layer);
+    // The text of a catalogue type number.
+    static QString TextoTipo(const QString& tipo);
+
+protected:
+    CECacheCatalogo& Catalogo() { return catalogo_; }
+    double Tolerancia() const { return tolerancia_; }
+
+private:
+    struct Conexoes {
+        QStringList elementos;
+        QStringList completas;
+        std::vector<CEPonto> pontos;
+    };
+    void CarregaConexoes(const QString& funcao, bool detalhes);
+    bool FioSobPonto(const OdDbObjectId& fio, const QString& layer, const CEPonto& ponto) const;
+    void LeCircuitoLocal(const QString& sufixo, CEItemLista& item, const OdDbObjectId& entidade);
+    void LeLayout(const QString& sufixo, CEItemLista& item, const OdDbObjectId& entidade);
+    // The key text's two parts; false when no key application is there.
+    bool ChaveENorma(const OdDbObjectId& entidade, QString& chave, QString& norma) const;
+
+    QHash<QString, Conexoes> conexoes_;
+    QHash<QString, QStringList> fiosPorLayer_;
+    CECacheCatalogo catalogo_;
+    double tolerancia_;
 };

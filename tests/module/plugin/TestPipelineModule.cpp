@@ -33,8 +33,8 @@ private:
 class LeitorTeste : public CCDataReader {
 public:
     ~LeitorTeste() override { delete compartilhado_; }
-    void LerLadoIni(CEItemLista&, const OdDbObjectId&) override {}
-    void LerLadoFim(CEItemLista&, const OdDbObjectId&) override {}
+    void LerLadoIni(CEItemLista&, const OdDbObjectId&, CETemplate&) override {}
+    void LerLadoFim(CEItemLista&, const OdDbObjectId&, CETemplate&) override {}
     VetorItens* LerDados(zvdb::Database*, const std::optional<QStringList>& paginas, CETemplate&,
                          CIProgress& progresso) override {
         ++leituras_;

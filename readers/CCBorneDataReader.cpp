@@ -1,0 +1,344 @@
+#include "CCBorneDataReader.h"
+
+#include "CEAtributo.h"
+#include "lists/CETemplate.h"
+#include "module/CIProgress.h"
+
+#include <algorithm>
+
+namespace {
+
+const char* const kReguas[] = {"REGUA", "STRIP", "REGLETA"};
+const char* const kNumeros[] = {"NUMERO", "NUMBER", "NUMERO"};
+
+// The leading decimal number of a text, 0 when there is none.
+int Inteiro(const QString& texto) {
+    const QString t = texto.trimmed();
+    int fim = (t.startsWith('-') || t.startsWith('+')) ? 1 : 0;
+    while (fim < t.size() && t[fim].unicode() >= '0' && t[fim].unicode() <= '9')
+        ++fim;
+    return t.left(fim).toInt();
+}
+
+QString Primeiro(const CEItemLista& item, const char* const (&nomes)[3],
+                 const QString& sufixo = QString()) {
+    for (const char* nome : nomes) {
+        const QString valor = item.valorCampo(nome + sufixo);
+        if (!valor.isEmpty()) return valor;
+    }
+    return {};
+}
+
+// A blank row: the strip and the number in all three languages, one null object.
+CEItemLista* ItemEmBranco(const QString& regua, int numero) {
+    auto* item = new CEItemLista;
+    for (int i = 0; i < 3; ++i) {
+        item->definirCampo(kReguas[i], regua);
+        item->definirCampo(kNumeros[i], QString::number(numero));
+    }
+    item->ids.push_back(OdDbObjectId());
+    return item;
+}
+
+QString Progresso(int k, int n) {
+    return QString::asprintf("%d/%d", k, n);
+}
+
+}  // namespace
+
+struct CCBorneDataReader::Lado {
+    bool insercao;  // the insertion point's side, else the cut point's
+};
+
+QString CCBorneDataReader::Regua(const CEItemLista& item) {
+    return Primeiro(item, kReguas);
+}
+
+QString CCBorneDataReader::Numero(const CEItemLista& item) {
+    return Primeiro(item, kNumeros);
+}
+
+// ---- sides
+
+void CCBorneDataReader::LerLadoIni(CEItemLista& item, const OdDbObjectId& borne,
+                                   CETemplate& modelo) {
+    LeLado(item, borne, Lado{true}, modelo);
+}
+
+void CCBorneDataReader::LerLadoFim(CEItemLista& item, const OdDbObjectId& borne,
+                                   CETemplate& modelo) {
+    LeLado(item, borne, Lado{false}, modelo);
+}
+
+// The insertion side looks forward first, the cut side backward first, so that the two
+// sides take different neighbours on a wire that passes straight through the terminal.
+void CCBorneDataReader::LeLado(CEItemLista& item, const OdDbObjectId& borne, const Lado& lado,
+                               CETemplate& modelo) {
+    const CEPonto p = CICad::GetPosicao(borne);
+    const CEPonto q = PontoDeCorte(borne);
+    const CEPonto& aqui = lado.insercao ? p : q;
+    QString vizinho = VizinhoNaConexao(borne, aqui, !lado.insercao);
+    if (vizinho.isEmpty()) vizinho = VizinhoNaConexao(borne, aqui, lado.insercao);
+    if (vizinho.isEmpty()) return;
+
+    const bool invertido = item.valorCampo("INVERTIDO").toUpper() == "S";
+    const bool fimNaInsercao = lado.insercao != invertido;
+    const QString sufixo = fimNaInsercao ? "_FIM" : "_INI";
+    const QString layer = CICad::GetLayerEntidade(borne);
+    const OdDbObjectId elemento = CICad::IdDoHandle(vizinho, borne.database());
+    const OdDbObjectId fio = FioNoPonto(layer, aqui);
+    const CEPonto r = PontoDaConexao(NumeroDoFio(fio), vizinho);
+    LeBloco(sufixo, item, elemento, &modelo);
+    CompoeRelacaoBorne(sufixo, item, elemento, r, modelo);
+
+    if (!EhFioNumerado(fio)) return;
+    const OdDbObjectId fioP = FioNoPonto(layer, p);
+    const OdDbObjectId fioQ = FioNoPonto(layer, q);
+    const QString segP = invertido ? "_SEGINI" : "_SEGFIM";
+    const QString segQ = invertido ? "_SEGFIM" : "_SEGINI";
+    if (lado.insercao) {
+        if (!fioQ.isNull()) LeEntidade(segQ, item, fioQ, &modelo);
+        if (!fioP.isNull()) LeEntidade(segP, item, fioP, &modelo);
+    } else {
+        if (!fioP.isNull()) LeEntidade(segP, item, fioP, &modelo);
+        if (!fioQ.isNull()) LeEntidade(segQ, item, fioQ, &modelo);
+    }
+}
+
+void CCBorneDataReader::CompoeRelacaoBorne(const QString& sufixo, CEItemLista& item,
+                                           const OdDbObjectId& elemento, const CEPonto& ponto,
+                                           CETemplate& modelo) {
+    static const char* const kRelacoes[] = {"RELACAO", "TAG", "ETIQUETA"};
+    const QString rel = Primeiro(item, kRelacoes, sufixo);
+    const QString regua = Primeiro(item, kReguas, sufixo);
+    const QString num = Primeiro(item, kNumeros, sufixo);
+    const std::unique_ptr<zv::CEAtributo> ligacao = AtributoConexaoProximo(elemento, ponto);
+    const QString lig = ligacao ? ligacao->GetValor() : QString();
+    const QString sep = modelo.LerTexto("*CHAR_SEP_STD_CFG*");
+    const bool relacaoPrimeiro = modelo.LerTexto("*ORDEM_CONCAT_STD*") == "1";
+    auto define = [&](const QString& texto) {
+        for (const char* nome : kRelacoes)
+            item.definirCampo(nome + sufixo, texto);
+    };
+    if (!lig.isEmpty()) define(relacaoPrimeiro ? rel + sep + lig : lig + sep + rel);
+    // A terminal as neighbour has no relation of its own: strip and number stand for it.
+    if (!regua.isEmpty() && !num.isEmpty() && rel.isEmpty())
+        define(relacaoPrimeiro ? regua + sep + num : num + sep + regua);
+}
+
+// ---- reading
+
+void CCBorneDataReader::RegistraNumero(const CEItemLista& item) {
+    if (duplicado_) return;
+    const QString numero = Numero(item);
+    const QString jumper = item.valorCampo("JUMPER");
+    auto it = jumperPorNumero_.constFind(numero);
+    // Only a number whose earlier terminal had a jumper text counts, whatever the strip.
+    if (it != jumperPorNumero_.constEnd() && !it.value().isEmpty()) duplicado_ = true;
+    jumperPorNumero_.insert(numero, jumper);
+}
+
+bool CCBorneDataReader::Aceita(CEItemLista* item, CETemplate& modelo, VetorItens& itens) {
+    if (!item) return false;
+    if (!modelo.FiltraItem(*item)) {
+        delete item;
+        return false;
+    }
+    if (item->valorCampo("ZV_LISTA") != "S") {
+        if (!avisouLista_) CICad::ImprimeMensagem(62);
+        avisouLista_ = true;
+        delete item;
+        return false;
+    }
+    itens.push_back(item);
+    RegistraNumero(*item);
+    return true;
+}
+
+VetorItens* CCBorneDataReader::LerDados(zvdb::Database* database,
+                                        const std::optional<QStringList>& paginas,
+                                        CETemplate& modelo, CIProgress& progresso) {
+    Q_UNUSED(paginas);
+    CarregaConexoesFios();
+    progresso.Definir(10);
+    CarregaConexoesCabos();
+    progresso.Definir(20);
+
+    auto* itens = new VetorItens;
+    const bool bor = modelo.LerLogico("PBLCTOBORNE");
+    const auto blocos = CICad::GetBlocos(database);
+    const auto referencias = CICad::GetReferenciasPorBloco(database);
+    const OdDbObjectId modelSpace = CICad::GetModelSpace(database);
+    const int n = int(blocos.size()) + 1;  // the count starts at 1: a small overcount
+    for (int k = 1; k <= int(blocos.size()); ++k) {
+        progresso.Definir(20 + 50 * k / n, Progresso(k, n));
+        const QString& nome = blocos[size_t(k - 1)].first;
+        if (!nome.startsWith("BORNE") && !(bor && nome.startsWith("BOR-"))) continue;
+        for (const OdDbObjectId& ref : referencias.value(nome.toUpper()))
+            if (CICad::GetDono(ref) == modelSpace)
+                Aceita(CriaItemBloco(ref, modelo), modelo, *itens);
+    }
+    progresso.Definir(70);
+
+    const auto virtuais = CICad::GetEntradasDicionario({"ESQ_VIRTUAL_ZV"}, database);
+    const int v = int(virtuais.size());
+    for (int k = 1; k <= v; ++k) {
+        progresso.Definir(70 + 20 * k / v, Progresso(k, v));
+        const auto& [nome, id] = virtuais[size_t(k - 1)];
+        if (nome.startsWith("BORNE")) Aceita(CriaItemVirtual(id), modelo, *itens);
+    }
+    progresso.Definir(90);
+
+    if (modelo.LerLogico("*SEL_REGUA_BORNE_CFG*")) {
+        VetorItens escolhidos = SelecionaReguas(*itens);
+        // What the selection dropped goes now; nothing else points at it.
+        std::unordered_set<CEItemLista*> ficam(escolhidos.begin(), escolhidos.end());
+        for (CEItemLista* item : *itens)
+            if (!ficam.count(item)) delete item;
+        static_cast<std::vector<CEItemLista*>&>(*itens) = std::move(escolhidos);
+    }
+    progresso.Definir(92);
+    itens->ordenar(modelo.LerListaTexto("*LISTA_DE_SORT*"));
+    progresso.Definir(95);
+    if (modelo.LerLogico("*INIC_SEQUENCIAL*")) IniciaSequencial(*itens);
+    // The reversal runs before the gaps are filled: a falling list gets no blank rows.
+    if (modelo.LerTexto("*ORDEM_CRESCENTE*") != "C") itens->inverter();
+    if (modelo.LerLogico("*PREENCHE_FALTANTES*")) PreencheFaltantes(*itens);
+    progresso.Definir(97);
+    if (!duplicado_)
+        LigaJumpers(*itens);
+    else
+        CICad::ImprimeMensagem(329);
+    if (itens->empty()) CICad::ImprimeMensagem(64);
+    progresso.Definir(100);
+    return itens;
+}
+
+// ---- after reading
+
+VetorItens CCBorneDataReader::SelecionaReguas(const VetorItens& itens) {
+    CICad::Log("selecaoBornes1");
+    zvsdk::ResultBuffer* lista = CICad::zvInvokeLista("zvSelecionaReguas");
+    CICad::Log("selecaoBornes2");
+    VetorItens resultado;
+    if (lista && lista->restype != zvsdk::RTNIL) {
+        CICad::Log("selecaoBornes3");
+        for (const zvsdk::ResultBuffer* no = lista; no; no = no->rbnext) {
+            if (no->restype != zvsdk::RTSTR) continue;
+            for (const char* campo : kReguas)
+                resultado.juntarSemRepetir(itens.filtrar({{campo, no->rstring}}));
+        }
+        CICad::Log("selecaoBornes4");
+    }
+    CICad::LiberaLista(lista);
+    return resultado;
+}
+
+void CCBorneDataReader::IniciaSequencial(VetorItens& itens) {
+    VetorItens resultado;
+    resultado.reserve(itens.size());
+    QString anterior;
+    for (CEItemLista* item : itens) {
+        const QString regua = item ? Regua(*item) : QString();
+        if (item && regua != anterior) {
+            // A strip that starts at 5 gets blank rows 1 to 4 in front.
+            for (int k = 1; k < Inteiro(Numero(*item)); ++k)
+                resultado.push_back(ItemEmBranco(regua, k));
+            anterior = regua;
+        }
+        resultado.push_back(item);
+    }
+    itens = std::move(resultado);
+}
+
+void CCBorneDataReader::PreencheFaltantes(VetorItens& itens) {
+    if (itens.size() < 2) return;
+    VetorItens resultado;
+    resultado.reserve(itens.size());
+    for (size_t i = 0; i < itens.size(); ++i) {
+        resultado.push_back(itens[i]);
+        if (i + 1 == itens.size() || !itens[i] || !itens[i + 1]) continue;
+        const QString regua = Regua(*itens[i]);
+        if (regua != Regua(*itens[i + 1])) continue;
+        const int a = Inteiro(Numero(*itens[i]));
+        const int b = Inteiro(Numero(*itens[i + 1]));
+        for (int k = a + 1; k < b; ++k)
+            resultado.push_back(ItemEmBranco(regua, k));
+    }
+    itens = std::move(resultado);
+}
+
+namespace {
+
+// The first item of each strip and number, per language, for the jumper look-ups.
+class IndiceBornes {
+public:
+    explicit IndiceBornes(const VetorItens& itens) {
+        for (CEItemLista* item : itens)
+            for (int i = 0; item && i < 3; ++i)
+                indice_[i].insert({Chave(*item, i, item->valorCampo(kNumeros[i])), item});
+    }
+    CEItemLista* Busca(const CEItemLista& de, int idioma, const QString& numero) const {
+        auto it = indice_[idioma].find(Chave(de, idioma, numero));
+        return it == indice_[idioma].end() ? nullptr : it->second;
+    }
+
+private:
+    static QString Chave(const CEItemLista& item, int idioma, const QString& numero) {
+        return item.valorCampo(kReguas[idioma]) + QChar(0x1F) + numero;
+    }
+    std::unordered_map<QString, CEItemLista*> indice_[3];
+};
+
+// The terminals bridged to `inicio`, followed through their own jumper texts, depth first.
+VetorItens ColetaJumper(CEItemLista* inicio, const IndiceBornes& indice,
+                        std::unordered_set<CEItemLista*>& visitados) {
+    VetorItens cadeia;
+    std::vector<CEItemLista*> pilha{inicio};
+    while (!pilha.empty()) {
+        CEItemLista* item = pilha.back();
+        pilha.pop_back();
+        cadeia.push_back(item);
+        std::vector<CEItemLista*> achados;
+        for (const QString& token : item->valorCampo("JUMPER").split(',')) {
+            for (int i = 0; i < 3; ++i) {
+                CEItemLista* achado = indice.Busca(*item, i, token);
+                if (!achado) continue;
+                if (visitados.insert(achado).second) achados.push_back(achado);
+                break;
+            }
+        }
+        pilha.insert(pilha.end(), achados.rbegin(), achados.rend());
+    }
+    return cadeia;
+}
+
+// Items linked to the chain's members by earlier passes join it.
+void EstendeCadeia(VetorItens& cadeia) {
+    std::unordered_set<CEItemLista*> membros(cadeia.begin(), cadeia.end());
+    const size_t n = cadeia.size();
+    for (size_t i = 0; i + 1 < n; ++i) {
+        for (CEItemLista* p = cadeia[i]->anterior; p && membros.insert(p).second; p = p->anterior)
+            cadeia.push_back(p);
+        for (CEItemLista* p = cadeia[i]->proximo; p && membros.insert(p).second; p = p->proximo)
+            cadeia.push_back(p);
+    }
+}
+
+}  // namespace
+
+void CCBorneDataReader::LigaJumpers(VetorItens& itens) {
+    const IndiceBornes indice(itens);
+    std::unordered_set<CEItemLista*> visitados;
+    for (CEItemLista* item : itens) {
+        if (!item || item->valorCampo("JUMPER").trimmed().isEmpty()) continue;
+        if (!visitados.insert(item).second) continue;
+        VetorItens cadeia = ColetaJumper(item, indice, visitados);
+        EstendeCadeia(cadeia);
+        cadeia.ordenar({"REGUA", "STRIP", "REGLETA", "NUMERO", "NUMBER", "NUMERO"});
+        for (size_t i = 0; i + 1 < cadeia.size(); ++i) {
+            cadeia[i]->proximo = cadeia[i + 1];
+            cadeia[i + 1]->anterior = cadeia[i];
+        }
+    }
+}

@@ -1,0 +1,37 @@
+#pragma once
+// The terminal reader: one item per terminal with its strip and number, what is wired to
+// each of its sides, the wires themselves, and the jumper chains of the strips.
+#include "CCDataReader.h"
+
+#include <unordered_set>
+
+class CCBorneDataReader : public CCDataReader {
+public:
+    void LerLadoIni(CEItemLista& item, const OdDbObjectId& borne, CETemplate& modelo) override;
+    void LerLadoFim(CEItemLista& item, const OdDbObjectId& borne, CETemplate& modelo) override;
+    // Reads every page of the database; the page list is not used.
+    VetorItens* LerDados(zvdb::Database* database, const std::optional<QStringList>& paginas,
+                         CETemplate& modelo, CIProgress& progresso) override;
+
+    // The steps after reading, each on its own for the writers and the tests.
+    static VetorItens SelecionaReguas(const VetorItens& itens);
+    static void IniciaSequencial(VetorItens& itens);
+    static void PreencheFaltantes(VetorItens& itens);
+    static void LigaJumpers(VetorItens& itens);
+    // The strip and number of a terminal: the first non-empty language.
+    static QString Regua(const CEItemLista& item);
+    static QString Numero(const CEItemLista& item);
+
+private:
+    struct Lado;
+    void LeLado(CEItemLista& item, const OdDbObjectId& borne, const Lado& lado, CETemplate& modelo);
+    void CompoeRelacaoBorne(const QString& sufixo, CEItemLista& item, const OdDbObjectId& elemento,
+                            const CEPonto& ponto, CETemplate& modelo);
+    // Takes a terminal's item or drops it; false when it was dropped.
+    bool Aceita(CEItemLista* item, CETemplate& modelo, VetorItens& itens);
+    void RegistraNumero(const CEItemLista& item);
+
+    bool avisouLista_ = false;
+    bool duplicado_ = false;
+    QHash<QString, QString> jumperPorNumero_;
+};

@@ -1,0 +1,515 @@
+#include "CCDataReader.h"
+
+#include "CEAtributo.h"
+#include "CEListaAtributos.h"
+#include "lists/CETemplate.h"
+#include "settings/CIMensagens.h"
+
+#include <algorithm>
+#include <cmath>
+
+using zvsdk::ResultBuffer;
+
+const QChar CCDataReader::kSeparador = QChar(0x0C);
+
+namespace {
+
+// A project symbol's key lives in the first of these applications that the entity carries.
+const char* const kAplicacoesChave[] = {"KVR_ZV", "KVR_ZV_WIRE", "KVR_ZV_CABO"};
+const char* const kPalavrasConexao[] = {"LIGACAO", "CONNECTION", "CONEXION"};
+constexpr double kToleranciaElemento = 3.0;
+constexpr double kForaDoSegmento = 666.0;
+
+double Distancia(const CEPonto& a, const CEPonto& b) {
+    return std::sqrt((a.x - b.x) * (a.x - b.x) + (a.y - b.y) * (a.y - b.y) +
+                     (a.z - b.z) * (a.z - b.z));
+}
+
+// Distance of P to the segment's line in the plane; beyond the segment's ends it is pushed
+// out of any tolerance.
+double DistanciaAoSegmento(const CEPonto& p, const CEPonto& a, const CEPonto& b) {
+    double d;
+    if (b.x == a.x) {
+        d = std::abs(p.x - a.x);
+    } else {
+        const double m = (b.y - a.y) / (b.x - a.x);
+        d = std::abs(p.x * m - p.y + a.y - m * a.x) / std::sqrt(m * m + 1);
+    }
+    const double l = Distancia(a, b);
+    if (l + d < Distancia(p, a) || l + d < Distancia(p, b)) d += kForaDoSegmento;
+    return d;
+}
+
+bool EhTexto(const CEItemXData& item) {
+    return item.codigo == 1000;
+}
+
+}  // namespace
+
+CCDataReader::CCDataReader() : tolerancia_(CICad::GetRealLisp("*ESPESSURA_BARRAMENTO*", 0.1)) {}
+
+CCDataReader::~CCDataReader() = default;
+
+// ---- connections
+
+void CCDataReader::CarregaConexoesFios() {
+    CarregaConexoes("getConexoesTodosFios", true);
+}
+
+void CCDataReader::CarregaConexoesCabos() {
+    CarregaConexoes("getConexoesTodosCabos", false);
+}
+
+// The answer: a list with one element per wire: its number, then its entries, each a list
+// of a string (the element, with "#"-separated details) and up to three reals. Two list
+// ends in a row close a wire.
+void CCDataReader::CarregaConexoes(const QString& funcao, bool detalhes) {
+    ResultBuffer* resposta = CICad::zvInvokeLista(funcao);
+    const ResultBuffer* no = resposta && resposta->restype != zvsdk::RTNIL ? resposta : nullptr;
+    for (; no; no = no ? no->rbnext : nullptr) {
+        if (no->restype == zvsdk::RTLB || no->restype == zvsdk::RTLE) continue;
+        const QString fio = no->restype == zvsdk::RTSTR ? no->rstring : QString();
+        Conexoes conexoes;
+        if (!detalhes) conexoes.completas = conexoes_.value(fio).completas;
+        if (no->rbnext && no->rbnext->restype == zvsdk::RTLE) {
+            conexoes_.insert(fio, conexoes);
+            no = no->rbnext;
+            continue;
+        }
+        int coordenada = 0;
+        for (no = no->rbnext; no; no = no->rbnext) {
+            if (no->restype == zvsdk::RTLE && no->rbnext && no->rbnext->restype == zvsdk::RTLE)
+                break;
+            if (no->restype == zvsdk::RTSTR) {
+                conexoes.elementos << (detalhes ? no->rstring.section('#', 0, 0) : no->rstring);
+                if (detalhes) conexoes.completas << no->rstring;
+                conexoes.pontos.push_back({});
+                coordenada = 0;
+            } else if (no->restype == zvsdk::RTREAL && !conexoes.pontos.empty() && coordenada < 3) {
+                CEPonto& p = conexoes.pontos.back();
+                (coordenada == 0 ? p.x : coordenada == 1 ? p.y : p.z) = no->rreal;
+                ++coordenada;
+            }
+        }
+        conexoes_.insert(fio, conexoes);
+    }
+    CICad::LiberaLista(resposta);
+}
+
+const QStringList* CCDataReader::ListaConexoes(const QString& fio) const {
+    auto it = conexoes_.constFind(fio);
+    return it == conexoes_.constEnd() ? nullptr : &it->elementos;
+}
+
+const QStringList* CCDataReader::ListaConexoesCompletas(const QString& fio) const {
+    auto it = conexoes_.constFind(fio);
+    return it == conexoes_.constEnd() ? nullptr : &it->completas;
+}
+
+const std::vector<CEPonto>* CCDataReader::PontosConexao(const QString& fio) const {
+    auto it = conexoes_.constFind(fio);
+    return it == conexoes_.constEnd() ? nullptr : &it->pontos;
+}
+
+CEPonto CCDataReader::PontoDaConexao(const QString& fio, const QString& elemento) const {
+    auto it = conexoes_.constFind(fio);
+    if (it == conexoes_.constEnd()) return {};
+    const int i = it->elementos.indexOf(elemento);
+    return i >= 0 && size_t(i) < it->pontos.size() ? it->pontos[size_t(i)] : CEPonto{};
+}
+
+CEPonto CCDataReader::PontoDaConexaoCompleta(const QString& fio, const QString& texto) const {
+    auto it = conexoes_.constFind(fio);
+    if (it == conexoes_.constEnd()) return {};
+    const int i = it->completas.indexOf(texto);
+    return i >= 0 && size_t(i) < it->pontos.size() ? it->pontos[size_t(i)] : CEPonto{};
+}
+
+bool CCDataReader::FioSobPonto(const OdDbObjectId& fio, const QString& layer,
+                               const CEPonto& ponto) const {
+    if (!CICad::EhPolilinha(fio) || CICad::GetLayerEntidade(fio) != layer) return false;
+    const std::vector<CEPonto> vertices = CICad::GetVertices(fio);
+    for (size_t i = 0; i + 1 < vertices.size(); ++i) {
+        const CEPonto& a = vertices[i];
+        const CEPonto& b = vertices[i + 1];
+        if (Distancia(ponto, a) < tolerancia_ || Distancia(ponto, b) < tolerancia_) return true;
+        if (DistanciaAoSegmento(ponto, a, b) < tolerancia_) return true;
+    }
+    return false;
+}
+
+OdDbObjectId CCDataReader::FioNoPonto(const QString& layer, const CEPonto& ponto) {
+    auto it = fiosPorLayer_.constFind(layer);
+    if (it == fiosPorLayer_.constEnd()) {
+        QStringList handles;
+        ResultBuffer* resposta = CICad::zvInvokeLista("getFiosPorLayer", {layer});
+        for (const ResultBuffer* no = resposta; no; no = no->rbnext)
+            if (no->restype == zvsdk::RTSTR) handles << no->rstring;
+        CICad::LiberaLista(resposta);
+        it = fiosPorLayer_.insert(layer, handles);
+    }
+    // The first wire in the answer's order wins, even when a later one is closer.
+    for (const QString& handle : *it) {
+        const OdDbObjectId fio = CICad::IdDoHandle(handle);
+        if (FioSobPonto(fio, layer, ponto)) return fio;
+    }
+    return {};
+}
+
+QString CCDataReader::NumeroDoFio(const OdDbObjectId& entidade) const {
+    const CEListaXData fio = CICad::GetXData(entidade, "KVR_ZV_WIRE");
+    for (size_t i = 2; fio.size() >= 3 && i < fio.size(); ++i) {
+        QString nome, valor;
+        if (!ZVString(fio[i].texto).DivideEmDois(kSeparador, nome, valor)) continue;
+        const QString maiusculo = nome.toUpper();
+        if (maiusculo == "CABO" || maiusculo == "FIO" || maiusculo == "WIRE" ||
+            maiusculo == "ALAMBRE")
+            return valor;
+    }
+    const CEListaXData cabo = CICad::GetXData(entidade, "KVR_ZV_CABO");
+    if (cabo.size() < 2 || !EhTexto(cabo[0]) || !EhTexto(cabo[1])) return {};
+    QString esquerda, direita;
+    ZVString(cabo[0].texto).DivideEmDois(kSeparador, esquerda, direita);
+    for (size_t i = 2; i < cabo.size(); ++i) {
+        if (!EhTexto(cabo[i])) continue;
+        std::unique_ptr<zv::CEListaAtributos> atributos;
+        CICad::GetAtributosVirtuais(CICad::IdDoHandle(cabo[i].texto), atributos);
+        for (int a = 0; atributos && a < atributos->Quantidade(); ++a) {
+            const QString tag = (*atributos)[a].GetTag().toUpper();
+            if (tag == "CABO" || tag == "CABLE")
+                return (*atributos)[a].GetValor() + kSeparador + esquerda;
+        }
+    }
+    return {};
+}
+
+bool CCDataReader::EhFioNumerado(const OdDbObjectId& entidade) const {
+    const CEListaXData fio = CICad::GetXData(entidade, "KVR_ZV_WIRE");
+    for (size_t i = 2; fio.size() >= 3 && i < fio.size(); ++i) {
+        QString nome, valor;
+        if (ZVString(fio[i].texto).DivideEmDois(kSeparador, nome, valor) &&
+            QStringList({"CABO", "FIO", "WIRE", "ALAMBRE"}).contains(nome.toUpper()))
+            return true;
+    }
+    return false;
+}
+
+QString CCDataReader::VizinhoNaConexao(const OdDbObjectId& entidade, const CEPonto& ponto,
+                                       bool anterior) {
+    const OdDbObjectId fio = FioNoPonto(CICad::GetLayerEntidade(entidade), ponto);
+    if (fio.isNull()) return {};
+    const QString numero = NumeroDoFio(fio);
+    const QStringList* elementos = ListaConexoes(numero);
+    const std::vector<CEPonto>* pontos = PontosConexao(numero);
+    if (!elementos || !pontos || elementos->size() < 2 || pontos->size() < 2) return {};
+    auto ehEntidade = [&entidade](const QString& handle) {
+        return ZVString(handle).ParaHandle() == entidade.handle();
+    };
+    bool seguinte = false;
+    for (int i = 0; i < elementos->size() && size_t(i) < pontos->size(); ++i) {
+        const QString& elemento = (*elementos)[i];
+        const bool aqui =
+            ehEntidade(elemento) && Distancia((*pontos)[size_t(i)], ponto) < kToleranciaElemento;
+        if (anterior) {
+            if (aqui && i > 0 && !ehEntidade((*elementos)[i - 1])) return (*elementos)[i - 1];
+            continue;
+        }
+        if (seguinte && !ehEntidade(elemento)) return elemento;
+        seguinte = aqui;
+    }
+    return {};
+}
+
+CEPonto CCDataReader::PontoDeCorte(const OdDbObjectId& referencia) const {
+    const CEListaXData corte = CICad::GetXData(referencia, "KVR_ZV_PTS_CORTE");
+    std::vector<CEPonto> pontos;
+    for (const CEItemXData& item : corte)
+        if (item.codigo >= 1010 && item.codigo <= 1013) pontos.push_back({item.x, item.y, item.z});
+    if (pontos.size() >= 2)
+        return CICad::PontosIguais(pontos[1], CICad::GetPosicao(referencia)) ? pontos[0]
+                                                                             : pontos[1];
+    const CEListaXData chave = CICad::GetXData(referencia, "KVR_ZV");
+    if (chave.size() >= 3) return {chave[2].x, chave[2].y, chave[2].z};
+    return {};
+}
+
+std::unique_ptr<zv::CEAtributo> CCDataReader::AtributoConexaoProximo(const OdDbObjectId& elemento,
+                                                                     const CEPonto& ponto) const {
+    std::unique_ptr<zv::CEListaAtributos> atributos;
+    CICad::GetAtributos(elemento, atributos, false, false);
+    const zv::CEAtributo* melhor = nullptr;
+    double menor = 0.0;
+    for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
+        const zv::CEAtributo& atributo = (*atributos)[i];
+        const QString tag = atributo.GetTag().toUpper();
+        if (!std::any_of(std::begin(kPalavrasConexao), std::end(kPalavrasConexao),
+                         [&tag](const char* palavra) { return tag.startsWith(palavra); }))
+            continue;
+        const double d = Distancia(CICad::GetPosicaoTexto(atributo.GetId()), ponto);
+        if (!melhor || d < menor) melhor = &atributo, menor = d;
+    }
+    return melhor ? std::make_unique<zv::CEAtributo>(*melhor) : nullptr;
+}
+
+VetorItens* CCDataReader::LeDicionarioCabos(zvdb::Database* database) {
+    auto* itens = new VetorItens;
+    for (const auto& [nome, id] : CICad::GetEntradasDicionario({"ZV_CABOS"}, database)) {
+        if (nome.trimmed().isEmpty()) continue;
+        CEItemLista* item = CriaItemVirtual(id);
+        if (!item) continue;
+        if (item->valorCampo("ZV_LISTA") == "S")
+            itens->push_back(item);
+        else
+            delete item;
+    }
+    return itens;
+}
+
+bool CCDataReader::EhEquipamento(const OdDbObjectId& id) const {
+    return !id.isNull() && CICad::TemXData(id, "KVR_ZV_EQUIPO");
+}
+
+// ---- items from entities
+
+bool CCDataReader::ChaveENorma(const OdDbObjectId& entidade, QString& chave, QString& norma) const {
+    for (const char* aplicacao : kAplicacoesChave) {
+        const CEListaXData itens = CICad::GetXData(entidade, aplicacao);
+        if (itens.empty()) continue;
+        for (const CEItemXData& item : itens)
+            if (EhTexto(item)) {
+                chave.clear(), norma.clear();
+                ZVString(item.texto).DivideEmDois(kSeparador, chave, norma);
+                return true;
+            }
+        return true;
+    }
+    return false;
+}
+
+QString CCDataReader::ChaveDaEntidade(const OdDbObjectId& entidade) const {
+    QString chave, norma;
+    return ChaveENorma(entidade, chave, norma) ? chave : QString();
+}
+
+QString CCDataReader::NormaDaEntidade(const OdDbObjectId& entidade) const {
+    QString chave, norma;
+    return ChaveENorma(entidade, chave, norma) ? norma : QString();
+}
+
+void CCDataReader::LeColunasUsuario(const QString& sufixo, CEItemLista& item,
+                                    const QStringList& colunas) {
+    for (const QString& coluna : colunas) {
+        QString nome, valor;
+        if (ZVString(coluna).DivideEmDois(kSeparador, nome, valor) && !nome.isEmpty())
+            item.definirCampo(nome + sufixo, valor);
+    }
+}
+
+void CCDataReader::LeLayer(const QString& sufixo, CEItemLista& item, const QString& layer) {
+    item.definirCampo("LAYER" + sufixo, layer);
+    const QStringList partes = ZVString(layer).Divide("$");
+    item.definirCampo("GRUPO" + sufixo, partes.size() == 3 ? partes[0] : QString());
+    item.definirCampo("PAGINA" + sufixo, partes.size() == 3 ? partes[1] : QString());
+}
+
+QString CCDataReader::TextoTipo(const QString& tipo) {
+    bool ok = false;
+    const int n = tipo.trimmed().toInt(&ok);
+    return CIMensagens::Mensagem("ZVLISTAS", ok && n >= 2 && n <= 26 ? 299 + n : 300);
+}
+
+QString CCDataReader::Posicao(const OdDbObjectId& entidade) const {
+    const QStringList partes = ZVString(CICad::GetLayerEntidade(entidade)).Divide("$");
+    if (partes.size() != 3) return "??";
+    CEPonto p;
+    if (CICad::EhPolilinha(entidade)) {
+        const std::vector<CEPonto> vertices = CICad::GetVertices(entidade);
+        if (vertices.empty()) return "??";
+        p = vertices.front();
+    } else if (CICad::EhReferencia(entidade)) {
+        p = CICad::GetPosicao(entidade);
+    } else {
+        return "??";
+    }
+    ResultBuffer* chamada = zvsdk::newString("BuscarCoordenadas");
+    ResultBuffer* cauda = chamada->rbnext = zvsdk::newEntity(entidade.entityName());
+    cauda = cauda->rbnext = zvsdk::newString(partes[0]);
+    cauda = cauda->rbnext = zvsdk::newString(partes[1]);
+    cauda = cauda->rbnext = zvsdk::newReal(p.x);
+    cauda->rbnext = zvsdk::newReal(p.y);
+    ResultBuffer* resposta = CICad::InvokeChain(chamada);
+    zvsdk::releaseChain(chamada);
+    const QString texto =
+        resposta && resposta->restype == zvsdk::RTSTR ? resposta->rstring : QStringLiteral("??");
+    CICad::LiberaLista(resposta);
+    return texto;
+}
+
+void CCDataReader::LeCircuitoLocal(const QString& sufixo, CEItemLista& item,
+                                   const OdDbObjectId& entidade) {
+    QString circuito, painel, terceiro;
+    int numero = 1;
+    if (CICad::GetCircuitoLocal(entidade, numero) &&
+        !CICad::GetCircuitoLocalInfo(numero, circuito, painel, terceiro))
+        circuito.clear(), painel.clear();
+    // PAINEL and LOCAL hold the same value: templates use either name.
+    item.definirCampo("PAINEL" + sufixo, painel);
+    item.definirCampo("LOCAL" + sufixo, painel);
+    item.definirCampo("CIRCUITO" + sufixo, circuito);
+}
+
+void CCDataReader::LeLayout(const QString& sufixo, CEItemLista& item,
+                            const OdDbObjectId& entidade) {
+    const CEListaXData layout = CICad::GetXData(entidade, "KVR_LAYOUT_ESQUEMA");
+    for (size_t indice : {size_t(0), size_t(2)}) {
+        if (indice >= layout.size()) continue;
+        const OdDbObjectId ref = CICad::IdDoHandle(layout[indice].texto, entidade.database());
+        if (!CICad::EhReferencia(ref)) continue;
+        const CEPonto p = CICad::GetPosicao(ref);
+        item.definirCampo("LAYOUTPOSITIONX" + sufixo, QString::number(qint64(std::trunc(p.x))));
+        item.definirCampo("LAYOUTPOSITIONY" + sufixo, QString::number(qint64(std::trunc(p.y))));
+        break;
+    }
+    QString orientacao = "0";
+    if (!layout.empty() && EhTexto(layout[0])) {
+        const OdDbObjectId ref = CICad::IdDoHandle(layout[0].texto, entidade.database());
+        if (CICad::EhReferencia(ref))
+            orientacao = ZVString::DeReal(CICad::GetRotacao(ref) * 180.0 / M_PI);
+    }
+    item.definirCampo("ORIENTACAO" + sufixo, orientacao);
+}
+
+void CCDataReader::LeBloco(const QString& s, CEItemLista& item, const OdDbObjectId& referencia,
+                           CETemplate* modelo) {
+    Q_UNUSED(modelo);
+    QString chave, norma;
+    ChaveENorma(referencia, chave, norma);
+    LeColunasUsuario(s, item, catalogo_.ColunasComp(chave));
+    std::unique_ptr<zv::CEListaAtributos> atributos;
+    CICad::GetAtributos(referencia, atributos, false, false);
+    for (int i = 0; atributos && i < atributos->Quantidade(); ++i)
+        item.definirCampo((*atributos)[i].GetTag() + s, (*atributos)[i].GetValor());
+    CICad::GetAtributosConstantes(referencia, atributos);
+    for (int i = 0; atributos && i < atributos->Quantidade(); ++i)
+        item.definirCampo((*atributos)[i].GetTag() + s, (*atributos)[i].GetValor());
+    if (CICad::GetNomeBloco(referencia).startsWith("PIN-")) {
+        const CEListaXData pino = CICad::GetXData(referencia, "ZV_PINO");
+        if (!pino.empty() && EhTexto(pino[0])) item.definirCampo("CONECTOR" + s, pino[0].texto);
+    }
+    item.definirCampo("HANDLE" + s, ZVString::DeHandle(referencia.handle()));
+    LeCircuitoLocal(s, item, referencia);
+    item.definirCampo("ZV_LISTA" + s, catalogo_.ListaComp(chave, norma));
+    item.definirCampo("ZV_KEY" + s, chave);
+    const QString descricao = catalogo_.DescricaoComp(chave);
+    item.definirCampo("DESCRICAO" + s, descricao);
+    item.definirCampo("TP_DESCRI" + s, descricao);
+    item.definirCampo("POSICAO" + s, Posicao(referencia));
+    LeLayer(s, item, CICad::GetLayerEntidade(referencia));
+    item.definirCampo("COMPONENTTYPE" + s, TextoTipo(catalogo_.TipoComp(chave)));
+    if (item.valorCampo("QTD" + s).isEmpty()) item.definirCampo("QTD" + s, "1");
+    item.definirCampo("SAP_MATERIAL" + s, catalogo_.MaterialSap(chave));
+    LeLayout(s, item, referencia);
+}
+
+void CCDataReader::LeFio(const QString& s, CEItemLista& item, const OdDbObjectId& polilinha,
+                         CETemplate* modelo) {
+    Q_UNUSED(modelo);
+    const QString chaveTexto = ChaveDaEntidade(polilinha);
+    LeColunasUsuario(s, item, catalogo_.ColunasFio(chaveTexto));
+    CICad::RegistraApp("KVR_ZV_WIRE", polilinha.database());
+    const CEListaXData fio = CICad::GetXData(polilinha, "KVR_ZV_WIRE");
+    QString chave, norma;
+    if (!fio.empty()) {
+        ZVString(fio[0].texto).DivideEmDois(kSeparador, chave, norma);
+        const QString segundo = fio.size() > 1 ? fio[1].texto : QString();
+        // Without key, standard and its second item the polyline is no complete wire.
+        if (chave.isEmpty() || norma.isEmpty() || segundo.isEmpty()) return;
+        item.definirCampo("ZV_KEY" + s, chave);
+        for (size_t i = 2; i < fio.size(); ++i) {
+            QString nome, valor;
+            if (ZVString(fio[i].texto).DivideEmDois(kSeparador, nome, valor) && !nome.isEmpty())
+                item.definirCampo(nome + s, valor);
+        }
+    }
+    item.definirCampo("WIRE_LISTA" + s, catalogo_.ListaFio(chave, norma));
+    const QString descricao = catalogo_.DescricaoFio(chave);
+    item.definirCampo("DESCRICAO" + s, descricao);
+    item.definirCampo("TP_DESCRI" + s, descricao);
+    item.definirCampo("POSICAO" + s, Posicao(polilinha));
+    LeLayer(s, item, CICad::GetLayerEntidade(polilinha));
+    if (item.valorCampo("QTD" + s).isEmpty()) item.definirCampo("QTD" + s, "1");
+    item.definirCampo("SAP_MATERIAL" + s, QString());
+}
+
+void CCDataReader::LeEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
+                              CETemplate* modelo) {
+    if (CICad::EhReferencia(id))
+        LeBloco(sufixo, item, id, modelo);
+    else if (CICad::EhPolilinha(id))
+        LeFio(sufixo, item, id, modelo);
+}
+
+CEItemLista* CCDataReader::CriaItemBloco(const OdDbObjectId& referencia, CETemplate& modelo) {
+    if (ChaveDaEntidade(referencia).isEmpty()) return nullptr;
+    auto* item = new CEItemLista;
+    item->ids.push_back(referencia);
+    LeBloco(QString(), *item, referencia, &modelo);
+    LerLadoIni(*item, referencia, modelo);
+    LerLadoFim(*item, referencia, modelo);
+    return item;
+}
+
+CEItemLista* CCDataReader::CriaItemFio(const OdDbObjectId& polilinha, CETemplate& modelo) {
+    if (ChaveDaEntidade(polilinha).isEmpty()) return nullptr;
+    auto* item = new CEItemLista;
+    item->ids.push_back(polilinha);
+    LeFio(QString(), *item, polilinha, &modelo);
+    LerLadoIni(*item, polilinha, modelo);
+    LerLadoFim(*item, polilinha, modelo);
+    return item;
+}
+
+CEItemLista* CCDataReader::CriaItemVirtual(const OdDbObjectId& registro) {
+    QString chave, norma;
+    if (!ChaveENorma(registro, chave, norma) || chave.isEmpty()) return nullptr;
+    const bool cabo = CICad::TemXData(registro, "KVR_ZV_CABO");
+    auto* item = new CEItemLista;
+    item->ids.push_back(registro);
+    LeColunasUsuario(QString(), *item,
+                     cabo ? catalogo_.ColunasCabo(chave) : catalogo_.ColunasComp(chave));
+    std::unique_ptr<zv::CEListaAtributos> atributos;
+    CICad::GetAtributosVirtuais(registro, atributos);
+    for (int i = 0; atributos && i < atributos->Quantidade(); ++i)
+        item->definirCampo((*atributos)[i].GetTag(), (*atributos)[i].GetValor());
+    item->definirCampo("ZV_KEY", chave);
+    item->definirCampo("HANDLE", ZVString::DeHandle(registro.handle()));
+    item->definirCampo(
+        "ZV_LISTA", cabo ? catalogo_.ListaCabo(chave, norma) : catalogo_.ListaComp(chave, norma));
+    LeCircuitoLocal(QString(), *item, registro);
+    const QString descricao =
+        cabo ? catalogo_.DescricaoCabo(chave) : catalogo_.DescricaoComp(chave);
+    item->definirCampo("DESCRICAO", descricao);
+    item->definirCampo("TP_DESCRI", descricao);
+    return item;
+}
+
+CEItemLista* CCDataReader::CriaItemEntidade(const OdDbObjectId& entidade, CETemplate& modelo) {
+    if (CICad::EhReferencia(entidade)) return CriaItemBloco(entidade, modelo);
+    if (CICad::TipoEntidade(entidade) == "XRECORD") return CriaItemVirtual(entidade);
+    if (CICad::EhPolilinha(entidade)) return CriaItemFio(entidade, modelo);
+    return nullptr;
+}
+
+CEItemLista* CCDataReader::CriaItemChave(const QString& relacao, const QString& chave,
+                                         const QString& norma) {
+    auto* item = new CEItemLista;
+    for (int i = 1; i <= 3; ++i)
+        item->definirCampo(CICad::TagTraduzida(CampoTraduzido::Relacao, i), relacao);
+    item->definirCampo("ZV_KEY", chave);
+    item->definirCampo("ZV_LISTA", catalogo_.ListaComp(chave, norma));
+    const QString descricao = catalogo_.DescricaoComp(chave);
+    item->definirCampo("DESCRICAO", descricao);
+    item->definirCampo("TP_DESCRI", descricao);
+    LeColunasUsuario(QString(), *item, catalogo_.ColunasComp(chave));
+    return item;
+}
