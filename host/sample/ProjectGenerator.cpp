@@ -32,6 +32,11 @@ constexpr double kPlcY = 150;
 constexpr double kTerminalY = 70;
 constexpr double kPinY = 30;
 constexpr double kBlindX = 360;
+constexpr double kPowerBusY[4] = {270, 265, 260, 255};  // L1, L2, L3, PE
+
+double motorX(int motor) {
+    return 40.0 + motor * 120;
+}
 
 std::string pageName(const std::string& group, int number) {
     char digits[16];
@@ -142,6 +147,11 @@ private:
                              const std::string& key, std::uint64_t record, int core);
     void drawPendingBlind(const std::string& layer);
     void drawPowerPage();
+    void drawBusBar(const std::string& layer, const std::string& relation, double y,
+                    const std::vector<SymbolAttribute>& taps);
+    void drawMotorCircuit(const std::string& layer, int m, const std::string& contactor,
+                          std::vector<PlannedTerminal> terminals);
+    void drawPhase(const std::string& layer, double x, int phase, const std::string& contactor);
     void addVirtualObjects(int virtualTerminals);
     void drawLayout();
     void addRoute(const RoutableWire& wire, const Point3& from, const Point3& to, bool split);
@@ -401,7 +411,6 @@ std::size_t ProjectGenerator::Impl::drawMaster(const CoilKind& kind, const std::
 
 void ProjectGenerator::Impl::drawContact(int page, const std::string& layer, Point3 at,
                                          const std::string& standard) {
-    (void)page;
     const std::size_t pool = mastersBeforePage_ > 0 ? mastersBeforePage_ : masters_.size();
     if (pool == 0) {  // the very first column: a button stands in for the contact
         drawMaster(
@@ -536,93 +545,98 @@ void ProjectGenerator::Impl::drawPendingBlind(const std::string& layer) {
 
 void ProjectGenerator::Impl::drawPowerPage() {
     const std::string& layer = groups_[2].pages[0];
-    const int page = 3;
     const int motors = options_.terminals >= 16 ? 2 : 0;
-    const double busY[3] = {270, 265, 260};
-    std::vector<SymbolAttribute> taps[3];
-    for (int m = 0; m < motors; ++m)
-        for (int i = 0; i < 3; ++i)
-            taps[i].push_back({"LIGACAO" + std::to_string(m + 1),
-                               "T" + std::to_string(m + 1),
-                               {40.0 + m * 120 + i * 10 - 20, 0}});
-    for (int i = 0; i < 3; ++i) {
-        const std::string phase = "L" + std::to_string(i + 1);
-        std::vector<SymbolAttribute> attributes = {{"RELACAO", "-W" + phase, {0, 2}}};
-        attributes.insert(attributes.end(), taps[i].begin(), taps[i].end());
-        zvdb::BlockReference* bar =
-            symbols_->insert("BUS_BARRAMENTO", {20, busY[i]}, layer, attributes);
-        setXData(*bar, "KVR_ZV", XDataItems().text(keyText("8001", "1")));
-        setXData(*bar, "KVR_ZV_PTS_CORTE", XDataItems().point({20, busY[i]}).point({320, busY[i]}));
+    for (int i = 0; i < 4; ++i) {
+        std::vector<SymbolAttribute> taps;
+        for (int m = 0; m < motors; ++m)
+            taps.push_back({"LIGACAO" + std::to_string(m + 1),
+                            i < 3 ? "T" : "PE",
+                            {motorX(m) + (i < 3 ? i * 10 : 30) - 20, 0}});
+        drawBusBar(layer, i < 3 ? "-WL" + std::to_string(i + 1) : "-WPE", kPowerBusY[i], taps);
     }
-    std::vector<SymbolAttribute> earthTaps = {{"RELACAO", "-WPE", {0, 2}}};
-    for (int m = 0; m < motors; ++m)
-        earthTaps.push_back({"LIGACAO" + std::to_string(m + 1), "PE", {50.0 + m * 120, 0}});
-    zvdb::BlockReference* earth =
-        symbols_->insert("BUS_BARRAMENTO_PE", {20, 255}, layer, earthTaps);
-    setXData(*earth, "KVR_ZV", XDataItems().text(keyText("8001", "1")));
-    setXData(*earth, "KVR_ZV_PTS_CORTE", XDataItems().point({20, 255}).point({320, 255}));
     std::vector<std::size_t> coils;
     for (std::size_t k = 0; k < masters_.size() && coils.size() < 2; ++k)
         if (masters_[k].key == "2001" || masters_[k].key == "2005") coils.push_back(k);
     StripPlanner powerStrip(random_, "X", 0);
     for (int m = 0; m < motors; ++m) {
-        const double base = 40.0 + m * 120;
-        std::vector<SymbolAttribute> breakerPins, thermalPins, motorPins;
-        for (int i = 0; i < 3; ++i) {
-            const double x = base + i * 10, dx = x - (base + 10);
-            const std::string n = std::to_string(2 * i + 1), n2 = std::to_string(2 * i + 2);
-            breakerPins.push_back({"LIGACAO" + n, n, {dx, 10}});
-            breakerPins.push_back({"LIGACAO" + n2, n2, {dx, -10}});
-            thermalPins.push_back({"LIGACAO" + n, n, {dx, 10}});
-            thermalPins.push_back({"LIGACAO" + n2, n2, {dx, -10}});
-            motorPins.push_back({"LIGACAO" + n, std::string(1, "UVW"[i]), {x - (base + 15), 5}});
-        }
-        motorPins.push_back({"LIGACAO7", "PE", {15, 5}});
-        const CoilKind breaker{"3001", "DISJUNTOR_MOTOR", "-Q", "TOPO_DM4"};
-        const CoilKind thermal{"3007", "RELE_TERMICO", "-F", "TOPO_RT13"};
-        const CoilKind motor{"7401", "MOTOR_TRIFASICO", "-M", ""};
-        const std::size_t q = drawMaster(breaker, "1", {base + 10, 230}, layer, page, breakerPins);
-        setXData(*masters_[q].reference, "ZV_VINC_ADITIVO", XDataItems().text("1").text("3006"));
-        drawMaster(thermal, "1", {base + 10, 165}, layer, page, thermalPins);
-        const std::size_t mm = drawMaster(motor, "1", {base + 15, 35}, layer, page, motorPins);
-        setXData(*masters_[mm].reference, "KVR_ZV_CIRCLOC", XDataItems().integer32(2));
-        std::vector<PlannedTerminal> terminals = powerStrip.plan(4);
-        const std::string cable = "W" + std::to_string(cableCounter_++);
-        const std::uint64_t record = addCableRecord(cable, "20005", 4, "X0");
-        for (int i = 0; i < 4; ++i) {
-            const double x = i < 3 ? base + i * 10 : base + 30;
-            PlannedTerminal& t = terminals[static_cast<std::size_t>(i)];
-            t.language = 0;
-            t.block = i < 3 ? "BORNE_PASSAGEM" : "BORNE_TERRA";
-            t.key = i < 3 ? "1002" : "1006";
-            t.standard = "1";
-            drawTerminal(layer, {x, 80}, t);
-            drawLead(layer, {{x, 70}, {x, 40}}, "20005", record, i + 1);
-            if (i == 3) {
-                drawWire(layer, "PE", {{x, 255}, {x, 80}}, "10015", "1");
-                continue;
-            }
-            drawWire(layer, "L" + std::to_string(i + 1), {{x, busY[i]}, {x, 240}}, "10011", "1");
-            const std::string out = nextWire(), mid = nextWire(), down = nextWire();
-            if (!coils.empty()) {
-                const Master& k = masters_[coils[static_cast<std::size_t>(m) % coils.size()]];
-                zvdb::BlockReference* contact =
-                    symbols_->insert("NA-CONTATO_POTENCIA", {x, 200}, layer,
-                                     {{"RELACAO", k.relation, {2, -4}},
-                                      {"PARENT", k.relation, {2, -7}},
-                                      {"POSICAO_CTT",
-                                       std::to_string(2 * i + 1) + "-" + std::to_string(2 * i + 2),
-                                       {2, -10}}});
-                setXData(*contact, "KVR_ZV", XDataItems().text(keyText("2101", "1")));
-                setXData(*contact, "KVR_ZV_PTS_CORTE",
-                         XDataItems().point({x, 200}).point({x, 190}));
-                ++counts.contacts;
-            }
-            drawWire(layer, out, {{x, 220}, {x, 200}}, "10011", "1");
-            drawWire(layer, mid, {{x, 190}, {x, 175}}, "10011", "1");
-            drawWire(layer, down, {{x, 155}, {x, 80}}, "10011", "1");
-        }
+        // A copy: drawing the circuit adds masters and moves the vector.
+        const std::string contactor =
+            coils.empty() ? std::string()
+                          : masters_[coils[static_cast<std::size_t>(m) % coils.size()]].relation;
+        drawMotorCircuit(layer, m, contactor, powerStrip.plan(4));
     }
+}
+
+void ProjectGenerator::Impl::drawBusBar(const std::string& layer, const std::string& relation,
+                                        double y, const std::vector<SymbolAttribute>& taps) {
+    std::vector<SymbolAttribute> attributes = {{"RELACAO", relation, {0, 2}}};
+    attributes.insert(attributes.end(), taps.begin(), taps.end());
+    zvdb::BlockReference* bar = symbols_->insert("BUS_BARRAMENTO", {20, y}, layer, attributes);
+    setXData(*bar, "KVR_ZV", XDataItems().text(keyText("8001", "1")));
+    setXData(*bar, "KVR_ZV_PTS_CORTE", XDataItems().point({20, y}).point({320, y}));
+}
+
+// Breaker, main contacts of a contactor, overload relay, terminals and the motor with its
+// cable, three phases and earth.
+void ProjectGenerator::Impl::drawMotorCircuit(const std::string& layer, int m,
+                                              const std::string& contactor,
+                                              std::vector<PlannedTerminal> terminals) {
+    const int page = 3;
+    const double base = motorX(m);
+    std::vector<SymbolAttribute> pins, motorPins;
+    for (int i = 0; i < 3; ++i) {
+        const double x = base + i * 10, dx = x - (base + 10);
+        const std::string n = std::to_string(2 * i + 1), n2 = std::to_string(2 * i + 2);
+        pins.push_back({"LIGACAO" + n, n, {dx, 10}});
+        pins.push_back({"LIGACAO" + n2, n2, {dx, -10}});
+        motorPins.push_back({"LIGACAO" + n, std::string(1, "UVW"[i]), {x - (base + 15), 5}});
+    }
+    motorPins.push_back({"LIGACAO7", "PE", {15, 5}});
+    const CoilKind breaker{"3001", "DISJUNTOR_MOTOR", "-Q", "TOPO_DM4"};
+    const CoilKind thermal{"3007", "RELE_TERMICO", "-F", "TOPO_RT13"};
+    const CoilKind motor{"7401", "MOTOR_TRIFASICO", "-M", ""};
+    const std::size_t q = drawMaster(breaker, "1", {base + 10, 230}, layer, page, pins);
+    setXData(*masters_[q].reference, "ZV_VINC_ADITIVO", XDataItems().text("1").text("3006"));
+    drawMaster(thermal, "1", {base + 10, 165}, layer, page, pins);
+    const std::size_t mm = drawMaster(motor, "1", {base + 15, 35}, layer, page, motorPins);
+    setXData(*masters_[mm].reference, "KVR_ZV_CIRCLOC", XDataItems().integer32(2));
+    const std::string cable = "W" + std::to_string(cableCounter_++);
+    const std::uint64_t record = addCableRecord(cable, "20005", 4, "X0");
+    for (int i = 0; i < 4; ++i) {
+        const double x = i < 3 ? base + i * 10 : base + 30;
+        PlannedTerminal& t = terminals[static_cast<std::size_t>(i)];
+        t.language = 0;
+        t.block = i < 3 ? "BORNE_PASSAGEM" : "BORNE_TERRA";
+        t.key = i < 3 ? "1002" : "1006";
+        t.standard = "1";
+        drawTerminal(layer, {x, 80}, t);
+        drawLead(layer, {{x, 70}, {x, 40}}, "20005", record, i + 1);
+        if (i == 3)
+            drawWire(layer, "PE", {{x, kPowerBusY[3]}, {x, 80}}, "10015", "1");
+        else
+            drawPhase(layer, x, i, contactor);
+    }
+}
+
+// One phase from its bus bar through breaker, main contact and overload relay to the terminal.
+void ProjectGenerator::Impl::drawPhase(const std::string& layer, double x, int phase,
+                                       const std::string& contactor) {
+    drawWire(layer, "L" + std::to_string(phase + 1), {{x, kPowerBusY[phase]}, {x, 240}}, "10011",
+             "1");
+    if (!contactor.empty()) {
+        const std::string position =
+            std::to_string(2 * phase + 1) + "-" + std::to_string(2 * phase + 2);
+        zvdb::BlockReference* contact = symbols_->insert("NA-CONTATO_POTENCIA", {x, 200}, layer,
+                                                         {{"RELACAO", contactor, {2, -4}},
+                                                          {"PARENT", contactor, {2, -7}},
+                                                          {"POSICAO_CTT", position, {2, -10}}});
+        setXData(*contact, "KVR_ZV", XDataItems().text(keyText("2101", "1")));
+        setXData(*contact, "KVR_ZV_PTS_CORTE", XDataItems().point({x, 200}).point({x, 190}));
+        ++counts.contacts;
+    }
+    drawWire(layer, nextWire(), {{x, 220}, {x, 200}}, "10011", "1");
+    drawWire(layer, nextWire(), {{x, 190}, {x, 175}}, "10011", "1");
+    drawWire(layer, nextWire(), {{x, 155}, {x, 80}}, "10011", "1");
 }
 
 // ---- virtual objects
