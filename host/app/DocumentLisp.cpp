@@ -33,6 +33,9 @@ int DocumentLisp::lispPutSymbol(const QString& name, const zvsdk::ResultBuffer* 
 
 zvsdk::ResultBuffer* DocumentLisp::lispInvoke(const zvsdk::ResultBuffer* call) {
     if (!call || call->restype != zvsdk::RTSTR) return nullptr;
+    // A function nobody defined answers nothing, quietly: the module asks for optional
+    // functions of the product. Errors inside a defined one are reported as usual.
+    if (lisp_.global(call->rstring).isNil()) return nullptr;
     const std::vector<zvlisp::Value> args = LispChains::values(lisp_, call->rbnext);
     const zvlisp::Value function = zvlisp::Value::symbol(lisp_.intern(call->rstring));
     zvlisp::Value result;
