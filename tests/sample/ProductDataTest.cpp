@@ -114,3 +114,27 @@ TEST(ProductLisp, TemplatesAndConfigurationRunInTheHostLisp) {
                                       << host.readAllStandardError().toStdString();
     }
 }
+
+TEST(ProductLisp, TemplateSymbolsHaveTheShapesTheWritersRead) {
+    QTemporaryDir dir;
+    const QString probe = dir.filePath("probe.lsp");
+    QFile file(probe);
+    ASSERT_TRUE(file.open(QIODevice::WriteOnly));
+    const QString templates = QStringLiteral(ZV_SOURCE_DIR "/data/templates/");
+    file.write(QString("(setq *DIR_ZVCFG_TEMPL* \"%1\")\n"
+                       "(load (strcat *DIR_ZVCFG_TEMPL* \"bornes.grt\"))\n"
+                       "(princ (list (type *LINHAS_POR_PAGINA*) (type *NUMERO_COLUNA*)\n"
+                       "  (type *Y_INIC_LISTA*) (type *ESPACO_HORIZONTAL*) (type TAM_DETALHE)\n"
+                       "  (type *LISTA_DE_SORT*) *VISUALIZAR_JUMPER_CFG* *NUM_COLUNAS_CFG*))\n"
+                       "(load (strcat *DIR_ZVCFG_TEMPL* \"bornes-sequencial.grt\"))\n"
+                       "(princ (list *INIC_SEQUENCIAL* *COLUNA_SN* LISTA_DETALHE))\n")
+                   .arg(templates)
+                   .toUtf8());
+    file.close();
+    QProcess host;
+    host.start(ZV_BIN_DIR "/zvhost", {"lisp", probe});
+    ASSERT_TRUE(host.waitForFinished(60000));
+    ASSERT_EQ(host.exitCode(), 0) << host.readAllStandardError().toStdString();
+    EXPECT_EQ(host.readAllStandardOutput().toStdString(),
+              "(INT INT REAL REAL STR LIST 1 3)(T nil DADOS\\1\\BLOCOS\\LST_BORNE_DET)");
+}
