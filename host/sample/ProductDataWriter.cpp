@@ -290,7 +290,10 @@ void ProductDataWriter::writeStripBlocks() {
                              6,
                              60},
                             {"REGUA_SEP", {}, 2, 40},
-                            {"REGUA_JUMPER", {}, 6, 3},
+                            {"REGUA_PONTEI", {}, 3, 1},
+                            {"REGUA_PONTE", {}, 6, 1},
+                            {"REGUA_PONTEF", {}, 3, 1},
+                            {"REGUA_PONTEM", {}, 6, 1},
                             {"REGUA_AVISO", {{"VARIAVEL_AVISO", "AVISO", 1, "Aviso"}}, 40, 8}};
     for (const Piece& piece : pieces) {
         BlockFile file;
