@@ -3,6 +3,7 @@
 #include "drawing/BlockRecord.h"
 #include "drawing/Database.h"
 #include "drawing/DxfWriter.h"
+#include "sample/XDataItems.h"
 
 #include <filesystem>
 #include <memory>
@@ -326,6 +327,9 @@ void ProductDataWriter::writeViews() {
             file.model().addAttributeDefinition("CPOINT1", "Connection", "1", {width / 2, height},
                                                 1.0);
             file.model().addAttributeDefinition("CPOINT2", "Connection", "2", {width / 2, 0}, 1.0);
+            // The step of a terminal in the topographic diagram's strips.
+            if (terminal)
+                file.model().addAttributeDefinition("PASSO", "Step", realText(width), {0, -2}, 1.0);
             written_.push_back(blockPath(root_, standard, view));
             file.save(written_.back());
         }
