@@ -146,6 +146,7 @@ private:
     zvdb::Polyline* drawLead(const std::string& layer, const std::vector<Point3>& points,
                              const std::string& key, std::uint64_t record, int core);
     void drawPendingBlind(const std::string& layer);
+    void drawFieldSensor(const std::string& layer, int page, double x, const std::string& standard);
     void drawPowerPage();
     void drawBusBar(const std::string& layer, const std::string& relation, double y,
                     const std::vector<SymbolAttribute>& taps);
@@ -314,7 +315,12 @@ void ProjectGenerator::Impl::drawControlPage(int pageIndex, int page,
     std::vector<std::string> strips;
     for (std::size_t c = 0; c < terminals.size(); ++c) {
         drawColumn(page, layer, static_cast<int>(c), terminals[c], pins);
-        xs.push_back(columnX(static_cast<int>(c)));
+        const double x = columnX(static_cast<int>(c));
+        if (random_.chance(20)) {  // a field wire to a sensor instead of a cable core
+            drawFieldSensor(layer, page, x, terminals[c].standard);
+            continue;
+        }
+        xs.push_back(x);
         strips.push_back(terminals[c].strip);
     }
     // The PLC card of the page: its supply pins take the feed in and out.
@@ -458,6 +464,15 @@ void ProjectGenerator::Impl::drawFerrule(const std::string& layer, zvdb::Polylin
     zvdb::BlockReference* ferrule =
         symbols_->insert("ANILHA_FIO", at, layer, {{"FIO", number, {2, 0}}});
     setXData(*ferrule, "KVR_ZV_ANILHAFIO", XDataItems().handle(wire.handle()));
+}
+
+void ProjectGenerator::Impl::drawFieldSensor(const std::string& layer, int page, double x,
+                                             const std::string& standard) {
+    const CoilKind sensor{"6301", "SENSOR_PNP", "-B", "TOPO_IS12"};
+    drawMaster(sensor, standard, {x, kPinY + 5}, layer, page,
+               {{"LIGACAO1", "BN", {0, 10}}, {"LIGACAO2", "BU", {0, -5}}});
+    const double cut = kTerminalY - SymbolLibrary::kTerminalLength;
+    drawWire(layer, nextWire(), {{x, cut}, {x, kPinY + 15}}, "10014", standard);
 }
 
 // ---- cables

@@ -61,7 +61,7 @@ std::vector<PlannedTerminal> StripPlanner::plan(int count) {
         t.strip = stripName_;
         if (jumperLeft_ == 0 && random_.chance(4)) next_ += random_.between(1, 2);  // a gap
         t.number = next_++;
-        if (jumperLeft_ == 0 && left_ >= 3 && random_.chance(12)) {
+        if (jumperLeft_ == 0 && left_ >= 3 && count - i >= 3 && random_.chance(12)) {
             groupFirst = t.number;
             groupSize = random_.between(2, 3);
             jumperLeft_ = groupSize;

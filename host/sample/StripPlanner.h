@@ -35,7 +35,7 @@ public:
 private:
     void startStrip();
 
-    SampleRandom& random_;
+    SampleRandom& random_;  // jumper groups stay inside one plan() call
     std::string prefix_;
     int stripIndex_;
     std::string stripName_;
