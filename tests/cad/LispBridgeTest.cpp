@@ -120,9 +120,10 @@ TEST_F(LispBridgeTest, InvokeFamilies) {
     EXPECT_DOUBLE_EQ(CICad::RealDaLista(resultado, 3), 2.5);
     EXPECT_EQ(CICad::NoDaLista(resultado, 4)->restype, zvsdk::RT3DPOINT);
     CICad::LiberaLista(resultado);
-    // An unknown function or a failing call answers null and says why on the command line.
+    // An unknown function answers null quietly (the product's optional functions); a
+    // failing call answers null and says why on the command line.
     EXPECT_EQ(CICad::zvInvokeLista("naoexiste"), nullptr);
-    EXPECT_TRUE(saida().contains("; error: no function definition: NAOEXISTE\n"));
+    EXPECT_FALSE(saida().contains("NAOEXISTE"));
     EXPECT_EQ(CICad::zvInvokeLista("junta", {"so-um"}), nullptr);
     EXPECT_TRUE(saida().contains("; error: too few arguments\n"));
 }
