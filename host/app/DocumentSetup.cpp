@@ -1,5 +1,6 @@
 #include "DocumentSetup.h"
 
+#include "CadLisp.h"
 #include "DocumentLisp.h"
 #include "HostDocument.h"
 
@@ -14,6 +15,7 @@ void setUpDocument(HostDocument& document) {
         [&document](const QString& text) { document.printMessage(text); });
     if (!document.fileName().isEmpty())
         lisp->interpreter().searchPaths() << QFileInfo(document.fileName()).absolutePath();
+    installCadFunctions(lisp->interpreter(), document);
     document.setLisp(std::move(lisp));
 }
 

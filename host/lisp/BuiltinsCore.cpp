@@ -20,7 +20,8 @@ Value typeOf(Interpreter& in, Args a) {
                                         "USUBR",
                                         "FILE",
                                         "ENAME",
-                                        "VL-CATCH-ALL-APPLY-ERROR"};
+                                        "VL-CATCH-ALL-APPLY-ERROR",
+                                        "PICKSET"};
     if (a[0].isNil()) return Value();
     return Value::symbol(in.intern(names[int(a[0].type())]));
 }

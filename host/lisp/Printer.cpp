@@ -107,6 +107,9 @@ void Printer::append(QString& out, const Value& value, bool escape, int depth) {
         case Type::Error:
             out += "#<%catch-all-apply-error%>";
             return;
+        case Type::Pickset:
+            out += "<Selection set: " + QString::number(quintptr(value.asObject()), 16) + '>';
+            return;
         case Type::Cons:
             break;
     }

@@ -10,6 +10,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <utility>
+#include <vector>
 
 namespace zvlisp {
 
@@ -24,7 +25,8 @@ enum class Type : std::uint8_t {
     User,
     File,
     Ename,
-    Error
+    Error,
+    Pickset
 };
 
 struct Symbol;
@@ -147,6 +149,11 @@ struct Cons : Object {
 struct EnameObject : Object {
     explicit EnameObject(zvsdk::EntityName n) : name(n) {}
     zvsdk::EntityName name;
+};
+
+// A selection set: entity names in the order they were selected.
+struct PicksetObject : Object {
+    std::vector<zvsdk::EntityName> names;
 };
 
 // What vl-catch-all-apply gives back for a failed call.

@@ -1,0 +1,550 @@
+#include "CadLisp.h"
+
+#include "HostDocument.h"
+#include "drawing/BlockRecord.h"
+#include "drawing/Database.h"
+#include "drawing/DbObject.h"
+#include "drawing/Dictionary.h"
+#include "drawing/Entity.h"
+#include "drawing/Extents.h"
+#include "drawing/LayerRecord.h"
+#include "drawing/SymbolTable.h"
+#include "drawing/Tag.h"
+#include "drawing/TagValues.h"
+#include "lisp/Function.h"
+#include "lisp/Interpreter.h"
+#include "lisp/Wildcard.h"
+
+#include <QFileInfo>
+
+#include <memory>
+
+namespace zvhost {
+
+using zvlisp::Args;
+using zvlisp::Interpreter;
+using zvlisp::ListBuilder;
+using zvlisp::Type;
+using zvlisp::Value;
+
+namespace {
+
+// How a group code's value reads in LISP.
+enum class Kind { Text, Real, Integer, Point, Pointer };
+
+Kind kindOf(int code) {
+    if (zvdb::isPointerCode(code) && code != 1005) return Kind::Pointer;
+    if ((code >= 10 && code <= 18) || (code >= 110 && code <= 112) ||
+        (code >= 1010 && code <= 1013))
+        return Kind::Point;
+    switch (zvdb::valueKind(code)) {
+        case zvdb::ValueKind::Real:
+            return Kind::Real;
+        case zvdb::ValueKind::Int16:
+        case zvdb::ValueKind::Int32:
+        case zvdb::ValueKind::Int64:
+        case zvdb::ValueKind::Bool:
+            return Kind::Integer;
+        default:
+            return Kind::Text;
+    }
+}
+
+QString text(std::string_view v) {
+    return QString::fromUtf8(v.data(), int(v.size()));
+}
+
+class CadFunctions : public std::enable_shared_from_this<CadFunctions> {
+public:
+    CadFunctions(Interpreter& lisp, HostDocument& document) : lisp_(lisp), document_(document) {}
+    // Each function holds the shared state, so it lives as long as the interpreter.
+    void install();
+
+private:
+    zvdb::Database& db() { return *document_.database(); }
+    Value ename(const zvdb::DbObject* object) {
+        if (!object) return {};
+        return Value::object(Type::Ename,
+                             new zvlisp::EnameObject({&object->database(), object->handle()}));
+    }
+    zvdb::DbObject* object(const Value& v) {
+        if (v.type() != Type::Ename) lisp_.badType("lentityp", v);
+        const auto name = static_cast<zvlisp::EnameObject*>(v.asObject())->name;
+        if (name.database != document_.database()) return nullptr;
+        zvdb::DbObject* o = db().objectByHandle(name.handle);
+        return o && !o->isErased() ? o : nullptr;
+    }
+    Value pair(int code, Value v) { return Value::cons(Value::integer(code), std::move(v)); }
+    Value point(int code, const zvdb::Point3& p) {
+        ListBuilder list;
+        list.add(Value::integer(code));
+        list.add(Value::real(p.x));
+        list.add(Value::real(p.y));
+        list.add(Value::real(p.z));
+        return list.take();
+    }
+    Value groupValue(int code, std::string_view raw) {
+        switch (kindOf(code)) {
+            case Kind::Real:
+                return Value::real(zvdb::TagValues::toReal(raw));
+            case Kind::Integer:
+                return Value::integer(std::int32_t(zvdb::TagValues::toInteger(raw)));
+            case Kind::Pointer:
+                return ename(db().objectByHandle(zvdb::TagValues::toHandle(raw)));
+            default:
+                return Value::string(text(raw));
+        }
+    }
+    // The tags of a range as dotted pairs, points gathered from their three groups.
+    void addGroups(ListBuilder& list, std::span<const zvdb::Tag> tags, size_t from, size_t to) {
+        for (size_t i = from; i < to; ++i) {
+            const int code = tags[i].code;
+            if (code == 102) {  // application groups stay out, as CAD users see them
+                while (i + 1 < to && !(tags[i + 1].code == 102))
+                    ++i;
+                ++i;
+                continue;
+            }
+            if (kindOf(code) == Kind::Point) {
+                zvdb::Point3 p{zvdb::TagValues::toReal(tags[i].value), 0, 0};
+                if (i + 1 < to && tags[i + 1].code == code + 10)
+                    p.y = zvdb::TagValues::toReal(tags[++i].value);
+                if (i + 1 < to && tags[i + 1].code == code + 20)
+                    p.z = zvdb::TagValues::toReal(tags[++i].value);
+                list.add(point(code, p));
+            } else {
+                list.add(pair(code, groupValue(code, tags[i].value)));
+            }
+        }
+    }
+    Value xdata(const zvdb::DbObject& o, const Value& applications);
+    Value entget(Args a);
+    Value entmod(Args a);
+    Value entnext(Args a);
+    Value tblsearch(Args a, bool next);
+    Value getvar(Args a);
+    Value setvar(Args a);
+    Value dictsearch(Args a);
+    Value dictnext(Args a);
+    std::vector<zvdb::Entity*> sequence();
+    Value ssget(Args a);
+    bool passes(const zvdb::Entity& e, const Value& filter);
+    zvlisp::PicksetObject* pickset(const Value& v);
+    zvdb::SymbolTable* table(const Value& name);
+
+    Interpreter& lisp_;
+    HostDocument& document_;
+    QHash<QString, int> tableCursor_;
+    QHash<quint64, int> dictCursor_;
+    int filedia_ = 1;
+};
+
+Value CadFunctions::xdata(const zvdb::DbObject& o, const Value& applications) {
+    ListBuilder groups;
+    std::vector<QString> patterns;
+    for (Value v = applications; v.isCons(); v = v.asCons()->cdr)
+        patterns.push_back(lisp_.toStr(v.asCons()->car));
+    for (std::string_view app : o.xdataApplications()) {
+        const QString name = text(app);
+        bool wanted = false;
+        // Application names are matched without regard to case.
+        for (const QString& p : patterns)
+            wanted = wanted || zvlisp::Wildcard(p.toUpper()).matches(name.toUpper());
+        if (!wanted) continue;
+        ListBuilder group;
+        group.add(Value::string(name));
+        const std::vector<zvdb::Tag> items = o.xdata(app);
+        addGroups(group, items, 0, items.size());
+        groups.add(group.take());
+    }
+    if (groups.empty()) return {};
+    return Value::cons(Value::integer(-3), groups.take());
+}
+
+Value CadFunctions::entget(Args a) {
+    zvdb::DbObject* o = object(a[0]);
+    if (!o) return {};
+    ListBuilder list;
+    list.add(pair(-1, a[0]));
+    list.add(pair(0, Value::string(text(o->type()))));
+    addGroups(list, o->tags(), 1, o->xdataStart());
+    if (a.has(1) && !a[1].isNil()) {
+        Value x = xdata(*o, a[1]);
+        if (!x.isNil()) list.add(x);
+    }
+    return list.take();
+}
+
+Value CadFunctions::entmod(Args a) {
+    lisp_.checkList(a[0]);
+    zvdb::DbObject* o = nullptr;
+    for (Value v = a[0]; v.isCons(); v = v.asCons()->cdr) {
+        const Value& group = v.asCons()->car;
+        if (group.isCons() && group.asCons()->car.isInt() && group.asCons()->car.asInt() == -1)
+            o = object(group.asCons()->cdr);
+    }
+    if (!o) return {};
+    for (Value v = a[0]; v.isCons(); v = v.asCons()->cdr) {
+        const Value& group = v.asCons()->car;
+        if (!group.isCons() || !group.asCons()->car.isInt()) continue;
+        const int code = group.asCons()->car.asInt();
+        const Value& value = group.asCons()->cdr;
+        if (code == -3) {
+            for (Value g = value; g.isCons(); g = g.asCons()->cdr) {
+                const Value& app = g.asCons()->car;
+                if (!app.isCons()) continue;
+                std::vector<zvdb::Tag> items;
+                for (Value it = app.asCons()->cdr; it.isCons(); it = it.asCons()->cdr) {
+                    const Value& item = it.asCons()->car;
+                    if (!item.isCons() || !item.asCons()->car.isInt()) continue;
+                    const int c = item.asCons()->car.asInt();
+                    const Value& iv = item.asCons()->cdr;
+                    if (kindOf(c) == Kind::Point && iv.isCons()) {
+                        std::vector<Value> xyz = lisp_.toVector(iv);
+                        for (size_t k = 0; k < 3; ++k)
+                            items.push_back({std::int16_t(c + 10 * int(k)),
+                                             db().store(zvdb::TagValues::fromReal(
+                                                 k < xyz.size() ? lisp_.toNumber(xyz[k]) : 0.0))});
+                    } else if (iv.isString()) {
+                        items.push_back({std::int16_t(c), db().store(iv.asString().toStdString())});
+                    } else if (iv.isReal()) {
+                        items.push_back(
+                            {std::int16_t(c), db().store(zvdb::TagValues::fromReal(iv.asReal()))});
+                    } else if (iv.isInt()) {
+                        items.push_back({std::int16_t(c),
+                                         db().store(zvdb::TagValues::fromInteger(iv.asInt()))});
+                    }
+                }
+                o->setXData(lisp_.toStr(app.asCons()->car).toStdString(), items);
+            }
+            continue;
+        }
+        if (code < 1 || code == 5 || code == 100 || code == 102 || code == 330 || code == 360)
+            continue;
+        if (kindOf(code) == Kind::Point && value.isCons()) {
+            std::vector<Value> xyz = lisp_.toVector(value);
+            o->setPoint(code, {xyz.size() > 0 ? lisp_.toNumber(xyz[0]) : 0,
+                               xyz.size() > 1 ? lisp_.toNumber(xyz[1]) : 0,
+                               xyz.size() > 2 ? lisp_.toNumber(xyz[2]) : 0});
+        } else if (value.isString()) {
+            o->setText(code, value.asString().toStdString());
+        } else if (value.isReal()) {
+            o->setReal(code, value.asReal());
+        } else if (value.isInt()) {
+            o->setInteger(code, value.asInt());
+        }
+    }
+    return a[0];
+}
+
+// Model space in order, each entity followed by its attributes or vertices and its end.
+std::vector<zvdb::Entity*> CadFunctions::sequence() {
+    std::vector<zvdb::Entity*> all;
+    if (!db().modelSpace()) return all;
+    for (zvdb::Entity* e : db().modelSpace()->entities()) {
+        all.push_back(e);
+        for (zvdb::Entity* sub : e->liveSubEntities())
+            all.push_back(sub);
+        if (e->seqend()) all.push_back(e->seqend());
+    }
+    return all;
+}
+
+Value CadFunctions::entnext(Args a) {
+    const std::vector<zvdb::Entity*> all = sequence();
+    if (!a.has(0) || a[0].isNil()) {
+        for (zvdb::Entity* e : all)
+            if (!e->parent()) return ename(e);
+        return {};
+    }
+    zvdb::DbObject* current = object(a[0]);
+    for (size_t i = 0; current && i + 1 < all.size(); ++i)
+        if (all[i] == current) return ename(all[i + 1]);
+    return {};
+}
+
+zvdb::SymbolTable* CadFunctions::table(const Value& name) {
+    QString t = lisp_.toStr(name).toUpper();
+    if (t == "BLOCK") t = "BLOCK_RECORD";
+    return db().table(t.toStdString());
+}
+
+// A table record as tblsearch shows it: name, flags and its own groups.
+Value CadFunctions::tblsearch(Args a, bool next) {
+    zvdb::SymbolTable* t = table(a[0]);
+    if (!t) return {};
+    const std::vector<zvdb::DbObject*> records = t->records();
+    const QString key = lisp_.toStr(a[0]).toUpper();
+    zvdb::DbObject* found = nullptr;
+    if (next) {
+        int& cursor = tableCursor_[key];
+        if (a.has(1) && !a[1].isNil()) cursor = 0;
+        if (cursor < int(records.size())) found = records[size_t(cursor++)];
+    } else {
+        const QString name = lisp_.toStr(a[1]);
+        for (zvdb::DbObject* r : records)
+            if (text(r->text(2)).compare(name, Qt::CaseInsensitive) == 0) found = r;
+        if (found && a.has(2) && !a[2].isNil()) {
+            int& cursor = tableCursor_[key];
+            cursor = int(std::find(records.begin(), records.end(), found) - records.begin()) + 1;
+        }
+    }
+    if (!found) return {};
+    ListBuilder list;
+    list.add(pair(0, Value::string(key == "BLOCK_RECORD" ? "BLOCK" : key)));
+    const auto tags = found->tags();
+    for (size_t i = 1; i < found->xdataStart(); ++i) {
+        const int code = tags[i].code;
+        if (code == 5 || code == 100 || code == 102 || code == 330 || code == 360 || code == 105)
+            continue;
+        addGroups(list, tags, i, i + 1);
+    }
+    return list.take();
+}
+
+Value CadFunctions::getvar(Args a) {
+    const QString name = lisp_.toStr(a[0]).toUpper();
+    const QFileInfo file(document_.fileName());
+    if (name == "CLAYER") return Value::string(text(db().currentLayer()));
+    if (name == "DWGNAME") return Value::string(file.fileName());
+    if (name == "DWGPREFIX") return Value::string(file.absolutePath() + "/");
+    if (name == "SAVENAME") return Value::string(file.absoluteFilePath());
+    if (name == "FILEDIA") return Value::integer(filedia_);
+    if (name == "ROAMABLEROOTPREFIX") {
+        QString folder = qEnvironmentVariable("ZV_DATA_DIR");
+        if (!folder.isEmpty() && !folder.endsWith('/')) folder += '/';
+        return Value::string(folder);
+    }
+    const std::string variable = QString("$" + name).toStdString();
+    if (!db().header().has(variable)) return {};
+    return Value::string(text(db().header().text(variable)));
+}
+
+Value CadFunctions::setvar(Args a) {
+    const QString name = lisp_.toStr(a[0]).toUpper();
+    if (name == "CLAYER") {
+        if (!db().setCurrentLayer(lisp_.toStr(a[1]).toStdString())) lisp_.fail("setvar rejected");
+    } else if (name == "FILEDIA") {
+        filedia_ = lisp_.toInt(a[1]);
+    } else {
+        lisp_.fail("setvar rejected");
+    }
+    return a[1];
+}
+
+Value CadFunctions::dictsearch(Args a) {
+    auto* dictionary = dynamic_cast<zvdb::Dictionary*>(object(a[0]));
+    if (!dictionary) return {};
+    zvdb::DbObject* entry = dictionary->get(lisp_.toStr(a[1]).toStdString());
+    if (!entry) return {};
+    const Value name = ename(entry);
+    return entget(Args(&name, 1));
+}
+
+Value CadFunctions::dictnext(Args a) {
+    auto* dictionary = dynamic_cast<zvdb::Dictionary*>(object(a[0]));
+    if (!dictionary) return {};
+    const auto entries = dictionary->entries();
+    int& cursor = dictCursor_[dictionary->handle()];
+    if (a.has(1) && !a[1].isNil()) cursor = 0;
+    if (cursor >= int(entries.size())) return {};
+    const Value name = ename(db().objectByHandle(entries[size_t(cursor++)].handle));
+    return entget(Args(&name, 1));
+}
+
+// A filter list of (0 . "TYPE"), (8 . "LAYER"), (2 . "BLOCK") with wildcards, and
+// (-3 ("APP")) for extended data; every pair must match.
+bool CadFunctions::passes(const zvdb::Entity& e, const Value& filter) {
+    for (Value v = filter; v.isCons(); v = v.asCons()->cdr) {
+        const Value& group = v.asCons()->car;
+        if (!group.isCons() || !group.asCons()->car.isInt()) continue;
+        const int code = group.asCons()->car.asInt();
+        const Value& want = group.asCons()->cdr;
+        if (code == -3) {
+            for (Value app = want; app.isCons(); app = app.asCons()->cdr) {
+                const Value& name = app.asCons()->car.isCons() ? app.asCons()->car.asCons()->car
+                                                               : app.asCons()->car;
+                if (!name.isString() || xdata(e, Value::cons(name, Value())).isNil()) return false;
+            }
+            continue;
+        }
+        if (!want.isString()) continue;
+        const QString have = code == 0 ? text(e.type()) : text(e.text(code));
+        if (!zvlisp::Wildcard(want.asString().toUpper()).matches(have.toUpper())) return false;
+    }
+    return true;
+}
+
+Value CadFunctions::ssget(Args a) {
+    const QString mode = a.has(0) && a[0].isString() ? a[0].asString().toUpper() : QString();
+    Value filter;
+    zvdb::BoundingBox window;
+    const bool windowed = mode == "C" || mode == "W";
+    if (mode == "X") {
+        filter = a.has(1) ? a[1] : Value();
+    } else if (windowed && a.has(2)) {
+        for (int k : {1, 2}) {
+            std::vector<Value> xyz = lisp_.toVector(a[k]);
+            window.add(zvdb::Point3{xyz.size() > 0 ? lisp_.toNumber(xyz[0]) : 0,
+                                    xyz.size() > 1 ? lisp_.toNumber(xyz[1]) : 0, 0});
+        }
+        filter = a.has(3) ? a[3] : Value();
+    } else {
+        return {};  // picking on screen: this host has no screen
+    }
+    auto* set = new zvlisp::PicksetObject;
+    const Value result = Value::object(Type::Pickset, set);
+    if (!db().modelSpace()) return {};
+    for (zvdb::Entity* e : db().modelSpace()->entities()) {
+        if (!passes(*e, filter)) continue;
+        if (windowed) {
+            // Windows see what shows: entities of thawed layers, inside (W) or touching (C).
+            const zvdb::LayerRecord* layer = db().layer(e->layer());
+            if (layer && layer->isFrozen()) continue;
+            const zvdb::BoundingBox box = zvdb::Extents::ofEntity(*e, false);
+            if (box.isEmpty()) continue;
+            const bool inside = box.min.x >= window.min.x && box.max.x <= window.max.x &&
+                                box.min.y >= window.min.y && box.max.y <= window.max.y;
+            const bool touching = box.max.x >= window.min.x && box.min.x <= window.max.x &&
+                                  box.max.y >= window.min.y && box.min.y <= window.max.y;
+            if (mode == "W" ? !inside : !touching) continue;
+        }
+        set->names.push_back({&db(), e->handle()});
+    }
+    return set->names.empty() ? Value() : result;
+}
+
+zvlisp::PicksetObject* CadFunctions::pickset(const Value& v) {
+    if (v.type() != Type::Pickset) lisp_.badType("lselsetp", v);
+    return static_cast<zvlisp::PicksetObject*>(v.asObject());
+}
+
+void CadFunctions::install() {
+    const std::shared_ptr<CadFunctions> self = shared_from_this();
+    lisp_.define(
+        "entget", [self](Interpreter&, Args a) { return self->entget(a); }, 1, 2);
+    lisp_.define(
+        "entmod", [self](Interpreter&, Args a) { return self->entmod(a); }, 1, 1);
+    lisp_.define(
+        "entupd", [](Interpreter&, Args a) { return a[0]; }, 1, 1);
+    lisp_.define(
+        "entnext", [self](Interpreter&, Args a) { return self->entnext(a); }, 0, 1);
+    lisp_.define(
+        "entlast",
+        [self](Interpreter&, Args) {
+            const auto all = self->db().modelSpace() ? self->db().modelSpace()->entities()
+                                                     : std::vector<zvdb::Entity*>();
+            return all.empty() ? Value() : self->ename(all.back());
+        },
+        0, 0);
+    lisp_.define(
+        "entdel",
+        [self](Interpreter&, Args a) {
+            zvdb::DbObject* o = self->object(a[0]);
+            if (!o) return Value();
+            o->erase();
+            return a[0];
+        },
+        1, 1);
+    lisp_.define(
+        "handent",
+        [self](Interpreter& in, Args a) {
+            return self->ename(
+                self->db().objectByHandle(zvdb::TagValues::toHandle(in.toStr(a[0]).toStdString())));
+        },
+        1, 1);
+    lisp_.define(
+        "tblsearch", [self](Interpreter&, Args a) { return self->tblsearch(a, false); }, 2, 3);
+    lisp_.define(
+        "tblnext", [self](Interpreter&, Args a) { return self->tblsearch(a, true); }, 1, 2);
+    lisp_.define(
+        "tblobjname",
+        [self](Interpreter& in, Args a) {
+            zvdb::SymbolTable* t = self->table(a[0]);
+            if (!t) return Value();
+            for (zvdb::DbObject* r : t->records())
+                if (text(r->text(2)).compare(in.toStr(a[1]), Qt::CaseInsensitive) == 0)
+                    return self->ename(r);
+            return Value();
+        },
+        2, 2);
+    lisp_.define(
+        "regapp",
+        [self](Interpreter& in, Args a) {
+            return self->db().registerApplication(in.toStr(a[0]).toStdString()) ? a[0] : Value();
+        },
+        1, 1);
+    lisp_.define(
+        "getvar", [self](Interpreter&, Args a) { return self->getvar(a); }, 1, 1);
+    lisp_.define(
+        "setvar", [self](Interpreter&, Args a) { return self->setvar(a); }, 2, 2);
+    lisp_.define(
+        "namedobjdict",
+        [self](Interpreter&, Args) { return self->ename(self->db().namedObjects()); }, 0, 0);
+    lisp_.define(
+        "dictsearch", [self](Interpreter&, Args a) { return self->dictsearch(a); }, 2, 3);
+    lisp_.define(
+        "dictnext", [self](Interpreter&, Args a) { return self->dictnext(a); }, 1, 2);
+    lisp_.define(
+        "ssget", [self](Interpreter&, Args a) { return self->ssget(a); }, 0, 4);
+    lisp_.define(
+        "sslength",
+        [self](Interpreter&, Args a) {
+            return Value::integer(std::int32_t(self->pickset(a[0])->names.size()));
+        },
+        1, 1);
+    lisp_.define(
+        "ssname",
+        [self](Interpreter& in, Args a) {
+            const auto& names = self->pickset(a[0])->names;
+            const int i = in.toInt(a[1]);
+            if (i < 0 || i >= int(names.size())) return Value();
+            return self->ename(self->db().objectByHandle(names[size_t(i)].handle));
+        },
+        2, 2);
+    lisp_.define(
+        "ssadd",
+        [self](Interpreter& in, Args a) {
+            auto* set = new zvlisp::PicksetObject;
+            Value result = Value::object(Type::Pickset, set);
+            if (a.has(1)) {
+                set->names = self->pickset(a[1])->names;
+                result = a[1];
+                set = self->pickset(a[1]);
+            }
+            if (a.has(0) && !a[0].isNil()) {
+                if (a[0].type() != Type::Ename) in.badType("lentityp", a[0]);
+                const auto name = static_cast<zvlisp::EnameObject*>(a[0].asObject())->name;
+                if (std::find(set->names.begin(), set->names.end(), name) == set->names.end())
+                    set->names.push_back(name);
+            }
+            return result;
+        },
+        0, 2);
+    lisp_.define(
+        "command",
+        [self](Interpreter& in, Args a) {
+            QStringList tokens;
+            for (const Value& v : a)
+                tokens << (v.isString() ? v.asString() : QString::number(in.toNumber(v)));
+            if (!tokens.isEmpty() && !self->document_.runCommand(tokens))
+                in.fail("Unknown command " + tokens.first());
+            return Value();
+        },
+        0, zvlisp::kVariadic);
+}
+
+}  // namespace
+
+void installCadFunctions(Interpreter& lisp, HostDocument& document) {
+    std::make_shared<CadFunctions>(lisp, document)->install();
+    lisp.define(
+        "vl-cmdf",
+        [](Interpreter& in, Args a) {
+            in.apply(in.global("command"), a);
+            return in.t();
+        },
+        0, zvlisp::kVariadic);
+}
+
+}  // namespace zvhost
