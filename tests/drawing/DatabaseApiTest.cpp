@@ -312,6 +312,30 @@ TEST_F(DatabaseApi, DeepCloneBringsBlocksLayersAndTranslatesHandles) {
         "K1");
 }
 
+TEST_F(DatabaseApi, ABlockIsRedefinedFromAnotherInTheSameDrawing) {
+    BlockRecord* existing = db.createBlock("BORNE");
+    existing->addLine({0, 0, 0}, {1, 0, 0});
+    BlockRecord* temporary = db.createBlock("ZV_TMP_41");
+    temporary->addCircle({0, 0, 0}, 2);
+    temporary->addAttributeDefinition("NUMERO", "", "", {0, 3, 0}, 1);
+    for (Entity* entity : existing->entities())
+        entity->erase();
+    DeepCloner cloner(db, db);
+    const auto copies = cloner.cloneEntities(temporary->entities(), *existing);
+    ASSERT_EQ(copies.size(), 2u);
+    temporary->erase();
+    EXPECT_EQ(db.block("ZV_TMP_41"), nullptr);
+    const auto entities = existing->entities();
+    ASSERT_EQ(entities.size(), 2u);
+    EXPECT_TRUE(entities[0]->isType("CIRCLE"));
+    EXPECT_EQ(entities[1]->ownerHandle(), existing->handle());
+    EXPECT_EQ(existing->attributeDefinitions().size(), 1u);
+    EXPECT_NE(db.createBlock("ZV_TMP_41"), temporary) << "the name is free again";
+    const QJsonObject blocks = inspect(db)["blocks"].toObject();
+    EXPECT_EQ(blocks["BORNE"].toArray().size(), 2);
+    EXPECT_EQ(blocks["ZV_TMP_41"].toArray().size(), 0);
+}
+
 TEST_F(DatabaseApi, ModelSpaceOfAFileBecomesABlock) {
     Database file;
     file.modelSpace()->addLine({0, 0, 0}, {3, 0, 0});
