@@ -405,34 +405,6 @@ bool ConfereBloco(zvdb::Database& lado, const QString& nome, const QString& arqu
     return true;
 }
 
-// Moves an entity's own points by `d` (block files drawn with another base point).
-void Desloca(zvdb::Entity& entidade, const zvdb::Point3& d) {
-    const std::string_view tipo = entidade.type();
-    const bool segundoPonto = tipo == "LINE" || tipo == "TEXT" || tipo == "ATTDEF" ||
-                              tipo == "ATTRIB" || tipo == "SOLID" || tipo == "3DFACE" ||
-                              tipo == "TRACE";
-    const bool maisPontos = tipo == "SOLID" || tipo == "3DFACE" || tipo == "TRACE";
-    zvdb::Database& db = entidade.database();
-    std::vector<zvdb::Tag>& tags = entidade.editTags();
-    const std::size_t fim = entidade.xdataStart();
-    for (std::size_t i = 1; i < fim; ++i) {
-        const int codigo = tags[i].code;
-        const int base = codigo % 10;
-        const int eixo = codigo / 10;
-        if (eixo < 1 || eixo > 3 || codigo >= 40) continue;
-        if (base == 0 || (base == 1 && segundoPonto) || (base >= 2 && base <= 3 && maisPontos)) {
-            if (tipo == "LWPOLYLINE" && eixo == 3) continue;  // no z per vertex
-            const double deslocamento = eixo == 1 ? d.x : eixo == 2 ? d.y : d.z;
-            const double valor =
-                QByteArray(tags[i].value.data(), int(tags[i].value.size())).toDouble();
-            tags[i].value =
-                db.store(QByteArray::number(valor + deslocamento, 'g', 17).toStdString());
-        }
-    }
-    for (zvdb::Entity* sub : entidade.liveSubEntities())
-        Desloca(*sub, d);
-}
-
 // Defines `nome` in `db` from a side database, its entities moved to the origin.
 zvdb::BlockRecord* InsereComoBloco(zvdb::Database& db, const zvdb::Database& lado,
                                    const QString& nome) {
@@ -442,7 +414,7 @@ zvdb::BlockRecord* InsereComoBloco(zvdb::Database& db, const zvdb::Database& lad
     const zvdb::Point3 origem = bloco->basePoint();
     if (origem != zvdb::Point3{})
         for (zvdb::Entity* entidade : bloco->entities())
-            Desloca(*entidade, zvdb::Point3{} - origem);
+            entidade->moveBy(zvdb::Point3{} - origem);
     bloco->setBasePoint({});
     return bloco;
 }

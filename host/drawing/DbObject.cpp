@@ -156,8 +156,8 @@ std::size_t DbObject::appGroupEnd(std::string_view group) const {
 
 std::size_t DbObject::xdataStart() const {
     const auto all = tags();
-    if (type() == "XRECORD") return all.size();
-    // Extended data is the run of codes 1000 and above at the end, opened by a 1001.
+    // Extended data is the run of codes 1000 and above at the end, opened by a 1001; an
+    // Xrecord's own data stays below 1000, so the rule holds for it too.
     std::size_t start = all.size();
     while (start > 1 && all[start - 1].code >= 1000)
         --start;

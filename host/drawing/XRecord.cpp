@@ -14,7 +14,8 @@ std::size_t XRecord::dataStart() const {
 
 std::vector<Tag> XRecord::data() const {
     const auto all = tags();
-    return std::vector<Tag>(all.begin() + static_cast<std::ptrdiff_t>(dataStart()), all.end());
+    return std::vector<Tag>(all.begin() + static_cast<std::ptrdiff_t>(dataStart()),
+                            all.begin() + static_cast<std::ptrdiff_t>(xdataStart()));
 }
 
 void XRecord::setData(std::span<const Tag> data) {
@@ -23,9 +24,12 @@ void XRecord::setData(std::span<const Tag> data) {
     stored.reserve(data.size());
     for (const Tag& tag : data)
         stored.push_back(Tag{tag.code, store(tag.value)});
+    // The extended data behind the data stays.
+    const std::size_t end = xdataStart();
     auto& all = editTags();
-    all.resize(start);
-    all.insert(all.end(), stored.begin(), stored.end());
+    all.erase(all.begin() + static_cast<std::ptrdiff_t>(start),
+              all.begin() + static_cast<std::ptrdiff_t>(end));
+    all.insert(all.begin() + static_cast<std::ptrdiff_t>(start), stored.begin(), stored.end());
 }
 
 }  // namespace zvdb

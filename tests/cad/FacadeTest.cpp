@@ -7,6 +7,7 @@
 #include "drawing/Dictionary.h"
 #include "drawing/Polyline.h"
 #include "drawing/TextEntity.h"
+#include "drawing/XRecord.h"
 #include "readers/ZVString.h"
 
 #include <cmath>
@@ -312,6 +313,29 @@ TEST_F(FacadeFixture, ExtentsOfEntitiesAndReferences) {
     const OdDbObjectId ref = CICad::InsereBloco(caminho, "CAIXA", "0", 100, 50, 0, 0);
     ASSERT_TRUE(CICad::GetExtensao(ref, xMax, xMin, yMax, yMin, false));
     EXPECT_EQ(QList<double>({xMax, xMin, yMax, yMin}), QList<double>({110, 100, 50, 50}));
+}
+
+}  // namespace
+
+namespace {
+
+TEST_F(FacadeFixture, XrecordsCarryExtendedDataBehindTheirData) {
+    const std::string caminho[] = {"ESQ_VIRTUAL_ZV", "BORNE_XV_1"};
+    zvdb::XRecord* registro = db().xrecordAt(caminho, true);
+    const zvdb::Tag dado{1, db().store("dados")};
+    registro->setData(std::span<const zvdb::Tag>(&dado, 1));
+    const OdDbObjectId id(&db(), registro->handle());
+    CICad::SetXData(id, "KVR_ZV", {{1000, QString("7001") + QChar(0x0C) + "1"}});
+    EXPECT_TRUE(CICad::TemXData(id, "KVR_ZV"));
+    // Rewriting the data keeps the extended data, and the other way round.
+    const zvdb::Tag outro{1, db().store("outros")};
+    registro->setData(std::span<const zvdb::Tag>(&outro, 1));
+    ASSERT_EQ(registro->data().size(), 1u);
+    EXPECT_EQ(registro->data()[0].value, "outros");
+    EXPECT_EQ(CICad::GetXData(id, "KVR_ZV").front().texto, QString("7001") + QChar(0x0C) + "1");
+    const auto entradas = CICad::GetEntradasDicionario({"ESQ_VIRTUAL_ZV"});
+    ASSERT_EQ(entradas.size(), 1u);
+    EXPECT_EQ(entradas[0].first, "BORNE_XV_1");
 }
 
 }  // namespace
