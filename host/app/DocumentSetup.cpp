@@ -3,10 +3,31 @@
 #include "CadLisp.h"
 #include "DocumentLisp.h"
 #include "HostDocument.h"
+#include "Application.h"
+#include "product/ProductLisp.h"
+#include "product/UserConfig.h"
 
 #include <QFileInfo>
 
 namespace zvhost {
+
+namespace {
+
+// The product's LISP functions on this document, then the user's configuration file.
+void installProduct(zvlisp::Interpreter& lisp, HostDocument& document) {
+    zvproduct::ProductContext context;
+    context.database = [&document] { return document.database(); };
+    context.userInterface = [] {
+        return Application::instance() ? Application::instance()->userInterface() : nullptr;
+    };
+    context.print = [&document](const QString& text) { document.printMessage(text); };
+    context.fileName = [&document] { return document.fileName(); };
+    zvproduct::installProductFunctions(lisp, context);
+    const QString config = zvproduct::UserConfig::file();
+    if (!config.isEmpty()) zvproduct::UserConfig::load(lisp, config);
+}
+
+}  // namespace
 
 void setUpDocument(HostDocument& document) {
     // The LISP environment prints on the document's command line; load and findfile look
@@ -16,6 +37,7 @@ void setUpDocument(HostDocument& document) {
     if (!document.fileName().isEmpty())
         lisp->interpreter().searchPaths() << QFileInfo(document.fileName()).absolutePath();
     installCadFunctions(lisp->interpreter(), document);
+    installProduct(lisp->interpreter(), document);
     document.setLisp(std::move(lisp));
 }
 

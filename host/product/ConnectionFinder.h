@@ -1,0 +1,79 @@
+#pragma once
+// Works out which symbols each wire and each cable touches, from the drawing alone. The
+// symbols' connection points go into a grid of cells keyed by layer and cell, so each
+// polyline vertex looks at nine cells: the whole drawing is read in near-linear time.
+// The rule is told in docs/project-format.md ("Wires and the connection rule").
+#include "drawing/Geometry.h"
+
+#include <cstdint>
+#include <string>
+#include <unordered_map>
+#include <vector>
+
+namespace zvdb {
+class Database;
+class Polyline;
+}  // namespace zvdb
+
+namespace zvproduct {
+
+struct Touch {
+    std::uint64_t symbol = 0;
+    std::string connection;  // value of the touching connection attribute, or empty
+    std::string block;
+    zvdb::Point3 point;
+};
+
+struct WireConnections {
+    std::string number;
+    std::vector<Touch> touches;            // along the wire from its start
+    std::vector<std::uint64_t> polylines;  // page order, then handle order
+};
+
+class ConnectionFinder {
+public:
+    ConnectionFinder(zvdb::Database& database, double tolerance);
+
+    // Wires (KVR_ZV_WIRE), in the order their first polyline comes in page order.
+    std::vector<WireConnections> wires();
+    // Cables by "NAME\fKEY": the two ends of each lead and the ends of its blind
+    // connections, leads in page order (tolerance 0.3).
+    std::vector<WireConnections> cables();
+
+    // Wire and cable polylines of one layer, handle order.
+    std::vector<std::uint64_t> polylinesOn(const std::string& layer) const;
+
+    // The wire number of a KVR_ZV_WIRE polyline (FIO, WIRE, ALAMBRE or CABO item); empty.
+    static std::string wireNumber(const zvdb::Polyline& polyline);
+    // "NAME\fKEY" of a lead: its cable's CABO field and its own key; empty.
+    std::string cableNumber(const zvdb::Polyline& lead) const;
+
+private:
+    struct Symbol {
+        std::uint64_t handle;
+        std::string block;
+    };
+    struct Spot {
+        std::uint32_t symbol;
+        int layer;
+        zvdb::Point3 point;
+        std::string connection;
+    };
+    void indexSymbols();
+    void addSpot(std::uint32_t symbol, int layer, const zvdb::Point3& p, std::string connection);
+    std::uint64_t cellKey(int layer, long long x, long long y) const;
+    std::vector<const Spot*> spotsNear(int layer, const zvdb::Point3& p, double radius) const;
+    void touchesAt(int layer, const zvdb::Point3& p, double radius, std::vector<Touch>& out) const;
+    int layerId(const std::string& layer);
+    std::vector<zvdb::Polyline*> polylinesInPageOrder(const char* application);
+
+    zvdb::Database& database_;
+    double tolerance_;
+    double cell_;
+    std::unordered_map<std::string, int> layers_;
+    std::vector<Symbol> symbols_;
+    std::vector<Spot> spots_;
+    std::unordered_map<std::uint64_t, std::vector<std::uint32_t>> grid_;
+};
+
+}  // namespace zvproduct

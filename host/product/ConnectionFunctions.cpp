@@ -1,0 +1,136 @@
+// Connections: getConexoesTodosFios, getConexoesTodosCabos, getFiosPorLayer, getListaFios,
+// getListaFiosProj.
+#include "ConnectionFinder.h"
+#include "LispHelpers.h"
+#include "PageRegistry.h"
+#include "ProductLisp.h"
+
+#include "drawing/Database.h"
+#include "drawing/Polyline.h"
+#include "sdk/ResultBuffer.h"
+
+#include <QStringList>
+
+#include <unordered_set>
+
+namespace zvproduct {
+
+using zvlisp::Args;
+using zvlisp::Interpreter;
+using zvlisp::Value;
+
+namespace {
+
+zvdb::Database& databaseOf(Interpreter& lisp, const ProductContext& context) {
+    zvdb::Database* database = context.database ? context.database() : nullptr;
+    if (!database) lisp.fail("no drawing");
+    return *database;
+}
+
+double tolerance(Interpreter& lisp) {
+    const Value value = lisp.global("*ESPESSURA_BARRAMENTO*");
+    return value.isNumber() && lisp.toNumber(value) > 0 ? lisp.toNumber(value) : 0.1;
+}
+
+std::string handleText(std::uint64_t handle) {
+    return QString::number(handle, 16).toUpper().toStdString();
+}
+
+// ((NUMBER (TEXT x y z) ...) ...); `details` adds "#CONNECTION#BLOCK" to the handle.
+Value connectionList(const std::vector<WireConnections>& wires, bool details) {
+    zvlisp::ListBuilder all;
+    for (const WireConnections& wire : wires) {
+        zvlisp::ListBuilder one;
+        one.add(lispText(wire.number));
+        for (const Touch& touch : wire.touches) {
+            std::string text = handleText(touch.symbol);
+            if (details) text += "#" + touch.connection + "#" + touch.block;
+            zvlisp::ListBuilder entry;
+            entry.add(lispText(text));
+            entry.add(Value::real(touch.point.x));
+            entry.add(Value::real(touch.point.y));
+            entry.add(Value::real(touch.point.z));
+            one.add(entry.take());
+        }
+        all.add(one.take());
+    }
+    return all.take();
+}
+
+Value ename(zvdb::Database& database, std::uint64_t handle) {
+    return Value::object(zvlisp::Type::Ename,
+                         new zvlisp::EnameObject(zvsdk::EntityName{&database, handle}));
+}
+
+// Layer names from strings and lists, a text cut at ";" too.
+std::unordered_set<std::string> layerNames(Args args, int from) {
+    std::vector<std::string> texts;
+    for (int i = from; i < args.size(); ++i)
+        collectTexts(args[i], texts);
+    std::unordered_set<std::string> names;
+    for (const std::string& text : texts)
+        for (const QString& part : QString::fromStdString(text).split(';', Qt::SkipEmptyParts))
+            names.insert(part.toStdString());
+    return names;
+}
+
+// The first polyline of each wire with a polyline on one of `layers` (all when empty).
+std::vector<std::uint64_t> wiresOn(zvdb::Database& database, double tol,
+                                   const std::unordered_set<std::string>& layers) {
+    std::vector<std::uint64_t> handles;
+    for (const WireConnections& wire : ConnectionFinder(database, tol).wires()) {
+        for (std::uint64_t handle : wire.polylines) {
+            zvdb::Entity* entity = database.entityByHandle(handle);
+            if (!layers.empty() && !layers.count(std::string(entity->layer()))) continue;
+            handles.push_back(handle);
+            break;
+        }
+    }
+    return handles;
+}
+
+}  // namespace
+
+void installConnectionFunctions(Interpreter& lisp, const ProductContext& context) {
+    lisp.define(
+        "getConexoesTodosFios",
+        [context](Interpreter& in, Args) {
+            ConnectionFinder finder(databaseOf(in, context), tolerance(in));
+            return connectionList(finder.wires(), true);
+        },
+        0, 0);
+    lisp.define(
+        "getConexoesTodosCabos",
+        [context](Interpreter& in, Args) {
+            ConnectionFinder finder(databaseOf(in, context), tolerance(in));
+            return connectionList(finder.cables(), false);
+        },
+        0, 0);
+    lisp.define(
+        "getFiosPorLayer",
+        [context](Interpreter& in, Args a) {
+            zvdb::Database& database = databaseOf(in, context);
+            std::vector<std::string> handles;
+            for (std::uint64_t handle :
+                 ConnectionFinder(database, tolerance(in)).polylinesOn(stdText(in, a[0])))
+                handles.push_back(handleText(handle));
+            return lispTexts(handles);
+        },
+        1, 1);
+    lisp.define("getListaFios", [context](Interpreter& in, Args a) {
+        zvdb::Database& database = databaseOf(in, context);
+        zvlisp::ListBuilder list;
+        for (std::uint64_t handle : wiresOn(database, tolerance(in), layerNames(a, 0)))
+            list.add(ename(database, handle));
+        return list.take();
+    });
+    lisp.define("getListaFiosProj", [context](Interpreter& in, Args a) {
+        zvdb::Database& database = databaseOf(in, context);
+        std::vector<std::string> handles;
+        for (std::uint64_t handle : wiresOn(database, tolerance(in), layerNames(a, 1)))
+            handles.push_back(handleText(handle));
+        return lispTexts(handles);
+    });
+}
+
+}  // namespace zvproduct

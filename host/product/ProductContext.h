@@ -1,0 +1,24 @@
+#pragma once
+// What the product's LISP functions reach of their document: its drawing, its user
+// interface, its command line and its file name. Every getter may answer null or empty.
+#include <QString>
+
+#include <functional>
+
+namespace zvdb {
+class Database;
+}
+namespace zvsdk {
+class UserInterface;
+}
+
+namespace zvproduct {
+
+struct ProductContext {
+    std::function<zvdb::Database*()> database;
+    std::function<zvsdk::UserInterface*()> userInterface;
+    std::function<void(const QString&)> print;
+    std::function<QString()> fileName;
+};
+
+}  // namespace zvproduct

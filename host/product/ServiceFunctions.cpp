@@ -1,0 +1,214 @@
+// Templates and the other services: ZVCarregaTemplate, zvBuild, BuscarCoordenadas,
+// zvGetCircuitoLocalInfo, zvsolution_isloaded, zvsolution_getProjFile,
+// zv_interno_get_idioma_corrente, atualizarMacros, atualizaTopografico,
+// zvAlternaStatusBloqueioPalette, zvExportaLayerDxf, zvExportaLayer.
+#include "LispHelpers.h"
+#include "ProductLisp.h"
+#include "ProjectCheck.h"
+
+#include "drawing/BlockRecord.h"
+#include "drawing/Database.h"
+#include "drawing/DeepCloner.h"
+#include "drawing/DxfWriter.h"
+#include "drawing/Entity.h"
+#include "lisp/LispFile.h"
+
+#include <QFileInfo>
+
+#include <cmath>
+
+namespace zvproduct {
+
+using zvlisp::Args;
+using zvlisp::Interpreter;
+using zvlisp::Value;
+
+namespace {
+
+// The sheet grid used when no page model is reachable: 12 columns 1-12 of 35 units across
+// the A3 sheet, 8 rows A-H of 37.125 units from the top edge.
+constexpr double kSheetWidth = 420.0, kSheetHeight = 297.0;
+constexpr int kColumns = 12, kRows = 8;
+
+void print(const ProductContext& context, const QString& text) {
+    if (context.print) context.print(text);
+}
+
+double tolerance(Interpreter& lisp) {
+    const Value value = lisp.global("*ESPESSURA_BARRAMENTO*");
+    return value.isNumber() && lisp.toNumber(value) > 0 ? lisp.toNumber(value) : 0.1;
+}
+
+Value loadTemplate(Interpreter& lisp, const ProductContext& context, const QString& path) {
+    QString text;
+    if (!QFileInfo(path).isFile() || !zvlisp::LispFile::readText(path, &text)) {
+        print(context, "\n; error: template not found: " + path + "\n");
+        return Value();
+    }
+    QString message;
+    const Value result = lisp.catching([&] { return lisp.evalText(text, path); }, &message);
+    if (!message.isEmpty()) {
+        print(context, "\n; error: " + message + "\n; in template " + path + "\n");
+        return Value();
+    }
+    (void)result;
+    return lisp.t();
+}
+
+QString gridPosition(double x, double y) {
+    if (!(x >= 0 && x <= kSheetWidth && y >= 0 && y <= kSheetHeight)) return "??";
+    const int column = std::min(kColumns - 1, static_cast<int>(x / (kSheetWidth / kColumns)));
+    const int row =
+        std::min(kRows - 1, static_cast<int>((kSheetHeight - y) / (kSheetHeight / kRows)));
+    return QString("%1%2").arg(QChar('A' + row)).arg(column + 1);
+}
+
+// From *ZV_CIRCUITOS_LOCAIS*, ((N "name" "description" "panel") ...); otherwise the number,
+// "LOCAL N" and an empty text.
+Value localCircuit(Interpreter& lisp, int number) {
+    for (Value rest = lisp.global("*ZV_CIRCUITOS_LOCAIS*"); rest.isCons();
+         rest = zvlisp::cdr(rest)) {
+        const Value entry = zvlisp::car(rest);
+        const Value key = zvlisp::car(entry);
+        if (key.isInt() && key.asInt() == number) {
+            QStringList texts;
+            for (Value f = zvlisp::cdr(entry); f.isCons() && texts.size() < 3; f = zvlisp::cdr(f))
+                texts << (zvlisp::car(f).isString() ? zvlisp::car(f).asString() : QString());
+            while (texts.size() < 3)
+                texts << QString();
+            return lispTexts(texts);
+        }
+    }
+    return lispTexts(
+        QStringList{QString::number(number), QString("LOCAL %1").arg(number), QString()});
+}
+
+QStringList solutionFiles(Interpreter& lisp) {
+    std::vector<std::string> files;
+    collectTexts(lisp.global("*ZV_SOLUCAO*"), files);
+    QStringList out;
+    for (const std::string& file : files)
+        out << QString::fromStdString(file);
+    return out;
+}
+
+// The solution's file whose name, with or without its extension, is the project key.
+Value projectFile(Interpreter& lisp, const QString& key) {
+    for (const QString& file : solutionFiles(lisp)) {
+        const QFileInfo info(QString(file).replace('\\', '/'));
+        if (info.fileName().compare(key, Qt::CaseInsensitive) == 0 ||
+            info.completeBaseName().compare(key, Qt::CaseInsensitive) == 0)
+            return Value::string(file);
+    }
+    return Value();
+}
+
+QString currentLanguage(Interpreter& lisp) {
+    const Value set = lisp.global("*_ZV_IDIOMA_ATUAL_*");
+    if (set.isString() && !set.asString().isEmpty()) return set.asString();
+    const QString locale = qEnvironmentVariable("LANG").left(2).toLower();
+    if (locale == "en") return "EN";
+    if (locale == "es") return "ES";
+    return "PT";
+}
+
+bool exportPageDxf(zvdb::Database& database, const std::string& page, const QString& path,
+                   QString* error) {
+    std::vector<zvdb::Entity*> entities;
+    for (zvdb::Entity* entity : database.modelSpace()->entities())
+        if (entity->layer() == page) entities.push_back(entity);
+    if (!database.layer(page)) {
+        *error = "no such page: " + QString::fromStdString(page);
+        return false;
+    }
+    try {
+        zvdb::Database target;
+        zvdb::DeepCloner(database, target).cloneEntities(entities, *target.modelSpace());
+        zvdb::DxfWriter::saveFile(target, path.toStdString());
+    } catch (const std::exception& failure) {
+        *error = QString::fromUtf8(failure.what());
+        return false;
+    }
+    return true;
+}
+
+}  // namespace
+
+void installServiceFunctions(Interpreter& lisp, const ProductContext& context) {
+    lisp.define(
+        "ZVCarregaTemplate",
+        [context](Interpreter& in, Args a) { return loadTemplate(in, context, in.toStr(a[0])); }, 1,
+        1);
+    lisp.define(
+        "zvBuild",
+        [context](Interpreter& in, Args) {
+            zvdb::Database* database = context.database ? context.database() : nullptr;
+            if (!database) return Value();
+            const QStringList findings = ProjectCheck::run(*database, tolerance(in));
+            const int shown = std::min<int>(findings.size(), 100);
+            for (int i = 0; i < shown; ++i)
+                print(context, "\n" + findings[i]);
+            if (findings.size() > shown)
+                print(context, QString("\n... %1 more").arg(findings.size() - shown));
+            if (!findings.isEmpty())
+                print(context, QString("\nProject check: %1 finding(s)\n").arg(findings.size()));
+            return in.boolean(findings.isEmpty());
+        },
+        0, 0);
+    lisp.define(
+        "BuscarCoordenadas",
+        [](Interpreter& in, Args a) {
+            return Value::string(gridPosition(in.toNumber(a[3]), in.toNumber(a[4])));
+        },
+        5, 5);
+    lisp.define(
+        "zvGetCircuitoLocalInfo",
+        [](Interpreter& in, Args a) { return localCircuit(in, in.toInt(a[0])); }, 1, 1);
+    lisp.define(
+        "zvsolution_isloaded",
+        [](Interpreter& in, Args) { return in.boolean(!solutionFiles(in).isEmpty()); }, 0, 0);
+    lisp.define(
+        "zvsolution_getProjFile",
+        [](Interpreter& in, Args a) { return projectFile(in, in.toStr(a[0])); }, 1, 1);
+    lisp.define(
+        "zv_interno_get_idioma_corrente",
+        [](Interpreter& in, Args) {
+            const Value language = Value::string(currentLanguage(in));
+            in.setGlobal("*_ZV_IDIOMA_ATUAL_*", language);
+            return language;
+        },
+        0, 0);
+    // Nothing of this edition's drawing depends on the material list or the topographic
+    // diagram, so the two hooks have nothing to refresh; they exist for the module's calls.
+    lisp.define(
+        "atualizarMacros", [](Interpreter&, Args) { return Value(); }, 0, 0);
+    lisp.define(
+        "atualizaTopografico", [](Interpreter&, Args) { return Value(); }, 0, 0);
+    lisp.define(
+        "zvAlternaStatusBloqueioPalette",
+        [](Interpreter& in, Args) {
+            const bool locked = in.global("*ZV_PALETTE_BLOQUEADA*").isNil();
+            in.setGlobal("*ZV_PALETTE_BLOQUEADA*", in.boolean(locked));
+            return in.boolean(locked);
+        },
+        0, 0);
+    lisp.define(
+        "zvExportaLayerDxf",
+        [context](Interpreter& in, Args a) {
+            zvdb::Database* database = context.database ? context.database() : nullptr;
+            QString error = "no drawing";
+            if (database && exportPageDxf(*database, stdText(in, a[0]), in.toStr(a[1]), &error))
+                return in.t();
+            print(context, "\nzvExportaLayerDxf: " + error + "\n");
+            return Value();
+        },
+        2, 2);
+    lisp.define("zvExportaLayer", [context](Interpreter&, Args) {
+        print(context,
+              "\nzvExportaLayer: DWG export is not available in this edition; "
+              "use zvExportaLayerDxf\n");
+        return Value();
+    });
+}
+
+}  // namespace zvproduct

@@ -1,0 +1,121 @@
+// Connection lists worked out from small drawings.
+#include "ProductFixture.h"
+
+#include "product/ConnectionFinder.h"
+
+namespace zvproduct::testing {
+namespace {
+
+std::string hex(const zvdb::DbObject* object) {
+    return QString::number(object->handle(), 16).toUpper().toStdString();
+}
+
+class ConnectionsTest : public ProductFixture {
+protected:
+    ConnectionsTest() { addGroup("ESQ", 4, {"ESQ$0001$A", "ESQ$0002$A"}); }
+
+    zvdb::BlockReference* contact(const std::string& layer, zvdb::Point3 at) {
+        auto* reference = twoPoint("NA-1", layer, at);
+        reference->addAttribute("LIGACAO1", "13", at, 2.5);
+        reference->addAttribute("LIGACAO2", "14", {at.x, at.y - 10, 0}, 2.5);
+        return reference;
+    }
+};
+
+TEST_F(ConnectionsTest, WireThroughTerminalContactAndSecondTerminal) {
+    auto* first = terminal("ESQ$0001$A", {100, 200, 0}, "X1", "1");
+    auto* middle = contact("ESQ$0001$A", {150, 200, 0});
+    auto* last = terminal("ESQ$0001$A", {200, 200, 0}, "X1", "2");
+    // the second vertex is a bend; the others touch within the tolerance
+    wire("ESQ$0001$A",
+         {{100, 190.05, 0}, {120, 220, 0}, {150, 200, 0}, {150, 190, 0}, {200, 200, 0}}, "101");
+    EXPECT_EQ(show("(getConexoesTodosFios)"),
+              "((\"101\" (\"" + hex(first) + "##BORNE_1\" 100.0 190.0 0.0) (\"" + hex(middle) +
+                  "#13#NA-1\" 150.0 200.0 0.0) (\"" + hex(middle) +
+                  "#14#NA-1\" 150.0 190.0 0.0) (\"" + hex(last) + "##BORNE_1\" 200.0 200.0 0.0)))");
+}
+
+TEST_F(ConnectionsTest, TouchNeedsTheToleranceAndTheSameLayer) {
+    terminal("ESQ$0001$A", {100, 200, 0}, "X1", "1");
+    terminal("ESQ$0002$A", {300, 200, 0}, "X1", "2");
+    wire("ESQ$0001$A", {{100, 190.2, 0}, {300, 200, 0}}, "101");  // 0.2 off; other page
+    EXPECT_EQ(show("(getConexoesTodosFios)"), "((\"101\"))");
+    run("(setq *ESPESSURA_BARRAMENTO* 0.5)");
+    EXPECT_EQ(show("(length (cdr (car (getConexoesTodosFios))))"), "1");
+}
+
+TEST_F(ConnectionsTest, WireContinuedOnAnotherPageFollowsPageOrder) {
+    auto* second = terminal("ESQ$0002$A", {100, 200, 0}, "X1", "3");
+    wire("ESQ$0002$A", {{80, 200, 0}, {100, 200, 0}}, "102");  // drawn first, page 2
+    auto* first = terminal("ESQ$0001$A", {100, 200, 0}, "X1", "2");
+    wire("ESQ$0001$A", {{100, 190, 0}, {250, 190, 0}}, "102");
+    EXPECT_EQ(show("(mapcar 'car (cdr (car (getConexoesTodosFios))))"),
+              "(\"" + hex(first) + "##BORNE_1\" \"" + hex(second) + "##BORNE_1\")");
+    EXPECT_EQ(show("(length (getConexoesTodosFios))"), "1");
+}
+
+TEST_F(ConnectionsTest, TerminalStandingTwiceOnOneWire) {
+    auto* both = terminal("ESQ$0001$A", {300, 200, 0}, "X1", "4");
+    wire("ESQ$0001$A", {{300, 200, 0}, {320, 180, 0}, {300, 190, 0}}, "103");
+    const std::string h = hex(both);
+    EXPECT_EQ(
+        show("(cdr (car (getConexoesTodosFios)))"),
+        "((\"" + h + "##BORNE_1\" 300.0 200.0 0.0) (\"" + h + "##BORNE_1\" 300.0 190.0 0.0))");
+}
+
+TEST_F(ConnectionsTest, CableLeadWithBlindConnectionOnTheNextPage) {
+    auto* near = terminal("ESQ$0001$A", {100, 100, 0}, "X2", "1");
+    auto* far = terminal("ESQ$0002$A", {100, 100, 0}, "X2", "2");
+    const std::string path[] = {"ZV_CABOS"};
+    auto* cable = database->dictionaryAt(path, true)->getOrCreateXRecord("W1");
+    cable->setData(zvsample::XDataItems().add(1, "W1").tags());
+    cable->setXData("KVR_ZV_CABO", zvsample::XDataItems().text("20001\f1").tags());
+    cable->setXData("KVR_ZV_ATT_VIRTUAL", zvsample::XDataItems().text("CABO\fW1\fN").tags());
+    auto* lead =
+        database->modelSpace()->addLwPolyline({{100, 90.2, 0}, {400, 90, 0}}, false, "ESQ$0001$A");
+    lead->setXData("KVR_ZV_CABO", zvsample::XDataItems()
+                                      .text("20001\f1")
+                                      .handle(cable->handle())
+                                      .handle(cable->handle())
+                                      .tags());
+    auto* blind =
+        database->modelSpace()->addLwPolyline({{10, 50, 0}, {100, 90, 0}}, false, "ESQ$0002$A");
+    blind->setXData("KVR_ZV_CONEX_BLIND",
+                    zvsample::XDataItems().text("W1").handle(lead->handle()).tags());
+    EXPECT_EQ(show("(= (car (car (getConexoesTodosCabos))) (strcat \"W1\" (chr 12) \"20001\"))"),
+              "T");
+    EXPECT_EQ(show("(cdr (car (getConexoesTodosCabos)))"),
+              "((\"" + hex(near) + "\" 100.0 90.0 0.0) (\"" + hex(far) + "\" 100.0 90.0 0.0))");
+    EXPECT_EQ(show("(getFiosPorLayer \"ESQ$0001$A\")"), "(\"" + hex(lead) + "\")");
+}
+
+TEST_F(ConnectionsTest, WireListsByPage) {
+    terminal("ESQ$0001$A", {100, 200, 0}, "X1", "1");
+    auto* one = wire("ESQ$0001$A", {{100, 190, 0}, {100, 150, 0}}, "201");
+    auto* oneOnTwo = wire("ESQ$0002$A", {{100, 190, 0}, {100, 150, 0}}, "201");
+    auto* two = wire("ESQ$0002$A", {{200, 190, 0}, {200, 150, 0}}, "202");
+    EXPECT_EQ(show("(getListaFiosProj \"proj.dxf\" \"ESQ$0002$A\")"),
+              "(\"" + hex(oneOnTwo) + "\" \"" + hex(two) + "\")");
+    EXPECT_EQ(show("(getListaFiosProj \"proj.dxf\" nil)"),
+              "(\"" + hex(one) + "\" \"" + hex(two) + "\")");
+    EXPECT_EQ(show("(length (getListaFios \"ESQ$0001$A\" \"0\"))"), "1");
+    EXPECT_EQ(show("(getFiosPorLayer \"ESQ$0002$A\")"),
+              "(\"" + hex(oneOnTwo) + "\" \"" + hex(two) + "\")");
+}
+
+TEST_F(ConnectionsTest, ProjectCheckFindsDuplicateTerminalsAndOpenWires) {
+    terminal("ESQ$0001$A", {100, 200, 0}, "X1", "1");
+    terminal("ESQ$0001$A", {200, 200, 0}, "X1", "2");
+    wire("ESQ$0001$A", {{100, 190, 0}, {200, 200, 0}}, "301");
+    EXPECT_EQ(show("(zvBuild)"), "T");
+    EXPECT_TRUE(printed.isEmpty()) << printed.toStdString();
+    terminal("ESQ$0002$A", {100, 200, 0}, "X1", "2");
+    wire("ESQ$0002$A", {{100, 190, 0}, {50, 50, 0}}, "302");
+    EXPECT_EQ(show("(zvBuild)"), "nil");
+    EXPECT_TRUE(printed.contains("Terminal X1:2 stands twice")) << printed.toStdString();
+    EXPECT_TRUE(printed.contains("Wire 302 has only one end")) << printed.toStdString();
+    EXPECT_FALSE(printed.contains("Wire 301")) << printed.toStdString();
+}
+
+}  // namespace
+}  // namespace zvproduct::testing
