@@ -1,0 +1,90 @@
+// Pickers and prompts answered and cancelled; templates; a native function overridden.
+#include "ProductFixture.h"
+
+#include <QTemporaryDir>
+
+namespace zvproduct::testing {
+namespace {
+
+class PickersTest : public ProductFixture {
+protected:
+    PickersTest() { addGroup("ESQ", 4, {"ESQ$0001$A", "ESQ$0002$A"}); }
+};
+
+TEST_F(PickersTest, PagesAnsweredFilteredOrCancelled) {
+    ui.answers["pages"] = "ESQ$0002$A;NOPE;ESQ$0001$A";
+    EXPECT_EQ(show("(setq pblTmpSelPags (zv_seleciona_paginas 0))"),
+              "(\"ESQ$0002$A\" \"ESQ$0001$A\")");
+    EXPECT_TRUE(printed.contains("No such page: NOPE"));
+    ui.answers["pages"] = "*";
+    EXPECT_EQ(show("(zv_seleciona_paginas 1 0)"), "(\"ESQ$0001$A\" \"ESQ$0002$A\")");
+    ui.answers["pages"] = "P1#ESQ$0001$A;P2#ESQ$0003$A";
+    EXPECT_EQ(show("(zvselpagsolucao 0)"), "(\"P1#ESQ$0001$A\" \"P2#ESQ$0003$A\")");
+    ui.answers.clear();
+    EXPECT_EQ(show("(list (zv_seleciona_paginas 0) (zvselpagsolucao 0))"), "(nil nil)");
+}
+
+TEST_F(PickersTest, StripsAndPrompts) {
+    ui.answers["strips"] = "X1, X2";
+    EXPECT_EQ(show("(zvSelecionaReguas)"), "(\"X1\" \"X2\")");
+    ui.answers.remove("strips");
+    EXPECT_EQ(show("(zvSelecionaReguas)"), "nil");
+    ui.answers["prompt:Client"] = "ACME";
+    ui.answers["prompt:Job"] = "J 1";
+    EXPECT_EQ(show("(ENTRA_VIA_DD (LIST \"Client\" \"Job\" ))"), "T");
+    EXPECT_EQ(show("*LST_ATRIBS_ENTRADA*"), "(\"ACME\" \"J 1\")");
+    EXPECT_EQ(show("(ENTRA_VIA_DD (LIST \"Client\" \"Date\" ))"), "nil");
+    EXPECT_EQ(show("*LST_ATRIBS_ENTRADA*"), "nil");
+    EXPECT_TRUE(ui.asked.contains("prompt:Date"));
+}
+
+TEST_F(PickersTest, TemplateLoadsOrReportsItsError) {
+    QTemporaryDir folder;
+    const QString good = folder.path() + "/bornes.grt", bad = folder.path() + "/bad.grt";
+    {
+        QFile file(good);
+        ASSERT_TRUE(file.open(QIODevice::WriteOnly));
+        file.write("(setq *LINHAS_PAGINA* 30)\n(setq *CAB* \"LST_BORNE_CAB\")\n");
+    }
+    {
+        QFile file(bad);
+        ASSERT_TRUE(file.open(QIODevice::WriteOnly));
+        file.write("(setq *LINHAS_PAGINA* 40)\n(setq *CAB* \"X\"\n");
+    }
+    EXPECT_EQ(show("(ZVCarregaTemplate \"" + good + "\")"), "T");
+    EXPECT_EQ(show("(list *LINHAS_PAGINA* *CAB*)"), "(30 \"LST_BORNE_CAB\")");
+    EXPECT_EQ(show("(ZVCarregaTemplate \"" + bad + "\")"), "nil");
+    EXPECT_TRUE(printed.contains("; error:")) << printed.toStdString();
+    EXPECT_TRUE(printed.contains("bad.grt")) << printed.toStdString();
+    printed.clear();
+    EXPECT_EQ(show("(ZVCarregaTemplate \"" + folder.path() + "/none.grt\")"), "nil");
+    EXPECT_TRUE(printed.contains("template not found")) << printed.toStdString();
+}
+
+TEST_F(PickersTest, UserDefunReplacesANativeFunction) {
+    EXPECT_EQ(show("(getprimeirapagina)"), "\"ESQ$0001$A\"");
+    run("(defun getprimeirapagina () \"MINHA$0001$A\")");
+    EXPECT_EQ(show("(getprimeirapagina)"), "\"MINHA$0001$A\"");
+    EXPECT_EQ(lisp.call("getprimeirapagina", {}).asString(), "MINHA$0001$A");
+}
+
+TEST_F(PickersTest, SheetGridCircuitsSolutionAndLanguage) {
+    EXPECT_EQ(show("(BuscarCoordenadas nil \"ESQ\" \"0001\" 10.0 290.0)"), "\"A1\"");
+    EXPECT_EQ(show("(BuscarCoordenadas nil \"ESQ\" \"0001\" 419.0 1.0)"), "\"H12\"");
+    EXPECT_EQ(show("(BuscarCoordenadas nil \"ESQ\" \"0001\" 500.0 10.0)"), "\"??\"");
+    EXPECT_EQ(show("(zvGetCircuitoLocalInfo 2)"), "(\"2\" \"LOCAL 2\" \"\")");
+    run("(setq *ZV_CIRCUITOS_LOCAIS* '((2 \"CL2\" \"Bombas\" \"PAINEL_1\")))");
+    EXPECT_EQ(show("(zvGetCircuitoLocalInfo 2)"), "(\"CL2\" \"Bombas\" \"PAINEL_1\")");
+    EXPECT_EQ(show("(zvsolution_isloaded)"), "nil");
+    run("(setq *ZV_SOLUCAO* '(\"/p/a/ProjA.dxf\" \"/p/b/ProjB.dxf\"))");
+    EXPECT_EQ(show("(list (zvsolution_isloaded) (zvsolution_getProjFile \"projb.dxf\") "
+                   "(zvsolution_getProjFile \"ProjA\") (zvsolution_getProjFile \"C\"))"),
+              "(T \"/p/b/ProjB.dxf\" \"/p/a/ProjA.dxf\" nil)");
+    run("(setq *_ZV_IDIOMA_ATUAL_* \"ES\")");
+    EXPECT_EQ(show("(zv_interno_get_idioma_corrente)"), "\"ES\"");
+    EXPECT_EQ(show("(list (zvAlternaStatusBloqueioPalette) (zvAlternaStatusBloqueioPalette))"),
+              "(T nil)");
+}
+
+}  // namespace
+}  // namespace zvproduct::testing
