@@ -1,6 +1,10 @@
 #include "CCDriverLista.h"
 
+#include "ExecutarLista.h"
 #include "cad/CICad.h"
+#include "lists/CCBorneGrfWriter.h"
+#include "lists/CETemplateLisp.h"
+#include "readers/CCBorneDataReader.h"
 
 namespace {
 
@@ -52,7 +56,14 @@ QString CCDriverLista::EscolherModelo(TipoLista tipo) {
 void CCDriverLista::Executar(TipoLista tipo) {
     const QString caminho = EscolherModelo(tipo);
     if (caminho.isEmpty()) return;
-    // The readers and writers of the lists join the drivers here as they are built.
+    if (tipo == TipoLista::Bornes) {
+        CCBorneDataReader leitor;
+        CCBorneGrfWriter escritor;
+        CETemplateLisp modelo(caminho);
+        ExecutarLista(leitor, escritor, modelo);
+        return;
+    }
+    // The readers and writers of the other lists join the drivers here as they are built.
     CICad::ImprimeMensagem(kMensagemIndisponivel);
 }
 

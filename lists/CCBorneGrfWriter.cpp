@@ -1,0 +1,236 @@
+#include "CCBorneGrfWriter.h"
+
+#include "CETemplate.h"
+#include "CETemplateLisp.h"
+#include "cad/CICad.h"
+#include "readers/VetorItens.h"
+#include "readers/ZVString.h"
+#include "settings/CIMensagens.h"
+
+namespace {
+
+const char* const kReguas[] = {"REGUA", "STRIP", "REGLETA"};
+const char* const kNumeros[] = {"NUMERO", "NUMBER", "NUMERO"};
+constexpr int kSemMarca = 4;
+
+QString Numero(const CEItemLista& item) {
+    for (const char* nome : kNumeros)
+        if (const QString v = item.valorCampo(nome); !v.isEmpty()) return v;
+    return {};
+}
+
+// The running grid of the layout, in single precision as the drawing keeps it.
+struct Grade {
+    float x0, y0, x, y, h;
+    double espaco;
+    int linhas, colunas, contagem = 0, coluna = 0;
+
+    void Coloca(CEPaginaLista& pagina, CEItemLista* item,
+                std::shared_ptr<CEItemLista> proprio = {}) {
+        pagina.linhas.push_back({item,
+                                 double(CICad::Simples(x)),
+                                 double(CICad::Simples(y)),
+                                 {},
+                                 {},
+                                 std::move(proprio)});
+        ++contagem;
+        y = float(CICad::Simples(y - h));
+    }
+    void Reinicia() {
+        contagem = coluna = 0;
+        x = x0;
+        y = y0;
+    }
+};
+
+void NovaPagina(std::vector<CEPaginaLista>& paginas, Grade& grade, const CEItemLista& item,
+                int indice) {
+    grade.Reinicia();
+    CEPaginaLista pagina;
+    pagina.atributos = paginas.back().atributos;
+    pagina.atributos.insert("PAGINA", QString::number(indice));
+    for (const char* campo : kReguas)
+        pagina.atributos.insert(campo, item.valorCampo(campo));
+    paginas.push_back(std::move(pagina));
+}
+
+// Blank rows to the end of the column, numbered on from the strip's last terminal.
+void Preenche(CEPaginaLista& pagina, Grade& grade, const CEItemLista& ultimo) {
+    int numero = CCListaPaginada::Inteiro(Numero(ultimo));
+    while (grade.contagem < grade.linhas) {
+        auto branco = std::make_shared<CEItemLista>();
+        for (const char* campo : kReguas)
+            branco->definirCampo(campo, ultimo.valorCampo(campo));
+        for (const char* campo : kNumeros)
+            branco->definirCampo(campo, QString::number(numero + 1));
+        branco->ids.push_back(OdDbObjectId());
+        ++numero;
+        grade.Coloca(pagina, branco.get(), branco);
+    }
+}
+
+}  // namespace
+
+QString CCBorneGrfWriter::Regua(const CEItemLista& item) {
+    for (const char* nome : kReguas)
+        if (const QString v = item.valorCampo(nome); !v.isEmpty()) return v;
+    return {};
+}
+
+std::vector<CEPaginaLista> CCBorneGrfWriter::Diagrama(VetorItens& itens, CETemplate& modelo) {
+    std::vector<CEPaginaLista> paginas;
+    VetorItens presentes;
+    for (CEItemLista* item : itens)
+        if (item) presentes.push_back(item);
+    if (presentes.empty()) return paginas;
+    Grade grade{
+        float(CICad::Simples(modelo.LerReal("*X_INIC_LISTA*"))),
+        float(CICad::Simples(modelo.LerReal("*Y_INIC_LISTA*"))),
+        0,
+        0,
+        float(CICad::Simples(CETemplateLisp::TextoParaReal(modelo.LerTexto("TAM_DETALHE")))),
+        modelo.LerReal("*ESPACO_HORIZONTAL*"),
+        modelo.LerInteiro("*LINHAS_POR_PAGINA*"),
+        modelo.LerLogico("*COLUNA_SN*") ? modelo.LerInteiro("*NUMERO_COLUNA*") : 1};
+    grade.Reinicia();
+    const QStringList chaves = modelo.LerListaTexto("*ZV_CHAVE_QUEBRA_PAGINA*");
+    const int n = int(presentes.size());
+    paginas.push_back({});
+    paginas.back().atributos = CCListaPaginada::CamposPrimeiraPagina(n);
+    for (const char* campo : kReguas)
+        paginas.back().atributos.insert(campo, Regua(*presentes[0]));
+    for (int i = 0; i < n; ++i) {
+        CEItemLista& item = *presentes[size_t(i)];
+        grade.Coloca(paginas.back(), &item);
+        const QString atual = Regua(item);
+        const QString seguinte = i + 1 < n ? Regua(*presentes[size_t(i + 1)]) : QString();
+        const bool preenche = modelo.LerLogico("*PREENCHE_ATE_FINAL*");
+        bool quebra = false;
+        if (!preenche && i + 1 < n) {
+            if (atual != seguinte) {
+                // The sense is as configured: true leaves blank rows, false breaks the page.
+                if (!modelo.LerLogico("*QUEBRA_PAGINA*")) {
+                    quebra = true;
+                } else {
+                    const int espaco = modelo.LerInteiro("*LINHAS_ESPACO*");
+                    grade.contagem += espaco;
+                    grade.y = float(CICad::Simples(grade.y - espaco * grade.h));
+                }
+            } else {
+                const CEItemLista& proximo = *presentes[size_t(i + 1)];
+                for (const QString& chave : chaves)
+                    if (proximo.valorCampo(chave) != item.valorCampo(chave)) {
+                        quebra = true;
+                        break;
+                    }
+            }
+        }
+        if (preenche && (i + 1 == n || atual != seguinte)) Preenche(paginas.back(), grade, item);
+        if (quebra) {
+            NovaPagina(paginas, grade, *presentes[size_t(i + 1)], i + 1);
+            continue;
+        }
+        if (grade.contagem >= grade.linhas) {
+            grade.contagem = 0;
+            ++grade.coluna;
+            grade.x = float(CICad::Simples(grade.x + grade.espaco));
+            grade.y = grade.y0;
+            if (grade.coluna >= grade.colunas && i + 1 < n)
+                NovaPagina(paginas, grade, *presentes[size_t(i + 1)], i + 1);
+        }
+    }
+    return paginas;
+}
+
+void CCBorneGrfWriter::MarcaJumpers(std::vector<CEPaginaLista>& paginas, int colunas) {
+    std::vector<CELinhaLista*> linhas;
+    for (CEPaginaLista& pagina : paginas)
+        for (CELinhaLista& linha : pagina.linhas) {
+            linha.marcas.assign(size_t(std::max(colunas, 0)), kSemMarca);
+            linhas.push_back(&linha);
+        }
+    auto coloca = [](CELinhaLista& linha, int coluna, int marca) {
+        if (coluna >= 0)
+            linha.marcas[size_t(coluna)] = marca;
+        else
+            linha.marcas_extra.push_back(marca);
+    };
+    for (CELinhaLista* cabeca : linhas) {
+        const CEItemLista* inicio = cabeca->item;
+        if (!inicio || !inicio->proximo || inicio->anterior) continue;
+        bool emCurso = false;
+        int coluna = -1;
+        const CEItemLista* atual = inicio;
+        for (CELinhaLista* linha : linhas) {
+            if (!atual) break;
+            if (!emCurso) {
+                if (linha->item != inicio) continue;
+                const auto livre = std::find(linha->marcas.begin(), linha->marcas.end(), kSemMarca);
+                coluna = livre == linha->marcas.end() ? -1 : int(livre - linha->marcas.begin());
+                coloca(*linha, coluna, 0);
+                emCurso = true;
+                atual = atual->proximo;
+            } else if (linha->item == atual) {
+                coloca(*linha, coluna, atual->proximo ? 1 : 3);
+                atual = atual->proximo;
+            } else {
+                coloca(*linha, coluna, 2);
+            }
+        }
+    }
+}
+
+void CCBorneGrfWriter::ImportaMarcas(CETemplate& modelo, const QString& grupo) {
+    static const char* const kSimbolos[] = {"*LISTA_JUMPER_INI*", "*LISTA_JUMPER_MEIO*",
+                                            "*LISTA_JUMPER_CONT*", "*LISTA_JUMPER_FIM*"};
+    marcas_.clear();
+    for (const char* simbolo : kSimbolos) {
+        const QString valor = modelo.LerTexto(simbolo);
+        const QStringList partes = ZVString(valor).Divide("\\");
+        marcas_.push_back({simbolo, (partes.isEmpty() ? QString() : partes.last()) + grupo,
+                           CCListaPaginada::CaminhoBloco(valor)});
+    }
+    for (const auto& marca : marcas_)
+        if (!CICad::ExisteArquivo(marca.arquivo))
+            throw ZVString(CIMensagens::Mensagem("ZVLISTAS", 150) + marca.arquivo);
+    for (const auto& marca : marcas_)
+        CICad::RecarregaBloco(marca.arquivo, marca.nome);
+}
+
+void CCBorneGrfWriter::InsereMarcas(const CELinhaLista& linha, const QString& layer) {
+    auto insere = [&](int marca, double x) {
+        if (marca < 0 || marca > 3) return;
+        const auto& bloco = marcas_[size_t(marca)];
+        CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, x, linha.y, 0, 0);
+    };
+    for (size_t k = 0; k < linha.marcas.size(); ++k)
+        insere(linha.marcas[k], linha.x + double(k) * distColunas_);
+    for (int marca : linha.marcas_extra)
+        insere(marca, linha.x + (numColunas_ - 1) * distColunas_);
+}
+
+void CCBorneGrfWriter::EscreverItens(VetorItens& itens, CETemplate& modelo) {
+    const QString grupo = modelo.LerTexto("FUNCAO_LSTGRT");
+    distColunas_ = modelo.LerReal("*DIST_COLUNAS_CFG*");
+    numColunas_ = modelo.LerInteiro("*NUM_COLUNAS_CFG*");
+    visualizarJumper_ = modelo.LerTexto("*VISUALIZAR_JUMPER_CFG*") == "1";
+    const bool variasColunas = modelo.LerLogico("*COLUNA_SN*");
+    const auto blocos = CCListaPaginada::ResolveBlocos(
+        modelo, {"LISTA_CABEC", "LISTA_DETALHE", "LISTA_RODAPE", "LISTA_TOTAL"},
+        {"BLK_CTR_LST_CABEC_BORN", "BLK_CTR_LST_DET_BORN", "BLK_CTR_LST_RODAPE_BORN",
+         "BLK_CTR_LST_TOTAL_BORN"},
+        grupo);
+    if (visualizarJumper_) ImportaMarcas(modelo, grupo);
+    std::vector<CEPaginaLista> paginas = Diagrama(itens, modelo);
+    MarcaJumpers(paginas, numColunas_);
+    CCListaPaginada::CriaPaginas(grupo, paginas);
+    for (const CEPaginaLista& pagina : paginas) {
+        CCListaPaginada::InsereCampos(blocos[0], pagina.nome, pagina.atributos, true);
+        for (const CELinhaLista& linha : pagina.linhas) {
+            if (!linha.item) continue;
+            CCListaPaginada::InsereDetalhe(blocos[1], pagina.nome, linha, variasColunas);
+            if (visualizarJumper_) InsereMarcas(linha, pagina.nome);
+        }
+        CCListaPaginada::InsereCampos(blocos[2], pagina.nome, pagina.atributos, false);
+    }
+}

@@ -1,0 +1,27 @@
+#pragma once
+// The terminal list as graphic pages: one row a terminal, strips one after the other, and
+// the jumper bars between terminals drawn in columns beside the rows.
+#include "CCListaPaginada.h"
+#include "module/CCDataWriter.h"
+
+#include <vector>
+
+class CCBorneGrfWriter : public CCDataWriter {
+public:
+    void EscreverItens(VetorItens& itens, CETemplate& modelo) override;
+
+    // The page layout of the items, without touching the drawing.
+    static std::vector<CEPaginaLista> Diagrama(VetorItens& itens, CETemplate& modelo);
+    // Jumper marks by column on the laid-out rows.
+    static void MarcaJumpers(std::vector<CEPaginaLista>& paginas, int colunas);
+    static QString Regua(const CEItemLista& item);
+
+private:
+    void ImportaMarcas(CETemplate& modelo, const QString& grupo);
+    void InsereMarcas(const CELinhaLista& linha, const QString& layer);
+
+    double distColunas_ = 0.0;
+    int numColunas_ = 0;
+    bool visualizarJumper_ = false;
+    std::vector<CCListaPaginada::Bloco> marcas_;
+};

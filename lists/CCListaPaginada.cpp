@@ -1,0 +1,142 @@
+#include "CCListaPaginada.h"
+
+#include "CETemplate.h"
+#include "cad/CICad.h"
+#include "host/sdk/SystemServices.h"
+#include "host/sdk/UserInterface.h"
+#include "readers/CEListaAtributos.h"
+#include "readers/ZVString.h"
+#include "settings/CIMensagens.h"
+
+#include <QDateTime>
+
+namespace {
+
+QString DoisDigitos(int valor) {
+    return QString::number(valor).rightJustified(2, '0');
+}
+
+bool Pergunta(int numero) {
+    zvsdk::SystemServices* servicos = zvsdk::systemServices();
+    if (!servicos || !servicos->userInterface()) return false;
+    return servicos->userInterface()->askYesNo("question:" + QString::number(numero),
+                                               CIMensagens::Mensagem("ZVLISTAS", numero), false);
+}
+
+bool GrupoExiste(const QString& grupo) {
+    zvsdk::ResultBuffer* grupos = CICad::zvInvokeLista("buscaListaGrupos");
+    bool existe = false;
+    for (const zvsdk::ResultBuffer* no = grupos; no && !existe; no = no->rbnext)
+        existe = no->restype == zvsdk::RTSTR && no->rstring == grupo;
+    CICad::LiberaLista(grupos);
+    return existe;
+}
+
+}  // namespace
+
+int CCListaPaginada::Inteiro(const QString& texto) {
+    const QString t = texto.trimmed();
+    int fim = (t.startsWith('-') || t.startsWith('+')) ? 1 : 0;
+    while (fim < t.size() && t[fim].unicode() >= '0' && t[fim].unicode() <= '9')
+        ++fim;
+    return t.left(fim).toInt();
+}
+
+QString CCListaPaginada::CaminhoBloco(const QString& valor) {
+    return CICad::GetStringLisp("*DIRETORIO_REDE*") + valor + ".dwg";
+}
+
+void CCListaPaginada::ImportaBloco(const Bloco& bloco) {
+    if (bloco.existe()) CICad::RecarregaBloco(bloco.arquivo, bloco.nome);
+}
+
+std::vector<CCListaPaginada::Bloco> CCListaPaginada::ResolveBlocos(CETemplate& modelo,
+                                                                   const QStringList& simbolos,
+                                                                   const QStringList& prefixos,
+                                                                   const QString& grupo) {
+    std::vector<Bloco> blocos;
+    for (int i = 0; i < simbolos.size(); ++i) {
+        const QString valor = modelo.LerTexto(simbolos[i]);
+        blocos.push_back({simbolos[i], prefixos.value(i) + grupo,
+                          valor.isEmpty() ? QString() : CaminhoBloco(valor)});
+    }
+    for (const Bloco& bloco : blocos)
+        if (bloco.existe() && !CICad::ExisteArquivo(bloco.arquivo))
+            throw ZVString(CIMensagens::Mensagem("ZVLISTAS", 150) + bloco.arquivo);
+    for (const Bloco& bloco : blocos)
+        ImportaBloco(bloco);
+    return blocos;
+}
+
+void CCListaPaginada::CriaPaginas(const QString& grupo, std::vector<CEPaginaLista>& paginas) {
+    if (GrupoExiste(grupo) && Pergunta(89)) CICad::zvInvokeVoid("apagargrupo", {grupo});
+    for (CEPaginaLista& pagina : paginas) {
+        zvsdk::ResultBuffer* chamada = zvsdk::newString("criarpagina");
+        chamada->rbnext = zvsdk::newString(grupo);
+        chamada->rbnext->rbnext = zvsdk::newShort(0);
+        CICad::LiberaLista(CICad::InvokeChain(chamada));
+        zvsdk::releaseChain(chamada);
+        // Whatever layer criarpagina left current is the page, even after a failure.
+        pagina.nome = CICad::GetLayerCorrente();
+    }
+    CICad::zvInvokeVoid("atualizarpaginas");
+}
+
+QHash<QString, QString> CCListaPaginada::CamposPrimeiraPagina(int quantidade) {
+    const QDateTime agora = QDateTime::currentDateTime();
+    const QDate dia = agora.date();
+    const QTime hora = agora.time();
+    return {{"DATA", DoisDigitos(dia.day()) + "/" + DoisDigitos(dia.month()) + "/" +
+                         DoisDigitos(dia.year() % 100)},
+            {"HORA", DoisDigitos(hora.hour()) + ":" + DoisDigitos(hora.minute()) + ":" +
+                         DoisDigitos(hora.second())},
+            {"QTD", QString::number(quantidade)},
+            {"PAGINA", "1"}};
+}
+
+void CCListaPaginada::InsereCampos(const Bloco& bloco, const QString& layer,
+                                   const QHash<QString, QString>& campos, bool maiusculas) {
+    if (!bloco.existe()) return;
+    const OdDbObjectId ref = CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, 0, 0, 0, 0);
+    std::unique_ptr<zv::CEListaAtributos> atributos;
+    CICad::GetAtributos(ref, atributos, false, false);
+    for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
+        zv::CEAtributo& atributo = (*atributos)[i];
+        const QString chave = maiusculas ? atributo.GetValor().toUpper() : atributo.GetValor();
+        atributo.SetValor(campos.value(chave));
+    }
+}
+
+QString CCListaPaginada::AvaliaFuncao(const QString& expressao) {
+    CICad::AvaliaLisp("(progn (setq INVOKELISP_LISTAS_TMP " + expressao + " ) (princ))");
+    zvsdk::ResultBuffer* valor = CICad::LeSimboloLisp("INVOKELISP_LISTAS_TMP");
+    const QString texto = valor && valor->restype == zvsdk::RTSTR ? valor->rstring : QString();
+    CICad::LiberaLista(valor);
+    return texto;
+}
+
+void CCListaPaginada::InsereDetalhe(const Bloco& bloco, const QString& layer,
+                                    const CELinhaLista& linha, bool variasColunas) {
+    if (!bloco.existe() || !linha.item) return;
+    const OdDbObjectId ref =
+        CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, linha.x, linha.y, 0, 0);
+    if (ref.isNull()) return;
+    std::unique_ptr<zv::CEListaAtributos> atributos;
+    CICad::GetAtributos(ref, atributos, false, false);
+    bool publicado = false;
+    for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
+        zv::CEAtributo& atributo = (*atributos)[i];
+        const QString tag = atributo.GetTag().toUpper();
+        if (tag.startsWith("VARIAVEL") || tag.startsWith("VARIABLE")) {
+            atributo.SetValor(linha.item->valorCampo(atributo.GetValor()));
+        } else if (tag.startsWith("FUNCAO") || tag.startsWith("FUNCTION")) {
+            if (!publicado) linha.item->paraLisp();
+            publicado = true;
+            atributo.SetValor(AvaliaFuncao(atributo.GetValor()));
+        }
+    }
+    if (publicado) CEItemLista::limparLisp();
+    if (!variasColunas && !linha.item->ids.empty() && !linha.item->ids.front().isNull())
+        CICad::SetXData(ref, "KVR_ZV_LINK",
+                        {{1000, ZVString::DeHandle(linha.item->ids.front().handle())}});
+}

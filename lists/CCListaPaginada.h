@@ -1,0 +1,47 @@
+#pragma once
+// What every graphic list writer does alike: resolve and import its blocks, create its
+// pages in the project, and fill header, footer and detail rows from page fields and items.
+#include "CEPaginaLista.h"
+
+#include <QStringList>
+
+#include <vector>
+
+class CETemplate;
+
+class CCListaPaginada {
+public:
+    // One block of a list: the template's symbol, its name in the drawing, its file.
+    struct Bloco {
+        QString simbolo;
+        QString nome;
+        QString arquivo;
+        bool existe() const { return !arquivo.isEmpty(); }
+    };
+
+    // Reads the symbols, checks the files in order (a missing one throws message 150 with
+    // its path) and imports each under prefix + page group. Empty symbols give no block.
+    static std::vector<Bloco> ResolveBlocos(CETemplate& modelo, const QStringList& simbolos,
+                                            const QStringList& prefixos, const QString& grupo);
+    // "\\DADOS\\X" and the like from the shared folder, as a ".dwg" path.
+    static QString CaminhoBloco(const QString& valor);
+    static void ImportaBloco(const Bloco& bloco);
+
+    // Message 89 when the group exists (Yes replaces it), then one page per record, named
+    // after the layer criarpagina leaves current, then atualizarpaginas.
+    static void CriaPaginas(const QString& grupo, std::vector<CEPaginaLista>& paginas);
+    // DATA, HORA, QTD and PAGINA of a first page.
+    static QHash<QString, QString> CamposPrimeiraPagina(int quantidade);
+
+    // Header (fields looked up in upper case) or footer (as they stand), at the origin.
+    static void InsereCampos(const Bloco& bloco, const QString& layer,
+                             const QHash<QString, QString>& campos, bool maiusculas);
+    // A detail row: VARIAVEL fields, FUNCAO expressions; the link back to the item's
+    // drawing object unless the page has several columns.
+    static void InsereDetalhe(const Bloco& bloco, const QString& layer, const CELinhaLista& linha,
+                              bool variasColunas);
+    // The value of a FUNCAO expression for the published item; empty unless a string.
+    static QString AvaliaFuncao(const QString& expressao);
+    // The leading-digits integer of a text, 0 when it has none.
+    static int Inteiro(const QString& texto);
+};
