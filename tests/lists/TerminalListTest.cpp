@@ -1,0 +1,139 @@
+// The terminal list from end to end through zvhost, on a generated project with the demo
+// catalogue and product data, read back from the saved drawing.
+#include "QtPrinters.h"
+#include "drawing/Attribute.h"
+#include "drawing/BlockRecord.h"
+#include "drawing/BlockReference.h"
+#include "drawing/Database.h"
+#include "drawing/DxfLoader.h"
+
+#include <gtest/gtest.h>
+
+#include <QDir>
+#include <QProcess>
+#include <QSet>
+#include <QTemporaryDir>
+
+namespace {
+
+struct Resultado {
+    int status = -1;
+    QString out, err;
+};
+
+class TerminalListTest : public ::testing::Test {
+protected:
+    static void SetUpTestSuite() {
+        pasta_ = new QTemporaryDir;
+        ASSERT_TRUE(pasta_->isValid());
+        const QString dados = pasta_->filePath("dados");
+        const QString produto = pasta_->filePath("produto") + "/";
+        QDir().mkpath(dados);
+        QDir().mkpath(produto);
+        const QString catalogo = QString(ZV_SOURCE_DIR) + "/data/catalogue/";
+        ASSERT_EQ(zvhost({"catalogue", "--build", dados + "/catalogo.db",
+                          catalogo + "catalogo-esquema.sql", catalogo + "catalogo-dados.sql"})
+                      .status,
+                  0);
+        ASSERT_EQ(zvhost({"catalogue", "--set", "Database=SQLITE", "NetworkZV=" + dados + "/",
+                          "DBName=catalogo.db", "libLang=1"})
+                      .status,
+                  0);
+        for (const char* sub : {"templates", "config"}) {
+            QDir().mkpath(produto + sub);
+            for (const QString& f :
+                 QDir(QString(ZV_SOURCE_DIR) + "/data/" + sub).entryList(QDir::Files))
+                QFile::copy(QString(ZV_SOURCE_DIR) + "/data/" + sub + "/" + f,
+                            produto + sub + "/" + f);
+        }
+        const Resultado gerado = zvhost({"generate", "--out", pasta_->filePath("p.dxf"), "--seed",
+                                         "3", "--terminals", "60", "--data", produto});
+        ASSERT_EQ(gerado.status, 0) << gerado.err.toStdString();
+    }
+    static void TearDownTestSuite() { delete pasta_; }
+
+    static Resultado zvhost(const QStringList& args) {
+        QProcess processo;
+        QProcessEnvironment env = QProcessEnvironment::systemEnvironment();
+        env.insert("ZV_DATA_DIR", pasta_->filePath("dados"));
+        env.insert("ZV_PRODUCT_DIR", pasta_->filePath("produto") + "/");
+        processo.setProcessEnvironment(env);
+        processo.setWorkingDirectory(pasta_->path());
+        processo.start(QString(ZV_BIN_DIR) + "/zvhost", args);
+        processo.closeWriteChannel();
+        EXPECT_TRUE(processo.waitForFinished(300000));
+        return {processo.exitCode(), QString::fromUtf8(processo.readAllStandardOutput()),
+                QString::fromUtf8(processo.readAllStandardError())};
+    }
+    static Resultado lista(const QString& entrada, const QString& saida, QStringList extra = {}) {
+        QStringList args = {"--quiet", "--load", pasta_->filePath("produto/config/zvconfig.lsp")};
+        args << extra << entrada << "-o" << saida << "gerarListaBornesGrf";
+        return zvhost(args);
+    }
+    // The detail rows of the terminal list: page layer and the printed fields in order.
+    static QStringList linhas(const QString& arquivo, QStringList* paginas = nullptr) {
+        const auto db = zvdb::DxfLoader::loadFile(arquivo.toStdString());
+        QStringList texto;
+        QSet<QString> vistas;
+        for (zvdb::Entity* e : db->modelSpace()->entities()) {
+            auto* ref = dynamic_cast<zvdb::BlockReference*>(e);
+            if (!ref || !ref->blockName().starts_with("BLK_CTR_LST_DET_BORN")) continue;
+            const QString layer = QString::fromStdString(std::string(ref->layer()));
+            if (paginas && !vistas.contains(layer)) *paginas << layer;
+            vistas.insert(layer);
+            QStringList campos;
+            for (zvdb::Attribute* a : ref->attributes())
+                campos << QString::fromStdString(std::string(a->textValue()));
+            texto << layer + " " + campos.join("|");
+        }
+        return texto;
+    }
+
+    static QTemporaryDir* pasta_;
+};
+
+QTemporaryDir* TerminalListTest::pasta_ = nullptr;
+
+TEST_F(TerminalListTest, EveryListedTerminalGetsARowOnPagesOfTheTemplateGroup) {
+    const Resultado r = lista(pasta_->filePath("p.dxf"), pasta_->filePath("l1.dxf"));
+    ASSERT_EQ(r.status, 0) << r.err.toStdString();
+    EXPECT_TRUE(r.out.contains("List created.")) << r.out.toStdString();
+    QStringList paginas;
+    const QStringList rows = linhas(pasta_->filePath("l1.dxf"), &paginas);
+    ASSERT_FALSE(rows.isEmpty());
+    EXPECT_GE(rows.size(), 60);
+    for (int i = 0; i < paginas.size(); ++i)
+        EXPECT_EQ(paginas[i], QString("LISTAS$%1$A").arg(i + 1, 4, 10, QChar('0')));
+    // Rows print the wires on the sides of the terminals they read.
+    const int comFio = int(std::count_if(rows.begin(), rows.end(), [](const QString& linha) {
+        const QStringList campos = linha.split('|');
+        return !campos.value(2).isEmpty() || !campos.value(3).isEmpty();
+    }));
+    EXPECT_GT(comFio, rows.size() / 2);
+}
+
+TEST_F(TerminalListTest, ARunAgainAppendsOnNoAndReplacesOnYes) {
+    ASSERT_EQ(lista(pasta_->filePath("p.dxf"), pasta_->filePath("l1.dxf")).status, 0);
+    QStringList uma, nao, sim;
+    const int linhasUma = int(linhas(pasta_->filePath("l1.dxf"), &uma).size());
+    Resultado r = lista(pasta_->filePath("l1.dxf"), pasta_->filePath("l2.dxf"),
+                        {"--answer", "question:89=no"});
+    ASSERT_EQ(r.status, 0) << r.err.toStdString();
+    EXPECT_EQ(int(linhas(pasta_->filePath("l2.dxf"), &nao).size()), 2 * linhasUma);
+    EXPECT_EQ(nao.size(), 2 * uma.size());
+    r = lista(pasta_->filePath("l1.dxf"), pasta_->filePath("l3.dxf"),
+              {"--answer", "question:89=yes"});
+    ASSERT_EQ(r.status, 0);
+    EXPECT_EQ(int(linhas(pasta_->filePath("l3.dxf"), &sim).size()), linhasUma);
+}
+
+TEST_F(TerminalListTest, AMissingBlockFileStopsWithMessage150) {
+    const Resultado r = lista(pasta_->filePath("p.dxf"), pasta_->filePath("l4.dxf"),
+                              {"--eval", "(setq *DIRETORIO_REDE* \"/nao/existe/\")"});
+    EXPECT_EQ(r.status, 0);
+    EXPECT_TRUE(r.err.contains("/nao/existe/")) << r.err.toStdString();
+    EXPECT_FALSE(r.out.contains("List created."));
+    EXPECT_TRUE(linhas(pasta_->filePath("l4.dxf")).isEmpty());
+}
+
+}  // namespace
