@@ -76,25 +76,40 @@ ConnectionFinder::ConnectionFinder(zvdb::Database& database, double tolerance)
       tolerance_(tolerance > 0 ? tolerance : 0.1),
       cell_(std::max({tolerance_, kLeadTolerance, 1.0})) {
     indexSymbols();
+    buildGrid();
 }
 
 int ConnectionFinder::layerId(const std::string& layer) {
     return layers_.emplace(layer, static_cast<int>(layers_.size())).first->second;
 }
 
-std::uint64_t ConnectionFinder::cellKey(int layer, long long x, long long y) const {
-    const auto ux = static_cast<std::uint64_t>(x) & 0x3FFFFF;
-    const auto uy = static_cast<std::uint64_t>(y) & 0x3FFFFF;
-    return (static_cast<std::uint64_t>(layer) << 44) | (ux << 22) | uy;
+std::uint64_t ConnectionFinder::cellKey(long long x, long long y) const {
+    return (static_cast<std::uint64_t>(x) << 32) ^ (static_cast<std::uint64_t>(y) & 0xFFFFFFFF);
 }
 
 void ConnectionFinder::addSpot(std::uint32_t symbol, int layer, const zvdb::Point3& p,
                                std::string connection) {
-    const auto index = static_cast<std::uint32_t>(spots_.size());
-    spots_.push_back({symbol, layer, p, std::move(connection)});
     const auto cx = static_cast<long long>(std::floor(p.x / cell_));
     const auto cy = static_cast<long long>(std::floor(p.y / cell_));
-    grid_[cellKey(layer, cx, cy)].push_back(index);
+    spots_.push_back({symbol, layer, cellKey(cx, cy), p, std::move(connection)});
+}
+
+// One sort puts each page's spots together, cell by cell: a page's wires then look at a
+// small table of their own.
+void ConnectionFinder::buildGrid() {
+    std::stable_sort(spots_.begin(), spots_.end(), [](const Spot& a, const Spot& b) {
+        return a.layer != b.layer ? a.layer < b.layer : a.cell < b.cell;
+    });
+    grid_.assign(layers_.size(), {});
+    for (std::uint32_t i = 0; i < spots_.size();) {
+        std::uint32_t end = i + 1;
+        while (end < spots_.size() && spots_[end].layer == spots_[i].layer &&
+               spots_[end].cell == spots_[i].cell)
+            ++end;
+        grid_[static_cast<std::size_t>(spots_[i].layer)].emplace(spots_[i].cell,
+                                                                 std::make_pair(i, end));
+        i = end;
+    }
 }
 
 // Every project symbol (KVR_ZV or KVR_ZV_EQUIPO) gives its connection attributes' text
@@ -136,16 +151,16 @@ std::vector<const ConnectionFinder::Spot*> ConnectionFinder::spotsNear(int layer
                                                                        const zvdb::Point3& p,
                                                                        double radius) const {
     std::vector<const Spot*> near;
+    if (layer < 0 || static_cast<std::size_t>(layer) >= grid_.size()) return near;
+    const CellRuns& cells = grid_[static_cast<std::size_t>(layer)];
     const auto cx = static_cast<long long>(std::floor(p.x / cell_));
     const auto cy = static_cast<long long>(std::floor(p.y / cell_));
     for (long long dx = -1; dx <= 1; ++dx)
         for (long long dy = -1; dy <= 1; ++dy) {
-            auto cell = grid_.find(cellKey(layer, cx + dx, cy + dy));
-            if (cell == grid_.end()) continue;
-            for (std::uint32_t index : cell->second) {
-                const Spot& spot = spots_[index];
-                if (spot.layer == layer && distance(spot.point, p) <= radius) near.push_back(&spot);
-            }
+            auto cell = cells.find(cellKey(cx + dx, cy + dy));
+            if (cell == cells.end()) continue;
+            for (std::uint32_t i = cell->second.first; i < cell->second.second; ++i)
+                if (distance(spots_[i].point, p) <= radius) near.push_back(&spots_[i]);
         }
     return near;
 }

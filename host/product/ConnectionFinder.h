@@ -56,12 +56,16 @@ private:
     struct Spot {
         std::uint32_t symbol;
         int layer;
+        std::uint64_t cell;
         zvdb::Point3 point;
         std::string connection;
     };
+    // Spots sorted by layer and cell; per layer, a cell's run in that order.
+    using CellRuns = std::unordered_map<std::uint64_t, std::pair<std::uint32_t, std::uint32_t>>;
     void indexSymbols();
     void addSpot(std::uint32_t symbol, int layer, const zvdb::Point3& p, std::string connection);
-    std::uint64_t cellKey(int layer, long long x, long long y) const;
+    std::uint64_t cellKey(long long x, long long y) const;
+    void buildGrid();
     std::vector<const Spot*> spotsNear(int layer, const zvdb::Point3& p, double radius) const;
     void touchesAt(int layer, const zvdb::Point3& p, double radius, std::vector<Touch>& out) const;
     int layerId(const std::string& layer);
@@ -73,7 +77,7 @@ private:
     std::unordered_map<std::string, int> layers_;
     std::vector<Symbol> symbols_;
     std::vector<Spot> spots_;
-    std::unordered_map<std::uint64_t, std::vector<std::uint32_t>> grid_;
+    std::vector<CellRuns> grid_;  // by layer id
 };
 
 }  // namespace zvproduct
