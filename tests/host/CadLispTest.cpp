@@ -128,6 +128,9 @@ TEST_F(CadLispTest, DictionariesAndCommands) {
     lisp("(command \"_.zoom\" \"_W\" \"0,0\" \"2,3\")");
     EXPECT_EQ(documento_->view().maxY, 3.0);
     EXPECT_EQ(lisp("(vl-cmdf \"_.zoom\" \"_E\")"), "T");
+    lisp("(command \"_-PRINT\" \"pagina\")");
+    EXPECT_TRUE(saida_.contains("-PRINT: not available in this edition yet"));
+    EXPECT_EQ(lisp("(vl-catch-all-error-p (vl-catch-all-apply 'command '(\"_.NAOEXISTE\")))"), "T");
     // The reference at (10, 20) with its attribute shows; the line of the frozen page not.
     EXPECT_GE(documento_->view().maxX, 11.0);
     EXPECT_LT(documento_->view().maxX, 100.0);
