@@ -63,9 +63,22 @@ QString gridPosition(double x, double y) {
     return QString("%1%2").arg(QChar('A' + row)).arg(column + 1);
 }
 
-// From *ZV_CIRCUITOS_LOCAIS*, ((N "name" "description" "panel") ...); otherwise the number,
-// "LOCAL N" and an empty text.
-Value localCircuit(Interpreter& lisp, int number) {
+// The first panel named on the project settings point (KVR_ZV_PAINEL); empty.
+QString firstPanel(zvdb::Database* database) {
+    if (!database) return {};
+    for (zvdb::Entity* entity : database->modelSpace()->entities()) {
+        if (entity->layer() != "ZV_FREEZE" || !entity->isType("POINT")) continue;
+        const auto items = entity->xdata("KVR_ZV_PAINEL");
+        if (!items.empty())
+            return QString::fromUtf8(items.front().value.data(),
+                                     static_cast<int>(items.front().value.size()));
+    }
+    return {};
+}
+
+// From *ZV_CIRCUITOS_LOCAIS*, ((N "circuit" "panel" "third") ...); otherwise the number, the
+// project's first panel and an empty text.
+Value localCircuit(Interpreter& lisp, zvdb::Database* database, int number) {
     for (Value rest = lisp.global("*ZV_CIRCUITOS_LOCAIS*"); rest.isCons();
          rest = zvlisp::cdr(rest)) {
         const Value entry = zvlisp::car(rest);
@@ -79,8 +92,7 @@ Value localCircuit(Interpreter& lisp, int number) {
             return lispTexts(texts);
         }
     }
-    return lispTexts(
-        QStringList{QString::number(number), QString("LOCAL %1").arg(number), QString()});
+    return lispTexts(QStringList{QString::number(number), firstPanel(database), QString()});
 }
 
 QStringList solutionFiles(Interpreter& lisp) {
@@ -163,7 +175,11 @@ void installServiceFunctions(Interpreter& lisp, const ProductContext& context) {
         5, 5);
     lisp.define(
         "zvGetCircuitoLocalInfo",
-        [](Interpreter& in, Args a) { return localCircuit(in, in.toInt(a[0])); }, 1, 1);
+        [context](Interpreter& in, Args a) {
+            return localCircuit(in, context.database ? context.database() : nullptr,
+                                in.toInt(a[0]));
+        },
+        1, 1);
     lisp.define(
         "zvsolution_isloaded",
         [](Interpreter& in, Args) { return in.boolean(!solutionFiles(in).isEmpty()); }, 0, 0);

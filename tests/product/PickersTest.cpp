@@ -72,7 +72,11 @@ TEST_F(PickersTest, SheetGridCircuitsSolutionAndLanguage) {
     EXPECT_EQ(show("(BuscarCoordenadas nil \"ESQ\" \"0001\" 10.0 290.0)"), "\"A1\"");
     EXPECT_EQ(show("(BuscarCoordenadas nil \"ESQ\" \"0001\" 419.0 1.0)"), "\"H12\"");
     EXPECT_EQ(show("(BuscarCoordenadas nil \"ESQ\" \"0001\" 500.0 10.0)"), "\"??\"");
-    EXPECT_EQ(show("(zvGetCircuitoLocalInfo 2)"), "(\"2\" \"LOCAL 2\" \"\")");
+    EXPECT_EQ(show("(zvGetCircuitoLocalInfo 2)"), "(\"2\" \"\" \"\")");
+    auto* settings = database->modelSpace()->addPoint({0, 0, 0}, "ZV_FREEZE");
+    settings->setXData("KVR_ZV_PAINEL",
+                       zvsample::XDataItems().text("PAINEL_1").text("PAINEL_2").tags());
+    EXPECT_EQ(show("(zvGetCircuitoLocalInfo 3)"), "(\"3\" \"PAINEL_1\" \"\")");
     run("(setq *ZV_CIRCUITOS_LOCAIS* '((2 \"CL2\" \"Bombas\" \"PAINEL_1\")))");
     EXPECT_EQ(show("(zvGetCircuitoLocalInfo 2)"), "(\"CL2\" \"Bombas\" \"PAINEL_1\")");
     EXPECT_EQ(show("(zvsolution_isloaded)"), "nil");
