@@ -283,15 +283,4 @@ std::string ConnectionFinder::cableNumber(const zvdb::Polyline& lead) const {
     return {};
 }
 
-std::vector<std::uint64_t> ConnectionFinder::polylinesOn(const std::string& layer) const {
-    std::vector<std::uint64_t> handles;
-    for (zvdb::Entity* entity : database_.modelSpace()->entities()) {
-        if (entity->layer() != layer || !dynamic_cast<zvdb::Polyline*>(entity)) continue;
-        if (entity->hasXData("KVR_ZV_WIRE") || entity->hasXData("KVR_ZV_CABO"))
-            handles.push_back(entity->handle());
-    }
-    std::sort(handles.begin(), handles.end());
-    return handles;
-}
-
 }  // namespace zvproduct

@@ -40,9 +40,6 @@ public:
     // connections, leads in page order (tolerance 0.3).
     std::vector<WireConnections> cables();
 
-    // Wire and cable polylines of one layer, handle order.
-    std::vector<std::uint64_t> polylinesOn(const std::string& layer) const;
-
     // The wire number of a KVR_ZV_WIRE polyline (FIO, WIRE, ALAMBRE or CABO item); empty.
     static std::string wireNumber(const zvdb::Polyline& polyline);
     // "NAME\fKEY" of a lead: its cable's CABO field and its own key; empty.

@@ -4,6 +4,7 @@
 #include "LispHelpers.h"
 #include "PageRegistry.h"
 #include "ProductLisp.h"
+#include "WireLayerIndex.h"
 
 #include "drawing/Database.h"
 #include "drawing/Polyline.h"
@@ -11,6 +12,7 @@
 
 #include <QStringList>
 
+#include <memory>
 #include <unordered_set>
 
 namespace zvproduct {
@@ -108,11 +110,10 @@ void installConnectionFunctions(Interpreter& lisp, const ProductContext& context
         0, 0);
     lisp.define(
         "getFiosPorLayer",
-        [context](Interpreter& in, Args a) {
+        [context, index = std::make_shared<WireLayerIndex>()](Interpreter& in, Args a) {
             zvdb::Database& database = databaseOf(in, context);
             std::vector<std::string> handles;
-            for (std::uint64_t handle :
-                 ConnectionFinder(database, tolerance(in)).polylinesOn(stdText(in, a[0])))
+            for (std::uint64_t handle : index->polylinesOn(database, stdText(in, a[0])))
                 handles.push_back(handleText(handle));
             return lispTexts(handles);
         },

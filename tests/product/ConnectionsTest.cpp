@@ -101,6 +101,11 @@ TEST_F(ConnectionsTest, WireListsByPage) {
     EXPECT_EQ(show("(length (getListaFios \"ESQ$0001$A\" \"0\"))"), "1");
     EXPECT_EQ(show("(getFiosPorLayer \"ESQ$0002$A\")"),
               "(\"" + hex(oneOnTwo) + "\" \"" + hex(two) + "\")");
+    // the answers follow the drawing: a wire drawn and a wire erased since
+    auto* three = wire("ESQ$0002$A", {{300, 190, 0}, {300, 150, 0}}, "203");
+    oneOnTwo->erase();
+    EXPECT_EQ(show("(getFiosPorLayer \"ESQ$0002$A\")"),
+              "(\"" + hex(two) + "\" \"" + hex(three) + "\")");
 }
 
 TEST_F(ConnectionsTest, ProjectCheckFindsDuplicateTerminalsAndOpenWires) {
