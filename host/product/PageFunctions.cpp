@@ -64,18 +64,14 @@ zvdb::BlockRecord* productBlock(Interpreter& lisp, zvdb::Database& database,
     }
 }
 
-bool layerHasEntities(zvdb::Database& database, const std::string& layer) {
-    for (zvdb::Entity* entity : database.modelSpace()->entities())
-        if (entity->layer() == layer) return true;
-    return false;
-}
-
-// The group's companion layers; its sheet frame when the product data has one.
+// The group's companion layers; its sheet frame, when the product data has one, goes on a
+// frame layer made now (a group that has the layer keeps what it holds).
 void addCompanions(Interpreter& lisp, zvdb::Database& database, const std::string& group) {
+    const std::string frameLayer = group + "$FORMATO";
+    const bool newFrameLayer = !database.layer(frameLayer);
     for (const char* suffix : kCompanions)
         ensureLayer(database, group + suffix);
-    const std::string frameLayer = group + "$FORMATO";
-    if (layerHasEntities(database, frameLayer)) return;
+    if (!newFrameLayer) return;
     if (zvdb::BlockRecord* frame = productBlock(lisp, database, "FORMATO_A3"))
         database.modelSpace()->addBlockReference(*frame, {}, {1, 1, 1}, 0, frameLayer);
 }
