@@ -1,8 +1,8 @@
 #pragma once
 // A small project drawing built with the drawing API, a LISP environment with the product's
 // functions on it, and a scripted user interface.
-#include "host/sample/XDataItems.h"
 #include "product/ProductLisp.h"
+#include "sample/XDataItems.h"
 
 #include "drawing/Attribute.h"
 #include "drawing/BlockRecord.h"
