@@ -88,10 +88,10 @@ std::uint64_t ConnectionFinder::cellKey(long long x, long long y) const {
 }
 
 void ConnectionFinder::addSpot(std::uint32_t symbol, int layer, const zvdb::Point3& p,
-                               std::string connection) {
+                               std::string_view connection) {
     const auto cx = static_cast<long long>(std::floor(p.x / cell_));
     const auto cy = static_cast<long long>(std::floor(p.y / cell_));
-    spots_.push_back({symbol, layer, cellKey(cx, cy), p, std::move(connection)});
+    spots_.push_back({symbol, layer, cellKey(cx, cy), p, connection});
 }
 
 // One sort puts each page's spots together, cell by cell: a page's wires then look at a
@@ -123,10 +123,10 @@ void ConnectionFinder::indexSymbols() {
         const auto symbol = static_cast<std::uint32_t>(symbols_.size());
         symbols_.push_back({reference->handle(), std::string(reference->blockName())});
         const int layer = layerId(std::string(reference->layer()));
-        std::vector<std::pair<zvdb::Point3, std::string>> named;
+        std::vector<std::pair<zvdb::Point3, std::string_view>> named;
         for (zvdb::Attribute* attribute : reference->attributes())
             if (isConnectionTag(attribute->tag()))
-                named.emplace_back(attribute->position(), std::string(attribute->text(1)));
+                named.emplace_back(attribute->position(), attribute->text(1));
         std::vector<zvdb::Point3> ends = {reference->position()};
         const auto cut = reference->xdata("KVR_ZV_PTS_CORTE");
         std::vector<zvdb::Point3> points;
@@ -179,7 +179,7 @@ void ConnectionFinder::touchesAt(int layer, const zvdb::Point3& p, double radius
         if (std::find(seen.begin(), seen.end(), spot->symbol) != seen.end()) continue;
         seen.push_back(spot->symbol);
         const Symbol& symbol = symbols_[spot->symbol];
-        Touch touch{symbol.handle, spot->connection, symbol.block, spot->point};
+        Touch touch{symbol.handle, std::string(spot->connection), symbol.block, spot->point};
         // two vertices on one point of a symbol are one touch
         if (!out.empty() && out.back().symbol == touch.symbol &&
             out.back().connection == touch.connection && out.back().point == touch.point)

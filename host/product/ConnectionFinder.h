@@ -7,6 +7,7 @@
 
 #include <cstdint>
 #include <string>
+#include <string_view>
 #include <unordered_map>
 #include <vector>
 
@@ -55,12 +56,13 @@ private:
         int layer;
         std::uint64_t cell;
         zvdb::Point3 point;
-        std::string connection;
+        std::string_view connection;  // in the drawing's storage: the spots sort cheaply
     };
     // Spots sorted by layer and cell; per layer, a cell's run in that order.
     using CellRuns = std::unordered_map<std::uint64_t, std::pair<std::uint32_t, std::uint32_t>>;
     void indexSymbols();
-    void addSpot(std::uint32_t symbol, int layer, const zvdb::Point3& p, std::string connection);
+    void addSpot(std::uint32_t symbol, int layer, const zvdb::Point3& p,
+                 std::string_view connection);
     std::uint64_t cellKey(long long x, long long y) const;
     void buildGrid();
     std::vector<const Spot*> spotsNear(int layer, const zvdb::Point3& p, double radius) const;
