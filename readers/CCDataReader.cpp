@@ -347,15 +347,23 @@ QString CCDataReader::Posicao(const OdDbObjectId& entidade) const {
 
 void CCDataReader::LeCircuitoLocal(const QString& sufixo, CEItemLista& item,
                                    const OdDbObjectId& entidade) {
-    QString circuito, painel, terceiro;
+    Circuito circuito;
     int numero = 1;
-    if (CICad::GetCircuitoLocal(entidade, numero) &&
-        !CICad::GetCircuitoLocalInfo(numero, circuito, painel, terceiro))
-        circuito.clear(), painel.clear();
+    if (CICad::GetCircuitoLocal(entidade, numero)) {
+        auto it = circuitos_.constFind(numero);
+        if (it == circuitos_.constEnd()) {
+            Circuito novo;
+            QString terceiro;
+            novo.ok = CICad::GetCircuitoLocalInfo(numero, novo.circuito, novo.painel, terceiro);
+            if (!novo.ok) novo.circuito.clear(), novo.painel.clear();
+            it = circuitos_.insert(numero, novo);
+        }
+        circuito = it.value();
+    }
     // PAINEL and LOCAL hold the same value: templates use either name.
-    item.definirCampo("PAINEL" + sufixo, painel);
-    item.definirCampo("LOCAL" + sufixo, painel);
-    item.definirCampo("CIRCUITO" + sufixo, circuito);
+    item.definirCampo("PAINEL" + sufixo, circuito.painel);
+    item.definirCampo("LOCAL" + sufixo, circuito.painel);
+    item.definirCampo("CIRCUITO" + sufixo, circuito.circuito);
 }
 
 void CCDataReader::LeLayout(const QString& sufixo, CEItemLista& item,

@@ -102,6 +102,12 @@ private:
     // The key text's two parts; false when no key application is there.
     bool ChaveENorma(const OdDbObjectId& entidade, QString& chave, QString& norma) const;
 
+    // Local circuits by number: the LISP side is asked once per circuit and run.
+    struct Circuito {
+        bool ok = false;
+        QString circuito, painel;
+    };
+    QHash<int, Circuito> circuitos_;
     QHash<QString, Conexoes> conexoes_;
     QHash<QString, QStringList> fiosPorLayer_;
     CECacheCatalogo catalogo_;
