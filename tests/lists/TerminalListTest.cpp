@@ -136,4 +136,28 @@ TEST_F(TerminalListTest, AMissingBlockFileStopsWithMessage150) {
     EXPECT_TRUE(linhas(pasta_->filePath("l4.dxf")).isEmpty());
 }
 
+TEST_F(TerminalListTest, StripPickerAnsweredKeepsItsStripsAndCancelledListsNothing) {
+    // A template that asks for the strips, on top of the demo's terminal template.
+    QFile modelo(pasta_->filePath("produto/templates/escolhe.grt"));
+    ASSERT_TRUE(modelo.open(QIODevice::WriteOnly));
+    modelo.write(
+        "(load (strcat *DIR_ZVCFG_TEMPL* \"bornes.grt\"))\n"
+        "(setq *SEL_REGUA_BORNE_CFG* T *FILTRO_TEMPLATE* \"\")\n");
+    modelo.close();
+    const QStringList escolhe = {"--eval", "(setq *DEF_LISTA_BORNES* \"escolhe.grt\")"};
+    Resultado r = lista(pasta_->filePath("p.dxf"), pasta_->filePath("l5.dxf"), escolhe);
+    ASSERT_EQ(r.status, 0) << r.err.toStdString();
+    EXPECT_TRUE(r.out.contains("No terminals were found for the list.")) << r.out.toStdString();
+    EXPECT_TRUE(linhas(pasta_->filePath("l5.dxf")).isEmpty());
+
+    ASSERT_EQ(lista(pasta_->filePath("p.dxf"), pasta_->filePath("l7.dxf")).status, 0);
+    const QStringList rows = linhas(pasta_->filePath("l7.dxf"));
+    r = lista(pasta_->filePath("p.dxf"), pasta_->filePath("l6.dxf"),
+              escolhe + QStringList{"--answer", "strips=X1"});
+    ASSERT_EQ(r.status, 0) << r.err.toStdString();
+    const QStringList x1 = linhas(pasta_->filePath("l6.dxf"));
+    EXPECT_FALSE(x1.isEmpty());
+    EXPECT_LT(x1.size(), rows.size());
+}
+
 }  // namespace
