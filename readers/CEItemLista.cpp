@@ -29,22 +29,31 @@ void CEItemLista::copiarCamposComSufixo(const CEItemLista& origem, const QString
 }
 
 void CEItemLista::paraLisp() const {
-    zvsdk::ResultBuffer* cabeca = zvsdk::newNode(zvsdk::RTLB);
-    zvsdk::ResultBuffer* cauda = cabeca;
+    // The chain lives in one block: a list run publishes an item per row.
+    std::vector<zvsdk::ResultBuffer> nos(size_t(campos.size()) * 5 + 2);
+    size_t i = 0;
+    auto no = [&nos, &i](short tipo, const QString* texto = nullptr) {
+        zvsdk::ResultBuffer& n = nos[i];
+        n.restype = tipo;
+        if (texto) n.rstring = *texto;
+        if (i > 0) nos[i - 1].rbnext = &n;
+        ++i;
+    };
+    no(zvsdk::RTLB);
     for (auto it = campos.constBegin(); it != campos.constEnd(); ++it) {
-        cauda = cauda->rbnext = zvsdk::newNode(zvsdk::RTLB);
-        cauda = cauda->rbnext = zvsdk::newString(it.key());
-        cauda = cauda->rbnext = zvsdk::newNode(zvsdk::RTDOTE);
-        cauda = cauda->rbnext = zvsdk::newString(it.value());
-        cauda = cauda->rbnext = zvsdk::newNode(zvsdk::RTLE);
+        no(zvsdk::RTLB);
+        no(zvsdk::RTSTR, &it.key());
+        no(zvsdk::RTDOTE);
+        no(zvsdk::RTSTR, &it.value());
+        no(zvsdk::RTLE);
     }
-    cauda->rbnext = zvsdk::newNode(zvsdk::RTLE);
-    CICad::SetChainLisp("reg", cabeca);
-    zvsdk::releaseChain(cabeca);
+    no(zvsdk::RTLE);
+    CICad::SetChainLisp("reg", nos.data());
     if (ids.empty()) return;
-    zvsdk::ResultBuffer* ename = zvsdk::newEntity(ids.front().entityName());
-    CICad::SetChainLisp("ename", ename);
-    zvsdk::releaseChain(ename);
+    zvsdk::ResultBuffer ename;
+    ename.restype = zvsdk::RTENAME;
+    ename.rlname = ids.front().entityName();
+    CICad::SetChainLisp("ename", &ename);
 }
 
 void CEItemLista::limparLisp() {
