@@ -69,10 +69,6 @@ ResultBuffer* Chamada(const QString& funcao, const QStringList& args) {
     return cabeca;
 }
 
-QString DoisDigitos(int valor) {
-    return QString::number(valor).rightJustified(2, '0');
-}
-
 }  // namespace
 
 void CICad::Imprime(const QString& texto) {
@@ -94,12 +90,8 @@ void CICad::Log(const QString& linha) {
     QFile arquivo(ArquivoLog());
     if (!arquivo.open(QIODevice::Append | QIODevice::Text)) return;
     const QDateTime agora = QDateTime::currentDateTime();
-    const QDate dia = agora.date();
-    const QTime hora = agora.time();
-    const QString texto = DoisDigitos(dia.day()) + "/" + DoisDigitos(dia.month()) + "/" +
-                          DoisDigitos(dia.year() % 100) + " " + DoisDigitos(hora.hour()) + ":" +
-                          DoisDigitos(hora.minute()) + ":" + DoisDigitos(hora.second()) + " - PID" +
-                          QString::number(getpid()) + " - " + linha + "\n";
+    const QString texto = ZVString::Data(agora.date()) + " " + ZVString::Hora(agora.time()) +
+                          " - PID" + QString::number(getpid()) + " - " + linha + "\n";
     arquivo.write(texto.toUtf8());
     arquivo.flush();
 }

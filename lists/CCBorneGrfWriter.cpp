@@ -3,21 +3,16 @@
 #include "CETemplate.h"
 #include "CETemplateLisp.h"
 #include "cad/CICad.h"
+#include "readers/CCBorneDataReader.h"
 #include "readers/VetorItens.h"
 #include "readers/ZVString.h"
 #include "settings/CIMensagens.h"
 
 namespace {
 
-const char* const kReguas[] = {"REGUA", "STRIP", "REGLETA"};
-const char* const kNumeros[] = {"NUMERO", "NUMBER", "NUMERO"};
+constexpr auto& kReguas = CCBorneDataReader::kCamposRegua;
+constexpr auto& kNumeros = CCBorneDataReader::kCamposNumero;
 constexpr int kSemMarca = 4;
-
-QString Numero(const CEItemLista& item) {
-    for (const char* nome : kNumeros)
-        if (const QString v = item.valorCampo(nome); !v.isEmpty()) return v;
-    return {};
-}
 
 // The running grid of the layout, in single precision as the drawing keeps it.
 struct Grade {
@@ -56,7 +51,7 @@ void NovaPagina(std::vector<CEPaginaLista>& paginas, Grade& grade, const CEItemL
 
 // Blank rows to the end of the column, numbered on from the strip's last terminal.
 void Preenche(CEPaginaLista& pagina, Grade& grade, const CEItemLista& ultimo) {
-    int numero = CCListaPaginada::Inteiro(Numero(ultimo));
+    int numero = ZVString(CCBorneDataReader::Numero(ultimo)).ParaInteiro();
     while (grade.contagem < grade.linhas) {
         auto branco = std::make_shared<CEItemLista>();
         for (const char* campo : kReguas)
@@ -70,12 +65,6 @@ void Preenche(CEPaginaLista& pagina, Grade& grade, const CEItemLista& ultimo) {
 }
 
 }  // namespace
-
-QString CCBorneGrfWriter::Regua(const CEItemLista& item) {
-    for (const char* nome : kReguas)
-        if (const QString v = item.valorCampo(nome); !v.isEmpty()) return v;
-    return {};
-}
 
 std::vector<CEPaginaLista> CCBorneGrfWriter::Diagrama(VetorItens& itens, CETemplate& modelo) {
     std::vector<CEPaginaLista> paginas;
@@ -98,12 +87,13 @@ std::vector<CEPaginaLista> CCBorneGrfWriter::Diagrama(VetorItens& itens, CETempl
     paginas.push_back({});
     paginas.back().atributos = CCListaPaginada::CamposPrimeiraPagina(n);
     for (const char* campo : kReguas)
-        paginas.back().atributos.insert(campo, Regua(*presentes[0]));
+        paginas.back().atributos.insert(campo, CCBorneDataReader::Regua(*presentes[0]));
     for (int i = 0; i < n; ++i) {
         CEItemLista& item = *presentes[size_t(i)];
         grade.Coloca(paginas.back(), &item);
-        const QString atual = Regua(item);
-        const QString seguinte = i + 1 < n ? Regua(*presentes[size_t(i + 1)]) : QString();
+        const QString atual = CCBorneDataReader::Regua(item);
+        const QString seguinte =
+            i + 1 < n ? CCBorneDataReader::Regua(*presentes[size_t(i + 1)]) : QString();
         const bool preenche = modelo.LerLogico("*PREENCHE_ATE_FINAL*");
         bool quebra = false;
         if (!preenche && i + 1 < n) {
@@ -155,13 +145,15 @@ void CCBorneGrfWriter::MarcaJumpers(std::vector<CEPaginaLista>& paginas, int col
         else
             linha.marcas_extra.push_back(marca);
     };
-    for (CELinhaLista* cabeca : linhas) {
-        const CEItemLista* inicio = cabeca->item;
+    for (size_t h = 0; h < linhas.size(); ++h) {
+        const CEItemLista* inicio = linhas[h]->item;
         if (!inicio || !inicio->proximo || inicio->anterior) continue;
         bool emCurso = false;
         int coluna = -1;
         const CEItemLista* atual = inicio;
-        for (CELinhaLista* linha : linhas) {
+        // Rows before the head cannot start its bar: the walk begins at the head's row.
+        for (size_t r = h; r < linhas.size(); ++r) {
+            CELinhaLista* linha = linhas[r];
             if (!atual) break;
             if (!emCurso) {
                 if (linha->item != inicio) continue;

@@ -14,7 +14,6 @@ public:
     static std::vector<CEPaginaLista> Diagrama(VetorItens& itens, CETemplate& modelo);
     // Jumper marks by column on the laid-out rows.
     static void MarcaJumpers(std::vector<CEPaginaLista>& paginas, int colunas);
-    static QString Regua(const CEItemLista& item);
 
 private:
     void ImportaMarcas(CETemplate& modelo, const QString& grupo);

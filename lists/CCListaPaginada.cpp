@@ -12,10 +12,6 @@
 
 namespace {
 
-QString DoisDigitos(int valor) {
-    return QString::number(valor).rightJustified(2, '0');
-}
-
 bool Pergunta(int numero) {
     zvsdk::SystemServices* servicos = zvsdk::systemServices();
     if (!servicos || !servicos->userInterface()) return false;
@@ -33,14 +29,6 @@ bool GrupoExiste(const QString& grupo) {
 }
 
 }  // namespace
-
-int CCListaPaginada::Inteiro(const QString& texto) {
-    const QString t = texto.trimmed();
-    int fim = (t.startsWith('-') || t.startsWith('+')) ? 1 : 0;
-    while (fim < t.size() && t[fim].unicode() >= '0' && t[fim].unicode() <= '9')
-        ++fim;
-    return t.left(fim).toInt();
-}
 
 QString CCListaPaginada::CaminhoBloco(const QString& valor) {
     return CICad::GetStringLisp("*DIRETORIO_REDE*") + valor + ".dwg";
@@ -84,12 +72,8 @@ void CCListaPaginada::CriaPaginas(const QString& grupo, std::vector<CEPaginaList
 
 QHash<QString, QString> CCListaPaginada::CamposPrimeiraPagina(int quantidade) {
     const QDateTime agora = QDateTime::currentDateTime();
-    const QDate dia = agora.date();
-    const QTime hora = agora.time();
-    return {{"DATA", DoisDigitos(dia.day()) + "/" + DoisDigitos(dia.month()) + "/" +
-                         DoisDigitos(dia.year() % 100)},
-            {"HORA", DoisDigitos(hora.hour()) + ":" + DoisDigitos(hora.minute()) + ":" +
-                         DoisDigitos(hora.second())},
+    return {{"DATA", ZVString::Data(agora.date())},
+            {"HORA", ZVString::Hora(agora.time())},
             {"QTD", QString::number(quantidade)},
             {"PAGINA", "1"}};
 }

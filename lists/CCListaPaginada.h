@@ -42,6 +42,4 @@ public:
                               bool variasColunas);
     // The value of a FUNCAO expression for the published item; empty unless a string.
     static QString AvaliaFuncao(const QString& expressao);
-    // The leading-digits integer of a text, 0 when it has none.
-    static int Inteiro(const QString& texto);
 };

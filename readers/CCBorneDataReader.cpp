@@ -8,17 +8,8 @@
 
 namespace {
 
-const char* const kReguas[] = {"REGUA", "STRIP", "REGLETA"};
-const char* const kNumeros[] = {"NUMERO", "NUMBER", "NUMERO"};
-
-// The leading decimal number of a text, 0 when there is none.
-int Inteiro(const QString& texto) {
-    const QString t = texto.trimmed();
-    int fim = (t.startsWith('-') || t.startsWith('+')) ? 1 : 0;
-    while (fim < t.size() && t[fim].unicode() >= '0' && t[fim].unicode() <= '9')
-        ++fim;
-    return t.left(fim).toInt();
-}
+constexpr auto& kReguas = CCBorneDataReader::kCamposRegua;
+constexpr auto& kNumeros = CCBorneDataReader::kCamposNumero;
 
 QString Primeiro(const CEItemLista& item, const char* const (&nomes)[3],
                  const QString& sufixo = QString()) {
@@ -223,10 +214,16 @@ VetorItens CCBorneDataReader::SelecionaReguas(const VetorItens& itens) {
     VetorItens resultado;
     if (lista && lista->restype != zvsdk::RTNIL) {
         CICad::Log("selecaoBornes3");
+        // The items of each strip per language, in vector order: what filtering the vector by
+        // that strip field gives, without a pass over all items for every strip picked.
+        QHash<QString, VetorItens> porRegua[3];
+        for (CEItemLista* item : itens)
+            for (int i = 0; item && i < 3; ++i)
+                porRegua[i][item->valorCampo(kReguas[i])].push_back(item);
         for (const zvsdk::ResultBuffer* no = lista; no; no = no->rbnext) {
             if (no->restype != zvsdk::RTSTR) continue;
-            for (const char* campo : kReguas)
-                resultado.juntarSemRepetir(itens.filtrar({{campo, no->rstring}}));
+            for (const auto& idioma : porRegua)
+                resultado.juntarSemRepetir(idioma.value(no->rstring));
         }
         CICad::Log("selecaoBornes4");
     }
@@ -242,7 +239,7 @@ void CCBorneDataReader::IniciaSequencial(VetorItens& itens) {
         const QString regua = item ? Regua(*item) : QString();
         if (item && regua != anterior) {
             // A strip that starts at 5 gets blank rows 1 to 4 in front.
-            for (int k = 1; k < Inteiro(Numero(*item)); ++k)
+            for (int k = 1; k < ZVString(Numero(*item)).ParaInteiro(); ++k)
                 resultado.push_back(ItemEmBranco(regua, k));
             anterior = regua;
         }
@@ -260,8 +257,8 @@ void CCBorneDataReader::PreencheFaltantes(VetorItens& itens) {
         if (i + 1 == itens.size() || !itens[i] || !itens[i + 1]) continue;
         const QString regua = Regua(*itens[i]);
         if (regua != Regua(*itens[i + 1])) continue;
-        const int a = Inteiro(Numero(*itens[i]));
-        const int b = Inteiro(Numero(*itens[i + 1]));
+        const int a = ZVString(Numero(*itens[i])).ParaInteiro();
+        const int b = ZVString(Numero(*itens[i + 1])).ParaInteiro();
         for (int k = a + 1; k < b; ++k)
             resultado.push_back(ItemEmBranco(regua, k));
     }

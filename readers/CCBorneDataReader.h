@@ -18,6 +18,9 @@ public:
     static void IniciaSequencial(VetorItens& itens);
     static void PreencheFaltantes(VetorItens& itens);
     static void LigaJumpers(VetorItens& itens);
+    // The strip and number fields of the three languages, in the order they are tried.
+    static constexpr const char* kCamposRegua[3] = {"REGUA", "STRIP", "REGLETA"};
+    static constexpr const char* kCamposNumero[3] = {"NUMERO", "NUMBER", "NUMERO"};
     // The strip and number of a terminal: the first non-empty language.
     static QString Regua(const CEItemLista& item);
     static QString Numero(const CEItemLista& item);

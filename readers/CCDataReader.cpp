@@ -156,16 +156,26 @@ OdDbObjectId CCDataReader::FioNoPonto(const QString& layer, const CEPonto& ponto
     return {};
 }
 
-QString CCDataReader::NumeroDoFio(const OdDbObjectId& entidade) const {
+namespace {
+
+// The number in a wire's own field of KVR_ZV_WIRE, from its third item on.
+std::optional<QString> NumeroNoCampoFio(const OdDbObjectId& entidade) {
     const CEListaXData fio = CICad::GetXData(entidade, "KVR_ZV_WIRE");
     for (size_t i = 2; fio.size() >= 3 && i < fio.size(); ++i) {
         QString nome, valor;
-        if (!ZVString(fio[i].texto).DivideEmDois(kSeparador, nome, valor)) continue;
+        if (!ZVString(fio[i].texto).DivideEmDois(CCDataReader::kSeparador, nome, valor)) continue;
         const QString maiusculo = nome.toUpper();
         if (maiusculo == "CABO" || maiusculo == "FIO" || maiusculo == "WIRE" ||
             maiusculo == "ALAMBRE")
             return valor;
     }
+    return std::nullopt;
+}
+
+}  // namespace
+
+QString CCDataReader::NumeroDoFio(const OdDbObjectId& entidade) const {
+    if (std::optional<QString> numero = NumeroNoCampoFio(entidade)) return *numero;
     const CEListaXData cabo = CICad::GetXData(entidade, "KVR_ZV_CABO");
     if (cabo.size() < 2 || !EhTexto(cabo[0]) || !EhTexto(cabo[1])) return {};
     QString esquerda, direita;
@@ -184,14 +194,7 @@ QString CCDataReader::NumeroDoFio(const OdDbObjectId& entidade) const {
 }
 
 bool CCDataReader::EhFioNumerado(const OdDbObjectId& entidade) const {
-    const CEListaXData fio = CICad::GetXData(entidade, "KVR_ZV_WIRE");
-    for (size_t i = 2; fio.size() >= 3 && i < fio.size(); ++i) {
-        QString nome, valor;
-        if (ZVString(fio[i].texto).DivideEmDois(kSeparador, nome, valor) &&
-            QStringList({"CABO", "FIO", "WIRE", "ALAMBRE"}).contains(nome.toUpper()))
-            return true;
-    }
-    return false;
+    return NumeroNoCampoFio(entidade).has_value();
 }
 
 QString CCDataReader::VizinhoNaConexao(const OdDbObjectId& entidade, const CEPonto& ponto,

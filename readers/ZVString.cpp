@@ -54,6 +54,30 @@ std::uint64_t ZVString::ParaHandle() const {
     return ok ? handle : 0;
 }
 
+int ZVString::ParaInteiro() const {
+    const QString t = trimmed();
+    int fim = (t.startsWith('-') || t.startsWith('+')) ? 1 : 0;
+    while (fim < t.size() && t[fim].unicode() >= '0' && t[fim].unicode() <= '9')
+        ++fim;
+    return t.left(fim).toInt();
+}
+
+namespace {
+QString DoisDigitos(int valor) {
+    return QString::number(valor).rightJustified(2, '0');
+}
+}  // namespace
+
+QString ZVString::Data(const QDate& dia) {
+    return QString(DoisDigitos(dia.day()) + "/" + DoisDigitos(dia.month()) + "/" +
+                   DoisDigitos(dia.year() % 100));
+}
+
+QString ZVString::Hora(const QTime& hora) {
+    return QString(DoisDigitos(hora.hour()) + ":" + DoisDigitos(hora.minute()) + ":" +
+                   DoisDigitos(hora.second()));
+}
+
 QString ZVString::FormaNatural(const QString& texto) {
     constexpr int kLargura = 10;
     QString natural;

@@ -1,6 +1,7 @@
 #pragma once
 // The system's text: UTF-16 code units with value semantics, and the helpers the lists use.
 // Comparisons are by code unit and case-sensitive.
+#include <QDate>
 #include <QString>
 #include <QStringList>
 
@@ -35,6 +36,12 @@ public:
     static ZVString DeHandle(std::uint64_t handle);
     // The handle in a hexadecimal text; 0 when the text is not one.
     std::uint64_t ParaHandle() const;
+
+    // The leading decimal number, as atoi reads it; 0 when the text starts with none.
+    int ParaInteiro() const;
+    // "dd/mm/yy" and "hh:mm:ss", each field two digits, the year modulo 100.
+    static QString Data(const QDate& dia);
+    static QString Hora(const QTime& hora);
 
     // The natural form: every run of fewer than ten digits is padded with zeros in front
     // to ten digits, so "2" sorts before "10"; longer runs stay as they are.

@@ -1,5 +1,7 @@
 #include "CIRegistro.h"
 
+#include "readers/ZVString.h"
+
 #include <QDir>
 #include <QDomDocument>
 #include <QFile>
@@ -123,12 +125,7 @@ void CIRegistro::SetDBPass(const QString& senha) {
 
 int CIRegistro::IdiomaMenuSel() {
     // Like _wtoi: the leading decimal number, 0 when there is none.
-    const QString texto = LerRegistro("IdiomaMenuSel").trimmed();
-    int fim = 0;
-    if (fim < texto.size() && (texto[fim] == '-' || texto[fim] == '+')) ++fim;
-    while (fim < texto.size() && texto[fim] >= '0' && texto[fim] <= '9')
-        ++fim;
-    return texto.left(fim).toInt();
+    return ZVString(LerRegistro("IdiomaMenuSel")).ParaInteiro();
 }
 
 void CIRegistro::SetIdiomaMenuSel(int idioma) {

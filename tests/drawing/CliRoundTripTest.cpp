@@ -9,24 +9,16 @@
 #include <QFileInfo>
 #include <QProcess>
 
+#include "ZvhostRun.h"
+
 using zvtest::PythonChecker;
 
 namespace {
 
-struct HostRun {
-    int status = -1;
-    QString out, err;
-};
+using zvtest::HostRun;
 
 HostRun zvhost(const QStringList& arguments) {
-    QProcess process;
-    process.start(QStringLiteral(ZV_BIN_DIR "/zvhost"), arguments);
-    HostRun run;
-    if (!process.waitForFinished(120000)) return run;
-    run.status = process.exitCode();
-    run.out = QString::fromUtf8(process.readAllStandardOutput());
-    run.err = QString::fromUtf8(process.readAllStandardError());
-    return run;
+    return zvtest::runZvhost(arguments);
 }
 
 QByteArray contents(const QString& path) {

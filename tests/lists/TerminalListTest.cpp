@@ -1,6 +1,7 @@
 // The terminal list from end to end through zvhost, on a generated project with the demo
 // catalogue and product data, read back from the saved drawing.
 #include "QtPrinters.h"
+#include "ZvhostRun.h"
 #include "drawing/Attribute.h"
 #include "drawing/BlockRecord.h"
 #include "drawing/BlockReference.h"
@@ -16,10 +17,7 @@
 
 namespace {
 
-struct Resultado {
-    int status = -1;
-    QString out, err;
-};
+using Resultado = zvtest::HostRun;
 
 class TerminalListTest : public ::testing::Test {
 protected:
@@ -53,17 +51,10 @@ protected:
     static void TearDownTestSuite() { delete pasta_; }
 
     static Resultado zvhost(const QStringList& args) {
-        QProcess processo;
         QProcessEnvironment env = QProcessEnvironment::systemEnvironment();
         env.insert("ZV_DATA_DIR", pasta_->filePath("dados"));
         env.insert("ZV_PRODUCT_DIR", pasta_->filePath("produto") + "/");
-        processo.setProcessEnvironment(env);
-        processo.setWorkingDirectory(pasta_->path());
-        processo.start(QString(ZV_BIN_DIR) + "/zvhost", args);
-        processo.closeWriteChannel();
-        EXPECT_TRUE(processo.waitForFinished(300000));
-        return {processo.exitCode(), QString::fromUtf8(processo.readAllStandardOutput()),
-                QString::fromUtf8(processo.readAllStandardError())};
+        return zvtest::runZvhost(args, env, pasta_->path());
     }
     static Resultado lista(const QString& entrada, const QString& saida, QStringList extra = {}) {
         QStringList args = {"--quiet", "--load", pasta_->filePath("produto/config/zvconfig.lsp")};

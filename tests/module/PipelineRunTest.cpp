@@ -1,6 +1,7 @@
 // The list pipeline run through zvhost with the test plug-in, and the drivers' template
 // choice on the real module.
 #include "QtPrinters.h"
+#include "ZvhostRun.h"
 
 #include <gtest/gtest.h>
 
@@ -9,27 +10,16 @@
 
 namespace {
 
-struct Resultado {
-    int status = -1;
-    QString out;
-    QString err;
-};
+using Resultado = zvtest::HostRun;
 
 class PipelineRunTest : public ::testing::Test {
 protected:
     void SetUp() override { ASSERT_TRUE(dados_.isValid()); }
 
     Resultado zvhost(const QStringList& args) {
-        QProcess processo;
         QProcessEnvironment env = QProcessEnvironment::systemEnvironment();
         env.insert("ZV_DATA_DIR", dados_.path());
-        processo.setProcessEnvironment(env);
-        processo.setWorkingDirectory(dados_.path());
-        processo.start(QString(ZV_BIN_DIR) + "/zvhost", args);
-        processo.closeWriteChannel();
-        EXPECT_TRUE(processo.waitForFinished(60000));
-        return {processo.exitCode(), QString::fromUtf8(processo.readAllStandardOutput()),
-                QString::fromUtf8(processo.readAllStandardError())};
+        return zvtest::runZvhost(args, env, dados_.path(), 60000);
     }
     Resultado plugin(const QString& comando) {
         return zvhost({"--module", ZV_TEST_PLUGIN, "--progress-log", "p.dxf", comando});

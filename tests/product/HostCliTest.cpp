@@ -1,26 +1,18 @@
 // The product functions in zvhost's documents: scripted answers, cancels, a saved new page.
 #include <QFileInfo>
 #include <QProcess>
+
 #include <QTemporaryDir>
+#include "ZvhostRun.h"
 
 #include <gtest/gtest.h>
 
 namespace {
 
-struct HostRun {
-    int status = -1;
-    QString out, err;
-};
+using zvtest::HostRun;
 
 HostRun zvhost(const QStringList& arguments) {
-    QProcess process;
-    process.start(QStringLiteral(ZV_BIN_DIR "/zvhost"), arguments);
-    HostRun run;
-    if (!process.waitForFinished(120000)) return run;
-    run.status = process.exitCode();
-    run.out = QString::fromUtf8(process.readAllStandardOutput());
-    run.err = QString::fromUtf8(process.readAllStandardError());
-    return run;
+    return zvtest::runZvhost(arguments);
 }
 
 class ProductInHost : public ::testing::Test {
