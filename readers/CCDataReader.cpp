@@ -2,6 +2,7 @@
 
 #include "CEAtributo.h"
 #include "CEListaAtributos.h"
+#include "cad/CELayoutRotasFios.h"
 #include "lists/CETemplate.h"
 #include "settings/CIMensagens.h"
 
@@ -523,4 +524,65 @@ CEItemLista* CCDataReader::CriaItemChave(const QString& relacao, const QString& 
     item->definirCampo("TP_DESCRI", descricao);
     LeColunasUsuario(QString(), *item, catalogo_.ColunasComp(chave));
     return item;
+}
+
+void CCDataReader::LeRotasFio(const QString& chave, CETemplate* modelo) {
+    if (caminhos_.contains(chave)) return;
+    if (!rotasLidas_) {
+        rotasLidas_ = true;
+        for (const auto& [id, campos] :
+             ZVData::CESerializable::CarregarClasse("CELayoutRotasFios")) {
+            CELayoutRotasFios rota;
+            if (rota.Carregar(campos)) rotas_.push_back({rota.strKeyFio, rota.strRotaData});
+        }
+    }
+    for (const Rota& rota : rotas_) {
+        if (rota.chave != chave) continue;
+        const QStringList segmentos = rota.dados.split('$', Qt::SkipEmptyParts);
+        if (segmentos.isEmpty()) continue;
+        QHash<QString, QString> mapa;
+        for (const QString& segmento : segmentos) {
+            const QStringList partes = segmento.split('-');
+            if (partes.size() < 3) continue;
+            const QStringList ini = partes[0].split(':'), fim = partes[1].split(':');
+            const QString chaveRota =
+                RotuloElemento(ini[0], ini.size() == 2 ? ini[1] : QString(), modelo) + "-" +
+                RotuloElemento(fim[0], fim.size() == 2 ? fim[1] : QString(), modelo);
+            mapa.insert(chaveRota, partes.mid(2).join('-'));
+        }
+        caminhos_.insert(chave, mapa);
+        return;
+    }
+}
+
+const QHash<QString, QString>* CCDataReader::Caminhos(const QString& chave) const {
+    auto it = caminhos_.constFind(chave);
+    return it == caminhos_.constEnd() ? nullptr : &it.value();
+}
+
+void CCDataReader::Separadores(CETemplate* modelo, QString& primeiro, QString& segundo) {
+    primeiro =
+        modelo ? modelo->LerTexto("*CHAR_SEP_STD_CFG*") : CICad::GetStringLisp("*EXPORT_CHAR_SEP*");
+    segundo = modelo ? modelo->LerTexto("*CHAR_SEP_LIG_CFG*")
+                     : CICad::GetStringLisp("*EXPORT_CHAR_SEP_LIG*");
+    if (primeiro.isEmpty()) primeiro = ":";
+}
+
+QString CCDataReader::RotuloElemento(const QString& handle, const QString& conexao,
+                                     CETemplate* modelo) {
+    const OdDbObjectId elemento = CICad::IdDoHandle(handle);
+    auto texto = [&elemento](CampoTraduzido campo) {
+        std::unique_ptr<zv::CEAtributo> atributo;
+        if (elemento.isNull() || CICad::GetAtributoTraduzido(campo, elemento, atributo) != 0 ||
+            !atributo)
+            return QString();
+        return atributo->GetValor();
+    };
+    QString primeiro, segundo;
+    Separadores(modelo, primeiro, segundo);
+    const QString relacao = texto(CampoTraduzido::Relacao);
+    const QString regua = texto(CampoTraduzido::Regua), numero = texto(CampoTraduzido::Numero);
+    if (!regua.isEmpty() && !numero.isEmpty()) return regua + primeiro + numero + segundo + conexao;
+    if (relacao.isEmpty()) return QString();
+    return conexao.isEmpty() ? relacao : relacao + primeiro + conexao;
 }

@@ -78,6 +78,19 @@ public:
     CEItemLista* CriaItemEntidade(const OdDbObjectId& entidade, CETemplate& modelo);
     CEItemLista* CriaItemChave(const QString& relacao, const QString& chave, const QString& norma);
 
+    // ---- routes of the manual wire layout
+    // Reads the routes of a wire once: from the first stored route record of the key that
+    // has segments, a map from "first end-second end" to the route text. A key without a
+    // record stores nothing and is looked up again next time.
+    void LeRotasFio(const QString& chave, CETemplate* modelo);
+    // The routes read for the key; null when there are none.
+    const QHash<QString, QString>* Caminhos(const QString& chave) const;
+    // An element's end as the lists show it: strip and number, or relation, with the
+    // connection; empty when the element has neither.
+    QString RotuloElemento(const QString& handle, const QString& conexao, CETemplate* modelo);
+    // The two relation separators: of the template, or of the export settings without one.
+    static void Separadores(CETemplate* modelo, QString& primeiro, QString& segundo);
+
     // The position text of the project's grid, or "??".
     QString Posicao(const OdDbObjectId& entidade) const;
     // LAYER, GRUPO and PAGINA under the suffix.
@@ -110,6 +123,13 @@ private:
     QHash<int, Circuito> circuitos_;
     QHash<QString, Conexoes> conexoes_;
     QHash<QString, QStringList> fiosPorLayer_;
+    // Route records in store order, read on the first lookup; routes by wire key.
+    struct Rota {
+        QString chave, dados;
+    };
+    std::vector<Rota> rotas_;
+    bool rotasLidas_ = false;
+    QHash<QString, QHash<QString, QString>> caminhos_;
     CECacheCatalogo catalogo_;
     double tolerancia_;
 };
