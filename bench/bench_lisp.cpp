@@ -88,7 +88,8 @@ BENCHMARK(BM_RecursiveFunction)->Unit(benchmark::kMillisecond);
 }  // namespace
 
 namespace {
-// Publication alone: the module's chain of 152 nodes and its conversion to `reg`.
+// Publication alone: the item's fields handed to the host as string pairs, `reg` built
+// from them.
 void BM_PublishOnly(benchmark::State& state) {
     Host host;
     const CEItemLista item = item30();
@@ -98,7 +99,8 @@ void BM_PublishOnly(benchmark::State& state) {
         benchmark::Counter(double(state.iterations()), benchmark::Counter::kIsRate);
 }
 BENCHMARK(BM_PublishOnly)->Iterations(100000)->Unit(benchmark::kMicrosecond);
-// The host's share of publication: a chain built once, converted to `reg` each time.
+// A chain built once and converted to `reg` each time: what publication costs on a host
+// that takes chains only.
 void BM_PutSymbolOnly(benchmark::State& state) {
     Host host;
     zvsdk::ResultBuffer* chain = zvsdk::newNode(zvsdk::RTLB);

@@ -185,6 +185,11 @@ void CICad::SetChainLisp(const QString& nome, const ResultBuffer* chain) {
     GravaSimbolo(nome, chain);
 }
 
+void CICad::SetParesLisp(const QString& nome, const std::vector<zvsdk::StringPair>& pares) {
+    if (zvsdk::LispInterface* lisp = LispDe(nullptr))
+        lisp->lispPutStringPairs(nome, pares.data(), int(pares.size()));
+}
+
 ResultBuffer* CICad::InvokeChain(const ResultBuffer* chamada) {
     zvsdk::LispInterface* lisp = LispDe(nullptr);
     return lisp ? lisp->lispInvoke(chamada) : nullptr;

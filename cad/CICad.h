@@ -232,6 +232,8 @@ public:
     static void SetListaLisp(const QString& nome, const QStringList& lista);
     // Sets a symbol to a chain the caller built; the caller keeps the chain.
     static void SetChainLisp(const QString& nome, const zvsdk::ResultBuffer* chain);
+    // Sets a symbol to an association list of dotted string pairs, in the pairs' order.
+    static void SetParesLisp(const QString& nome, const std::vector<zvsdk::StringPair>& pares);
 
     // ---- calling LISP functions with text arguments (at most nine)
     static void zvInvokeVoid(const QString& funcao, const QStringList& args = {});

@@ -29,26 +29,12 @@ void CEItemLista::copiarCamposComSufixo(const CEItemLista& origem, const QString
 }
 
 void CEItemLista::paraLisp() const {
-    // The chain lives in one block: a list run publishes an item per row.
-    std::vector<zvsdk::ResultBuffer> nos(size_t(campos.size()) * 5 + 2);
-    size_t i = 0;
-    auto no = [&nos, &i](short tipo, const QString* texto = nullptr) {
-        zvsdk::ResultBuffer& n = nos[i];
-        n.restype = tipo;
-        if (texto) n.rstring = *texto;
-        if (i > 0) nos[i - 1].rbnext = &n;
-        ++i;
-    };
-    no(zvsdk::RTLB);
-    for (auto it = campos.constBegin(); it != campos.constEnd(); ++it) {
-        no(zvsdk::RTLB);
-        no(zvsdk::RTSTR, &it.key());
-        no(zvsdk::RTDOTE);
-        no(zvsdk::RTSTR, &it.value());
-        no(zvsdk::RTLE);
-    }
-    no(zvsdk::RTLE);
-    CICad::SetChainLisp("reg", nos.data());
+    // The texts are not copied: the host builds `reg` straight from them.
+    std::vector<zvsdk::StringPair> pares;
+    pares.reserve(size_t(campos.size()));
+    for (auto it = campos.constBegin(); it != campos.constEnd(); ++it)
+        pares.push_back({&it.key(), &it.value()});
+    CICad::SetParesLisp("reg", pares);
     if (ids.empty()) return;
     zvsdk::ResultBuffer ename;
     ename.restype = zvsdk::RTENAME;

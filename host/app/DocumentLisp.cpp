@@ -31,6 +31,19 @@ int DocumentLisp::lispPutSymbol(const QString& name, const zvsdk::ResultBuffer* 
     return zvsdk::RTNORM;
 }
 
+int DocumentLisp::lispPutStringPairs(const QString& name, const zvsdk::StringPair* pairs,
+                                     int count) {
+    if (name.isEmpty()) return zvsdk::RTERROR;
+    zvlisp::Value list;
+    for (int i = count - 1; i >= 0; --i) {
+        zvlisp::Value pair = zvlisp::Value::cons(zvlisp::Value::string(*pairs[i].key),
+                                                 zvlisp::Value::string(*pairs[i].value));
+        list = zvlisp::Value::cons(std::move(pair), std::move(list));
+    }
+    lisp_.setGlobal(name, std::move(list));
+    return zvsdk::RTNORM;
+}
+
 zvsdk::ResultBuffer* DocumentLisp::lispInvoke(const zvsdk::ResultBuffer* call) {
     if (!call || call->restype != zvsdk::RTSTR) return nullptr;
     // A function nobody defined answers nothing, quietly: the module asks for optional

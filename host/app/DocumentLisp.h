@@ -22,6 +22,8 @@ public:
     // with one 5019 node.
     int lispGetSymbol(const QString& name, zvsdk::ResultBuffer** value) override;
     int lispPutSymbol(const QString& name, const zvsdk::ResultBuffer* value) override;
+    // Builds the list straight from the texts, without a chain in between.
+    int lispPutStringPairs(const QString& name, const zvsdk::StringPair* pairs, int count) override;
     // Errors are printed on the command line and answered with null.
     zvsdk::ResultBuffer* lispInvoke(const zvsdk::ResultBuffer* call) override;
     // The same text is read once: a list run evaluates one expression per item.

@@ -17,6 +17,10 @@ public:
     // Evaluates LISP text in the document; a failure is printed on the command line.
     virtual bool lispEvaluate(const QString& text) = 0;
     virtual void releaseResultBuffer(ResultBuffer* chain) { releaseChain(chain); }
+    // Sets the symbol to an association list of dotted string pairs, in the given order.
+    // A list run publishes one item per row this way, so a host may build the list
+    // directly; the default goes through a chain and lispPutSymbol.
+    virtual int lispPutStringPairs(const QString& name, const StringPair* pairs, int count);
 };
 
 }  // namespace zvsdk

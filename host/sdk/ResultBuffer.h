@@ -50,6 +50,12 @@ struct ResultBuffer {
     EntityName rlname;
 };
 
+// One element of an association list of strings; the texts stay the caller's.
+struct StringPair {
+    const QString* key;
+    const QString* value;
+};
+
 // Builds a node; the chain's owner frees it with releaseChain.
 ResultBuffer* newNode(short type);
 ResultBuffer* newString(const QString& text);

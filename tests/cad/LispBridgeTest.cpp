@@ -151,6 +151,47 @@ TEST_F(LispBridgeTest, ItemEvaluationKeepsTheStaleValueAfterAFailure) {
     EXPECT_EQ(valor("reg"), "nil");
 }
 
+// A host without its own way to take string pairs gets them through a chain.
+class ChainOnlyLisp : public zvsdk::LispInterface {
+public:
+    explicit ChainOnlyLisp(zvsdk::LispInterface& host) : host_(host) {}
+    int lispGetSymbol(const QString& n, zvsdk::ResultBuffer** v) override {
+        return host_.lispGetSymbol(n, v);
+    }
+    int lispPutSymbol(const QString& n, const zvsdk::ResultBuffer* v) override {
+        return host_.lispPutSymbol(n, v);
+    }
+    zvsdk::ResultBuffer* lispInvoke(const zvsdk::ResultBuffer* c) override {
+        return host_.lispInvoke(c);
+    }
+    bool lispEvaluate(const QString& t) override { return host_.lispEvaluate(t); }
+
+private:
+    zvsdk::LispInterface& host_;
+};
+
+TEST_F(LispBridgeTest, StringPairsGiveTheSameListDirectlyAndThroughAChain) {
+    const QString chaves[] = {"REGUA", "NUMERO", "VAZIO", "ASPAS"};
+    const QString valores[] = {"X1", "12", "", "a \"b\" \\ c"};
+    std::vector<zvsdk::StringPair> pares;
+    for (int i = 0; i < 4; ++i)
+        pares.push_back({&chaves[i], &valores[i]});
+    const QString esperado =
+        "((\"REGUA\" . \"X1\") (\"NUMERO\" . \"12\") (\"VAZIO\" . \"\") "
+        "(\"ASPAS\" . \"a \\\"b\\\" \\\\ c\"))";
+
+    CICad::SetParesLisp("direto", pares);
+    EXPECT_EQ(valor("direto"), esperado);
+    ChainOnlyLisp soCadeias(*documento_->lisp());
+    EXPECT_EQ(soCadeias.lispPutStringPairs("cadeia", pares.data(), int(pares.size())),
+              zvsdk::RTNORM);
+    EXPECT_EQ(valor("cadeia"), esperado);
+    // No pairs make nil, and an unnamed symbol is refused.
+    CICad::SetParesLisp("direto", {});
+    EXPECT_EQ(valor("direto"), "nil");
+    EXPECT_EQ(documento_->lisp()->lispPutStringPairs("", pares.data(), 1), zvsdk::RTERROR);
+}
+
 TEST_F(LispBridgeTest, HostCodeRegistersFunctionsThatUserCodeCanReplace) {
     auto* documentLisp = dynamic_cast<zvhost::DocumentLisp*>(documento_->lisp());
     ASSERT_NE(documentLisp, nullptr);
