@@ -6,21 +6,12 @@
 #include "cad/FacadeFixture.h"
 #include "drawing/Dictionary.h"
 #include "lists/TemplateDouble.h"
-#include "readers/CCDataReader.h"
+#include "readers/LeitorBase.h"
 #include "readers/ZVString.h"
 
 namespace {
 
-class Leitor : public CCDataReader {
-public:
-    void LerLadoIni(CEItemLista&, const OdDbObjectId&, CETemplate&) override {}
-    void LerLadoFim(CEItemLista&, const OdDbObjectId&, CETemplate&) override {}
-    VetorItens* LerDados(zvdb::Database*, const std::optional<QStringList>&, CETemplate&,
-                         CIProgress&) override {
-        return nullptr;
-    }
-};
-
+using Leitor = LeitorBase;
 using Rotas = QHash<QString, QString>;
 
 class RouteLookupTest : public FacadeFixture {
