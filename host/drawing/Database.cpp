@@ -12,6 +12,8 @@
 #include "TagValues.h"
 #include "XRecord.h"
 
+#include <atomic>
+
 namespace zvdb {
 
 Database::Database(Blank) : header_(arena_) {}
@@ -45,9 +47,15 @@ void Database::noteHandle(std::uint64_t handle) {
     if (handle >= nextHandle_) nextHandle_ = handle + 1;
 }
 
+void Database::noteChange() {
+    static std::atomic<std::uint64_t> sequence{0};
+    changes_ = sequence.fetch_add(1, std::memory_order_relaxed) + 1;
+}
+
 DbObject* Database::adopt(std::unique_ptr<DbObject> object) {
     DbObject* raw = object.get();
     storage_.push_back(std::move(object));
+    noteChange();
     if (raw->handle() != 0) {
         byHandle_.emplace(raw->handle(), raw);
         noteHandle(raw->handle());

@@ -53,6 +53,10 @@ public:
     // The next free handle ($HANDSEED), above every handle in use.
     std::uint64_t handleSeed() const { return nextHandle_; }
     std::size_t objectCount() const { return storage_.size(); }
+    // Goes up whenever an object is added, changed or erased: what is worked out from the
+    // drawing stays good while the count stays the same. The values come from one sequence
+    // for all drawings of the process, so two drawings never show the same count.
+    std::uint64_t changeCount() const { return changes_; }
 
     // Tables -------------------------------------------------------------------------------
     SymbolTable* table(std::string_view name) const;  // "LAYER", "BLOCK_RECORD"...
@@ -109,6 +113,7 @@ public:
 
 private:
     friend class BlockRecord;
+    friend class DbObject;
     friend class DxfLoader;
     friend class DxfWriter;
     friend class DeepCloner;
@@ -124,6 +129,7 @@ private:
     DbObject* adopt(std::unique_ptr<DbObject> object);
     std::uint64_t allocateHandle() { return nextHandle_++; }
     void noteHandle(std::uint64_t handle);
+    void noteChange();
     void forgetBlock(BlockRecord& record);
     void ensureSeqend(Entity& parent);
     std::vector<Tag> entityHead(std::string_view type, std::uint64_t handle, std::uint64_t owner,
@@ -142,6 +148,7 @@ private:
     std::vector<std::string> sectionOrder_;
     std::vector<std::string> warnings_;
     std::uint64_t namedObjects_ = 0;
+    std::uint64_t changes_ = 0;
 };
 
 }  // namespace zvdb

@@ -34,6 +34,7 @@ std::span<const Tag> DbObject::tags() const {
 }
 
 std::vector<Tag>& DbObject::editTags() {
+    database_->noteChange();
     if (!owned_) {
         own_.assign(fileTags_, fileTags_ + fileCount_);
         owned_ = true;
@@ -44,6 +45,7 @@ std::vector<Tag>& DbObject::editTags() {
 }
 
 void DbObject::takeTags(std::vector<Tag> tags) {
+    database_->noteChange();
     own_ = std::move(tags);
     owned_ = true;
     fileTags_ = nullptr;
@@ -444,9 +446,14 @@ void DbObject::addReactor(std::uint64_t handle) {
     all.insert(all.begin() + static_cast<std::ptrdiff_t>(at), group, group + 3);
 }
 
+void DbObject::markErased() {
+    erased_ = true;
+    database_->noteChange();
+}
+
 void DbObject::erase() {
     if (erased_) return;
-    erased_ = true;
+    markErased();
     if (Dictionary* xdict = extensionDictionary()) xdict->erase();
     if (auto* dictionary = dynamic_cast<Dictionary*>(owner())) dictionary->forgetEntry(handle_);
 }

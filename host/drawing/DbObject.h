@@ -88,7 +88,7 @@ protected:
     friend class Database;
     friend class DxfLoader;
     void setHandle(std::uint64_t handle);
-    void markErased() { erased_ = true; }
+    void markErased();
     // Makes the object own these tags (values already in the database's storage).
     void takeTags(std::vector<Tag> tags);
     std::string_view store(std::string_view text) const;

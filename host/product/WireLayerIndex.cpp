@@ -1,7 +1,6 @@
 #include "WireLayerIndex.h"
 
 #include "drawing/BlockRecord.h"
-#include "drawing/Database.h"
 #include "drawing/Entity.h"
 #include "drawing/Polyline.h"
 
@@ -18,24 +17,15 @@ void WireLayerIndex::rebuild(zvdb::Database& database) {
     }
     for (auto& [layer, handles] : byLayer_)
         std::sort(handles.begin(), handles.end());
-    database_ = &database;
-    handleSeed_ = database.handleSeed();
-    objectCount_ = database.objectCount();
+    stamp_ = DrawingStamp::of(database);
 }
 
-std::vector<std::uint64_t> WireLayerIndex::polylinesOn(zvdb::Database& database,
-                                                       const std::string& layer) {
-    if (database_ != &database || handleSeed_ != database.handleSeed() ||
-        objectCount_ != database.objectCount())
-        rebuild(database);
-    std::vector<std::uint64_t> handles;
+const std::vector<std::uint64_t>& WireLayerIndex::polylinesOn(zvdb::Database& database,
+                                                              const std::string& layer) {
+    static const std::vector<std::uint64_t> none;
+    if (!(stamp_ == DrawingStamp::of(database))) rebuild(database);
     auto found = byLayer_.find(layer);
-    if (found == byLayer_.end()) return handles;
-    for (std::uint64_t handle : found->second) {
-        zvdb::Entity* entity = database.entityByHandle(handle);
-        if (entity && !entity->isErased() && entity->layer() == layer) handles.push_back(handle);
-    }
-    return handles;
+    return found == byLayer_.end() ? none : found->second;
 }
 
 }  // namespace zvproduct

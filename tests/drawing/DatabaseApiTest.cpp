@@ -268,6 +268,30 @@ TEST_F(DatabaseApi, HandlesAreUniqueStableAndErasedObjectsVanish) {
     EXPECT_GE(fresh->handle(), db.handleSeed()) << "handles are never reused";
 }
 
+TEST_F(DatabaseApi, ChangeCountMovesOnEveryChangeAndOnlyThen) {
+    Entity* line = db.modelSpace()->addLine({0, 0, 0}, {1, 0, 0});
+    std::uint64_t seen = db.changeCount();
+    auto changed = [&] {
+        const bool moved = db.changeCount() != seen;
+        seen = db.changeCount();
+        return moved;
+    };
+    (void)line->layer();
+    (void)line->xdata("APP");
+    (void)db.modelSpace()->entities();
+    EXPECT_FALSE(changed()) << "reading changes nothing";
+    line->setXData("APP", std::vector<Tag>{tag(1000, "A")});
+    EXPECT_TRUE(changed());
+    line->setLayer("OTHER");
+    EXPECT_TRUE(changed());
+    db.modelSpace()->addPoint({1, 1, 0});
+    EXPECT_TRUE(changed());
+    line->erase();
+    EXPECT_TRUE(changed());
+    Database other;
+    EXPECT_NE(other.changeCount(), db.changeCount()) << "two drawings never share a count";
+}
+
 TEST_F(DatabaseApi, DeepCloneBringsBlocksLayersAndTranslatesHandles) {
     Database source;
     source.createLayer("SYMBOLS")->setColor(3);
