@@ -188,13 +188,14 @@ void ConnectionFinder::touchesAt(int layer, const zvdb::Point3& p, double radius
     }
 }
 
-std::vector<zvdb::Polyline*> ConnectionFinder::polylinesInPageOrder(const char* application) {
-    const auto pages = PageRegistry(database_).pages();
+std::vector<zvdb::Polyline*> ConnectionFinder::polylinesInPageOrder(zvdb::Database& database,
+                                                                    const char* application) {
+    const auto pages = PageRegistry(database).pages();
     std::unordered_map<std::string, int> order;
     for (std::size_t i = 0; i < pages.size(); ++i)
         order.emplace(pages[i], static_cast<int>(i));
     std::vector<std::pair<std::pair<int, std::uint64_t>, zvdb::Polyline*>> found;
-    for (zvdb::Entity* entity : database_.modelSpace()->entities()) {
+    for (zvdb::Entity* entity : database.modelSpace()->entities()) {
         auto* polyline = dynamic_cast<zvdb::Polyline*>(entity);
         if (!polyline || !polyline->hasXData(application)) continue;
         auto page = order.find(std::string(polyline->layer()));
@@ -222,7 +223,7 @@ std::string ConnectionFinder::wireNumber(const zvdb::Polyline& polyline) {
 std::vector<WireConnections> ConnectionFinder::wires() {
     std::vector<WireConnections> result;
     std::unordered_map<std::string, std::size_t> byNumber;
-    for (zvdb::Polyline* polyline : polylinesInPageOrder("KVR_ZV_WIRE")) {
+    for (zvdb::Polyline* polyline : polylinesInPageOrder(database_, "KVR_ZV_WIRE")) {
         std::string number = wireNumber(*polyline);
         if (number.empty()) continue;  // an unnumbered wire joins nothing
         auto [it, added] = byNumber.emplace(number, result.size());
@@ -239,7 +240,7 @@ std::vector<WireConnections> ConnectionFinder::wires() {
 std::vector<WireConnections> ConnectionFinder::cables() {
     // blind connections by the handle of their lead
     std::unordered_map<std::uint64_t, std::vector<zvdb::Polyline*>> blinds;
-    for (zvdb::Polyline* blind : polylinesInPageOrder("KVR_ZV_CONEX_BLIND")) {
+    for (zvdb::Polyline* blind : polylinesInPageOrder(database_, "KVR_ZV_CONEX_BLIND")) {
         const auto items = blind->xdata("KVR_ZV_CONEX_BLIND");
         if (items.size() >= 2) blinds[zvdb::TagValues::toHandle(items[1].value)].push_back(blind);
     }
@@ -252,7 +253,7 @@ std::vector<WireConnections> ConnectionFinder::cables() {
     };
     std::vector<WireConnections> result;
     std::unordered_map<std::string, std::size_t> byNumber;
-    for (zvdb::Polyline* lead : polylinesInPageOrder("KVR_ZV_CABO")) {
+    for (zvdb::Polyline* lead : polylinesInPageOrder(database_, "KVR_ZV_CABO")) {
         const std::string number = cableNumber(*lead);
         if (number.empty()) continue;
         auto [it, added] = byNumber.emplace(number, result.size());

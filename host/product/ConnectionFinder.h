@@ -45,6 +45,10 @@ public:
     static std::string wireNumber(const zvdb::Polyline& polyline);
     // "NAME\fKEY" of a lead: its cable's CABO field and its own key; empty.
     std::string cableNumber(const zvdb::Polyline& lead) const;
+    // Model-space polylines with the application's extended data, by registry page order
+    // (polylines off the pages last), then by handle.
+    static std::vector<zvdb::Polyline*> polylinesInPageOrder(zvdb::Database& database,
+                                                             const char* application);
 
 private:
     struct Symbol {
@@ -68,7 +72,6 @@ private:
     std::vector<const Spot*> spotsNear(int layer, const zvdb::Point3& p, double radius) const;
     void touchesAt(int layer, const zvdb::Point3& p, double radius, std::vector<Touch>& out) const;
     int layerId(const std::string& layer);
-    std::vector<zvdb::Polyline*> polylinesInPageOrder(const char* application);
 
     zvdb::Database& database_;
     double tolerance_;

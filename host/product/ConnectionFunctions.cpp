@@ -5,6 +5,7 @@
 #include "PageRegistry.h"
 #include "ProductLisp.h"
 #include "WireLayerIndex.h"
+#include "WireListIndex.h"
 
 #include "drawing/Database.h"
 #include "drawing/Polyline.h"
@@ -76,21 +77,6 @@ std::unordered_set<std::string> layerNames(Args args, int from) {
     return names;
 }
 
-// The first polyline of each wire with a polyline on one of `layers` (all when empty).
-std::vector<std::uint64_t> wiresOn(zvdb::Database& database, double tol,
-                                   const std::unordered_set<std::string>& layers) {
-    std::vector<std::uint64_t> handles;
-    for (const WireConnections& wire : ConnectionFinder(database, tol).wires()) {
-        for (std::uint64_t handle : wire.polylines) {
-            zvdb::Entity* entity = database.entityByHandle(handle);
-            if (!layers.empty() && !layers.count(std::string(entity->layer()))) continue;
-            handles.push_back(handle);
-            break;
-        }
-    }
-    return handles;
-}
-
 }  // namespace
 
 void installConnectionFunctions(Interpreter& lisp, const ProductContext& context) {
@@ -118,17 +104,19 @@ void installConnectionFunctions(Interpreter& lisp, const ProductContext& context
             return lispTexts(handles);
         },
         1, 1);
-    lisp.define("getListaFios", [context](Interpreter& in, Args a) {
+    // The wire reader, the ferrule reader and the material list ask in turn: one index.
+    auto wires = std::make_shared<WireListIndex>();
+    lisp.define("getListaFios", [context, wires](Interpreter& in, Args a) {
         zvdb::Database& database = databaseOf(in, context);
         zvlisp::ListBuilder list;
-        for (std::uint64_t handle : wiresOn(database, tolerance(in), layerNames(a, 0)))
+        for (std::uint64_t handle : wires->firstPolylines(database, layerNames(a, 0)))
             list.add(ename(database, handle));
         return list.take();
     });
-    lisp.define("getListaFiosProj", [context](Interpreter& in, Args a) {
+    lisp.define("getListaFiosProj", [context, wires](Interpreter& in, Args a) {
         zvdb::Database& database = databaseOf(in, context);
         std::vector<std::string> handles;
-        for (std::uint64_t handle : wiresOn(database, tolerance(in), layerNames(a, 1)))
+        for (std::uint64_t handle : wires->firstPolylines(database, layerNames(a, 1)))
             handles.push_back(handleText(handle));
         return lispTexts(handles);
     });

@@ -108,6 +108,40 @@ TEST_F(ConnectionsTest, WireListsByPage) {
               "(\"" + hex(two) + "\" \"" + hex(three) + "\")");
 }
 
+TEST_F(ConnectionsTest, WireListTakesEachWiresFirstPolylineOnThePagesAndFollowsEdits) {
+    auto* late = wire("ESQ$0002$A", {{10, 10, 0}, {20, 10, 0}}, "401");  // drawn first, page 2
+    auto* early = wire("ESQ$0001$A", {{10, 10, 0}, {20, 10, 0}}, "401");
+    auto* other = wire("ESQ$0002$A", {{30, 10, 0}, {40, 10, 0}}, "402");
+    wire("ESQ$0001$A", {{50, 10, 0}, {60, 10, 0}}, "");  // no number: no wire of the lists
+    auto list = [this](const char* pages) {
+        return show(QString("(getListaFiosProj \"proj.dxf\" %1)").arg(pages));
+    };
+    auto texts = [](std::initializer_list<const zvdb::DbObject*> objects) {
+        std::string out = "(";
+        for (const zvdb::DbObject* object : objects)
+            out += (out.size() > 1 ? " \"" : "\"") + hex(object) + "\"";
+        return out + ")";
+    };
+    EXPECT_EQ(list("nil"), texts({early, other}));
+    EXPECT_EQ(list("\"ESQ$0002$A\""), texts({late, other}));
+    EXPECT_EQ(list("\"ESQ$0002$A;ESQ$0001$A\""), texts({early, other}))
+        << "a wire on several of the pages answers with its first polyline among them";
+    EXPECT_EQ(list("'(\"ESQ$0002$A\")"), texts({late, other}));
+    EXPECT_EQ(list("\"NOPE$0001$A\""), "nil");
+    EXPECT_EQ(show("(length (getListaFios \"ESQ$0001$A\" \"ESQ$0002$A\"))"), "2");
+
+    // a number changed, a polyline erased, a polyline moved to another page
+    early->setXData("KVR_ZV_WIRE",
+                    zvsample::XDataItems().text("10006\f1").text("1").text("FIO\f403").tags());
+    EXPECT_EQ(list("nil"), texts({early, late, other}));
+    early->erase();
+    EXPECT_EQ(list("nil"), texts({late, other}));
+    other->setLayer("ESQ$0001$A");
+    EXPECT_EQ(list("nil"), texts({other, late}));
+    EXPECT_EQ(list("\"ESQ$0001$A\""), texts({other}));
+    EXPECT_EQ(show("(length (getListaFios \"ESQ$0001$A\"))"), "1");
+}
+
 TEST_F(ConnectionsTest, ProjectCheckFindsDuplicateTerminalsAndOpenWires) {
     terminal("ESQ$0001$A", {100, 200, 0}, "X1", "1");
     terminal("ESQ$0001$A", {200, 200, 0}, "X1", "2");

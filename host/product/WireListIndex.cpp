@@ -1,0 +1,69 @@
+#include "WireListIndex.h"
+
+#include "ConnectionFinder.h"
+
+#include "drawing/Polyline.h"
+
+#include <algorithm>
+
+namespace zvproduct {
+
+void WireListIndex::rebuild(zvdb::Database& database) {
+    firsts_.clear();
+    byLayer_.clear();
+    std::unordered_map<std::string, std::uint32_t> rankOf;
+    std::vector<std::uint32_t> placesSeen;  // polylines met so far, by wire rank
+    for (zvdb::Polyline* polyline :
+         ConnectionFinder::polylinesInPageOrder(database, "KVR_ZV_WIRE")) {
+        const std::string number = ConnectionFinder::wireNumber(*polyline);
+        if (number.empty()) continue;  // an unnumbered wire is no wire of the lists
+        const auto [it, added] = rankOf.emplace(number, static_cast<std::uint32_t>(firsts_.size()));
+        if (added) {
+            firsts_.push_back(polyline->handle());
+            placesSeen.push_back(0);
+        }
+        const std::uint32_t wire = it->second;
+        const std::uint32_t place = placesSeen[wire]++;
+        std::vector<OnLayer>& onLayer = byLayer_[std::string(polyline->layer())];
+        // polylines come in page order, so a wire's first one on this layer is the one kept
+        if (onLayer.empty() || onLayer.back().wire != wire)
+            onLayer.push_back({wire, place, polyline->handle()});
+    }
+    // within a layer a wire can come back after others; the later entries only repeat it
+    for (auto& [layer, entries] : byLayer_) {
+        std::stable_sort(entries.begin(), entries.end(),
+                         [](const OnLayer& a, const OnLayer& b) { return a.wire < b.wire; });
+        entries.erase(
+            std::unique(entries.begin(), entries.end(),
+                        [](const OnLayer& a, const OnLayer& b) { return a.wire == b.wire; }),
+            entries.end());
+    }
+    stamp_ = DrawingStamp::of(database);
+}
+
+std::vector<std::uint64_t> WireListIndex::firstPolylines(
+    zvdb::Database& database, const std::unordered_set<std::string>& layers) {
+    if (!(stamp_ == DrawingStamp::of(database))) rebuild(database);
+    if (layers.empty()) return firsts_;
+    std::vector<const std::vector<OnLayer>*> asked;
+    for (const std::string& layer : layers) {
+        auto entries = byLayer_.find(layer);
+        if (entries != byLayer_.end()) asked.push_back(&entries->second);
+    }
+    // the wire reader names every layer of the drawing: that is every wire
+    if (asked.size() == byLayer_.size()) return firsts_;
+    std::vector<OnLayer> found;
+    for (const std::vector<OnLayer>* entries : asked)
+        found.insert(found.end(), entries->begin(), entries->end());
+    // a wire on several of the layers answers with its first polyline among them
+    std::sort(found.begin(), found.end(), [](const OnLayer& a, const OnLayer& b) {
+        return a.wire != b.wire ? a.wire < b.wire : a.place < b.place;
+    });
+    std::vector<std::uint64_t> handles;
+    handles.reserve(found.size());
+    for (std::size_t i = 0; i < found.size(); ++i)
+        if (i == 0 || found[i].wire != found[i - 1].wire) handles.push_back(found[i].handle);
+    return handles;
+}
+
+}  // namespace zvproduct
