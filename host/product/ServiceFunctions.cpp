@@ -2,6 +2,7 @@
 // zvGetCircuitoLocalInfo, zvsolution_isloaded, zvsolution_getProjFile,
 // zv_interno_get_idioma_corrente, atualizarMacros, atualizaTopografico,
 // zvAlternaStatusBloqueioPalette, zvExportaLayerDxf, zvExportaLayer.
+#include "DrawingStamp.h"
 #include "LispHelpers.h"
 #include "ProductLisp.h"
 #include "ProjectCheck.h"
@@ -16,6 +17,7 @@
 #include <QFileInfo>
 
 #include <cmath>
+#include <memory>
 
 namespace zvproduct {
 
@@ -64,9 +66,8 @@ QString gridPosition(double x, double y) {
 }
 
 // The first panel named on the project settings point (KVR_ZV_PAINEL); empty.
-QString firstPanel(zvdb::Database* database) {
-    if (!database) return {};
-    for (zvdb::Entity* entity : database->modelSpace()->entities()) {
+QString findFirstPanel(zvdb::Database& database) {
+    for (zvdb::Entity* entity : database.modelSpace()->entities()) {
         if (entity->layer() != "ZV_FREEZE" || !entity->isType("POINT")) continue;
         const auto items = entity->xdata("KVR_ZV_PAINEL");
         if (!items.empty())
@@ -76,9 +77,24 @@ QString firstPanel(zvdb::Database* database) {
     return {};
 }
 
+// The readers ask for every local circuit: the panel is looked for once per drawing change.
+struct PanelCache {
+    DrawingStamp stamp;
+    QString panel;
+};
+
+QString firstPanel(zvdb::Database* database, PanelCache& cache) {
+    if (!database) return {};
+    if (!(cache.stamp == DrawingStamp::of(*database))) {
+        cache.panel = findFirstPanel(*database);
+        cache.stamp = DrawingStamp::of(*database);
+    }
+    return cache.panel;
+}
+
 // From *ZV_CIRCUITOS_LOCAIS*, ((N "circuit" "panel" "third") ...); otherwise the number, the
 // project's first panel and an empty text.
-Value localCircuit(Interpreter& lisp, zvdb::Database* database, int number) {
+Value localCircuit(Interpreter& lisp, const QString& panel, int number) {
     for (Value rest = lisp.global("*ZV_CIRCUITOS_LOCAIS*"); rest.isCons();
          rest = zvlisp::cdr(rest)) {
         const Value entry = zvlisp::car(rest);
@@ -92,7 +108,7 @@ Value localCircuit(Interpreter& lisp, zvdb::Database* database, int number) {
             return lispTexts(texts);
         }
     }
-    return lispTexts(QStringList{QString::number(number), firstPanel(database), QString()});
+    return lispTexts(QStringList{QString::number(number), panel, QString()});
 }
 
 QStringList solutionFiles(Interpreter& lisp) {
@@ -175,9 +191,9 @@ void installServiceFunctions(Interpreter& lisp, const ProductContext& context) {
         5, 5);
     lisp.define(
         "zvGetCircuitoLocalInfo",
-        [context](Interpreter& in, Args a) {
-            return localCircuit(in, context.database ? context.database() : nullptr,
-                                in.toInt(a[0]));
+        [context, panels = std::make_shared<PanelCache>()](Interpreter& in, Args a) {
+            zvdb::Database* database = context.database ? context.database() : nullptr;
+            return localCircuit(in, firstPanel(database, *panels), in.toInt(a[0]));
         },
         1, 1);
     lisp.define(
