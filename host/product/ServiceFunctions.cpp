@@ -6,6 +6,7 @@
 #include "LispHelpers.h"
 #include "ProductLisp.h"
 #include "ProjectCheck.h"
+#include "SheetGridIndex.h"
 
 #include "drawing/BlockRecord.h"
 #include "drawing/Database.h"
@@ -26,11 +27,6 @@ using zvlisp::Interpreter;
 using zvlisp::Value;
 
 namespace {
-
-// The sheet grid used when no page model is reachable: 12 columns 1-12 of 35 units across
-// the A3 sheet, 8 rows A-H of 37.125 units from the top edge.
-constexpr double kSheetWidth = 420.0, kSheetHeight = 297.0;
-constexpr int kColumns = 12, kRows = 8;
 
 void print(const ProductContext& context, const QString& text) {
     if (context.print) context.print(text);
@@ -57,12 +53,13 @@ Value loadTemplate(Interpreter& lisp, const ProductContext& context, const QStri
     return lisp.t();
 }
 
-QString gridPosition(double x, double y) {
-    if (!(x >= 0 && x <= kSheetWidth && y >= 0 && y <= kSheetHeight)) return "??";
-    const int column = std::min(kColumns - 1, static_cast<int>(x / (kSheetWidth / kColumns)));
-    const int row =
-        std::min(kRows - 1, static_cast<int>((kSheetHeight - y) / (kSheetHeight / kRows)));
-    return QString("%1%2").arg(QChar('A' + row)).arg(column + 1);
+// (BuscarCoordenadas ENAME GROUP PAGE X Y): the position on the group's sheet grid.
+Value gridPosition(Interpreter& lisp, const ProductContext& context, SheetGridIndex& grids,
+                   Args a) {
+    if (!a[3].isNumber() || !a[4].isNumber()) return Value::string("??");
+    zvdb::Database* database = context.database ? context.database() : nullptr;
+    const std::string group = a[1].isString() ? a[1].asString().toStdString() : std::string();
+    return Value::string(grids.position(database, group, lisp.toNumber(a[3]), lisp.toNumber(a[4])));
 }
 
 // The first panel named on the project settings point (KVR_ZV_PAINEL); empty.
@@ -185,8 +182,8 @@ void installServiceFunctions(Interpreter& lisp, const ProductContext& context) {
         0, 0);
     lisp.define(
         "BuscarCoordenadas",
-        [](Interpreter& in, Args a) {
-            return Value::string(gridPosition(in.toNumber(a[3]), in.toNumber(a[4])));
+        [context, grids = std::make_shared<SheetGridIndex>()](Interpreter& in, Args a) {
+            return gridPosition(in, context, *grids, a);
         },
         5, 5);
     lisp.define(
