@@ -1,0 +1,321 @@
+// The reader base's point and neighbour queries on small drawings built by the tests: the
+// wire under a point, the element next to a symbol along a wire, the cut point of a
+// two-point symbol and the connection attribute nearest a point.
+#include "QtPrinters.h"
+#include "cad/CICad.h"
+#include "cad/FacadeFixture.h"
+#include "drawing/Polyline.h"
+#include "readers/CCDataReader.h"
+#include "readers/CEAtributo.h"
+#include "readers/ZVString.h"
+#include "sample/XDataItems.h"
+
+namespace {
+
+// A reader with no list of its own: only the base's services are asked.
+class LeitorBase : public CCDataReader {
+public:
+    void LerLadoIni(CEItemLista&, const OdDbObjectId&, CETemplate&) override {}
+    void LerLadoFim(CEItemLista&, const OdDbObjectId&, CETemplate&) override {}
+    VetorItens* LerDados(zvdb::Database*, const std::optional<QStringList>&, CETemplate&,
+                         CIProgress&) override {
+        return nullptr;
+    }
+};
+
+const std::string kPagina = "ESQ$0001$A";
+
+class ConnectionQueriesTest : public FacadeFixture {
+protected:
+    void SetUp() override {
+        FacadeFixture::SetUp();
+        db().createLayer(kPagina);
+        db().createLayer("ESQ$0002$A");
+    }
+
+    OdDbObjectId id(const zvdb::DbObject* objeto) { return OdDbObjectId(&db(), objeto->handle()); }
+    QString handle(const zvdb::DbObject* objeto) { return ZVString::DeHandle(objeto->handle()); }
+
+    // A numbered wire polyline.
+    zvdb::Polyline* fio(const std::vector<zvdb::Point3>& pontos, const std::string& numero,
+                        const std::string& layer = kPagina) {
+        zvdb::Polyline* linha = db().modelSpace()->addLwPolyline(pontos, false, layer);
+        linha->setXData(
+            "KVR_ZV_WIRE",
+            zvsample::XDataItems().text("10006\f1").text("1").text("FIO\f" + numero).tags());
+        return linha;
+    }
+
+    zvdb::BlockRecord& bloco(const std::string& nome) {
+        if (zvdb::BlockRecord* achado = db().block(nome)) return *achado;
+        zvdb::BlockRecord* feito = db().createBlock(nome);
+        feito->addLine({0, 0, 0}, {0, -10, 0});
+        return *feito;
+    }
+
+    // A project symbol with its cut point 10 below the insertion point.
+    zvdb::BlockReference* simbolo(const std::string& nome, zvdb::Point3 em) {
+        auto* ref = db().modelSpace()->addBlockReference(bloco(nome), em, {1, 1, 1}, 0, kPagina);
+        ref->setXData("KVR_ZV", zvsample::XDataItems().text("1001\f1").tags());
+        ref->setXData("KVR_ZV_PTS_CORTE",
+                      zvsample::XDataItems().point(em).point({em.x, em.y - 10, em.z}).tags());
+        return ref;
+    }
+
+    // The reader reads the wire's catch radius when it is made.
+    std::unique_ptr<LeitorBase> leitor(std::optional<double> espessura = std::nullopt) {
+        if (espessura) CICad::SetRealLisp("*ESPESSURA_BARRAMENTO*", *espessura);
+        return std::make_unique<LeitorBase>();
+    }
+};
+
+// ---- the wire under a point
+
+TEST_F(ConnectionQueriesTest, APointCatchesAWireWithinTheBusBarThicknessOnly) {
+    const zvdb::Polyline* w = fio({{0, 100, 0}, {100, 100, 0}}, "1");
+    auto r = leitor(0.5);
+    const QString layer = QString::fromStdString(kPagina);
+    EXPECT_EQ(r->FioNoPonto(layer, {50, 100.4, 0}), id(w));
+    EXPECT_EQ(r->FioNoPonto(layer, {50, 99.6, 0}), id(w));
+    // The radius is open: a point exactly at the thickness is off the wire.
+    EXPECT_TRUE(r->FioNoPonto(layer, {50, 100.5, 0}).isNull());
+    EXPECT_TRUE(r->FioNoPonto(layer, {50, 101.0, 0}).isNull());
+    // The line distance is taken in the plane: height does not move a point off the wire.
+    EXPECT_EQ(r->FioNoPonto(layer, {50, 100, 5}), id(w));
+    // Other layers' wires are not looked at.
+    EXPECT_TRUE(r->FioNoPonto("ESQ$0002$A", {50, 100, 0}).isNull());
+}
+
+TEST_F(ConnectionQueriesTest, WithoutTheSymbolTheRadiusIsATenth) {
+    const zvdb::Polyline* w = fio({{0, 100, 0}, {100, 100, 0}}, "1");
+    auto r = leitor();
+    const QString layer = QString::fromStdString(kPagina);
+    EXPECT_EQ(r->FioNoPonto(layer, {50, 100.09, 0}), id(w));
+    EXPECT_TRUE(r->FioNoPonto(layer, {50, 100.15, 0}).isNull());
+}
+
+TEST_F(ConnectionQueriesTest, APointBeyondEitherEndOfASegmentIsOff) {
+    const zvdb::Polyline* w = fio({{0, 100, 0}, {100, 100, 0}}, "1");
+    auto r = leitor(0.5);
+    const QString layer = QString::fromStdString(kPagina);
+    // On the segment's line but past its ends: the line distance is zero, the point is out.
+    EXPECT_TRUE(r->FioNoPonto(layer, {100.6, 100, 0}).isNull());
+    EXPECT_TRUE(r->FioNoPonto(layer, {-0.6, 100, 0}).isNull());
+    EXPECT_TRUE(r->FioNoPonto(layer, {150, 100, 0}).isNull());
+    EXPECT_TRUE(r->FioNoPonto(layer, {-50, 100, 0}).isNull());
+    // Near an end point it is on, whatever side.
+    EXPECT_EQ(r->FioNoPonto(layer, {100.4, 100, 0}), id(w));
+    EXPECT_EQ(r->FioNoPonto(layer, {-0.4, 100, 0}), id(w));
+    // End points are measured in three dimensions.
+    EXPECT_TRUE(r->FioNoPonto(layer, {100.3, 100, 0.45}).isNull());
+    EXPECT_EQ(r->FioNoPonto(layer, {100.3, 100, 0.3}), id(w));
+}
+
+TEST_F(ConnectionQueriesTest, JustPastAnEndAPointIsOutOnlyWhenItIsFartherOutThanOffTheLine) {
+    // 0.6 from the end point, 0.45 off the line and 0.4 past the end: the segment's length
+    // plus the line distance still exceeds the distance to the far end, so the point is on.
+    const zvdb::Polyline* w = fio({{0, 100, 0}, {100, 100, 0}}, "1");
+    auto r = leitor(0.5);
+    const QString layer = QString::fromStdString(kPagina);
+    EXPECT_EQ(r->FioNoPonto(layer, {100.4, 100.45, 0}), id(w));
+    EXPECT_EQ(r->FioNoPonto(layer, {-0.4, 99.55, 0}), id(w));
+    // Farther past the end than off the line: out.
+    EXPECT_TRUE(r->FioNoPonto(layer, {100.5, 100.3, 0}).isNull());
+}
+
+TEST_F(ConnectionQueriesTest, VerticalSlopedAndZeroLengthSegments) {
+    const zvdb::Polyline* vertical = fio({{10, 0, 0}, {10, 50, 0}}, "1");
+    const zvdb::Polyline* inclinado = fio({{200, 0, 0}, {230, 40, 0}}, "2");
+    const zvdb::Polyline* ponto = fio({{300, 300, 0}, {300, 300, 0}}, "3");
+    auto r = leitor(0.5);
+    const QString layer = QString::fromStdString(kPagina);
+    EXPECT_EQ(r->FioNoPonto(layer, {10.4, 25, 0}), id(vertical));
+    EXPECT_TRUE(r->FioNoPonto(layer, {10.6, 25, 0}).isNull());
+    EXPECT_TRUE(r->FioNoPonto(layer, {10, 50.6, 0}).isNull());
+    EXPECT_EQ(r->FioNoPonto(layer, {10, 50.4, 0}), id(vertical));
+    // 0.4 and 0.6 from the middle of a 3-4-5 segment, along its normal (-0.8, 0.6).
+    EXPECT_EQ(r->FioNoPonto(layer, {214.68, 20.24, 0}), id(inclinado));
+    EXPECT_TRUE(r->FioNoPonto(layer, {214.52, 20.36, 0}).isNull());
+    // A segment of no length is caught at its point only.
+    EXPECT_EQ(r->FioNoPonto(layer, {300, 300.4, 0}), id(ponto));
+    EXPECT_TRUE(r->FioNoPonto(layer, {300, 301, 0}).isNull());
+}
+
+TEST_F(ConnectionQueriesTest, TheFirstWireOfTheLayerWinsOverACloserOne) {
+    const zvdb::Polyline* primeiro = fio({{0, 300, 0}, {100, 300, 0}}, "1");
+    const zvdb::Polyline* segundo = fio({{0, 300.3, 0}, {100, 300.3, 0}}, "2");
+    const zvdb::Polyline* dobra = fio({{0, 400, 0}, {50, 400, 0}, {50, 450, 0}}, "3");
+    auto r = leitor(0.5);
+    const QString layer = QString::fromStdString(kPagina);
+    EXPECT_EQ(r->FioNoPonto(layer, {50, 300.4, 0}), id(primeiro));
+    EXPECT_EQ(r->FioNoPonto(layer, {50, 300.75, 0}), id(segundo));
+    // A bend: each segment is looked at.
+    EXPECT_EQ(r->FioNoPonto(layer, {50.3, 430, 0}), id(dobra));
+}
+
+TEST_F(ConnectionQueriesTest, ALayersWiresAreAskedForOncePerReader) {
+    fio({{0, 100, 0}, {100, 100, 0}}, "1");
+    auto r = leitor(0.5);
+    const QString layer = QString::fromStdString(kPagina);
+    EXPECT_TRUE(r->FioNoPonto(layer, {50, 200, 0}).isNull());
+    const zvdb::Polyline* depois = fio({{0, 200, 0}, {100, 200, 0}}, "2");
+    // The drawing does not change during a run: the first answer for the layer stays.
+    EXPECT_TRUE(r->FioNoPonto(layer, {50, 200, 0}).isNull());
+    EXPECT_EQ(leitor()->FioNoPonto(layer, {50, 200, 0}), id(depois));
+}
+
+// ---- neighbours along a wire
+
+class NeighbourTest : public ConnectionQueriesTest {
+protected:
+    void SetUp() override {
+        ConnectionQueriesTest::SetUp();
+        // 101: K -> T (T's insertion point); 102: T's cut point -> U.
+        k = simbolo("NA-1", {20, 200, 0});
+        t = simbolo("BORNE_1", {20, 150, 0});
+        u = simbolo("BORNE_1", {20, 100, 0});
+        fio({{20, 190, 0}, {20, 150, 0}}, "101");
+        fio({{20, 140, 0}, {20, 100, 0}}, "102");
+        // 103 runs straight through V: A -> V -> B.
+        a = simbolo("NA-1", {60, 210, 0});
+        v = simbolo("BORNE_1", {60, 150, 0});
+        b = simbolo("BORNE_1", {60, 90, 0});
+        fio({{60, 200, 0}, {60, 150, 0}, {60, 90, 0}}, "103");
+        // 104 touches W twice, at its insertion and at its cut point: C -> W -> W -> D.
+        c = simbolo("NA-1", {100, 210, 0});
+        w = simbolo("BORNE_1", {100, 150, 0});
+        d = simbolo("BORNE_1", {100, 90, 0});
+        fio({{100, 200, 0}, {100, 150, 0}, {100, 140, 0}, {100, 90, 0}}, "104");
+        // 105 touches S only.
+        s = simbolo("BORNE_1", {150, 200, 0});
+        fio({{150, 200, 0}, {150, 180, 0}}, "105");
+        r = leitor();
+        r->CarregaConexoesFios();
+    }
+    QString vizinho(const zvdb::DbObject* de, zvdb::Point3 p, bool anterior) {
+        return r->VizinhoNaConexao(id(de), {p.x, p.y, p.z}, anterior);
+    }
+
+    zvdb::BlockReference *k, *t, *u, *a, *v, *b, *c, *w, *d, *s;
+    std::unique_ptr<LeitorBase> r;
+};
+
+TEST_F(NeighbourTest, TheWireHoldsItsElementsInOrderWithTheirPoints) {
+    const QStringList* elementos = r->ListaConexoes("104");
+    ASSERT_TRUE(elementos);
+    EXPECT_EQ(*elementos, QStringList({handle(c), handle(w), handle(w), handle(d)}));
+    const std::vector<CEPonto>* pontos = r->PontosConexao("104");
+    ASSERT_TRUE(pontos);
+    ASSERT_EQ(pontos->size(), 4u);
+    EXPECT_DOUBLE_EQ((*pontos)[2].y, 140.0);
+    const CEPonto primeiro = r->PontoDaConexao("104", handle(w));
+    EXPECT_DOUBLE_EQ(primeiro.y, 150.0);
+    const CEPonto nenhum = r->PontoDaConexao("104", handle(k));
+    EXPECT_DOUBLE_EQ(nenhum.x, 0.0);
+    EXPECT_DOUBLE_EQ(nenhum.y, 0.0);
+}
+
+TEST_F(NeighbourTest, EachEndOfATerminalSeesItsOwnWire) {
+    EXPECT_EQ(vizinho(t, {20, 150, 0}, true), handle(k));
+    EXPECT_EQ(vizinho(t, {20, 150, 0}, false), "");
+    EXPECT_EQ(vizinho(t, {20, 140, 0}, false), handle(u));
+    // First on its wire: nothing before it.
+    EXPECT_EQ(vizinho(t, {20, 140, 0}, true), "");
+    EXPECT_EQ(vizinho(u, {20, 100, 0}, true), handle(t));
+    // A point on no wire has no neighbour.
+    EXPECT_EQ(vizinho(t, {40, 150, 0}, true), "");
+}
+
+TEST_F(NeighbourTest, TheElementMatchesWithinThreeUnitsOfItsPoint) {
+    // Points on wire 101 at 2.5 and 3.5 from T's point.
+    EXPECT_EQ(vizinho(t, {20, 152.5, 0}, true), handle(k));
+    EXPECT_EQ(vizinho(t, {20, 153.5, 0}, true), "");
+}
+
+TEST_F(NeighbourTest, AWireThroughATerminalGivesOneNeighbourEachWay) {
+    EXPECT_EQ(vizinho(v, {60, 150, 0}, false), handle(b));
+    EXPECT_EQ(vizinho(v, {60, 150, 0}, true), handle(a));
+    // The neighbour's own view: the terminal is before B.
+    EXPECT_EQ(vizinho(b, {60, 90, 0}, true), handle(v));
+}
+
+TEST_F(NeighbourTest, ATerminalTwiceOnAWireIsFoundAtTheOccurrenceNearThePoint) {
+    EXPECT_EQ(vizinho(w, {100, 140, 0}, false), handle(d));
+    EXPECT_EQ(vizinho(w, {100, 150, 0}, true), handle(c));
+    // The terminal itself is never its own neighbour.
+    EXPECT_EQ(vizinho(w, {100, 150, 0}, false), "");
+    EXPECT_EQ(vizinho(w, {100, 140, 0}, true), "");
+}
+
+TEST_F(NeighbourTest, AWireWithOneElementGivesNoNeighbour) {
+    ASSERT_TRUE(r->ListaConexoes("105"));
+    EXPECT_EQ(r->ListaConexoes("105")->size(), 1);
+    EXPECT_EQ(vizinho(s, {150, 200, 0}, false), "");
+    EXPECT_EQ(vizinho(s, {150, 200, 0}, true), "");
+}
+
+// ---- wire numbers, cut points and connection attributes
+
+TEST_F(ConnectionQueriesTest, AWireNumberComesFromItsNamedFieldInAnyLanguage) {
+    zvdb::Polyline* ingles = db().modelSpace()->addLwPolyline({{0, 0, 0}, {1, 0, 0}}, false);
+    ingles->setXData("KVR_ZV_WIRE",
+                     zvsample::XDataItems().text("10006\f1").text("1").text("wire\f7A").tags());
+    zvdb::Polyline* curto = db().modelSpace()->addLwPolyline({{0, 0, 0}, {1, 0, 0}}, false);
+    curto->setXData("KVR_ZV_WIRE", zvsample::XDataItems().text("10006\f1").text("FIO\f9").tags());
+    auto r = leitor();
+    EXPECT_EQ(r->NumeroDoFio(id(ingles)), "7A");
+    EXPECT_TRUE(r->EhFioNumerado(id(ingles)));
+    // The number is read from the third item on.
+    EXPECT_EQ(r->NumeroDoFio(id(curto)), "");
+    EXPECT_FALSE(r->EhFioNumerado(id(curto)));
+    EXPECT_EQ(r->NumeroDoFio(id(fio({{0, 0, 0}, {1, 1, 0}}, "12"))), "12");
+}
+
+TEST_F(ConnectionQueriesTest, TheCutPointIsTheStoredPointThatIsNotTheInsertion) {
+    auto r = leitor();
+    auto ponto = [&](const zvdb::DbObject* ref) {
+        const CEPonto p = r->PontoDeCorte(id(ref));
+        return QString("%1,%2,%3").arg(p.x).arg(p.y).arg(p.z);
+    };
+    EXPECT_EQ(ponto(simbolo("BORNE_1", {5, 50, 0})), "5,40,0");
+    // Stored the other way round: the first point is the cut point.
+    auto* trocado = db().modelSpace()->addBlockReference(bloco("NA-1"), {8, 8, 0});
+    trocado->setXData("KVR_ZV_PTS_CORTE",
+                      zvsample::XDataItems().point({8, -2, 0}).point({8, 8, 0}).tags());
+    EXPECT_EQ(ponto(trocado), "8,-2,0");
+    // Without cut points: the third key item, as a point.
+    auto* chave = db().modelSpace()->addBlockReference(bloco("NA-1"), {1, 1, 0});
+    chave->setXData("KVR_ZV",
+                    zvsample::XDataItems().text("1001\f1").text("x").point({3, 4, 5}).tags());
+    EXPECT_EQ(ponto(chave), "3,4,5");
+    // One point only and a short key: the origin.
+    auto* curto = db().modelSpace()->addBlockReference(bloco("NA-1"), {1, 1, 0});
+    curto->setXData("KVR_ZV_PTS_CORTE", zvsample::XDataItems().point({7, 7, 0}).tags());
+    curto->setXData("KVR_ZV", zvsample::XDataItems().text("1001\f1").tags());
+    EXPECT_EQ(ponto(curto), "0,0,0");
+}
+
+TEST_F(ConnectionQueriesTest, TheNearestConnectionAttributeOfAnyLanguageIsCopied) {
+    auto* ref = db().modelSpace()->addBlockReference(bloco("BOBINA"), {0, 0, 0});
+    ref->addAttribute("LIGACAO1", "A1", {0, 0, 0}, 2.5);
+    ref->addAttribute("RELACAO", "-K1", {6, 0, 0}, 2.5);
+    ref->addAttribute("Connection2", "A2", {10, 0, 0}, 2.5);
+    ref->addAttribute("CONEXION3", "A3", {20, 0, 0}, 2.5);
+    auto r = leitor();
+    auto valor = [&](CEPonto p) {
+        const std::unique_ptr<zv::CEAtributo> a = r->AtributoConexaoProximo(id(ref), p);
+        return a ? a->GetTag() + "=" + a->GetValor() : QString("none");
+    };
+    EXPECT_EQ(valor({9, 0, 0}), "Connection2=A2");
+    EXPECT_EQ(valor({6, 0, 0}), "Connection2=A2");  // the label nearer still is no connection
+    EXPECT_EQ(valor({30, 1, 0}), "CONEXION3=A3");
+    EXPECT_EQ(valor({-1, 0, 0}), "LIGACAO1=A1");
+    // Equally near: the first one stays.
+    EXPECT_EQ(valor({5, 3, 0}), "LIGACAO1=A1");
+    EXPECT_EQ(valor({5, 0, 0}), "LIGACAO1=A1");
+    auto* sem = db().modelSpace()->addBlockReference(bloco("BOBINA"), {0, 0, 0});
+    sem->addAttribute("RELACAO", "-K2", {0, 0, 0}, 2.5);
+    EXPECT_EQ(r->AtributoConexaoProximo(id(sem), {0, 0, 0}), nullptr);
+}
+
+}  // namespace
