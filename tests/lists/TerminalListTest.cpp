@@ -7,6 +7,7 @@
 #include "drawing/BlockReference.h"
 #include "drawing/Database.h"
 #include "drawing/DxfLoader.h"
+#include "drawing/DxfWriter.h"
 
 #include <gtest/gtest.h>
 
@@ -80,6 +81,46 @@ protected:
         return texto;
     }
 
+    // A template of the suite's product folder: `texto` after loading the demo's terminal
+    // template; the list commands then use it.
+    static QStringList modelo(const QString& nome, const QByteArray& texto) {
+        QFile arquivo(pasta_->filePath("produto/templates/" + nome));
+        EXPECT_TRUE(arquivo.open(QIODevice::WriteOnly));
+        arquivo.write("(load (strcat *DIR_ZVCFG_TEMPL* \"bornes.grt\"))\n" + texto + "\n");
+        return {"--eval", "(setq *DEF_LISTA_BORNES* \"" + nome + "\")"};
+    }
+
+    // The detail rows of a single-column list with the strip of the terminal each one links
+    // back to; a blank row takes the strip of the row before it.
+    struct Linha {
+        QString texto, regua;
+    };
+    static std::vector<Linha> linhasComRegua(const QString& arquivo) {
+        const auto db = zvdb::DxfLoader::loadFile(arquivo.toStdString());
+        std::vector<Linha> linhas;
+        for (zvdb::Entity* e : db->modelSpace()->entities()) {
+            auto* ref = dynamic_cast<zvdb::BlockReference*>(e);
+            if (!ref || !ref->blockName().starts_with("BLK_CTR_LST_DET_BORN")) continue;
+            QStringList campos;
+            for (zvdb::Attribute* a : ref->attributes())
+                campos << QString::fromStdString(std::string(a->textValue()));
+            Linha linha{campos.join("|"), linhas.empty() ? QString() : linhas.back().regua};
+            const auto link = ref->xdata("KVR_ZV_LINK");
+            if (!link.empty()) {
+                const auto handle = QString::fromStdString(std::string(link[0].value));
+                auto* borne = dynamic_cast<zvdb::BlockReference*>(
+                    db->entityByHandle(handle.toULongLong(nullptr, 16)));
+                EXPECT_TRUE(borne) << handle.toStdString();
+                linha.regua.clear();
+                for (const char* tag : {"REGUA", "STRIP", "REGLETA"})
+                    if (zvdb::Attribute* a = borne ? borne->attribute(tag) : nullptr)
+                        linha.regua = QString::fromStdString(std::string(a->textValue()));
+            }
+            linhas.push_back(linha);
+        }
+        return linhas;
+    }
+
     static QTemporaryDir* pasta_;
 };
 
@@ -149,6 +190,75 @@ TEST_F(TerminalListTest, StripPickerAnsweredKeepsItsStripsAndCancelledListsNothi
     const QStringList x1 = linhas(pasta_->filePath("l6.dxf"));
     EXPECT_FALSE(x1.isEmpty());
     EXPECT_LT(x1.size(), rows.size());
+}
+
+TEST_F(TerminalListTest, InvertedTerminalsSwapTheirSidesOnTheRowsAndNothingElse) {
+    // The same project with the flag of every drawn terminal turned over.
+    auto db = zvdb::DxfLoader::loadFile(pasta_->filePath("p.dxf").toStdString());
+    ASSERT_TRUE(db);
+    int virados = 0;
+    for (zvdb::Entity* e : db->modelSpace()->entities()) {
+        auto* ref = dynamic_cast<zvdb::BlockReference*>(e);
+        zvdb::Attribute* flag = ref ? ref->attribute("INVERTIDO") : nullptr;
+        if (!flag) continue;
+        flag->setTextValue(flag->textValue() == "S" ? "N" : "S");
+        ++virados;
+    }
+    ASSERT_GT(virados, 50);
+    zvdb::DxfWriter::saveFile(*db, pasta_->filePath("inv.dxf").toStdString());
+    ASSERT_EQ(lista(pasta_->filePath("p.dxf"), pasta_->filePath("l8.dxf")).status, 0);
+    const Resultado r = lista(pasta_->filePath("inv.dxf"), pasta_->filePath("l9.dxf"));
+    ASSERT_EQ(r.status, 0) << r.err.toStdString();
+
+    // Row cells: number, element and wire of the first side, wire and element of the other
+    // side, key, and "inv" for an inverted terminal.
+    const QStringList antes = linhas(pasta_->filePath("l8.dxf"));
+    QStringList esperado;
+    int lados = 0, invertidos = 0;
+    for (const QString& linha : antes) {
+        QStringList c = linha.split('|');
+        ASSERT_EQ(c.size(), 7) << linha.toStdString();
+        if (c[1] != c[4] || c[2] != c[3]) ++lados;
+        if (c[6] == "inv") ++invertidos;
+        std::swap(c[1], c[4]);
+        std::swap(c[2], c[3]);
+        if (!c[5].isEmpty()) c[6] = c[6] == "inv" ? "" : "inv";  // blank rows have no key
+        esperado << c.join('|');
+    }
+    EXPECT_GT(lados, antes.size() / 2);
+    EXPECT_GT(invertidos, 0);
+    EXPECT_EQ(linhas(pasta_->filePath("l9.dxf")), esperado);
+}
+
+TEST_F(TerminalListTest, AFilterExpressionKeepsOnlyTheTerminalsItAccepts) {
+    // One column, so that each row links back to its terminal.
+    const QStringList todos = modelo("uma-coluna.grt", "(setq *COLUNA_SN* nil)");
+    // Strips X0 and X2, tagged in any language.
+    const QStringList filtrado = modelo("filtro.grt", R"LSP((setq *COLUNA_SN* nil)
+(setq *FILTRO_TEMPLATE* "(member (cond ((cdr (assoc \"REGUA\" reg)))
+                                       ((cdr (assoc \"STRIP\" reg)))
+                                       ((cdr (assoc \"REGLETA\" reg))))
+                                 '(\"X0\" \"X2\"))"))LSP");
+    Resultado r = lista(pasta_->filePath("p.dxf"), pasta_->filePath("l10.dxf"), todos);
+    ASSERT_EQ(r.status, 0) << r.err.toStdString();
+    r = lista(pasta_->filePath("p.dxf"), pasta_->filePath("l11.dxf"), filtrado);
+    ASSERT_EQ(r.status, 0) << r.err.toStdString();
+
+    const std::vector<Linha> completa = linhasComRegua(pasta_->filePath("l10.dxf"));
+    QStringList esperado;
+    QSet<QString> reguas;
+    for (const Linha& linha : completa) {
+        reguas.insert(linha.regua);
+        if (linha.regua == "X0" || linha.regua == "X2") esperado << linha.texto;
+    }
+    ASSERT_TRUE(reguas.contains("X0") && reguas.contains("X1") && reguas.contains("X2"));
+    ASSERT_FALSE(esperado.isEmpty());
+    QStringList obtido;
+    for (const Linha& linha : linhasComRegua(pasta_->filePath("l11.dxf"))) {
+        EXPECT_TRUE(linha.regua == "X0" || linha.regua == "X2") << linha.regua.toStdString();
+        obtido << linha.texto;
+    }
+    EXPECT_EQ(obtido, esperado);
 }
 
 }  // namespace
