@@ -8,10 +8,14 @@
 #include "drawing/Database.h"
 #include "drawing/DxfLoader.h"
 #include "drawing/DxfWriter.h"
+#include "drawing/PythonChecker.h"
 
 #include <gtest/gtest.h>
 
 #include <QDir>
+#include <QJsonArray>
+#include <QJsonDocument>
+#include <QJsonObject>
 #include <QProcess>
 #include <QSet>
 #include <QTemporaryDir>
@@ -259,6 +263,30 @@ TEST_F(TerminalListTest, AFilterExpressionKeepsOnlyTheTerminalsItAccepts) {
         obtido << linha.texto;
     }
     EXPECT_EQ(obtido, esperado);
+}
+
+TEST_F(TerminalListTest, TheListedDrawingPassesTheAuditOfAnotherReader) {
+    const QString faltando = zvtest::PythonChecker::missing();
+    if (!faltando.isEmpty()) GTEST_SKIP() << faltando.toStdString();
+    ASSERT_EQ(lista(pasta_->filePath("p.dxf"), pasta_->filePath("l12.dxf")).status, 0);
+    QString saida;
+    ASSERT_EQ(zvtest::PythonChecker::run("../drawing/inspect_dxf.py", {pasta_->filePath("l12.dxf")},
+                                         &saida),
+              0)
+        << saida.toStdString();
+    // ezdxf sees the same rows, with the same texts, as the drawing reader.
+    const QJsonObject visto = QJsonDocument::fromJson(saida.toUtf8()).object();
+    QStringList linhasEzdxf;
+    for (const QJsonValue& e : visto.value("modelspace").toArray()) {
+        const QJsonObject o = e.toObject();
+        if (!o.value("name").toString().startsWith("BLK_CTR_LST_DET_BORN")) continue;
+        QStringList campos;
+        for (const QJsonValue& a : o.value("attribs").toArray())
+            campos << a.toArray().at(1).toString();
+        linhasEzdxf << o.value("layer").toString() + " " + campos.join('|');
+    }
+    EXPECT_EQ(linhasEzdxf, linhas(pasta_->filePath("l12.dxf")));
+    EXPECT_TRUE(visto.value("layers").toObject().contains("LISTAS$0001$A"));
 }
 
 }  // namespace
