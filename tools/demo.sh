@@ -24,5 +24,5 @@ cp -r "$ROOT/data/templates" "$ROOT/data/config" "$PRODUCT/"
 export ZV_PRODUCT_DIR="$PRODUCT/"
 echo "== zvhost: the demo project, the module loaded, the terminal list command"
 "$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$OUT/demo.dxf" \
-    -o "$OUT/demo-listas.dxf" gerarListaBornesGrf
+    -o "$OUT/terminal-list.dxf" gerarListaBornesGrf
 echo "== results in $OUT"
