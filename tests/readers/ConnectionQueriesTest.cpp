@@ -7,21 +7,11 @@
 #include "drawing/Polyline.h"
 #include "readers/CCDataReader.h"
 #include "readers/CEAtributo.h"
+#include "readers/LeitorBase.h"
 #include "readers/ZVString.h"
 #include "sample/XDataItems.h"
 
 namespace {
-
-// A reader with no list of its own: only the base's services are asked.
-class LeitorBase : public CCDataReader {
-public:
-    void LerLadoIni(CEItemLista&, const OdDbObjectId&, CETemplate&) override {}
-    void LerLadoFim(CEItemLista&, const OdDbObjectId&, CETemplate&) override {}
-    VetorItens* LerDados(zvdb::Database*, const std::optional<QStringList>&, CETemplate&,
-                         CIProgress&) override {
-        return nullptr;
-    }
-};
 
 const std::string kPagina = "ESQ$0001$A";
 
