@@ -2,6 +2,7 @@
 // criarpagina, apagargrupo, atualizarpaginas, Descongela_as_layers_da_pagina,
 // AtualizaModemacro.
 #include "LispHelpers.h"
+#include "PageAppender.h"
 #include "PageRegistry.h"
 #include "ProductLisp.h"
 
@@ -18,6 +19,7 @@
 #include <QDir>
 #include <QFileInfo>
 
+#include <memory>
 #include <unordered_set>
 
 namespace zvproduct {
@@ -34,12 +36,6 @@ zvdb::Database& databaseOf(Interpreter& lisp, const ProductContext& context) {
     zvdb::Database* database = context.database ? context.database() : nullptr;
     if (!database) lisp.fail("no drawing");
     return *database;
-}
-
-int pageNumber(const std::string& layer) {
-    const auto first = layer.find('$');
-    if (first == std::string::npos) return 0;
-    return std::atoi(layer.c_str() + first + 1);
 }
 
 void ensureLayer(zvdb::Database& database, const std::string& name) {
@@ -76,23 +72,14 @@ void addCompanions(Interpreter& lisp, zvdb::Database& database, const std::strin
         database.modelSpace()->addBlockReference(*frame, {}, {1, 1, 1}, 0, frameLayer);
 }
 
-std::string createPage(Interpreter& lisp, zvdb::Database& database, const std::string& group) {
-    PageRegistry registry(database);
-    PageGroup& entry = registry.addGroup(group);
-    int number = 0;
-    for (const std::string& page : entry.pages)
-        number = std::max(number, pageNumber(page));
-    std::string name = PageRegistry::pageName(group, number + 1);
-    while (database.layer(name))
-        name = PageRegistry::pageName(group, ++number + 1);
-    database.createLayer(name);
-    entry.pages.push_back(name);
-    registry.save(entry);
+std::string createPage(Interpreter& lisp, zvdb::Database& database, PageAppender& pages,
+                       const std::string& group) {
+    const PageAppender::Page page = pages.append(database, group);
     addCompanions(lisp, database, group);
-    const std::string running = std::to_string(registry.pageIndex(name) + 1);
-    database.modelSpace()->addText({395, 14, 0}, 2.5, running, name);
-    database.setCurrentLayer(name);
-    return name;
+    database.modelSpace()->addText({395, 14, 0}, 2.5, std::to_string(page.running), page.name);
+    database.setCurrentLayer(page.name);
+    pages.settle(database);
+    return page.name;
 }
 
 void eraseGroup(zvdb::Database& database, const std::string& group) {
@@ -155,6 +142,7 @@ Value structuredPages(const PageRegistry& registry) {
 }  // namespace
 
 void installPageFunctions(Interpreter& lisp, const ProductContext& context) {
+    const auto pages = std::make_shared<PageAppender>();
     lisp.define(
         "buscaListaGrupos",
         [context](Interpreter& in, Args) {
@@ -182,15 +170,16 @@ void installPageFunctions(Interpreter& lisp, const ProductContext& context) {
         0, 0);
     lisp.define(
         "criarpagina",
-        [context](Interpreter& in, Args a) {
+        [context, pages](Interpreter& in, Args a) {
             const std::string group = PageRegistry::groupOf(stdText(in, a[0]));
             if (group.empty()) in.fail("criarpagina: no group in \"" + in.toStr(a[0]) + "\"");
-            return lispText(createPage(in, databaseOf(in, context), group));
+            return lispText(createPage(in, databaseOf(in, context), *pages, group));
         },
         1, 2);
     lisp.define(
         "apagargrupo",
-        [context](Interpreter& in, Args a) {
+        [context, pages](Interpreter& in, Args a) {
+            pages->forget();
             eraseGroup(databaseOf(in, context), PageRegistry::groupOf(stdText(in, a[0])));
             return Value();
         },

@@ -73,6 +73,17 @@ void PageRegistry::save(const PageGroup& group) {
     registry->getOrCreateXRecord(group.name)->setData(data);
 }
 
+void PageRegistry::appendPage(PageGroup& group, const std::string& page) {
+    group.pages.push_back(page);
+    zvdb::Dictionary* registry = database_.dictionaryAt(kRegistry, false);
+    zvdb::XRecord* record = registry ? registry->getXRecord(group.name) : nullptr;
+    if (!record) return save(group);
+    const std::size_t end = record->xdataStart();
+    std::vector<zvdb::Tag>& tags = record->editTags();
+    tags.insert(tags.begin() + static_cast<std::ptrdiff_t>(end),
+                zvdb::Tag{8, database_.store(page)});
+}
+
 PageGroup& PageRegistry::addGroup(const std::string& name) {
     if (PageGroup* existing = group(name)) return *existing;
     PageGroup group;

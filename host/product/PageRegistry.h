@@ -30,6 +30,8 @@ public:
 
     // Writes one group's Xrecord back (made, and appended, when new).
     void save(const PageGroup& group);
+    // Adds a page at the end of a group and of its Xrecord, the other pages left as stored.
+    void appendPage(PageGroup& group, const std::string& page);
     PageGroup& addGroup(const std::string& name);
     void removeGroup(const std::string& name);
 

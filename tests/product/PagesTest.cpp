@@ -1,5 +1,6 @@
 // Pages and groups: lists, creation and deletion, kept through a DXF round trip.
 #include "ProductFixture.h"
+#include "QtPrinters.h"
 
 #include "drawing/DxfLoader.h"
 #include "drawing/DxfWriter.h"
@@ -60,6 +61,37 @@ TEST_F(PagesTest, NewGroupGetsTheSheetFrameOfTheProductData) {
     run("(criarpagina \"NOVO\" 0)");  // one frame per group
     ASSERT_NE(database->block("FORMATO_A3"), nullptr);
     EXPECT_EQ(database->block("FORMATO_A3")->entityCount(), 1u);
+}
+
+TEST_F(PagesTest, PagesMadeInARowCountOnAndSeeTheRegistryChangedBetweenThem) {
+    // The running number each page shows at its corner, by page.
+    auto numeros = [this] {
+        QStringList texts;
+        for (zvdb::Entity* entity : database->modelSpace()->entities())
+            if (entity->isType("TEXT") && entity->layer().starts_with("LISTAS$"))
+                texts << QString::fromStdString(std::string(entity->layer()) + "=" +
+                                                std::string(entity->text(1)));
+        return texts;
+    };
+    for (int i = 0; i < 3; ++i)
+        run("(criarpagina \"LISTAS\" 0)");
+    EXPECT_EQ(numeros(), QStringList({"LISTAS$0001$A=4", "LISTAS$0002$A=5", "LISTAS$0003$A=6"}));
+    // A group rewritten between two calls, with no new object: one page fewer before.
+    addGroup("ESQ", 4, {"ESQ$0001$A"});
+    EXPECT_EQ(show("(criarpagina \"LISTAS\" 0)"), "\"LISTAS$0004$A\"");
+    EXPECT_EQ(numeros().last(), "LISTAS$0004$A=6");
+    // Another group's next page follows its highest number, and shifts the lists.
+    addGroup("ESQ", 4, {"ESQ$0001$A", "ESQ$0007$A"});
+    EXPECT_EQ(show("(criarpagina \"ESQ\" 0)"), "\"ESQ$0008$A\"");
+    EXPECT_EQ(show("(criarpagina \"LISTAS\" 0)"), "\"LISTAS$0005$A\"");
+    EXPECT_EQ(numeros().last(), "LISTAS$0005$A=9");
+    // A group erased and made again starts from 1.
+    run("(apagargrupo \"LISTAS\")");
+    EXPECT_EQ(show("(criarpagina \"LISTAS\" 0)"), "\"LISTAS$0001$A\"");
+    EXPECT_EQ(show("(buscalistapaginas T)"),
+              "((\"CAPA\" \"CAPA$0001$A\") (\"ESQ\" \"ESQ$0001$A\" \"ESQ$0007$A\" "
+              "\"ESQ$0008$A\") (\"LISTAS\" \"LISTAS$0001$A\"))");
+    EXPECT_EQ(numeros(), QStringList({"LISTAS$0001$A=5"}));
 }
 
 TEST_F(PagesTest, ErasedGroupTakesItsPagesEntitiesAndLayers) {
