@@ -141,6 +141,7 @@ bool CCBorneDataReader::Aceita(CEItemLista* item, CETemplate& modelo, VetorItens
         delete item;
         return false;
     }
+    PartilhaNomes(*item);
     itens.push_back(item);
     RegistraNumero(*item);
     return true;

@@ -100,6 +100,8 @@ public:
 
 protected:
     CECacheCatalogo& Catalogo() { return catalogo_; }
+    // An item kept for the list shares its field names with the items kept before it.
+    void PartilhaNomes(CEItemLista& item) { item.partilharNomes(nomesCampos_); }
     double Tolerancia() const { return tolerancia_; }
 
 private:
@@ -130,6 +132,7 @@ private:
     std::vector<Rota> rotas_;
     bool rotasLidas_ = false;
     QHash<QString, QHash<QString, QString>> caminhos_;
+    QSet<QString> nomesCampos_;
     CECacheCatalogo catalogo_;
     double tolerancia_;
 };

@@ -28,6 +28,17 @@ void CEItemLista::copiarCamposComSufixo(const CEItemLista& origem, const QString
         campos.insert(it.key() + "_" + sufixo, it.value());
 }
 
+void CEItemLista::partilharNomes(QSet<QString>& nomes) {
+    QHash<QString, QString> partilhados;
+    partilhados.reserve(campos.size());
+    for (auto it = campos.constBegin(); it != campos.constEnd(); ++it) {
+        auto nome = nomes.constFind(it.key());
+        if (nome == nomes.constEnd()) nome = nomes.insert(it.key());
+        partilhados.insert(*nome, it.value());
+    }
+    campos.swap(partilhados);
+}
+
 void CEItemLista::paraLisp() const {
     // The texts are not copied: the host builds `reg` straight from them.
     std::vector<zvsdk::StringPair> pares;

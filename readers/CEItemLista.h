@@ -4,6 +4,7 @@
 #include "cad/OdDbObjectId.h"
 
 #include <QHash>
+#include <QSet>
 
 #include <vector>
 
@@ -27,6 +28,9 @@ public:
     void copiarCampos(const CEItemLista& origem);
     // Each source field under "key_suffix"; an empty suffix keeps the keys.
     void copiarCamposComSufixo(const CEItemLista& origem, const QString& sufixo);
+    // Makes the field names share one copy of each name with the other items of a run, the
+    // names put in `nomes`: a large list holds millions of fields under a few hundred names.
+    void partilharNomes(QSet<QString>& nomes);
     // Publishes the item to LISP: `reg` the fields as an association list, `ename` the
     // first object (left as it was when the item has none).
     void paraLisp() const;

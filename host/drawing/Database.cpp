@@ -246,6 +246,12 @@ std::vector<DbObject*> Database::objects() const {
 
 // Entities ---------------------------------------------------------------------------------
 
+namespace {
+// Room for the few tags (rotation, colour, linetype, alignment point) that callers set right
+// after making an entity, so that setting them does not double the entity's tag storage.
+constexpr std::size_t kSettersSlack = 4;
+}  // namespace
+
 std::vector<Tag> Database::entityHead(std::string_view type, std::uint64_t handle,
                                       std::uint64_t owner, std::string_view layer,
                                       bool paperSpace) {
@@ -260,10 +266,11 @@ Entity* Database::addEntity(BlockRecord& block, std::string_view type, const std
                             std::string_view layer) {
     std::vector<Tag> tags =
         entityHead(type, allocateHandle(), block.handle(), layer, block.isPaperSpace());
+    tags.reserve(tags.size() + body.size() + kSettersSlack);
     for (const Tag& tag : body)
         tags.push_back(Tag{tag.code, store(tag.value)});
     auto* entity = static_cast<Entity*>(
-        adopt(DxfLoader::makeOwnedObject(*this, tags, DxfLoader::Context::Entity)));
+        adopt(DxfLoader::makeOwnedObject(*this, std::move(tags), DxfLoader::Context::Entity)));
     block.appendEntity(entity);
     return entity;
 }
@@ -282,11 +289,12 @@ Attribute* Database::addAttribute(BlockReference& reference, const std::vector<T
                                   std::string_view layer) {
     std::vector<Tag> tags =
         entityHead("ATTRIB", allocateHandle(), reference.handle(), layer, reference.inPaperSpace());
+    tags.reserve(tags.size() + 1 + body.size() + kSettersSlack);
     tags.push_back(Tag{100, "AcDbText"});
     for (const Tag& tag : body)
         tags.push_back(Tag{tag.code, store(tag.value)});
     auto* attribute = static_cast<Attribute*>(
-        adopt(DxfLoader::makeOwnedObject(*this, tags, DxfLoader::Context::Entity)));
+        adopt(DxfLoader::makeOwnedObject(*this, std::move(tags), DxfLoader::Context::Entity)));
     reference.addSubEntity(attribute);
     if (reference.integer(66) != 1) reference.setInteger(66, 1, "AcDbBlockReference");
     ensureSeqend(reference);

@@ -16,6 +16,12 @@
 
 namespace zvdb {
 
+namespace {
+// A file save hands the text over in chunks of this size, so the whole text never stands
+// in memory beside the drawing.
+constexpr std::size_t kChunk = 1 << 20;
+}  // namespace
+
 std::string DxfWriter::toText(Database& database) {
     DxfWriter writer(database);
     writer.prepare();
@@ -24,13 +30,16 @@ std::string DxfWriter::toText(Database& database) {
 }
 
 void DxfWriter::saveFile(Database& database, const std::string& path) {
-    const std::string text = toText(database);
     QSaveFile file(QString::fromStdString(path));
     if (!file.open(QIODevice::WriteOnly))
         throw DxfError(path + ": cannot be written: " + file.errorString().toStdString());
-    if (file.write(text.data(), static_cast<qint64>(text.size())) !=
-            static_cast<qint64>(text.size()) ||
-        !file.commit())
+    DxfWriter writer(database);
+    writer.sink_ = &file;
+    writer.prepare();
+    writer.write();
+    writer.flush();
+    // A failed write leaves the file as it was: the temporary file goes with `file`.
+    if (file.error() != QFileDevice::NoError || !file.commit())
         throw DxfError(path + ": cannot be written: " + file.errorString().toStdString());
 }
 
@@ -80,10 +89,18 @@ void DxfWriter::tag(int code, std::string_view value) {
         out_.append(value);
     }
     out_ += '\n';
+    if (sink_ && out_.size() >= kChunk) flush();
+}
+
+void DxfWriter::flush() {
+    // Once the device has failed it keeps its error for the commit to report.
+    if (sink_ && !out_.empty() && sink_->isOpen())
+        sink_->write(out_.data(), static_cast<qint64>(out_.size()));
+    out_.clear();
 }
 
 void DxfWriter::write() {
-    out_.reserve(db_.arena_.bytesUsed() + 1024 * 1024);
+    out_.reserve(sink_ ? kChunk + 64 * 1024 : db_.arena_.bytesUsed() + 1024 * 1024);
     std::vector<std::string> order = db_.sectionOrder_;
     for (const char* name : {"HEADER", "CLASSES", "TABLES", "BLOCKS", "ENTITIES", "OBJECTS"}) {
         bool present = false;

@@ -7,6 +7,8 @@
 
 #include "Tag.h"
 
+class QIODevice;
+
 namespace zvdb {
 
 class Database;
@@ -30,10 +32,13 @@ private:
     void writeObject(const class DbObject& object);
     void writeEntity(const class Entity& entity);
     void tag(int code, std::string_view value);
+    void flush();
     bool isErasedObject(const Tag& pointer) const;
 
     Database& db_;
     std::string out_;
+    // Where a file save streams its text; out_ then holds one chunk at a time.
+    QIODevice* sink_ = nullptr;
     bool legacyEncoding_ = false;
     std::string codePage_;
 };

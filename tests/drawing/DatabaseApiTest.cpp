@@ -18,6 +18,7 @@
 
 #include <gtest/gtest.h>
 
+#include <QFile>
 #include <QJsonArray>
 #include <QJsonDocument>
 #include <QJsonObject>
@@ -465,6 +466,23 @@ TEST_F(DatabaseApi, OldVersionsAreWrittenInTheirCodePage) {
     // ezdxf leaves the escape as it stands in TEXT
     EXPECT_EQ(seen["modelspace"].toArray()[0].toObject()["text"].toString(),
               QString("Ação \\U+03A9"));
+}
+
+// A file save hands the text over in pieces: a drawing of several megabytes, with texts in
+// the code page of an old version, is the same file as the text written in one piece.
+TEST_F(DatabaseApi, ALargeDrawingIsSavedAsTheSameTextInPieces) {
+    db.setVersion("AC1015");
+    for (int i = 0; i < 40000; ++i)
+        db.modelSpace()->addText({double(i), 0, 0}, 1, "Ação " + std::to_string(i));
+    const std::string text = DxfWriter::toText(db);
+    ASSERT_GT(text.size(), 4u << 20);
+    const QString path = PythonChecker::scratchFolder() + "/large.dxf";
+    DxfWriter::saveFile(db, path.toStdString());
+    QFile file(path);
+    ASSERT_TRUE(file.open(QIODevice::ReadOnly));
+    const QByteArray saved = file.readAll();
+    EXPECT_EQ(saved.size(), qsizetype(text.size()));
+    EXPECT_TRUE(saved == QByteArray::fromRawData(text.data(), qsizetype(text.size())));
 }
 
 }  // namespace

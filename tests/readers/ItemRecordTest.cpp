@@ -111,6 +111,26 @@ TEST(ItemRecordTest, CopiesOverwriteAndSuffixGetsItsUnderscore) {
     EXPECT_TRUE(nomes.contains("TAG_FIM "));
 }
 
+// Items of one run keep one copy of each field name; their fields stay as they were.
+TEST(ItemRecordTest, ItemsOfARunShareTheirFieldNames) {
+    QSet<QString> nomes;
+    CEItemLista a, b;
+    for (CEItemLista* item : {&a, &b}) {
+        item->definirCampo(QString("NUMERO") + "_FIM", item == &a ? "1" : "2");
+        item->definirCampo(QString("REGUA"), "X1");
+        item->partilharNomes(nomes);
+    }
+    EXPECT_EQ(nomes.size(), 2);
+    EXPECT_EQ(a.valorCampo("NUMERO_FIM"), "1");
+    EXPECT_EQ(b.valorCampo("NUMERO_FIM"), "2");
+    EXPECT_EQ(b.campos.size(), 2);
+    auto nome = [](const CEItemLista& item, const QString& chave) {
+        return item.campos.find(chave).key().constData();
+    };
+    EXPECT_EQ(nome(a, "NUMERO_FIM"), nome(b, "NUMERO_FIM"));
+    EXPECT_EQ(nome(a, "REGUA"), nome(b, "REGUA"));
+}
+
 TEST(OrderingTest, NumbersSortNaturallyAndLeadingZerosTieOnRawText) {
     Itens itens;
     VetorItens v{itens.novo({{"N", "10"}}), itens.novo({{"N", "2"}}), itens.novo({{"N", "1"}}),
