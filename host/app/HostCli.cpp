@@ -4,6 +4,7 @@
 #include "ConsoleUserInterface.h"
 #include "DrawingFiles.h"
 #include "HostDocument.h"
+#include "HugePages.h"
 #include "drawing/Database.h"
 #include "sdk/LispInterface.h"
 
@@ -148,6 +149,7 @@ bool runLisp(HostDocument& document, const Options& options, QTextStream& err) {
 }
 
 int runDrawing(const Options& options, QTextStream& out, QTextStream& err) {
+    restartWithHugePages(options.drawing);
     const bool terminal = !options.quiet && isatty(STDOUT_FILENO);
     auto ui = std::make_unique<ConsoleUserInterface>(out, err, terminal);
     for (const QString& answer : options.answers)
