@@ -38,13 +38,15 @@ double tolerance(Interpreter& lisp) {
 }
 
 Value loadTemplate(Interpreter& lisp, const ProductContext& context, const QString& path) {
+    // The module names files the way the product always has, with backslashes between folders.
+    const QString file = zvlisp::LispFile::find(path, {});
     QString text;
-    if (!QFileInfo(path).isFile() || !zvlisp::LispFile::readText(path, &text)) {
+    if (!QFileInfo(file).isFile() || !zvlisp::LispFile::readText(file, &text)) {
         print(context, "\n; error: template not found: " + path + "\n");
         return Value();
     }
     QString message;
-    const Value result = lisp.catching([&] { return lisp.evalText(text, path); }, &message);
+    const Value result = lisp.catching([&] { return lisp.evalText(text, file); }, &message);
     if (!message.isEmpty()) {
         print(context, "\n; error: " + message + "\n; in template " + path + "\n");
         return Value();

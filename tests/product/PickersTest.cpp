@@ -53,6 +53,12 @@ TEST_F(PickersTest, TemplateLoadsOrReportsItsError) {
     }
     EXPECT_EQ(show("(ZVCarregaTemplate \"" + good + "\")"), "T");
     EXPECT_EQ(show("(list *LINHAS_PAGINA* *CAB*)"), "(30 \"LST_BORNE_CAB\")");
+    show("(setq *LINHAS_PAGINA* nil)");
+    QString windowsStyle = good;
+    windowsStyle.replace('/', "\\\\");
+    EXPECT_EQ(show("(ZVCarregaTemplate \"" + windowsStyle + "\")"), "T")
+        << "folders parted by backslashes, as the module names files";
+    EXPECT_EQ(show("*LINHAS_PAGINA*"), "30");
     EXPECT_EQ(show("(ZVCarregaTemplate \"" + bad + "\")"), "nil");
     EXPECT_TRUE(printed.contains("; error:")) << printed.toStdString();
     EXPECT_TRUE(printed.contains("bad.grt")) << printed.toStdString();
