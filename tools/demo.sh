@@ -19,7 +19,7 @@ PRODUCT="$OUT/produto"
 rm -rf "$PRODUCT"
 mkdir -p "$PRODUCT"
 cp -r "$ROOT/data/templates" "$ROOT/data/config" "$PRODUCT/"
-"$BIN/zvhost" generate --out "$OUT/demo.dxf" --seed 1 --terminals 120 --pages 10 \
+"$BIN/zvhost" generate --out "$OUT/demo.dxf" --seed 1 --terminals 120 --pages 10 --numbers project \
     --data "$PRODUCT"
 export ZV_PRODUCT_DIR="$PRODUCT/"
 echo "== zvhost: the demo project, the module loaded, the terminal list command"

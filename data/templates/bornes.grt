@@ -16,11 +16,12 @@
 (setq *Y_INIC_LISTA* 262.0)
 (setq *ESPACO_HORIZONTAL* 180.0)
 
-;; Breaks: a new page at a change of strip, and at a change of page group of the terminal.
+;; Breaks: a new page at a change of strip. No break key: a page group as key would break the
+;; page at every blank row of a gap, which has no group.
 (setq *QUEBRA_PAGINA* nil)
 (setq *LINHAS_ESPACO* 2)
 (setq *PREENCHE_ATE_FINAL* nil)
-(setq *ZV_CHAVE_QUEBRA_PAGINA* '("GRUPO"))
+(setq *ZV_CHAVE_QUEBRA_PAGINA* nil)
 
 ;; Reading: sort by strip and number in the three tag languages, rising, gaps left as they are.
 (setq *LISTA_DE_SORT* '("REGUA" "STRIP" "REGLETA" "NUMERO" "NUMBER"))

@@ -12,7 +12,8 @@ namespace zvhost {
 namespace {
 
 const char* const kGenerateUsage =
-    "usage: zvhost generate --out FILE.dxf [--seed N] [--terminals N] [--pages N] [--data DIR]\n"
+    "usage: zvhost generate --out FILE.dxf [--seed N] [--terminals N] [--pages N]\n"
+    "                       [--numbers strip|project] [--data DIR]\n"
     "       zvhost generate --blocks DIR\n";
 
 struct GenerateOptions {
@@ -49,6 +50,9 @@ QString parse(const QStringList& args, GenerateOptions& options) {
         } else if (arg == "--pages") {
             if (!number(value, 1, n) || n > 1'000'000) return "--pages needs 1 to 1000000";
             options.generator.pages = static_cast<int>(n);
+        } else if (arg == "--numbers") {
+            if (value != "strip" && value != "project") return "--numbers needs strip or project";
+            options.generator.projectNumbers = value == "project";
         } else {
             return "unknown option " + arg;
         }

@@ -110,7 +110,7 @@ const char* const kContactBlocks[] = {"NA-CONTATO", "NA-CONTATO", "NF-CONTATO", 
 class ProjectGenerator::Impl {
 public:
     explicit Impl(const GeneratorOptions& options)
-        : options_(options), random_(options.seed), planner_(random_, "X", 1) {}
+        : options_(options), random_(options.seed), planner_(random_, "X", 1, projectNumbers()) {}
 
     std::unique_ptr<zvdb::Database> run();
     GeneratedCounts counts;
@@ -166,6 +166,9 @@ private:
 
     GeneratorOptions options_;
     SampleRandom random_;
+    // The next terminal number of the project, when numbers run on through it.
+    int nextNumber_ = 1;
+    int* projectNumbers() { return options_.projectNumbers ? &nextNumber_ : nullptr; }
     StripPlanner planner_;
     std::unique_ptr<zvdb::Database> db_;
     std::unique_ptr<SymbolLibrary> symbols_;
@@ -572,7 +575,7 @@ void ProjectGenerator::Impl::drawPowerPage() {
     std::vector<std::size_t> coils;
     for (std::size_t k = 0; k < masters_.size() && coils.size() < 2; ++k)
         if (masters_[k].key == "2001" || masters_[k].key == "2005") coils.push_back(k);
-    StripPlanner powerStrip(random_, "X", 0);
+    StripPlanner powerStrip(random_, "X", 0, projectNumbers());
     for (int m = 0; m < motors; ++m) {
         // A copy: drawing the circuit adds masters and moves the vector.
         const std::string contactor =
@@ -667,7 +670,8 @@ void ProjectGenerator::Impl::addVirtualObjects(int virtualTerminals) {
         setXData(*record, "KVR_ZV", XDataItems().text(keyText("1001", "1")));
         XDataItems fields;
         fields.text(std::string(tags.strip) + kSep + "XV" + kSep + "N");
-        fields.text(std::string(tags.number) + kSep + std::to_string(n) + kSep + "N");
+        const int number = options_.projectNumbers ? nextNumber_++ : n;
+        fields.text(std::string(tags.number) + kSep + std::to_string(number) + kSep + "N");
         fields.text(std::string("JUMPER") + kSep + kSep + "N");
         setXData(*record, "KVR_ZV_ATT_VIRTUAL", fields);
     }

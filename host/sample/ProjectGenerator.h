@@ -17,6 +17,9 @@ struct GeneratorOptions {
     std::uint64_t seed = 1;
     int terminals = 120;  // all terminals: drawn, BOR- and virtual ones
     int pages = 10;       // at least; more when the terminals need them
+    // Terminal numbers run on through the project instead of starting again on each strip,
+    // so that no number stands twice and the terminal list links the jumpers.
+    bool projectNumbers = false;
 };
 
 // What a generated project holds.

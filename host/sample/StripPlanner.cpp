@@ -38,13 +38,18 @@ const TagSet& tagSet(int language) {
     return kTagSets[language >= 0 && language < 3 ? language : 0];
 }
 
-StripPlanner::StripPlanner(SampleRandom& random, std::string prefix, int firstStrip)
-    : random_(random), prefix_(std::move(prefix)), stripIndex_(firstStrip - 1) {}
+StripPlanner::StripPlanner(SampleRandom& random, std::string prefix, int firstStrip,
+                           int* projectNext)
+    : random_(random),
+      prefix_(std::move(prefix)),
+      stripIndex_(firstStrip - 1),
+      projectNext_(projectNext) {}
 
 void StripPlanner::startStrip() {
     ++stripIndex_;
     left_ = random_.between(12, 40);
     next_ = random_.chance(15) ? random_.between(2, 9) : 1;
+    if (projectNext_) next_ += *projectNext_ - 1;
     jumperLeft_ = 0;
     stripName_.assign(prefix_).append(std::to_string(stripIndex_));
 }
@@ -61,6 +66,7 @@ std::vector<PlannedTerminal> StripPlanner::plan(int count) {
         t.strip = stripName_;
         if (jumperLeft_ == 0 && random_.chance(4)) next_ += random_.between(1, 2);  // a gap
         t.number = next_++;
+        if (projectNext_) *projectNext_ = next_;
         if (jumperLeft_ == 0 && left_ >= 3 && count - i >= 3 && random_.chance(12)) {
             groupFirst = t.number;
             groupSize = random_.between(2, 3);

@@ -28,7 +28,10 @@ struct PlannedTerminal {
 
 class StripPlanner {
 public:
-    StripPlanner(SampleRandom& random, std::string prefix, int firstStrip);
+    // With `projectNext`, numbers come from that counter, shared with other planners, instead
+    // of starting again on each strip; a strip that would start above 1 leaves a gap.
+    StripPlanner(SampleRandom& random, std::string prefix, int firstStrip,
+                 int* projectNext = nullptr);
     // The next `count` terminals, strips continuing where the last call stopped.
     std::vector<PlannedTerminal> plan(int count);
 
@@ -42,6 +45,7 @@ private:
     int left_ = 0;        // terminals left on the current strip
     int next_ = 1;        // next number on it
     int jumperLeft_ = 0;  // members of the current jumper group still to place
+    int* projectNext_;    // the project's next number, when numbers run on
 };
 
 }  // namespace zvsample

@@ -203,6 +203,46 @@ TEST(SampleTerminals, JumpersNameTerminalsOfTheSameStripWhateverTheSeed) {
     }
 }
 
+// Numbers that run on through the project: drawn and virtual terminals all differ, jumpers
+// still name terminals of their own strip, and the strips are those of the same seed
+// numbered strip by strip.
+TEST(SampleTerminals, ProjectNumbersStandOnceAndChangeNothingElse) {
+    zvsample::GeneratorOptions options{5, 400, 24};
+    options.projectNumbers = true;
+    zvsample::ProjectGenerator generator(options);
+    const auto db = generator.generate();
+    std::map<std::string, int> seen;
+    std::map<std::string, int> perStrip, perStripByStrip;
+    std::set<std::pair<std::string, std::string>> present;
+    int withJumper = 0;
+    for (const zvdb::BlockReference* t : terminals(*db)) {
+        ++seen[numberOf(*t)];
+        ++perStrip[stripOf(*t)];
+        present.insert({stripOf(*t), numberOf(*t)});
+    }
+    for (const zvdb::BlockReference* t : terminals(*db)) {
+        const std::string jumper = attributeValue(*t, "JUMPER");
+        if (jumper.empty()) continue;
+        ++withJumper;
+        const std::string first = jumper.substr(0, jumper.find(','));
+        EXPECT_TRUE(present.count({stripOf(*t), first})) << stripOf(*t) << " jumper " << jumper;
+    }
+    const auto* virtuals = db->namedObjects()->getDictionary("ESQ_VIRTUAL_ZV");
+    for (const auto& entry : virtuals->entries()) {
+        if (!startsWith(entry.name, "BORNE")) continue;
+        const auto items = xdataTexts(*virtuals->get(entry.name), "KVR_ZV_ATT_VIRTUAL");
+        ASSERT_GE(items.size(), 2u);
+        const std::string number = items[1].substr(items[1].find('\f') + 1);
+        ++seen[number.substr(0, number.find('\f'))];
+    }
+    EXPECT_GT(withJumper, 0);
+    for (const auto& [number, n] : seen)
+        EXPECT_EQ(n, 1) << "number " << number << " stands " << n << " times";
+    for (const zvdb::BlockReference* t : terminals(*demo().db))
+        ++perStripByStrip[stripOf(*t)];
+    EXPECT_EQ(perStrip, perStripByStrip);
+}
+
 TEST(SampleWires, EveryTerminalTouchesAWireOnItsPageAndWiresHaveCompleteKeys) {
     const zvdb::Database& db = *demo().db;
     std::map<std::string, std::vector<zvdb::Point3>> verticesByLayer;

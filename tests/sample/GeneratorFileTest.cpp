@@ -110,6 +110,7 @@ TEST(SampleFile, ZvhostGenerateRefusesBadOptionsAndLeavesNoFile) {
          {QStringList{"generate"}, QStringList{"generate", "--out", out, "--terminals", "-3"},
           QStringList{"generate", "--out", out, "--pages", "zero"},
           QStringList{"generate", "--out", out, "--colour", "red"},
+          QStringList{"generate", "--out", out, "--numbers", "page"},
           QStringList{"generate", "--out"}}) {
         const ProcessRun refused = run(kHost, bad);
         EXPECT_EQ(refused.status, 2) << bad.join(' ').toStdString();
