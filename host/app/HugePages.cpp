@@ -15,14 +15,12 @@ namespace {
 
 constexpr char kTunable[] = "glibc.malloc.hugetlb=1";
 
-// "always" or "madvise" (the choice in brackets); with "never" asking changes nothing.
+}  // namespace
+
 bool kernelOffersHugePages() {
     QFile mode("/sys/kernel/mm/transparent_hugepage/enabled");
-    if (!mode.open(QIODevice::ReadOnly)) return false;
-    return !mode.readAll().contains("[never]");
+    return mode.open(QIODevice::ReadOnly) && !mode.readAll().contains("[never]");
 }
-
-}  // namespace
 
 bool wantsHugePages(const QString& drawing) {
     const QByteArray asked = qgetenv("ZV_HUGE_PAGES");

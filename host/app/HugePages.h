@@ -16,6 +16,9 @@ namespace zvhost {
 
 inline constexpr qint64 kLargeDrawingBytes = 128LL * 1024 * 1024;
 
+// "always" or "madvise" (the choice in brackets); with "never" asking changes nothing.
+bool kernelOffersHugePages();
+
 // Whether a run on the drawing should restart with huge pages: asked for (or the drawing is
 // large), not yet in the tunables, and the kernel lets a program ask for them.
 bool wantsHugePages(const QString& drawing);

@@ -93,9 +93,9 @@ void DxfWriter::tag(int code, std::string_view value) {
 }
 
 void DxfWriter::flush() {
-    // Once the device has failed it keeps its error for the commit to report.
-    if (sink_ && !out_.empty() && sink_->isOpen())
-        sink_->write(out_.data(), static_cast<qint64>(out_.size()));
+    if (!sink_) return;
+    // A failed write leaves its error on the device for the commit to report.
+    sink_->write(out_.data(), static_cast<qint64>(out_.size()));
     out_.clear();
 }
 

@@ -11,15 +11,10 @@
 
 namespace {
 
-bool kernelOffersHugePages() {
-    QFile mode("/sys/kernel/mm/transparent_hugepage/enabled");
-    return mode.open(QIODevice::ReadOnly) && !mode.readAll().contains("[never]");
-}
-
 class HugePages : public ::testing::Test {
 protected:
     void SetUp() override {
-        if (!kernelOffersHugePages()) GTEST_SKIP() << "the kernel offers no huge pages";
+        if (!zvhost::kernelOffersHugePages()) GTEST_SKIP() << "the kernel offers no huge pages";
         qunsetenv("ZV_HUGE_PAGES");
         qunsetenv("GLIBC_TUNABLES");
         small = folder.filePath("small.dxf");
