@@ -1,6 +1,7 @@
 #include "CCDriverLista.h"
 
 #include "ExecutarLista.h"
+#include "ZVResultado.h"
 #include "cad/CICad.h"
 #include "lists/CCBorneGrfWriter.h"
 #include "lists/CETemplateLisp.h"
@@ -54,20 +55,35 @@ QString CCDriverLista::EscolherModelo(TipoLista tipo) {
 }
 
 void CCDriverLista::Executar(TipoLista tipo) {
+    if (!Disponivel(tipo)) return AvisaIndisponivel();
     const QString caminho = EscolherModelo(tipo);
-    if (caminho.isEmpty()) return;
-    if (tipo == TipoLista::Bornes) {
-        CCBorneDataReader leitor;
-        CCBorneGrfWriter escritor;
-        CETemplateLisp modelo(caminho);
-        ExecutarLista(leitor, escritor, modelo);
+    if (caminho.isEmpty()) {
+        ZVResultado::Cancelado();
         return;
     }
-    // The readers and writers of the other lists join the drivers here as they are built.
-    CICad::ImprimeMensagem(kMensagemIndisponivel);
+    CCBorneDataReader leitor;
+    CCBorneGrfWriter escritor;
+    CETemplateLisp modelo(caminho);
+    ExecutarLista(leitor, escritor, modelo);
 }
 
 void CCDriverLista::Exporta(const QString& tipo) {
     Q_UNUSED(tipo);
+    AvisaIndisponivel();
+}
+
+// The readers and writers of the other lists and of the exports join the drivers as they
+// are built.
+bool CCDriverLista::Disponivel(TipoLista tipo) {
+    return tipo == TipoLista::Bornes;
+}
+
+bool CCDriverLista::ExportacaoDisponivel(const QString& tipo) {
+    Q_UNUSED(tipo);
+    return false;
+}
+
+void CCDriverLista::AvisaIndisponivel() {
     CICad::ImprimeMensagem(kMensagemIndisponivel);
+    ZVResultado::Falhou();
 }

@@ -13,4 +13,9 @@ public:
     static void Executar(TipoLista tipo);
     // The export driver, by its type word.
     static void Exporta(const QString& tipo);
+    // Whether this edition has the list or export yet; a command without it prints
+    // AvisaIndisponivel's message and does nothing else.
+    static bool Disponivel(TipoLista tipo);
+    static bool ExportacaoDisponivel(const QString& tipo);
+    static void AvisaIndisponivel();
 };

@@ -2,6 +2,7 @@
 
 #include "CCDataWriter.h"
 #include "CIProgress.h"
+#include "ZVResultado.h"
 #include "cad/CICad.h"
 #include "host/sdk/Document.h"
 #include "host/sdk/SystemServices.h"
@@ -60,6 +61,7 @@ void ExecutarLista(CCDataReader& leitor, CCDataWriter& escritor, CETemplate& mod
                    const CESelecao* selecao) {
     if (!modelo.Carregar()) {
         CICad::ImprimeMensagem(88);
+        ZVResultado::Falhou();
         return;
     }
     auto progresso = std::make_unique<CIProgress>();
@@ -77,6 +79,7 @@ void ExecutarLista(CCDataReader& leitor, CCDataWriter& escritor, CETemplate& mod
         Escrever(escritor, itens, modelo);
     } catch (...) {
         // The writer stopped the run: nothing leaks, and there is no end message.
+        ZVResultado::Falhou();
         itens.destruirItens();
         progresso->Fechar();
         return;

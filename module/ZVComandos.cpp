@@ -2,11 +2,13 @@
 
 #include "CCDriverLista.h"
 #include "ZVPreflight.h"
+#include "ZVResultado.h"
+#include "cad/CICad.h"
 #include "host/sdk/Document.h"
 #include "host/sdk/SystemServices.h"
 
-#include <exception>
 #include <functional>
+#include <new>
 
 namespace {
 
@@ -24,24 +26,47 @@ bool RodarPreflight(Preflight tipo) {
     return false;
 }
 
+// Printed when a command runs out of memory.
+constexpr int kMensagemSemMemoria = 901;
+
+void IniciaComando() {
+    if (zvsdk::Document* documento = zvsdk::activeDocument()) documento->startCommand();
+}
+
 // The six steps every handler takes. Nothing escapes a handler.
 int RodarComando(Preflight tipo, const std::function<void()>& driver) {
     try {
-        if (zvsdk::Document* documento = zvsdk::activeDocument()) documento->startCommand();
-        if (!RodarPreflight(tipo)) return 1;
+        IniciaComando();
+        if (!RodarPreflight(tipo)) {
+            ZVResultado::Falhou();
+            return 1;
+        }
         ZVPreflight::AbrirBracket();
         driver();
         ZVPreflight::FecharBracket();
+    } catch (const std::bad_alloc&) {
+        CICad::ImprimeMensagem(kMensagemSemMemoria);
+        ZVResultado::SemMemoria();
     } catch (...) {
+        ZVResultado::Falhou();
     }
     return 1;
 }
 
+// A command this edition does not have yet says so before it touches anything.
+int Indisponivel() {
+    IniciaComando();
+    CCDriverLista::AvisaIndisponivel();
+    return 1;
+}
+
 int Lista(TipoLista tipo) {
+    if (!CCDriverLista::Disponivel(tipo)) return Indisponivel();
     return RodarComando(Preflight::Listas, [tipo] { CCDriverLista::Executar(tipo); });
 }
 
 int Exporta(const char* tipo) {
+    if (!CCDriverLista::ExportacaoDisponivel(tipo)) return Indisponivel();
     return RodarComando(Preflight::Exportacao, [tipo] { CCDriverLista::Exporta(tipo); });
 }
 
@@ -84,6 +109,7 @@ int ExportacaoCabos() {
 }
 
 int DiagramaTopografico() {
+    if (!CCDriverLista::Disponivel(TipoLista::DiagramaTopografico)) return Indisponivel();
     return RodarComando(Preflight::Diagrama,
                         [] { CCDriverLista::Executar(TipoLista::DiagramaTopografico); });
 }

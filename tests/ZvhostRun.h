@@ -12,18 +12,33 @@ struct HostRun {
     QString err;
 };
 
+// zvhost under resource limits of its own, as prlimit(1) takes them: "--fsize=300000"
+// (bytes a file may reach), "--as=400000000" (bytes of address space).
+struct Limits {
+    QStringList prlimit;
+};
+
+inline void startZvhost(QProcess& process, const QStringList& arguments, const Limits& limits) {
+    if (limits.prlimit.isEmpty()) {
+        process.start(QStringLiteral(ZV_BIN_DIR "/zvhost"), arguments);
+        return;
+    }
+    process.start(QStringLiteral("/usr/bin/prlimit"),
+                  QStringList(limits.prlimit) << "--" << ZV_BIN_DIR "/zvhost" << arguments);
+}
+
 inline HostRun runZvhost(
     const QStringList& arguments,
     const QProcessEnvironment& environment = QProcessEnvironment::systemEnvironment(),
-    const QString& folder = QString(), int timeoutMs = 300000) {
+    const QString& folder = QString(), int timeoutMs = 300000, const Limits& limits = {}) {
     QProcess process;
     process.setProcessEnvironment(environment);
     if (!folder.isEmpty()) process.setWorkingDirectory(folder);
-    process.start(QStringLiteral(ZV_BIN_DIR "/zvhost"), arguments);
+    startZvhost(process, arguments, limits);
     process.closeWriteChannel();
     HostRun run;
     if (!process.waitForFinished(timeoutMs)) return run;
-    run.status = process.exitCode();
+    run.status = process.exitStatus() == QProcess::CrashExit ? 128 : process.exitCode();
     run.out = QString::fromUtf8(process.readAllStandardOutput());
     run.err = QString::fromUtf8(process.readAllStandardError());
     return run;

@@ -1,5 +1,8 @@
 #include "ConsoleUserInterface.h"
 
+#include "sdk/Document.h"
+#include "sdk/SystemServices.h"
+
 #include <QCoreApplication>
 
 namespace zvhost {
@@ -23,6 +26,9 @@ void ConsoleUserInterface::missing(const QString& name, const QString& what) {
     err_ << "zvhost: no answer for " << what << " '" << name << "' (--answer " << name
          << "=...): cancelled\n";
     err_.flush();
+    // A cancelled question cancels the command that asked it.
+    if (zvsdk::Document* document = zvsdk::activeDocument())
+        document->reportCommandResult(zvsdk::CommandResult::Cancelled);
 }
 
 void ConsoleUserInterface::messageBox(const QString& text, const QString& title) {

@@ -1,5 +1,6 @@
 #include "DocumentLisp.h"
 
+#include "Interrupts.h"
 #include "LispChains.h"
 
 namespace zvhost {
@@ -45,7 +46,7 @@ int DocumentLisp::lispPutStringPairs(const QString& name, const zvsdk::StringPai
 }
 
 zvsdk::ResultBuffer* DocumentLisp::lispInvoke(const zvsdk::ResultBuffer* call) {
-    if (!call || call->restype != zvsdk::RTSTR) return nullptr;
+    if (!call || call->restype != zvsdk::RTSTR || interruptRequested()) return nullptr;
     // A function nobody defined answers nothing, quietly: the module asks for optional
     // functions of the product. Errors inside a defined one are reported as usual.
     if (lisp_.global(call->rstring).isNil()) return nullptr;
@@ -62,6 +63,8 @@ zvsdk::ResultBuffer* DocumentLisp::lispInvoke(const zvsdk::ResultBuffer* call) {
 }
 
 bool DocumentLisp::lispEvaluate(const QString& text) {
+    // After a Ctrl+C the command runs out without LISP: it is cancelled anyway.
+    if (interruptRequested()) return false;
     auto it = readTexts_.constFind(text);
     if (it == readTexts_.constEnd()) {
         zvlisp::Value forms;

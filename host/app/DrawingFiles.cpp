@@ -24,6 +24,8 @@ bool writeDrawing(zvdb::Database& database, const QString& path, QString* error)
         return true;
     } catch (const zvdb::DxfError& e) {
         *error = QString::fromStdString(e.what());
+    } catch (const std::bad_alloc&) {
+        *error = "could not save " + path + ": not enough memory";
     }
     return false;
 }

@@ -2,9 +2,11 @@
 
 #include "Application.h"
 #include "ConsoleUserInterface.h"
+#include "DocumentLisp.h"
 #include "DrawingFiles.h"
 #include "HostDocument.h"
 #include "HugePages.h"
+#include "Interrupts.h"
 #include "drawing/Database.h"
 #include "sdk/LispInterface.h"
 
@@ -57,7 +59,9 @@ const char* const kUsage =
     "  -h, --help            this text\n"
     "\n"
     "exit status: 0 on success; 1 when the drawing can't be read or saved (nothing is\n"
-    "overwritten) or a module can't be loaded; 2 for a usage error or an unknown command.\n";
+    "overwritten), a module or LISP file fails, or memory runs out; 2 for a usage error or\n"
+    "an unknown command; 3 when a command fails; 4 when a command is cancelled (a question\n"
+    "without an answer, Ctrl+C). After a status other than 0 the drawing is not saved.\n";
 
 struct Options {
     QString drawing;
@@ -134,18 +138,41 @@ bool runLisp(HostDocument& document, const Options& options, QTextStream& err) {
         err << "zvhost: LISP is not available in this build\n";
         return false;
     }
-    for (const QString& file : options.loads) {
-        QString quoted = QFileInfo(file).absoluteFilePath();
-        quoted.replace('\\', "\\\\").replace('"', "\\\"");
-        if (!lisp->lispEvaluate("(load \"" + quoted + "\")")) {
-            err << "zvhost: " << file << ": could not be loaded\n";
-            return false;
+    try {
+        for (const QString& file : options.loads) {
+            QString quoted = QFileInfo(file).absoluteFilePath();
+            quoted.replace('\\', "\\\\").replace('"', "\\\"");
+            if (!lisp->lispEvaluate("(load \"" + quoted + "\")")) {
+                err << "zvhost: " << file << ": could not be loaded\n";
+                return false;
+            }
         }
+        for (const QString& expression : options.evals) {
+            if (!lisp->lispEvaluate(expression)) return false;
+        }
+    } catch (const std::bad_alloc&) {
+        err << "zvhost: out of memory while evaluating LISP; the drawing is not saved\n";
+        return false;
     }
-    for (const QString& expression : options.evals) {
-        if (!lisp->lispEvaluate(expression)) return false;
+    return !interruptRequested();
+}
+
+// The exit status after a command and, when it is not 0, a line that says why.
+int commandStatus(const QString& command, zvsdk::CommandResult result, QTextStream& err) {
+    switch (result) {
+        case zvsdk::CommandResult::Succeeded:
+            return kExitOk;
+        case zvsdk::CommandResult::Failed:
+            err << "zvhost: " << command << " failed; the drawing is not saved\n";
+            return kExitCommandFailed;
+        case zvsdk::CommandResult::Cancelled:
+            err << "zvhost: " << command << " was cancelled; the drawing is not saved\n";
+            return kExitCommandCancelled;
+        case zvsdk::CommandResult::OutOfMemory:
+            err << "zvhost: " << command << " ran out of memory; the drawing is not saved\n";
+            return kExitFailure;
     }
-    return true;
+    return kExitFailure;
 }
 
 int runDrawing(const Options& options, QTextStream& out, QTextStream& err) {
@@ -158,6 +185,10 @@ int runDrawing(const Options& options, QTextStream& out, QTextStream& err) {
     Application app(std::move(ui), out);
 
     std::unique_ptr<zvdb::Database> database;
+    if (QFileInfo(options.drawing).isDir()) {
+        err << "zvhost: " << options.drawing << ": is a directory, not a drawing\n";
+        return kExitFailure;
+    }
     if (QFileInfo::exists(options.drawing)) {
         QString error;
         database = readDrawing(options.drawing, &error);
@@ -183,18 +214,26 @@ int runDrawing(const Options& options, QTextStream& out, QTextStream& err) {
             out << name << "\n";
         return kExitOk;
     }
-    if (!runLisp(*document, options, err)) return kExitFailure;
+    if (auto* lisp = dynamic_cast<DocumentLisp*>(document->lisp()))
+        catchInterrupts(&lisp->interpreter());
+    if (!runLisp(*document, options, err)) {
+        if (!interruptRequested()) return kExitFailure;
+        err << "zvhost: interrupted; the drawing is not saved\n";
+        return kExitCommandCancelled;
+    }
     for (const QString& command : options.commands) {
-        if (!document->execute(command)) {
+        zvsdk::CommandResult result = zvsdk::CommandResult::Succeeded;
+        if (!document->execute(command, &result)) {
             err << "zvhost: unknown command: " << command << "\n";
             return kExitUsage;
         }
+        if (const int status = commandStatus(command, result, err)) return status;
     }
     const QString target = options.inPlace ? options.drawing : options.output;
     if (target.isEmpty()) return kExitOk;
     QString error;
     if (!writeDrawing(*document->database(), target, &error)) {
-        err << "zvhost: cannot save: " << error << "\n";
+        err << "zvhost: " << error << "\n";
         return kExitFailure;
     }
     return kExitOk;

@@ -5,8 +5,15 @@
 
 namespace zvhost {
 
-// Exit statuses of zvhost.
-enum ExitStatus { kExitOk = 0, kExitFailure = 1, kExitUsage = 2 };
+// Exit statuses of zvhost (the README's table).
+enum ExitStatus {
+    kExitOk = 0,
+    kExitFailure = 1,          // a file can't be read or saved, a module or LISP file failed,
+                               // memory ran out
+    kExitUsage = 2,            // bad options, an unknown command
+    kExitCommandFailed = 3,    // a command reported an error
+    kExitCommandCancelled = 4  // a command was cancelled: a question unanswered, Ctrl+C
+};
 
 // What a subcommand gets: its own arguments (without its name) and the streams.
 struct CliContext {

@@ -1,6 +1,8 @@
 #include "HostDocument.h"
 
 #include "Application.h"
+#include "DocumentLisp.h"
+#include "Interrupts.h"
 #include "drawing/Database.h"
 #include "sdk/LispInterface.h"
 #include "sdk/UserInterface.h"
@@ -33,11 +35,30 @@ QStringList HostDocument::commandNames() const {
     return names;
 }
 
-bool HostDocument::execute(const QString& name) {
+void HostDocument::reportCommandResult(zvsdk::CommandResult result) {
+    // The worst word wins: running out of memory over a cancel over a failure.
+    if (int(result) > int(result_)) result_ = result;
+}
+
+bool HostDocument::execute(const QString& name, zvsdk::CommandResult* result) {
+    result_ = zvsdk::CommandResult::Succeeded;
+    auto* documentLisp = dynamic_cast<DocumentLisp*>(lisp_.get());
+    const int errorsBefore = documentLisp ? documentLisp->interpreter().errorsReported() : 0;
     auto it = commands_.constFind(name.toUpper());
-    if (it == commands_.constEnd()) return app_.runHostCommand(*this, {name});
-    zvsdk::CommandHandler handler = it.value().handler;  // it may remove commands
-    handler();
+    if (it == commands_.constEnd()) {
+        if (!app_.runHostCommand(*this, {name})) return false;
+    } else {
+        zvsdk::CommandHandler handler = it.value().handler;  // it may remove commands
+        try {
+            handler();
+        } catch (const std::bad_alloc&) {
+            reportCommandResult(zvsdk::CommandResult::OutOfMemory);
+        }
+    }
+    if (documentLisp && documentLisp->interpreter().errorsReported() != errorsBefore)
+        reportCommandResult(zvsdk::CommandResult::Failed);
+    if (interruptRequested()) reportCommandResult(zvsdk::CommandResult::Cancelled);
+    if (result) *result = result_;
     return true;
 }
 

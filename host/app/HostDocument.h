@@ -27,8 +27,11 @@ public:
     void startCommand() override { ++commandsStarted_; }
     int commandsStarted() const { return commandsStarted_; }
     bool runCommand(const QStringList& tokens) override;
+    void reportCommandResult(zvsdk::CommandResult result) override;
     // Runs a command by name as a user typing it; false when no such command exists.
-    bool execute(const QString& name);
+    // `result` gets how it ended: the worst the module reported, a LISP error that reached
+    // the command line, a question left unanswered, or an interrupt.
+    bool execute(const QString& name, zvsdk::CommandResult* result = nullptr);
 
     void printMessage(const QString& text) override;
     zvsdk::LispInterface* lisp() override { return lisp_.get(); }
@@ -55,6 +58,7 @@ private:
     };
     QHash<QString, Command> commands_;
     int commandsStarted_ = 0;
+    zvsdk::CommandResult result_ = zvsdk::CommandResult::Succeeded;
     View view_;
 };
 

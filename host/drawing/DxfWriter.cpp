@@ -9,8 +9,7 @@
 #include "TagValues.h"
 #include "TextCodec.h"
 
-#include <QFileInfo>
-#include <QSaveFile>
+#include "sdk/AtomicFile.h"
 
 #include <unordered_set>
 
@@ -30,17 +29,15 @@ std::string DxfWriter::toText(Database& database) {
 }
 
 void DxfWriter::saveFile(Database& database, const std::string& path) {
-    QSaveFile file(QString::fromStdString(path));
-    if (!file.open(QIODevice::WriteOnly))
-        throw DxfError(path + ": cannot be written: " + file.errorString().toStdString());
+    zvsdk::AtomicFile file(QString::fromStdString(path));
+    if (!file.open()) throw DxfError(file.errorString().toStdString());
     DxfWriter writer(database);
     writer.sink_ = &file;
     writer.prepare();
     writer.write();
     writer.flush();
-    // A failed write leaves the file as it was: the temporary file goes with `file`.
-    if (file.error() != QFileDevice::NoError || !file.commit())
-        throw DxfError(path + ": cannot be written: " + file.errorString().toStdString());
+    // On failure the temporary file goes with `file` and the old file stays as it was.
+    if (!file.commit()) throw DxfError(file.errorString().toStdString());
 }
 
 void DxfWriter::prepare() {
@@ -94,8 +91,8 @@ void DxfWriter::tag(int code, std::string_view value) {
 
 void DxfWriter::flush() {
     if (!sink_) return;
-    // A failed write leaves its error on the device for the commit to report.
-    sink_->write(out_.data(), static_cast<qint64>(out_.size()));
+    // The first failed write ends the save: nothing after it could reach the disk.
+    if (!sink_->write(out_)) throw DxfError(sink_->errorString().toStdString());
     out_.clear();
 }
 

@@ -7,7 +7,9 @@
 
 #include "Tag.h"
 
-class QIODevice;
+namespace zvsdk {
+class AtomicFile;
+}
 
 namespace zvdb {
 
@@ -16,7 +18,8 @@ class Database;
 class DxfWriter {
 public:
     static std::string toText(Database& database);
-    // Atomic: a temporary file in the same folder, then a rename. Throws DxfError.
+    // Atomic and checked: a temporary file in the same folder, then a rename. Throws
+    // DxfError with "could not save PATH: REASON"; the old file is then untouched.
     static void saveFile(Database& database, const std::string& path);
 
 private:
@@ -38,7 +41,7 @@ private:
     Database& db_;
     std::string out_;
     // Where a file save streams its text; out_ then holds one chunk at a time.
-    QIODevice* sink_ = nullptr;
+    zvsdk::AtomicFile* sink_ = nullptr;
     bool legacyEncoding_ = false;
     std::string codePage_;
 };

@@ -48,7 +48,10 @@ void registerFileBuiltins(Interpreter& in) {
         "close",
         [](Interpreter& in, Args a) {
             if (a[0].type() != Type::File) in.badType("streamp", a[0]);
-            static_cast<LispFile*>(a[0].asObject())->close();
+            auto* file = static_cast<LispFile*>(a[0].asObject());
+            // A file that did not reach the disk is an error the program must see.
+            const bool wasOpen = file->isOpen();
+            if (!file->close() && wasOpen) in.fail(file->errorString());
             return Value();
         },
         1, 1);

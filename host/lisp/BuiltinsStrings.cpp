@@ -96,7 +96,9 @@ Value substitute(Interpreter& in, Args a) {
     QString text = in.toStr(a[2]);
     const int start = optionalInt(in, a, 3, 0);
     const int at = start > text.size() ? -1 : text.indexOf(pattern, std::max(0, start));
-    if (at >= 0) text.replace(at, pattern.size(), replacement);
+    if (at < 0) return Value::string(text);
+    in.checkLength(qint64(text.size()) + replacement.size(), "vl-string-subst");
+    text.replace(at, pattern.size(), replacement);
     return Value::string(text);
 }
 
@@ -149,7 +151,12 @@ Value snvalid(Interpreter& in, Args a) {
 
 void defineBasics(Interpreter& in) {
     in.define("strcat", [](Interpreter& in, Args a) {
+        qint64 length = 0;
+        for (const Value& v : a)
+            length += in.toStr(v).size();
+        in.checkLength(length, "strcat");
         QString text;
+        text.reserve(int(length));
         for (const Value& v : a)
             text += in.toStr(v);
         return Value::string(text);

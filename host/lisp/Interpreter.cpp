@@ -7,6 +7,7 @@
 #include "SmallVector.h"
 
 #include <QFileInfo>
+#include <new>
 
 #include <pthread.h>
 
@@ -310,6 +311,10 @@ bool Interpreter::topLevel(Body body, Value* result) {
         if (!error.handled) report(error);
         cancel_.store(false, std::memory_order_relaxed);
         return false;
+    } catch (const std::bad_alloc&) {
+        // The host ends the command: nothing of it is to be trusted or saved.
+        cancel_.store(false, std::memory_order_relaxed);
+        throw;
     }
 }
 
@@ -387,11 +392,17 @@ void Interpreter::fail(const QString& message) {
 
 void Interpreter::report(LispError& error) {
     error.handled = true;
+    ++errorsReported_;
     if (callErrorHandler(error.message())) return;
     write((atLineStart_ ? "; error: " : "\n; error: ") + error.message() + "\n");
     const QString file = error.file.isEmpty() ? whereFile_ : error.file;
     const int line = error.file.isEmpty() ? whereLine_ : error.line;
     if (!file.isEmpty()) write("; in " + file + ", line " + QString::number(line) + "\n");
+}
+
+void Interpreter::checkLength(qint64 length, const char* function) {
+    if (length > maxStringLength)
+        fail(QLatin1String("string too long: ") + QLatin1String(function));
 }
 
 void Interpreter::badType(const char* what, const Value& value) {

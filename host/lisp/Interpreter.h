@@ -125,8 +125,14 @@ public:
     QString findFile(const QString& name) const;
 
     Units units;
-    // strcat fails with "string too long" beyond this many characters.
+    // Functions that build text fail with "string too long: NAME" beyond this many
+    // characters, long before the memory runs out.
     int maxStringLength = 64 << 20;
+    // The text a function named `function` is about to build must fit maxStringLength.
+    void checkLength(qint64 length, const char* function);
+    // Errors that reached the top level and were reported; a host compares the count before
+    // and after a command.
+    int errorsReported() const { return errorsReported_; }
 
     // Helpers for the evaluator's special forms.
     Value makeLambda(const QString& name, const Value& params, const Value& body);
@@ -169,6 +175,7 @@ private:
     int catchDepth_ = 0;
     bool inErrorHandler_ = false;
     unsigned steps_ = 0;
+    int errorsReported_ = 0;
     std::atomic<bool> cancel_{false};
     std::function<bool()> cancelCheck_;
 };
@@ -185,13 +192,16 @@ private:
 template <typename Body>
 Value Interpreter::catching(Body body, QString* message) {
     const int depth = depth_;
-    ++catchDepth_;
+    // Whatever leaves the body, memory exhaustion included, ends the catch.
+    struct CatchScope {
+        int& depth;
+        explicit CatchScope(int& d) : depth(d) { ++depth; }
+        ~CatchScope() { --depth; }
+    };
     try {
-        Value result = body();
-        --catchDepth_;
-        return result;
+        CatchScope scope(catchDepth_);
+        return body();
     } catch (LispError& error) {
-        --catchDepth_;
         depth_ = depth;
         if (error.uncatchable) throw;
         *message = error.message();

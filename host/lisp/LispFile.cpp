@@ -20,12 +20,12 @@ LispFile* LispFile::open(const QString& path, const QString& mode) {
     } else if (lower == QLatin1String("w") || lower == QLatin1String("a")) {
         const QString found = resolve(native);
         const QString target = found.isEmpty() ? native : found;
-        file->writer_ = std::make_unique<QSaveFile>(target);
-        if (!file->writer_->open(QIODevice::WriteOnly)) return nullptr;
+        file->writer_ = std::make_unique<zvsdk::AtomicFile>(target);
+        if (!file->writer_->open()) return nullptr;
         if (lower == QLatin1String("a") && !found.isEmpty()) {
             QFile old(found);
-            if (!old.open(QIODevice::ReadOnly)) return nullptr;
-            file->writer_->write(old.readAll());
+            if (!old.open(QIODevice::ReadOnly) || !file->writer_->write(old.readAll()))
+                return nullptr;
         }
     } else {
         return nullptr;
@@ -52,7 +52,7 @@ int LispFile::readChar() {
 
 bool LispFile::write(const QString& text) {
     if (!open_ || !writer_) return false;
-    return writer_->write(text.toUtf8()) >= 0;
+    return writer_->write(text.toUtf8());
 }
 
 bool LispFile::close() {
@@ -60,6 +60,7 @@ bool LispFile::close() {
     open_ = false;
     if (!writer_) return true;
     const bool saved = writer_->commit();
+    if (!saved) error_ = writer_->errorString();
     writer_.reset();
     return saved;
 }

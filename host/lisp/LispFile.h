@@ -4,7 +4,8 @@
 // that does not match exactly is matched without regard to case, folder by folder.
 #include "Value.h"
 
-#include <QSaveFile>
+#include "sdk/AtomicFile.h"
+
 #include <QStringList>
 
 #include <memory>
@@ -16,7 +17,8 @@ public:
     ~LispFile() override;
     // Mode "r", "w" or "a"; null when the file can't be opened. Reading takes UTF-8 (or
     // UTF-16 with its mark, or Windows-1252 when the bytes are no UTF-8); writing gives
-    // UTF-8. A written file replaces the old one only when closed.
+    // UTF-8. A written file replaces the old one only when closed, and only when every
+    // write reached the disk.
     static LispFile* open(const QString& path, const QString& mode);
     bool isOpen() const { return open_; }
     bool reading() const { return !writer_; }
@@ -27,6 +29,8 @@ public:
     bool write(const QString& text);
     // False when the file was already closed or could not be saved.
     bool close();
+    // Why the last save failed: "could not save FILE: REASON".
+    QString errorString() const { return error_; }
 
     // The whole text of a file, decoded as open() does.
     static bool readText(const QString& path, QString* text);
@@ -45,7 +49,8 @@ private:
     bool open_ = false;
     QString text_;  // what is read
     int position_ = 0;
-    std::unique_ptr<QSaveFile> writer_;
+    std::unique_ptr<zvsdk::AtomicFile> writer_;
+    QString error_;
 };
 
 }  // namespace zvlisp

@@ -46,12 +46,14 @@ Value loadTemplate(Interpreter& lisp, const ProductContext& context, const QStri
         return Value();
     }
     QString message;
-    const Value result = lisp.catching([&] { return lisp.evalText(text, file); }, &message);
+    // A template that sets nothing makes no list: it is refused like a broken one.
+    const Value forms = lisp.catching([&] { return lisp.readAll(text); }, &message);
+    if (message.isEmpty() && forms.isNil()) message = "the template is empty";
+    if (message.isEmpty()) lisp.catching([&] { return lisp.evalText(text, file); }, &message);
     if (!message.isEmpty()) {
         print(context, "\n; error: " + message + "\n; in template " + path + "\n");
         return Value();
     }
-    (void)result;
     return lisp.t();
 }
 

@@ -14,6 +14,11 @@ class LispInterface;
 // A command handler takes nothing and returns 1 whatever happened.
 using CommandHandler = std::function<int()>;
 
+// How a command ended. The handler's return says nothing, so a module tells the host here;
+// the host keeps the worst it hears during one command and decides by it whether to go on
+// and save.
+enum class CommandResult { Succeeded, Failed, Cancelled, OutOfMemory };
+
 class Document {
 public:
     virtual ~Document() = default;
@@ -26,6 +31,9 @@ public:
     virtual bool hasCommand(const QString& name) const = 0;
     // The host's start-of-command call, made by a handler before it works.
     virtual void startCommand() = 0;
+    // The module's word on the running command: a failure it printed, a question the user
+    // cancelled, memory that ran out.
+    virtual void reportCommandResult(CommandResult result) = 0;
     // Runs a host command from its tokens ("_.zoom", "_W", ...); false when unknown.
     virtual bool runCommand(const QStringList& tokens) = 0;
 

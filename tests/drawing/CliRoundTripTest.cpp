@@ -72,7 +72,7 @@ TEST_F(ZvhostDrawing, BrokenInputWritesNothing) {
 TEST_F(ZvhostDrawing, UnwritableTargetFailsCleanly) {
     const HostRun run = zvhost({input_, "-o", folder_ + "/no/such/folder/out.dxf", "--quiet"});
     EXPECT_EQ(run.status, 1);
-    EXPECT_TRUE(run.err.contains("cannot save")) << run.err.toStdString();
+    EXPECT_TRUE(run.err.contains("could not save")) << run.err.toStdString();
 }
 
 TEST_F(ZvhostDrawing, DxfInfoGivesAQuickLook) {

@@ -166,10 +166,11 @@ TEST_F(TerminalListTest, ARunAgainAppendsOnNoAndReplacesOnYes) {
 TEST_F(TerminalListTest, AMissingBlockFileStopsWithMessage150) {
     const Resultado r = lista(pasta_->filePath("p.dxf"), pasta_->filePath("l4.dxf"),
                               {"--eval", "(setq *DIRETORIO_REDE* \"/nao/existe/\")"});
-    EXPECT_EQ(r.status, 0);
+    // The writer stops: the command failed, and the drawing is not saved.
+    EXPECT_EQ(r.status, 3);
     EXPECT_TRUE(r.err.contains("/nao/existe/")) << r.err.toStdString();
     EXPECT_FALSE(r.out.contains("List created."));
-    EXPECT_TRUE(linhas(pasta_->filePath("l4.dxf")).isEmpty());
+    EXPECT_FALSE(QFile::exists(pasta_->filePath("l4.dxf")));
 }
 
 TEST_F(TerminalListTest, StripPickerAnsweredKeepsItsStripsAndCancelledListsNothing) {
@@ -181,10 +182,11 @@ TEST_F(TerminalListTest, StripPickerAnsweredKeepsItsStripsAndCancelledListsNothi
         "(setq *SEL_REGUA_BORNE_CFG* T *FILTRO_TEMPLATE* \"\")\n");
     modelo.close();
     const QStringList escolhe = {"--eval", "(setq *DEF_LISTA_BORNES* \"escolhe.grt\")"};
+    // Nobody picks: the command is cancelled and nothing is saved.
     Resultado r = lista(pasta_->filePath("p.dxf"), pasta_->filePath("l5.dxf"), escolhe);
-    ASSERT_EQ(r.status, 0) << r.err.toStdString();
+    ASSERT_EQ(r.status, 4) << r.err.toStdString();
     EXPECT_TRUE(r.out.contains("No terminals were found for the list.")) << r.out.toStdString();
-    EXPECT_TRUE(linhas(pasta_->filePath("l5.dxf")).isEmpty());
+    EXPECT_FALSE(QFile::exists(pasta_->filePath("l5.dxf")));
 
     ASSERT_EQ(lista(pasta_->filePath("p.dxf"), pasta_->filePath("l7.dxf")).status, 0);
     const QStringList rows = linhas(pasta_->filePath("l7.dxf"));

@@ -75,34 +75,54 @@ TEST_F(BracketTest, AFailedBuildStopsTheListsWithMessage326AndChangesNothing) {
     lisp("(setq PBLBLNRUNONLSTS T construiu nil)");
     documento_->database()->setCurrentLayer("ESQ$0002$A");
     const QStringList antes = descongelados();
-    documento_->execute("gerarListaBornesGrf");
+    zvsdk::CommandResult resultado{};
+    documento_->execute("gerarListaBornesGrf", &resultado);
     EXPECT_EQ(simbolo("chamadas"), "build");
     EXPECT_EQ(descongelados(), antes);
     EXPECT_FALSE(erros().contains("file dialog"));
-    EXPECT_FALSE(saida().isEmpty());
-    const QString mensagem326 = saida();
-    // The diagram has its own message; the exports go by their own symbol.
-    documento_->execute("diagramaTopografico");
-    EXPECT_NE(saida().mid(mensagem326.size()), mensagem326);
-    documento_->execute("exportacao");
-    EXPECT_EQ(simbolo("chamadas"), "descongela ESQ$0002$A|atualizar|build|build");
+    EXPECT_TRUE(saida().contains("\nThe project build failed. The list was not created.\n"));
+    EXPECT_EQ(resultado, zvsdk::CommandResult::Failed);
+}
+
+TEST_F(BracketTest, CommandsNotBuiltYetSaySoBeforeAnythingElse) {
+    // Every flag that would run a build, open the bracket or ask for a template is set.
+    lisp("(setq PBLBLNRUNONLSTS T PBLBLNRUNONEXPORT T construiu T)");
+    documento_->database()->setCurrentLayer("ESQ$0002$A");
+    const QStringList antes = descongelados();
+    for (const char* comando :
+         {"gerarListaFiosGrf", "diagramaTopografico", "exportacao", "exportacaoFios"}) {
+        const int inicio = saida().size();
+        zvsdk::CommandResult resultado{};
+        documento_->execute(comando, &resultado);
+        EXPECT_EQ(saida().mid(inicio),
+                  "\nThis list or export is not available in this edition yet.\n")
+            << comando;
+        EXPECT_EQ(resultado, zvsdk::CommandResult::Failed) << comando;
+    }
+    EXPECT_EQ(simbolo("chamadas"), "");
+    EXPECT_EQ(descongelados(), antes);
+    EXPECT_FALSE(erros().contains("file dialog"));
 }
 
 TEST_F(BracketTest, APassingBuildRunsTheCommandInsideTheBracket) {
-    lisp("(setq PBLBLNRUNONEXPORT T construiu T)");
+    lisp("(setq PBLBLNRUNONLSTS T construiu T)");
     documento_->database()->setCurrentLayer("ESQ$0002$A");
-    documento_->execute("exportacaoFios");
+    zvsdk::CommandResult resultado{};
+    documento_->execute("gerarListaBornesGrf", &resultado);
     // Built, then the user's page shown again with its companions, the product told.
     EXPECT_EQ(simbolo("chamadas"), "descongela ESQ$0002$A|atualizar|build");
     EXPECT_EQ(descongelados(),
               QStringList({"0", "ESQ$0002$A", "ESQ$DE", "ESQ$FORMATO", "ESQ$SELO"}));
     EXPECT_EQ(QString::fromStdString(std::string(documento_->database()->currentLayer())),
               "ESQ$0002$A");
+    // Nobody answered the template dialog.
+    EXPECT_TRUE(erros().contains("file dialog 'template'"));
+    EXPECT_EQ(resultado, zvsdk::CommandResult::Cancelled);
 }
 
 TEST_F(BracketTest, WithoutTheSymbolNoBuildAndFromLayerZeroTheFirstPage) {
     documento_->database()->setCurrentLayer("0");
-    documento_->execute("gerarListaFiosGrf");
+    documento_->execute("gerarListaBornesGrf");
     EXPECT_TRUE(erros().contains("file dialog 'template'"));
     EXPECT_EQ(simbolo("chamadas"), "descongela ESQ$0001$A|atualizar|primeira");
     EXPECT_EQ(descongelados(),

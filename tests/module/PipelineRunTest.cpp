@@ -46,24 +46,25 @@ TEST_F(PipelineRunTest, ARunReadsEveryPartMergesAndEndsWithMessage63) {
 
 TEST_F(PipelineRunTest, ATemplateThatDoesNotLoadStopsWithMessage88) {
     const Resultado run = plugin("testeModeloRuim");
-    EXPECT_EQ(run.status, 0);
+    EXPECT_EQ(run.status, 3);
     EXPECT_EQ(run.out, "\nThe template could not be loaded.\n");
     EXPECT_FALSE(run.err.contains("progress"));
 }
 
 TEST_F(PipelineRunTest, AWriterThatStopsShowsItsTextAndNoEndMessage) {
     const Resultado run = plugin("testeEscritorPara");
-    EXPECT_EQ(run.status, 0);
+    EXPECT_EQ(run.status, 3);
     EXPECT_TRUE(run.err.contains(": escritor parou\n")) << run.err.toStdString();
     EXPECT_FALSE(run.out.contains("List created."));
     EXPECT_TRUE(run.err.contains("progress: close"));
 }
 
-TEST_F(PipelineRunTest, ACancelledTemplateDialogEndsSilently) {
-    const Resultado run = zvhost({"novo.dxf", "gerarListaBornesGrf", "gerarListaFiosGrf"});
-    EXPECT_EQ(run.status, 0);
+TEST_F(PipelineRunTest, ACancelledTemplateDialogEndsSilentlyAndStopsTheRun) {
+    const Resultado run = zvhost({"novo.dxf", "gerarListaBornesGrf", "gerarListaBornesGrf"});
+    EXPECT_EQ(run.status, 4);
     EXPECT_EQ(run.out, "");
-    EXPECT_EQ(run.err.count("no answer for file dialog 'template'"), 2);
+    // The first cancel ends the run: the second command never asks.
+    EXPECT_EQ(run.err.count("no answer for file dialog 'template'"), 1);
 }
 
 TEST_F(PipelineRunTest, UnknownCommandsAndBadOptionsAreUsageErrors) {
@@ -80,7 +81,7 @@ TEST_F(PipelineRunTest, UnknownCommandsAndBadOptionsAreUsageErrors) {
 }
 
 TEST_F(PipelineRunTest, NothingIsWrittenUnlessAsked) {
-    const Resultado run = zvhost({"novo.dxf", "exportacao"});
+    const Resultado run = zvhost({"novo.dxf", "--eval", "(setq x 1)"});
     EXPECT_EQ(run.status, 0);
     EXPECT_FALSE(QFile::exists(dados_.filePath("novo.dxf")));
 }
