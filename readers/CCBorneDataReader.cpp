@@ -298,7 +298,9 @@ VetorItens ColetaJumper(CEItemLista* inicio, const IndiceBornes& indice,
         pilha.pop_back();
         cadeia.push_back(item);
         std::vector<CEItemLista*> achados;
-        for (const QString& token : item->valorCampo("JUMPER").split(',')) {
+        // Empty tokens are dropped: one would match any terminal whose strip and number
+        // read empty in some language, i.e. every terminal tagged in another one.
+        for (const QString& token : ZVString(item->valorCampo("JUMPER")).Divide(",")) {
             for (int i = 0; i < 3; ++i) {
                 CEItemLista* achado = indice.Busca(*item, i, token);
                 if (!achado) continue;
