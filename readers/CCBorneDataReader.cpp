@@ -75,8 +75,10 @@ void CCBorneDataReader::LeLado(CEItemLista& item, const OdDbObjectId& borne, con
     const bool invertido = item.valorCampo("INVERTIDO").toUpper() == "S";
     const bool fimNaInsercao = lado.insercao != invertido;
     const QString sufixo = fimNaInsercao ? "_FIM" : "_INI";
-    const QString layer = CICad::GetLayerEntidade(borne);
+    // A stale handle in the connection answer: the element is skipped, the side stays blank.
     const OdDbObjectId elemento = CICad::IdDoHandle(vizinho, borne.database());
+    if (elemento.isNull()) return;
+    const QString layer = CICad::GetLayerEntidade(borne);
     const OdDbObjectId fio = FioNoPonto(layer, aqui);
     const CEPonto r = PontoDaConexao(NumeroDoFio(fio), vizinho);
     LeBloco(sufixo, item, elemento, &modelo);
