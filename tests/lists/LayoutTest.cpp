@@ -69,6 +69,25 @@ TEST_F(LayoutTest, BlankRowsBetweenStripsWhenTheBreakFlagAsksForThem) {
     EXPECT_TRUE(p[0].contains("X2:2@110,200"));
 }
 
+// With no rows per column the column ends after every row, a page break included: after a
+// strip break the new page's first row stands in its second column, and with one column
+// the break leaves an empty page behind it.
+TEST_F(LayoutTest, WithNoRowsPerColumnTheColumnEndsAfterABreakToo) {
+    modelo_.simbolos.insert("*LINHAS_POR_PAGINA*", 0);
+    borne("X1", "1"), borne("X2", "1"), borne("X2", "2");
+    EXPECT_EQ(paginas(),
+              QStringList({"1:X1 | X1:1@10,200", "1:X2 | X2:1@110,200", "2:X2 | X2:2@10,200"}));
+    modelo_.simbolos.insert("*NUMERO_COLUNA*", 1);
+    EXPECT_EQ(paginas(), QStringList({"1:X1 | X1:1@10,200", "1:X2 |", "1:X2 | X2:1@10,200",
+                                      "2:X2 | X2:2@10,200"}));
+    // A key break does the same.
+    itens_.clear();
+    modelo_.simbolos.insert("*ZV_CHAVE_QUEBRA_PAGINA*", QStringList{"LADO"});
+    borne("X3", "1")->definirCampo("LADO", "A");
+    borne("X3", "2")->definirCampo("LADO", "B");
+    EXPECT_EQ(paginas(), QStringList({"1:X3 | X3:1@10,200", "1:X3 |", "1:X3 | X3:2@10,200"}));
+}
+
 TEST_F(LayoutTest, FillingToTheEndNumbersBlankRowsAndKeysDoNotBreak) {
     modelo_.simbolos.insert("*PREENCHE_ATE_FINAL*", true);
     modelo_.simbolos.insert("*ZV_CHAVE_QUEBRA_PAGINA*", QStringList{"LADO"});
