@@ -22,17 +22,18 @@ bool MesmaTag(std::string_view a, const QString& b) {
 
 // Virtual attributes: "TAG\fVALUE\fFLAG", an empty field between two separators read as
 // one blank.
-bool LeAtributoVirtual(QString registro, QString& tag, QString& valor, bool& invisivel) {
+QStringList CamposAtributoVirtual(QString registro) {
     const QString duplo = QString(QChar(0x0C)) + QChar(0x0C);
     const QString preenchido = QString(QChar(0x0C)) + " " + QChar(0x0C);
     while (registro.contains(duplo))
         registro.replace(duplo, preenchido);
-    const QStringList campos = ZVString(registro).Divide(QString(QChar(0x0C)));
-    if (campos.size() != 3) return false;
-    tag = campos[0];
-    valor = campos[1];
-    invisivel = campos[2].toUpper() == "S";
-    return true;
+    return ZVString(registro).Divide(QString(QChar(0x0C)));
+}
+
+std::unique_ptr<zv::CEAtributo> AtributoVirtual(const QStringList& campos) {
+    const bool invisivel = campos.size() > 2 && campos[2].toUpper() == "S";
+    return std::make_unique<zv::CEAtributo>(campos.value(0), QString(), campos.value(1),
+                                            OdDbObjectId(), invisivel);
 }
 
 }  // namespace
@@ -111,11 +112,11 @@ std::unique_ptr<zv::CEAtributo> CICad::GetAtributoEntidade(const QString& tag,
 
 std::unique_ptr<zv::CEAtributo> CICad::GetAtributoVirtual(const QString& tag,
                                                           const OdDbObjectId& entidade) {
+    // Asked by tag, a record answers with its first field alone: "CABO\f101" has no flag.
     for (const CEItemXData& item : GetXData(entidade, "KVR_ZV_ATT_VIRTUAL")) {
-        QString t, valor;
-        bool invisivel = false;
-        if (item.codigo == 1000 && LeAtributoVirtual(item.texto, t, valor, invisivel) && t == tag)
-            return std::make_unique<zv::CEAtributo>(t, QString(), valor, OdDbObjectId(), invisivel);
+        if (item.codigo != 1000) continue;
+        const QStringList campos = CamposAtributoVirtual(item.texto);
+        if (!campos.isEmpty() && campos[0] == tag) return AtributoVirtual(campos);
     }
     return nullptr;
 }
@@ -124,12 +125,11 @@ int CICad::GetAtributosVirtuais(const OdDbObjectId& id,
                                 std::unique_ptr<zv::CEListaAtributos>& lista) {
     if (id.isNull()) return 1;
     lista = std::make_unique<zv::CEListaAtributos>();
+    // Listed, only records of exactly three fields count.
     for (const CEItemXData& item : GetXData(id, "KVR_ZV_ATT_VIRTUAL")) {
-        QString tag, valor;
-        bool invisivel = false;
-        if (item.codigo == 1000 && LeAtributoVirtual(item.texto, tag, valor, invisivel))
-            lista->Adicionar(
-                std::make_unique<zv::CEAtributo>(tag, QString(), valor, OdDbObjectId(), invisivel));
+        if (item.codigo != 1000) continue;
+        const QStringList campos = CamposAtributoVirtual(item.texto);
+        if (campos.size() == 3) lista->Adicionar(AtributoVirtual(campos));
     }
     return 0;
 }

@@ -200,19 +200,33 @@ TEST_F(FacadeFixture, VirtualAttributesFillEmptyFieldsWithABlank) {
     const QChar ff(0x0C);
     CICad::SetXData(id, "KVR_ZV_ATT_VIRTUAL",
                     {{1000, QString("TAG") + ff + ff + "s"},
-                     {1000, QString("CABO") + ff + "101" + ff + "N"},
-                     {1000, QString("QUEBRADO") + ff + "x"}});
+                     {1000, QString("CABO") + ff + "101"},
+                     {1000, QString("QUEBRADO") + ff + "x"},
+                     {1000, QString("CABO") + ff + "999" + ff + "N"},
+                     {1000, QString("SO")}});
+    // The list takes only records of three fields.
     std::unique_ptr<zv::CEListaAtributos> lista;
     EXPECT_EQ(CICad::GetAtributosVirtuais(id, lista), 0);
     ASSERT_EQ(lista->Quantidade(), 2);
     EXPECT_EQ((*lista)[0].GetValor(), " ");
     EXPECT_TRUE((*lista)[0].IsInvisivel());
+    EXPECT_EQ((*lista)[1].GetValor(), "999");
     EXPECT_FALSE((*lista)[1].IsInvisivel());
+    // One tag asked for: the first record whose first field is the tag answers, whatever
+    // its count of fields.
     const auto cabo = CICad::GetAtributoEntidade("CABO", id);
     ASSERT_TRUE(cabo);
     EXPECT_EQ(cabo->GetValor(), "101");
+    EXPECT_FALSE(cabo->IsInvisivel());
     EXPECT_TRUE(cabo->GetId().isNull());
-    EXPECT_FALSE(CICad::GetAtributoVirtual("QUEBRADO", id));
+    const auto quebrado = CICad::GetAtributoVirtual("QUEBRADO", id);
+    ASSERT_TRUE(quebrado);
+    EXPECT_EQ(quebrado->GetValor(), "x");
+    const auto so = CICad::GetAtributoVirtual("SO", id);
+    ASSERT_TRUE(so);
+    EXPECT_EQ(so->GetValor(), "");
+    EXPECT_TRUE(CICad::GetAtributoVirtual("TAG", id)->IsInvisivel());
+    EXPECT_FALSE(CICad::GetAtributoVirtual("FALTA", id));
     EXPECT_EQ(CICad::GetAtributosVirtuais(OdDbObjectId(), lista), 1);
 }
 
