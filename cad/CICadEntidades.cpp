@@ -1,6 +1,7 @@
 #include "CICad.h"
 #include "CICadInterno.h"
 
+#include "drawing/Attribute.h"
 #include "drawing/BlockRecord.h"
 #include "drawing/BlockReference.h"
 #include "drawing/Dictionary.h"
@@ -12,6 +13,29 @@
 
 using namespace cicad;
 
+namespace {
+
+// The block's bounds scaled by the reference's factors and moved to its position, without
+// its rotation; with `comAtributos` merged with those of every attribute, visible or not.
+zvdb::BoundingBox ExtensaoReferencia(const zvdb::BlockReference& ref, bool comAtributos) {
+    zvdb::BoundingBox caixa;
+    double xMax, xMin, yMax, yMin;
+    if (CICad::GetExtensaoBloco(Id(ref.definition()), xMax, xMin, yMax, yMin)) {
+        const zvdb::Point3 escala = ref.scale(), posicao = ref.position();
+        // A negative factor mirrors: its corners are sorted again by the box.
+        for (const double x : {xMin, xMax})
+            for (const double y : {yMin, yMax})
+                caixa.add(
+                    zvdb::Point3{posicao.x + x * escala.x, posicao.y + y * escala.y, posicao.z});
+    }
+    if (comAtributos)
+        for (const zvdb::Attribute* atributo : ref.attributes())
+            caixa.add(zvdb::Extents::ofEntity(*atributo, false));
+    return caixa;
+}
+
+}  // namespace
+
 bool CICad::GetExtensao(const OdDbObjectId& entidade, double& xMax, double& xMin, double& yMax,
                         double& yMin, bool comAtributos) {
     auto* e = Como<zvdb::Entity>(entidade);
@@ -19,13 +43,15 @@ bool CICad::GetExtensao(const OdDbObjectId& entidade, double& xMax, double& xMin
     const std::string_view tipo = e->type();
     if ((tipo == "TEXT" || tipo == "MTEXT") && !comAtributos) return false;
     zvdb::BoundingBox caixa;
-    if (tipo == "ELLIPSE") {
+    if (auto* ref = dynamic_cast<zvdb::BlockReference*>(e)) {
+        caixa = ExtensaoReferencia(*ref, comAtributos);
+    } else if (tipo == "ELLIPSE") {
         const zvdb::Point3 centro = e->point(10);
         const double raio = zvdb::length(e->point(11));
         caixa.add(centro - zvdb::Point3{raio, raio, 0});
         caixa.add(centro + zvdb::Point3{raio, raio, 0});
-    } else if (tipo == "INSERT" || tipo == "LWPOLYLINE" || tipo == "POLYLINE" || tipo == "LINE" ||
-               tipo == "CIRCLE" || tipo == "TEXT" || tipo == "MTEXT") {
+    } else if (tipo == "LWPOLYLINE" || tipo == "POLYLINE" || tipo == "LINE" || tipo == "CIRCLE" ||
+               tipo == "TEXT" || tipo == "MTEXT") {
         caixa = zvdb::Extents::ofEntity(*e, comAtributos);
     }
     if (caixa.isEmpty()) return false;

@@ -329,6 +329,27 @@ TEST_F(FacadeFixture, ExtentsOfEntitiesAndReferences) {
     EXPECT_EQ(QList<double>({xMax, xMin, yMax, yMin}), QList<double>({110, 100, 50, 50}));
 }
 
+// A reference's bounds are its block's, scaled and moved; its rotation takes no part, and
+// with attributes asked for every attribute counts, the invisible ones too.
+TEST_F(FacadeFixture, ExtentsOfAReferenceAreItsBlocksScaledAndMoved) {
+    double xMax, xMin, yMax, yMin;
+    const QString caminho = arquivoBloco("CAIXA", {});
+    const OdDbObjectId id = CICad::InsereBloco(caminho, "CAIXA", "0", 100, 50, 0, 0);
+    auto* ref = dynamic_cast<zvdb::BlockReference*>(db().objectByHandle(id.handle()));
+    ASSERT_TRUE(ref);
+    ref->setScale({2, 3, 1});
+    ref->setRotation(90);
+    ASSERT_TRUE(CICad::GetExtensao(id, xMax, xMin, yMax, yMin, false));
+    EXPECT_EQ(QList<double>({xMax, xMin, yMax, yMin}), QList<double>({120, 100, 50, 50}));
+    // Two attributes of one character below the block, 2 high; one of them invisible.
+    ref->addAttribute("VISTO", "a", {100, 20, 0}, 2.0);
+    ref->addAttribute("OCULTO", "b", {100, -40, 0}, 2.0)->setInvisible(true);
+    ASSERT_TRUE(CICad::GetExtensao(id, xMax, xMin, yMax, yMin, false));
+    EXPECT_EQ(yMin, 50);
+    ASSERT_TRUE(CICad::GetExtensao(id, xMax, xMin, yMax, yMin, true));
+    EXPECT_EQ(QList<double>({xMax, xMin, yMax, yMin}), QList<double>({120, 100, 50, -40}));
+}
+
 }  // namespace
 
 namespace {
