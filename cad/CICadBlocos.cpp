@@ -125,8 +125,9 @@ bool CICad::RecarregaBloco(const QString& arquivo, const QString& nome) {
     zvdb::DeepCloner(*db, *db).cloneEntities(fontes, *existente);
     novo->erase();
     const OdDbObjectId definicao = Id(existente);
-    for (zvdb::BlockRecord* dono : {db->modelSpace(), db->paperSpace()}) {
-        if (!dono) continue;
+    // Every reference: those of model and paper space and those nested in other blocks.
+    for (zvdb::BlockRecord* dono : db->blocks()) {
+        if (dono->isErased()) continue;
         for (zvdb::Entity* entidade : dono->entities()) {
             auto* ref = dynamic_cast<zvdb::BlockReference*>(entidade);
             if (!ref || ref->blockName() != existente->name()) continue;

@@ -173,6 +173,32 @@ TEST_F(FacadeFixture, RedefiningABlockKeepsValuesAndDropsRemovedTags) {
         EXPECT_FALSE(QString::fromStdString(std::string(bloco->name())).startsWith("ZV_TMP_"));
 }
 
+// References inside other blocks are refreshed like those of model space.
+TEST_F(FacadeFixture, RedefiningABlockRefreshesReferencesNestedInOtherBlocks) {
+    const QString v1 = arquivoBloco("REGUA_V1", {"REGUA", "VELHO"});
+    const OdDbObjectId solto = CICad::InsereBloco(v1, "BORNE_C", "0", 0, 0, 0, 0);
+    OdDbObjectId definicao;
+    ASSERT_TRUE(CICad::GetBlocoId("BORNE_C", definicao));
+    zvdb::BlockRecord* grupo = db().createBlock("GRUPO");
+    zvdb::BlockReference* aninhada =
+        grupo->addBlockReference(*db().block("BORNE_C"), {5, 5, 0}, {1, 1, 1}, 0, "0");
+    const OdDbObjectId dentro(&db(), aninhada->handle());
+    CICad::CriarAtributos(definicao, dentro);
+    CICad::SetAtributo(dentro, "REGUA", "X9");
+    CICad::SetAtributo(solto, "REGUA", "X1");
+    ASSERT_TRUE(CICad::RecarregaBloco(arquivoBloco("REGUA_V2", {"REGUA", "NOVO"}), "BORNE_C"));
+    auto pares = [](const OdDbObjectId& ref) {
+        std::unique_ptr<zv::CEListaAtributos> atributos;
+        CICad::GetAtributos(ref, atributos, false, false);
+        QStringList texto;
+        for (int i = 0; atributos && i < atributos->Quantidade(); ++i)
+            texto << (*atributos)[i].GetTag() + "=" + (*atributos)[i].GetValor();
+        return texto;
+    };
+    EXPECT_EQ(pares(solto), QStringList({"REGUA=X1", "NOVO="}));
+    EXPECT_EQ(pares(dentro), QStringList({"REGUA=X9", "NOVO="}));
+}
+
 TEST_F(FacadeFixture, AttributesByLanguageTriple) {
     const QString caminho = arquivoBloco("TERMINAL_EN", {"STRIP", "NUMBER"});
     const OdDbObjectId ref = CICad::InsereBloco(caminho, "TERMINAL_EN", "0", 0, 0, 0, 0);
