@@ -116,10 +116,9 @@ std::vector<CEPaginaLista> CCBorneGrfWriter::Diagrama(VetorItens& itens, CETempl
             }
         }
         if (preenche && (i + 1 == n || atual != seguinte)) Preenche(paginas.back(), grade, item);
-        if (quebra) {
-            NovaPagina(paginas, grade, *presentes[size_t(i + 1)], i + 1);
-            continue;
-        }
+        if (quebra) NovaPagina(paginas, grade, *presentes[size_t(i + 1)], i + 1);
+        // The column end runs after a break too: with no rows per column it moves the new
+        // page's first row on a column, or on a page when there is one column.
         if (grade.contagem >= grade.linhas) {
             grade.contagem = 0;
             ++grade.coluna;

@@ -75,8 +75,10 @@ void CCBorneDataReader::LeLado(CEItemLista& item, const OdDbObjectId& borne, con
     const bool invertido = item.valorCampo("INVERTIDO").toUpper() == "S";
     const bool fimNaInsercao = lado.insercao != invertido;
     const QString sufixo = fimNaInsercao ? "_FIM" : "_INI";
-    const QString layer = CICad::GetLayerEntidade(borne);
+    // A stale handle in the connection answer: the element is skipped, the side stays blank.
     const OdDbObjectId elemento = CICad::IdDoHandle(vizinho, borne.database());
+    if (elemento.isNull()) return;
+    const QString layer = CICad::GetLayerEntidade(borne);
     const OdDbObjectId fio = FioNoPonto(layer, aqui);
     const CEPonto r = PontoDaConexao(NumeroDoFio(fio), vizinho);
     LeBloco(sufixo, item, elemento, &modelo);
@@ -298,7 +300,9 @@ VetorItens ColetaJumper(CEItemLista* inicio, const IndiceBornes& indice,
         pilha.pop_back();
         cadeia.push_back(item);
         std::vector<CEItemLista*> achados;
-        for (const QString& token : item->valorCampo("JUMPER").split(',')) {
+        // Empty tokens are dropped: one would match any terminal whose strip and number
+        // read empty in some language, i.e. every terminal tagged in another one.
+        for (const QString& token : ZVString(item->valorCampo("JUMPER")).Divide(",")) {
             for (int i = 0; i < 3; ++i) {
                 CEItemLista* achado = indice.Busca(*item, i, token);
                 if (!achado) continue;

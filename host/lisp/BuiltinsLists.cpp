@@ -3,6 +3,8 @@
 #include "Equality.h"
 #include "Interpreter.h"
 
+#include <algorithm>
+
 namespace zvlisp {
 
 namespace {
@@ -107,8 +109,11 @@ auto comparator(Interpreter& in, const Value& function) {
     };
 }
 
+// Equal elements come out last one first, as the dialect's documented results show: the
+// list is sorted stably from its end.
 Value sort(Interpreter& in, Args a) {
     std::vector<Value> items = in.toVector(a[0]);
+    std::reverse(items.begin(), items.end());
     mergeSort(items, comparator(in, in.toFunction(a[1])));
     // Equal integers and symbols collapse into one, as the dialect has always done.
     std::vector<Value> kept;
@@ -123,7 +128,7 @@ Value sort(Interpreter& in, Args a) {
 Value sortIndices(Interpreter& in, Args a) {
     const std::vector<Value> items = in.toVector(a[0]);
     std::vector<Value> indices;
-    for (size_t i = 0; i < items.size(); ++i)
+    for (size_t i = items.size(); i-- > 0;)
         indices.push_back(Value::integer(std::int32_t(i)));
     auto less = comparator(in, in.toFunction(a[1]));
     mergeSort(indices, [&](const Value& x, const Value& y) {

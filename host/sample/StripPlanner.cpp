@@ -20,8 +20,15 @@ const TerminalKind kKinds[] = {{"1001", "BORNE_PASSAGEM"}, {"1001", "BORNE_PASSA
                                {"1005", "BORNE_TERRA"},    {"1007", "BORNE_SECCIONAVEL"},
                                {"1008", "BORNE_FUSIVEL"},  {"1009", "BORNE_DOIS_NIVEIS"}};
 
-// "n+1,n+2" style list of the group's other members.
-std::string jumperText(int first, int size, int self) {
+// How a jumper group writes its texts. Users write them all these ways: every member
+// naming the others, one member naming the others while they name nothing, and with a
+// trailing comma. The groups take them in turn, so no random draw changes.
+enum class JumperStyle { BothWays, FromFirst, BothWaysTrailingComma, FromLastTrailingComma };
+
+// "n+1,n+2" style list of the group's other members, as the style wants it.
+std::string jumperText(int first, int size, int self, JumperStyle style) {
+    if (style == JumperStyle::FromFirst && self != first) return {};
+    if (style == JumperStyle::FromLastTrailingComma && self != first + size - 1) return {};
     char buffer[64];
     int used = 0;
     for (int n = first; n < first + size; ++n) {
@@ -29,7 +36,10 @@ std::string jumperText(int first, int size, int self) {
         used += std::snprintf(buffer + used, sizeof buffer - static_cast<std::size_t>(used),
                               used ? ",%d" : "%d", n);
     }
-    return std::string(buffer, static_cast<std::size_t>(used));
+    std::string text(buffer, static_cast<std::size_t>(used));
+    if (style == JumperStyle::BothWaysTrailingComma || style == JumperStyle::FromLastTrailingComma)
+        text += ',';
+    return text;
 }
 
 }  // namespace
@@ -71,9 +81,11 @@ std::vector<PlannedTerminal> StripPlanner::plan(int count) {
             groupFirst = t.number;
             groupSize = random_.between(2, 3);
             jumperLeft_ = groupSize;
+            ++jumperGroups_;
         }
         if (jumperLeft_ > 0) {
-            t.jumper = jumperText(groupFirst, groupSize, t.number);
+            t.jumper = jumperText(groupFirst, groupSize, t.number,
+                                  static_cast<JumperStyle>(jumperGroups_ % 4));
             --jumperLeft_;
         }
         const TerminalKind& kind = kKinds[random_.below(10)];

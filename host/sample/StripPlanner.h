@@ -1,7 +1,7 @@
 #pragma once
 // Plans the terminals of a sample project: strips of varied length in the three tag
-// languages, some starting above 1, gaps in the numbering, jumpers between neighbours,
-// inverted terminals and a few BOR- blocks.
+// languages, some starting above 1, gaps in the numbering, jumpers between neighbours (both
+// ways, one way, with trailing commas), inverted terminals and a few BOR- blocks.
 #include <string>
 #include <vector>
 #include "sample/SampleRandom.h"
@@ -42,10 +42,11 @@ private:
     std::string prefix_;
     int stripIndex_;
     std::string stripName_;
-    int left_ = 0;        // terminals left on the current strip
-    int next_ = 1;        // next number on it
-    int jumperLeft_ = 0;  // members of the current jumper group still to place
-    int* projectNext_;    // the project's next number, when numbers run on
+    int left_ = 0;          // terminals left on the current strip
+    int next_ = 1;          // next number on it
+    int jumperLeft_ = 0;    // members of the current jumper group still to place
+    int jumperGroups_ = 0;  // groups so far: how the next one writes its texts
+    int* projectNext_;      // the project's next number, when numbers run on
 };
 
 }  // namespace zvsample

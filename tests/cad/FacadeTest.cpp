@@ -173,6 +173,32 @@ TEST_F(FacadeFixture, RedefiningABlockKeepsValuesAndDropsRemovedTags) {
         EXPECT_FALSE(QString::fromStdString(std::string(bloco->name())).startsWith("ZV_TMP_"));
 }
 
+// References inside other blocks are refreshed like those of model space.
+TEST_F(FacadeFixture, RedefiningABlockRefreshesReferencesNestedInOtherBlocks) {
+    const QString v1 = arquivoBloco("REGUA_V1", {"REGUA", "VELHO"});
+    const OdDbObjectId solto = CICad::InsereBloco(v1, "BORNE_C", "0", 0, 0, 0, 0);
+    OdDbObjectId definicao;
+    ASSERT_TRUE(CICad::GetBlocoId("BORNE_C", definicao));
+    zvdb::BlockRecord* grupo = db().createBlock("GRUPO");
+    zvdb::BlockReference* aninhada =
+        grupo->addBlockReference(*db().block("BORNE_C"), {5, 5, 0}, {1, 1, 1}, 0, "0");
+    const OdDbObjectId dentro(&db(), aninhada->handle());
+    CICad::CriarAtributos(definicao, dentro);
+    CICad::SetAtributo(dentro, "REGUA", "X9");
+    CICad::SetAtributo(solto, "REGUA", "X1");
+    ASSERT_TRUE(CICad::RecarregaBloco(arquivoBloco("REGUA_V2", {"REGUA", "NOVO"}), "BORNE_C"));
+    auto pares = [](const OdDbObjectId& ref) {
+        std::unique_ptr<zv::CEListaAtributos> atributos;
+        CICad::GetAtributos(ref, atributos, false, false);
+        QStringList texto;
+        for (int i = 0; atributos && i < atributos->Quantidade(); ++i)
+            texto << (*atributos)[i].GetTag() + "=" + (*atributos)[i].GetValor();
+        return texto;
+    };
+    EXPECT_EQ(pares(solto), QStringList({"REGUA=X1", "NOVO="}));
+    EXPECT_EQ(pares(dentro), QStringList({"REGUA=X9", "NOVO="}));
+}
+
 TEST_F(FacadeFixture, AttributesByLanguageTriple) {
     const QString caminho = arquivoBloco("TERMINAL_EN", {"STRIP", "NUMBER"});
     const OdDbObjectId ref = CICad::InsereBloco(caminho, "TERMINAL_EN", "0", 0, 0, 0, 0);
@@ -200,19 +226,33 @@ TEST_F(FacadeFixture, VirtualAttributesFillEmptyFieldsWithABlank) {
     const QChar ff(0x0C);
     CICad::SetXData(id, "KVR_ZV_ATT_VIRTUAL",
                     {{1000, QString("TAG") + ff + ff + "s"},
-                     {1000, QString("CABO") + ff + "101" + ff + "N"},
-                     {1000, QString("QUEBRADO") + ff + "x"}});
+                     {1000, QString("CABO") + ff + "101"},
+                     {1000, QString("QUEBRADO") + ff + "x"},
+                     {1000, QString("CABO") + ff + "999" + ff + "N"},
+                     {1000, QString("SO")}});
+    // The list takes only records of three fields.
     std::unique_ptr<zv::CEListaAtributos> lista;
     EXPECT_EQ(CICad::GetAtributosVirtuais(id, lista), 0);
     ASSERT_EQ(lista->Quantidade(), 2);
     EXPECT_EQ((*lista)[0].GetValor(), " ");
     EXPECT_TRUE((*lista)[0].IsInvisivel());
+    EXPECT_EQ((*lista)[1].GetValor(), "999");
     EXPECT_FALSE((*lista)[1].IsInvisivel());
+    // One tag asked for: the first record whose first field is the tag answers, whatever
+    // its count of fields.
     const auto cabo = CICad::GetAtributoEntidade("CABO", id);
     ASSERT_TRUE(cabo);
     EXPECT_EQ(cabo->GetValor(), "101");
+    EXPECT_FALSE(cabo->IsInvisivel());
     EXPECT_TRUE(cabo->GetId().isNull());
-    EXPECT_FALSE(CICad::GetAtributoVirtual("QUEBRADO", id));
+    const auto quebrado = CICad::GetAtributoVirtual("QUEBRADO", id);
+    ASSERT_TRUE(quebrado);
+    EXPECT_EQ(quebrado->GetValor(), "x");
+    const auto so = CICad::GetAtributoVirtual("SO", id);
+    ASSERT_TRUE(so);
+    EXPECT_EQ(so->GetValor(), "");
+    EXPECT_TRUE(CICad::GetAtributoVirtual("TAG", id)->IsInvisivel());
+    EXPECT_FALSE(CICad::GetAtributoVirtual("FALTA", id));
     EXPECT_EQ(CICad::GetAtributosVirtuais(OdDbObjectId(), lista), 1);
 }
 
@@ -313,6 +353,27 @@ TEST_F(FacadeFixture, ExtentsOfEntitiesAndReferences) {
     const OdDbObjectId ref = CICad::InsereBloco(caminho, "CAIXA", "0", 100, 50, 0, 0);
     ASSERT_TRUE(CICad::GetExtensao(ref, xMax, xMin, yMax, yMin, false));
     EXPECT_EQ(QList<double>({xMax, xMin, yMax, yMin}), QList<double>({110, 100, 50, 50}));
+}
+
+// A reference's bounds are its block's, scaled and moved; its rotation takes no part, and
+// with attributes asked for every attribute counts, the invisible ones too.
+TEST_F(FacadeFixture, ExtentsOfAReferenceAreItsBlocksScaledAndMoved) {
+    double xMax, xMin, yMax, yMin;
+    const QString caminho = arquivoBloco("CAIXA", {});
+    const OdDbObjectId id = CICad::InsereBloco(caminho, "CAIXA", "0", 100, 50, 0, 0);
+    auto* ref = dynamic_cast<zvdb::BlockReference*>(db().objectByHandle(id.handle()));
+    ASSERT_TRUE(ref);
+    ref->setScale({2, 3, 1});
+    ref->setRotation(90);
+    ASSERT_TRUE(CICad::GetExtensao(id, xMax, xMin, yMax, yMin, false));
+    EXPECT_EQ(QList<double>({xMax, xMin, yMax, yMin}), QList<double>({120, 100, 50, 50}));
+    // Two attributes of one character below the block, 2 high; one of them invisible.
+    ref->addAttribute("VISTO", "a", {100, 20, 0}, 2.0);
+    ref->addAttribute("OCULTO", "b", {100, -40, 0}, 2.0)->setInvisible(true);
+    ASSERT_TRUE(CICad::GetExtensao(id, xMax, xMin, yMax, yMin, false));
+    EXPECT_EQ(yMin, 50);
+    ASSERT_TRUE(CICad::GetExtensao(id, xMax, xMin, yMax, yMin, true));
+    EXPECT_EQ(QList<double>({xMax, xMin, yMax, yMin}), QList<double>({120, 100, 50, -40}));
 }
 
 }  // namespace

@@ -49,11 +49,29 @@ TEST_F(ListsTest, SortingDropsDuplicateIntegersAsTheDialectDoes) {
               "((3 1) (2 2) (1 3))");
     EXPECT_EQ(ev("(vl-sort '(\"b\" \"a\" \"b\") '<)"), "(\"a\" \"b\" \"b\")");
     EXPECT_EQ(ev("(vl-sort-i '(\"a\" \"d\" \"f\" \"c\") '>)"), "(2 1 3 0)");
-    EXPECT_EQ(ev("(vl-sort-i '(3 2 1 3) '<)"), "(2 1 0 3)");
+    EXPECT_EQ(ev("(vl-sort-i '(3 2 1 3) '<)"), "(2 1 3 0)");
+    EXPECT_EQ(ev("(vl-sort-i '((1 3) (2 2) (3 1)) (function (lambda (e1 e2) (< (cadr e1) "
+                 "(cadr e2)))))"),
+              "(2 1 0)");
+    EXPECT_EQ(ev("(vl-sort-i '(a d c b a) '(lambda (s1 s2) (< (vl-symbol-name s1) "
+                 "(vl-symbol-name s2))))"),
+              "(4 0 3 2 1)");
     EXPECT_EQ(ev("(vl-sort nil '<)"), "nil");
     // An inconsistent comparison still ends with every element.
     EXPECT_EQ(ev("(length (vl-sort '(\"5\" \"3\" \"9\" \"1\" \"7\") '(lambda (a b) t)))"), "5");
     EXPECT_EQ(ev("(acad_strlsort '(\"Mary\" \"joan\" \"Jim\"))"), "(\"Jim\" \"joan\" \"Mary\")");
+}
+
+// Equal elements come out last one first, in vl-sort-i and, where they stay, in vl-sort.
+TEST_F(ListsTest, SortingPutsEqualElementsLastOneFirst) {
+    EXPECT_EQ(ev("(vl-sort-i '(1 1 1) '<)"), "(2 1 0)");
+    EXPECT_EQ(ev("(vl-sort-i '(\"b\" \"a\" \"b\" \"a\") '<)"), "(3 1 2 0)");
+    EXPECT_EQ(ev("(vl-sort-i '(2.0 1 2.0) '>)"), "(2 0 1)");
+    ev("(setq l '((1 \"a\") (0 \"b\") (1 \"c\") (0 \"d\")) f (lambda (x y) (< (car x) (car "
+       "y))))");
+    EXPECT_EQ(ev("(vl-sort l f)"), "((0 \"d\") (0 \"b\") (1 \"c\") (1 \"a\"))");
+    EXPECT_EQ(ev("(equal (vl-sort l f) (mapcar '(lambda (i) (nth i l)) (vl-sort-i l f)))"), "T");
+    EXPECT_EQ(ev("(vl-sort '(2.0 1 2.0 1) '<)"), "(1 2.0 2.0)");
 }
 
 TEST_F(ListsTest, PredicateFunctions) {

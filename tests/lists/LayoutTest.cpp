@@ -2,6 +2,7 @@
 #include "QtPrinters.h"
 #include "TemplateDouble.h"
 #include "lists/CCBorneGrfWriter.h"
+#include "readers/CCBorneDataReader.h"
 #include "readers/VetorItens.h"
 
 #include <gtest/gtest.h>
@@ -68,6 +69,25 @@ TEST_F(LayoutTest, BlankRowsBetweenStripsWhenTheBreakFlagAsksForThem) {
     EXPECT_TRUE(p[0].contains("X2:2@110,200"));
 }
 
+// With no rows per column the column ends after every row, a page break included: after a
+// strip break the new page's first row stands in its second column, and with one column
+// the break leaves an empty page behind it.
+TEST_F(LayoutTest, WithNoRowsPerColumnTheColumnEndsAfterABreakToo) {
+    modelo_.simbolos.insert("*LINHAS_POR_PAGINA*", 0);
+    borne("X1", "1"), borne("X2", "1"), borne("X2", "2");
+    EXPECT_EQ(paginas(),
+              QStringList({"1:X1 | X1:1@10,200", "1:X2 | X2:1@110,200", "2:X2 | X2:2@10,200"}));
+    modelo_.simbolos.insert("*NUMERO_COLUNA*", 1);
+    EXPECT_EQ(paginas(), QStringList({"1:X1 | X1:1@10,200", "1:X2 |", "1:X2 | X2:1@10,200",
+                                      "2:X2 | X2:2@10,200"}));
+    // A key break does the same.
+    itens_.clear();
+    modelo_.simbolos.insert("*ZV_CHAVE_QUEBRA_PAGINA*", QStringList{"LADO"});
+    borne("X3", "1")->definirCampo("LADO", "A");
+    borne("X3", "2")->definirCampo("LADO", "B");
+    EXPECT_EQ(paginas(), QStringList({"1:X3 | X3:1@10,200", "1:X3 |", "1:X3 | X3:2@10,200"}));
+}
+
 TEST_F(LayoutTest, FillingToTheEndNumbersBlankRowsAndKeysDoNotBreak) {
     modelo_.simbolos.insert("*PREENCHE_ATE_FINAL*", true);
     modelo_.simbolos.insert("*ZV_CHAVE_QUEBRA_PAGINA*", QStringList{"LADO"});
@@ -104,6 +124,33 @@ TEST_F(LayoutTest, JumperBarsKeepTheirColumnAndOverflowWhenNoneIsFree) {
     EXPECT_EQ(l[1].marcas_extra, std::vector<int>({0}));
     EXPECT_EQ(l[2].marcas_extra, std::vector<int>({2}));
     EXPECT_EQ(l[3].marcas_extra, std::vector<int>({3}));
+}
+
+// Strip X1 of 1 to 8 after a strip X0, terminal 3 bridged to 5 and 7, the others pointing
+// nowhere: one bar from 3 to 7, through 5, passing 4 and 6, and no mark anywhere else.
+TEST_F(LayoutTest, AJumperTextDrawsTheBarItNamesAndNoOther) {
+    modelo_.simbolos.insert("*LINHAS_POR_PAGINA*", 20);
+    modelo_.simbolos.insert("*QUEBRA_PAGINA*", true);
+    for (const char* n : {"1", "2"})
+        borne("X0", n)->definirCampo("JUMPER", "");
+    for (const char* n : {"1", "2", "3", "4", "5", "6", "7", "8"})
+        borne("X1", n)->definirCampo("JUMPER", n == QString("8") ? "," : "");
+    itens_[4]->definirCampo("JUMPER", "5,7");
+    CCBorneDataReader::LigaJumpers(itens_);
+    std::vector<CEPaginaLista> paginas = CCBorneGrfWriter::Diagrama(itens_, modelo_);
+    CCBorneGrfWriter::MarcaJumpers(paginas, 3);
+    ASSERT_EQ(paginas.size(), 1u);
+    QStringList marcas;
+    for (const CELinhaLista& l : paginas[0].linhas) {
+        QString texto = l.item->valorCampo("REGUA") + ":" + l.item->valorCampo("NUMERO") + " ";
+        for (int m : l.marcas)
+            texto += QString::number(m);
+        for (int m : l.marcas_extra)
+            texto += "+" + QString::number(m);
+        marcas << texto;
+    }
+    EXPECT_EQ(marcas, QStringList({"X0:1 444", "X0:2 444", "X1:1 444", "X1:2 444", "X1:3 044",
+                                   "X1:4 244", "X1:5 144", "X1:6 244", "X1:7 344", "X1:8 444"}));
 }
 
 TEST_F(LayoutTest, NoItemsNoPages) {

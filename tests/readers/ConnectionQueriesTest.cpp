@@ -5,6 +5,8 @@
 #include "cad/CICad.h"
 #include "cad/FacadeFixture.h"
 #include "drawing/Polyline.h"
+#include "lists/TemplateDouble.h"
+#include "readers/CCBorneDataReader.h"
 #include "readers/CCDataReader.h"
 #include "readers/CEAtributo.h"
 #include "readers/LeitorBase.h"
@@ -242,6 +244,30 @@ TEST_F(NeighbourTest, AWireWithOneElementGivesNoNeighbour) {
     EXPECT_EQ(r->ListaConexoes("105")->size(), 1);
     EXPECT_EQ(vizinho(s, {150, 200, 0}, false), "");
     EXPECT_EQ(vizinho(s, {150, 200, 0}, true), "");
+}
+
+// A neighbour erased after the connections were loaded answers by a handle that no longer
+// opens: the terminal's side stays blank, with no placeholder fields of a missing block.
+TEST_F(NeighbourTest, ANeighbourThatDoesNotOpenLeavesTheSideBlank) {
+    CCBorneDataReader terminais;
+    terminais.CarregaConexoesFios();
+    TemplateDouble modelo;
+    CEItemLista vivo;
+    terminais.LerLadoIni(vivo, id(t), modelo);
+    EXPECT_EQ(vivo.valorCampo("HANDLE_FIM"), handle(k));
+    k->erase();
+    CEItemLista item;
+    terminais.LerLadoIni(item, id(t), modelo);
+    terminais.LerLadoFim(item, id(t), modelo);
+    // The cut side still sees U on wire 102; the insertion side, whose K is gone, nothing.
+    EXPECT_EQ(item.valorCampo("HANDLE_INI"), handle(u));
+    EXPECT_FALSE(item.temCampo("HANDLE_FIM"));
+    EXPECT_FALSE(item.temCampo("DESCRICAO_FIM"));
+    EXPECT_FALSE(item.temCampo("POSICAO_FIM"));
+    // No field of the element; wire 101 itself still stands and the cut side reads it.
+    for (const QString& campo : item.textoCampos().split(' ', Qt::SkipEmptyParts))
+        EXPECT_FALSE(campo.endsWith("_FIM")) << campo.toStdString();
+    EXPECT_FALSE(item.valorCampo("LAYER_SEGFIM").isEmpty());
 }
 
 // ---- wire numbers, cut points and connection attributes

@@ -91,6 +91,41 @@ TEST_F(TerminalStepsTest, JumperTextsChainTerminalsWhateverLiesBetween) {
     }
 }
 
+// Terminals as the drawing gives them: every one has a JUMPER field, most of them empty, and
+// only the tags of its own language. An empty piece of a jumper text names no terminal.
+TEST_F(TerminalStepsTest, OneWayJumpersAndStrayCommasBridgeOnlyWhatTheyName) {
+    auto comJumper = [this](const char* regua, const char* numero, const char* jumper,
+                            const char* reguaCampo = "REGUA", const char* numeroCampo = "NUMERO") {
+        CEItemLista* item = borne(regua, numero, "", reguaCampo, numeroCampo);
+        item->definirCampo("JUMPER", jumper);
+        return item;
+    };
+    std::vector<CEItemLista*> x0, x1, x2;
+    for (const char* n : {"1", "2"})
+        x0.push_back(comJumper("X0", n, ""));
+    for (const char* n : {"1", "2", "3", "4", "5", "6", "7", "8", "9", "10"})
+        x1.push_back(comJumper("X1", n, ""));
+    for (const char* n : {"1", "2"})
+        x2.push_back(comJumper("X2", n, ",", "STRIP", "NUMBER"));
+    x1[2]->definirCampo("JUMPER", "5,7");  // the others point nowhere
+    x1[8]->definirCampo("JUMPER", "10,");  // one way, with a trailing comma
+    x1[9]->definirCampo("JUMPER", ",");
+    CCBorneDataReader::LigaJumpers(vetor_);
+    auto par = [](const CEItemLista* item) {
+        return QString("%1/%2").arg(
+            item->anterior ? CCBorneDataReader::Numero(*item->anterior) : "-",
+            item->proximo ? CCBorneDataReader::Numero(*item->proximo) : "-");
+    };
+    QStringList ligacoes;
+    for (const auto* grupo : {&x0, &x1, &x2})
+        for (const CEItemLista* item : *grupo)
+            ligacoes << CCBorneDataReader::Regua(*item) + ":" + CCBorneDataReader::Numero(*item) +
+                            " " + par(item);
+    EXPECT_EQ(ligacoes, QStringList({"X0:1 -/-", "X0:2 -/-", "X1:1 -/-", "X1:2 -/-", "X1:3 -/5",
+                                     "X1:4 -/-", "X1:5 3/7", "X1:6 -/-", "X1:7 5/-", "X1:8 -/-",
+                                     "X1:9 -/10", "X1:10 9/-", "X2:1 -/-", "X2:2 -/-"}));
+}
+
 TEST_F(TerminalStepsTest, ChainsFollowJumpersOfJumpersAndOtherLanguages) {
     // 3 bridges 1, 1 bridges 2 through the English tags both carry: one chain, sorted.
     CEItemLista* b3 = borne("X1", "3", "1");

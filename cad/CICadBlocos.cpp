@@ -1,0 +1,202 @@
+#include "CICad.h"
+#include "CICadInterno.h"
+
+#include "drawing/Attribute.h"
+#include "drawing/BlockRecord.h"
+#include "drawing/BlockReference.h"
+#include "drawing/DeepCloner.h"
+#include "drawing/DxfLoader.h"
+#include "drawing/Entity.h"
+#include "readers/CEAtributo.h"
+#include "readers/CEListaAtributos.h"
+#include "settings/CIMensagens.h"
+
+#include <QFile>
+#include <QRandomGenerator>
+
+#include <cmath>
+#include <exception>
+
+using namespace cicad;
+
+namespace {
+
+// A file's text for the command line: doubled separators reduced to one.
+QString CaminhoParaMensagem(QString caminho) {
+    return caminho.replace("\\\\", "\\").replace("//", "/");
+}
+
+// Reads a drawing file into a side database; null (with a line on the command line for a
+// file that is not a readable DXF) when it can't be read.
+std::unique_ptr<zvdb::Database> LeDesenho(const QString& caminho) {
+    const QString arquivo = CICad::ResolveArquivo(caminho);
+    QFile f(arquivo);
+    if (!f.open(QIODevice::ReadOnly)) return nullptr;
+    const QByteArray inicio = f.peek(6);
+    if (inicio.startsWith("AC10") || inicio.startsWith("AC1.")) {
+        CICad::Imprime("\n" + arquivo +
+                       ": a DWG drawing; this edition reads DXF drawings only. Save it as DXF.\n");
+        return nullptr;
+    }
+    try {
+        return zvdb::DxfLoader::loadFile(arquivo.toStdString());
+    } catch (const std::exception& erro) {
+        CICad::Imprime("\n" + arquivo + ": " + QString::fromUtf8(erro.what()) + "\n");
+        return nullptr;
+    }
+}
+
+void RejeitaBloco(const QString& mensagem, const QString& nome, const QString& arquivo) {
+    CICad::Imprime("\n" + mensagem + nome + " = " + CaminhoParaMensagem(arquivo) + "\n");
+}
+
+// Product block files hold one layer and no nested references.
+bool ConfereBloco(zvdb::Database& lado, const QString& nome, const QString& arquivo) {
+    if (lado.layers().size() >= 2) {
+        RejeitaBloco(CIMensagens::Mensagem("ZVINC", 17), nome, arquivo);
+        return false;
+    }
+    zvdb::BlockRecord* modelo = lado.modelSpace();
+    const std::vector<zvdb::Entity*> entidades =
+        modelo ? modelo->entities() : std::vector<zvdb::Entity*>();
+    for (zvdb::Entity* entidade : entidades)
+        if (entidade->isType("INSERT")) {
+            RejeitaBloco(CIMensagens::Mensagem("ZVINC", 18), nome, arquivo);
+            return false;
+        }
+    return true;
+}
+
+// Defines `nome` in `db` from a side database, its entities moved to the origin.
+zvdb::BlockRecord* InsereComoBloco(zvdb::Database& db, const zvdb::Database& lado,
+                                   const QString& nome) {
+    zvdb::DeepCloner clonador(lado, db);
+    zvdb::BlockRecord* bloco = clonador.cloneModelSpaceAsBlock(U8(nome));
+    if (!bloco) return nullptr;
+    const zvdb::Point3 origem = bloco->basePoint();
+    if (origem != zvdb::Point3{})
+        for (zvdb::Entity* entidade : bloco->entities())
+            entidade->moveBy(zvdb::Point3{} - origem);
+    bloco->setBasePoint({});
+    return bloco;
+}
+
+}  // namespace
+
+// ---- blocks and references
+
+bool CICad::GetBlocoId(const QString& nome, OdDbObjectId& id, zvdb::Database* database) {
+    zvdb::Database* db = Db(database);
+    zvdb::BlockRecord* bloco = db && !nome.isEmpty() ? db->block(U8(nome)) : nullptr;
+    if (bloco) id = Id(bloco);
+    return bloco != nullptr;
+}
+
+QString CICad::GetNomeBloco(const OdDbObjectId& referencia) {
+    auto* ref = Como<zvdb::BlockReference>(referencia);
+    return ref ? Q(ref->blockName()) : QString();
+}
+
+OdDbObjectId CICad::CarregaBloco(const QString& nome, const QString& arquivo) {
+    zvdb::Database* db = GetDatabase();
+    if (!db || !ExisteArquivo(arquivo)) return {};
+    std::unique_ptr<zvdb::Database> lado = LeDesenho(arquivo);
+    if (!lado || !ConfereBloco(*lado, nome, arquivo)) return {};
+    return Id(InsereComoBloco(*db, *lado, nome));
+}
+
+bool CICad::RecarregaBloco(const QString& arquivo, const QString& nome) {
+    zvdb::Database* db = GetDatabase();
+    if (!db) return false;
+    std::unique_ptr<zvdb::Database> lado = ExisteArquivo(arquivo) ? LeDesenho(arquivo) : nullptr;
+    if (!lado || !ConfereBloco(*lado, nome, arquivo)) return false;
+    zvdb::BlockRecord* existente = db->block(U8(nome));
+    if (!existente) return InsereComoBloco(*db, *lado, nome) != nullptr;
+    QString temporario;
+    do {
+        temporario = "ZV_TMP_" + QString::number(QRandomGenerator::global()->bounded(1 << 30));
+    } while (db->block(U8(temporario)));
+    zvdb::BlockRecord* novo = InsereComoBloco(*db, *lado, temporario);
+    if (!novo) return false;
+    existente->setBasePoint({});
+    for (zvdb::Entity* entidade : existente->entities())
+        entidade->erase();
+    const std::vector<zvdb::Entity*> fontes = novo->entities();
+    zvdb::DeepCloner(*db, *db).cloneEntities(fontes, *existente);
+    novo->erase();
+    const OdDbObjectId definicao = Id(existente);
+    // Every reference: those of model and paper space and those nested in other blocks.
+    for (zvdb::BlockRecord* dono : db->blocks()) {
+        if (dono->isErased()) continue;
+        for (zvdb::Entity* entidade : dono->entities()) {
+            auto* ref = dynamic_cast<zvdb::BlockReference*>(entidade);
+            if (!ref || ref->blockName() != existente->name()) continue;
+            std::unique_ptr<zv::CEListaAtributos> valores;
+            GetAtributos(Id(ref), valores, true, false);
+            for (zvdb::Attribute* atributo : ref->attributes())
+                atributo->erase();
+            CriarAtributos(definicao, Id(ref));
+            if (valores) SetAtributosLista(Id(ref), *valores);
+        }
+    }
+    return true;
+}
+
+OdDbObjectId CICad::InsereBloco(const QString& arquivo, const QString& nome, const QString& layer,
+                                double x, double y, double z, double rotacao) {
+    zvdb::Database* db = GetDatabase();
+    if (!db) return {};
+    OdDbObjectId bloco;
+    if (!GetBlocoId(nome, bloco, db)) bloco = CarregaBloco(nome, arquivo);
+    CriaLayer(layer, db);
+    auto* definicao = Como<zvdb::BlockRecord>(bloco);
+    zvdb::BlockRecord* modelo = db->modelSpace();
+    if (!definicao || !modelo) return {};
+    // Insertion points and rotations go through single precision on purpose.
+    const zvdb::Point3 ponto{Simples(x), Simples(y), Simples(z)};
+    const double graus = Simples(rotacao) * 180.0 / M_PI;
+    zvdb::BlockReference* ref =
+        modelo->addBlockReference(*definicao, ponto, {1, 1, 1}, graus, U8(layer));
+    CriarAtributos(bloco, Id(ref));
+    return Id(ref);
+}
+
+std::unique_ptr<zv::CEListaAtributos> CICad::GetDefinicoesAtributos(const QString& arquivo,
+                                                                    const QString& nome) {
+    OdDbObjectId id;
+    if (!GetBlocoId(nome, id)) id = CarregaBloco(nome, arquivo);
+    auto* bloco = Como<zvdb::BlockRecord>(id);
+    if (!bloco) return nullptr;
+    auto lista = std::make_unique<zv::CEListaAtributos>();
+    for (zvdb::Attribute* definicao : bloco->attributeDefinitions()) {
+        if (definicao->isConstant()) continue;
+        lista->Adicionar(std::make_unique<zv::CEAtributo>(
+            Q(definicao->tag()), Q(definicao->prompt()), Q(definicao->textValue()), Id(definicao),
+            definicao->isInvisible()));
+    }
+    return lista;
+}
+
+OdDbObjectId CICad::GetReferenciaNoLayer(const QString& nome, const QString& layer) {
+    zvdb::Database* db = GetDatabase();
+    if (!db || !db->modelSpace()) return {};
+    const std::string camada = U8(layer);
+    for (zvdb::Entity* entidade : db->modelSpace()->entities()) {
+        auto* ref = dynamic_cast<zvdb::BlockReference*>(entidade);
+        if (ref && ref->layer() == camada &&
+            Q(ref->blockName()).compare(nome, Qt::CaseInsensitive) == 0)
+            return Id(ref);
+    }
+    return {};
+}
+
+QString CICad::GetValorSimboloPagina(const QString& tag, const QString& nome,
+                                     const QString& layer) {
+    for (const QString& forma : QStringList{nome, nome + "_C", nome + "_I"}) {
+        const OdDbObjectId ref = GetReferenciaNoLayer(forma, layer);
+        if (ref.isNull()) continue;
+        if (std::unique_ptr<zv::CEAtributo> atributo = GetAtributo(tag, ref))
+            return atributo->GetValor();
+    }
+    return {};
+}

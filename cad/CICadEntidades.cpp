@@ -1,0 +1,168 @@
+#include "CICad.h"
+#include "CICadInterno.h"
+
+#include "drawing/Attribute.h"
+#include "drawing/BlockRecord.h"
+#include "drawing/BlockReference.h"
+#include "drawing/Dictionary.h"
+#include "drawing/Entity.h"
+#include "drawing/Extents.h"
+#include "drawing/Polyline.h"
+
+#include <cmath>
+
+using namespace cicad;
+
+namespace {
+
+// The block's bounds scaled by the reference's factors and moved to its position, without
+// its rotation; with `comAtributos` merged with those of every attribute, visible or not.
+zvdb::BoundingBox ExtensaoReferencia(const zvdb::BlockReference& ref, bool comAtributos) {
+    zvdb::BoundingBox caixa;
+    double xMax, xMin, yMax, yMin;
+    if (CICad::GetExtensaoBloco(Id(ref.definition()), xMax, xMin, yMax, yMin)) {
+        const zvdb::Point3 escala = ref.scale(), posicao = ref.position();
+        // A negative factor mirrors: its corners are sorted again by the box.
+        for (const double x : {xMin, xMax})
+            for (const double y : {yMin, yMax})
+                caixa.add(
+                    zvdb::Point3{posicao.x + x * escala.x, posicao.y + y * escala.y, posicao.z});
+    }
+    if (comAtributos)
+        for (const zvdb::Attribute* atributo : ref.attributes())
+            caixa.add(zvdb::Extents::ofEntity(*atributo, false));
+    return caixa;
+}
+
+}  // namespace
+
+bool CICad::GetExtensao(const OdDbObjectId& entidade, double& xMax, double& xMin, double& yMax,
+                        double& yMin, bool comAtributos) {
+    auto* e = Como<zvdb::Entity>(entidade);
+    if (!e) return false;
+    const std::string_view tipo = e->type();
+    if ((tipo == "TEXT" || tipo == "MTEXT") && !comAtributos) return false;
+    zvdb::BoundingBox caixa;
+    if (auto* ref = dynamic_cast<zvdb::BlockReference*>(e)) {
+        caixa = ExtensaoReferencia(*ref, comAtributos);
+    } else if (tipo == "ELLIPSE") {
+        const zvdb::Point3 centro = e->point(10);
+        const double raio = zvdb::length(e->point(11));
+        caixa.add(centro - zvdb::Point3{raio, raio, 0});
+        caixa.add(centro + zvdb::Point3{raio, raio, 0});
+    } else if (tipo == "LWPOLYLINE" || tipo == "POLYLINE" || tipo == "LINE" || tipo == "CIRCLE" ||
+               tipo == "TEXT" || tipo == "MTEXT") {
+        caixa = zvdb::Extents::ofEntity(*e, comAtributos);
+    }
+    if (caixa.isEmpty()) return false;
+    xMax = caixa.max.x, xMin = caixa.min.x, yMax = caixa.max.y, yMin = caixa.min.y;
+    return true;
+}
+
+bool CICad::GetExtensaoBloco(const OdDbObjectId& bloco, double& xMax, double& xMin, double& yMax,
+                             double& yMin) {
+    auto* b = Como<zvdb::BlockRecord>(bloco);
+    if (!b) return false;
+    const zvdb::BoundingBox caixa = zvdb::Extents::ofBlock(*b);
+    if (caixa.isEmpty()) return false;
+    xMax = caixa.max.x, xMin = caixa.min.x, yMax = caixa.max.y, yMin = caixa.min.y;
+    return true;
+}
+
+// ---- entities, as the readers see them
+
+QString CICad::TipoEntidade(const OdDbObjectId& id) {
+    zvdb::DbObject* objeto = Objeto(id);
+    return objeto ? Q(objeto->type()) : QString();
+}
+
+bool CICad::EhReferencia(const OdDbObjectId& id) {
+    return Como<zvdb::BlockReference>(id);
+}
+
+bool CICad::EhPolilinha(const OdDbObjectId& id) {
+    return Como<zvdb::Polyline>(id);
+}
+
+QString CICad::GetLayerEntidade(const OdDbObjectId& id) {
+    auto* entidade = Como<zvdb::Entity>(id);
+    return entidade ? Q(entidade->layer()) : QString();
+}
+
+std::vector<CEPonto> CICad::GetVertices(const OdDbObjectId& polilinha) {
+    std::vector<CEPonto> pontos;
+    if (auto* p = Como<zvdb::Polyline>(polilinha))
+        for (const zvdb::Point3& v : p->vertices())
+            pontos.push_back({v.x, v.y, v.z});
+    return pontos;
+}
+
+CEPonto CICad::GetPosicao(const OdDbObjectId& referencia) {
+    auto* ref = Como<zvdb::BlockReference>(referencia);
+    if (!ref) return {};
+    const zvdb::Point3 p = ref->position();
+    return {p.x, p.y, p.z};
+}
+
+double CICad::GetRotacao(const OdDbObjectId& referencia) {
+    auto* ref = Como<zvdb::BlockReference>(referencia);
+    return ref ? ref->rotation() * M_PI / 180.0 : 0.0;
+}
+
+CEPonto CICad::GetPosicaoTexto(const OdDbObjectId& texto) {
+    auto* entidade = Como<zvdb::Entity>(texto);
+    if (!entidade) return {};
+    const zvdb::Point3 p = entidade->point(10);
+    return {p.x, p.y, p.z};
+}
+
+OdDbObjectId CICad::GetDono(const OdDbObjectId& id) {
+    zvdb::DbObject* objeto = Objeto(id);
+    return objeto ? Id(objeto->owner()) : OdDbObjectId();
+}
+
+OdDbObjectId CICad::GetModelSpace(zvdb::Database* database) {
+    zvdb::Database* db = Db(database);
+    return db ? Id(db->modelSpace()) : OdDbObjectId();
+}
+
+std::vector<std::pair<QString, OdDbObjectId>> CICad::GetBlocos(zvdb::Database* database) {
+    std::vector<std::pair<QString, OdDbObjectId>> blocos;
+    if (zvdb::Database* db = Db(database))
+        for (zvdb::BlockRecord* bloco : db->blocks())
+            blocos.emplace_back(Q(bloco->name()), Id(bloco));
+    return blocos;
+}
+
+QHash<QString, std::vector<OdDbObjectId>> CICad::GetReferenciasPorBloco(zvdb::Database* database) {
+    QHash<QString, std::vector<OdDbObjectId>> referencias;
+    zvdb::Database* db = Db(database);
+    if (!db) return referencias;
+    for (zvdb::BlockRecord* bloco : db->blocks())
+        bloco->forEachEntity([&referencias](zvdb::Entity& entidade) {
+            if (auto* ref = dynamic_cast<zvdb::BlockReference*>(&entidade))
+                referencias[Q(ref->blockName()).toUpper()].push_back(Id(ref));
+        });
+    return referencias;
+}
+
+std::vector<std::pair<QString, OdDbObjectId>> CICad::GetEntradasDicionario(
+    const QStringList& caminho, zvdb::Database* database) {
+    std::vector<std::pair<QString, OdDbObjectId>> entradas;
+    zvdb::Database* db = Db(database);
+    std::vector<std::string> nomes;
+    for (const QString& nome : caminho)
+        nomes.push_back(U8(nome));
+    zvdb::Dictionary* dicionario = db ? db->dictionaryAt(nomes, false) : nullptr;
+    if (!dicionario) return entradas;
+    for (const zvdb::Dictionary::Entry& entrada : dicionario->entries())
+        if (zvdb::DbObject* objeto = db->objectByHandle(entrada.handle))
+            entradas.emplace_back(Q(entrada.name), Id(objeto));
+    return entradas;
+}
+
+bool CICad::PontosIguais(const CEPonto& a, const CEPonto& b) {
+    constexpr double kTolerancia = 1e-10;
+    return std::abs(a.x - b.x) <= kTolerancia && std::abs(a.y - b.y) <= kTolerancia &&
+           std::abs(a.z - b.z) <= kTolerancia;
+}
