@@ -265,14 +265,18 @@ int CIFerramentaCatalogo::Configurar(const QStringList& atribuicoes) {
             return 2;
         }
     }
+    QList<QPair<QString, QString>> valores;
     for (const QString& atribuicao : atribuicoes) {
         const int igual = atribuicao.indexOf('=');
         const QString chave = atribuicao.left(igual);
         const QString valor = atribuicao.mid(igual + 1);
-        if (chave == "DBPass")
-            CIRegistro::SetDBPass(valor);
-        else
-            CIRegistro::GravarRegistro(chave, valor);
+        valores << qMakePair(chave, chave == "DBPass" ? CIRegistro::SenhaGuardada(valor) : valor);
+    }
+    // One save for all of them: either every setting is written or none.
+    QString erro;
+    if (!CIRegistro::GravarRegistros(valores, &erro)) {
+        Erro(erro);
+        return 1;
     }
     Saida("settings: " + CIRegistro::ArquivoRegistro());
     return 0;

@@ -3,7 +3,9 @@
 
 #include "settings/CIRegistro.h"
 
+#include <QDir>
 #include <QFile>
+#include <QFileInfo>
 #include <QProcess>
 
 namespace {
@@ -110,6 +112,70 @@ TEST_F(FerramentaTest, SetWritesOnlyCatalogueSettings) {
     EXPECT_EQ(CIRegistro::Database(), "SQLITE");  // nothing written when one is refused
     EXPECT_EQ(Ferramenta({}, &saida, &erros), 2);
     EXPECT_TRUE(erros.contains("usage: zvhost catalogue"));
+}
+
+TEST_F(FerramentaTest, SetOnASettingsFileThatDoesNotParseSaysSoAndWritesNothing) {
+    const QString arquivo = CIRegistro::ArquivoRegistro();
+    const QByteArray estragado = "<registros><registro key=\"ZVPalette\" value=\"x\"/>\n";
+    ASSERT_TRUE(QDir().mkpath(QFileInfo(arquivo).absolutePath()));
+    QFile f(arquivo);
+    ASSERT_TRUE(f.open(QIODevice::WriteOnly));
+    f.write(estragado);
+    f.close();
+    QString saida, erros;
+    EXPECT_EQ(Ferramenta({"--set", "Database=SQLITE", "DBName=c.db"}, &saida, &erros), 1);
+    EXPECT_TRUE(erros.startsWith("zvhost catalogue: the settings file " + arquivo +
+                                 " does not parse (line 2"))
+        << erros.toStdString();
+    EXPECT_TRUE(erros.contains("nothing was saved"));
+    EXPECT_TRUE(saida.isEmpty());
+    ASSERT_TRUE(f.open(QIODevice::ReadOnly));
+    EXPECT_EQ(f.readAll(), estragado);
+}
+
+// Runs zvhost with arguments in a shell whose files can't grow past `blocos` blocks of
+// 512 bytes, the signal of that limit ignored; its exit status and stderr.
+int ZvhostSobLimite(int blocos, const QStringList& argumentos, QString* erros) {
+    QProcess shell;
+    QStringList comando{QString(ZV_BIN_DIR) + "/zvhost"};
+    for (const QString& a : argumentos)
+        comando << "'" + QString(a).replace("'", "'\\''") + "'";
+    shell.start(
+        "/bin/sh",
+        {"-c", QString("ulimit -f %1; trap '' XFSZ; exec %2").arg(blocos).arg(comando.join(' '))});
+    if (!shell.waitForFinished(60000)) return -1;
+    *erros = QString::fromUtf8(shell.readAllStandardError());
+    return shell.exitStatus() == QProcess::NormalExit ? shell.exitCode() : -1;
+}
+
+TEST_F(FerramentaTest, ASaveOfTheSettingsThatFailsExitsOneAndKeepsTheOldFile) {
+    ASSERT_TRUE(CIRegistro::GravarRegistros({{"Database", "SQLITE"}, {"DBName", "c.db"}}));
+    const QString arquivo = CIRegistro::ArquivoRegistro();
+    QFile f(arquivo);
+    ASSERT_TRUE(f.open(QIODevice::ReadOnly));
+    const QByteArray antes = f.readAll();
+    f.close();
+    QString erros;
+    // Small settings still save under the limit.
+    EXPECT_EQ(ZvhostSobLimite(64, {"catalogue", "--set", "libLang=2"}, &erros), 0)
+        << erros.toStdString();
+    EXPECT_EQ(CIRegistro::LibLang(), "2");
+    ASSERT_TRUE(f.open(QIODevice::ReadOnly));
+    const QByteArray depois = f.readAll();
+    f.close();
+    EXPECT_NE(depois, antes);
+
+    EXPECT_EQ(
+        ZvhostSobLimite(64, {"catalogue", "--set", "NetworkZV=" + QString(70000, 'p'), "libLang=3"},
+                        &erros),
+        1);
+    EXPECT_TRUE(
+        erros.contains("zvhost catalogue: could not save " + arquivo + ": File too large\n"))
+        << erros.toStdString();
+    ASSERT_TRUE(f.open(QIODevice::ReadOnly));
+    EXPECT_EQ(f.readAll(), depois);
+    EXPECT_EQ(QDir(QFileInfo(arquivo).absolutePath()).entryList(QDir::Files | QDir::Hidden),
+              QStringList({"FVREG2022SP0.xml"}));
 }
 
 TEST_F(FerramentaTest, TheHostSubcommandRunsTheModulesTool) {
