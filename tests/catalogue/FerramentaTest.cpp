@@ -44,6 +44,52 @@ TEST_F(FerramentaTest, CheckWithoutACatalogueSaysWhy) {
     EXPECT_TRUE(erros.contains("the catalogue file does not exist: " + Pasta() + "/falta.db"));
 }
 
+TEST_F(FerramentaTest, CheckOpensOnlyWhatAStatementRunsOn) {
+    QFile texto(Pasta() + "/texto.db");
+    ASSERT_TRUE(texto.open(QIODevice::WriteOnly));
+    texto.write("isto não é um catálogo\n");
+    texto.close();
+    UsarSqlite("texto.db", "1");
+    QString saida, erros;
+    EXPECT_EQ(Ferramenta({"--check"}, &saida, &erros), 1);
+    EXPECT_TRUE(saida.contains("opens: no\n")) << saida.toStdString();
+    EXPECT_FALSE(saida.contains("opens: yes"));
+    EXPECT_TRUE(erros.contains("no statement runs on the catalogue: file is not a database"))
+        << erros.toStdString();
+
+    ASSERT_TRUE(Construir(Pasta() + "/outro.db", {QString(ZV_TEST_DIR) + "/outro-programa.sql"}));
+    UsarSqlite("outro.db", "1");
+    saida.clear();
+    erros.clear();
+    EXPECT_EQ(Ferramenta({"--check"}, &saida, &erros), 1);
+    EXPECT_TRUE(saida.contains("opens: yes\n"));
+    EXPECT_TRUE(saida.contains("upgrades to run: none (not a catalogue)\n")) << saida.toStdString();
+    EXPECT_TRUE(erros.contains("this database is not a ZVListas catalogue")) << erros.toStdString();
+    saida.clear();
+    EXPECT_EQ(Ferramenta({"--sql", "select name from sqlite_master"}, &saida), 0);
+    EXPECT_EQ(saida, "name\nclientes\n");
+
+    QFile vazio(Pasta() + "/vazio.db");
+    ASSERT_TRUE(vazio.open(QIODevice::WriteOnly));
+    vazio.close();
+    UsarSqlite("vazio.db", "1");
+    saida.clear();
+    EXPECT_EQ(Ferramenta({"--check"}, &saida, &erros), 0);
+    EXPECT_TRUE(saida.contains("tables: none (an empty database)\n")) << saida.toStdString();
+    EXPECT_TRUE(saida.contains("  2: create table BDTIPOCOMP\n")) << saida.toStdString();
+}
+
+TEST_F(FerramentaTest, CheckTellsASettingsFileThatDoesNotParse) {
+    UsarDemo();
+    QFile f(CIRegistro::ArquivoRegistro());
+    ASSERT_TRUE(f.open(QIODevice::Append));
+    f.write("<registro key=\"solto\"/>");
+    f.close();
+    QString saida, erros;
+    EXPECT_EQ(Ferramenta({"--check"}, &saida, &erros), 1);
+    EXPECT_TRUE(erros.contains("does not parse")) << erros.toStdString();
+}
+
 TEST_F(FerramentaTest, SqlPrintsRowsAndLookupRunsTheReadersPath) {
     UsarDemo("2");
     QString saida, erros;
@@ -187,6 +233,26 @@ TEST_F(FerramentaTest, TheHostSubcommandRunsTheModulesTool) {
     ASSERT_TRUE(zvhost.waitForFinished(60000));
     EXPECT_EQ(zvhost.exitCode(), 0) << zvhost.readAllStandardError().toStdString();
     EXPECT_EQ(QString::fromUtf8(zvhost.readAllStandardOutput()), "Fuente conmutada 24 V CC 5 A\n");
+
+    // Text that would rewrite the statement finds nothing, at once.
+    zvhost.setArguments({"catalogue", "--lookup", "DescricaoComp", "NOPE' OR '1'='1"});
+    zvhost.start();
+    ASSERT_TRUE(zvhost.waitForFinished(60000));
+    EXPECT_EQ(zvhost.exitCode(), 0);
+    EXPECT_EQ(QString::fromUtf8(zvhost.readAllStandardOutput()),
+              "Component without description in the catalogue\n");
+    const QString erros = QString::fromUtf8(zvhost.readAllStandardError());
+    EXPECT_TRUE(erros.contains("empty answer")) << erros.toStdString();
+    EXPECT_FALSE(erros.contains("SQL ERROR")) << erros.toStdString();
+    zvhost.setArguments({"catalogue", "--lookup", "ListaComp", "x'; DROP TABLE BDZV; --", "1"});
+    zvhost.start();
+    ASSERT_TRUE(zvhost.waitForFinished(60000));
+    EXPECT_EQ(zvhost.readAllStandardOutput(), "\n");
+    EXPECT_TRUE(zvhost.readAllStandardError().contains("empty answer"));
+    zvhost.setArguments({"catalogue", "--lookup", "ListaComp", "7001", "1"});
+    zvhost.start();
+    ASSERT_TRUE(zvhost.waitForFinished(60000));
+    EXPECT_EQ(zvhost.readAllStandardOutput(), "S\n");
 
     // A failing statement shows its message box on stderr.
     zvhost.setArguments({"catalogue", "--sql", "select NADA from BDZV"});
