@@ -235,9 +235,13 @@ int CIFerramentaCatalogo::Consulta(const QStringList& argumentos) {
         Erro("usage: --lookup " + it->first + " " + it->second.argumentos);
         return 2;
     }
+    // Such values answer empty without a statement: the connection isn't even tried.
+    bool recusada = false;
+    for (const QString& argumento : argumentos.mid(1))
+        recusada = recusada || argumento.contains('\'') || argumento.contains('\\');
     CECacheCatalogo cache;
     const QStringList resposta = it->second.rodar(cache, argumentos.mid(1));
-    if (!CEConexaoCatalogo::ObterCatalogo()->Conectado())
+    if (!recusada && !CEConexaoCatalogo::ObterCatalogo()->Conectado())
         Erro("no catalogue opens; the look-up answers as without a catalogue");
     const QChar separador(0x000C);
     for (QString linha : resposta)
@@ -245,7 +249,12 @@ int CIFerramentaCatalogo::Consulta(const QStringList& argumentos) {
     // A description the catalogue doesn't give shows as the lists' fallback text.
     const bool substituta = it->second.mensagem != 0 && resposta.size() == 1 &&
                             resposta[0] == CIMensagens::Mensagem("ZVLISTAS", it->second.mensagem);
-    if (resposta.isEmpty() || (resposta.size() == 1 && resposta[0].isEmpty()))
+    const bool vazia = resposta.isEmpty() || (resposta.size() == 1 && resposta[0].isEmpty());
+    if (recusada && (vazia || substituta))
+        Erro(
+            "empty answer: a value holding a quote or a backslash is never sent to the "
+            "catalogue");
+    else if (vazia)
         Erro("empty answer");
     else if (substituta)
         Erro("empty answer; the lists print the text above in its place");
