@@ -188,16 +188,15 @@ QString CEDialetoCatalogo::ConsultaLargura(const QString& tabela, const QString&
 }
 
 QString CEDialetoCatalogo::ConsultaTabelas() const {
+    const QString servidores =
+        "SELECT TABLE_NAME FROM INFORMATION_SCHEMA.TABLES WHERE TABLE_TYPE = 'BASE TABLE'";
     switch (familia_) {
         case Embutido:
             return "SELECT name FROM sqlite_master WHERE type = 'table'";
         case ServidorSql:
-            return "SELECT TABLE_NAME FROM INFORMATION_SCHEMA.TABLES WHERE TABLE_TYPE = 'BASE "
-                   "TABLE'";
+            return servidores;
         case Postgres:
-            return "SELECT TABLE_NAME FROM INFORMATION_SCHEMA.TABLES WHERE TABLE_TYPE = 'BASE "
-                   "TABLE' "
-                   "AND TABLE_SCHEMA NOT IN ('pg_catalog', 'information_schema')";
+            return servidores + " AND TABLE_SCHEMA NOT IN ('pg_catalog', 'information_schema')";
         default:
             return {};
     }
