@@ -54,9 +54,21 @@ QStringList PaginasIniciais() {
 
 CEAtualizacaoCatalogo::CEAtualizacaoCatalogo(CEConexaoCatalogo& conexao) : conexao_(conexao) {}
 
+bool CEAtualizacaoCatalogo::Atualizavel() {
+    const CEConexaoCatalogo::Conteudo conteudo = conexao_.Examinar();
+    return conteudo == CEConexaoCatalogo::Vazio || conteudo == CEConexaoCatalogo::Catalogo;
+}
+
 QStringList CEAtualizacaoCatalogo::Executar() {
     QStringList feitas;
-    if (!conexao_.Conectar()) return feitas;
+    // Tables are made only in a catalogue, or in an empty database: never inside someone
+    // else's data, nor in a file that is no database.
+    if (!Atualizavel()) {
+        if (conexao_.Conectado())
+            CICad::Log("Catalogue upgrades skipped: " + conexao_.TextoConexao() +
+                       " is no catalogue");
+        return feitas;
+    }
     for (const Alteracao& alteracao : Alteracoes(conexao_.Dialeto())) {
         if (!alteracao.necessaria()) continue;
         const bool ok = alteracao.aplicar();
@@ -69,7 +81,7 @@ QStringList CEAtualizacaoCatalogo::Executar() {
 
 QStringList CEAtualizacaoCatalogo::Pendentes() {
     QStringList pendentes;
-    if (!conexao_.Conectar()) return pendentes;
+    if (!Atualizavel()) return pendentes;
     for (const Alteracao& alteracao : Alteracoes(conexao_.Dialeto()))
         if (alteracao.necessaria())
             pendentes << QString("%1: %2").arg(alteracao.passo).arg(alteracao.descricao);
@@ -259,7 +271,9 @@ CEAtualizacaoCatalogo::Alteracao CEAtualizacaoCatalogo::Idiomas(const CEDialetoC
     auto aplicar = [this, faltando, tipo] {
         // Rows without a language are taken to be in the catalogue's language in use.
         const QString idioma = IdiomaDoCatalogo();
-        CIRegistro::SetLibLang(idioma);
+        QString erro;
+        if (!CIRegistro::GravarRegistro("libLang", idioma, &erro))
+            CICad::Log("Catalogue language not saved: " + erro);
         bool ok = true;
         for (const ColunaIdioma& c : kColunasIdioma) {
             if (!faltando(c)) continue;

@@ -15,11 +15,13 @@ class CEAtualizacaoCatalogo {
 public:
     explicit CEAtualizacaoCatalogo(CEConexaoCatalogo& conexao);
 
-    // Runs every upgrade in order. The changes made, one "step: change" line each; a change
-    // whose statements failed is logged and listed with "(failed)".
+    // Is the catalogue one the upgrades may change: an empty database or a catalogue?
+    bool Atualizavel();
+    // Runs every upgrade in order, when the catalogue may be changed. The changes made, one "step:
+    // change" line each; a change whose statements failed is logged and listed with "(failed)".
     QStringList Executar();
-    // The changes that Executar would make now. A table that an earlier step would create
-    // is not looked into, so its later changes show only once it exists.
+    // The changes that Executar would make now; none on what it may not change. A table that an
+    // earlier step would create is not looked into, so its later changes show only once it exists.
     QStringList Pendentes();
 
     static constexpr int kPassos = 19;

@@ -15,8 +15,6 @@ namespace {
 
 CEConexaoCatalogo* conexao = nullptr;
 
-// How long a failed opening keeps the engine alone, in milliseconds.
-const qint64 kPausaAposFalha = 10000;
 // Messages of section ZVLISTAS.
 const int kMsgSemMotorLocal = 950;
 const int kMsgSemDriver = 951;
@@ -82,7 +80,8 @@ bool CEConexaoCatalogo::Executar(const QString& instrucao) {
 
 bool CEConexaoCatalogo::Conectar() {
     if (banco_.isOpen()) return true;
-    if (falhaAbertura_.isValid() && !falhaAbertura_.hasExpired(kPausaAposFalha)) return false;
+    // After a failure every query tries again and shows why it fails: the settings may
+    // have been put right meanwhile, and an attempt costs only the opening itself.
     dialeto_ = CEDialetoCatalogo::DaConfiguracao();
     if (dialeto_.motor() == CEDialetoCatalogo::LocalDb) return AvisoLocalDb();
     const CEDialetoCatalogo::Ligacao ligacao = dialeto_.LigacaoDaConfiguracao();
@@ -94,7 +93,6 @@ bool CEConexaoCatalogo::Conectar() {
     if (arquivo && !QFileInfo(ligacao.arquivo).isFile()) return false;
     if (!QSqlDatabase::isDriverAvailable(ligacao.driver)) {
         CICad::MessageBox(CIMensagens::Mensagem("ZVLISTAS", kMsgSemDriver) + "\n" + ligacao.driver);
-        falhaAbertura_.start();
         return false;
     }
     return Abrir(ligacao);
@@ -123,7 +121,6 @@ bool CEConexaoCatalogo::Abrir(const CEDialetoCatalogo::Ligacao& ligacao) {
                       "\nCode meaning = " + erro.driverText() + "\nSource = " + ligacao.driver +
                       "\nDescription = " + erro.databaseText());
     Fechar();
-    falhaAbertura_.start();
     return false;
 }
 
@@ -181,4 +178,27 @@ int CEConexaoCatalogo::LarguraColuna(const QString& tabela, const QString& colun
                 return registro.field(i).length();
     }
     return -1;
+}
+
+const QStringList& CEConexaoCatalogo::TabelasDoCatalogo() {
+    static const QStringList tabelas = {"BDZV", "BDMENUS", "BDWIRE", "BDWENUS", "BDVERSAO"};
+    return tabelas;
+}
+
+CEConexaoCatalogo::Conteudo CEConexaoCatalogo::Examinar() {
+    if (!Conectar()) return SemConexao;
+    // An engine on a file opens anything: only a statement tells a database.
+    QStringList tabelas;
+    const QString listagem = dialeto_.ConsultaTabelas();
+    if (!listagem.isEmpty()) {
+        const CERegistrosCatalogo linhas = Rodar(listagem);
+        if (!linhas.Executada()) return Ilegivel;
+        for (int i = 0; i < linhas.Linhas(); ++i)
+            tabelas << linhas.Valor(i, 0);
+    } else {
+        tabelas = banco_.tables(QSql::Tables);
+    }
+    for (const QString& tabela : TabelasDoCatalogo())
+        if (ExisteTabela(tabela)) return Catalogo;
+    return tabelas.isEmpty() ? Vazio : Outro;
 }

@@ -4,8 +4,8 @@
 #include "CEDialetoCatalogo.h"
 #include "CERegistrosCatalogo.h"
 
-#include <QElapsedTimer>
 #include <QString>
+#include <QStringList>
 #include <QtSql/QSqlDatabase>
 
 class CEConexaoCatalogo {
@@ -42,6 +42,19 @@ public:
     // The declared width of a character column; -1 when the engine doesn't tell.
     int LarguraColuna(const QString& tabela, const QString& coluna);
 
+    // What the catalogue of the settings holds. Only an empty database or a catalogue of
+    // this product takes the upgrades' tables.
+    enum Conteudo {
+        SemConexao,  // nothing opens
+        Ilegivel,    // it opens, but no statement runs on it (a file that is no database)
+        Vazio,       // no table at all
+        Catalogo,    // a table that every catalogue has
+        Outro,       // tables, but none of a catalogue
+    };
+    Conteudo Examinar();
+    // The tables that tell a catalogue of this product.
+    static const QStringList& TabelasDoCatalogo();
+
     // Statements sent to the engine by this object, and the last one with its error.
     int InstrucoesEnviadas() const { return enviadas_; }
     QString UltimaInstrucao() const { return ultima_; }
@@ -67,9 +80,6 @@ private:
     QSqlDatabase banco_;
     CEDialetoCatalogo dialeto_;
     QString texto_;
-    // After a failed opening the engine is left alone for a moment, so a run's look-ups
-    // answer at once and show the failure once.
-    QElapsedTimer falhaAbertura_;
     bool avisouLocalDb_ = false;
     int enviadas_ = 0;
     QString ultima_;

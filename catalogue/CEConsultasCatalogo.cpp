@@ -4,6 +4,9 @@
 #include "settings/CIRegistro.h"
 
 #include <QChar>
+#include <QRegularExpression>
+
+#include <initializer_list>
 
 const char* const CEConsultasCatalogo::kTabelaComp = "BDUSER";
 const char* const CEConsultasCatalogo::kChaveComp = "USER_KEY";
@@ -13,8 +16,38 @@ const char* const CEConsultasCatalogo::kTabelaCabo = "BDCUSER";
 const char* const CEConsultasCatalogo::kChaveCabo = "CUSER_KEY";
 
 namespace {
+
 const QChar kSeparador(0x000C);
+
+// Keys come from drawings, and drawings from anyone. A value goes into its statement as it
+// is, between single quotes; one that could end the quotes (a quote, or a backslash, which
+// some engines read as an escape) or cut the text short is never sent: its look-up answers
+// empty, as a key that breaks its statement always has.
+bool Colavel(const QString& valor) {
+    for (const QChar c : valor)
+        if (c == '\'' || c == '\\' || c.unicode() == 0) return false;
+    return true;
 }
+
+bool Colaveis(std::initializer_list<QString> valores) {
+    for (const QString& valor : valores)
+        if (!Colavel(valor)) return false;
+    return true;
+}
+
+// A value pasted without quotes must be a whole number.
+bool Numero(const QString& valor) {
+    static const QRegularExpression numero("^ *[+-]?[0-9]+ *$");
+    return numero.match(valor).hasMatch();
+}
+
+// Table and column names pasted into a statement.
+bool Nome(const QString& valor) {
+    static const QRegularExpression nome("^[A-Za-z_][A-Za-z0-9_]*$");
+    return nome.match(valor).hasMatch();
+}
+
+}  // namespace
 
 CEConsultasCatalogo::CEConsultasCatalogo() : conexao_(*CEConexaoCatalogo::ObterCatalogo()) {}
 
@@ -29,24 +62,28 @@ QString CEConsultasCatalogo::Primeiro(const QString& instrucao, const QString& c
 }
 
 QString CEConsultasCatalogo::DescricaoComp(const QString& chave) const {
+    if (!Colaveis({chave, Idioma()})) return {};
     return Primeiro("select rtrim(MENU_DESCR) as MENU_DESCR from BDMENUS where MENU_KEY = '" +
                         chave + "' AND MENU_KEY_LANG = '" + Idioma() + "'",
                     "MENU_DESCR");
 }
 
 QString CEConsultasCatalogo::DescricaoFio(const QString& chave) const {
+    if (!Colaveis({chave, Idioma()})) return {};
     return Primeiro("select rtrim(WENU_DESCR) as WENU_DESCR from BDWENUS where WENU_KEY = '" +
                         chave + "' AND WENU_KEY_LANG = '" + Idioma() + "'",
                     "WENU_DESCR");
 }
 
 QString CEConsultasCatalogo::DescricaoCabo(const QString& chave) const {
+    if (!Colaveis({chave, Idioma()})) return {};
     return Primeiro("select rtrim(CENU_DESCR) as CENU_DESCR from BDCENU where CENU_KEY = '" +
                         chave + "' AND CENU_KEY_LANG = '" + Idioma() + "'",
                     "CENU_DESCR");
 }
 
 QString CEConsultasCatalogo::ListaComp(const QString& chave, const QString& norma) const {
+    if (!Colaveis({chave, norma})) return {};
     // The tab after "and" is part of the statement as it has always been sent.
     return Primeiro(
         "select ZV_LISTA from BDZV where ZV_KEY='" + chave + "' and\tZV_KEY_NOR ='" + norma + "'",
@@ -54,12 +91,14 @@ QString CEConsultasCatalogo::ListaComp(const QString& chave, const QString& norm
 }
 
 QString CEConsultasCatalogo::ListaFio(const QString& chave, const QString& norma) const {
+    if (!Colaveis({chave, norma})) return {};
     return Primeiro("select WIRE_LISTA from BDWIRE where WIRE_KEY='" + chave +
                         "' and WIRE_NORMA ='" + norma + "'",
                     "WIRE_LISTA");
 }
 
 QString CEConsultasCatalogo::ListaCabo(const QString& chave, const QString& norma) const {
+    if (!Colaveis({chave, norma})) return {};
     return Primeiro("select CABO_LISTA from BDCABO2 where CABO_KEY='" + chave +
                         "' and CABO_NORMA ='" + norma + "'",
                     "CABO_LISTA");
@@ -67,6 +106,7 @@ QString CEConsultasCatalogo::ListaCabo(const QString& chave, const QString& norm
 
 QStringList CEConsultasCatalogo::ColunasUsuario(const QString& tabela, const QString& colunaChave,
                                                 const QString& chave) const {
+    if (!(Nome(tabela) && Nome(colunaChave) && Colavel(chave))) return {};
     const CERegistrosCatalogo linhas = conexao_.Consultar(
         "SELECT * FROM " + tabela + " WHERE " + colunaChave + " = '" + chave + "'", true);
     QStringList colunas;
@@ -89,12 +129,14 @@ QStringList CEConsultasCatalogo::ColunasCabo(const QString& chave) const {
 }
 
 QString CEConsultasCatalogo::MaterialSap(const QString& chave) const {
+    if (!Colavel(chave)) return {};
     return Primeiro("select MATSAP_MAT from BDMATSAP where MATSAP_TIPO = 'C' AND MATSAP_ZVKEY = '" +
                         chave + "'",
                     "MATSAP_MAT");
 }
 
 QStringList CEConsultasCatalogo::AcessoriosDe(const QString& chave) const {
+    if (!Colavel(chave)) return {};
     const CERegistrosCatalogo linhas = conexao_.Consultar(
         "select VL_KEY_B, VL_QTDE from BDVINCL where VL_KEY_A = '" + chave + "'", true);
     QStringList acessorios;
@@ -104,34 +146,40 @@ QStringList CEConsultasCatalogo::AcessoriosDe(const QString& chave) const {
 }
 
 QString CEConsultasCatalogo::TipoComp(const QString& chave) const {
+    if (!Colavel(chave)) return {};
     return Primeiro(" select TIPO_KEY from BDTIPOCOMP where COMP_KEY='" + chave + "'", "TIPO_KEY");
 }
 
 QString CEConsultasCatalogo::BlocoRepresentacao(const QString& chave, const QString& norma,
                                                 const QString& representacao) const {
+    if (!Colaveis({chave, norma, representacao})) return {};
     return Primeiro("select BLK_BLOCO from BDBLOCOS where BLK_ZV_KEY='" + chave +
                         "' and BLK_NORMA='" + norma + "' and BLK_REP_KEY='" + representacao + "'",
                     "BLK_BLOCO");
 }
 
 QString CEConsultasCatalogo::GrupoNome(const QString& grupo, const QString& idioma) const {
+    if (!(Numero(grupo) && Numero(idioma))) return {};
     return Primeiro("select NAME from BDGROUP where GROUP_KEY=" + grupo + " and LANG=" + idioma,
                     "NAME");
 }
 
 QString CEConsultasCatalogo::GrupoDescricao(const QString& grupo, const QString& idioma) const {
+    if (!(Numero(grupo) && Numero(idioma))) return {};
     return Primeiro("select DESC_ATT from BDPAGE, BDGROUP where PAGE_KEY=PAGE and GROUP_KEY=" +
                         grupo + " and LANG=" + idioma,
                     "DESC_ATT");
 }
 
 QString CEConsultasCatalogo::GrupoSequencial(const QString& grupo, const QString& idioma) const {
+    if (!(Numero(grupo) && Numero(idioma))) return {};
     return Primeiro("select REF_SEQ from BDPAGE, BDGROUP where PAGE_KEY=PAGE and GROUP_KEY=" +
                         grupo + " and LANG=" + idioma,
                     "REF_SEQ");
 }
 
 QString CEConsultasCatalogo::PromptCampo(const QString& campo, bool fio) const {
+    if (!Colavel(campo)) return campo;
     const QString prompt =
         fio ? Primeiro("SELECT WDIC_PROMP FROM BDWDIC WHERE WDIC_FIELD='" + campo + "'",
                        "WDIC_PROMP")

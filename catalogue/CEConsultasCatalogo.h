@@ -1,8 +1,8 @@
 #pragma once
 // The catalogue look-ups of the lists. Each runs one short statement through the catalogue
 // connection, with the upgrades on failure, and reads the first row. Keys go into the
-// statements between single quotes as they are: a key with a quote in it breaks its
-// statement and answers empty.
+// statements between single quotes as they are, without escaping: a key holding a quote or
+// a backslash answers empty at once, and is never sent.
 #include <QString>
 #include <QStringList>
 

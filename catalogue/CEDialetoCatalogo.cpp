@@ -187,6 +187,21 @@ QString CEDialetoCatalogo::ConsultaLargura(const QString& tabela, const QString&
            tabela.toUpper() + "' AND UPPER(COLUMN_NAME) = '" + coluna.toUpper() + "'";
 }
 
+QString CEDialetoCatalogo::ConsultaTabelas() const {
+    const QString servidores =
+        "SELECT TABLE_NAME FROM INFORMATION_SCHEMA.TABLES WHERE TABLE_TYPE = 'BASE TABLE'";
+    switch (familia_) {
+        case Embutido:
+            return "SELECT name FROM sqlite_master WHERE type = 'table'";
+        case ServidorSql:
+            return servidores;
+        case Postgres:
+            return servidores + " AND TABLE_SCHEMA NOT IN ('pg_catalog', 'information_schema')";
+        default:
+            return {};
+    }
+}
+
 QString CEDialetoCatalogo::NomeColuna(const QString& nome) const {
     if (familia_ != Postgres || nome != nome.toLower()) return nome;
     return nome.toUpper();

@@ -57,6 +57,9 @@ public:
     // A statement giving a column's declared width in its first column; empty when the
     // engine has no such view (the driver's record is asked then).
     QString ConsultaLargura(const QString& tabela, const QString& coluna) const;
+    // A statement listing the tables of the database in its first column; empty when the
+    // engine has none (the driver lists them then).
+    QString ConsultaTabelas() const;
     // A column name as the readers know it: upper-case when the engine folded it to lower.
     QString NomeColuna(const QString& nome) const;
 

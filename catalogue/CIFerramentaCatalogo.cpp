@@ -4,6 +4,7 @@
 #include "CECacheCatalogo.h"
 #include "CEConexaoCatalogo.h"
 #include "CEScriptSql.h"
+#include "settings/CIMensagens.h"
 #include "settings/CIRegistro.h"
 
 #include <QDir>
@@ -22,6 +23,8 @@ namespace {
 struct Operacao {
     const char* argumentos;
     std::function<QStringList(CECacheCatalogo&, const QStringList&)> rodar;
+    // The message that stands for a missing description; 0 for the other look-ups.
+    int mensagem = 0;
 };
 
 // Look-ups by name, with what the readers' cache gives (fallback messages included).
@@ -29,9 +32,15 @@ const std::map<QString, Operacao>& TabelaOperacoes() {
     using C = CECacheCatalogo;
     using L = const QStringList&;
     static const std::map<QString, Operacao> tabela = {
-        {"DescricaoComp", {"KEY", [](C& c, L a) { return QStringList{c.DescricaoComp(a[0])}; }}},
-        {"DescricaoFio", {"KEY", [](C& c, L a) { return QStringList{c.DescricaoFio(a[0])}; }}},
-        {"DescricaoCabo", {"KEY", [](C& c, L a) { return QStringList{c.DescricaoCabo(a[0])}; }}},
+        {"DescricaoComp",
+         {"KEY", [](C& c, L a) { return QStringList{c.DescricaoComp(a[0])}; },
+          C::kMsgSemDescricaoComp}},
+        {"DescricaoFio",
+         {"KEY", [](C& c, L a) { return QStringList{c.DescricaoFio(a[0])}; },
+          C::kMsgSemDescricaoFio}},
+        {"DescricaoCabo",
+         {"KEY", [](C& c, L a) { return QStringList{c.DescricaoCabo(a[0])}; },
+          C::kMsgSemDescricaoCabo}},
         {"ListaComp",
          {"KEY STANDARD", [](C& c, L a) { return QStringList{c.ListaComp(a[0], a[1])}; }}},
         {"ListaFio",
@@ -150,6 +159,8 @@ int CIFerramentaCatalogo::Verificar() {
     const CEDialetoCatalogo configurado = CEDialetoCatalogo::DaConfiguracao();
     const QString palavra = CIRegistro::Database();
     Saida("settings: " + CIRegistro::ArquivoRegistro());
+    const QString problema = CIRegistro::ProblemaArquivo();
+    if (!problema.isEmpty()) Erro(problema);
     if (configurado.motor() == CEDialetoCatalogo::Nenhum) {
         Saida("engine: none (Database is \"" + palavra + "\")");
         Erro("no catalogue is configured: set Database to SQLITE, MDB, SQLSERVER, LOCALDB or ODBC");
@@ -159,10 +170,14 @@ int CIFerramentaCatalogo::Verificar() {
     const CEDialetoCatalogo::Ligacao ligacao = configurado.LigacaoDaConfiguracao();
     Saida("connection: " + CEDialetoCatalogo::TextoSemSenha(ligacao.texto));
     CEConexaoCatalogo* conexao = CEConexaoCatalogo::ObterCatalogo();
-    if (!conexao->Conectar()) {
+    // It opens when a statement ran on it: an SQLite file opens whatever it holds.
+    const CEConexaoCatalogo::Conteudo conteudo = conexao->Examinar();
+    if (conteudo == CEConexaoCatalogo::SemConexao || conteudo == CEConexaoCatalogo::Ilegivel) {
         Saida("opens: no");
         if (!ligacao.arquivo.isEmpty() && !QFileInfo(ligacao.arquivo).isFile())
             Erro("the catalogue file does not exist: " + ligacao.arquivo);
+        else if (conteudo == CEConexaoCatalogo::Ilegivel)
+            Erro("no statement runs on the catalogue: " + conexao->UltimoErro());
         return 1;
     }
     Saida("opens: yes");
@@ -171,6 +186,13 @@ int CIFerramentaCatalogo::Verificar() {
     Saida("schema version: " + (versao.Executada() ? versao.Primeiro("VERSAO").trimmed()
                                                    : QString("unknown (no BDVERSAO)")));
     Saida("catalogue language (libLang): " + CIRegistro::LibLang());
+    if (conteudo == CEConexaoCatalogo::Outro) {
+        Saida("upgrades to run: none (not a catalogue)");
+        Erro("this database is not a ZVListas catalogue: it has none of the tables " +
+             CEConexaoCatalogo::TabelasDoCatalogo().join(", ") + "; no upgrade will change it");
+        return 1;
+    }
+    if (conteudo == CEConexaoCatalogo::Vazio) Saida("tables: none (an empty database)");
     const QStringList pendentes = CEAtualizacaoCatalogo(*conexao).Pendentes();
     Saida("upgrades to run: " + (pendentes.isEmpty() ? QString("none") : QString()));
     for (const QString& pendente : pendentes)
@@ -213,14 +235,29 @@ int CIFerramentaCatalogo::Consulta(const QStringList& argumentos) {
         Erro("usage: --lookup " + it->first + " " + it->second.argumentos);
         return 2;
     }
-    if (!CEConexaoCatalogo::ObterCatalogo()->Conectar())
-        Erro("no catalogue opens; the look-up answers as without a catalogue");
+    // Such values answer empty without a statement: the connection isn't even tried.
+    bool recusada = false;
+    for (const QString& argumento : argumentos.mid(1))
+        recusada = recusada || argumento.contains('\'') || argumento.contains('\\');
     CECacheCatalogo cache;
     const QStringList resposta = it->second.rodar(cache, argumentos.mid(1));
+    if (!recusada && !CEConexaoCatalogo::ObterCatalogo()->Conectado())
+        Erro("no catalogue opens; the look-up answers as without a catalogue");
     const QChar separador(0x000C);
     for (QString linha : resposta)
         Saida(linha.replace(separador, '='));
-    if (resposta.isEmpty() || (resposta.size() == 1 && resposta[0].isEmpty())) Erro("empty answer");
+    // A description the catalogue doesn't give shows as the lists' fallback text.
+    const bool substituta = it->second.mensagem != 0 && resposta.size() == 1 &&
+                            resposta[0] == CIMensagens::Mensagem("ZVLISTAS", it->second.mensagem);
+    const bool vazia = resposta.isEmpty() || (resposta.size() == 1 && resposta[0].isEmpty());
+    if (recusada && (vazia || substituta))
+        Erro(
+            "empty answer: a value holding a quote or a backslash is never sent to the "
+            "catalogue");
+    else if (vazia)
+        Erro("empty answer");
+    else if (substituta)
+        Erro("empty answer; the lists print the text above in its place");
     return 0;
 }
 
@@ -265,14 +302,18 @@ int CIFerramentaCatalogo::Configurar(const QStringList& atribuicoes) {
             return 2;
         }
     }
+    QList<QPair<QString, QString>> valores;
     for (const QString& atribuicao : atribuicoes) {
         const int igual = atribuicao.indexOf('=');
         const QString chave = atribuicao.left(igual);
         const QString valor = atribuicao.mid(igual + 1);
-        if (chave == "DBPass")
-            CIRegistro::SetDBPass(valor);
-        else
-            CIRegistro::GravarRegistro(chave, valor);
+        valores << qMakePair(chave, chave == "DBPass" ? CIRegistro::SenhaGuardada(valor) : valor);
+    }
+    // One save for all of them: either every setting is written or none.
+    QString erro;
+    if (!CIRegistro::GravarRegistros(valores, &erro)) {
+        Erro(erro);
+        return 1;
     }
     Saida("settings: " + CIRegistro::ArquivoRegistro());
     return 0;

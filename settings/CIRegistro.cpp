@@ -5,10 +5,15 @@
 #include <QDir>
 #include <QDomDocument>
 #include <QFile>
+#include <QFileInfo>
 #include <QSaveFile>
 #include <QStandardPaths>
 
+#include <cerrno>
+#include <cstring>
 #include <mutex>
+
+#include <unistd.h>
 
 namespace {
 
@@ -20,17 +25,42 @@ std::mutex& Trava() {
 
 const char* const kArquivo = "FV/FVREG2022SP0.xml";
 
-// The whole file, parsed; `ilegivel` tells a file that holds something but doesn't parse.
-QDomDocument Carrega(bool* ilegivel = nullptr) {
+// The file as read: its records, or why it can't be used.
+struct Leitura {
     QDomDocument documento;
-    QFile arquivo(CIRegistro::ArquivoRegistro());
-    bool falhou = false;
-    if (arquivo.open(QIODevice::ReadOnly))
-        falhou = !documento.setContent(&arquivo) && arquivo.size() > 0;
-    else
-        falhou = arquivo.exists();
-    if (ilegivel) *ilegivel = falhou;
-    return documento;
+    QString problema;
+};
+
+Leitura Carrega() {
+    Leitura leitura;
+    const QString caminho = CIRegistro::ArquivoRegistro();
+    const QFileInfo info(caminho);
+    if (!info.exists()) return leitura;
+    QFile arquivo(caminho);
+    if (info.isDir() || !arquivo.open(QIODevice::ReadOnly)) {
+        leitura.problema =
+            "cannot read " + caminho + ": " +
+            (info.isDir() ? QStringLiteral("it is a folder") : arquivo.errorString());
+        return leitura;
+    }
+    const QByteArray conteudo = arquivo.readAll();
+    if (arquivo.error() != QFileDevice::NoError) {
+        leitura.problema = "cannot read " + caminho + ": " + arquivo.errorString();
+        return leitura;
+    }
+    // An empty file holds nothing to keep.
+    if (conteudo.isEmpty()) return leitura;
+    QString mensagem;
+    int linha = 0, coluna = 0;
+    if (!leitura.documento.setContent(conteudo, &mensagem, &linha, &coluna)) {
+        leitura.documento = QDomDocument();
+        leitura.problema = QString("the settings file %1 does not parse (line %2, column %3: %4)")
+                               .arg(caminho)
+                               .arg(linha)
+                               .arg(coluna)
+                               .arg(mensagem);
+    }
+    return leitura;
 }
 
 QDomElement Registro(const QDomDocument& documento, const QString& chave) {
@@ -38,6 +68,38 @@ QDomElement Registro(const QDomDocument& documento, const QString& chave) {
          e = e.nextSiblingElement("registro"))
         if (e.attribute("key") == chave) return e;
     return {};
+}
+
+// Every record as key and value, in order.
+QList<QPair<QString, QString>> Registros(const QDomDocument& documento) {
+    QList<QPair<QString, QString>> registros;
+    for (QDomElement e = documento.documentElement().firstChildElement("registro"); !e.isNull();
+         e = e.nextSiblingElement("registro"))
+        registros << qMakePair(e.attribute("key"), e.attribute("value"));
+    return registros;
+}
+
+// Can an XML 1.0 file hold the text? Control characters but tab and line ends, unpaired
+// surrogates and the two non-characters can't be written.
+bool TextoXml(const QString& texto) {
+    for (int i = 0; i < texto.size(); ++i) {
+        const char16_t c = texto[i].unicode();
+        if (c < 0x20 && c != 0x9 && c != 0xA && c != 0xD) return false;
+        if (c == 0xFFFE || c == 0xFFFF) return false;
+        if (QChar::isHighSurrogate(c)) {
+            if (i + 1 >= texto.size() || !texto[i + 1].isLowSurrogate()) return false;
+            ++i;
+        } else if (QChar::isLowSurrogate(c)) {
+            return false;
+        }
+    }
+    return true;
+}
+
+// Why a write failed: the system's reason when there is one.
+QString Motivo(const QFileDevice& arquivo, int erroSistema) {
+    return erroSistema != 0 ? QString::fromLocal8Bit(std::strerror(erroSistema))
+                            : arquivo.errorString();
 }
 
 // The password is kept as the hex of its UTF-16 code units, each mixed with a key.
@@ -76,16 +138,34 @@ QString CIRegistro::PastaTemporaria() {
 
 QString CIRegistro::LerRegistro(const QString& chave) {
     std::lock_guard<std::mutex> guarda(Trava());
-    const QDomElement e = Registro(Carrega(), chave);
+    const QDomElement e = Registro(Carrega().documento, chave);
     return e.isNull() ? QString() : e.attribute("value");
 }
 
-void CIRegistro::GravarRegistro(const QString& chave, const QString& valor) {
+bool CIRegistro::GravarRegistro(const QString& chave, const QString& valor, QString* erro) {
+    return GravarRegistros({{chave, valor}}, erro);
+}
+
+QString CIRegistro::ProblemaArquivo() {
     std::lock_guard<std::mutex> guarda(Trava());
-    bool ilegivel = false;
-    QDomDocument documento = Carrega(&ilegivel);
+    return Carrega().problema;
+}
+
+bool CIRegistro::GravarRegistros(const QList<QPair<QString, QString>>& valores, QString* erro) {
+    std::lock_guard<std::mutex> guarda(Trava());
+    const QString caminho = ArquivoRegistro();
+    auto falha = [&](const QString& motivo) {
+        if (erro) *erro = motivo;
+        return false;
+    };
+    Leitura leitura = Carrega();
     // The other modules' keys live in the same file: one we can't read is never replaced.
-    if (ilegivel) return;
+    if (!leitura.problema.isEmpty()) return falha(leitura.problema + "; nothing was saved");
+    for (const auto& [chave, valor] : valores)
+        if (chave.isEmpty() || !TextoXml(chave) || !TextoXml(valor))
+            return falha("could not save " + caminho + ": the setting \"" + chave +
+                         "\" holds a character that the file cannot hold");
+    QDomDocument& documento = leitura.documento;
     if (documento.documentElement().isNull())
         documento.appendChild(documento.createElement("registros"));
     // The parse drops the declaration; the file keeps saying that it is UTF-8.
@@ -93,19 +173,40 @@ void CIRegistro::GravarRegistro(const QString& chave, const QString& valor) {
         documento.insertBefore(
             documento.createProcessingInstruction("xml", "version=\"1.0\" encoding=\"UTF-8\""),
             documento.firstChild());
-    QDomElement e = Registro(documento, chave);
-    if (e.isNull()) {
-        e = documento.createElement("registro");
-        e.setAttribute("key", chave);
-        documento.documentElement().appendChild(e);
+    for (const auto& [chave, valor] : valores) {
+        QDomElement e = Registro(documento, chave);
+        if (e.isNull()) {
+            e = documento.createElement("registro");
+            e.setAttribute("key", chave);
+            documento.documentElement().appendChild(e);
+        }
+        e.setAttribute("value", valor);
     }
-    e.setAttribute("value", valor);
-    const QString caminho = ArquivoRegistro();
-    QDir().mkpath(QFileInfo(caminho).absolutePath());
+    const QByteArray conteudo = documento.toByteArray(2);
+    // What is saved must read back as what it holds, or the next reader loses every key.
+    QDomDocument relido;
+    if (!relido.setContent(conteudo) || Registros(relido) != Registros(documento))
+        return falha("could not save " + caminho + ": the new file would not read back");
+
+    if (!QDir().mkpath(QFileInfo(caminho).absolutePath()))
+        return falha("could not save " + caminho + ": cannot make its folder");
+    // A temporary file beside it, renamed over it only when every byte is on the disk.
     QSaveFile arquivo(caminho);
-    if (!arquivo.open(QIODevice::WriteOnly)) return;
-    arquivo.write(documento.toByteArray(2));
-    arquivo.commit();  // a failed save is not reported
+    if (!arquivo.open(QIODevice::WriteOnly))
+        return falha("could not save " + caminho + ": " + arquivo.errorString());
+    auto desiste = [&](const QString& motivo) {
+        arquivo.cancelWriting();
+        return falha("could not save " + caminho + ": " + motivo);
+    };
+    // Qt doesn't always put the system's reason into its error text: errno tells it.
+    errno = 0;
+    if (arquivo.write(conteudo) != conteudo.size()) return desiste(Motivo(arquivo, errno));
+    if (!arquivo.flush()) return desiste(Motivo(arquivo, errno));
+    if (::fsync(arquivo.handle()) != 0) return desiste(Motivo(arquivo, errno));
+    errno = 0;
+    if (!arquivo.commit())
+        return falha("could not save " + caminho + ": " + Motivo(arquivo, errno));
+    return true;
 }
 
 QString CIRegistro::DBPass() {
@@ -116,11 +217,15 @@ QString CIRegistro::DBPass() {
     return Transforma(texto);
 }
 
-void CIRegistro::SetDBPass(const QString& senha) {
+QString CIRegistro::SenhaGuardada(const QString& senha) {
     QByteArray bytes;
     for (QChar c : Transforma(senha))
         bytes.append(char(c.unicode() >> 8)).append(char(c.unicode()));
-    GravarRegistro("DBPass", QString::fromLatin1(bytes.toHex()));
+    return QString::fromLatin1(bytes.toHex());
+}
+
+bool CIRegistro::SetDBPass(const QString& senha) {
+    return GravarRegistro("DBPass", SenhaGuardada(senha));
 }
 
 int CIRegistro::IdiomaMenuSel() {
@@ -128,6 +233,6 @@ int CIRegistro::IdiomaMenuSel() {
     return ZVString(LerRegistro("IdiomaMenuSel")).ParaInteiro();
 }
 
-void CIRegistro::SetIdiomaMenuSel(int idioma) {
-    GravarRegistro("IdiomaMenuSel", QString::number(idioma));
+bool CIRegistro::SetIdiomaMenuSel(int idioma) {
+    return GravarRegistro("IdiomaMenuSel", QString::number(idioma));
 }

@@ -1,6 +1,8 @@
 #pragma once
 // The product's settings file, shared by all modules: one XML file of key/value records
 // in the folder for all users' application data.
+#include <QList>
+#include <QPair>
 #include <QString>
 
 class CIRegistro {
@@ -15,26 +17,35 @@ public:
 
     // The value of a key, or empty when the file or the key is missing.
     static QString LerRegistro(const QString& chave);
-    // Sets a key's value, adding its record when there is none, and saves the file.
-    static void GravarRegistro(const QString& chave, const QString& valor);
+    // Sets a key's value, adding its record when there is none, and saves the file. False
+    // when nothing was saved: the file can't be read (it is never replaced then), or the
+    // save failed and the old file stayed as it was; `erro` then says why.
+    static bool GravarRegistro(const QString& chave, const QString& valor, QString* erro = nullptr);
+    // Several keys in one save: all of them or none.
+    static bool GravarRegistros(const QList<QPair<QString, QString>>& valores,
+                                QString* erro = nullptr);
+    // Why the file can't be read: empty when it reads, or when there is none.
+    static QString ProblemaArquivo();
 
     static QString Database() { return LerRegistro("Database"); }
-    static void SetDatabase(const QString& v) { GravarRegistro("Database", v); }
+    static bool SetDatabase(const QString& v) { return GravarRegistro("Database", v); }
     static QString NetworkZV() { return LerRegistro("NetworkZV"); }
-    static void SetNetworkZV(const QString& v) { GravarRegistro("NetworkZV", v); }
+    static bool SetNetworkZV(const QString& v) { return GravarRegistro("NetworkZV", v); }
     static QString DBName() { return LerRegistro("DBName"); }
-    static void SetDBName(const QString& v) { GravarRegistro("DBName", v); }
+    static bool SetDBName(const QString& v) { return GravarRegistro("DBName", v); }
     static QString DBUser() { return LerRegistro("DBUser"); }
-    static void SetDBUser(const QString& v) { GravarRegistro("DBUser", v); }
+    static bool SetDBUser(const QString& v) { return GravarRegistro("DBUser", v); }
     // The password is stored through a reversible transform.
     static QString DBPass();
-    static void SetDBPass(const QString& senha);
+    static bool SetDBPass(const QString& senha);
+    // The stored form of a password.
+    static QString SenhaGuardada(const QString& senha);
     static QString DBServer() { return LerRegistro("DBServer"); }
-    static void SetDBServer(const QString& v) { GravarRegistro("DBServer", v); }
+    static bool SetDBServer(const QString& v) { return GravarRegistro("DBServer", v); }
     static int IdiomaMenuSel();
-    static void SetIdiomaMenuSel(int idioma);
+    static bool SetIdiomaMenuSel(int idioma);
     static QString LibLang() { return LerRegistro("libLang"); }
-    static void SetLibLang(const QString& v) { GravarRegistro("libLang", v); }
+    static bool SetLibLang(const QString& v) { return GravarRegistro("libLang", v); }
     static QString VersionIN() { return LerRegistro("VersionIN"); }
-    static void SetVersionIN(const QString& v) { GravarRegistro("VersionIN", v); }
+    static bool SetVersionIN(const QString& v) { return GravarRegistro("VersionIN", v); }
 };

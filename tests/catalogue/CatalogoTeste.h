@@ -30,6 +30,10 @@ protected:
     int Ferramenta(const QStringList& argumentos, QString* saida, QString* erros = nullptr);
 
     static QStringList ScriptsDemo();
+    // Keys as drawings may hold them, on the demo catalogue of the settings: rows whose keys
+    // hold "--", "%", "_", ";" or non-ASCII text are found; a key, standard or language that
+    // holds a quote or a backslash answers empty without a statement sent, whatever it says.
+    void ConfereChavesDeDesenhos();
     QString Pasta() const { return pasta_.path(); }
     // What the host showed: message boxes go to `erros`, the command line to `saida`.
     QString Caixas() const { return erros_; }

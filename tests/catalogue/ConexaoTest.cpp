@@ -2,6 +2,7 @@
 // SQL forms that differ between them.
 #include "CatalogoTeste.h"
 
+#include "catalogue/CEAtualizacaoCatalogo.h"
 #include "catalogue/CEConexaoCatalogo.h"
 #include "catalogue/CEConsultasCatalogo.h"
 #include "catalogue/CEDialetoCatalogo.h"
@@ -9,6 +10,7 @@
 #include "settings/CIMensagens.h"
 #include "settings/CIRegistro.h"
 
+#include <QElapsedTimer>
 #include <QFile>
 #include <QFileInfo>
 
@@ -72,16 +74,68 @@ TEST_F(ConexaoTest, ReleasingIsHarmlessWithOrWithoutAConnection) {
     EXPECT_EQ(CEConsultasCatalogo().TipoComp("2001"), "2");
 }
 
-TEST_F(ConexaoTest, AServerThatCannotBeReachedIsShownOnceForARun) {
+TEST_F(ConexaoTest, AFailedOpeningIsTriedAgainAndShownAtEveryQuery) {
+    ASSERT_TRUE(Construir(Pasta() + "/catalogo.db", ScriptsDemo()));
     CIRegistro::SetDatabase("ODBC");
     CIRegistro::SetDBName("DRIVER={Driver That Is Not Installed};SERVER=127.0.0.1;");
     CIRegistro::SetDBPass("segredo;1");
     CEConsultasCatalogo consultas;
-    for (int i = 0; i < 5; ++i)
-        EXPECT_EQ(consultas.DescricaoComp("7001"), "");
-    EXPECT_EQ(Caixas().count("Connection Error\nCode = "), 1) << Caixas().toStdString();
-    EXPECT_TRUE(Caixas().contains("\nSource = QODBC\nDescription = "));
+    QElapsedTimer relogio;
+    relogio.start();
+    const int vezes = 20;
+    for (int i = 0; i < vezes; ++i)
+        EXPECT_EQ(consultas.DescricaoComp(QString::number(7001 + i)), "");
+    const qint64 ms = relogio.elapsed();
+    EXPECT_EQ(Caixas().count("Connection Error\nCode = "), vezes) << Caixas().toStdString();
+    EXPECT_EQ(Caixas().count("\nSource = QODBC\nDescription = "), vezes);
     EXPECT_FALSE(Caixas().contains("segredo"));
+    // An attempt costs the opening only.
+    EXPECT_LT(ms / vezes, 250) << ms << " ms for " << vezes << " attempts";
+    // Settings put right take effect at the next query, with no pause after the failures.
+    UsarSqlite("catalogo.db", "1");
+    LimparSaidas();
+    EXPECT_EQ(consultas.DescricaoComp("7001"), "Fonte chaveada 24 Vcc 5 A");
+    EXPECT_TRUE(Caixas().isEmpty()) << Caixas().toStdString();
+}
+
+TEST_F(ConexaoTest, UpgradesNeverWriteIntoADatabaseThatIsNoCatalogue) {
+    // Another program's SQLite file: it opens, its statements run, but it is not ours.
+    const QString outro = Pasta() + "/outro.db";
+    ASSERT_TRUE(Construir(outro, {QString(ZV_TEST_DIR) + "/outro-programa.sql"}));
+    QFile arquivo(outro);
+    ASSERT_TRUE(arquivo.open(QIODevice::ReadOnly));
+    const QByteArray antes = arquivo.readAll();
+    arquivo.close();
+    UsarSqlite("outro.db", "1");
+    CEConexaoCatalogo& conexao = *CEConexaoCatalogo::ObterCatalogo();
+    EXPECT_EQ(conexao.Examinar(), CEConexaoCatalogo::Outro);
+    EXPECT_TRUE(CEAtualizacaoCatalogo(conexao).Pendentes().isEmpty());
+    EXPECT_EQ(CEConsultasCatalogo().TipoComp("7001"), "");
+    EXPECT_EQ(Caixas().count("SQL ERROR: "), 1) << Caixas().toStdString();
+    EXPECT_FALSE(conexao.ExisteTabela("BDTIPOCOMP"));
+    CEConexaoCatalogo::LiberarCatalogo();
+    ASSERT_TRUE(arquivo.open(QIODevice::ReadOnly));
+    EXPECT_EQ(arquivo.readAll(), antes);
+    arquivo.close();
+
+    // A file that is no database: nothing runs on it, nothing is made in it.
+    QFile texto(Pasta() + "/texto.db");
+    ASSERT_TRUE(texto.open(QIODevice::WriteOnly));
+    texto.write("BDZV;BDMENUS\n");
+    texto.close();
+    UsarSqlite("texto.db", "1");
+    EXPECT_EQ(CEConexaoCatalogo::ObterCatalogo()->Examinar(), CEConexaoCatalogo::Ilegivel);
+    EXPECT_TRUE(CEAtualizacaoCatalogo(*CEConexaoCatalogo::ObterCatalogo()).Executar().isEmpty());
+    CEConexaoCatalogo::LiberarCatalogo();
+
+    // An empty file is an empty database: the upgrades may make their tables there.
+    QFile vazio(Pasta() + "/vazio.db");
+    ASSERT_TRUE(vazio.open(QIODevice::WriteOnly));
+    vazio.close();
+    UsarSqlite("vazio.db", "1");
+    EXPECT_EQ(CEConexaoCatalogo::ObterCatalogo()->Examinar(), CEConexaoCatalogo::Vazio);
+    EXPECT_EQ(CEConsultasCatalogo().TipoComp("7001"), "");
+    EXPECT_TRUE(CEConexaoCatalogo::ObterCatalogo()->ExisteTabela("BDTIPOCOMP"));
 }
 
 TEST_F(ConexaoTest, SettingsBuildTheConnectionOfEachEngine) {

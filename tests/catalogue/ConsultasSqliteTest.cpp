@@ -123,18 +123,8 @@ TEST_F(ConsultasSqliteTest, TheCacheAsksOncePerKeyAndUpperCasesFlags) {
     EXPECT_EQ(cache.BlocoRepresentacao("1001", "1", "2"), "REGUA_BX2_5_GY");
 }
 
-TEST_F(ConsultasSqliteTest, AQuoteInAKeyBreaksItsStatementAndAnswersEmpty) {
-    CEConsultasCatalogo consultas;
-    EXPECT_EQ(consultas.ListaComp("70'01", "1"), "");
-    // Sent as it is, with no escaping, and retried once after the upgrades.
-    EXPECT_EQ(Conexao().UltimaInstrucao(),
-              "select ZV_LISTA from BDZV where ZV_KEY='70'01' and\tZV_KEY_NOR ='1'");
-    const QString caixas = Caixas();
-    EXPECT_EQ(caixas.count("SQL ERROR: "), 1) << caixas.toStdString();
-    EXPECT_TRUE(caixas.contains("\n \n select ZV_LISTA from BDZV where ZV_KEY='70'01' ..."))
-        << caixas.toStdString();
-    // The next good key is unaffected.
-    EXPECT_EQ(consultas.ListaComp("7001", "1"), "S");
+TEST_F(ConsultasSqliteTest, KeysFromDrawingsNeverChangeAStatement) {
+    ConfereChavesDeDesenhos();
 }
 
 TEST(ConexaoCatalogo, FailedStatementsAreCutAfter47Characters) {

@@ -207,7 +207,7 @@ TEST_F(PostgresTest, EveryLookUpAnswersThroughOdbc) {
     EXPECT_TRUE(Caixas().isEmpty()) << Caixas().toStdString();
 }
 
-TEST_F(PostgresTest, FallbacksCacheAndAQuoteInAKey) {
+TEST_F(PostgresTest, FallbacksAndTheCache) {
     Usar("demo", ScriptsDemo(), "2");
     CECacheCatalogo cache;
     EXPECT_EQ(cache.DescricaoComp("4242"), CIMensagens::Mensagem("ZVLISTAS", 108));
@@ -215,9 +215,26 @@ TEST_F(PostgresTest, FallbacksCacheAndAQuoteInAKey) {
     for (int i = 0; i < 200; ++i)
         cache.ListaComp(i % 2 ? "1001" : "2001", "1");
     EXPECT_EQ(Conexao().InstrucoesEnviadas() - antes, 2);
-    EXPECT_EQ(cache.Consultas().ListaComp("70'01", "1"), "");
-    EXPECT_EQ(Caixas().count("SQL ERROR: "), 1) << Caixas().toStdString();
     EXPECT_EQ(cache.Consultas().DescricaoComp("7001"), "Switch-mode power supply 24 V DC 5 A");
+    EXPECT_TRUE(Caixas().isEmpty()) << Caixas().toStdString();
+}
+
+TEST_F(PostgresTest, KeysFromDrawingsNeverChangeAStatement) {
+    Usar("chaves", ScriptsDemo(), "1");
+    ConfereChavesDeDesenhos();
+}
+
+TEST_F(PostgresTest, UpgradesTouchOnlyACatalogueOrAnEmptyDatabase) {
+    Usar("outro", {QString(ZV_TEST_DIR) + "/outro-programa.sql"}, "1");
+    EXPECT_EQ(Conexao().Examinar(), CEConexaoCatalogo::Outro);
+    EXPECT_EQ(CEConsultasCatalogo().TipoComp("7001"), "");
+    EXPECT_EQ(Caixas().count("SQL ERROR: "), 1) << Caixas().toStdString();
+    EXPECT_FALSE(Conexao().ExisteTabela("BDTIPOCOMP"));
+    EXPECT_EQ(Conexao().Consultar("select count(*) as N from clientes").Primeiro("N"), "2");
+
+    Usar("vazia", {}, "1");
+    EXPECT_EQ(Conexao().Examinar(), CEConexaoCatalogo::Vazio);
+    EXPECT_FALSE(CEAtualizacaoCatalogo(Conexao()).Pendentes().isEmpty());
 }
 
 TEST_F(PostgresTest, AnOldCatalogueIsUpgradedOnTheServer) {

@@ -1,12 +1,19 @@
 // The product settings file: one XML file of key/value records shared by all modules.
 #include "AmbienteTeste.h"
+#include "QtPrinters.h"
 #include "settings/CIRegistro.h"
 
 #include <QDomDocument>
 #include <QStandardPaths>
 
 #include <atomic>
+#include <functional>
 #include <thread>
+
+#include <sys/resource.h>
+#include <sys/wait.h>
+#include <unistd.h>
+#include <csignal>
 
 namespace {
 
@@ -131,12 +138,128 @@ TEST_F(CIRegistroTest, AnUnreadableFileReadsAsEmptyAndIsNeverOverwritten) {
     const QByteArray estragado = "<registros><registro key=\"DBName\" value=\"x\"";
     ASSERT_TRUE(Escreve(Arquivo(), estragado));
     EXPECT_EQ(CIRegistro::DBName(), QString());
-    CIRegistro::SetDBName("novo");
+    EXPECT_FALSE(CIRegistro::SetDBName("novo"));
+    QString erro;
+    EXPECT_FALSE(CIRegistro::GravarRegistros({{"DBName", "novo"}, {"libLang", "2"}}, &erro));
+    EXPECT_TRUE(erro.startsWith("the settings file " + Arquivo() + " does not parse (line 1"))
+        << erro.toStdString();
+    EXPECT_TRUE(erro.endsWith("; nothing was saved")) << erro.toStdString();
+    EXPECT_EQ(CIRegistro::ProblemaArquivo(), erro.left(erro.indexOf(';')));
     EXPECT_EQ(Le(Arquivo()), estragado);
+    // Blanks alone are no XML either.
+    ASSERT_TRUE(Escreve(Arquivo(), " \n"));
+    EXPECT_FALSE(CIRegistro::SetDBName("novo"));
+    EXPECT_EQ(Le(Arquivo()), " \n");
     // An empty file holds nothing to keep.
     ASSERT_TRUE(Escreve(Arquivo(), QByteArray()));
-    CIRegistro::SetDBName("novo");
+    EXPECT_TRUE(CIRegistro::ProblemaArquivo().isEmpty());
+    EXPECT_TRUE(CIRegistro::SetDBName("novo"));
     EXPECT_EQ(CIRegistro::DBName(), "novo");
+}
+
+TEST_F(CIRegistroTest, AFolderInPlaceOfTheFileIsReportedAndLeftAlone) {
+    ASSERT_TRUE(QDir().mkpath(Arquivo()));
+    EXPECT_EQ(CIRegistro::Database(), QString());
+    QString erro;
+    EXPECT_FALSE(CIRegistro::GravarRegistro("Database", "SQLITE", &erro));
+    EXPECT_EQ(erro, "cannot read " + Arquivo() + ": it is a folder; nothing was saved");
+    EXPECT_TRUE(QFileInfo(Arquivo()).isDir());
+}
+
+TEST_F(CIRegistroTest, SeveralKeysGoInOneSave) {
+    ASSERT_TRUE(CIRegistro::SetDatabase("MDB"));
+    QString erro;
+    ASSERT_TRUE(CIRegistro::GravarRegistros({{"Database", "SQLITE"},
+                                             {"NetworkZV", "/srv/zv/"},
+                                             {"DBPass", CIRegistro::SenhaGuardada("pw")}},
+                                            &erro))
+        << erro.toStdString();
+    EXPECT_EQ(Registros(), QStringList({"Database=SQLITE", "NetworkZV=/srv/zv/",
+                                        "DBPass=" + CIRegistro::SenhaGuardada("pw")}));
+    EXPECT_EQ(CIRegistro::DBPass(), "pw");
+    // One value that can't be stored stops them all.
+    const QByteArray antes = Le(Arquivo());
+    EXPECT_FALSE(CIRegistro::GravarRegistros({{"DBName", "ok"}, {"DBUser", "a\x01b"}}, &erro));
+    EXPECT_EQ(erro, "could not save " + Arquivo() +
+                        ": the setting \"DBUser\" holds a character that the file cannot hold");
+    EXPECT_EQ(Le(Arquivo()), antes);
+}
+
+TEST_F(CIRegistroTest, ValuesComeBackExactlyOrAreRefused) {
+    ASSERT_TRUE(CIRegistro::SetDBServer("antes"));
+    const QStringList guardaveis = {"linha\nlinha", "tab\there", "cr\r\nlf", "  bordas  ",
+                                    "<&\"'>",       "😀 ação",    QString()};
+    for (const QString& valor : guardaveis) {
+        QString erro;
+        EXPECT_TRUE(CIRegistro::GravarRegistro("DBUser", valor, &erro)) << erro.toStdString();
+        EXPECT_EQ(CIRegistro::DBUser(), valor) << valor.toStdString();
+    }
+    const QByteArray antes = Le(Arquivo());
+    const QStringList recusados = {QString("a") + QChar(0), "b\x1f", QString(QChar(0xD800)),
+                                   QString(QChar(0xDC00)) + "x", QString(QChar(0xFFFF))};
+    for (const QString& valor : recusados) {
+        EXPECT_FALSE(CIRegistro::SetDBUser(valor));
+        EXPECT_FALSE(CIRegistro::GravarRegistro(valor, "x"));
+    }
+    EXPECT_FALSE(CIRegistro::GravarRegistro(QString(), "x"));
+    EXPECT_EQ(Le(Arquivo()), antes);
+    EXPECT_EQ(CIRegistro::DBServer(), "antes");
+}
+
+// Runs a save in a child process whose files can't grow past `limite` bytes; the signal
+// that would end it is ignored, so the writes themselves fail. The save's answer and
+// error text come back through a pipe.
+QPair<bool, QString> GravaSobLimite(rlim_t limite, const std::function<bool(QString*)>& gravar) {
+    int canal[2];
+    if (pipe(canal) != 0) return {true, "no pipe"};
+    const pid_t filho = fork();
+    if (filho == 0) {
+        close(canal[0]);
+        signal(SIGXFSZ, SIG_IGN);
+        const rlimit limiteArquivo{limite, limite};
+        setrlimit(RLIMIT_FSIZE, &limiteArquivo);
+        QString erro;
+        const bool ok = gravar(&erro);
+        const QByteArray resposta = QByteArray(ok ? "1" : "0") + erro.toUtf8();
+        const ssize_t escrito = write(canal[1], resposta.constData(), size_t(resposta.size()));
+        _exit(escrito == resposta.size() ? 0 : 3);
+    }
+    close(canal[1]);
+    QByteArray resposta;
+    char bloco[4096];
+    for (ssize_t n; (n = read(canal[0], bloco, sizeof bloco)) > 0;)
+        resposta.append(bloco, int(n));
+    close(canal[0]);
+    int estado = 0;
+    waitpid(filho, &estado, 0);
+    if (!WIFEXITED(estado) || WEXITSTATUS(estado) != 0 || resposta.isEmpty())
+        return {true, "the child did not answer"};
+    return {resposta[0] == '1', QString::fromUtf8(resposta.mid(1))};
+}
+
+TEST_F(CIRegistroTest, ASaveThatHitsTheFileSizeLimitKeepsTheOldFileByteForByte) {
+    ASSERT_TRUE(CIRegistro::SetDatabase("SQLITE"));
+    ASSERT_TRUE(CIRegistro::SetDBName("catalogo.db"));
+    const QByteArray antes = Le(Arquivo());
+    ASSERT_LT(antes.size(), 1024);
+
+    // Under the limit a save still goes through.
+    const auto pequena = GravaSobLimite(
+        4096, [](QString* erro) { return CIRegistro::GravarRegistro("DBUser", "ana", erro); });
+    EXPECT_TRUE(pequena.first) << pequena.second.toStdString();
+    EXPECT_EQ(CIRegistro::DBUser(), "ana");
+    const QByteArray depoisDaPequena = Le(Arquivo());
+
+    const QString grande(20000, 'x');
+    const auto falha = GravaSobLimite(
+        4096, [&](QString* erro) { return CIRegistro::GravarRegistro("NetworkZV", grande, erro); });
+    EXPECT_FALSE(falha.first);
+    EXPECT_EQ(falha.second, QString("could not save " + Arquivo() + ": File too large"))
+        << falha.second.toStdString();
+    EXPECT_EQ(Le(Arquivo()), depoisDaPequena);
+    EXPECT_EQ(QDir(PastaDados() + "/FV").entryList(QDir::Files | QDir::Hidden),
+              QStringList({"FVREG2022SP0.xml"}));
+    EXPECT_EQ(CIRegistro::NetworkZV(), QString());
 }
 
 TEST_F(CIRegistroTest, SavesReplaceTheWholeFileAtOnce) {
