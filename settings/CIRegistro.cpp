@@ -1,19 +1,16 @@
 #include "CIRegistro.h"
 
+#include "host/sdk/AtomicFile.h"
+
 #include "readers/ZVString.h"
 
 #include <QDir>
 #include <QDomDocument>
 #include <QFile>
 #include <QFileInfo>
-#include <QSaveFile>
 #include <QStandardPaths>
 
-#include <cerrno>
-#include <cstring>
 #include <mutex>
-
-#include <unistd.h>
 
 namespace {
 
@@ -94,12 +91,6 @@ bool TextoXml(const QString& texto) {
         }
     }
     return true;
-}
-
-// Why a write failed: the system's reason when there is one.
-QString Motivo(const QFileDevice& arquivo, int erroSistema) {
-    return erroSistema != 0 ? QString::fromLocal8Bit(std::strerror(erroSistema))
-                            : arquivo.errorString();
 }
 
 // The password is kept as the hex of its UTF-16 code units, each mixed with a key.
@@ -191,21 +182,9 @@ bool CIRegistro::GravarRegistros(const QList<QPair<QString, QString>>& valores, 
     if (!QDir().mkpath(QFileInfo(caminho).absolutePath()))
         return falha("could not save " + caminho + ": cannot make its folder");
     // A temporary file beside it, renamed over it only when every byte is on the disk.
-    QSaveFile arquivo(caminho);
-    if (!arquivo.open(QIODevice::WriteOnly))
-        return falha("could not save " + caminho + ": " + arquivo.errorString());
-    auto desiste = [&](const QString& motivo) {
-        arquivo.cancelWriting();
-        return falha("could not save " + caminho + ": " + motivo);
-    };
-    // Qt doesn't always put the system's reason into its error text: errno tells it.
-    errno = 0;
-    if (arquivo.write(conteudo) != conteudo.size()) return desiste(Motivo(arquivo, errno));
-    if (!arquivo.flush()) return desiste(Motivo(arquivo, errno));
-    if (::fsync(arquivo.handle()) != 0) return desiste(Motivo(arquivo, errno));
-    errno = 0;
-    if (!arquivo.commit())
-        return falha("could not save " + caminho + ": " + Motivo(arquivo, errno));
+    zvsdk::AtomicFile arquivo(caminho);
+    if (!arquivo.open() || !arquivo.write(conteudo) || !arquivo.commit())
+        return falha(arquivo.errorString());
     return true;
 }
 

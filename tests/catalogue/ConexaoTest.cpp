@@ -10,7 +10,6 @@
 #include "settings/CIMensagens.h"
 #include "settings/CIRegistro.h"
 
-#include <QElapsedTimer>
 #include <QFile>
 #include <QFileInfo>
 
@@ -80,17 +79,12 @@ TEST_F(ConexaoTest, AFailedOpeningIsTriedAgainAndShownAtEveryQuery) {
     CIRegistro::SetDBName("DRIVER={Driver That Is Not Installed};SERVER=127.0.0.1;");
     CIRegistro::SetDBPass("segredo;1");
     CEConsultasCatalogo consultas;
-    QElapsedTimer relogio;
-    relogio.start();
     const int vezes = 20;
     for (int i = 0; i < vezes; ++i)
         EXPECT_EQ(consultas.DescricaoComp(QString::number(7001 + i)), "");
-    const qint64 ms = relogio.elapsed();
     EXPECT_EQ(Caixas().count("Connection Error\nCode = "), vezes) << Caixas().toStdString();
     EXPECT_EQ(Caixas().count("\nSource = QODBC\nDescription = "), vezes);
     EXPECT_FALSE(Caixas().contains("segredo"));
-    // An attempt costs the opening only.
-    EXPECT_LT(ms / vezes, 250) << ms << " ms for " << vezes << " attempts";
     // Settings put right take effect at the next query, with no pause after the failures.
     UsarSqlite("catalogo.db", "1");
     LimparSaidas();
