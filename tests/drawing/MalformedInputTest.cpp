@@ -89,17 +89,19 @@ TEST(MalformedInput, OddNumberOfLinesIsAnError) {
         << error;
 }
 
-TEST(MalformedInput, DuplicateHandlesAreAnError) {
+TEST(MalformedInput, DuplicateHandlesAreRenumbered) {
     Database db;
     Entity* first = db.modelSpace()->addPoint({0, 0, 0});
     Entity* second = db.modelSpace()->addPoint({1, 0, 0});
     std::string text = DxfWriter::toText(db);
     const std::string mine = "  5\n" + std::string(second->text(5)) + "\n";
     text = replaced(text, mine, "  5\n" + std::string(first->text(5)) + "\n", "ENTITIES");
-    const std::string error = errorOf(text);
-    EXPECT_NE(error.find("handle " + std::string(first->text(5)) + " is used twice"),
-              std::string::npos)
-        << error;
+    auto again = DxfLoader::load(text);
+    const auto points = again->modelSpace()->entities();
+    ASSERT_EQ(points.size(), 2u);
+    EXPECT_EQ(points[0]->handle(), first->handle());
+    EXPECT_GE(points[1]->handle(), db.handleSeed());
+    EXPECT_EQ(points[1]->point(10).x, 1.0);
 }
 
 TEST(MalformedInput, EmptyAndForeignFilesAreErrors) {
