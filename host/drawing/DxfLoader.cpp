@@ -477,6 +477,9 @@ void DxfLoader::completeSectionOrder() {
     static const char* const kStandard[] = {"HEADER", "CLASSES",  "TABLES",
                                             "BLOCKS", "ENTITIES", "OBJECTS"};
     auto& order = db_.sectionOrder_;
+    // A section that comes twice is read twice but written once, with all it holds.
+    std::unordered_set<std::string> seen;
+    std::erase_if(order, [&](const std::string& name) { return !seen.insert(name).second; });
     const auto present = [&](std::string_view name) {
         return std::find(order.begin(), order.end(), name) != order.end();
     };
