@@ -195,20 +195,25 @@ BlockRecord* Database::createBlock(std::string_view name, const Point3& basePoin
     more.integer(280, 1).integer(281, 0);
     auto* record = static_cast<BlockRecord*>(
         createTableRecord("BLOCK_RECORD", name, "AcDbBlockTableRecord", more.take()));
+    addBlockEnds(*record, basePoint);
+    return record;
+}
+
+void Database::addBlockEnds(BlockRecord& record, const Point3& basePoint) {
+    const std::string_view name = record.name();
     TagListBuilder begin(arena_);
-    begin.text(0, "BLOCK").handle(5, allocateHandle()).handle(330, record->handle());
+    begin.text(0, "BLOCK").handle(5, allocateHandle()).handle(330, record.handle());
     begin.text(100, "AcDbEntity").text(8, "0").text(100, "AcDbBlockBegin").text(2, name);
     begin.integer(70, 0).point(10, basePoint).text(3, name).text(1, "");
     auto* blockBegin = static_cast<Entity*>(
         adopt(DxfLoader::makeOwnedObject(*this, begin.take(), DxfLoader::Context::Entity)));
     TagListBuilder end(arena_);
-    end.text(0, "ENDBLK").handle(5, allocateHandle()).handle(330, record->handle());
+    end.text(0, "ENDBLK").handle(5, allocateHandle()).handle(330, record.handle());
     end.text(100, "AcDbEntity").text(8, "0").text(100, "AcDbBlockEnd");
     auto* blockEnd = static_cast<Entity*>(
         adopt(DxfLoader::makeOwnedObject(*this, end.take(), DxfLoader::Context::Entity)));
-    record->setBlockBegin(blockBegin);
-    record->setBlockEnd(blockEnd);
-    return record;
+    record.setBlockBegin(blockBegin);
+    record.setBlockEnd(blockEnd);
 }
 
 void Database::forgetBlock(BlockRecord& record) {

@@ -140,6 +140,8 @@ private:
     void noteHandle(std::uint64_t handle);
     void noteChange();
     void forgetBlock(BlockRecord& record);
+    // The BLOCK and ENDBLK entities of a block record that has none.
+    void addBlockEnds(BlockRecord& record, const Point3& basePoint = {});
     void ensureSeqend(Entity& parent);
     std::vector<Tag> entityHead(std::string_view type, std::uint64_t handle, std::uint64_t owner,
                                 std::string_view layer, bool paperSpace);

@@ -401,7 +401,13 @@ void DxfLoader::readEntities(std::size_t begin, std::size_t end) {
                            std::to_string(tags[i].code));
         const std::size_t next = nextObject(i, end);
         auto* entity = static_cast<Entity*>(adopt(i, next, Context::Entity));
+        if (entity->isType("BLOCK") || entity->isType("ENDBLK"))
+            throw DxfError(where(i) + ": " + std::string(entity->type()) +
+                           " outside the BLOCKS section");
+        // The ENTITIES section holds model and paper space only, whatever an owner says.
         BlockRecord* block = dynamic_cast<BlockRecord*>(db_.objectByHandle(entity->ownerHandle()));
+        const bool wrongOwner = block && !block->isLayout();
+        if (wrongOwner) block = nullptr;
         if (!block) {
             if (entity->inPaperSpace()) {
                 if (!paper) paper = syntheticBlock("*Paper_Space");
@@ -411,6 +417,7 @@ void DxfLoader::readEntities(std::size_t begin, std::size_t end) {
                 block = model;
             }
         }
+        if (wrongOwner) entity->setOwner(block->handle());
         placeEntity(entity, block);
         i = next;
     }
@@ -446,8 +453,12 @@ void DxfLoader::finish() {
                                 " objects had no handle; new handles were given");
     }
     renumberDuplicates();
-    // Every drawing has a model space, even a file with no ENTITIES section.
+    // Every drawing has a model space, even a file with no ENTITIES section, and every
+    // block record of a modern file its BLOCK and ENDBLK.
     if (!db_.modelSpace()) syntheticBlock("*Model_Space");
+    if (modern())
+        for (BlockRecord* block : db_.blocks())
+            if (!block->blockBegin()) db_.addBlockEnds(*block);
     completeSectionOrder();
     if (repairedSeqends_)
         db_.warnings_.push_back(std::to_string(repairedSeqends_) +

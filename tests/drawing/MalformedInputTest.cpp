@@ -110,6 +110,15 @@ TEST(MalformedInput, DuplicateHandlesAreRenumbered) {
     EXPECT_EQ(points[1]->point(10).x, 1.0);
 }
 
+TEST(MalformedInput, BlockDefinitionsOutsideTheBlocksSectionAreErrors) {
+    std::string text = sample();
+    const std::size_t entities = text.find("ENTITIES\n");
+    const std::size_t at = text.find("  0\nLWPOLYLINE\n", entities);
+    text.insert(at, "  0\nBLOCK\n  2\nB\n");
+    EXPECT_EQ(errorOf(text),
+              "line " + std::to_string(lineOf(text, at)) + ": BLOCK outside the BLOCKS section");
+}
+
 TEST(MalformedInput, EmptyAndForeignFilesAreErrors) {
     EXPECT_EQ(errorOf(""), "the file is empty");
     EXPECT_NE(errorOf("hello\nworld\n").find("line 1: expected a group code"), std::string::npos);
