@@ -112,8 +112,11 @@ void DxfLoader::run(std::string bytes) {
     db_.byHandle_.reserve(objects);
     db_.storage_.reserve(objects);
     // Objects made while reading (a missing block record) take handles above all of the file's.
-    for (const Tag& tag : db_.fileTags_)
-        if (tag.code == 5 || tag.code == 105) db_.noteHandle(TagValues::toHandle(tag.value));
+    // ($HANDSEED, a code 5 of the header, is the next free handle, not one in use.)
+    const auto& tags = db_.fileTags_;
+    for (std::size_t i = 1; i < tags.size(); ++i)
+        if ((tags[i].code == 5 || tags[i].code == 105) && tags[i - 1].code != 9)
+            db_.noteHandle(TagValues::toHandle(tags[i].value));
     fixEncoding();
     readSections();
     finish();
