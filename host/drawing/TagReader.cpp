@@ -73,6 +73,10 @@ public:
         const auto* z = static_cast<const char*>(zero);
         std::string_view text(data_.data() + pos_,
                               static_cast<std::size_t>(z - data_.data()) - pos_);
+        // A line break would split the value in two lines of the DXF text we write.
+        if (text.find('\n') != std::string_view::npos)
+            throw DxfError("byte " + std::to_string(pos_ + kBinarySentinel.size()) +
+                           ": a text holds a line break");
         pos_ += text.size() + 1;
         return text;
     }

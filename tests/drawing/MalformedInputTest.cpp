@@ -126,6 +126,10 @@ TEST(MalformedInput, EmptyAndForeignFilesAreErrors) {
     std::string binary("AutoCAD Binary DXF\r\n\x1a\0", 22);
     binary += std::string("\x00\x00SECTION\x00\x02\x00HEA", 16);
     EXPECT_NE(errorOf(binary), "");
+    // A text with a line break can't be written back as DXF text.
+    binary = std::string("AutoCAD Binary DXF\r\n\x1a\0", 22) +
+             std::string("\0\0SECTION\0\x02\0HEA\nDER\0", 21);
+    EXPECT_EQ(errorOf(binary), "byte 34: a text holds a line break");
 }
 
 TEST(MalformedInput, UnregisteredApplicationIsRegisteredOnReading) {
