@@ -193,8 +193,24 @@ std::size_t DxfLoader::sectionEnd(std::size_t begin, std::string_view name) cons
                    " (ENDSEC expected)");
 }
 
+namespace {
+// The standard sections in their order; others come after them.
+constexpr std::string_view kSections[] = {"HEADER", "CLASSES",  "TABLES",
+                                          "BLOCKS", "ENTITIES", "OBJECTS"};
+
+std::size_t sectionRank(std::string_view name) {
+    return static_cast<std::size_t>(std::find(std::begin(kSections), std::end(kSections), name) -
+                                    std::begin(kSections));
+}
+}  // namespace
+
 void DxfLoader::readSections() {
     const auto& tags = db_.fileTags_;
+    struct Section {
+        std::string_view name;
+        std::size_t begin, end;
+    };
+    std::vector<Section> sections;
     std::size_t i = 0;
     bool sawEof = false;
     while (i < tags.size()) {
@@ -210,6 +226,15 @@ void DxfLoader::readSections() {
             throw DxfError(where(i + 1) + ": expected the section name (group code 2)");
         const std::string_view name = tags[i + 1].value;
         const std::size_t begin = i + 2, end = sectionEnd(begin, name);
+        sections.push_back({name, begin, end});
+        i = end + 1;
+    }
+    if (!sawEof) db_.warnings_.push_back("the file has no EOF after its last section");
+    // Tables before the blocks and entities that name them, whatever order the file has.
+    std::stable_sort(sections.begin(), sections.end(), [](const Section& a, const Section& b) {
+        return sectionRank(a.name) < sectionRank(b.name);
+    });
+    for (const auto& [name, begin, end] : sections) {
         db_.sectionOrder_.emplace_back(name);
         if (name == "HEADER")
             readHeader(begin, end);
@@ -224,9 +249,7 @@ void DxfLoader::readSections() {
         else
             db_.rawSections_.push_back(
                 {std::string(name), std::vector<Tag>(tags.begin() + begin, tags.begin() + end)});
-        i = end + 1;
     }
-    if (!sawEof) db_.warnings_.push_back("the file has no EOF after its last section");
 }
 
 void DxfLoader::readHeader(std::size_t begin, std::size_t end) {
@@ -282,7 +305,9 @@ void DxfLoader::readTables(std::size_t begin, std::size_t end) {
             if (i + 1 >= next || tags[i + 1].code != 2)
                 throw DxfError(where(i + 1) + ": expected the table name (group code 2)");
             DbObject* head = adopt(i, next, Context::Object);
-            current = db_.addTable(tags[i + 1].value, head);
+            // A table given twice (or made before it was read) takes the records of both.
+            current = db_.table(tags[i + 1].value);
+            if (!current) current = db_.addTable(tags[i + 1].value, head);
         } else if (tags[i].value == "ENDTAB") {
             current = nullptr;
         } else {
@@ -487,22 +512,17 @@ void DxfLoader::finish() {
 }
 
 void DxfLoader::completeSectionOrder() {
-    // Sections the file lacks are written at their usual place, between those it has.
-    static const char* const kStandard[] = {"HEADER", "CLASSES",  "TABLES",
-                                            "BLOCKS", "ENTITIES", "OBJECTS"};
+    // A section that comes twice is read twice but written once, with all it holds; the
+    // standard sections the file lacks are written at their place.
     auto& order = db_.sectionOrder_;
-    // A section that comes twice is read twice but written once, with all it holds.
     std::unordered_set<std::string> seen;
     std::erase_if(order, [&](const std::string& name) { return !seen.insert(name).second; });
-    const auto present = [&](std::string_view name) {
-        return std::find(order.begin(), order.end(), name) != order.end();
-    };
-    for (std::size_t k = 0; k < std::size(kStandard); ++k) {
-        if (present(kStandard[k])) continue;
-        auto at = order.end();
-        for (std::size_t later = k + 1; later < std::size(kStandard) && at == order.end(); ++later)
-            at = std::find(order.begin(), order.end(), kStandard[later]);
-        order.insert(at, kStandard[k]);
+    for (std::size_t k = 0; k < std::size(kSections); ++k) {
+        if (std::find(order.begin(), order.end(), kSections[k]) != order.end()) continue;
+        const auto at = std::find_if(order.begin(), order.end(), [&](const std::string& name) {
+            return sectionRank(name) > k;
+        });
+        order.insert(at, std::string(kSections[k]));
     }
 }
 
