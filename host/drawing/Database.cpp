@@ -94,9 +94,57 @@ std::vector<LayerRecord*> Database::layers() const {
     return result;
 }
 
+namespace {
+// The order of the TABLES section.
+constexpr std::string_view kStandardTables[] = {"VPORT", "LTYPE", "LAYER",    "STYLE",       "VIEW",
+                                                "UCS",   "APPID", "DIMSTYLE", "BLOCK_RECORD"};
+
+int tableRank(std::string_view name) {
+    for (std::size_t i = 0; i < std::size(kStandardTables); ++i)
+        if (TagValues::sameName(kStandardTables[i], name)) return static_cast<int>(i);
+    return -1;
+}
+}  // namespace
+
+SymbolTable* Database::ensureTable(std::string_view name) {
+    if (SymbolTable* existing = table(name)) return existing;
+    const int rank = tableRank(name);
+    if (rank < 0) return nullptr;
+    const std::string_view standard = kStandardTables[rank];
+    TagListBuilder tags(arena_);
+    tags.text(0, "TABLE").text(2, standard).handle(5, allocateHandle()).handle(330, 0);
+    tags.text(100, "AcDbSymbolTable").integer(70, 0);
+    if (standard == "DIMSTYLE") tags.text(100, "AcDbDimStyleTable").integer(71, 0);
+    DbObject* head =
+        adopt(DxfLoader::makeOwnedObject(*this, tags.take(), DxfLoader::Context::Object));
+    // Before the first table that comes later in the standard order; unknown ones stay last.
+    auto at = tables_.begin();
+    while (at != tables_.end()) {
+        const int other = tableRank((*at)->name());
+        if (other < 0 || other > rank) break;
+        ++at;
+    }
+    SymbolTable* made = tables_.insert(at, std::make_unique<SymbolTable>(standard, head))->get();
+    // The records that every drawing has and that new layers and entities name.
+    if (standard == "LTYPE") {
+        for (const char* name : {"ByBlock", "ByLayer", "Continuous"}) {
+            TagListBuilder more(arena_);
+            more.text(3, name == std::string_view("Continuous") ? "Solid line" : "");
+            more.integer(72, 65).integer(73, 0).real(40, 0.0);
+            createTableRecord("LTYPE", name, "AcDbLinetypeTableRecord", more.take());
+        }
+    } else if (standard == "LAYER") {
+        TagListBuilder more(arena_);
+        more.integer(62, 7).text(6, "Continuous");
+        createTableRecord("LAYER", "0", "AcDbLayerTableRecord", more.take());
+    }
+    return made;
+}
+
 DbObject* Database::createTableRecord(std::string_view tableName, std::string_view name,
                                       std::string_view subclass, const std::vector<Tag>& more) {
-    SymbolTable* t = table(tableName);
+    SymbolTable* t = ensureTable(tableName);
+    if (!t) t = table(tableName);
     if (!t) return nullptr;
     TagListBuilder tags(arena_);
     const std::string_view type = t->name();
@@ -112,6 +160,7 @@ DbObject* Database::createTableRecord(std::string_view tableName, std::string_vi
 
 LayerRecord* Database::createLayer(std::string_view name) {
     if (LayerRecord* existing = layer(name)) return existing;
+    ensureTable("LTYPE");
     TagListBuilder more(arena_);
     more.integer(62, 7).text(6, "Continuous").integer(370, -3);
     if (LayerRecord* zero = layer("0"); zero && zero->has(390)) more.text(390, zero->text(390));
@@ -146,20 +195,25 @@ BlockRecord* Database::createBlock(std::string_view name, const Point3& basePoin
     more.integer(280, 1).integer(281, 0);
     auto* record = static_cast<BlockRecord*>(
         createTableRecord("BLOCK_RECORD", name, "AcDbBlockTableRecord", more.take()));
+    addBlockEnds(*record, basePoint);
+    return record;
+}
+
+void Database::addBlockEnds(BlockRecord& record, const Point3& basePoint) {
+    const std::string_view name = record.name();
     TagListBuilder begin(arena_);
-    begin.text(0, "BLOCK").handle(5, allocateHandle()).handle(330, record->handle());
+    begin.text(0, "BLOCK").handle(5, allocateHandle()).handle(330, record.handle());
     begin.text(100, "AcDbEntity").text(8, "0").text(100, "AcDbBlockBegin").text(2, name);
     begin.integer(70, 0).point(10, basePoint).text(3, name).text(1, "");
     auto* blockBegin = static_cast<Entity*>(
         adopt(DxfLoader::makeOwnedObject(*this, begin.take(), DxfLoader::Context::Entity)));
     TagListBuilder end(arena_);
-    end.text(0, "ENDBLK").handle(5, allocateHandle()).handle(330, record->handle());
+    end.text(0, "ENDBLK").handle(5, allocateHandle()).handle(330, record.handle());
     end.text(100, "AcDbEntity").text(8, "0").text(100, "AcDbBlockEnd");
     auto* blockEnd = static_cast<Entity*>(
         adopt(DxfLoader::makeOwnedObject(*this, end.take(), DxfLoader::Context::Entity)));
-    record->setBlockBegin(blockBegin);
-    record->setBlockEnd(blockEnd);
-    return record;
+    record.setBlockBegin(blockBegin);
+    record.setBlockEnd(blockEnd);
 }
 
 void Database::forgetBlock(BlockRecord& record) {
@@ -196,8 +250,20 @@ Dictionary* Database::namedObjects() const {
     return dynamic_cast<Dictionary*>(objectByHandle(namedObjects_));
 }
 
+Dictionary* Database::ensureNamedObjects() {
+    if (Dictionary* root = namedObjects()) return root;
+    TagListBuilder tags(arena_);
+    tags.text(0, "DICTIONARY").handle(5, allocateHandle()).handle(330, 0);
+    tags.text(100, "AcDbDictionary").integer(281, 1);
+    auto* root = static_cast<Dictionary*>(
+        adopt(DxfLoader::makeOwnedObject(*this, tags.take(), DxfLoader::Context::Object)));
+    objects_.insert(objects_.begin(), root);
+    namedObjects_ = root->handle();
+    return root;
+}
+
 Dictionary* Database::dictionaryAt(std::span<const std::string> path, bool create) {
-    Dictionary* current = namedObjects();
+    Dictionary* current = create ? ensureNamedObjects() : namedObjects();
     for (const std::string& name : path) {
         if (!current) return nullptr;
         current = create ? current->getOrCreateDictionary(name) : current->getDictionary(name);

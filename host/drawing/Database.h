@@ -60,6 +60,9 @@ public:
 
     // Tables -------------------------------------------------------------------------------
     SymbolTable* table(std::string_view name) const;  // "LAYER", "BLOCK_RECORD"...
+    // One of the standard tables, made empty at its usual place when the drawing has none
+    // (files from small tools often carry only what they use); null for other names.
+    SymbolTable* ensureTable(std::string_view name);
     const std::vector<std::unique_ptr<SymbolTable>>& tables() const { return tables_; }
     LayerRecord* layer(std::string_view name) const;
     std::vector<LayerRecord*> layers() const;
@@ -75,6 +78,7 @@ public:
     // Adds the APPID record when missing; true when it was added.
     bool registerApplication(std::string_view application);
     // A new record at the end of a table: type, name, its subclass marker and further tags.
+    // A missing standard table is made first.
     DbObject* createTableRecord(std::string_view tableName, std::string_view name,
                                 std::string_view subclass, const std::vector<Tag>& more = {});
 
@@ -85,8 +89,12 @@ public:
 
     // Objects section -------------------------------------------------------------------------
     Dictionary* namedObjects() const;
+    // The named-objects dictionary, made (the first object of the OBJECTS section) when the
+    // drawing has none.
+    Dictionary* ensureNamedObjects();
     // The dictionary at the path of names below the named-objects dictionary; missing levels
-    // are made when `create` is set, else the answer is null.
+    // (the named-objects dictionary too) are made when `create` is set, else the answer is
+    // null.
     Dictionary* dictionaryAt(std::span<const std::string> path, bool create);
     // The Xrecord at the path (the last name is the Xrecord's entry).
     XRecord* xrecordAt(std::span<const std::string> path, bool create);
@@ -118,6 +126,7 @@ private:
     friend class DxfWriter;
     friend class DeepCloner;
     friend class R12Upgrade;
+    friend class R14Upgrade;
     struct Blank {};
     explicit Database(Blank);
 
@@ -131,6 +140,8 @@ private:
     void noteHandle(std::uint64_t handle);
     void noteChange();
     void forgetBlock(BlockRecord& record);
+    // The BLOCK and ENDBLK entities of a block record that has none.
+    void addBlockEnds(BlockRecord& record, const Point3& basePoint = {});
     void ensureSeqend(Entity& parent);
     std::vector<Tag> entityHead(std::string_view type, std::uint64_t handle, std::uint64_t owner,
                                 std::string_view layer, bool paperSpace);

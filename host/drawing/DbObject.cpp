@@ -123,7 +123,10 @@ void DbObject::setHandle(std::uint64_t handle) {
             return;
         }
     }
-    all.insert(all.begin() + (all.empty() ? 0 : 1), Tag{code, value});
+    // A table head keeps its name first: readers look for it right after 0/TABLE.
+    std::size_t at = all.empty() ? 0 : 1;
+    if (type() == "TABLE" && all.size() > 1 && all[1].code == 2) at = 2;
+    all.insert(all.begin() + static_cast<std::ptrdiff_t>(at), Tag{code, value});
 }
 
 std::size_t DbObject::headerEnd() const {

@@ -8,6 +8,7 @@
 #include "LayerRecord.h"
 #include "Polyline.h"
 #include "R12Upgrade.h"
+#include "R14Upgrade.h"
 #include "SymbolTable.h"
 #include "TagReader.h"
 #include "TagValues.h"
@@ -15,13 +16,17 @@
 #include "TextEntity.h"
 #include "XRecord.h"
 
+#include <algorithm>
 #include <fstream>
+#include <iostream>
 #include <sstream>
 #include <unordered_set>
 
 namespace zvdb {
 
 namespace {
+
+constexpr std::string_view kDuplicateNote = " already in use; new handles were given";
 
 bool isTag(const Tag& tag, int code, std::string_view value) {
     return tag.code == code && tag.value == value;
@@ -69,7 +74,8 @@ std::unique_ptr<DbObject> DxfLoader::makeOwnedObject(Database& database, std::ve
 std::unique_ptr<Database> DxfLoader::load(std::string bytes) {
     std::unique_ptr<Database> database(new Database(Database::Blank{}));
     loadInto(*database, std::move(bytes));
-    if (database->version() < "AC1015") return R12Upgrade::upgrade(*database);
+    if (database->version() < "AC1012") return R12Upgrade::upgrade(*database);
+    if (database->version() < "AC1015") R14Upgrade::upgrade(*database);
     return database;
 }
 
@@ -81,7 +87,11 @@ std::unique_ptr<Database> DxfLoader::loadFile(const std::string& path) {
     in.seekg(0);
     std::string bytes(static_cast<std::size_t>(size), '\0');
     if (!in.read(bytes.data(), size)) throw DxfError(path + ": cannot be read");
-    return load(std::move(bytes));
+    auto database = load(std::move(bytes));
+    // Renumbered objects change what other programs see: the user hears of it once per file.
+    for (const std::string& warning : database->warnings())
+        if (warning.ends_with(kDuplicateNote)) std::cerr << path << ": " << warning << "\n";
+    return database;
 }
 
 void DxfLoader::loadInto(Database& database, std::string bytes) {
@@ -93,22 +103,32 @@ void DxfLoader::run(std::string bytes) {
     if (bytes.empty()) throw DxfError("the file is empty");
     text_ = db_.arena_.adopt(std::move(bytes));
     binary_ = TagReader::isBinary(text_);
-    db_.fileTags_ =
-        binary_ ? TagReader::readBinary(text_, db_.arena_) : TagReader::readAscii(text_);
+    db_.fileTags_ = binary_ ? TagReader::readBinary(text_, db_.arena_, &comments_)
+                            : TagReader::readAscii(text_, &comments_);
     if (db_.fileTags_.empty()) throw DxfError("line 1: the file holds no DXF data");
     std::size_t objects = 0;
     for (const Tag& tag : db_.fileTags_)
         objects += tag.code == 0 ? 1 : 0;
     db_.byHandle_.reserve(objects);
     db_.storage_.reserve(objects);
+    // Objects made while reading (a missing block record) take handles above all of the file's.
+    // ($HANDSEED, a code 5 of the header, is the next free handle, not one in use.)
+    const auto& tags = db_.fileTags_;
+    for (std::size_t i = 1; i < tags.size(); ++i)
+        if ((tags[i].code == 5 || tags[i].code == 105) && tags[i - 1].code != 9)
+            db_.noteHandle(TagValues::toHandle(tags[i].value));
     fixEncoding();
     readSections();
     finish();
 }
 
 std::string DxfLoader::where(std::size_t tagIndex) const {
-    if (binary_) return "tag " + std::to_string(tagIndex + 1);
-    return "line " + std::to_string(2 * tagIndex + 1);
+    // Comments were left out of the tags but count in the file.
+    const auto before = static_cast<std::size_t>(
+        std::upper_bound(comments_.begin(), comments_.end(), tagIndex) - comments_.begin());
+    const std::size_t place = tagIndex + before;
+    if (binary_) return "tag " + std::to_string(place + 1);
+    return "line " + std::to_string(2 * place + 1);
 }
 
 std::string DxfLoader::where(const DbObject& object) const {
@@ -173,8 +193,24 @@ std::size_t DxfLoader::sectionEnd(std::size_t begin, std::string_view name) cons
                    " (ENDSEC expected)");
 }
 
+namespace {
+// The standard sections in their order; others come after them.
+constexpr std::string_view kSections[] = {"HEADER", "CLASSES",  "TABLES",
+                                          "BLOCKS", "ENTITIES", "OBJECTS"};
+
+std::size_t sectionRank(std::string_view name) {
+    return static_cast<std::size_t>(std::find(std::begin(kSections), std::end(kSections), name) -
+                                    std::begin(kSections));
+}
+}  // namespace
+
 void DxfLoader::readSections() {
     const auto& tags = db_.fileTags_;
+    struct Section {
+        std::string_view name;
+        std::size_t begin, end;
+    };
+    std::vector<Section> sections;
     std::size_t i = 0;
     bool sawEof = false;
     while (i < tags.size()) {
@@ -190,6 +226,15 @@ void DxfLoader::readSections() {
             throw DxfError(where(i + 1) + ": expected the section name (group code 2)");
         const std::string_view name = tags[i + 1].value;
         const std::size_t begin = i + 2, end = sectionEnd(begin, name);
+        sections.push_back({name, begin, end});
+        i = end + 1;
+    }
+    if (!sawEof) db_.warnings_.push_back("the file has no EOF after its last section");
+    // Tables before the blocks and entities that name them, whatever order the file has.
+    std::stable_sort(sections.begin(), sections.end(), [](const Section& a, const Section& b) {
+        return sectionRank(a.name) < sectionRank(b.name);
+    });
+    for (const auto& [name, begin, end] : sections) {
         db_.sectionOrder_.emplace_back(name);
         if (name == "HEADER")
             readHeader(begin, end);
@@ -204,9 +249,7 @@ void DxfLoader::readSections() {
         else
             db_.rawSections_.push_back(
                 {std::string(name), std::vector<Tag>(tags.begin() + begin, tags.begin() + end)});
-        i = end + 1;
     }
-    if (!sawEof) db_.warnings_.push_back("the file has no EOF after its last section");
 }
 
 void DxfLoader::readHeader(std::size_t begin, std::size_t end) {
@@ -238,13 +281,15 @@ DbObject* DxfLoader::adopt(std::size_t begin, std::size_t end, Context context) 
     const auto& tags = db_.fileTags_;
     auto object = makeObject(db_, std::span<const Tag>(tags.data() + begin, end - begin), context);
     const std::uint64_t handle = object->handle();
-    if (handle != 0) {
-        if (DbObject* first = db_.byHandle_.count(handle) ? db_.byHandle_.at(handle) : nullptr)
-            throw DxfError(where(begin) + ": handle " + TagValues::fromHandle(handle) +
-                           " is used twice (first at " + where(*first) + ")");
-    }
+    // A handle used twice stays with the first object; the later one gets a new handle
+    // once every handle of the file is known, as CAD programs recover such files.
+    const bool duplicate = handle != 0 && db_.byHandle_.count(handle) != 0;
+    if (duplicate) object->handle_ = 0;
     DbObject* raw = db_.adopt(std::move(object));
-    if (handle == 0 && modern()) withoutHandle_.push_back(raw);
+    if (duplicate)
+        duplicates_.push_back({raw, handle});
+    else if (handle == 0 && modern())
+        withoutHandle_.push_back(raw);
     return raw;
 }
 
@@ -260,7 +305,9 @@ void DxfLoader::readTables(std::size_t begin, std::size_t end) {
             if (i + 1 >= next || tags[i + 1].code != 2)
                 throw DxfError(where(i + 1) + ": expected the table name (group code 2)");
             DbObject* head = adopt(i, next, Context::Object);
-            current = db_.addTable(tags[i + 1].value, head);
+            // A table given twice (or made before it was read) takes the records of both.
+            current = db_.table(tags[i + 1].value);
+            if (!current) current = db_.addTable(tags[i + 1].value, head);
         } else if (tags[i].value == "ENDTAB") {
             current = nullptr;
         } else {
@@ -276,14 +323,23 @@ void DxfLoader::readTables(std::size_t begin, std::size_t end) {
     }
 }
 
-BlockRecord* DxfLoader::syntheticBlock(std::string_view name) {
+BlockRecord* DxfLoader::syntheticBlock(std::string_view name, bool withEnds) {
+    if (BlockRecord* existing = db_.block(name)) return existing;
+    if (modern()) {
+        // A record in a written table, and the BLOCK and ENDBLK that the file did not give.
+        BlockRecord* record = withEnds ? db_.createBlock(name)
+                                       : dynamic_cast<BlockRecord*>(db_.createTableRecord(
+                                             "BLOCK_RECORD", name, "AcDbBlockTableRecord"));
+        db_.warnings_.push_back("block " + std::string(name) +
+                                " had no BLOCK_RECORD; one was added");
+        return record;
+    }
     SymbolTable* records = db_.table("BLOCK_RECORD");
     if (!records) {
         // R12 files have no block records; they are kept in memory only.
         records = db_.addTable("BLOCK_RECORD", nullptr);
         db_.tables_.back()->setWritten(false);
     }
-    if (auto* existing = dynamic_cast<BlockRecord*>(records->find(name))) return existing;
     TagListBuilder tags(db_.arena_);
     tags.text(0, "BLOCK_RECORD")
         .text(100, "AcDbSymbolTableRecord")
@@ -291,12 +347,6 @@ BlockRecord* DxfLoader::syntheticBlock(std::string_view name) {
         .text(2, name);
     auto* record =
         static_cast<BlockRecord*>(db_.adopt(makeOwnedObject(db_, tags.take(), Context::Table)));
-    if (modern()) {
-        record->setHandle(db_.allocateHandle());
-        db_.byHandle_.emplace(record->handle(), record);
-        db_.warnings_.push_back("block " + std::string(name) +
-                                " had no BLOCK_RECORD; one was added");
-    }
     records->add(record);
     return record;
 }
@@ -306,7 +356,7 @@ BlockRecord* DxfLoader::blockFor(Entity& blockBegin) {
         return record;
     const std::string_view name = blockBegin.text(2);
     if (BlockRecord* record = db_.block(name)) return record;
-    return syntheticBlock(name);
+    return syntheticBlock(name, false);
 }
 
 void DxfLoader::closeOpenParent() {
@@ -379,7 +429,13 @@ void DxfLoader::readEntities(std::size_t begin, std::size_t end) {
                            std::to_string(tags[i].code));
         const std::size_t next = nextObject(i, end);
         auto* entity = static_cast<Entity*>(adopt(i, next, Context::Entity));
+        if (entity->isType("BLOCK") || entity->isType("ENDBLK"))
+            throw DxfError(where(i) + ": " + std::string(entity->type()) +
+                           " outside the BLOCKS section");
+        // The ENTITIES section holds model and paper space only, whatever an owner says.
         BlockRecord* block = dynamic_cast<BlockRecord*>(db_.objectByHandle(entity->ownerHandle()));
+        const bool wrongOwner = block && !block->isLayout();
+        if (wrongOwner) block = nullptr;
         if (!block) {
             if (entity->inPaperSpace()) {
                 if (!paper) paper = syntheticBlock("*Paper_Space");
@@ -389,6 +445,7 @@ void DxfLoader::readEntities(std::size_t begin, std::size_t end) {
                 block = model;
             }
         }
+        if (wrongOwner) entity->setOwner(block->handle());
         placeEntity(entity, block);
         i = next;
     }
@@ -423,12 +480,19 @@ void DxfLoader::finish() {
         db_.warnings_.push_back(std::to_string(withoutHandle_.size()) +
                                 " objects had no handle; new handles were given");
     }
-    // Every drawing has a model space, even a file with no ENTITIES section.
+    renumberDuplicates();
+    // Every drawing has a model space, even a file with no ENTITIES section, and every
+    // block record of a modern file its BLOCK and ENDBLK.
     if (!db_.modelSpace()) syntheticBlock("*Model_Space");
+    if (modern())
+        for (BlockRecord* block : db_.blocks())
+            if (!block->blockBegin()) db_.addBlockEnds(*block);
+    completeSectionOrder();
     if (repairedSeqends_)
         db_.warnings_.push_back(std::to_string(repairedSeqends_) +
                                 " missing SEQEND entities were added");
-    // Every extended-data application must be registered.
+    // Every extended-data application must be registered. Registering adds objects to the
+    // storage, so the names are gathered first.
     std::vector<std::string> missing;
     if (db_.table("APPID")) {
         std::unordered_set<std::string_view> checked;
@@ -436,15 +500,50 @@ void DxfLoader::finish() {
             if (object->isType("XRECORD")) continue;
             for (const Tag& tag : object->tags()) {
                 if (tag.code != 1001 || !checked.insert(tag.value).second) continue;
-                if (db_.isApplicationRegistered(tag.value)) continue;
-                missing.emplace_back(tag.value);
-                db_.registerApplication(tag.value);
+                if (!db_.isApplicationRegistered(tag.value)) missing.emplace_back(tag.value);
             }
         }
     }
-    for (const std::string& app : missing)
+    for (const std::string& app : missing) {
+        db_.registerApplication(app);
         db_.warnings_.push_back("extended-data application " + app +
                                 " was not in the APPID table; it was added");
+    }
+}
+
+void DxfLoader::completeSectionOrder() {
+    // A section that comes twice is read twice but written once, with all it holds; the
+    // standard sections the file lacks are written at their place.
+    auto& order = db_.sectionOrder_;
+    std::unordered_set<std::string> seen;
+    std::erase_if(order, [&](const std::string& name) { return !seen.insert(name).second; });
+    for (std::size_t k = 0; k < std::size(kSections); ++k) {
+        if (std::find(order.begin(), order.end(), kSections[k]) != order.end()) continue;
+        const auto at = std::find_if(order.begin(), order.end(), [&](const std::string& name) {
+            return sectionRank(name) > k;
+        });
+        order.insert(at, std::string(kSections[k]));
+    }
+}
+
+void DxfLoader::renumberDuplicates() {
+    if (duplicates_.empty()) return;
+    for (const Duplicate& duplicate : duplicates_) {
+        DbObject* object = duplicate.object;
+        object->setHandle(db_.allocateHandle());
+        db_.byHandle_.emplace(object->handle(), object);
+        // Attributes, vertices and the SEQEND that followed it are its own.
+        auto* entity = dynamic_cast<Entity*>(object);
+        if (!entity) continue;
+        std::vector<Entity*> children = entity->subEntities();
+        if (entity->seqend()) children.push_back(entity->seqend());
+        for (Entity* child : children)
+            if (child->ownerHandle() == duplicate.handle) child->setOwner(object->handle());
+    }
+    db_.warnings_.push_back(
+        std::to_string(duplicates_.size()) +
+        (duplicates_.size() == 1 ? " object had a handle" : " objects had handles") +
+        std::string(kDuplicateNote));
 }
 
 }  // namespace zvdb

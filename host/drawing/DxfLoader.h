@@ -48,11 +48,15 @@ private:
     std::size_t nextObject(std::size_t from, std::size_t end) const;
     DbObject* adopt(std::size_t begin, std::size_t end, Context context);
     BlockRecord* blockFor(Entity& blockBegin);
-    BlockRecord* syntheticBlock(std::string_view name);
+    // A block the file names without defining it; `withEnds` adds its BLOCK and ENDBLK.
+    BlockRecord* syntheticBlock(std::string_view name, bool withEnds = true);
     void placeEntity(Entity* entity, BlockRecord* block);
     void closeOpenParent();
     void finish();
-    bool modern() const { return db_.version() >= "AC1015"; }
+    void renumberDuplicates();
+    void completeSectionOrder();
+    // Files from R13 on give every object a handle and every table record an owner.
+    bool modern() const { return db_.version() >= "AC1012"; }
 
     Database& db_;
     bool binary_ = false;
@@ -60,6 +64,13 @@ private:
     Entity* openParent_ = nullptr;
     BlockRecord* openParentBlock_ = nullptr;
     std::vector<DbObject*> withoutHandle_;
+    // Objects whose handle an earlier object holds: they get new handles at the end.
+    struct Duplicate {
+        DbObject* object;
+        std::uint64_t handle;
+    };
+    std::vector<Duplicate> duplicates_;
+    std::vector<std::size_t> comments_;  // tag index after each comment left out
     std::size_t repairedSeqends_ = 0;
 };
 

@@ -73,6 +73,10 @@ public:
         const auto* z = static_cast<const char*>(zero);
         std::string_view text(data_.data() + pos_,
                               static_cast<std::size_t>(z - data_.data()) - pos_);
+        // A line break would split the value in two lines of the DXF text we write.
+        if (text.find('\n') != std::string_view::npos)
+            throw DxfError("byte " + std::to_string(pos_ + kBinarySentinel.size()) +
+                           ": a text holds a line break");
         pos_ += text.size() + 1;
         return text;
     }
@@ -130,7 +134,15 @@ bool TagReader::isBinary(std::string_view data) {
            data.substr(0, kBinarySentinel.size()) == kBinarySentinel;
 }
 
-std::vector<Tag> TagReader::readAscii(std::string_view text) {
+namespace {
+constexpr int kComment = 999;
+
+bool isEof(const Tag& tag) {
+    return tag.code == 0 && tag.value == "EOF";
+}
+}  // namespace
+
+std::vector<Tag> TagReader::readAscii(std::string_view text, std::vector<std::size_t>* comments) {
     std::vector<Tag> tags;
     tags.reserve(static_cast<std::size_t>(std::count(text.begin(), text.end(), '\n')) / 2 + 2);
     const char* p = text.data();
@@ -155,14 +167,22 @@ std::vector<Tag> TagReader::readAscii(std::string_view text) {
         const char* valueEnd = vnl ? vnl : end;
         const char* trimmed = valueEnd;
         if (trimmed > p && trimmed[-1] == '\r') --trimmed;
-        tags.push_back(Tag{static_cast<std::int16_t>(code), std::string_view(p, trimmed - p)});
+        const Tag tag{static_cast<std::int16_t>(code), std::string_view(p, trimmed - p)};
         p = vnl ? vnl + 1 : end;
         line += 2;
+        if (code == kComment) {
+            if (comments) comments->push_back(tags.size());
+            continue;
+        }
+        tags.push_back(tag);
+        // What follows the end of the file is not part of the drawing.
+        if (isEof(tag)) break;
     }
     return tags;
 }
 
-std::vector<Tag> TagReader::readBinary(std::string_view data, StringArena& arena) {
+std::vector<Tag> TagReader::readBinary(std::string_view data, StringArena& arena,
+                                       std::vector<std::size_t>* comments) {
     std::vector<Tag> tags;
     tags.reserve(data.size() / 10 + 16);
     BinaryCursor in(data.substr(kBinarySentinel.size()), arena);
@@ -181,8 +201,12 @@ std::vector<Tag> TagReader::readBinary(std::string_view data, StringArena& arena
             throw DxfError("byte " + std::to_string(in.offset() + kBinarySentinel.size()) +
                            ": expected a group code, found " + std::to_string(code));
         const std::string_view value = binaryValue(in, code, shortCodes);
+        if (code == kComment) {
+            if (comments) comments->push_back(tags.size());
+            continue;
+        }
         tags.push_back(Tag{static_cast<std::int16_t>(code), value});
-        if (code == 0 && value == "EOF") break;
+        if (isEof(tags.back())) break;
     }
     return tags;
 }

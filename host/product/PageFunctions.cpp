@@ -94,7 +94,7 @@ void eraseGroup(zvdb::Database& database, const std::string& group) {
     if (layers.count(std::string(database.currentLayer()))) database.setCurrentLayer("0");
     for (const std::string& name : layers)
         if (zvdb::LayerRecord* layer = database.layer(name)) layer->erase();
-    database.table("LAYER")->reindex();
+    if (zvdb::SymbolTable* table = database.table("LAYER")) table->reindex();
     registry.removeGroup(group);
 }
 
