@@ -156,6 +156,9 @@ public:
     static QString GetLayerEntidade(const OdDbObjectId& id);
     // The vertices of a polyline, in the drawing's coordinates.
     static std::vector<CEPonto> GetVertices(const OdDbObjectId& polilinha);
+    // Grows with every change to the drawing: what was read from it before stays valid while
+    // this number stays the same.
+    static std::uint64_t VersaoDesenho(zvdb::Database* database = nullptr);
     static CEPonto GetPosicao(const OdDbObjectId& referencia);
     // In radians.
     static double GetRotacao(const OdDbObjectId& referencia);

@@ -97,6 +97,11 @@ std::vector<CEPonto> CICad::GetVertices(const OdDbObjectId& polilinha) {
     return pontos;
 }
 
+std::uint64_t CICad::VersaoDesenho(zvdb::Database* database) {
+    zvdb::Database* db = Db(database);
+    return db ? db->changeCount() : 0;
+}
+
 CEPonto CICad::GetPosicao(const OdDbObjectId& referencia) {
     auto* ref = Como<zvdb::BlockReference>(referencia);
     if (!ref) return {};

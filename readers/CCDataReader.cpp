@@ -126,10 +126,7 @@ CEPonto CCDataReader::PontoDaConexaoCompleta(const QString& fio, const QString& 
     return i >= 0 && size_t(i) < it->pontos.size() ? it->pontos[size_t(i)] : CEPonto{};
 }
 
-bool CCDataReader::FioSobPonto(const OdDbObjectId& fio, const QString& layer,
-                               const CEPonto& ponto) const {
-    if (!CICad::EhPolilinha(fio) || CICad::GetLayerEntidade(fio) != layer) return false;
-    const std::vector<CEPonto> vertices = CICad::GetVertices(fio);
+bool CCDataReader::FioSobPonto(const std::vector<CEPonto>& vertices, const CEPonto& ponto) const {
     for (size_t i = 0; i + 1 < vertices.size(); ++i) {
         const CEPonto& a = vertices[i];
         const CEPonto& b = vertices[i + 1];
@@ -139,7 +136,34 @@ bool CCDataReader::FioSobPonto(const OdDbObjectId& fio, const QString& layer,
     return false;
 }
 
-OdDbObjectId CCDataReader::FioNoPonto(const QString& layer, const CEPonto& ponto) {
+// A point passes a segment only within the tolerance of the segment's box (a z that differs
+// between its ends widens the box by that much), so each segment goes into the grid cells
+// its widened box meets; a segment with coordinates that are not finite is tried always.
+struct CCDataReader::FiosDoLayer {
+    std::vector<OdDbObjectId> fios;  // in the answer's order
+    std::vector<std::vector<CEPonto>> vertices;
+    std::vector<std::uint32_t> sempre;  // wires tried at every point
+    bool semGrade = false;              // no grid: every wire is tried
+    double x0 = 0, y0 = 0, passo = 1;
+    std::size_t nx = 0, ny = 0;
+    std::vector<std::vector<std::uint32_t>> celulas;
+
+    std::size_t Celula(double v, double origem, std::size_t n) const {
+        const double c = std::floor((v - origem) / passo);
+        if (!(c > 0)) return 0;
+        return c >= double(n - 1) ? n - 1 : std::size_t(c);
+    }
+};
+
+const CCDataReader::FiosDoLayer& CCDataReader::IndiceFios(const QString& layer) {
+    const std::uint64_t versao = CICad::VersaoDesenho();
+    if (versao != versaoIndices_) {
+        indicesFios_.clear();
+        versaoIndices_ = versao;
+    }
+    std::unique_ptr<FiosDoLayer>& indice = indicesFios_[layer];
+    if (indice) return *indice;
+    indice = std::make_unique<FiosDoLayer>();
     auto it = fiosPorLayer_.constFind(layer);
     if (it == fiosPorLayer_.constEnd()) {
         QStringList handles;
@@ -149,10 +173,101 @@ OdDbObjectId CCDataReader::FioNoPonto(const QString& layer, const CEPonto& ponto
         CICad::LiberaLista(resposta);
         it = fiosPorLayer_.insert(layer, handles);
     }
-    // The first wire in the answer's order wins, even when a later one is closer.
+    FiosDoLayer& f = *indice;
     for (const QString& handle : *it) {
         const OdDbObjectId fio = CICad::IdDoHandle(handle);
-        if (FioSobPonto(fio, layer, ponto)) return fio;
+        if (!CICad::EhPolilinha(fio) || CICad::GetLayerEntidade(fio) != layer) continue;
+        std::vector<CEPonto> vertices = CICad::GetVertices(fio);
+        if (vertices.size() < 2) continue;
+        f.fios.push_back(fio);
+        f.vertices.push_back(std::move(vertices));
+    }
+    // Widened boxes of the segments; the grid spans the finite ones.
+    struct Caixa {
+        double x1, y1, x2, y2;
+        std::uint32_t fio;
+    };
+    std::vector<Caixa> caixas;
+    const double tol = tolerancia_;
+    if (!std::isfinite(tol)) {
+        f.semGrade = true;
+        return f;
+    }
+    double minX = HUGE_VAL, minY = HUGE_VAL, maxX = -HUGE_VAL, maxY = -HUGE_VAL;
+    for (std::uint32_t w = 0; w < f.fios.size(); ++w) {
+        const std::vector<CEPonto>& v = f.vertices[w];
+        bool sempre = false;
+        for (size_t i = 0; i + 1 < v.size(); ++i) {
+            const CEPonto& a = v[i];
+            const CEPonto& b = v[i + 1];
+            const double folga = std::abs(tol) + std::abs(b.z - a.z);
+            const Caixa c{std::min(a.x, b.x) - folga, std::min(a.y, b.y) - folga,
+                          std::max(a.x, b.x) + folga, std::max(a.y, b.y) + folga, w};
+            if (!std::isfinite(c.x1) || !std::isfinite(c.y1) || !std::isfinite(c.x2) ||
+                !std::isfinite(c.y2)) {
+                sempre = true;
+                continue;
+            }
+            caixas.push_back(c);
+            minX = std::min(minX, c.x1);
+            minY = std::min(minY, c.y1);
+            maxX = std::max(maxX, c.x2);
+            maxY = std::max(maxY, c.y2);
+        }
+        if (sempre) f.sempre.push_back(w);
+    }
+    if (caixas.empty()) return f;
+    // About one cell per segment, square cells.
+    const double largura = std::max(maxX - minX, 1e-9), altura = std::max(maxY - minY, 1e-9);
+    const double lado = std::max(1.0, std::ceil(std::sqrt(double(caixas.size()))));
+    f.passo = std::max(largura, altura) / lado;
+    if (!(f.passo > 0) || !std::isfinite(f.passo)) {
+        f.semGrade = true;
+        return f;
+    }
+    f.x0 = minX;
+    f.y0 = minY;
+    f.nx = std::min<std::size_t>(std::size_t(largura / f.passo) + 1, 1024);
+    f.ny = std::min<std::size_t>(std::size_t(altura / f.passo) + 1, 1024);
+    f.celulas.resize(f.nx * f.ny);
+    for (const Caixa& c : caixas) {
+        const std::size_t i1 = f.Celula(c.x1, f.x0, f.nx), i2 = f.Celula(c.x2, f.x0, f.nx);
+        const std::size_t j1 = f.Celula(c.y1, f.y0, f.ny), j2 = f.Celula(c.y2, f.y0, f.ny);
+        for (std::size_t j = j1; j <= j2; ++j)
+            for (std::size_t i = i1; i <= i2; ++i) {
+                std::vector<std::uint32_t>& celula = f.celulas[j * f.nx + i];
+                if (celula.empty() || celula.back() != c.fio) celula.push_back(c.fio);
+            }
+    }
+    return f;
+}
+
+OdDbObjectId CCDataReader::FioNoPonto(const QString& layer, const CEPonto& ponto) {
+    const FiosDoLayer& f = IndiceFios(layer);
+    // The first wire in the answer's order wins, even when a later one is closer.
+    if (f.semGrade || !std::isfinite(ponto.x) || !std::isfinite(ponto.y)) {
+        for (size_t w = 0; w < f.fios.size(); ++w)
+            if (FioSobPonto(f.vertices[w], ponto)) return f.fios[w];
+        return {};
+    }
+    static const std::vector<std::uint32_t> kNenhuma;
+    const bool dentro = !f.celulas.empty() && ponto.x >= f.x0 && ponto.y >= f.y0 &&
+                        ponto.x <= f.x0 + f.passo * double(f.nx) &&
+                        ponto.y <= f.y0 + f.passo * double(f.ny);
+    const std::vector<std::uint32_t>& celula =
+        dentro ? f.celulas[f.Celula(ponto.y, f.y0, f.ny) * f.nx + f.Celula(ponto.x, f.x0, f.nx)]
+               : kNenhuma;
+    // Both lists ascend: walk them as one, in the answer's order.
+    size_t i = 0, k = 0;
+    while (i < celula.size() || k < f.sempre.size()) {
+        std::uint32_t w;
+        if (k >= f.sempre.size() || (i < celula.size() && celula[i] < f.sempre[k])) {
+            w = celula[i++];
+        } else {
+            w = f.sempre[k++];
+            if (i < celula.size() && celula[i] == w) ++i;
+        }
+        if (FioSobPonto(f.vertices[w], ponto)) return f.fios[w];
     }
     return {};
 }

@@ -11,6 +11,7 @@
 
 #include <memory>
 #include <optional>
+#include <unordered_map>
 #include <vector>
 
 namespace zvdb {
@@ -111,7 +112,11 @@ private:
         std::vector<CEPonto> pontos;
     };
     void CarregaConexoes(const QString& funcao, bool detalhes);
-    bool FioSobPonto(const OdDbObjectId& fio, const QString& layer, const CEPonto& ponto) const;
+    bool FioSobPonto(const std::vector<CEPonto>& vertices, const CEPonto& ponto) const;
+    // The wires of a layer with their vertices, read once, and a grid of their segments that
+    // answers the wire-at-point question from the few wires near the point.
+    struct FiosDoLayer;
+    const FiosDoLayer& IndiceFios(const QString& layer);
     void LeCircuitoLocal(const QString& sufixo, CEItemLista& item, const OdDbObjectId& entidade);
     void LeLayout(const QString& sufixo, CEItemLista& item, const OdDbObjectId& entidade);
     // The key text's two parts; false when no key application is there.
@@ -125,6 +130,8 @@ private:
     QHash<int, Circuito> circuitos_;
     QHash<QString, Conexoes> conexoes_;
     QHash<QString, QStringList> fiosPorLayer_;
+    std::unordered_map<QString, std::unique_ptr<FiosDoLayer>> indicesFios_;
+    std::uint64_t versaoIndices_ = 0;  // the drawing's version the indexes were read at
     // Route records in store order, read on the first lookup; routes by wire key.
     struct Rota {
         QString chave, dados;

@@ -29,14 +29,12 @@ void CEItemLista::copiarCamposComSufixo(const CEItemLista& origem, const QString
 }
 
 void CEItemLista::partilharNomes(QSet<QString>& nomes) {
-    QHash<QString, QString> partilhados;
-    partilhados.reserve(campos.size());
-    for (auto it = campos.constBegin(); it != campos.constEnd(); ++it) {
+    // Each key is swapped for the shared copy of the same text: its hash and place stay.
+    for (auto it = campos.begin(); it != campos.end(); ++it) {
         auto nome = nomes.constFind(it.key());
         if (nome == nomes.constEnd()) nome = nomes.insert(it.key());
-        partilhados.insert(*nome, it.value());
+        if (!nome->isSharedWith(it.key())) const_cast<QString&>(it.key()) = *nome;
     }
-    campos.swap(partilhados);
 }
 
 void CEItemLista::paraLisp() const {

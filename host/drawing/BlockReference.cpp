@@ -72,7 +72,10 @@ Attribute* BlockReference::addAttributeFromDefinition(const Attribute& definitio
         if (tag.code == 3) continue;  // the prompt belongs to the definition
         body.push_back(tag);
     }
-    Attribute* attribute = database().addAttribute(*this, body, definition.layer());
+    // A definition of the same drawing lends its values as they are; the marker put in is a
+    // literal, which lives as long as any drawing.
+    Attribute* attribute = database().addAttribute(*this, body, definition.layer(),
+                                                   &definition.database() == &database());
     attribute->setPosition(t.apply(definition.position()));
     if (definition.has(11)) attribute->setPoint(11, t.apply(definition.point(11)), "AcDbText");
     const double s = scale().y;

@@ -352,13 +352,13 @@ void Database::ensureSeqend(Entity& parent) {
 }
 
 Attribute* Database::addAttribute(BlockReference& reference, const std::vector<Tag>& body,
-                                  std::string_view layer) {
+                                  std::string_view layer, bool stored) {
     std::vector<Tag> tags =
         entityHead("ATTRIB", allocateHandle(), reference.handle(), layer, reference.inPaperSpace());
     tags.reserve(tags.size() + 1 + body.size() + kSettersSlack);
     tags.push_back(Tag{100, "AcDbText"});
     for (const Tag& tag : body)
-        tags.push_back(Tag{tag.code, store(tag.value)});
+        tags.push_back(Tag{tag.code, stored ? tag.value : store(tag.value)});
     auto* attribute = static_cast<Attribute*>(
         adopt(DxfLoader::makeOwnedObject(*this, std::move(tags), DxfLoader::Context::Entity)));
     reference.addSubEntity(attribute);

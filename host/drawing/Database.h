@@ -110,8 +110,9 @@ public:
     // ones (its subclass marker first).
     Entity* addEntity(BlockRecord& block, std::string_view type, const std::vector<Tag>& body,
                       std::string_view layer);
+    // `stored`: the body's values are already held by this database (they are not copied).
     Attribute* addAttribute(BlockReference& reference, const std::vector<Tag>& body,
-                            std::string_view layer);
+                            std::string_view layer, bool stored = false);
     Entity* addVertex(Polyline& polyline, const Point3& p);
     StringArena& arena() { return arena_; }
     std::string_view store(std::string_view text) { return arena_.store(text); }

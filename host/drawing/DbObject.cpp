@@ -173,10 +173,18 @@ std::size_t DbObject::xdataStart() const {
 
 int DbObject::indexOf(int code, std::size_t from) const {
     const auto all = tags();
-    const std::size_t end = code >= 1000 ? all.size() : xdataStart();
+    // The extended data's start is looked for only when a tag of 1000 or above is reached:
+    // below the first such tag there is no extended data.
+    std::size_t end = all.size();
+    bool endKnown = code >= 1000;
     bool inGroup = false;
     for (std::size_t i = 1; i < end; ++i) {
         const Tag& tag = all[i];
+        if (!endKnown && tag.code >= 1000) {
+            end = xdataStart();
+            endKnown = true;
+            if (i >= end) break;
+        }
         if (opensGroup(tag)) {
             inGroup = true;
         } else if (closesGroup(tag)) {
@@ -313,8 +321,9 @@ std::vector<std::string_view> DbObject::xdataApplications() const {
 }
 
 bool DbObject::hasXData(std::string_view application) const {
-    for (std::string_view name : xdataApplications())
-        if (TagValues::sameName(name, application)) return true;
+    const auto all = tags();
+    for (std::size_t i = xdataStart(); i < all.size(); ++i)
+        if (all[i].code == 1001 && TagValues::sameName(all[i].value, application)) return true;
     return false;
 }
 

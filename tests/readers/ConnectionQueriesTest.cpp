@@ -12,6 +12,7 @@
 #include "readers/LeitorBase.h"
 #include "readers/ZVString.h"
 #include "sample/XDataItems.h"
+#include "sdk/LispInterface.h"
 
 namespace {
 
@@ -154,6 +155,20 @@ TEST_F(ConnectionQueriesTest, ALayersWiresAreAskedForOncePerReader) {
     // The drawing does not change during a run: the first answer for the layer stays.
     EXPECT_TRUE(r->FioNoPonto(layer, {50, 200, 0}).isNull());
     EXPECT_EQ(leitor()->FioNoPonto(layer, {50, 200, 0}), id(depois));
+}
+
+TEST_F(ConnectionQueriesTest, AWireVertexMovedInLispIsSeenByTheNextQuestion) {
+    const zvdb::Polyline* w = fio({{0, 100, 0}, {100, 100, 0}}, "1");
+    auto r = leitor(0.5);
+    const QString layer = QString::fromStdString(kPagina);
+    EXPECT_EQ(r->FioNoPonto(layer, {50, 100, 0}), id(w));
+    EXPECT_TRUE(r->FioNoPonto(layer, {50, 200, 0}).isNull());
+    // The first vertex goes up to (0 300): the wire now passes (50 200), no longer (50 100).
+    ASSERT_TRUE(documento_->lisp()->lispEvaluate("(entmod (list (cons -1 (handent \"" + handle(w) +
+                                                 "\")) '(10 0.0 300.0)))"));
+    ASSERT_EQ(w->vertices().front().y, 300.0);
+    EXPECT_EQ(r->FioNoPonto(layer, {50, 200, 0}), id(w));
+    EXPECT_TRUE(r->FioNoPonto(layer, {50, 100, 0}).isNull());
 }
 
 // ---- neighbours along a wire

@@ -1,0 +1,65 @@
+// The terminal list's output bytes on generated projects of a few sizes, time stamps set
+// aside, against digests taken from the build before the reader's caches and indexes came
+// in. A change here means the list prints something else: a faster path that answers
+// differently, or a change of behaviour that must then be looked at and the digest renewed.
+#include "ProductFolder.h"
+
+#include <gtest/gtest.h>
+
+#include <QCryptographicHash>
+#include <QFile>
+#include <QRegularExpression>
+
+namespace {
+
+struct Caso {
+    const char* seed;
+    const char* terminais;
+    bool numerosNoProjeto;
+    const char* digest;
+};
+
+// SHA-256 of the output with every line that is a time ("hh:mm:ss") or a date ("dd/mm/yy")
+// replaced by "*".
+QByteArray Digest(const QString& arquivo) {
+    QFile f(arquivo);
+    if (!f.open(QIODevice::ReadOnly)) return {};
+    static const QRegularExpression kCarimbo("^(\\d\\d:\\d\\d:\\d\\d|\\d\\d/\\d\\d/\\d\\d)$");
+    QList<QByteArray> linhas = f.readAll().split('\n');
+    for (QByteArray& linha : linhas)
+        if (kCarimbo.match(QString::fromLatin1(linha)).hasMatch()) linha = "*";
+    return QCryptographicHash::hash(linhas.join('\n'), QCryptographicHash::Sha256).toHex();
+}
+
+class ListOutputGoldenTest : public ::testing::TestWithParam<Caso> {};
+
+TEST_P(ListOutputGoldenTest, TheTerminalListPrintsTheSameBytesAsBefore) {
+    const Caso& caso = GetParam();
+    zvtest::ProductFolder pasta;
+    QStringList gerar{"--seed", caso.seed, "--terminals", caso.terminais};
+    if (caso.numerosNoProjeto)
+        gerar << "--numbers"
+              << "project";
+    const QString falha = pasta.prepare(gerar);
+    ASSERT_TRUE(falha.isEmpty()) << falha.toStdString();
+    const zvtest::HostRun r =
+        pasta.zvhost(pasta.terminalList(pasta.project(), pasta.path("l.dxf")));
+    ASSERT_EQ(r.status, 0) << r.err.toStdString();
+    // The stamp is there and is what the digest leaves out.
+    QFile saida(pasta.path("l.dxf"));
+    ASSERT_TRUE(saida.open(QIODevice::ReadOnly));
+    EXPECT_TRUE(QRegularExpression("\n\\d\\d:\\d\\d:\\d\\d\n")
+                    .match(QString::fromLatin1(saida.readAll()))
+                    .hasMatch());
+    EXPECT_EQ(Digest(pasta.path("l.dxf")).toStdString(), caso.digest);
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    GeneratedProjects, ListOutputGoldenTest,
+    ::testing::Values(
+        Caso{"3", "60", false, "aca76a715e96582064ec1f843c832f2d5ef29059219132fa8f5e4ab16a209297"},
+        Caso{"5", "400", true, "98819c6702b9dad19e8e7cc9f778691d26a58ab9077d543f808c332bfa49d4fc"},
+        Caso{"11", "2500", true,
+             "cbc6b6373170d0dc77420d358c8646c3a097ca73ce952a52701398abbea1104c"}));
+
+}  // namespace
