@@ -18,6 +18,7 @@
 #include <QFileInfo>
 
 #include <memory>
+#include <unordered_map>
 
 namespace zvhost {
 
@@ -120,6 +121,7 @@ private:
     Value xdata(const zvdb::DbObject& o, const Value& applications);
     Value entget(Args a);
     Value entmod(Args a);
+    void setGroup(zvdb::DbObject& o, int code, int occurrence, const Value& value);
     Value entnext(Args a);
     Value tblsearch(Args a, bool next);
     Value getvar(Args a);
@@ -184,6 +186,7 @@ Value CadFunctions::entmod(Args a) {
             o = object(group.asCons()->cdr);
     }
     if (!o) return {};
+    std::unordered_map<int, int> seen;
     for (Value v = a[0]; v.isCons(); v = v.asCons()->cdr) {
         const Value& group = v.asCons()->car;
         if (!group.isCons() || !group.asCons()->car.isInt()) continue;
@@ -221,20 +224,50 @@ Value CadFunctions::entmod(Args a) {
         }
         if (code < 1 || code == 5 || code == 100 || code == 102 || code == 330 || code == 360)
             continue;
-        if (kindOf(code) == Kind::Point && value.isCons()) {
-            std::vector<Value> xyz = lisp_.toVector(value);
-            o->setPoint(code, {xyz.size() > 0 ? lisp_.toNumber(xyz[0]) : 0,
-                               xyz.size() > 1 ? lisp_.toNumber(xyz[1]) : 0,
-                               xyz.size() > 2 ? lisp_.toNumber(xyz[2]) : 0});
-        } else if (value.isString()) {
-            o->setText(code, value.asString().toStdString());
-        } else if (value.isReal()) {
-            o->setReal(code, value.asReal());
-        } else if (value.isInt()) {
-            o->setInteger(code, value.asInt());
-        }
+        // The n-th group of a code goes to the n-th tag of it: a polyline's vertices.
+        setGroup(*o, code, seen[code]++, value);
     }
     return a[0];
+}
+
+void CadFunctions::setGroup(zvdb::DbObject& o, int code, int occurrence, const Value& value) {
+    int at = o.indexOf(code);
+    for (int n = 0; n < occurrence && at >= 0; ++n)
+        at = o.indexOf(code, std::size_t(at) + 1);
+    if (at < 0) {
+        // A later group that the object lacks is left out; a first one is added.
+        if (occurrence > 0) return;
+        if (kindOf(code) == Kind::Point && value.isCons()) {
+            std::vector<Value> xyz = lisp_.toVector(value);
+            o.setPoint(code, {xyz.size() > 0 ? lisp_.toNumber(xyz[0]) : 0,
+                              xyz.size() > 1 ? lisp_.toNumber(xyz[1]) : 0,
+                              xyz.size() > 2 ? lisp_.toNumber(xyz[2]) : 0});
+        } else if (value.isString()) {
+            o.setText(code, value.asString().toStdString());
+        } else if (value.isReal()) {
+            o.setReal(code, value.asReal());
+        } else if (value.isInt()) {
+            o.setInteger(code, value.asInt());
+        }
+        return;
+    }
+    auto& tags = o.editTags();
+    std::size_t k = std::size_t(at);
+    if (kindOf(code) == Kind::Point && value.isCons()) {
+        // The coordinates the tag has are set; a 2-D vertex gets no z.
+        const std::vector<Value> xyz = lisp_.toVector(value);
+        for (std::size_t axis = 0; axis < 3 && axis < xyz.size(); ++axis) {
+            const std::size_t i = k + axis;
+            if (i >= tags.size() || tags[i].code != code + 10 * int(axis)) break;
+            tags[i].value = db().store(zvdb::TagValues::fromReal(lisp_.toNumber(xyz[axis])));
+        }
+    } else if (value.isString()) {
+        tags[k].value = db().store(value.asString().toStdString());
+    } else if (value.isReal()) {
+        tags[k].value = db().store(zvdb::TagValues::fromReal(value.asReal()));
+    } else if (value.isInt()) {
+        tags[k].value = db().store(zvdb::TagValues::fromInteger(value.asInt()));
+    }
 }
 
 // Model space in order, each entity followed by its attributes or vertices and its end.
@@ -480,7 +513,8 @@ void CadFunctions::install() {
         "setvar", [self](Interpreter&, Args a) { return self->setvar(a); }, 2, 2);
     lisp_.define(
         "namedobjdict",
-        [self](Interpreter&, Args) { return self->ename(self->db().namedObjects()); }, 0, 0);
+        // A drawing without one gets its named-object dictionary, as a CAD program makes it.
+        [self](Interpreter&, Args) { return self->ename(self->db().ensureNamedObjects()); }, 0, 0);
     lisp_.define(
         "dictsearch", [self](Interpreter&, Args a) { return self->dictsearch(a); }, 2, 3);
     lisp_.define(

@@ -10,6 +10,7 @@
 #include "drawing/Database.h"
 #include "drawing/Dictionary.h"
 #include "drawing/LayerRecord.h"
+#include "drawing/Polyline.h"
 #include "drawing/TagValues.h"
 #include "lisp/Printer.h"
 
@@ -86,6 +87,22 @@ TEST_F(CadLispTest, EntmodWritesTheDrawing) {
     EXPECT_EQ(lisp("(entdel e)"), lisp("e"));
     EXPECT_TRUE(ref_->isErased());
     EXPECT_EQ(lisp("(entget e)"), "nil");
+}
+
+TEST_F(CadLispTest, EntmodSetsEachVertexOfAPolylineInItsOwnPlace) {
+    zvdb::Polyline* fio = documento_->database()->modelSpace()->addLwPolyline(
+        {{0, 0, 0}, {10, 0, 0}, {10, 5, 0}}, false, "ESQ$0001$A");
+    lisp("(setq e (handent \"" +
+         QString::fromStdString(zvdb::TagValues::fromHandle(fio->handle())) + "\"))");
+    // The whole entget list back, with its second vertex moved.
+    lisp(
+        "(setq d (entget e) n 0 d (mapcar '(lambda (g) (if (= (car g) 10) (progn (setq n (1+ n))"
+        " (if (= n 2) (list 10 20.0 1.0) g)) g)) d))");
+    lisp("(entmod d)");
+    EXPECT_EQ(lisp("(vl-remove-if-not '(lambda (g) (= (car g) 10)) (entget e))"),
+              "((10 0.0 0.0 0.0) (10 20.0 1.0 0.0) (10 10.0 5.0 0.0))");
+    // entget shows a z, but a 2-D vertex stays 2-D in the drawing.
+    EXPECT_EQ(fio->indexOf(30), -1);
 }
 
 TEST_F(CadLispTest, TablesAndVariables) {
