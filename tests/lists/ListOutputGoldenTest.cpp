@@ -60,6 +60,9 @@ INSTANTIATE_TEST_SUITE_P(
         Caso{"3", "60", false, "aca76a715e96582064ec1f843c832f2d5ef29059219132fa8f5e4ab16a209297"},
         Caso{"5", "400", true, "98819c6702b9dad19e8e7cc9f778691d26a58ab9077d543f808c332bfa49d4fc"},
         Caso{"11", "2500", true,
-             "cbc6b6373170d0dc77420d358c8646c3a097ca73ce952a52701398abbea1104c"}));
+             "cbc6b6373170d0dc77420d358c8646c3a097ca73ce952a52701398abbea1104c"}),
+    [](const ::testing::TestParamInfo<Caso>& info) {
+        return std::string("seed") + info.param.seed + "_terminals" + info.param.terminais;
+    });
 
 }  // namespace
