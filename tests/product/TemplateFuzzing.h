@@ -55,10 +55,14 @@ public:
         } restore;
         qputenv("ZV_DATA_DIR", folder_.path().toUtf8());
 
-        auto database = zvdb::DxfLoader::load(project());
+        // The project is read when a function first asks for it: most inputs never do.
+        std::unique_ptr<zvdb::Database> database;
         CancellingUser user;
         zvproduct::ProductContext context;
-        context.database = [&database] { return database.get(); };
+        context.database = [&database] {
+            if (!database) database = zvdb::DxfLoader::load(project());
+            return database.get();
+        };
         context.userInterface = [&user] { return &user; };
         context.print = [&result](const QString& text) { result.printed += text; };
         context.fileName = [this] { return folder_.filePath("project.dxf"); };

@@ -66,9 +66,10 @@ TEST_F(TemplateRobustness, InputsThatOnceFailedTheFuzzer) {
     for (const QFileInfo& file : inputs) {
         const TemplateFuzzing::Result result = fuzzing.run(contentOf(file.filePath()));
         EXPECT_TRUE(result.stillWorks) << file.fileName().toStdString();
-        if (!result.loaded)
+        if (!result.loaded) {
             EXPECT_TRUE(result.printed.contains("; error:"))
                 << file.fileName().toStdString() << ": " << result.printed.toStdString();
+        }
     }
 }
 
