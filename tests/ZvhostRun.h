@@ -6,6 +6,20 @@
 
 namespace zvtest {
 
+// AddressSanitizer reserves terabytes of address space for its shadow memory, so a child
+// under an address-space limit (prlimit --as) cannot even start in a sanitizer build.
+#if defined(__SANITIZE_ADDRESS__)
+inline constexpr bool kAddressSanitizer = true;
+#elif defined(__has_feature)
+#if __has_feature(address_sanitizer)
+inline constexpr bool kAddressSanitizer = true;
+#else
+inline constexpr bool kAddressSanitizer = false;
+#endif
+#else
+inline constexpr bool kAddressSanitizer = false;
+#endif
+
 struct HostRun {
     int status = -1;  // -1 when it did not finish in time
     QString out;
