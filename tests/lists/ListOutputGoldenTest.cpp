@@ -19,6 +19,11 @@ struct Caso {
     const char* digest;
 };
 
+// Shown in test names and failures.
+void PrintTo(const Caso& caso, std::ostream* os) {
+    *os << "seed " << caso.seed << ", " << caso.terminais << " terminals";
+}
+
 // SHA-256 of the output with every line that is a time ("hh:mm:ss") or a date ("dd/mm/yy")
 // replaced by "*".
 QByteArray Digest(const QString& arquivo) {
