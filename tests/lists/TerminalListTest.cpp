@@ -1,7 +1,7 @@
 // The terminal list from end to end through zvhost, on a generated project with the demo
 // catalogue and product data, read back from the saved drawing.
+#include "ProductFolder.h"
 #include "QtPrinters.h"
-#include "ZvhostRun.h"
 #include "drawing/Attribute.h"
 #include "drawing/BlockRecord.h"
 #include "drawing/BlockReference.h"
@@ -27,42 +27,15 @@ using Resultado = zvtest::HostRun;
 class TerminalListTest : public ::testing::Test {
 protected:
     static void SetUpTestSuite() {
-        pasta_ = new QTemporaryDir;
-        ASSERT_TRUE(pasta_->isValid());
-        const QString dados = pasta_->filePath("dados");
-        const QString produto = pasta_->filePath("produto") + "/";
-        QDir().mkpath(dados);
-        QDir().mkpath(produto);
-        const QString catalogo = QString(ZV_SOURCE_DIR) + "/data/catalogue/";
-        ASSERT_EQ(zvhost({"catalogue", "--build", dados + "/catalogo.db",
-                          catalogo + "catalogo-esquema.sql", catalogo + "catalogo-dados.sql"})
-                      .status,
-                  0);
-        ASSERT_EQ(zvhost({"catalogue", "--set", "Database=SQLITE", "NetworkZV=" + dados + "/",
-                          "DBName=catalogo.db", "libLang=1"})
-                      .status,
-                  0);
-        for (const char* sub : {"templates", "config"}) {
-            QDir().mkpath(produto + sub);
-            for (const QString& f :
-                 QDir(QString(ZV_SOURCE_DIR) + "/data/" + sub).entryList(QDir::Files))
-                QFile::copy(QString(ZV_SOURCE_DIR) + "/data/" + sub + "/" + f,
-                            produto + sub + "/" + f);
-        }
-        const Resultado gerado = zvhost({"generate", "--out", pasta_->filePath("p.dxf"), "--seed",
-                                         "3", "--terminals", "60", "--data", produto});
-        ASSERT_EQ(gerado.status, 0) << gerado.err.toStdString();
+        pasta_ = new zvtest::ProductFolder;
+        const QString problema = pasta_->prepare();
+        ASSERT_TRUE(problema.isEmpty()) << problema.toStdString();
     }
     static void TearDownTestSuite() { delete pasta_; }
 
-    static Resultado zvhost(const QStringList& args) {
-        QProcessEnvironment env = QProcessEnvironment::systemEnvironment();
-        env.insert("ZV_DATA_DIR", pasta_->filePath("dados"));
-        env.insert("ZV_PRODUCT_DIR", pasta_->filePath("produto") + "/");
-        return zvtest::runZvhost(args, env, pasta_->path());
-    }
+    static Resultado zvhost(const QStringList& args) { return pasta_->zvhost(args); }
     static Resultado lista(const QString& entrada, const QString& saida, QStringList extra = {}) {
-        QStringList args = {"--quiet", "--load", pasta_->filePath("produto/config/zvconfig.lsp")};
+        QStringList args = {"--quiet", "--load", pasta_->path("produto/config/zvconfig.lsp")};
         args << extra << entrada << "-o" << saida << "gerarListaBornesGrf";
         return zvhost(args);
     }
@@ -88,7 +61,7 @@ protected:
     // A template of the suite's product folder: `texto` after loading the demo's terminal
     // template; the list commands then use it.
     static QStringList modelo(const QString& nome, const QByteArray& texto) {
-        QFile arquivo(pasta_->filePath("produto/templates/" + nome));
+        QFile arquivo(pasta_->path("produto/templates/" + nome));
         EXPECT_TRUE(arquivo.open(QIODevice::WriteOnly));
         arquivo.write("(load (strcat *DIR_ZVCFG_TEMPL* \"bornes.grt\"))\n" + texto + "\n");
         return {"--eval", "(setq *DEF_LISTA_BORNES* \"" + nome + "\")"};
@@ -125,17 +98,17 @@ protected:
         return linhas;
     }
 
-    static QTemporaryDir* pasta_;
+    static zvtest::ProductFolder* pasta_;
 };
 
-QTemporaryDir* TerminalListTest::pasta_ = nullptr;
+zvtest::ProductFolder* TerminalListTest::pasta_ = nullptr;
 
 TEST_F(TerminalListTest, EveryListedTerminalGetsARowOnPagesOfTheTemplateGroup) {
-    const Resultado r = lista(pasta_->filePath("p.dxf"), pasta_->filePath("l1.dxf"));
+    const Resultado r = lista(pasta_->path("p.dxf"), pasta_->path("l1.dxf"));
     ASSERT_EQ(r.status, 0) << r.err.toStdString();
     EXPECT_TRUE(r.out.contains("List created.")) << r.out.toStdString();
     QStringList paginas;
-    const QStringList rows = linhas(pasta_->filePath("l1.dxf"), &paginas);
+    const QStringList rows = linhas(pasta_->path("l1.dxf"), &paginas);
     ASSERT_FALSE(rows.isEmpty());
     EXPECT_GE(rows.size(), 60);
     for (int i = 0; i < paginas.size(); ++i)
@@ -149,33 +122,32 @@ TEST_F(TerminalListTest, EveryListedTerminalGetsARowOnPagesOfTheTemplateGroup) {
 }
 
 TEST_F(TerminalListTest, ARunAgainAppendsOnNoAndReplacesOnYes) {
-    ASSERT_EQ(lista(pasta_->filePath("p.dxf"), pasta_->filePath("l1.dxf")).status, 0);
+    ASSERT_EQ(lista(pasta_->path("p.dxf"), pasta_->path("l1.dxf")).status, 0);
     QStringList uma, nao, sim;
-    const int linhasUma = int(linhas(pasta_->filePath("l1.dxf"), &uma).size());
-    Resultado r = lista(pasta_->filePath("l1.dxf"), pasta_->filePath("l2.dxf"),
-                        {"--answer", "question:89=no"});
+    const int linhasUma = int(linhas(pasta_->path("l1.dxf"), &uma).size());
+    Resultado r =
+        lista(pasta_->path("l1.dxf"), pasta_->path("l2.dxf"), {"--answer", "question:89=no"});
     ASSERT_EQ(r.status, 0) << r.err.toStdString();
-    EXPECT_EQ(int(linhas(pasta_->filePath("l2.dxf"), &nao).size()), 2 * linhasUma);
+    EXPECT_EQ(int(linhas(pasta_->path("l2.dxf"), &nao).size()), 2 * linhasUma);
     EXPECT_EQ(nao.size(), 2 * uma.size());
-    r = lista(pasta_->filePath("l1.dxf"), pasta_->filePath("l3.dxf"),
-              {"--answer", "question:89=yes"});
+    r = lista(pasta_->path("l1.dxf"), pasta_->path("l3.dxf"), {"--answer", "question:89=yes"});
     ASSERT_EQ(r.status, 0);
-    EXPECT_EQ(int(linhas(pasta_->filePath("l3.dxf"), &sim).size()), linhasUma);
+    EXPECT_EQ(int(linhas(pasta_->path("l3.dxf"), &sim).size()), linhasUma);
 }
 
 TEST_F(TerminalListTest, AMissingBlockFileStopsWithMessage150) {
-    const Resultado r = lista(pasta_->filePath("p.dxf"), pasta_->filePath("l4.dxf"),
+    const Resultado r = lista(pasta_->path("p.dxf"), pasta_->path("l4.dxf"),
                               {"--eval", "(setq *DIRETORIO_REDE* \"/nao/existe/\")"});
     // The writer stops: the command failed, and the drawing is not saved.
     EXPECT_EQ(r.status, 3);
     EXPECT_TRUE(r.err.contains("/nao/existe/")) << r.err.toStdString();
     EXPECT_FALSE(r.out.contains("List created."));
-    EXPECT_FALSE(QFile::exists(pasta_->filePath("l4.dxf")));
+    EXPECT_FALSE(QFile::exists(pasta_->path("l4.dxf")));
 }
 
 TEST_F(TerminalListTest, StripPickerAnsweredKeepsItsStripsAndCancelledListsNothing) {
     // A template that asks for the strips, on top of the demo's terminal template.
-    QFile modelo(pasta_->filePath("produto/templates/escolhe.grt"));
+    QFile modelo(pasta_->path("produto/templates/escolhe.grt"));
     ASSERT_TRUE(modelo.open(QIODevice::WriteOnly));
     modelo.write(
         "(load (strcat *DIR_ZVCFG_TEMPL* \"bornes.grt\"))\n"
@@ -183,24 +155,24 @@ TEST_F(TerminalListTest, StripPickerAnsweredKeepsItsStripsAndCancelledListsNothi
     modelo.close();
     const QStringList escolhe = {"--eval", "(setq *DEF_LISTA_BORNES* \"escolhe.grt\")"};
     // Nobody picks: the command is cancelled and nothing is saved.
-    Resultado r = lista(pasta_->filePath("p.dxf"), pasta_->filePath("l5.dxf"), escolhe);
+    Resultado r = lista(pasta_->path("p.dxf"), pasta_->path("l5.dxf"), escolhe);
     ASSERT_EQ(r.status, 4) << r.err.toStdString();
     EXPECT_TRUE(r.out.contains("No terminals were found for the list.")) << r.out.toStdString();
-    EXPECT_FALSE(QFile::exists(pasta_->filePath("l5.dxf")));
+    EXPECT_FALSE(QFile::exists(pasta_->path("l5.dxf")));
 
-    ASSERT_EQ(lista(pasta_->filePath("p.dxf"), pasta_->filePath("l7.dxf")).status, 0);
-    const QStringList rows = linhas(pasta_->filePath("l7.dxf"));
-    r = lista(pasta_->filePath("p.dxf"), pasta_->filePath("l6.dxf"),
+    ASSERT_EQ(lista(pasta_->path("p.dxf"), pasta_->path("l7.dxf")).status, 0);
+    const QStringList rows = linhas(pasta_->path("l7.dxf"));
+    r = lista(pasta_->path("p.dxf"), pasta_->path("l6.dxf"),
               escolhe + QStringList{"--answer", "strips=X1"});
     ASSERT_EQ(r.status, 0) << r.err.toStdString();
-    const QStringList x1 = linhas(pasta_->filePath("l6.dxf"));
+    const QStringList x1 = linhas(pasta_->path("l6.dxf"));
     EXPECT_FALSE(x1.isEmpty());
     EXPECT_LT(x1.size(), rows.size());
 }
 
 TEST_F(TerminalListTest, InvertedTerminalsSwapTheirSidesOnTheRowsAndNothingElse) {
     // The same project with the flag of every drawn terminal turned over.
-    auto db = zvdb::DxfLoader::loadFile(pasta_->filePath("p.dxf").toStdString());
+    auto db = zvdb::DxfLoader::loadFile(pasta_->path("p.dxf").toStdString());
     ASSERT_TRUE(db);
     int virados = 0;
     for (zvdb::Entity* e : db->modelSpace()->entities()) {
@@ -211,14 +183,14 @@ TEST_F(TerminalListTest, InvertedTerminalsSwapTheirSidesOnTheRowsAndNothingElse)
         ++virados;
     }
     ASSERT_GT(virados, 50);
-    zvdb::DxfWriter::saveFile(*db, pasta_->filePath("inv.dxf").toStdString());
-    ASSERT_EQ(lista(pasta_->filePath("p.dxf"), pasta_->filePath("l8.dxf")).status, 0);
-    const Resultado r = lista(pasta_->filePath("inv.dxf"), pasta_->filePath("l9.dxf"));
+    zvdb::DxfWriter::saveFile(*db, pasta_->path("inv.dxf").toStdString());
+    ASSERT_EQ(lista(pasta_->path("p.dxf"), pasta_->path("l8.dxf")).status, 0);
+    const Resultado r = lista(pasta_->path("inv.dxf"), pasta_->path("l9.dxf"));
     ASSERT_EQ(r.status, 0) << r.err.toStdString();
 
     // Row cells: number, element and wire of the first side, wire and element of the other
     // side, key, and "inv" for an inverted terminal.
-    const QStringList antes = linhas(pasta_->filePath("l8.dxf"));
+    const QStringList antes = linhas(pasta_->path("l8.dxf"));
     QStringList esperado;
     int lados = 0, invertidos = 0;
     for (const QString& linha : antes) {
@@ -233,7 +205,7 @@ TEST_F(TerminalListTest, InvertedTerminalsSwapTheirSidesOnTheRowsAndNothingElse)
     }
     EXPECT_GT(lados, antes.size() / 2);
     EXPECT_GT(invertidos, 0);
-    EXPECT_EQ(linhas(pasta_->filePath("l9.dxf")), esperado);
+    EXPECT_EQ(linhas(pasta_->path("l9.dxf")), esperado);
 }
 
 TEST_F(TerminalListTest, AFilterExpressionKeepsOnlyTheTerminalsItAccepts) {
@@ -245,12 +217,12 @@ TEST_F(TerminalListTest, AFilterExpressionKeepsOnlyTheTerminalsItAccepts) {
                                        ((cdr (assoc \"STRIP\" reg)))
                                        ((cdr (assoc \"REGLETA\" reg))))
                                  '(\"X0\" \"X2\"))"))LSP");
-    Resultado r = lista(pasta_->filePath("p.dxf"), pasta_->filePath("l10.dxf"), todos);
+    Resultado r = lista(pasta_->path("p.dxf"), pasta_->path("l10.dxf"), todos);
     ASSERT_EQ(r.status, 0) << r.err.toStdString();
-    r = lista(pasta_->filePath("p.dxf"), pasta_->filePath("l11.dxf"), filtrado);
+    r = lista(pasta_->path("p.dxf"), pasta_->path("l11.dxf"), filtrado);
     ASSERT_EQ(r.status, 0) << r.err.toStdString();
 
-    const std::vector<Linha> completa = linhasComRegua(pasta_->filePath("l10.dxf"));
+    const std::vector<Linha> completa = linhasComRegua(pasta_->path("l10.dxf"));
     QStringList esperado;
     QSet<QString> reguas;
     for (const Linha& linha : completa) {
@@ -260,7 +232,7 @@ TEST_F(TerminalListTest, AFilterExpressionKeepsOnlyTheTerminalsItAccepts) {
     ASSERT_TRUE(reguas.contains("X0") && reguas.contains("X1") && reguas.contains("X2"));
     ASSERT_FALSE(esperado.isEmpty());
     QStringList obtido;
-    for (const Linha& linha : linhasComRegua(pasta_->filePath("l11.dxf"))) {
+    for (const Linha& linha : linhasComRegua(pasta_->path("l11.dxf"))) {
         EXPECT_TRUE(linha.regua == "X0" || linha.regua == "X2") << linha.regua.toStdString();
         obtido << linha.texto;
     }
@@ -270,11 +242,11 @@ TEST_F(TerminalListTest, AFilterExpressionKeepsOnlyTheTerminalsItAccepts) {
 TEST_F(TerminalListTest, TheListedDrawingPassesTheAuditOfAnotherReader) {
     const QString faltando = zvtest::PythonChecker::missing();
     if (!faltando.isEmpty()) GTEST_SKIP() << faltando.toStdString();
-    ASSERT_EQ(lista(pasta_->filePath("p.dxf"), pasta_->filePath("l12.dxf")).status, 0);
+    ASSERT_EQ(lista(pasta_->path("p.dxf"), pasta_->path("l12.dxf")).status, 0);
     QString saida;
-    ASSERT_EQ(zvtest::PythonChecker::run("../drawing/inspect_dxf.py", {pasta_->filePath("l12.dxf")},
-                                         &saida),
-              0)
+    ASSERT_EQ(
+        zvtest::PythonChecker::run("../drawing/inspect_dxf.py", {pasta_->path("l12.dxf")}, &saida),
+        0)
         << saida.toStdString();
     // ezdxf sees the same rows, with the same texts, as the drawing reader.
     const QJsonObject visto = QJsonDocument::fromJson(saida.toUtf8()).object();
@@ -287,7 +259,7 @@ TEST_F(TerminalListTest, TheListedDrawingPassesTheAuditOfAnotherReader) {
             campos << a.toArray().at(1).toString();
         linhasEzdxf << o.value("layer").toString() + " " + campos.join('|');
     }
-    EXPECT_EQ(linhasEzdxf, linhas(pasta_->filePath("l12.dxf")));
+    EXPECT_EQ(linhasEzdxf, linhas(pasta_->path("l12.dxf")));
     EXPECT_TRUE(visto.value("layers").toObject().contains("LISTAS$0001$A"));
 }
 

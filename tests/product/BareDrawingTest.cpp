@@ -2,8 +2,8 @@
 // named-objects dictionary), an R12 file. They make what they need and never reach into a
 // missing table or dictionary; in zvhost and with the module's terminal list too.
 #include "ProductFixture.h"
+#include "ProductFolder.h"
 #include "QtPrinters.h"
-#include "ZvhostRun.h"
 
 #include "drawing/DxfLoader.h"
 #include "drawing/DxfWriter.h"
@@ -91,19 +91,13 @@ class BareDrawingInHost : public ::testing::Test {
 protected:
     void SetUp() override {
         ASSERT_TRUE(QFileInfo::exists(ZV_BIN_DIR "/zvhost")) << "build the zvhost target first";
-        ASSERT_TRUE(folder.isValid());
     }
-    zvtest::HostRun zvhost(const QStringList& arguments) {
-        QProcessEnvironment environment = QProcessEnvironment::systemEnvironment();
-        environment.insert("ZV_DATA_DIR", folder.filePath("data"));
-        environment.insert("ZV_PRODUCT_DIR", folder.filePath("produto") + "/");
-        return zvtest::runZvhost(arguments, environment, folder.path());
-    }
-    QTemporaryDir folder;
+    zvtest::HostRun zvhost(const QStringList& arguments) { return product.zvhost(arguments); }
+    zvtest::ProductFolder product;
 };
 
 TEST_F(BareDrawingInHost, PageCommandsOnAHeaderAlone) {
-    const QString saved = folder.filePath("saved.dxf");
+    const QString saved = product.path("saved.dxf");
     zvtest::HostRun run = zvhost(
         {"--no-module", kHeaderOnly, "--eval", "(princ (criarpagina \"LISTAS\" 0))", "-o", saved});
     ASSERT_EQ(run.status, 0) << run.err.toStdString();
@@ -111,46 +105,25 @@ TEST_F(BareDrawingInHost, PageCommandsOnAHeaderAlone) {
     run = zvhost({"--no-module", saved, "--eval", "(prin1 (buscalistapaginas T))"});
     EXPECT_EQ(run.out, "((\"LISTAS\" \"LISTAS$0001$A\"))") << run.err.toStdString();
     run = zvhost({"--no-module", kHeaderOnly, "--eval", "(apagargrupo \"COMANDO\")", "-o",
-                  folder.filePath("erased.dxf")});
+                  product.path("erased.dxf")});
     EXPECT_EQ(run.status, 0) << run.err.toStdString();
     EXPECT_EQ(run.err, "");
-    EXPECT_TRUE(
-        zvdb::DxfLoader::loadFile(folder.filePath("erased.dxf").toStdString())->modelSpace());
+    EXPECT_TRUE(zvdb::DxfLoader::loadFile(product.path("erased.dxf").toStdString())->modelSpace());
 }
 
 // The terminal list of a generated project whose OBJECTS section was taken out: the list's
 // pages are registered in a new named-objects dictionary.
 TEST_F(BareDrawingInHost, TerminalListOfAProjectWithoutObjects) {
-    const QString data = folder.filePath("data"), product = folder.filePath("produto") + "/";
-    QDir().mkpath(data);
-    const QString catalogue = QString(ZV_SOURCE_DIR) + "/data/catalogue/";
-    ASSERT_EQ(zvhost({"catalogue", "--build", data + "/catalogo.db",
-                      catalogue + "catalogo-esquema.sql", catalogue + "catalogo-dados.sql"})
-                  .status,
-              0);
-    ASSERT_EQ(zvhost({"catalogue", "--set", "Database=SQLITE", "NetworkZV=" + data + "/",
-                      "DBName=catalogo.db", "libLang=1"})
-                  .status,
-              0);
-    for (const char* sub : {"templates", "config"}) {
-        QDir().mkpath(product + sub);
-        const QString from = QString(ZV_SOURCE_DIR) + "/data/" + sub + "/";
-        for (const QString& name : QDir(from).entryList(QDir::Files))
-            QFile::copy(from + name, product + sub + "/" + name);
-    }
-    const QString project = folder.filePath("p.dxf");
-    ASSERT_EQ(zvhost({"generate", "--out", project, "--seed", "3", "--terminals", "30", "--data",
-                      product})
-                  .status,
-              0);
-    const QString bare = folder.filePath("bare.dxf");
+    const QString problem = product.prepare({"--seed", "3", "--terminals", "30"});
+    ASSERT_TRUE(problem.isEmpty()) << problem.toStdString();
+    const QString project = product.project();
+    const QString bare = product.path("bare.dxf");
     QFile out(bare);
     ASSERT_TRUE(out.open(QIODevice::WriteOnly));
     out.write(QByteArray::fromStdString(withoutObjects(fileBytes(project).toStdString())));
     out.close();
-    const QString listed = folder.filePath("listed.dxf");
-    const zvtest::HostRun run = zvhost({"--quiet", "--load", product + "config/zvconfig.lsp", bare,
-                                        "-o", listed, "gerarListaBornesGrf"});
+    const QString listed = product.path("listed.dxf");
+    const zvtest::HostRun run = zvhost(product.terminalList(bare, listed));
     ASSERT_EQ(run.status, 0) << run.err.toStdString();
     EXPECT_TRUE(run.out.contains("List created.")) << run.out.toStdString();
     const auto db = zvdb::DxfLoader::loadFile(listed.toStdString());
