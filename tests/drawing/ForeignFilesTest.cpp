@@ -19,6 +19,8 @@
 #include "drawing/SymbolTable.h"
 #include "drawing/TagValues.h"
 
+#include "ReaderOracle.h"
+
 #include <gtest/gtest.h>
 
 #include <QFile>
@@ -41,14 +43,7 @@ std::string corpusText(const std::string& name) {
     return text.str();
 }
 
-std::string errorOf(const std::string& text) {
-    try {
-        DxfLoader::load(text);
-    } catch (const DxfError& e) {
-        return e.what();
-    }
-    return {};
-}
+using zvtest::errorOf;
 
 int lineOf(const std::string& text, std::size_t offset) {
     return 1 + static_cast<int>(std::count(

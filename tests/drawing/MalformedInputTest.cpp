@@ -41,14 +41,7 @@ std::string sample(std::string_view version = "AC1027") {
     return DxfWriter::toText(db);
 }
 
-std::string errorOf(const std::string& text) {
-    try {
-        DxfLoader::load(text);
-    } catch (const DxfError& e) {
-        return e.what();
-    }
-    return {};
-}
+using zvtest::errorOf;
 
 // Replaces the first occurrence of `from` after `after`.
 std::string replaced(std::string text, const std::string& from, const std::string& to,

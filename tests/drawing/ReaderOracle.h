@@ -16,6 +16,16 @@
 
 namespace zvtest {
 
+// The reader's message for the bytes; empty when they read.
+inline std::string errorOf(const std::string& bytes) {
+    try {
+        zvdb::DxfLoader::load(bytes);
+    } catch (const zvdb::DxfError& e) {
+        return e.what();
+    }
+    return {};
+}
+
 inline std::size_t entityCount(const zvdb::Database& database) {
     std::size_t count = 0;
     for (const zvdb::BlockRecord* block : database.blocks())
