@@ -5,6 +5,7 @@
 #include "app/DocumentLisp.h"
 #include "cad/CICad.h"
 #include "readers/CEItemLista.h"
+#include "readers/SelecaoPaginas.h"
 #include "sdk/LispInterface.h"
 
 #include <QFile>
@@ -218,4 +219,25 @@ TEST_F(LispBridgeTest, FileDialogFiltersAndLog) {
     const QString text = QString::fromUtf8(log.readAll());
     EXPECT_TRUE(text.contains("OPEN file dialog, filter=Templates|*.grt, path=C:\\ZV"));
     EXPECT_TRUE(text.contains("File dialog result: C:/ZV/lists/x.grt"));
+}
+
+TEST_F(LispBridgeTest, PagePickerAnswersNoPageOrThePagesInOrder) {
+    lisp("(criarpagina \"ESQ\" 0)");
+    lisp("(criarpagina \"ESQ\" 0)");
+    auto* ui = dynamic_cast<zvhost::ConsoleUserInterface*>(app_->userInterface());
+    std::optional<QStringList> paginas;
+    // Cancelled: an empty list, which reads no page, not the absence of a list.
+    EXPECT_EQ(SelecionaPaginas(false, paginas), 0);
+    ASSERT_TRUE(paginas.has_value());
+    EXPECT_TRUE(paginas->isEmpty());
+    ui->setAnswer("pages", "ESQ$0002$A;ESQ$0001$A");
+    EXPECT_EQ(SelecionaPaginas(true, paginas), 0);
+    EXPECT_EQ(*paginas, QStringList({"ESQ$0002$A", "ESQ$0001$A"}));
+    EXPECT_EQ(valor("pblTmpSelPags"), "(\"ESQ$0002$A\" \"ESQ$0001$A\")");
+}
+
+TEST(SelecaoPaginasSemDesenho, NoActiveDrawingLeavesTheListAlone) {
+    std::optional<QStringList> paginas = QStringList{"X"};
+    EXPECT_EQ(SelecionaPaginas(false, paginas), 2);
+    EXPECT_EQ(*paginas, QStringList{"X"});
 }
