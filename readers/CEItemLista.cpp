@@ -3,9 +3,9 @@
 #include "cad/CICad.h"
 
 bool CEItemLista::obterCampo(const QString& chave, QString& valor) const {
-    auto it = campos.constFind(chave);
-    if (it == campos.constEnd()) return false;
-    valor = it.value();
+    const QString* achado = campos.procura(chave);
+    if (!achado) return false;
+    valor = *achado;
     return true;
 }
 
@@ -18,8 +18,7 @@ void CEItemLista::definirCampoReal(const QString& chave, double valor, int decim
 }
 
 void CEItemLista::copiarCampos(const CEItemLista& origem) {
-    for (auto it = origem.campos.constBegin(); it != origem.campos.constEnd(); ++it)
-        campos.insert(it.key(), it.value());
+    campos.juntar(origem.campos);
 }
 
 void CEItemLista::copiarCamposComSufixo(const CEItemLista& origem, const QString& sufixo) {
@@ -29,12 +28,9 @@ void CEItemLista::copiarCamposComSufixo(const CEItemLista& origem, const QString
 }
 
 void CEItemLista::partilharNomes(QSet<QString>& nomes) {
-    // Each key is swapped for the shared copy of the same text: its hash and place stay.
-    for (auto it = campos.begin(); it != campos.end(); ++it) {
-        auto nome = nomes.constFind(it.key());
-        if (nome == nomes.constEnd()) nome = nomes.insert(it.key());
-        if (!nome->isSharedWith(it.key())) const_cast<QString&>(it.key()) = *nome;
-    }
+    for (auto it = campos.constBegin(); it != campos.constEnd(); ++it)
+        nomes.insert(it.key());
+    campos.compactar();
 }
 
 void CEItemLista::paraLisp() const {

@@ -1,16 +1,16 @@
 #pragma once
 // One list item: text fields by name, the drawing objects it came from, and chain links.
+#include "CamposItem.h"
 #include "ZVString.h"
 #include "cad/OdDbObjectId.h"
 
-#include <QHash>
 #include <QSet>
 
 #include <vector>
 
 class CEItemLista {
 public:
-    QHash<QString, QString> campos;
+    CamposItem campos;
     // The entity that made the item stands first.
     std::vector<OdDbObjectId> ids;
     // Non-owning: the previous and next terminal of a jumper group, the next wire stretch.
@@ -22,14 +22,16 @@ public:
     // True and the value when present; false and `valor` untouched otherwise.
     bool obterCampo(const QString& chave, QString& valor) const;
     QString valorCampo(const QString& chave) const { return campos.value(chave); }
+    // The value without a copy, or null; valid until the item's fields change.
+    const QString* campo(const QString& chave) const { return campos.procura(chave); }
     void definirCampo(const QString& chave, const QString& valor) { campos.insert(chave, valor); }
     void definirCampoInteiro(const QString& chave, int valor);
     void definirCampoReal(const QString& chave, double valor, int decimais = -1);
     void copiarCampos(const CEItemLista& origem);
     // Each source field under "key_suffix"; an empty suffix keeps the keys.
     void copiarCamposComSufixo(const CEItemLista& origem, const QString& sufixo);
-    // Makes the field names share one copy of each name with the other items of a run, the
-    // names put in `nomes`: a large list holds millions of fields under a few hundred names.
+    // Puts the field names in `nomes` and gives back the spare room of the item's fields (the
+    // names themselves are kept once for the whole program).
     void partilharNomes(QSet<QString>& nomes);
     // Publishes the item to LISP: `reg` the fields as an association list, `ename` the
     // first object (left as it was when the item has none).

@@ -7,7 +7,10 @@
 
 #include <gtest/gtest.h>
 
+#include <QSet>
+
 #include <memory>
+#include <vector>
 
 namespace {
 
@@ -129,6 +132,69 @@ TEST(ItemRecordTest, ItemsOfARunShareTheirFieldNames) {
     };
     EXPECT_EQ(nome(a, "NUMERO_FIM"), nome(b, "NUMERO_FIM"));
     EXPECT_EQ(nome(a, "REGUA"), nome(b, "REGUA"));
+}
+
+// The flat field store: names in any order, overwrites, merges and removals.
+TEST(ItemRecordTest, FieldsInAnyOrderAreFoundOverwrittenMergedAndRemoved) {
+    CEItemLista item;
+    std::vector<int> ordem(500);
+    for (int i = 0; i < 500; ++i)
+        ordem[size_t(i)] = (i * 7919) % 500;  // a permutation: 7919 is prime
+    for (int i : ordem)
+        item.definirCampo("F" + QString::number(i), "v" + QString::number(i));
+    ASSERT_EQ(item.campos.size(), 500);
+    for (int i = 0; i < 500; ++i)
+        EXPECT_EQ(item.valorCampo("F" + QString::number(i)), "v" + QString::number(i)) << i;
+    item.definirCampo("F250", "novo");
+    EXPECT_EQ(item.campos.size(), 500);
+    EXPECT_EQ(item.valorCampo("F250"), "novo");
+
+    CEItemLista destino;
+    destino.definirCampo("F1", "antigo");
+    destino.definirCampo("SO_DESTINO", "fica");
+    destino.definirCampo("F499", "antigo");
+    destino.copiarCampos(item);
+    EXPECT_EQ(destino.campos.size(), 501);
+    EXPECT_EQ(destino.valorCampo("F1"), "v1");
+    EXPECT_EQ(destino.valorCampo("F499"), "v499");
+    EXPECT_EQ(destino.valorCampo("SO_DESTINO"), "fica");
+    EXPECT_EQ(destino.valorCampo("F250"), "novo");
+
+    EXPECT_EQ(destino.campos.remove("F3"), 1);
+    EXPECT_EQ(destino.campos.remove("F3"), 0);
+    EXPECT_EQ(destino.campos.remove("NUNCA_USADO_EM_LUGAR_NENHUM"), 0);
+    EXPECT_FALSE(destino.temCampo("F3"));
+    EXPECT_TRUE(item.temCampo("F3"));
+    EXPECT_EQ(destino.campos.size(), 500);
+
+    // Iteration visits each field once with its own value.
+    QSet<QString> vistos;
+    for (auto it = destino.campos.constBegin(); it != destino.campos.constEnd(); ++it) {
+        const int antes = vistos.size();
+        vistos.insert(it.key());
+        EXPECT_EQ(vistos.size(), antes + 1) << qPrintable(it.key());
+        EXPECT_EQ(it.value(), destino.valorCampo(it.key()));
+    }
+    EXPECT_EQ(vistos.size(), 500);
+    const QString* semCopia = destino.campo("SO_DESTINO");
+    ASSERT_NE(semCopia, nullptr);
+    EXPECT_EQ(*semCopia, "fica");
+    EXPECT_EQ(destino.campo("F3"), nullptr);
+}
+
+// Asking for a name no item ever had does not add it to the program's name table.
+TEST(ItemRecordTest, LookingUpAnUnknownNameLeavesTheNameTableAlone) {
+    CEItemLista item;
+    item.definirCampo("CONHECIDO", "1");
+    const std::uint32_t antes = CamposItem::numero("CONHECIDO");
+    EXPECT_FALSE(item.temCampo("JAMAIS_DEFINIDO_7F3A"));
+    EXPECT_TRUE(item.valorCampo("JAMAIS_DEFINIDO_7F3A").isNull());
+    EXPECT_EQ(item.campos.find("JAMAIS_DEFINIDO_7F3A"), item.campos.constEnd());
+    // A new name gets the next number: the unknown one above took none.
+    const std::uint32_t novo = CamposItem::numero("OUTRO_NOME_NOVO_7F3A");
+    EXPECT_GT(novo, antes);
+    EXPECT_EQ(CamposItem::nome(novo), "OUTRO_NOME_NOVO_7F3A");
+    EXPECT_EQ(CamposItem::numero("JAMAIS_DEFINIDO_7F3A"), novo + 1);
 }
 
 TEST(OrderingTest, NumbersSortNaturallyAndLeadingZerosTieOnRawText) {

@@ -1,0 +1,73 @@
+#pragma once
+// The text fields of one list item, stored flat: a large list holds millions of fields under
+// a few hundred names, so each name is kept once for the whole program and a field is its
+// name's number next to its value, in one array sorted by that number. The interface is the
+// part of a hash of texts that the readers use.
+#include <QString>
+
+#include <cstdint>
+#include <vector>
+
+class CamposItem {
+public:
+    struct Campo {
+        std::uint32_t nome;
+        QString valor;
+    };
+
+    class const_iterator {
+    public:
+        const_iterator() = default;
+        explicit const_iterator(const Campo* campo) : campo_(campo) {}
+        const QString& key() const { return CamposItem::nome(campo_->nome); }
+        const QString& value() const { return campo_->valor; }
+        const QString& operator*() const { return campo_->valor; }
+        const_iterator& operator++() {
+            ++campo_;
+            return *this;
+        }
+        const_iterator operator++(int) {
+            const_iterator antes = *this;
+            ++campo_;
+            return antes;
+        }
+        bool operator==(const const_iterator& outro) const = default;
+
+    private:
+        const Campo* campo_ = nullptr;
+    };
+    using iterator = const_iterator;
+
+    int size() const { return int(campos_.size()); }
+    int count() const { return size(); }
+    bool isEmpty() const { return campos_.empty(); }
+    bool empty() const { return campos_.empty(); }
+    bool contains(const QString& chave) const { return procura(chave) != nullptr; }
+    QString value(const QString& chave, const QString& padrao = QString()) const;
+    // The stored value or null; the pointer lives until the next change of the fields.
+    const QString* procura(const QString& chave) const;
+    void insert(const QString& chave, const QString& valor);
+    int remove(const QString& chave);
+    void clear() { campos_.clear(); }
+    // Each field of `origem` under the same name, replacing what was there.
+    void juntar(const CamposItem& origem);
+    // Gives back the spare room of the array once the item is complete.
+    void compactar() { campos_.shrink_to_fit(); }
+
+    const_iterator begin() const { return const_iterator(campos_.data()); }
+    const_iterator end() const { return const_iterator(campos_.data() + campos_.size()); }
+    const_iterator constBegin() const { return begin(); }
+    const_iterator constEnd() const { return end(); }
+    const_iterator find(const QString& chave) const;
+    const_iterator constFind(const QString& chave) const { return find(chave); }
+
+    // The program-wide name table. A name's text, by its number.
+    static const QString& nome(std::uint32_t numero);
+    // The number of a name, added when new.
+    static std::uint32_t numero(const QString& nome);
+
+private:
+    std::vector<Campo>::const_iterator lugar(std::uint32_t numero) const;
+
+    std::vector<Campo> campos_;
+};
