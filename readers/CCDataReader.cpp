@@ -417,10 +417,17 @@ QString CCDataReader::NormaDaEntidade(const OdDbObjectId& entidade) const {
 
 void CCDataReader::LeColunasUsuario(const QString& sufixo, CEItemLista& item,
                                     const QStringList& colunas) {
+    // Items of one catalogue key repeat its columns: each text is split once, and the items
+    // share the value texts.
     for (const QString& coluna : colunas) {
-        QString nome, valor;
-        if (ZVString(coluna).DivideEmDois(kSeparador, nome, valor) && !nome.isEmpty())
-            item.definirCampo(nome + sufixo, valor);
+        auto it = colunasDivididas_.constFind(coluna);
+        if (it == colunasDivididas_.constEnd()) {
+            QString nome, valor;
+            if (!ZVString(coluna).DivideEmDois(kSeparador, nome, valor)) nome.clear();
+            it = colunasDivididas_.insert(coluna, {nome, valor});
+        }
+        if (!it->first.isEmpty())
+            item.definirCampo(sufixo.isEmpty() ? it->first : it->first + sufixo, it->second);
     }
 }
 

@@ -12,6 +12,7 @@
 #include <memory>
 #include <optional>
 #include <unordered_map>
+#include <utility>
 #include <vector>
 
 namespace zvdb {
@@ -140,6 +141,8 @@ private:
     bool rotasLidas_ = false;
     QHash<QString, QHash<QString, QString>> caminhos_;
     QSet<QString> nomesCampos_;
+    // Catalogue column texts split into name and value (an empty name: not a column).
+    QHash<QString, std::pair<QString, QString>> colunasDivididas_;
     CECacheCatalogo catalogo_;
     double tolerancia_;
 };
