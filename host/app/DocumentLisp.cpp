@@ -50,16 +50,23 @@ zvsdk::ResultBuffer* DocumentLisp::lispInvoke(const zvsdk::ResultBuffer* call) {
     // A function nobody defined answers nothing, quietly: the module asks for optional
     // functions of the product. Errors inside a defined one are reported as usual.
     if (lisp_.global(call->rstring).isNil()) return nullptr;
-    const std::vector<zvlisp::Value> args = LispChains::values(lisp_, call->rbnext);
-    const zvlisp::Value function = zvlisp::Value::symbol(lisp_.intern(call->rstring));
-    zvlisp::Value result;
-    if (!lisp_.applyTopLevel(function, zvlisp::Args(args.data(), int(args.size())), &result))
-        return nullptr;
-    try {
-        return LispChains::toChain(result);
-    } catch (const zvlisp::LispError&) {
-        return nullptr;
+    zvsdk::ResultBuffer* chain = nullptr;
+    {
+        const std::vector<zvlisp::Value> args = LispChains::values(lisp_, call->rbnext);
+        const zvlisp::Value function = zvlisp::Value::symbol(lisp_.intern(call->rstring));
+        zvlisp::Value result;
+        if (!lisp_.applyTopLevel(function, zvlisp::Args(args.data(), int(args.size())), &result))
+            return nullptr;
+        try {
+            chain = LispChains::toChain(result);
+        } catch (const zvlisp::LispError&) {
+            chain = nullptr;
+        }
     }
+    // A function may answer a list of the whole drawing: once it is a chain, the LISP
+    // blocks it took go back for the rest of the command.
+    zvlisp::trimPool();
+    return chain;
 }
 
 bool DocumentLisp::lispEvaluate(const QString& text) {

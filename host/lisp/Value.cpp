@@ -2,6 +2,7 @@
 
 #include "Function.h"
 
+#include <algorithm>
 #include <vector>
 
 namespace zvlisp {
@@ -18,8 +19,11 @@ struct FreeBlock {
 
 thread_local FreeBlock* freeBlocks __attribute__((tls_model("initial-exec"))) = nullptr;
 
+constexpr std::size_t kCount = 1024;
+
 struct Chunks {
     std::vector<void*> list;
+    std::size_t atLastTrim = 0;
     ~Chunks() {
         for (void* chunk : list)
             ::operator delete(chunk);
@@ -30,7 +34,6 @@ struct Chunks {
 thread_local Chunks chunks;
 
 void refill() {
-    constexpr std::size_t kCount = 1024;
     char* chunk = static_cast<char*>(::operator new(kBlock* kCount));
     chunks.list.push_back(chunk);
     for (std::size_t i = 0; i < kCount; ++i) {
@@ -100,6 +103,51 @@ void freeObject(Object* object) {
         --deferredCount;
         release(next, 0);
     }
+}
+
+std::size_t poolChunks() {
+    return chunks.list.size();
+}
+
+std::size_t trimPool() {
+    // Cheap unless the pool grew by some megabytes since the last look.
+    constexpr std::size_t kGrowth = 64;
+    if (chunks.list.size() < chunks.atLastTrim + kGrowth) return 0;
+    std::vector<char*> sorted(chunks.list.size());
+    std::transform(chunks.list.begin(), chunks.list.end(), sorted.begin(),
+                   [](void* c) { return static_cast<char*>(c); });
+    std::sort(sorted.begin(), sorted.end());
+    auto chunkOf = [&](const void* block) {
+        const char* at = static_cast<const char*>(block);
+        auto it = std::upper_bound(sorted.begin(), sorted.end(), at);
+        return std::size_t(it - sorted.begin()) - 1;  // every free block lies in a chunk
+    };
+    std::vector<std::uint32_t> freeCount(sorted.size(), 0);
+    for (FreeBlock* b = freeBlocks; b; b = b->next)
+        ++freeCount[chunkOf(b)];
+    // The free list keeps the blocks of chunks still in use, in its order.
+    FreeBlock* kept = nullptr;
+    FreeBlock** tail = &kept;
+    for (FreeBlock* b = freeBlocks; b; b = b->next)
+        if (freeCount[chunkOf(b)] != kCount) {
+            *tail = b;
+            tail = &b->next;
+        }
+    *tail = nullptr;
+    freeBlocks = kept;
+    std::size_t released = 0;
+    std::vector<void*> left;
+    for (std::size_t i = 0; i < sorted.size(); ++i) {
+        if (freeCount[i] == kCount) {
+            ::operator delete(sorted[i]);
+            ++released;
+        } else {
+            left.push_back(sorted[i]);
+        }
+    }
+    chunks.list = std::move(left);
+    chunks.atLastTrim = chunks.list.size();
+    return released;
 }
 
 bool Value::same(const Value& other) const {

@@ -35,6 +35,11 @@ struct Cons;
 
 // Frees an object whose count dropped to zero, and what only it held.
 void freeObject(Object* object);
+// The small-object pool of this thread: its chunk count, and giving back to the system the
+// chunks whose blocks are all free (after a large list died). The trim only looks when the
+// pool grew by some megabytes since its last look; it answers the chunks released.
+std::size_t poolChunks();
+std::size_t trimPool();
 
 class Value {
 public:
