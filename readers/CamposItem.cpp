@@ -56,6 +56,22 @@ QString CamposItem::value(const QString& chave, const QString& padrao) const {
     return valor ? *valor : padrao;
 }
 
+QStringList CamposItem::keys() const {
+    QStringList nomes;
+    nomes.reserve(size());
+    for (const Campo& campo : campos_)
+        nomes << nome(campo.nome);
+    return nomes;
+}
+
+QStringList CamposItem::values() const {
+    QStringList valores;
+    valores.reserve(size());
+    for (const Campo& campo : campos_)
+        valores << campo.valor;
+    return valores;
+}
+
 CamposItem::const_iterator CamposItem::find(const QString& chave) const {
     const std::uint32_t n = Tabela().procura(chave);
     if (n == kSemNumero) return end();

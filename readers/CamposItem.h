@@ -4,6 +4,7 @@
 // name's number next to its value, in one array sorted by that number. The interface is the
 // part of a hash of texts that the readers use.
 #include <QString>
+#include <QStringList>
 
 #include <cstdint>
 #include <vector>
@@ -44,6 +45,9 @@ public:
     bool empty() const { return campos_.empty(); }
     bool contains(const QString& chave) const { return procura(chave) != nullptr; }
     QString value(const QString& chave, const QString& padrao = QString()) const;
+    QString operator[](const QString& chave) const { return value(chave); }
+    QStringList keys() const;
+    QStringList values() const;
     // The stored value or null; the pointer lives until the next change of the fields.
     const QString* procura(const QString& chave) const;
     void insert(const QString& chave, const QString& valor);

@@ -176,6 +176,12 @@ TEST(ItemRecordTest, FieldsInAnyOrderAreFoundOverwrittenMergedAndRemoved) {
         EXPECT_EQ(it.value(), destino.valorCampo(it.key()));
     }
     EXPECT_EQ(vistos.size(), 500);
+    const QStringList nomes = destino.campos.keys(), valores = destino.campos.values();
+    ASSERT_EQ(nomes.size(), 500);
+    ASSERT_EQ(valores.size(), 500);
+    for (int i = 0; i < nomes.size(); ++i)
+        EXPECT_EQ(destino.campos[nomes[i]], valores[i]) << qPrintable(nomes[i]);
+    EXPECT_EQ(QSet<QString>(nomes.begin(), nomes.end()), vistos);
     const QString* semCopia = destino.campo("SO_DESTINO");
     ASSERT_NE(semCopia, nullptr);
     EXPECT_EQ(*semCopia, "fica");
