@@ -14,6 +14,7 @@
 #include "drawing/DxfWriter.h"
 #include "drawing/PythonChecker.h"
 #include "lists/CETemplate.h"
+#include "lists/CETemplateLisp.h"
 #include "settings/CIMensagens.h"
 #include "strips/CCBorneDwgWriter.h"
 
@@ -283,7 +284,7 @@ TEST_F(DesenhoReguasTest, SymbolsStandUnderTheirFirstTerminalAndLinkBackToTheSch
     k2->definirCampo("ZV_KEY", "1001");
     // A key without a strip view in the catalogue leaves a gap.
     CEItemLista* k3 = itens_.Simbolo("2C", "K3", {"1"});
-    k3->definirCampo("ZV_KEY", "2001");
+    k3->definirCampo("ZV_KEY", "1106");
     auto x1 = itens_.Regua("X1", 5);
     for (int i = 0; i < 3; ++i)
         ItensRegua::Liga(x1[size_t(i)], "INI", k1, QStringList({"13", "14", "A1"})[i]);
@@ -367,6 +368,98 @@ TEST_F(DesenhoReguasTest, TheBlockNameTakesThePrefixAndTheLastPieceOfThePath) {
     const auto todas = Salvo();
     EXPECT_EQ(Pontos(todas, "P_REGUA_BORNE"), QStringList({"20,140"}));
     EXPECT_TRUE(Pontos(todas, "REGUA_BORNE").isEmpty());
+}
+
+}  // namespace
+
+namespace {
+
+// The demo's strip template and product blocks, on items shaped as the strip reader gives
+// them: two strips, one longer than a row, contactors, lights and buttons wired to them,
+// bridged commons. With ZV_STRIP_SAMPLE set the drawing is kept there, for a look.
+TEST_F(DesenhoReguasTest, TheDemoTemplateAndBlocksDrawAStripDrawing) {
+    QProcessEnvironment env = QProcessEnvironment::systemEnvironment();
+    env.insert("ZV_DATA_DIR", pasta_->path());
+    const QString produto = trabalho_.filePath("produto") + "/";
+    const zvtest::HostRun r = zvtest::runZvhost(
+        {"generate", "--out", trabalho_.filePath("p.dxf"), "--terminals", "10", "--data", produto},
+        env);
+    ASSERT_EQ(r.status, 0) << r.err.toStdString();
+    QDir().mkpath(produto + "templates");
+    ASSERT_TRUE(QFile::copy(QString(ZV_SOURCE_DIR) + "/data/templates/reguas.grx",
+                            produto + "templates/reguas.grx"));
+    CICad::SetStringLisp("*DIRETORIO_REDE*", produto);
+    CETemplateLisp modelo(produto + "templates/reguas.grx");
+    ASSERT_TRUE(modelo.Carregar());
+
+    struct Componente {
+        const char* handle;
+        const char* tag;
+        const char* chave;
+        const char* descricao;
+        QStringList ligacoes;
+    };
+    const Componente componentes[] = {
+        {"A01", "-K1", "2001", "Contator 9A 24Vcc", {"A1", "A2", "13", "14"}},
+        {"A02", "-K2", "2002", "Contator 18A 230Vca", {"A1", "A2"}},
+        {"A03", "-H1", "6101", "Sinaleiro verde 24V", {"X1", "X2"}},
+        {"A04", "-S1", "6001", "Botao verde NA", {"13", "14"}},
+        {"A05", "-S2", "6002", "Botao vermelho NF", {"11", "12"}},
+        {"A06", "-B1", "8001", "Sensor indutivo M12", {"BN", "BU", "BK"}},
+        {"A07", "-P9", "7001", "Fonte 24V 5A", {"L", "N"}}};
+    std::vector<CEItemLista*> simbolos;
+    for (const Componente& c : componentes) {
+        CEItemLista* item = itens_.Simbolo(c.handle, c.tag, c.ligacoes);
+        item->definirCampo("ZV_KEY", c.chave);
+        item->definirCampo("DESCRICAO", c.descricao);
+        simbolos.push_back(item);
+    }
+    auto x1 = itens_.Regua("-X1", 12);
+    auto x2 = itens_.Regua("-X2", 64);
+    int fio = 100;
+    auto liga = [&](CEItemLista* borne, int simbolo, const QString& ligacao) {
+        ItensRegua::Liga(borne, "INI", simbolos[size_t(simbolo)], ligacao);
+        borne->definirCampo("REL_INI", simbolos[size_t(simbolo)]->valorCampo("RELACAO"));
+        borne->definirCampo("RELACAO_INI", borne->valorCampo("REL_INI") + ":" + ligacao);
+        borne->definirCampo("FIO_SEGINI", QString::number(++fio));
+        borne->definirCampo("RELACAO_FIM", "-M" + borne->valorCampo("NUMERO") + ":1");
+        borne->definirCampo("FIO_SEGFIM", QString::number(++fio));
+    };
+    liga(x1[0], 0, "A1"), liga(x1[1], 0, "A2"), liga(x1[2], 0, "13"), liga(x1[3], 0, "14");
+    liga(x1[4], 2, "X1"), liga(x1[5], 2, "X2"), liga(x1[6], 3, "13"), liga(x1[7], 3, "14");
+    liga(x1[8], 4, "11"), liga(x1[9], 4, "12");
+    for (int i = 0; i < 64; i += 8) {
+        liga(x2[size_t(i)], 5, "BN"), liga(x2[size_t(i + 1)], 5, "BU");
+        liga(x2[size_t(i + 2)], 5, "BK");
+    }
+    liga(x2[50], 1, "A1"), liga(x2[51], 1, "A2");
+    // Bridged commons: 0 V on X1 2, 6, 10; on X2 the sensors' 0 V, across the row's end.
+    ItensRegua::Jumper({x1[1], x1[5], x1[9]});
+    ItensRegua::Jumper({x1[3], x1[4]});
+    ItensRegua::Jumper({x2[1], x2[9], x2[17], x2[25], x2[33], x2[41], x2[49], x2[57]});
+    ItensRegua::Jumper({x2[44], x2[46], x2[48]});
+    itens_.Simbolo("A08", "-Q1", {"1", "2"})->definirCampo("ZV_KEY", "3001");
+
+    CCBorneDwgWriter escritor;
+    escritor.EscreverItens(itens_.itens, modelo);
+    const auto todas = Salvo();
+    if (!qEnvironmentVariableIsEmpty("ZV_STRIP_SAMPLE"))
+        zvdb::DxfWriter::saveFile(*documento_->database(),
+                                  qEnvironmentVariable("ZV_STRIP_SAMPLE").toStdString());
+    // The warning page, the page of -P9 and -Q1 (wired to no terminal), then two pages of
+    // strips; each page has the frame the product puts on its group's frame layer.
+    EXPECT_EQ(Layers(todas).filter("$0"),
+              QStringList({"REGUAS$0001$A", "REGUAS$0002$A", "REGUAS$0003$A", "REGUAS$0004$A"}));
+    EXPECT_EQ(Pontos(todas, "REGUA_AVISO"), QStringList({"0,0"}));
+    EXPECT_EQ(Pontos(todas, "REGUA_COMP", "REGUAS$0002$A"), QStringList({"100,100", "120,100"}));
+    // -X1 alone on its page (the strip name breaks pages); -X2 in rows of 50 and 14.
+    EXPECT_EQ(Pontos(todas, "REGUA_CAB"), QStringList({"50,225", "50,225", "50,90"}));
+    EXPECT_EQ(Pontos(todas, "REGUA_BORNE").size(), 76);
+    EXPECT_EQ(Pontos(todas, "REGUA_PONTEF").size(), 4);
+    for (const Insercao& i : todas)
+        if (i.nome == "REGUA_CAB") {
+            EXPECT_TRUE(i.atributos["REGUA"].toString().startsWith("-X"));
+        }
 }
 
 }  // namespace
