@@ -109,6 +109,7 @@ protected:
         ASSERT_TRUE(trabalho_.isValid());
         qputenv("TMPDIR", trabalho_.path().toUtf8());
         auto ui = std::make_unique<zvhost::ConsoleUserInterface>(out_, err_, false);
+        ui_ = ui.get();
         app_ = std::make_unique<zvhost::Application>(std::move(ui), out_);
         app_->setExecutableFolder(ZV_BIN_DIR);
         documento_ = app_->openDocument(trabalho_.filePath("projeto.dxf"));
@@ -200,6 +201,7 @@ protected:
     QString saida_, erros_;
     QTextStream out_{&saida_}, err_{&erros_};
     std::unique_ptr<zvhost::Application> app_;
+    zvhost::ConsoleUserInterface* ui_ = nullptr;
     zvhost::HostDocument* documento_ = nullptr;
     ModeloReguas modelo_;
     ItensRegua itens_;
@@ -345,6 +347,21 @@ TEST_F(DesenhoReguasTest, AMissingBlockFileStopsWithItsNumberedMessageBeforeAnyP
     }
     EXPECT_FALSE(CICad::ExisteLayer("REGUAS$0001$A"));
     EXPECT_TRUE(Salvo().empty());
+}
+
+TEST_F(DesenhoReguasTest, ADrawingAgainAsksWhetherTheOldPagesGo) {
+    itens_.Regua("X1", 2);
+    Desenha();
+    // No answer keeps the old pages: the new ones come behind them.
+    auto todas = Desenha();
+    EXPECT_EQ(Layers(todas), QStringList({"REGUAS$0001$A", "REGUAS$0002$A"}));
+    err_.flush();
+    EXPECT_TRUE(erros_.contains("question:89")) << erros_.toStdString();
+    // Yes takes the old group away first.
+    ui_->setAnswer("question:89", "yes");
+    todas = Desenha();
+    EXPECT_EQ(Pontos(todas, "REGUA_CAB").size(), 1);
+    EXPECT_EQ(Layers(todas).size(), 1);
 }
 
 TEST_F(DesenhoReguasTest, AnEmptyBlockValueIsNotDrawnAndTheRestIs) {
