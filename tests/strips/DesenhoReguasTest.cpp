@@ -287,11 +287,15 @@ TEST_F(DesenhoReguasTest, SymbolsStandUnderTheirFirstTerminalAndLinkBackToTheSch
     // A key without a strip view in the catalogue leaves a gap.
     CEItemLista* k3 = itens_.Simbolo("2C", "K3", {"1"});
     k3->definirCampo("ZV_KEY", "1106");
-    auto x1 = itens_.Regua("X1", 5);
+    // A key whose strip view has no file in the shared folder leaves a gap too.
+    CEItemLista* k4 = itens_.Simbolo("2D", "K4", {"1"});
+    k4->definirCampo("ZV_KEY", "2001");
+    auto x1 = itens_.Regua("X1", 6);
     for (int i = 0; i < 3; ++i)
         ItensRegua::Liga(x1[size_t(i)], "INI", k1, QStringList({"13", "14", "A1"})[i]);
     ItensRegua::Liga(x1[3], "INI", k2, "1");
     ItensRegua::Liga(x1[4], "INI", k3, "1");
+    ItensRegua::Liga(x1[5], "INI", k4, "1");
     modelo_.simbolos["*BORNE_PAGINA_GRX*"] = 10;
     const auto todas = Desenha();
     EXPECT_EQ(Pontos(todas, "REGUA_BX2_5_GY"), QStringList({"20,90", "50,90"}));
@@ -303,6 +307,8 @@ TEST_F(DesenhoReguasTest, SymbolsStandUnderTheirFirstTerminalAndLinkBackToTheSch
         }
     EXPECT_EQ(rotulos, QStringList({"K1", "K2"}));
     EXPECT_EQ(reps, QStringList({"2:2A", "2:2B"}));
+    EXPECT_EQ(Pontos(todas, "REGUA_BORNE").size(), 6);
+    EXPECT_TRUE(Pontos(todas, "REGUA_COMP").isEmpty());
 }
 
 TEST_F(DesenhoReguasTest, TheWarningPageAndThePageOfUnwiredSymbolsComeFirst) {
