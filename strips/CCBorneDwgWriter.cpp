@@ -86,7 +86,8 @@ void CCBorneDwgWriter::DesenhaRegua(const CEReguaDwg& regua, const QString& laye
     for (const CEDetalheReguaDwg& detalhe : regua.detalhes) {
         const double k = detalhe.quantidade;
         CEItemLista campos;
-        campos.campos = detalhe.campos;
+        for (auto it = detalhe.campos.cbegin(); it != detalhe.campos.cend(); ++it)
+            campos.definirCampo(it.key(), it.value());
         Preenche(Insere(detalhe_, layer, c + k * passo_ * 0.5 - passo_ * 0.5, regua.y), campos);
         contagem += detalhe.quantidade;
         if (contagem < limite) Insere(traco_, layer, c + k * passo_ - passo_ * 0.5, regua.y);

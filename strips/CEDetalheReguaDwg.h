@@ -3,6 +3,7 @@
 // run's last terminal, which the detail block prints.
 #include <QHash>
 #include <QString>
+#include <QStringList>
 
 #include <cstdint>
 
@@ -12,6 +13,9 @@ class CEDetalheReguaDwg {
 public:
     CEDetalheReguaDwg() = default;
     CEDetalheReguaDwg(std::int32_t quantidade, const CEItemLista* ultimo);
+
+    // The names of an item's fields, through its public operations only.
+    static QStringList NomesCampos(const CEItemLista& item);
 
     std::int32_t quantidade = 0;
     QHash<QString, QString> campos;

@@ -128,19 +128,22 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
 std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& simbolo) const {
     // The symbol's connections by suffix: LIGACAO_1, CONNECTION_2...
     QMap<QString, QString> ligacoes;
-    for (auto it = simbolo.item->campos.cbegin(); it != simbolo.item->campos.cend(); ++it)
-        for (const char* prefixo : {"LIGACAO_", "CONNECTION_", "CONEXION_"})
-            if (it.key().startsWith(QLatin1String(prefixo))) {
-                const QString sufixo = it.key().mid(int(qstrlen(prefixo)));
-                if (!ligacoes.contains(sufixo)) ligacoes.insert(sufixo, it.value());
+    // A suffix given in two languages keeps the first language's value.
+    const QStringList nomes = CEDetalheReguaDwg::NomesCampos(*simbolo.item);
+    for (const char* prefixo : {"LIGACAO_", "CONNECTION_", "CONEXION_"})
+        for (const QString& nome : nomes)
+            if (nome.startsWith(QLatin1String(prefixo))) {
+                const QString sufixo = nome.mid(int(qstrlen(prefixo)));
+                if (!ligacoes.contains(sufixo))
+                    ligacoes.insert(sufixo, simbolo.item->valorCampo(nome));
             }
     // The terminals of each connection value, in the symbol's own order.
     QHash<QString, std::vector<CEBorneDwg*>> porLigacao;
     for (CEItemDwg* ligado : simbolo.ligados) {
         auto* borne = static_cast<CEBorneDwg*>(ligado);
-        for (auto it = borne->item->campos.cbegin(); it != borne->item->campos.cend(); ++it)
-            if (it.key().startsWith(QLatin1String("LIG_"))) {
-                auto& lista = porLigacao[it.value()];
+        for (const QString& nome : CEDetalheReguaDwg::NomesCampos(*borne->item))
+            if (nome.startsWith(QLatin1String("LIG_"))) {
+                auto& lista = porLigacao[borne->item->valorCampo(nome)];
                 if (lista.empty() || lista.back() != borne) lista.push_back(borne);
             }
     }

@@ -243,7 +243,8 @@ TEST_F(DesenhoReguasTest, TerminalsDetailsSeparatorsAndTracksStandWhereTheLayout
         if (i.nome == "REGUA_DET" && i.x == 40) {
             EXPECT_EQ(i.atributos["VARIAVEL_REL"].toString(), "K2");
             // FUNCAO attributes see the run's fields as reg.
-            EXPECT_EQ(i.atributos["FUNCAO_QTD"].toString(), QString::number(x1[2]->campos.size()));
+            EXPECT_EQ(i.atributos["FUNCAO_QTD"].toString(),
+                      QString::number(CEDetalheReguaDwg::NomesCampos(*x1[2]).size()));
         }
     }
 }

@@ -80,7 +80,7 @@ TEST_F(ModeloReguasTest, NumbersThatAreNotNumbersSortAfterTheNumbersAndStillDraw
 TEST_F(ModeloReguasTest, StripNamesComeFromTheFirstLanguageThatHasOne) {
     CEItemLista* ingles = itens_.Borne("", "1");
     ingles->definirCampo("STRIP", "X7");
-    ingles->campos.remove("NUMERO");
+    ingles->definirCampo("NUMERO", "");
     ingles->definirCampo("NUMBER", "4");
     itens_.Borne("X7", "3");
     CEModeloReguas& modelo = Modelo();
@@ -135,6 +135,20 @@ TEST_F(ModeloReguasTest, ASymbolOnTwoStripsPlacesItsTerminalsOnEachStrip) {
     ItensRegua::Liga(x2[1], "INI", k1, "4");
     ItensRegua::Liga(x2[2], "INI", k1, "3");
     EXPECT_EQ(Reguas(Modelo()), QStringList({"X1: 3 1 2", "X2: 1 3 2"}));
+}
+
+TEST_F(ModeloReguasTest, ConnectionsOfOtherLanguagesCountAndTheFirstLanguageWinsASuffix) {
+    CEItemLista* k1 = itens_.Simbolo("A1", "K1");
+    k1->definirCampo("CONNECTION_1", "B");
+    k1->definirCampo("LIGACAO_2", "A");
+    k1->definirCampo("CONEXION_2", "C");
+    auto x1 = itens_.Regua("X1", 3);
+    ItensRegua::Liga(x1[0], "INI", k1, "C");
+    ItensRegua::Liga(x1[1], "INI", k1, "A");
+    ItensRegua::Liga(x1[2], "INI", k1, "B");
+    // Suffix 1 is B, suffix 2 is A (Portuguese before Spanish); C matches nothing and keeps
+    // its turn behind the symbol's terminals.
+    EXPECT_EQ(Reguas(Modelo()), QStringList({"X1: 3 2 1"}));
 }
 
 // ---- jumper tracks
