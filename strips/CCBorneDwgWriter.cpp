@@ -112,7 +112,6 @@ void CCBorneDwgWriter::DesenhaRegua(const CEReguaDwg& regua, const QString& laye
                 Insere(BlocoSimbolo(*simbolo->item), layer, x, regua.y - entreBornes_);
             if (!ref.isNull()) {
                 Preenche(ref, *simbolo->item);
-                CICad::RegistraApp("KVR_ZV_REPRESENTACAO");
                 CICad::SetXData(
                     ref, "KVR_ZV_REPRESENTACAO",
                     {{1000, representacao_}, {1000, simbolo->item->valorCampo("HANDLE")}});
@@ -177,6 +176,8 @@ void CCBorneDwgWriter::Escreve(VetorItens& itens, CETemplate& modelo) {
     std::vector<CEPaginaLista> paginas(size_t(capa) + size_t(!semBorne.empty()) +
                                        modelo_.paginas.size());
     CCListaPaginada::CriaPaginas(grupo, paginas);
+    // Each symbol drawn under a strip links back to its schematic symbol.
+    CICad::RegistraApp("KVR_ZV_REPRESENTACAO");
     size_t p = 0;
     if (capa) Insere(aviso, paginas[p++].nome, 0, 0);
     if (!semBorne.empty()) DesenhaSemBorne(semBorne, paginas[p++].nome);
