@@ -1,5 +1,6 @@
 #include "sample/ProductDataWriter.h"
 
+#include "drawing/Attribute.h"
 #include "drawing/BlockRecord.h"
 #include "drawing/Database.h"
 #include "drawing/DxfWriter.h"
@@ -277,36 +278,76 @@ void ProductDataWriter::writeListBlocks() {
     }
 }
 
+namespace {
+
+// An attribute definition of a strip piece; `vertical` writes it upwards, as the texts of a
+// strip's narrow terminals stand.
+void stripText(BlockFile& file, const char* tag, const char* value, zvdb::Point3 at, double height,
+               bool vertical = false) {
+    zvdb::Attribute* definition = file.model().addAttributeDefinition(tag, tag, value, at, height);
+    if (vertical) definition->setReal(50, 90.0, "AcDbText");
+}
+
+}  // namespace
+
+// The pieces of the strip drawing (reguas.grx), around a terminal step of 6 and jumper tracks
+// 2 apart: each terminal's insertion point is the middle of its top jumper track.
 void ProductDataWriter::writeStripBlocks() {
-    struct Piece {
-        const char* name;
-        std::vector<Cell> cells;
-        double width, height;
-    };
-    const Piece pieces[] = {{"REGUA_CAB", {{"VARIAVEL_REGUA", "REGUA", 1, "Regua"}}, 20, 12},
-                            {"REGUA_BORNE", {{"VARIAVEL_NUMERO", "NUMERO", 1, "No."}}, 6, 40},
-                            {"REGUA_DET",
-                             {{"VARIAVEL_REL_INI", "RELACAO_INI", 1, "Interno"},
-                              {"VARIAVEL_REL_FIM", "RELACAO_FIM", 1, "Externo"}},
-                             6,
-                             60},
-                            {"REGUA_SEP", {}, 2, 40},
-                            {"REGUA_PONTEI", {}, 3, 1},
-                            {"REGUA_PONTE", {}, 6, 1},
-                            {"REGUA_PONTEF", {}, 3, 1},
-                            {"REGUA_PONTEM", {}, 6, 1},
-                            {"REGUA_AVISO", {{"VARIAVEL_AVISO", "AVISO", 1, "Aviso"}}, 40, 8}};
-    for (const Piece& piece : pieces) {
-        BlockFile file;
-        file.box(0, -piece.height, piece.width, 0);
-        double y = -3;
-        for (const Cell& cell : piece.cells) {
-            file.model().addAttributeDefinition(cell.tag, cell.title, cell.value, {cell.x, y}, 2.0);
-            y -= piece.height / 2;
-        }
-        written_.push_back(blockPath(root_, "1", piece.name));
+    auto store = [&](BlockFile& file, const char* name) {
+        written_.push_back(blockPath(root_, "1", name));
         file.save(written_.back());
+    };
+    // The strip's name box at the left of its first terminal; the drawing writes the name
+    // into REGUA (or STRIP, REGLETA).
+    BlockFile header;
+    header.box(-33, -12, -3, 14);
+    header.model().addLine({-33, 8}, {-3, 8});
+    header.model().addText({-31, 9.5}, 2.5, "REGUA");
+    stripText(header, "REGUA", "", {-31, -2}, 6.0);
+    store(header, "REGUA_CAB");
+    // A terminal: number on top, the inner side's element and wire above, the outer side's
+    // below, the jumper tracks in the middle.
+    BlockFile terminal;
+    terminal.box(-3, -12, 3, 14);
+    terminal.model().addLine({-3, 8}, {3, 8});
+    terminal.model().addLine({0, 14}, {0, 16});
+    terminal.model().addLine({0, -12}, {0, -14});
+    stripText(terminal, "VARIAVEL_NUMERO", "NUMERO", {-2.2, 9.8}, 2.2);
+    stripText(terminal, "VARIAVEL_REL_INI", "RELACAO_INI", {1.0, 16.5}, 1.6, true);
+    stripText(terminal, "VARIAVEL_FIO_INI", "FIO_SEGINI", {-1.2, 16.5}, 1.4, true);
+    stripText(terminal, "VARIAVEL_REL_FIM", "RELACAO_FIM", {1.0, -38}, 1.6, true);
+    stripText(terminal, "VARIAVEL_FIO_FIM", "FIO_SEGFIM", {-1.2, -38}, 1.4, true);
+    store(terminal, "REGUA_BORNE");
+    // A detail run's label above the strip (the element on the inner side of the run), and
+    // the separator that closes the run's band.
+    BlockFile detail;
+    detail.model().addLine({-3, 36}, {3, 36});
+    stripText(detail, "VARIAVEL_REL", "REL_INI", {-2.5, 38}, 2.5);
+    store(detail, "REGUA_DET");
+    BlockFile separator;
+    separator.model().addLine({0, 34}, {0, 44});
+    store(separator, "REGUA_SEP");
+    // Jumper marks on a track: a bar to the neighbours, a dot on a bridged terminal.
+    struct Mark {
+        const char* name;
+        double from, to;
+        bool dot;
+    };
+    for (const Mark& mark :
+         {Mark{"REGUA_PONTEI", 0, 3, true}, Mark{"REGUA_PONTE", -3, 3, false},
+          Mark{"REGUA_PONTEF", -3, 0, true}, Mark{"REGUA_PONTEM", -3, 3, true}}) {
+        BlockFile file;
+        file.model().addLine({mark.from, 0}, {mark.to, 0});
+        if (mark.dot) file.model().addCircle({0, 0}, 0.6);
+        store(file, mark.name);
     }
+    // The first page of the drawing.
+    BlockFile warning;
+    warning.box(60, 110, 360, 190);
+    warning.model().addText({80, 165}, 10, "ATENCAO");
+    warning.model().addText({80, 145}, 4, "Desenho de reguas gerado a partir do projeto:");
+    warning.model().addText({80, 135}, 4, "altere o esquema e gere de novo, nao estas paginas.");
+    store(warning, "REGUA_AVISO");
 }
 
 void ProductDataWriter::writeViews() {
@@ -333,6 +374,15 @@ void ProductDataWriter::writeViews() {
             written_.push_back(blockPath(root_, standard, view));
             file.save(written_.back());
         }
+        // The strip drawing's view of a component (representation 2): a narrow box under the
+        // first terminal it is wired to, tag and description written upwards.
+        BlockFile component;
+        component.box(-2.5, -28, 2.5, 0);
+        component.model().addLine({0, 0}, {0, 8});
+        stripText(component, "VARIAVEL_RELACAO", "RELACAO", {2.3, -26}, 2.0, true);
+        stripText(component, "VARIAVEL_DESCRICAO", "DESCRICAO", {-0.2, -26}, 1.1, true);
+        written_.push_back(blockPath(root_, standard, "REGUA_COMP"));
+        component.save(written_.back());
     }
 }
 

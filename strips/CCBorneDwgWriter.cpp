@@ -1,0 +1,189 @@
+#include "CCBorneDwgWriter.h"
+
+#include "cad/CICad.h"
+#include "lists/CCListaPaginada.h"
+#include "lists/CETemplate.h"
+#include "readers/CEListaAtributos.h"
+#include "readers/VetorItens.h"
+#include "readers/ZVString.h"
+#include "settings/CIMensagens.h"
+
+#include <limits>
+
+namespace {
+
+constexpr int kMensagemSemArquivo = 150;
+
+bool ComecaCom(const QString& tag, const char* a, const char* b) {
+    return tag.startsWith(QLatin1String(a), Qt::CaseInsensitive) ||
+           tag.startsWith(QLatin1String(b), Qt::CaseInsensitive);
+}
+
+}  // namespace
+
+CCBorneDwgWriter::CCBorneDwgWriter()
+    : prefixo_(CICad::GetStringLisp("*ZV_PREFIX*")),
+      pastaRede_(CICad::GetStringLisp("*DIRETORIO_REDE*")) {}
+
+CCBorneDwgWriter::Bloco CCBorneDwgWriter::BlocoConfigurado(const QString& valor) const {
+    if (valor.isEmpty()) return {};
+    const QStringList partes = ZVString(valor).Divide("\\");
+    return {prefixo_ + (partes.isEmpty() ? QString() : partes.last()), pastaRede_ + valor + ".dwg"};
+}
+
+CCBorneDwgWriter::Bloco CCBorneDwgWriter::BlocoSimbolo(const CEItemLista& item) {
+    const QString chave = item.valorCampo("ZV_KEY");
+    auto it = blocosSimbolo_.constFind(chave);
+    if (it != blocosSimbolo_.constEnd()) return it.value();
+    const QString nome = catalogo_.BlocoRepresentacao(chave, norma_, representacao_);
+    Bloco bloco;
+    if (!nome.isEmpty()) {
+        QString pasta = CICad::GetStringLisp("*DIR_BLOCOS*");
+        if (pasta.isEmpty())
+            pasta = "DADOS\\" + CICad::GetStringLisp("*NORMA_UTILIZADA*") + "\\BLOCOS\\";
+        bloco = BlocoConfigurado(pasta + nome);
+    }
+    return blocosSimbolo_.insert(chave, bloco).value();
+}
+
+OdDbObjectId CCBorneDwgWriter::Insere(const Bloco& bloco, const QString& layer, double x,
+                                      double y) {
+    if (!bloco.existe()) return {};
+    return CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, x, y, 0, 0);
+}
+
+void CCBorneDwgWriter::Preenche(const OdDbObjectId& referencia, const CEItemLista& item) {
+    if (referencia.isNull()) return;
+    std::unique_ptr<zv::CEListaAtributos> atributos;
+    CICad::GetAtributos(referencia, atributos, false, false);
+    bool publicado = false;
+    for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
+        zv::CEAtributo& atributo = (*atributos)[i];
+        const QString tag = atributo.GetTag();
+        if (ComecaCom(tag, "FUNCAO", "FUNCTION")) {
+            if (!publicado) item.paraLisp();
+            publicado = true;
+            atributo.SetValor(CCListaPaginada::AvaliaFuncao(atributo.GetValor()));
+        } else if (ComecaCom(tag, "VARIAVEL", "VARIABLE")) {
+            atributo.SetValor(item.valorCampo(atributo.GetValor()));
+        } else {
+            atributo.SetValor(item.valorCampo(tag));
+        }
+    }
+    if (publicado) CEItemLista::limparLisp();
+}
+
+void CCBorneDwgWriter::DesenhaRegua(const CEReguaDwg& regua, const QString& layer) {
+    const OdDbObjectId cabecalho = Insere(regua_, layer, regua.x, regua.y);
+    if (!cabecalho.isNull())
+        for (const char* tag : {"REGUA", "STRIP", "REGLETA"})
+            CICad::SetAtributo(cabecalho, tag, regua.nome);
+
+    // Detail runs, with a separator behind each one but the run that fills the strip.
+    const int limite = bornesPorRegua_ > 0 ? bornesPorRegua_ : std::numeric_limits<int>::max();
+    double c = regua.x;
+    int contagem = 0;
+    for (const CEDetalheReguaDwg& detalhe : regua.detalhes) {
+        const double k = detalhe.quantidade;
+        CEItemLista campos;
+        for (auto it = detalhe.campos.cbegin(); it != detalhe.campos.cend(); ++it)
+            campos.definirCampo(it.key(), it.value());
+        Preenche(Insere(detalhe_, layer, c + k * passo_ * 0.5 - passo_ * 0.5, regua.y), campos);
+        contagem += detalhe.quantidade;
+        if (contagem < limite) Insere(traco_, layer, c + k * passo_ - passo_ * 0.5, regua.y);
+        c += k * passo_;
+    }
+
+    double x = regua.x;
+    for (const CEBorneDwg* borne : regua.bornes) {
+        Preenche(Insere(borne_, layer, x, regua.y), *borne->item);
+        for (size_t i = 0; i < borne->trilhas.size(); ++i) {
+            const std::int32_t estado = borne->trilhas[i];
+            if (estado > 0 && estado < 5)
+                Insere(pontes_[estado], layer, x, regua.y - double(i) * distJumper_);
+        }
+        x += passo_;
+    }
+
+    x = regua.x;
+    for (const CESimboloDwg* simbolo : regua.Simbolos()) {
+        if (simbolo) {
+            const OdDbObjectId ref =
+                Insere(BlocoSimbolo(*simbolo->item), layer, x, regua.y - entreBornes_);
+            if (!ref.isNull()) {
+                Preenche(ref, *simbolo->item);
+                CICad::SetXData(
+                    ref, "KVR_ZV_REPRESENTACAO",
+                    {{1000, representacao_}, {1000, simbolo->item->valorCampo("HANDLE")}});
+            }
+        }
+        x += passo_;
+    }
+}
+
+void CCBorneDwgWriter::DesenhaSemBorne(const std::vector<CESimboloDwg*>& simbolos,
+                                       const QString& layer) {
+    double x = 100;
+    for (const CESimboloDwg* simbolo : simbolos) {
+        Preenche(Insere(BlocoSimbolo(*simbolo->item), layer, x, 100), *simbolo->item);
+        x += passoSemBorne_;
+    }
+}
+
+void CCBorneDwgWriter::Escreve(VetorItens& itens, CETemplate& modelo) {
+    modelo_ = CEModeloReguas();
+    const CEModeloReguas::Parametros parametros = CEModeloReguas::Parametros::DoModelo(modelo);
+    modelo_.Constroi(itens);
+    modelo_.CalculaTrilhas();
+    modelo_.CortaReguas(parametros.bornesPorRegua, parametros.chavesQuebra);
+    modelo_.Pagina(parametros.reguasPorPagina);
+    if (modelo_.paginas.empty()) return;
+    modelo_.CalculaPontos(parametros.distanciaReguas, parametros.refX, parametros.refY);
+    modelo_.CalculaDetalhes(parametros.camposDetalhe);
+
+    const QString grupo = modelo.LerTexto("*GP_PAGINA_GRX*");
+    const bool capa = modelo.LerLogico("*INSERIR_CAPA_GRX*");
+    const Bloco aviso = BlocoConfigurado(modelo.LerTexto("*BLOCO_ATENCAO_GRX*"));
+    regua_ = BlocoConfigurado(modelo.LerTexto("*BLOCO_REGUA_GRX*"));
+    borne_ = BlocoConfigurado(modelo.LerTexto("*BLOCO_BORNE_GRX*"));
+    detalhe_ = BlocoConfigurado(modelo.LerTexto("*BLOCO_DETALHE_GRX*"));
+    traco_ = BlocoConfigurado(modelo.LerTexto("*BLOCO_TRACO_GRX*"));
+    pontes_[0] = {};
+    pontes_[1] = BlocoConfigurado(modelo.LerTexto("*BLOCO_PONTEI_GRX*"));
+    pontes_[2] = BlocoConfigurado(modelo.LerTexto("*BLOCO_PONTE_GRX*"));
+    pontes_[3] = BlocoConfigurado(modelo.LerTexto("*BLOCO_PONTEF_GRX*"));
+    pontes_[4] = BlocoConfigurado(modelo.LerTexto("*BLOCO_PONTEM_GRX*"));
+    passo_ = modelo.LerReal("*PONTO_X_INC_GRX*");
+    distJumper_ = modelo.LerReal("*DIST_JUMPER_GRX*");
+    entreBornes_ = modelo.LerReal("*ENTRE_BORNES_GRX*");
+    passoSemBorne_ = modelo.LerReal("*NAO_BORNES_GRX*");
+    bornesPorRegua_ = parametros.bornesPorRegua;
+    norma_ = modelo.LerTexto("*NORMA_UTILIZADA*");
+    representacao_ = modelo.LerTexto("PBLCHAVEREPBORNEDWG");
+
+    // Every block the template names must be there before anything is drawn.
+    for (const Bloco* bloco :
+         std::initializer_list<const Bloco*>{&aviso, &regua_, &borne_, &detalhe_, &traco_,
+                                             &pontes_[1], &pontes_[2], &pontes_[3], &pontes_[4]})
+        if (bloco->existe() && (capa || bloco != &aviso) && !CICad::ExisteArquivo(bloco->arquivo))
+            throw ZVString(CIMensagens::Mensagem("ZVLISTAS", kMensagemSemArquivo) + bloco->arquivo);
+
+    const std::vector<CESimboloDwg*> semBorne = modelo.LerLogico("*SIMB_NAO_LIG_BORNES_GRX*")
+                                                    ? modelo_.SimbolosSemBorne()
+                                                    : std::vector<CESimboloDwg*>();
+    // The warning page, the page of symbols without terminals, then the strips' pages; all
+    // are made before the first block goes in.
+    std::vector<CEPaginaLista> paginas(size_t(capa) + size_t(!semBorne.empty()) +
+                                       modelo_.paginas.size());
+    CCListaPaginada::CriaPaginas(grupo, paginas);
+    // Each symbol drawn under a strip links back to its schematic symbol.
+    CICad::RegistraApp("KVR_ZV_REPRESENTACAO");
+    size_t p = 0;
+    if (capa) Insere(aviso, paginas[p++].nome, 0, 0);
+    if (!semBorne.empty()) DesenhaSemBorne(semBorne, paginas[p++].nome);
+    for (const auto& pagina : modelo_.paginas)
+        pagina->nome = paginas[p++].nome;
+    for (const auto& pagina : modelo_.paginas)
+        for (const CEReguaDwg* regua : pagina->reguas)
+            DesenhaRegua(*regua, pagina->nome);
+}

@@ -1,0 +1,58 @@
+#pragma once
+// The terminal-strip drawing: lays the items out as strips of terminal blocks with the
+// symbols wired to them, jumper tracks and detail bands, makes the pages in the template's
+// group and inserts the blocks. It takes the item vector of the strip reader: components
+// (ZV_LISTA_TIPO "COMP") and terminals ("BORNE").
+#include "CEModeloReguas.h"
+#include "catalogue/CECacheCatalogo.h"
+#include "module/CCDataWriter.h"
+
+#include <QString>
+
+class CEItemLista;
+struct OdDbObjectId;
+
+class CCBorneDwgWriter : public CCDataWriter {
+public:
+    // Reads the block-name prefix (*ZV_PREFIX*) and the shared folder (*DIRETORIO_REDE*).
+    CCBorneDwgWriter();
+
+    void EscreverItens(VetorItens& itens, CETemplate& modelo) override { Escreve(itens, modelo); }
+    // Throws message 150 with the path when a block file the template names is missing;
+    // then nothing has been drawn.
+    void Escreve(VetorItens& itens, CETemplate& modelo);
+
+    // A block as the drawing knows it: name and file.
+    struct Bloco {
+        QString nome;
+        QString arquivo;
+        bool existe() const { return !arquivo.isEmpty(); }
+    };
+    // A template's block value, a path below the shared folder without extension: the
+    // name is the prefix and the path's last piece, the file the folder, path and ".dwg".
+    Bloco BlocoConfigurado(const QString& valor) const;
+
+    // The laid-out model of the last run.
+    const CEModeloReguas& Modelo() const { return modelo_; }
+
+private:
+    struct Config;
+    Bloco BlocoSimbolo(const CEItemLista& item);
+    OdDbObjectId Insere(const Bloco& bloco, const QString& layer, double x, double y);
+    void DesenhaRegua(const CEReguaDwg& regua, const QString& layer);
+    void DesenhaSemBorne(const std::vector<CESimboloDwg*>& simbolos, const QString& layer);
+    static void Preenche(const OdDbObjectId& referencia, const CEItemLista& item);
+
+    QString prefixo_;
+    QString pastaRede_;
+    CEModeloReguas modelo_;
+    CECacheCatalogo catalogo_;
+    QHash<QString, Bloco> blocosSimbolo_;
+
+    // The template's values of the run.
+    QString norma_, representacao_;
+    Bloco regua_, borne_, detalhe_, traco_;
+    Bloco pontes_[5];  // by track state; 0 is never drawn
+    double passo_ = 0.0, distJumper_ = 0.0, entreBornes_ = 0.0, passoSemBorne_ = 0.0;
+    int bornesPorRegua_ = 0;
+};

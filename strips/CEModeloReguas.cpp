@@ -1,0 +1,319 @@
+#include "CEModeloReguas.h"
+
+#include "lists/CETemplate.h"
+#include "readers/CCBorneDataReader.h"
+#include "readers/VetorItens.h"
+
+#include <QMap>
+
+#include <algorithm>
+#include <limits>
+#include <unordered_set>
+
+namespace {
+
+constexpr QChar kSeparador(0x000C);
+
+bool Difere(const CEItemLista* a, const CEItemLista* b, const QStringList& campos) {
+    for (const QString& campo : campos)
+        if (a->valorCampo(campo) != b->valorCampo(campo)) return true;
+    return false;
+}
+
+// Does the terminal have a symbol of this label?
+bool TemRotulo(const CEBorneDwg* borne, const QString& rotulo) {
+    for (const CEItemDwg* ligado : borne->ligados)
+        if (static_cast<const CESimboloDwg*>(ligado)->Rotulo() == rotulo) return true;
+    return false;
+}
+
+// A label that a symbol of `a` and a symbol of `b` share; empty when none.
+QString RotuloComum(const CEBorneDwg* a, const CEBorneDwg* b) {
+    for (const CEItemDwg* ligado : a->ligados) {
+        const QString rotulo = static_cast<const CESimboloDwg*>(ligado)->Rotulo();
+        if (!rotulo.isEmpty() && TemRotulo(b, rotulo)) return rotulo;
+    }
+    return {};
+}
+
+}  // namespace
+
+CEModeloReguas::Parametros CEModeloReguas::Parametros::DoModelo(CETemplate& modelo) {
+    Parametros p;
+    p.bornesPorRegua = modelo.LerInteiro("*BORNE_PAGINA_GRX*");
+    p.chavesQuebra = modelo.LerListaTexto("*ZV_CHAVE_QUEBRA_PAGINA*");
+    p.reguasPorPagina = modelo.LerInteiro("*REGUAS_POR_PAGINA_GRX*");
+    p.distanciaReguas = modelo.LerReal("*DIST_ENTRE_REGUAS_GRX*");
+    modelo.LerPonto("*PONTO_REF_GRX*", p.refX, p.refY);
+    // A text of names cut by ";", or a list of such texts.
+    for (const QString& texto : modelo.LerListaTexto("*ZV_CAMPOS_QUEBRA_DETALHE*"))
+        p.camposDetalhe += ZVString(texto).Divide(";");
+    return p;
+}
+
+QString CEModeloReguas::Chave(const QString& regua, const QString& numero) {
+    return regua + kSeparador + numero;
+}
+
+CEBorneDwg* CEModeloReguas::Borne(const QString& regua, const QString& numero) const {
+    return bornesPorChave.value(Chave(regua, numero));
+}
+
+void CEModeloReguas::Monta(const VetorItens& itens, const Parametros& p) {
+    Constroi(itens);
+    CalculaTrilhas();
+    CortaReguas(p.bornesPorRegua, p.chavesQuebra);
+    Pagina(p.reguasPorPagina);
+    CalculaPontos(p.distanciaReguas, p.refX, p.refY);
+    CalculaDetalhes(p.camposDetalhe);
+}
+
+void CEModeloReguas::Constroi(const VetorItens& itens) {
+    VetorItens componentes, terminais;
+    for (CEItemLista* item : itens) {
+        if (!item) continue;
+        const QString tipo = item->valorCampo("ZV_LISTA_TIPO");
+        if (tipo == "COMP")
+            componentes.push_back(item);
+        else if (tipo == "BORNE")
+            terminais.push_back(item);
+    }
+    componentes.ordenar({"RELACAO", "TAG", "ETIQUETA"});
+    for (CEItemLista* item : componentes) {
+        simbolos.push_back(std::make_unique<CESimboloDwg>(item));
+        // The first symbol of a handle keeps it.
+        const QString handle = item->valorCampo("HANDLE");
+        if (!simbolosPorHandle.contains(handle))
+            simbolosPorHandle.insert(handle, simbolos.back().get());
+    }
+    terminais.ordenar({"REGUA", "STRIP", "REGLETA", "NUMERO", "NUMBER", "NUMERO"});
+    QHash<QString, CEReguaDwg*> reguaPorNome;
+    QHash<const CEItemLista*, CEBorneDwg*> bornePorItem;
+    for (CEItemLista* item : terminais) {
+        const QString nome = CCBorneDataReader::Regua(*item);
+        const QString chave = Chave(nome, CCBorneDataReader::Numero(*item));
+        if (bornesPorChave.contains(chave)) continue;  // the first of a strip and number wins
+        auto borne = std::make_unique<CEBorneDwg>(item);
+        CEReguaDwg*& regua = reguaPorNome[nome];
+        if (!regua) {
+            reguas.push_back(std::make_unique<CEReguaDwg>(nome));
+            regua = reguas.back().get();
+        }
+        regua->bornes.push_back(borne.get());
+        borne->regua = regua;
+        for (const auto& [rel, handle] :
+             {std::pair{"REL_INI", "HANDLE_INI"}, std::pair{"REL_FIM", "HANDLE_FIM"}}) {
+            if (item->valorCampo(rel).isEmpty()) continue;
+            if (CESimboloDwg* simbolo = simbolosPorHandle.value(item->valorCampo(handle))) {
+                borne->ligados.push_back(simbolo);
+                simbolo->Liga(borne.get());
+            }
+        }
+        bornesPorChave.insert(chave, borne.get());
+        bornes.push_back(std::move(borne));
+    }
+    // Jumper links by strip and number, so a duplicate's link lands on the terminal kept.
+    auto busca = [this](const CEItemLista* ligado) -> CEBorneDwg* {
+        if (!ligado) return nullptr;
+        return Borne(CCBorneDataReader::Regua(*ligado), CCBorneDataReader::Numero(*ligado));
+    };
+    for (const auto& borne : bornes) {
+        borne->proximo = busca(borne->item->proximo);
+        borne->anterior = busca(borne->item->anterior);
+    }
+    for (const auto& regua : reguas)
+        OrdenaPorSimbolos(*regua);
+}
+
+std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& simbolo) const {
+    // The symbol's connections by suffix: LIGACAO_1, CONNECTION_2...
+    QMap<QString, QString> ligacoes;
+    // A suffix given in two languages keeps the first language's value.
+    const QStringList nomes = CEDetalheReguaDwg::NomesCampos(*simbolo.item);
+    for (const char* prefixo : {"LIGACAO_", "CONNECTION_", "CONEXION_"})
+        for (const QString& nome : nomes)
+            if (nome.startsWith(QLatin1String(prefixo))) {
+                const QString sufixo = nome.mid(int(qstrlen(prefixo)));
+                if (!ligacoes.contains(sufixo))
+                    ligacoes.insert(sufixo, simbolo.item->valorCampo(nome));
+            }
+    // The terminals of each connection value, in the symbol's own order.
+    QHash<QString, std::vector<CEBorneDwg*>> porLigacao;
+    for (CEItemDwg* ligado : simbolo.ligados) {
+        auto* borne = static_cast<CEBorneDwg*>(ligado);
+        for (const QString& nome : CEDetalheReguaDwg::NomesCampos(*borne->item))
+            if (nome.startsWith(QLatin1String("LIG_"))) {
+                auto& lista = porLigacao[borne->item->valorCampo(nome)];
+                if (lista.empty() || lista.back() != borne) lista.push_back(borne);
+            }
+    }
+    std::vector<CEBorneDwg*> ordem;
+    std::unordered_set<const CEBorneDwg*> tomados;
+    for (const QString& valor : ligacoes) {
+        const auto it = porLigacao.constFind(valor);
+        if (it == porLigacao.constEnd()) continue;
+        for (CEBorneDwg* borne : it.value())
+            if (tomados.insert(borne).second) {
+                ordem.push_back(borne);
+                break;
+            }
+    }
+    return ordem;
+}
+
+void CEModeloReguas::OrdenaPorSimbolos(CEReguaDwg& regua) {
+    std::vector<CEBorneDwg*> ordem;
+    ordem.reserve(regua.bornes.size());
+    std::unordered_set<const CEBorneDwg*> colocados;
+    std::unordered_set<const CESimboloDwg*> tratados;
+    for (CEBorneDwg* borne : regua.bornes) {
+        for (CEItemDwg* ligado : borne->ligados) {
+            auto* simbolo = static_cast<CESimboloDwg*>(ligado);
+            if (!tratados.insert(simbolo).second) continue;
+            for (CEBorneDwg* irmao : BornesDoSimbolo(*simbolo))
+                if (irmao->regua == &regua && colocados.insert(irmao).second)
+                    ordem.push_back(irmao);
+        }
+        // A terminal its symbols did not place keeps its turn: none is lost.
+        if (colocados.insert(borne).second) ordem.push_back(borne);
+    }
+    regua.bornes = std::move(ordem);
+}
+
+void CEModeloReguas::CalculaTrilhas() {
+    std::unordered_set<const CEBorneDwg*> feitos;
+    for (const auto& regua : reguas) {
+        const std::vector<CEBorneDwg*>& lista = regua->bornes;
+        for (size_t k = 0; k < lista.size(); ++k) {
+            CEBorneDwg* inicio = lista[k];
+            if (!inicio->proximo || feitos.count(inicio->proximo)) continue;
+            const int trilha = inicio->TrilhaLivre();
+            inicio->DefineTrilha(trilha, CEBorneDwg::Inicio);
+            feitos.insert(inicio);
+            // A chain that leaves the strip runs on to its end, and no end is drawn.
+            const CEBorneDwg* seguinte = inicio->proximo;
+            for (size_t m = k + 1; m < lista.size(); ++m) {
+                CEBorneDwg* borne = lista[m];
+                if (borne != seguinte) {
+                    borne->DefineTrilha(trilha, CEBorneDwg::Passa);
+                    continue;
+                }
+                feitos.insert(borne);
+                if (!borne->proximo) {
+                    borne->DefineTrilha(trilha, CEBorneDwg::Fim);
+                    break;
+                }
+                borne->DefineTrilha(trilha, CEBorneDwg::Meio);
+                seguinte = borne->proximo;
+            }
+        }
+    }
+}
+
+size_t CEModeloReguas::Corte(const CEReguaDwg& regua, int limite, const QStringList& chaves,
+                             bool& quebra) const {
+    const auto& lista = regua.bornes;
+    const size_t n = lista.size();
+    quebra = false;
+    if (n < 2) return n;
+    // Without a limit the strip is cut only where a break field changes.
+    const size_t ultimoQueCabe = limite > 0 ? size_t(limite) - 1 : n - 1;
+    size_t corte = ultimoQueCabe + 1;  // the piece is [0, corte)
+    for (size_t i = 1; i <= std::min(ultimoQueCabe, n - 1); ++i)
+        if (Difere(lista[i]->item, lista[i - 1]->item, chaves)) {
+            corte = i;
+            quebra = true;
+            break;
+        }
+    if (corte >= n) return n;
+    // A symbol is not parted: its terminals go whole to the next piece, unless it starts
+    // this one; then the piece runs to the symbol's end.
+    const QString rotulo = RotuloComum(lista[corte - 1], lista[corte]);
+    if (rotulo.isEmpty()) return corte;
+    for (size_t j = corte - 1; j-- > 0;)
+        if (!TemRotulo(lista[j], rotulo)) return j + 1;
+    for (size_t f = corte + 1; f < n; ++f)
+        if (!TemRotulo(lista[f], rotulo)) return f;
+    return n;
+}
+
+void CEModeloReguas::CortaReguas(int limite, const QStringList& chaves) {
+    std::vector<std::unique_ptr<CEReguaDwg>> novas;
+    novas.reserve(reguas.size());
+    auto anexa = [&](std::unique_ptr<CEReguaDwg> regua) {
+        if (!novas.empty() && !novas.back()->quebra && !novas.back()->bornes.empty() &&
+            !regua->bornes.empty() &&
+            Difere(novas.back()->bornes.back()->item, regua->bornes.front()->item, chaves))
+            novas.back()->quebra = true;
+        novas.push_back(std::move(regua));
+    };
+    for (auto& original : reguas) {
+        std::unique_ptr<CEReguaDwg> regua = std::move(original);
+        for (;;) {
+            bool quebra = false;
+            const size_t corte = Corte(*regua, limite, chaves, quebra);
+            if (corte >= regua->bornes.size()) {
+                anexa(std::move(regua));
+                break;
+            }
+            auto resto = std::make_unique<CEReguaDwg>(regua->nome);
+            resto->bornes.assign(regua->bornes.begin() + std::ptrdiff_t(corte),
+                                 regua->bornes.end());
+            regua->bornes.resize(corte);
+            regua->quebra = quebra;
+            for (CEBorneDwg* borne : resto->bornes)
+                borne->regua = resto.get();
+            anexa(std::move(regua));
+            regua = std::move(resto);
+        }
+    }
+    reguas = std::move(novas);
+}
+
+void CEModeloReguas::Pagina(int reguasPorPagina) {
+    const int porPagina = std::max(reguasPorPagina, 1);
+    paginas.clear();
+    CEPaginaDwg* pagina = nullptr;
+    for (const auto& regua : reguas) {
+        if (!pagina) {
+            paginas.push_back(std::make_unique<CEPaginaDwg>());
+            pagina = paginas.back().get();
+        }
+        pagina->reguas.push_back(regua.get());
+        regua->pagina = pagina;
+        if (pagina->Quantidade() >= porPagina || regua->quebra) pagina = nullptr;
+    }
+}
+
+void CEModeloReguas::CalculaPontos(double distancia, double refX, double refY) {
+    for (const auto& pagina : paginas) {
+        const int n = pagina->Quantidade();
+        for (int i = 0; i < n; ++i) {
+            CEReguaDwg* regua = pagina->reguas[size_t(i)];
+            // A lone strip stands one distance up, where the upper of two would.
+            const int fator = n == 1 ? 1 : n - 1 - i;
+            regua->x = refX;
+            regua->y = fator * distancia + refY;
+        }
+    }
+}
+
+void CEModeloReguas::CalculaDetalhes(const QStringList& campos) {
+    for (const auto& regua : reguas) {
+        regua->detalhes.clear();
+        const auto& lista = regua->bornes;
+        std::int32_t desde = 0;
+        for (size_t i = 1; i <= lista.size(); ++i) {
+            if (i < lista.size() && !Difere(lista[i]->item, lista[i - 1]->item, campos)) continue;
+            regua->detalhes.emplace_back(std::int32_t(i) - desde, lista[i - 1]->item);
+            desde = std::int32_t(i);
+        }
+    }
+}
+
+std::vector<CESimboloDwg*> CEModeloReguas::SimbolosSemBorne() const {
+    std::vector<CESimboloDwg*> sem;
+    for (const auto& simbolo : simbolos)
+        if (simbolo->ligados.empty()) sem.push_back(simbolo.get());
+    return sem;
+}

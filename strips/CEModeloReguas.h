@@ -1,0 +1,66 @@
+#pragma once
+// The terminal-strip drawing before it is drawn: the strips with their terminals in drawing
+// order, the symbols wired to them, the jumper tracks, the cuts of long strips, the pages
+// and where each strip stands. Everything here is computed on the items alone; the writer
+// then only inserts blocks.
+#include "CEBorneDwg.h"
+#include "CEPaginaDwg.h"
+#include "CEReguaDwg.h"
+#include "CESimboloDwg.h"
+
+#include <QHash>
+#include <QStringList>
+
+#include <memory>
+#include <vector>
+
+class CETemplate;
+class VetorItens;
+
+class CEModeloReguas {
+public:
+    // The layout settings of a strip drawing's template.
+    struct Parametros {
+        int bornesPorRegua = 0;  // terminals per strip row; below 1: no limit
+        QStringList chavesQuebra;
+        int reguasPorPagina = 1;
+        double distanciaReguas = 0.0;
+        double refX = 0.0, refY = 0.0;
+        QStringList camposDetalhe;
+
+        static Parametros DoModelo(CETemplate& modelo);
+    };
+
+    // Builds, lays tracks, cuts strips and makes pages; then points and details.
+    void Monta(const VetorItens& itens, const Parametros& parametros);
+
+    // The steps, in the order Monta runs them.
+    void Constroi(const VetorItens& itens);
+    void CalculaTrilhas();
+    void CortaReguas(int limite, const QStringList& chavesQuebra);
+    void Pagina(int reguasPorPagina);
+    void CalculaPontos(double distancia, double refX, double refY);
+    void CalculaDetalhes(const QStringList& campos);
+
+    // Symbols that no terminal of the drawing is wired to, in symbol order.
+    std::vector<CESimboloDwg*> SimbolosSemBorne() const;
+    // The key of a terminal: strip name, U+000C, number.
+    static QString Chave(const QString& regua, const QString& numero);
+    CEBorneDwg* Borne(const QString& regua, const QString& numero) const;
+
+    std::vector<std::unique_ptr<CEBorneDwg>> bornes;
+    QHash<QString, CEBorneDwg*> bornesPorChave;
+    std::vector<std::unique_ptr<CESimboloDwg>> simbolos;
+    QHash<QString, CESimboloDwg*> simbolosPorHandle;
+    std::vector<std::unique_ptr<CEPaginaDwg>> paginas;
+    std::vector<std::unique_ptr<CEReguaDwg>> reguas;
+
+private:
+    void OrdenaPorSimbolos(CEReguaDwg& regua);
+    // The symbol's terminals in the order of its connections; those that match none drop.
+    std::vector<CEBorneDwg*> BornesDoSimbolo(const CESimboloDwg& simbolo) const;
+    // Where the next piece of a strip begins (the terminal count when no cut is due), and
+    // whether the strip ends its page there.
+    size_t Corte(const CEReguaDwg& regua, int limite, const QStringList& chaves,
+                 bool& quebra) const;
+};

@@ -1,0 +1,5 @@
+#include "CEPaginaDwg.h"
+
+int CEPaginaDwg::Quantidade() const {
+    return int(reguas.size());
+}
