@@ -125,10 +125,12 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
         const QStringList* b = ListaConexoesCompletas(numero);
         const QStringList elementos = a ? *a : QStringList();
         const QStringList completas = b ? *b : QStringList();
+        Trechos trechos;
         if (!elementos.isEmpty()) {
             const CEItemLista padrao = *item;
             PreencheExtremidade("INI", *item, elementos, completas, 0, modelo);
             CEItemLista* atual = item;
+            trechos[atual] = {0, -1};
             const int n = int(elementos.size());
             for (int i = 1; i < n; ++i) {
                 const OdDbObjectId elemento = CICad::IdDoHandle(elementos[i]);
@@ -136,18 +138,21 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
                 if (elemento.isNull()) break;
                 // A run of one equipment is one passage: the wire goes in and out of it.
                 const bool equipamento = EhEquipamento(elemento);
-                if (elementos[i] != elementos[i - 1] || !equipamento)
+                if (elementos[i] != elementos[i - 1] || !equipamento) {
                     PreencheExtremidade("FIM", *atual, elementos, completas, i, modelo);
+                    trechos[atual].fim = i;
+                }
                 if (i != n - 1 && (elementos[i] != elementos[i + 1] || !equipamento)) {
                     auto* novo = new CEItemLista(padrao);
                     PreencheExtremidade("INI", *novo, elementos, completas, i, modelo);
                     atual->ligado = novo;
                     itens->push_back(novo);
                     atual = novo;
+                    trechos[atual] = {i, -1};
                 }
             }
         }
-        CalculaComprimentos(item, elementos);
+        CalculaComprimentos(item, elementos, &trechos);
         // The first stretch stands behind the later ones; the writer sorts.
         itens->push_back(item);
     }
@@ -194,9 +199,11 @@ VetorItens* CCFioDataReader::LeAnilhas(const QHash<QString, QString>& opcoes, CE
         const int n = int(elementos.size());
         // A ferrule on each conductor end: a stretch between every two elements.
         CEItemLista* atual = item;
+        Trechos trechos;
         for (int i = 0; n >= 2 && i + 1 < n; ++i) {
             PreencheExtremidade("INI", *atual, elementos, completas, i, modelo);
             PreencheExtremidade("FIM", *atual, elementos, completas, i + 1, modelo);
+            trechos[atual] = {i, i + 1};
             if (i + 2 == n) break;
             CEItemLista* novo = ItemFio(fio, modelo);
             if (!novo) break;
@@ -213,13 +220,14 @@ VetorItens* CCFioDataReader::LeAnilhas(const QHash<QString, QString>& opcoes, CE
             CEItemLista* antes = (*itens)[destino - 1];
             if (esta->valorCampo("HANDLE_INI") == antes->valorCampo("HANDLE_INI")) {
                 antes->ligado = esta->ligado;
+                trechos.erase(esta);
                 delete esta;
             } else {
                 (*itens)[destino++] = esta;
             }
         }
         itens->resize(destino);
-        CalculaComprimentos(item, elementos, false);
+        CalculaComprimentos(item, elementos, &trechos);
     }
     for (CEItemLista* item : *itens)
         PartilhaNomes(*item);

@@ -6,6 +6,8 @@
 
 #include <QSet>
 
+#include <unordered_map>
+
 class CCFioDataReader : public CCDataReader {
 public:
     // A wire's ends are filled by the reader's own walk.
@@ -48,11 +50,18 @@ public:
     // The length along the wire's routes between the vertices nearest two points, with the
     // allowances, as "%f" text; "-" for an empty key, "0.000000" without a route.
     QString ComprimentoFio(const QString& chave, const CEPonto& inicio, const CEPonto& fim);
-    // LENGTH and COMPRIMENTO of every stretch of the chain that starts at `primeiro`;
-    // `passagens` treats an equipment standing twice in a row as one passage, as the wire
-    // list's stretches do.
+    // Where a stretch starts and ends in the wire's connection list; an open stretch ends
+    // at -1.
+    struct Trecho {
+        int inicio = 0, fim = -1;
+    };
+    using Trechos = std::unordered_map<const CEItemLista*, Trecho>;
+    // LENGTH and COMPRIMENTO of every stretch of the chain that starts at `primeiro`. Each
+    // stretch is measured between the elements it joins: those `trechos` gives, else the
+    // k-th and the next of the list for the k-th stretch; an open stretch to the element
+    // after its start.
     void CalculaComprimentos(CEItemLista* primeiro, const QStringList& elementos,
-                             bool passagens = true);
+                             const Trechos* trechos = nullptr);
     // CAMINHOFIO and PATHWIRE of each item from the routes read for its wire.
     void AplicaCaminhos(VetorItens& itens);
     // Transitions between ducts: pairs of a transition block and its partner.

@@ -194,7 +194,7 @@ QString CCFioDataReader::ComprimentoFio(const QString& chave, const CEPonto& ini
 }
 
 void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const QStringList& elementos,
-                                          bool passagens) {
+                                          const Trechos* trechos) {
     if (!primeiro || elementos.isEmpty()) return;
     std::vector<CEItemLista*> cadeia;
     std::unordered_set<CEItemLista*> vistos;
@@ -213,18 +213,25 @@ void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const QStringLi
         const QString handle = layoutPorRelacao_.value(relacao);
         if (!handle.isEmpty()) PosicaoLayout(handle, conexao, ponto);
     };
-    size_t k = 0;
-    for (int i = 0; i + 1 < elementos.size() && k < cadeia.size(); ++i) {
-        const OdDbObjectId a1 = CICad::IdDoHandle(elementos[i]);
-        // The stretches of the list pass an equipment that stands twice in a row at once.
-        if (passagens && elementos[i] == elementos[i + 1] && EhEquipamento(a1)) continue;
-        CEItemLista& item = *cadeia[k++];
-        const OdDbObjectId a2 = CICad::IdDoHandle(elementos[i + 1]);
-        const QString r1 = ValorLigacao(AtributoConexaoProximo(a1, pontoDe(i)));
-        const QString r2 = ValorLigacao(AtributoConexaoProximo(a2, pontoDe(i + 1)));
+    const int n = int(elementos.size());
+    for (size_t k = 0; k < cadeia.size(); ++k) {
+        CEItemLista& item = *cadeia[k];
+        Trecho trecho{int(k), int(k) + 1};
+        if (trechos) {
+            auto achado = trechos->find(&item);
+            if (achado != trechos->end()) trecho = achado->second;
+            if (trecho.fim < 0) trecho.fim = trecho.inicio + 1;
+        }
+        if (trecho.inicio < 0 || trecho.inicio >= n || trecho.fim >= n) continue;
+        const QString& a1 = elementos[trecho.inicio];
+        const QString& a2 = elementos[trecho.fim];
+        const QString r1 =
+            ValorLigacao(AtributoConexaoProximo(CICad::IdDoHandle(a1), pontoDe(trecho.inicio)));
+        const QString r2 =
+            ValorLigacao(AtributoConexaoProximo(CICad::IdDoHandle(a2), pontoDe(trecho.fim)));
         CEPonto inicio, fim;
-        posicao(elementos[i], r1, item.valorCampo("REL_INI"), inicio);
-        posicao(elementos[i + 1], r2, item.valorCampo("REL_FIM"), fim);
+        posicao(a1, r1, item.valorCampo("REL_INI"), inicio);
+        posicao(a2, r2, item.valorCampo("REL_FIM"), fim);
         if (!item.temCampo(campo)) continue;
         const QString comprimento = ComprimentoFio(chave, inicio, fim);
         item.definirCampo("LENGTH", comprimento);

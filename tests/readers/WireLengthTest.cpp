@@ -147,6 +147,32 @@ TEST_F(WireLengthTest, AnElementWithoutAViewIsPlacedByTheViewOfItsRelation) {
     EXPECT_EQ(comprimentos().value("18"), "660.000000");
 }
 
+TEST_F(WireLengthTest, EachStretchIsMeasuredBetweenTheElementsItJoins) {
+    // A PLC entered at I1 and left at I2, with a view that has both points.
+    zvdb::BlockReference* clp =
+        componente("-A1", {{"I1", {20, 140, 0}}, {"I2", {20, 130, 0}}}, "CLP");
+    clp->setXData("KVR_ZV_EQUIPO", zvsample::XDataItems().text("EQUIPO").tags());
+    vista(*clp, {300, 170, 0},
+          {{"CPOINT1", "I1", {300, 190, 0}}, {"CPOINT2", "I2", {300, 150, 0}}});
+    fio({{20, 150, 0}, {20, 140, 0}, {20, 130, 0}, {20, 100, 0}}, "12");
+    rota({{100, 190, 0}, {300, 190, 0}, {300, 150, 0}, {300, -10, 0}, {900, -10, 0}}, "12");
+    // The same PLC first on a wire: the stretch that starts at its entry stays open.
+    fio({{20, 140, 0}, {20, 130, 0}, {20, 120, 0}, {60, 120, 0}, {60, 100, 0}}, "19");
+    vista(*x2_, {900, -10, 0}, {});
+    rota({{300, 190, 0}, {300, 150, 0}, {300, -10, 0}, {900, -10, 0}}, "19");
+    CICad::SetRealLisp("PBLCOMPFIOPORCENTO", 0.0);
+    CICad::SetRealLisp("PBLCOMPFIOABSOLUTO", 0.0);
+    CCFioDataReader leitor;
+    le(leitor);
+    QStringList trechos;
+    for (const CEItemLista* item : itens_)
+        trechos << item->valorCampo("FIO") + " " + item->valorCampo("RELACAO_INI") + ">" +
+                       item->valorCampo("RELACAO_FIM") + " " + item->valorCampo("COMPRIMENTO");
+    trechos.sort();
+    EXPECT_EQ(trechos, QStringList({"12 -A1:I2>X1:1/ 760.000000", "12 -K1:A2>-A1:I1 200.000000",
+                                    "19 -A1:I1> 40.000000", "19 -A1:I2>X1:2/ 760.000000"}));
+}
+
 TEST_F(WireLengthTest, StretchesBetweenTheSamePointsShareOneAnswer) {
     CCFioDataReader leitor;
     rota({{0, 0, 0}, {0, 100, 0}}, "9");
