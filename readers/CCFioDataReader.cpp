@@ -70,8 +70,28 @@ CEItemLista* CCFioDataReader::ItemFio(const OdDbObjectId& polilinha, CETemplate*
     if (ChaveDaEntidade(polilinha).isEmpty()) return nullptr;
     auto* item = new CEItemLista;
     item->ids.push_back(polilinha);
-    LeFio(QString(), *item, polilinha, modelo);
+    CopiaEntidade(QString(), *item, polilinha, modelo);
     return item;
+}
+
+void CCFioDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item,
+                                    const OdDbObjectId& id, CETemplate* modelo) {
+    auto achado = camposPorEntidade_.find(id);
+    if (achado == camposPorEntidade_.end()) {
+        CEItemLista lido;
+        LeEntidade(QString(), lido, id, modelo);
+        Campos campos;
+        campos.reserve(size_t(lido.campos.size()));
+        for (auto it = lido.campos.constBegin(); it != lido.campos.constEnd(); ++it)
+            campos.emplace_back(it.key(), it.value());
+        achado = camposPorEntidade_.emplace(id, std::move(campos)).first;
+    }
+    QHash<QString, QString>& nomes = nomesComSufixo_[sufixo];
+    for (const auto& [nome, valor] : achado->second) {
+        auto n = nomes.constFind(nome);
+        if (n == nomes.constEnd()) n = nomes.insert(nome, nome + sufixo);
+        item.definirCampo(n.value(), valor);
+    }
 }
 
 void CCFioDataReader::PreencheExtremidade(const QString& lado, CEItemLista& item,
@@ -79,7 +99,7 @@ void CCFioDataReader::PreencheExtremidade(const QString& lado, CEItemLista& item
                                           const QStringList& completas, int indice,
                                           CETemplate* modelo) {
     const QString sufixo = "_" + lado;
-    LeEntidade(sufixo, item, CICad::IdDoHandle(elementos.value(indice)), modelo);
+    CopiaEntidade(sufixo, item, CICad::IdDoHandle(elementos.value(indice)), modelo);
     LeSegmento(lado, item, completas.value(indice), modelo);
     CompoeExtremidade(sufixo, item, modelo, indice);
 }
@@ -242,7 +262,7 @@ void CCFioDataReader::LeSegmento(const QString& lado, CEItemLista& item, const Q
     const CEPonto ponto = PontoDaConexaoCompleta(item.valorCampo(campo), completo);
     // The element's page: its LAYER under the end's suffix.
     const OdDbObjectId fio = FioNoPonto(item.valorCampo("LAYER_" + lado), ponto);
-    if (!fio.isNull()) LeFio("_SEG" + lado, item, fio, modelo);
+    if (!fio.isNull()) CopiaEntidade("_SEG" + lado, item, fio, modelo);
 }
 
 void CCFioDataReader::CompoeExtremidade(const QString& sufixo, CEItemLista& item,

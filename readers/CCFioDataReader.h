@@ -78,7 +78,14 @@ private:
     void PreencheExtremidade(const QString& lado, CEItemLista& item, const QStringList& elementos,
                              const QStringList& completas, int indice, CETemplate* modelo);
     void CarregaTransicoes();
+    // The fields of an element or wire polyline under the suffix. An entity stands at the
+    // ends of many stretches: its fields are read once and copied, sharing their texts.
+    void CopiaEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
+                       CETemplate* modelo);
 
+    using Campos = std::vector<std::pair<QString, QString>>;
+    std::unordered_map<OdDbObjectId, Campos> camposPorEntidade_;
+    QHash<QString, QHash<QString, QString>> nomesComSufixo_;  // by suffix, then bare name
     QHash<QString, QString> rotasLayoutFio_;  // wire key (and key + "$") to route handle
     QHash<QString, QString> paineisLayout_;   // panel key to view handle
     QHash<QString, QString> layoutPorRelacao_;
