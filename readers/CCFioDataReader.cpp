@@ -94,6 +94,19 @@ void CCFioDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item,
     }
 }
 
+std::optional<QString> CCFioDataReader::LigacaoProxima(const QString& elemento,
+                                                       const CEPonto& ponto) {
+    const PontoElemento chave{elemento, ponto.x, ponto.y, ponto.z};
+    auto achado = ligacoes_.find(chave);
+    if (achado != ligacoes_.end()) return achado->second;
+    const std::unique_ptr<zv::CEAtributo> atributo =
+        AtributoConexaoProximo(CICad::IdDoHandle(elemento), ponto);
+    std::optional<QString> valor;
+    if (atributo) valor = atributo->GetValor();
+    ligacoes_.emplace(chave, valor);
+    return valor;
+}
+
 void CCFioDataReader::PreencheExtremidade(const QString& lado, CEItemLista& item,
                                           const QStringList& elementos,
                                           const QStringList& completas, int indice,
@@ -259,7 +272,22 @@ void CCFioDataReader::LeSegmento(const QString& lado, CEItemLista& item, const Q
                                  CETemplate* modelo) {
     const QString campo = CampoFio(item);
     if (campo.isEmpty()) return;
-    const CEPonto ponto = PontoDaConexaoCompleta(item.valorCampo(campo), completo);
+    // The point of the first entry with this full text, as PontoDaConexaoCompleta answers,
+    // from an index of the wire's entries made once.
+    const QString numero = item.valorCampo(campo);
+    auto lugares = lugaresCompletos_.find(numero);
+    if (lugares == lugaresCompletos_.end()) {
+        QHash<QString, int> primeiros;
+        if (const QStringList* completas = ListaConexoesCompletas(numero))
+            for (int i = int(completas->size()) - 1; i >= 0; --i)
+                primeiros.insert((*completas)[i], i);
+        lugares = lugaresCompletos_.insert(numero, primeiros);
+    }
+    const std::vector<CEPonto>* pontos = PontosConexao(numero);
+    const int lugar = lugares->value(completo, -1);
+    const CEPonto ponto = pontos && lugar >= 0 && size_t(lugar) < pontos->size()
+                              ? (*pontos)[size_t(lugar)]
+                              : CEPonto{};
     // The element's page: its LAYER under the end's suffix.
     const OdDbObjectId fio = FioNoPonto(item.valorCampo("LAYER_" + lado), ponto);
     if (!fio.isNull()) CopiaEntidade("_SEG" + lado, item, fio, modelo);
@@ -274,9 +302,13 @@ void CCFioDataReader::CompoeExtremidade(const QString& sufixo, CEItemLista& item
     const QStringList* elementos = ListaConexoes(numero);
     std::unique_ptr<zv::CEAtributo> ligacao;
     if (pontos && elementos && indice >= 0 && indice < elementos->size() &&
-        size_t(indice) < pontos->size())
-        ligacao = AtributoConexaoProximo(CICad::IdDoHandle((*elementos)[indice]),
-                                         (*pontos)[size_t(indice)]);
+        size_t(indice) < pontos->size()) {
+        const std::optional<QString> valor =
+            LigacaoProxima((*elementos)[indice], (*pontos)[size_t(indice)]);
+        if (valor)
+            ligacao = std::make_unique<zv::CEAtributo>(QString(), QString(), *valor, OdDbObjectId(),
+                                                       false);
+    }
     ComporRelacaoFio(sufixo, item, modelo, ligacao.get());
 }
 

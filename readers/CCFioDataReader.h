@@ -78,11 +78,29 @@ private:
     void PreencheExtremidade(const QString& lado, CEItemLista& item, const QStringList& elementos,
                              const QStringList& completas, int indice, CETemplate* modelo);
     void CarregaTransicoes();
+    // The value of the element's connection attribute nearest the point; null when it has
+    // none. Each end is asked twice (its texts and its length): answered once.
+    std::optional<QString> LigacaoProxima(const QString& elemento, const CEPonto& ponto);
     // The fields of an element or wire polyline under the suffix. An entity stands at the
     // ends of many stretches: its fields are read once and copied, sharing their texts.
     void CopiaEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
                        CETemplate* modelo);
 
+    struct PontoElemento {
+        QString elemento;
+        double x, y, z;
+        bool operator==(const PontoElemento&) const = default;
+    };
+    struct HashPontoElemento {
+        size_t operator()(const PontoElemento& p) const {
+            const std::hash<double> h;
+            return qHash(p.elemento) ^ (h(p.x) * 31) ^ (h(p.y) * 131) ^ (h(p.z) * 1031);
+        }
+    };
+    std::unordered_map<PontoElemento, std::optional<QString>, HashPontoElemento> ligacoes_;
+    // Per wire number, the first place of each full connection text: a bus wire holds
+    // thousands of entries, and each of its ends looks its own up.
+    QHash<QString, QHash<QString, int>> lugaresCompletos_;
     using Campos = std::vector<std::pair<QString, QString>>;
     std::unordered_map<OdDbObjectId, Campos> camposPorEntidade_;
     QHash<QString, QHash<QString, QString>> nomesComSufixo_;  // by suffix, then bare name

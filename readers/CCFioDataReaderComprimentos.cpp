@@ -36,10 +36,6 @@ bool EhContato(const QString& bloco) {
     return ComecaComAlgum(bloco, {"NA-", "NF-", "NAF-", "BT-"});
 }
 
-QString ValorLigacao(const std::unique_ptr<zv::CEAtributo>& atributo) {
-    return atributo ? atributo->GetValor() : QString();
-}
-
 QString TextoPonto(const CEPonto& p) {
     return QString::asprintf("%.17g,%.17g,%.17g", p.x, p.y, p.z);
 }
@@ -225,10 +221,8 @@ void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const QStringLi
         if (trecho.inicio < 0 || trecho.inicio >= n || trecho.fim >= n) continue;
         const QString& a1 = elementos[trecho.inicio];
         const QString& a2 = elementos[trecho.fim];
-        const QString r1 =
-            ValorLigacao(AtributoConexaoProximo(CICad::IdDoHandle(a1), pontoDe(trecho.inicio)));
-        const QString r2 =
-            ValorLigacao(AtributoConexaoProximo(CICad::IdDoHandle(a2), pontoDe(trecho.fim)));
+        const QString r1 = LigacaoProxima(a1, pontoDe(trecho.inicio)).value_or(QString());
+        const QString r2 = LigacaoProxima(a2, pontoDe(trecho.fim)).value_or(QString());
         CEPonto inicio, fim;
         posicao(a1, r1, item.valorCampo("REL_INI"), inicio);
         posicao(a2, r2, item.valorCampo("REL_FIM"), fim);
