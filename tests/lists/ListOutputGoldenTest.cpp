@@ -62,10 +62,10 @@ TEST_P(ListOutputGoldenTest, TheTerminalListPrintsTheSameBytesAsBefore) {
 INSTANTIATE_TEST_SUITE_P(
     GeneratedProjects, ListOutputGoldenTest,
     ::testing::Values(
-        Caso{"3", "60", false, "aca76a715e96582064ec1f843c832f2d5ef29059219132fa8f5e4ab16a209297"},
-        Caso{"5", "400", true, "98819c6702b9dad19e8e7cc9f778691d26a58ab9077d543f808c332bfa49d4fc"},
+        Caso{"3", "60", false, "dabddd54bd0c85c8362ea1a1ce445d6583ba2cc8713c90218a20c45701c25c4d"},
+        Caso{"5", "400", true, "b68a42a9a602d69bc4c8a7abed17381e64578d9adb8443a49f40204144bd7a33"},
         Caso{"11", "2500", true,
-             "cbc6b6373170d0dc77420d358c8646c3a097ca73ce952a52701398abbea1104c"}),
+             "a20ef009b32e56c7adfeb7593f4646da5bc275084236b018b58fc11b83708129"}),
     [](const ::testing::TestParamInfo<Caso>& info) {
         return std::string("seed") + info.param.seed + "_terminals" + info.param.terminais;
     });
