@@ -62,10 +62,10 @@ TEST_P(ListOutputGoldenTest, TheTerminalListPrintsTheSameBytesAsBefore) {
 INSTANTIATE_TEST_SUITE_P(
     GeneratedProjects, ListOutputGoldenTest,
     ::testing::Values(
-        Caso{"3", "60", false, "aca76a715e96582064ec1f843c832f2d5ef29059219132fa8f5e4ab16a209297"},
-        Caso{"5", "400", true, "98819c6702b9dad19e8e7cc9f778691d26a58ab9077d543f808c332bfa49d4fc"},
+        Caso{"3", "60", false, "9e41d30598c501d9fb825d2b787443c47b9f82a5a01d5b400247a85ef09c688b"},
+        Caso{"5", "400", true, "90330a2972bd27fd28ada4d3b6a53e981072373ab879034a5ab2c1d027bb8735"},
         Caso{"11", "2500", true,
-             "cbc6b6373170d0dc77420d358c8646c3a097ca73ce952a52701398abbea1104c"}),
+             "e8008924e15cb6c55a4821ea7814b93ad20a07c2799b8251adf252b980bfa2fe"}),
     [](const ::testing::TestParamInfo<Caso>& info) {
         return std::string("seed") + info.param.seed + "_terminals" + info.param.terminais;
     });
