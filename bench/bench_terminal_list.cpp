@@ -105,7 +105,8 @@ int main(int argc, char** argv) {
     QStringList sizes = app.arguments().mid(1);
     if (sizes.isEmpty()) sizes = QStringList{"20000", "80000"};
     // Every list command the module has today; the others join as they land.
-    const QStringList comandos{"gerarListaBornesGrf"};
+    // The wire list measures along the generated projects' layout routes.
+    const QStringList comandos{"gerarListaBornesGrf", "gerarListaFiosGrf"};
     QTemporaryDir folder;
     const QString data = folder.filePath("data"), product = folder.filePath("product") + "/";
     QDir().mkpath(data);

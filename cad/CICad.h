@@ -173,6 +173,10 @@ public:
     // gathered in one walk.
     static QHash<QString, std::vector<OdDbObjectId>> GetReferenciasPorBloco(
         zvdb::Database* database = nullptr);
+    // The entities of model space that carry the application's extended data, in drawing
+    // order, gathered in one walk.
+    static std::vector<OdDbObjectId> GetEntidadesComXData(const QString& aplicacao,
+                                                          zvdb::Database* database = nullptr);
     // The entries of a dictionary below the named-objects dictionary; nothing when the
     // path does not exist (it is not made).
     static std::vector<std::pair<QString, OdDbObjectId>> GetEntradasDicionario(

@@ -151,6 +151,18 @@ QHash<QString, std::vector<OdDbObjectId>> CICad::GetReferenciasPorBloco(zvdb::Da
     return referencias;
 }
 
+std::vector<OdDbObjectId> CICad::GetEntidadesComXData(const QString& aplicacao,
+                                                      zvdb::Database* database) {
+    std::vector<OdDbObjectId> ids;
+    zvdb::Database* db = Db(database);
+    if (!db || !db->modelSpace()) return ids;
+    const std::string nome = U8(aplicacao);
+    db->modelSpace()->forEachEntity([&](zvdb::Entity& entidade) {
+        if (entidade.hasXData(nome)) ids.push_back(Id(&entidade));
+    });
+    return ids;
+}
+
 std::vector<std::pair<QString, OdDbObjectId>> CICad::GetEntradasDicionario(
     const QStringList& caminho, zvdb::Database* database) {
     std::vector<std::pair<QString, OdDbObjectId>> entradas;

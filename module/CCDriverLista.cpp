@@ -4,8 +4,10 @@
 #include "ZVResultado.h"
 #include "cad/CICad.h"
 #include "lists/CCBorneGrfWriter.h"
+#include "lists/CCFioGrfWriter.h"
 #include "lists/CETemplateLisp.h"
 #include "readers/CCBorneDataReader.h"
+#include "readers/CCFioDataReader.h"
 
 namespace {
 
@@ -41,6 +43,22 @@ Driver DriverDe(TipoLista tipo) {
     return {nullptr, nullptr, "ZV Diagram Template", "dtp"};
 }
 
+// A template that only counts as loaded when it set the list's own symbol: a terminal or
+// material template picked for the wire list loads, but has no page group for it. The
+// symbol is cleared first, so a value left by an earlier template does not count.
+class ModeloComSimbolo : public CETemplateLisp {
+public:
+    ModeloComSimbolo(const QString& caminho, const QString& simbolo)
+        : CETemplateLisp(caminho), simbolo_(simbolo) {}
+    bool Carregar() override {
+        CICad::SetNilLisp(simbolo_);
+        return CETemplateLisp::Carregar() && !LerTexto(simbolo_).isEmpty();
+    }
+
+private:
+    QString simbolo_;
+};
+
 }  // namespace
 
 QString CCDriverLista::EscolherModelo(TipoLista tipo) {
@@ -61,6 +79,13 @@ void CCDriverLista::Executar(TipoLista tipo) {
         ZVResultado::Cancelado();
         return;
     }
+    if (tipo == TipoLista::Fios) {
+        CCFioDataReader leitor;
+        CCFioGrfWriter escritor;
+        ModeloComSimbolo modelo(caminho, "FUNCAO_LSTGRW");
+        ExecutarLista(leitor, escritor, modelo);
+        return;
+    }
     CCBorneDataReader leitor;
     CCBorneGrfWriter escritor;
     CETemplateLisp modelo(caminho);
@@ -75,7 +100,7 @@ void CCDriverLista::Exporta(const QString& tipo) {
 // The readers and writers of the other lists and of the exports join the drivers as they
 // are built.
 bool CCDriverLista::Disponivel(TipoLista tipo) {
-    return tipo == TipoLista::Bornes;
+    return tipo == TipoLista::Bornes || tipo == TipoLista::Fios;
 }
 
 bool CCDriverLista::ExportacaoDisponivel(const QString& tipo) {

@@ -540,7 +540,6 @@ void CCDataReader::LeBloco(const QString& s, CEItemLista& item, const OdDbObject
 
 void CCDataReader::LeFio(const QString& s, CEItemLista& item, const OdDbObjectId& polilinha,
                          CETemplate* modelo) {
-    Q_UNUSED(modelo);
     const QString chaveTexto = ChaveDaEntidade(polilinha);
     LeColunasUsuario(s, item, catalogo_.ColunasFio(chaveTexto));
     CICad::RegistraApp("KVR_ZV_WIRE", polilinha.database());
@@ -558,6 +557,8 @@ void CCDataReader::LeFio(const QString& s, CEItemLista& item, const OdDbObjectId
                 item.definirCampo(nome + s, valor);
         }
     }
+    const QString campoFio = CampoFio(item);
+    if (!campoFio.isEmpty()) LeRotasFio(item.valorCampo(campoFio), modelo);
     item.definirCampo("WIRE_LISTA" + s, catalogo_.ListaFio(chave, norma));
     const QString descricao = catalogo_.DescricaoFio(chave);
     item.definirCampo("DESCRICAO" + s, descricao);
@@ -648,11 +649,14 @@ void CCDataReader::LeRotasFio(const QString& chave, CETemplate* modelo) {
         for (const auto& [id, campos] :
              ZVData::CESerializable::CarregarClasse("CELayoutRotasFios")) {
             CELayoutRotasFios rota;
-            if (rota.Carregar(campos)) rotas_.push_back({rota.strKeyFio, rota.strRotaData});
+            if (!rota.Carregar(campos)) continue;
+            rotasPorChave_[rota.strKeyFio].push_back(rotas_.size());
+            rotas_.push_back({rota.strKeyFio, rota.strRotaData});
         }
     }
-    for (const Rota& rota : rotas_) {
-        if (rota.chave != chave) continue;
+    // Only the records of this key, in store order: a project routes thousands of wires.
+    for (const std::size_t lugar : rotasPorChave_.value(chave)) {
+        const Rota& rota = rotas_[lugar];
         const QStringList segmentos = rota.dados.split('$', Qt::SkipEmptyParts);
         if (segmentos.isEmpty()) continue;
         QHash<QString, QString> mapa;
@@ -681,6 +685,14 @@ void CCDataReader::Separadores(CETemplate* modelo, QString& primeiro, QString& s
     segundo = modelo ? modelo->LerTexto("*CHAR_SEP_LIG_CFG*")
                      : CICad::GetStringLisp("*EXPORT_CHAR_SEP_LIG*");
     if (primeiro.isEmpty()) primeiro = ":";
+}
+
+QString CCDataReader::CampoFio(const CEItemLista& item, const QString& sufixo) {
+    for (int i = 1; i <= 3; ++i) {
+        const QString campo = CICad::TagTraduzida(CampoTraduzido::Fio, i) + sufixo;
+        if (item.temCampo(campo)) return campo;
+    }
+    return item.temCampo("FIO" + sufixo) ? "FIO" + sufixo : QString();
 }
 
 QString CCDataReader::RotuloElemento(const QString& handle, const QString& conexao,

@@ -91,6 +91,10 @@ public:
     QString RotuloElemento(const QString& handle, const QString& conexao, CETemplate* modelo);
     // The two relation separators: of the template, or of the export settings without one.
     static void Separadores(CETemplate* modelo, QString& primeiro, QString& segundo);
+    // The name of the item's wire number field: the first present of the three languages'
+    // (CABO, WIRE, ALAMBRE), else FIO, the name this edition's drawings write; empty when the
+    // item has none.
+    static QString CampoFio(const CEItemLista& item, const QString& sufixo = QString());
 
     // The position text of the project's grid, or "??".
     QString Posicao(const OdDbObjectId& entidade) const;
@@ -137,6 +141,7 @@ private:
         QString chave, dados;
     };
     std::vector<Rota> rotas_;
+    QHash<QString, std::vector<std::size_t>> rotasPorChave_;  // record places by wire key
     bool rotasLidas_ = false;
     QHash<QString, QHash<QString, QString>> caminhos_;
     QSet<QString> nomesCampos_;

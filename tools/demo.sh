@@ -25,4 +25,7 @@ export ZV_PRODUCT_DIR="$PRODUCT/"
 echo "== zvhost: the demo project, the module loaded, the terminal list command"
 "$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$OUT/demo.dxf" \
     -o "$OUT/terminal-list.dxf" gerarListaBornesGrf
+echo "== zvhost: the wire list of the same project"
+"$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$OUT/demo.dxf" \
+    -o "$OUT/wire-list.dxf" gerarListaFiosGrf
 echo "== results in $OUT"

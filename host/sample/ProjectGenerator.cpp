@@ -161,6 +161,8 @@ private:
     void addVirtualObjects(int virtualTerminals);
     void drawLayout();
     void addRoute(const RoutableWire& wire, const Point3& from, const Point3& to, bool split);
+    // The name of a master's n-th connection (LIGACAOn), "An" when it has none.
+    static std::string connectionOf(const Master& master, int n);
     void setXData(zvdb::DbObject& object, std::string_view application, const XDataItems& items) {
         object.setXData(application, items.tags());
     }
@@ -697,6 +699,11 @@ void ProjectGenerator::Impl::addVirtualObjects(int virtualTerminals) {
 
 // ---- panel layout
 
+std::string ProjectGenerator::Impl::connectionOf(const Master& master, int n) {
+    const zvdb::Attribute* connection = master.reference->attribute("LIGACAO" + std::to_string(n));
+    return connection ? std::string(connection->textValue()) : "A" + std::to_string(n);
+}
+
 void ProjectGenerator::Impl::drawLayout() {
     const std::string& layer = groups_[4].pages[0];
     zvdb::BlockRecord* model = db_->modelSpace();
@@ -718,9 +725,11 @@ void ProjectGenerator::Impl::drawLayout() {
     for (std::size_t k = 0; k < masters_.size() && slot < 40; ++k) {
         if (masters_[k].topBlock.empty()) continue;
         const Point3 at{30.0 + (slot % 20) * 16, slot < 20 ? 250.0 : 200.0};
+        // The view's connection points carry the master's own connection names.
         ofMaster[k] = place(*masters_[k].reference, masters_[k].key, masters_[k].standard,
                             masters_[k].topBlock, at,
-                            {{"CPOINT1", "A1", {0, 10}}, {"CPOINT2", "A2", {0, -10}}});
+                            {{"CPOINT1", connectionOf(masters_[k], 1), {0, 10}},
+                             {"CPOINT2", connectionOf(masters_[k], 2), {0, -10}}});
         ++slot;
     }
     for (std::size_t k = 0; k < placedTerminals_.size() && k < 40; ++k) {
@@ -764,7 +773,8 @@ void ProjectGenerator::Impl::addRoute(const RoutableWire& wire, const Point3& fr
     const std::string key = std::to_string(routeKey_);
     routeKey_ += 1 + random_.below(50);
     const std::string base[] = {"ZV_DATA_MGR", "CELayoutRotasFios", key};
-    const std::string data = handleText(masters_[wire.master].reference->handle()) + ":A2-" +
+    const std::string data = handleText(masters_[wire.master].reference->handle()) + ":" +
+                             connectionOf(masters_[wire.master], 2) + "-" +
                              handleText(placedTerminals_[wire.terminal].reference->handle()) +
                              "-C1-C2" + (split ? "-T1-C3" : "");
     const std::pair<const char*, std::string> fields[] = {{"strKeyFio", wire.number},

@@ -1,0 +1,214 @@
+#include "CCFioGrfWriter.h"
+
+#include "CETemplate.h"
+#include "CETemplateLisp.h"
+#include "cad/CICad.h"
+#include "readers/CEListaAtributos.h"
+#include "readers/VetorItens.h"
+#include "readers/ZVString.h"
+
+namespace {
+
+enum { kCabecalho, kDetalhe, kPrimeira, kRodape, kTotal };
+
+// The running grid of the layout, in single precision as the drawing keeps it.
+struct Grade {
+    float x0, y0, x, y, h;
+    double espaco;
+    int linhas, colunas, contagem = 0, coluna = 0;
+
+    void Coloca(CEPaginaLista& pagina, CEItemLista* item,
+                std::shared_ptr<CEItemLista> proprio = {}) {
+        pagina.linhas.push_back({item,
+                                 double(CICad::Simples(x)),
+                                 double(CICad::Simples(y)),
+                                 {},
+                                 {},
+                                 std::move(proprio)});
+        ++contagem;
+        y = float(CICad::Simples(y - h));
+    }
+    void Reinicia() {
+        contagem = coluna = 0;
+        x = x0;
+        y = y0;
+    }
+};
+
+// A new page goes on with the fields of the page before; PAGINA is the running index of
+// the item it starts at.
+void NovaPagina(std::vector<CEPaginaLista>& paginas, Grade& grade, int indice) {
+    grade.Reinicia();
+    CEPaginaLista pagina;
+    pagina.atributos = paginas.back().atributos;
+    pagina.atributos.insert("PAGINA", QString::number(indice));
+    paginas.push_back(std::move(pagina));
+}
+
+bool ComecaCom(const QString& tag, const char* a, const char* b) {
+    const QString maiuscula = tag.toUpper();
+    return maiuscula.startsWith(QLatin1String(a)) || maiuscula.startsWith(QLatin1String(b));
+}
+
+}  // namespace
+
+QStringList CCFioGrfWriter::CamposTotal(const CCListaPaginada::Bloco& total) {
+    QStringList campos;
+    OdDbObjectId id;
+    if (!CICad::GetBlocoId(total.nome, id)) return campos;
+    std::unique_ptr<zv::CEListaAtributos> definicoes =
+        CICad::GetDefinicoesAtributos(total.arquivo, total.nome);
+    for (int i = 0; definicoes && i < definicoes->Quantidade(); ++i) {
+        const zv::CEAtributo& definicao = (*definicoes)[i];
+        if (ComecaCom(definicao.GetTag(), "VARIAVEL", "VARIABLE") &&
+            !campos.contains(definicao.GetValor()))
+            campos << definicao.GetValor();
+    }
+    return campos;
+}
+
+bool CCFioGrfWriter::QuebraComBranco(CETemplate& modelo) {
+    Q_UNUSED(modelo);
+    return false;
+}
+
+std::vector<CEPaginaLista> CCFioGrfWriter::Diagrama(VetorItens& itens, CETemplate& modelo,
+                                                    const QStringList& totais) {
+    std::vector<CEPaginaLista> paginas;
+    Grade grade{
+        float(CICad::Simples(modelo.LerReal("*X_INIC_LISTA*"))),
+        float(CICad::Simples(modelo.LerReal("*Y_INIC_LISTA*"))),
+        0,
+        0,
+        float(CICad::Simples(CETemplateLisp::TextoParaReal(modelo.LerTexto("TAM_DETALHE")))),
+        modelo.LerReal("*ESPACO_HORIZONTAL*"),
+        modelo.LerInteiro("*LINHAS_POR_PAGINA*"),
+        modelo.LerLogico("*COLUNA_SN*") ? modelo.LerInteiro("*NUMERO_COLUNA*") : 1};
+    grade.Reinicia();
+    // Null entries are tolerated, and skipped here.
+    VetorItens presentes;
+    for (CEItemLista* item : itens)
+        if (item) presentes.push_back(item);
+    const int n = int(presentes.size());
+    if (n == 0) return paginas;
+    paginas.push_back({});
+    paginas.back().atributos = CCListaPaginada::CamposPrimeiraPagina(n);
+    presentes.ordenar(modelo.LerListaTexto("*LISTA_DE_SORT*"));
+    if (modelo.LerTexto("*ORDEM_CRESCENTE*") != "C") presentes.inverter();
+    const QStringList chaves = modelo.LerListaTexto("*ZV_CHAVE_QUEBRA_PAGINA*");
+    const int brancas = modelo.LerInteiro("*NUMERO_LINHAS*");
+    const bool comBranco = QuebraComBranco(modelo);
+
+    std::vector<double> somas(size_t(totais.size()), 0.0);
+    for (int i = 0; i < n; ++i) {
+        CEItemLista& item = *presentes[size_t(i)];
+        for (int t = 0; t < totais.size(); ++t) {
+            QString valor;
+            if (item.obterCampo(totais[t], valor))
+                somas[size_t(t)] += CETemplateLisp::TextoParaReal(valor);
+        }
+        grade.Coloca(paginas.back(), &item);
+        if (i + 1 < n) {
+            const CEItemLista& proximo = *presentes[size_t(i + 1)];
+            for (const QString& chave : chaves) {
+                if (proximo.valorCampo(chave) == item.valorCampo(chave)) continue;
+                if (!comBranco) {
+                    NovaPagina(paginas, grade, i + 1);
+                } else {
+                    grade.contagem += brancas;
+                    grade.y = float(CICad::Simples(grade.y - brancas * grade.h));
+                }
+                break;
+            }
+        }
+        // The column end runs after a break too, as the terminal list's does.
+        if (grade.contagem >= grade.linhas) {
+            grade.contagem = 0;
+            grade.y = grade.y0;
+            grade.x = float(CICad::Simples(grade.x + grade.espaco));
+            ++grade.coluna;
+            if (grade.coluna >= grade.colunas && i + 1 < n) NovaPagina(paginas, grade, i + 1);
+        }
+    }
+    // The sorted order is the list's order from here on.
+    itens = presentes;
+
+    if (!modelo.LerTexto("LISTA_TOTAL").isEmpty()) {
+        auto total = std::make_shared<CEItemLista>();
+        const int digitos = CICad::GetIntLisp("PBLINTFIODGTSAFTERDOT", 0);
+        for (int t = 0; t < totais.size(); ++t)
+            total->definirCampoReal(totais[t], somas[size_t(t)], digitos);
+        CEPaginaLista pagina;
+        pagina.pagina_total = true;
+        grade.Reinicia();
+        grade.Coloca(pagina, total.get(), total);
+        paginas.push_back(std::move(pagina));
+    }
+    return paginas;
+}
+
+QString CCFioGrfWriter::ValorVariavel(const CEItemLista& item, const QString& campo, int digitos) {
+    const QString valor = item.valorCampo(campo);
+    // The length prints as a number; so does any field that holds the same text. A row
+    // without a length prints its empty fields as they are.
+    const QString comprimento = item.valorCampo("COMPRIMENTO");
+    if (comprimento.isEmpty() || valor != comprimento) return valor;
+    const float numero = float(CETemplateLisp::TextoParaReal(comprimento));
+    return ZVString::DeReal(double(numero), digitos);
+}
+
+void CCFioGrfWriter::InsereLinha(const CCListaPaginada::Bloco& bloco, const QString& layer,
+                                 const CELinhaLista& linha) {
+    if (!bloco.existe() || !linha.item) return;
+    const OdDbObjectId ref =
+        CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, linha.x, linha.y, 0, 0);
+    if (ref.isNull()) return;
+    std::unique_ptr<zv::CEListaAtributos> atributos;
+    CICad::GetAtributos(ref, atributos, false, false);
+    bool publicado = false;
+    for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
+        zv::CEAtributo& atributo = (*atributos)[i];
+        const QString tag = atributo.GetTag();
+        if (ComecaCom(tag, "VARIAVEL", "VARIABLE")) {
+            atributo.SetValor(ValorVariavel(*linha.item, atributo.GetValor(), digitos_));
+        } else if (ComecaCom(tag, "FUNCAO", "FUNCTION")) {
+            if (!publicado) linha.item->paraLisp();
+            publicado = true;
+            atributo.SetValor(CCListaPaginada::AvaliaFuncao(atributo.GetValor()));
+        } else if (ComecaCom(tag, "TOTAL", "TOTAL")) {
+            atributo.SetValor(linha.item->valorCampo(atributo.GetValor()));
+        }
+    }
+    if (publicado) CEItemLista::limparLisp();
+    if (!variasColunas_ && !linha.item->ids.empty() && !linha.item->ids.front().isNull())
+        CICad::SetXData(ref, "KVR_ZV_LINK",
+                        {{1000, ZVString::DeHandle(linha.item->ids.front().handle())}});
+}
+
+void CCFioGrfWriter::EscrevePagina(const CEPaginaLista& pagina) {
+    // The first-row block is imported for the template's sake, never placed.
+    for (const CELinhaLista& linha : pagina.linhas)
+        if (linha.item) InsereLinha(blocos_[kDetalhe], pagina.nome, linha);
+}
+
+void CCFioGrfWriter::EscreverItens(VetorItens& itens, CETemplate& modelo) {
+    grupo_ = modelo.LerTexto("FUNCAO_LSTGRW");
+    variasColunas_ = modelo.LerLogico("*COLUNA_SN*");
+    digitos_ = CICad::GetIntLisp("PBLINTFIODGTSAFTERDOT", 0);
+    blocos_ = CCListaPaginada::ResolveBlocos(
+        modelo,
+        {"LISTA_CABEC", "LISTA_DETALHE", "LISTA_DETALHE_PRIM", "LISTA_RODAPE", "LISTA_TOTAL"},
+        {"BLK_CTR_LST_CABEC_CABLA", "BLK_CTR_LST_DET_CABLA", "BLK_CTR_LST_DET_PRIM",
+         "BLK_CTR_LST_RODAPE_CABLA", "BLK_CTR_LST_TOTAL_CABLA"},
+        grupo_);
+    std::vector<CEPaginaLista> paginas = Diagrama(itens, modelo, CamposTotal(blocos_[kTotal]));
+    CCListaPaginada::CriaPaginas(grupo_, paginas);
+    for (const CEPaginaLista& pagina : paginas) {
+        CCListaPaginada::InsereCampos(blocos_[kCabecalho], pagina.nome, pagina.atributos, true);
+        if (!pagina.pagina_total)
+            EscrevePagina(pagina);
+        else if (!pagina.linhas.empty())
+            InsereLinha(blocos_[kTotal], pagina.nome, pagina.linhas.front());
+        CCListaPaginada::InsereCampos(blocos_[kRodape], pagina.nome, pagina.atributos, false);
+    }
+}

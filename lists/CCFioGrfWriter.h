@@ -1,0 +1,40 @@
+#pragma once
+// The wire list as graphic pages: one row an item, sorted by the template, a new page (or
+// blank rows, for the cable list) at a change of a key field, and a page of totals at the
+// end. The cable list writer builds on it.
+#include "CCListaPaginada.h"
+#include "module/CCDataWriter.h"
+
+#include <utility>
+#include <vector>
+
+class CCFioGrfWriter : public CCDataWriter {
+public:
+    void EscreverItens(VetorItens& itens, CETemplate& modelo) override;
+    // Places the page's rows, each with the detail block.
+    virtual void EscrevePagina(const CEPaginaLista& pagina);
+    // How a change of a key field breaks: false starts a new page.
+    virtual bool QuebraComBranco(CETemplate& modelo);
+
+    // The pages of the items, sorted as the template says, with the total page last when
+    // the template has a total block; the drawing is not touched. `totais` lists the fields
+    // that the total sums, in order.
+    std::vector<CEPaginaLista> Diagrama(VetorItens& itens, CETemplate& modelo,
+                                        const QStringList& totais);
+    // The fields the total block sums: the VARIAVEL attribute definitions of the block
+    // named, in order; nothing when the drawing lacks it.
+    static QStringList CamposTotal(const CCListaPaginada::Bloco& total);
+    // A VARIAVEL cell of a row: the length prints as a number with `digitos` decimals.
+    static QString ValorVariavel(const CEItemLista& item, const QString& campo, int digitos);
+
+protected:
+    // Fills a detail or total row inserted at the row's point.
+    void InsereLinha(const CCListaPaginada::Bloco& bloco, const QString& layer,
+                     const CELinhaLista& linha);
+
+    QString grupo_;
+    bool variasColunas_ = false;
+    int digitos_ = 0;
+    // Header, detail, first-row detail, footer, total.
+    std::vector<CCListaPaginada::Bloco> blocos_;
+};

@@ -1,0 +1,95 @@
+#pragma once
+// The wire reader: one item per stretch of a wire between two elements, the stretches of one
+// wire chained by `ligado`; the ferrule variant, which breaks a wire at every element; and
+// the wire lengths measured along the routes of the panel layout.
+#include "CCDataReader.h"
+
+#include <QSet>
+
+#include <unordered_map>
+
+class CCFioDataReader : public CCDataReader {
+public:
+    // A wire's ends are filled by the reader's own walk.
+    void LerLadoIni(CEItemLista& item, const OdDbObjectId& entidade, CETemplate& modelo) override;
+    void LerLadoFim(CEItemLista& item, const OdDbObjectId& entidade, CETemplate& modelo) override;
+    // Reads the wires of the active drawing; the pages come from the template's page picker,
+    // never from the pipeline.
+    VetorItens* LerDados(zvdb::Database* database, const std::optional<QStringList>& paginas,
+                         CETemplate& modelo, CIProgress& progresso) override;
+
+    // The wire stretches of the pages (all without a list; none for an empty list). Template
+    // and progress may be null (the exports).
+    VetorItens* LeFios(const std::optional<QStringList>& paginas, CETemplate* modelo,
+                       CIProgress* progresso);
+    // The ferrule stretches; `opcoes` is the export's options, of which PAGINAS (page names
+    // cut by ";", empty for all pages) is read.
+    VetorItens* LeAnilhas(const QHash<QString, QString>& opcoes, CETemplate* modelo,
+                          CIProgress* progresso);
+    // The fields of the wire polyline at one end (side "INI" or "FIM"), found at the point of
+    // the end's connection text.
+    void LeSegmento(const QString& lado, CEItemLista& item, const QString& completo,
+                    CETemplate* modelo);
+    // The relation texts of the end at `indice` of the wire's connection list.
+    void CompoeExtremidade(const QString& sufixo, CEItemLista& item, CETemplate* modelo,
+                           int indice);
+    // REL, LIG and the three relation fields of one end: a pin, a terminal or any other
+    // element, in this order of tests.
+    void ComporRelacaoFio(const QString& sufixo, CEItemLista& item, CETemplate* modelo,
+                          const zv::CEAtributo* ligacao);
+
+    // ---- lengths and routes of the panel layout
+    // The route polylines and panel views of model space, once per reader.
+    void CarregaLayout();
+    // Element relations (masters) and terminals to their own handles, for those that have a
+    // layout view.
+    void MapeiaLayout(CETemplate* modelo);
+    // The point of an element's connection in its layout view: the CPOINT attribute of that
+    // connection, else the view's position; false when the element has no view.
+    bool PosicaoLayout(const QString& elemento, const QString& conexao, CEPonto& ponto);
+    // The length along the wire's routes between the vertices nearest two points, with the
+    // allowances, as "%f" text; "-" for an empty key, "0.000000" without a route.
+    QString ComprimentoFio(const QString& chave, const CEPonto& inicio, const CEPonto& fim);
+    // Where a stretch starts and ends in the wire's connection list; an open stretch ends
+    // at -1.
+    struct Trecho {
+        int inicio = 0, fim = -1;
+    };
+    using Trechos = std::unordered_map<const CEItemLista*, Trecho>;
+    // LENGTH and COMPRIMENTO of every stretch of the chain that starts at `primeiro`. Each
+    // stretch is measured between the elements it joins: those `trechos` gives, else the
+    // k-th and the next of the list for the k-th stretch; an open stretch to the element
+    // after its start.
+    void CalculaComprimentos(CEItemLista* primeiro, const QStringList& elementos,
+                             const Trechos* trechos = nullptr);
+    // CAMINHOFIO and PATHWIRE of each item from the routes read for its wire.
+    void AplicaCaminhos(VetorItens& itens);
+    // Transitions between ducts: pairs of a transition block and its partner.
+    const std::vector<std::pair<OdDbObjectId, OdDbObjectId>>& Transicoes() const {
+        return transicoes_;
+    }
+
+private:
+    // The wire's item from its polyline; null without a key.
+    CEItemLista* ItemFio(const OdDbObjectId& polilinha, CETemplate* modelo);
+    // The answer of getListaFios for the layers, as object ids.
+    std::vector<OdDbObjectId> ListaFios(const QStringList& layers);
+    // One end of a stretch from the element at `indice` of the wire's lists.
+    void PreencheExtremidade(const QString& lado, CEItemLista& item, const QStringList& elementos,
+                             const QStringList& completas, int indice, CETemplate* modelo);
+    void CarregaTransicoes();
+    // The fields of an element or wire polyline under the suffix. An entity stands at the
+    // ends of many stretches: its fields are read once and copied, sharing their texts.
+    void CopiaEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
+                       CETemplate* modelo);
+
+    using Campos = std::vector<std::pair<QString, QString>>;
+    std::unordered_map<OdDbObjectId, Campos> camposPorEntidade_;
+    QHash<QString, QHash<QString, QString>> nomesComSufixo_;  // by suffix, then bare name
+    QHash<QString, QString> rotasLayoutFio_;  // wire key (and key + "$") to route handle
+    QHash<QString, QString> paineisLayout_;   // panel key to view handle
+    QHash<QString, QString> layoutPorRelacao_;
+    QHash<QString, QString> comprimentos_;
+    std::vector<std::pair<OdDbObjectId, OdDbObjectId>> transicoes_;
+    bool layoutCarregado_ = false, layoutMapeado_ = false, transicoesCarregadas_ = false;
+};

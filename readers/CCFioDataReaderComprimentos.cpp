@@ -1,0 +1,254 @@
+// The wire reader's lengths: where each end of a wire stands in the panel layout, and the
+// length along the wire's route polylines between those places, with the allowances.
+#include "CCFioDataReader.h"
+
+#include "CEAtributo.h"
+#include "CEListaAtributos.h"
+
+#include <cmath>
+#include <memory>
+#include <unordered_set>
+
+namespace {
+
+// A vertex counts only when it lies strictly closer to the point than this.
+constexpr double kDistanciaMaxima = 999.0;
+
+double Distancia(const CEPonto& a, const CEPonto& b) {
+    return std::sqrt((a.x - b.x) * (a.x - b.x) + (a.y - b.y) * (a.y - b.y) +
+                     (a.z - b.z) * (a.z - b.z));
+}
+
+// The first text item of the application, as a key.
+QString PrimeiroTexto(const OdDbObjectId& id, const QString& aplicacao) {
+    const CEListaXData itens = CICad::GetXData(id, aplicacao);
+    return itens.empty() ? QString() : itens.front().texto;
+}
+
+bool ComecaComAlgum(const QString& nome, std::initializer_list<const char*> prefixos) {
+    for (const char* prefixo : prefixos)
+        if (nome.startsWith(QLatin1String(prefixo), Qt::CaseInsensitive)) return true;
+    return false;
+}
+
+// Contacts reach the layout through their master.
+bool EhContato(const QString& bloco) {
+    return ComecaComAlgum(bloco, {"NA-", "NF-", "NAF-", "BT-"});
+}
+
+QString ValorLigacao(const std::unique_ptr<zv::CEAtributo>& atributo) {
+    return atributo ? atributo->GetValor() : QString();
+}
+
+QString TextoPonto(const CEPonto& p) {
+    return QString::asprintf("%.17g,%.17g,%.17g", p.x, p.y, p.z);
+}
+
+}  // namespace
+
+void CCFioDataReader::CarregaLayout() {
+    if (layoutCarregado_) return;
+    layoutCarregado_ = true;
+    for (const OdDbObjectId& id : CICad::GetEntidadesComXData("KVR_ZV_WIRE_LAYOUT")) {
+        if (!CICad::EhPolilinha(id)) continue;
+        const QString chave = PrimeiroTexto(id, "KVR_ZV_WIRE_LAYOUT");
+        if (chave.isEmpty()) continue;
+        // A wire may have a second route; it is kept under the key and "$".
+        rotasLayoutFio_.insert(rotasLayoutFio_.contains(chave) ? chave + "$" : chave,
+                               ZVString::DeHandle(id.handle()));
+    }
+    for (const OdDbObjectId& id : CICad::GetEntidadesComXData("KVR_LAYOUT_PAINEL")) {
+        if (!CICad::EhReferencia(id)) continue;
+        const QString chave = PrimeiroTexto(id, "KVR_LAYOUT_PAINEL");
+        if (!chave.isEmpty()) paineisLayout_.insert(chave, ZVString::DeHandle(id.handle()));
+    }
+}
+
+void CCFioDataReader::MapeiaLayout(CETemplate* modelo) {
+    Q_UNUSED(modelo);
+    if (layoutMapeado_) return;
+    layoutMapeado_ = true;
+    // Only the symbols with a layout view can enter the map, so only they are looked at.
+    const OdDbObjectId modelSpace = CICad::GetModelSpace();
+    for (const OdDbObjectId& ref : CICad::GetEntidadesComXData("KVR_LAYOUT_ESQUEMA")) {
+        if (!CICad::EhReferencia(ref) || CICad::GetDono(ref) != modelSpace) continue;
+        if (ChaveDaEntidade(ref).isEmpty()) continue;  // no item, no entry
+        const QString bloco = CICad::GetNomeBloco(ref);
+        const bool borne = bloco.startsWith("BORNE", Qt::CaseInsensitive);
+        if (!borne && (EhContato(bloco) || bloco.startsWith("BOR-", Qt::CaseInsensitive))) continue;
+        CEItemLista campos;
+        std::unique_ptr<zv::CEListaAtributos> atributos;
+        CICad::GetAtributos(ref, atributos, false, false);
+        for (int i = 0; atributos && i < atributos->Quantidade(); ++i)
+            campos.definirCampo((*atributos)[i].GetTag(), (*atributos)[i].GetValor());
+        CICad::GetAtributosConstantes(ref, atributos);
+        for (int i = 0; atributos && i < atributos->Quantidade(); ++i)
+            campos.definirCampo((*atributos)[i].GetTag(), (*atributos)[i].GetValor());
+        QString chave;
+        if (borne) {
+            for (int i = 1; i <= 3 && chave.isEmpty(); ++i) {
+                const QString regua = CICad::TagTraduzida(CampoTraduzido::Regua, i);
+                const QString numero = CICad::TagTraduzida(CampoTraduzido::Numero, i);
+                if (campos.temCampo(regua) && campos.temCampo(numero))
+                    chave = campos.valorCampo(regua) + kSeparador + campos.valorCampo(numero);
+            }
+        } else {
+            for (int i = 1; i <= 3; ++i)
+                chave += campos.valorCampo(CICad::TagTraduzida(CampoTraduzido::Relacao, i));
+        }
+        if (!chave.isEmpty()) layoutPorRelacao_.insert(chave, ZVString::DeHandle(ref.handle()));
+    }
+}
+
+bool CCFioDataReader::PosicaoLayout(const QString& elemento, const QString& conexao,
+                                    CEPonto& ponto) {
+    OdDbObjectId id = CICad::IdDoHandle(elemento);
+    if (!CICad::EhReferencia(id)) return false;
+    if (EhContato(CICad::GetNomeBloco(id))) {
+        const std::unique_ptr<zv::CEAtributo> pai = CICad::GetAtributo("PARENT", id);
+        const QString mestre = pai ? layoutPorRelacao_.value(pai->GetValor()) : QString();
+        if (mestre.isEmpty()) return false;
+        id = CICad::IdDoHandle(mestre);
+        if (!CICad::EhReferencia(id)) return false;
+    }
+    const CEListaXData esquema = CICad::GetXData(id, "KVR_LAYOUT_ESQUEMA");
+    OdDbObjectId vista;
+    for (size_t indice : {size_t(0), size_t(2)}) {
+        if (indice >= esquema.size()) continue;
+        const OdDbObjectId candidata = CICad::IdDoHandle(esquema[indice].texto);
+        if (CICad::EhReferencia(candidata)) {
+            vista = candidata;
+            break;
+        }
+    }
+    if (vista.isNull()) return false;
+    std::unique_ptr<zv::CEListaAtributos> atributos;
+    CICad::GetAtributos(vista, atributos, false, false);
+    for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
+        const zv::CEAtributo& atributo = (*atributos)[i];
+        if (!atributo.GetTag().toUpper().startsWith("CPOINT")) continue;
+        if (atributo.GetValor().compare(conexao, Qt::CaseInsensitive) != 0) continue;
+        ponto = CICad::GetPosicaoTexto(atributo.GetId());
+        return true;
+    }
+    ponto = CICad::GetPosicao(vista);
+    return true;
+}
+
+void CCFioDataReader::CarregaTransicoes() {
+    if (transicoesCarregadas_) return;
+    transicoesCarregadas_ = true;
+    for (const OdDbObjectId& id : CICad::GetEntidadesComXData("KVR_ZV_TRANSITION")) {
+        if (!CICad::EhReferencia(id)) continue;
+        if (PrimeiroTexto(id, "KVR_ZV_REPRESENTACAO") != "-50") continue;
+        // A transition whose partner is gone pairs with nothing.
+        const OdDbObjectId parceiro = CICad::IdDoHandle(PrimeiroTexto(id, "KVR_ZV_TRANSITION"));
+        if (CICad::EhReferencia(parceiro)) transicoes_.emplace_back(id, parceiro);
+    }
+}
+
+QString CCFioDataReader::ComprimentoFio(const QString& chave, const CEPonto& inicio,
+                                        const CEPonto& fim) {
+    if (chave.isEmpty()) return "-";
+    const QString memoria =
+        chave + QChar(0x1F) + TextoPonto(inicio) + QChar(0x1F) + TextoPonto(fim);
+    auto achado = comprimentos_.constFind(memoria);
+    if (achado != comprimentos_.constEnd()) return achado.value();
+    CarregaLayout();
+
+    struct Vertice {
+        double distancia = kDistanciaMaxima;
+        int rota = -1, indice = -1;
+    } maisPertoInicio, maisPertoFim;
+    std::vector<std::vector<CEPonto>> rotas;
+    for (const QString& nome : {chave, QString(chave + "$")}) {
+        const QString handle = rotasLayoutFio_.value(nome);
+        if (!handle.isEmpty()) rotas.push_back(CICad::GetVertices(CICad::IdDoHandle(handle)));
+    }
+    for (int r = 0; r < int(rotas.size()); ++r)
+        for (int v = 0; v < int(rotas[size_t(r)].size()); ++v) {
+            const CEPonto& p = rotas[size_t(r)][size_t(v)];
+            const double a = Distancia(p, inicio), b = Distancia(p, fim);
+            if (a < maisPertoInicio.distancia) maisPertoInicio = {a, r, v};
+            if (b < maisPertoFim.distancia) maisPertoFim = {b, r, v};
+        }
+    double comprimento = 0.0;
+    if (maisPertoInicio.rota >= 0 && maisPertoFim.rota >= 0) {
+        if (maisPertoInicio.rota == maisPertoFim.rota) {
+            const std::vector<CEPonto>& rota = rotas[size_t(maisPertoInicio.rota)];
+            const int de = std::min(maisPertoInicio.indice, maisPertoFim.indice);
+            const int ate = std::max(maisPertoInicio.indice, maisPertoFim.indice);
+            double soma = 0.0;
+            for (int v = de; v < ate; ++v)
+                soma += Distancia(rota[size_t(v)], rota[size_t(v + 1)]);
+            comprimento = soma * (CICad::GetRealLisp("PBLCOMPFIOPORCENTO", 0.0) / 100.0 + 1.0) +
+                          CICad::GetRealLisp("PBLCOMPFIOABSOLUTO", 0.0);
+        } else {
+            // Across a transition between two routes nothing is measured: the length is 0.
+            CarregaTransicoes();
+        }
+    }
+    const QString texto = QString::asprintf("%f", comprimento);
+    comprimentos_.insert(memoria, texto);
+    return texto;
+}
+
+void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const QStringList& elementos,
+                                          const Trechos* trechos) {
+    if (!primeiro || elementos.isEmpty()) return;
+    std::vector<CEItemLista*> cadeia;
+    std::unordered_set<CEItemLista*> vistos;
+    for (CEItemLista* item = primeiro; item && vistos.insert(item).second; item = item->ligado)
+        cadeia.push_back(item);
+    const QString campo = CampoFio(*primeiro);
+    if (campo.isEmpty()) return;
+    const QString chave = primeiro->valorCampo(campo);
+    const std::vector<CEPonto>* pontos = PontosConexao(chave);
+    auto pontoDe = [pontos](int i) {
+        return pontos && size_t(i) < pontos->size() ? (*pontos)[size_t(i)] : CEPonto{};
+    };
+    auto posicao = [this](const QString& elemento, const QString& conexao, const QString& relacao,
+                          CEPonto& ponto) {
+        if (PosicaoLayout(elemento, conexao, ponto)) return;
+        const QString handle = layoutPorRelacao_.value(relacao);
+        if (!handle.isEmpty()) PosicaoLayout(handle, conexao, ponto);
+    };
+    const int n = int(elementos.size());
+    for (size_t k = 0; k < cadeia.size(); ++k) {
+        CEItemLista& item = *cadeia[k];
+        Trecho trecho{int(k), int(k) + 1};
+        if (trechos) {
+            auto achado = trechos->find(&item);
+            if (achado != trechos->end()) trecho = achado->second;
+            if (trecho.fim < 0) trecho.fim = trecho.inicio + 1;
+        }
+        if (trecho.inicio < 0 || trecho.inicio >= n || trecho.fim >= n) continue;
+        const QString& a1 = elementos[trecho.inicio];
+        const QString& a2 = elementos[trecho.fim];
+        const QString r1 =
+            ValorLigacao(AtributoConexaoProximo(CICad::IdDoHandle(a1), pontoDe(trecho.inicio)));
+        const QString r2 =
+            ValorLigacao(AtributoConexaoProximo(CICad::IdDoHandle(a2), pontoDe(trecho.fim)));
+        CEPonto inicio, fim;
+        posicao(a1, r1, item.valorCampo("REL_INI"), inicio);
+        posicao(a2, r2, item.valorCampo("REL_FIM"), fim);
+        if (!item.temCampo(campo)) continue;
+        const QString comprimento = ComprimentoFio(chave, inicio, fim);
+        item.definirCampo("LENGTH", comprimento);
+        item.definirCampo("COMPRIMENTO", comprimento);
+    }
+}
+
+void CCFioDataReader::AplicaCaminhos(VetorItens& itens) {
+    for (CEItemLista* item : itens) {
+        if (!item) continue;
+        const QString campo = CampoFio(*item);
+        const QHash<QString, QString>* caminhos =
+            campo.isEmpty() ? nullptr : Caminhos(item->valorCampo(campo));
+        if (!caminhos || caminhos->isEmpty()) continue;
+        const QString caminho = caminhos->value(item->valorCampo("RELACAO_INI") + "-" +
+                                                item->valorCampo("RELACAO_FIM"));
+        item->definirCampo("CAMINHOFIO", caminho);
+        item->definirCampo("PATHWIRE", caminho);
+    }
+}

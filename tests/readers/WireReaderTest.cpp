@@ -1,0 +1,347 @@
+// The wire reader on small schematics: how a wire breaks into chained stretches, what each
+// end of a stretch says, which wires and pages it reads, and the ferrule variant.
+#include "readers/FioFixture.h"
+
+#include "module/CIProgress.h"
+#include "readers/CEAtributo.h"
+
+namespace {
+
+using WireReaderTest = FioFixture;
+
+// ---- chains
+
+TEST_F(WireReaderTest, AWireThroughAContactMakesTwoStretchesChainedByLigado) {
+    const zvdb::BlockReference* x1 = borne("X1", "1", {20, 200, 0});
+    const zvdb::BlockReference* k1 = componente("-K1", {{"A1", {20, 150, 0}}}, "NA-1");
+    const zvdb::BlockReference* x2 = borne("X1", "2", {20, 100, 0});
+    fio({{20, 190, 0}, {20, 150, 0}, {20, 100, 0}}, "12");
+    CCFioDataReader leitor;
+    const VetorItens& itens = le(leitor);
+    ASSERT_EQ(itens.size(), 2u);
+    // The first stretch stands behind the later ones.
+    const CEItemLista& primeiro = *itens[1];
+    const CEItemLista& segundo = *itens[0];
+    EXPECT_EQ(primeiro.ligado, &segundo);
+    EXPECT_EQ(segundo.ligado, nullptr);
+    EXPECT_EQ(primeiro.valorCampo("HANDLE_INI"), handle(x1));
+    EXPECT_EQ(primeiro.valorCampo("HANDLE_FIM"), handle(k1));
+    EXPECT_EQ(segundo.valorCampo("HANDLE_INI"), handle(k1));
+    EXPECT_EQ(segundo.valorCampo("HANDLE_FIM"), handle(x2));
+    EXPECT_EQ(cadeias(), QStringList({"X1:1/>-K1:A1 -K1:A1>X1:2/"}));
+    for (const CEItemLista* item : itens) {
+        EXPECT_EQ(item->valorCampo("ZV_LISTA_TIPO"), "FIO");
+        EXPECT_EQ(item->valorCampo("FIO"), "12");
+        // The wire polyline's own fields at each end, and the wire itself first in the ids.
+        EXPECT_EQ(item->valorCampo("FIO_SEGINI"), "12");
+        EXPECT_EQ(item->valorCampo("FIO_SEGFIM"), "12");
+        ASSERT_FALSE(item->ids.empty());
+        EXPECT_TRUE(CICad::EhPolilinha(item->ids.front()));
+    }
+    EXPECT_EQ(primeiro.valorCampo("REL_INI"), "X1:1");
+    EXPECT_EQ(primeiro.valorCampo("LIG_INI"), "");
+    EXPECT_EQ(primeiro.valorCampo("REL_FIM"), "-K1");
+    EXPECT_EQ(primeiro.valorCampo("LIG_FIM"), "A1");
+}
+
+TEST_F(WireReaderTest, TwoPolylinesOfOneNumberOnTwoPagesMakeOneChain) {
+    borne("X1", "1", {20, 200, 0});
+    componente("-K1", {{"A1", {20, 150, 0}}});
+    componente("-K2", {{"A1", {50, 150, 0}}}, "BOBINA", kPagina2);
+    borne("X2", "1", {50, 100, 0}, kPagina2);
+    fio({{20, 190, 0}, {20, 150, 0}}, "12");
+    fio({{50, 150, 0}, {50, 100, 0}}, "12", kPagina2);
+    CCFioDataReader leitor;
+    EXPECT_EQ(le(leitor).size(), 3u);
+    EXPECT_EQ(cadeias(), QStringList({"X1:1/>-K1:A1 -K1:A1>-K2:A1 -K2:A1>X2:1/"}));
+}
+
+TEST_F(WireReaderTest, AnEquipmentPassedTwiceInARowMakesNoBreakTwoEquipmentsDo) {
+    borne("X1", "1", {20, 200, 0});
+    zvdb::BlockReference* e =
+        componente("-A1", {{"I1", {20, 170, 0}}, {"I2", {20, 160, 0}}}, "CLP");
+    e->setXData("KVR_ZV_EQUIPO", zvsample::XDataItems().text("EQUIPO").tags());
+    borne("X1", "2", {20, 100, 0});
+    fio({{20, 190, 0}, {20, 170, 0}, {20, 160, 0}, {20, 100, 0}}, "20");
+    CCFioDataReader leitor;
+    le(leitor);
+    // In at one pin, out at the other: one passage, two stretches.
+    EXPECT_EQ(cadeias(), QStringList({"X1:1/>-A1:I1 -A1:I2>X1:2/"}));
+}
+
+TEST_F(WireReaderTest, TwoDifferentEquipmentsAndAComponentTwiceBreakTheWire) {
+    borne("X1", "1", {20, 200, 0});
+    zvdb::BlockReference* e1 = componente("-A1", {{"I1", {20, 170, 0}}}, "CLP");
+    zvdb::BlockReference* e2 = componente("-A2", {{"I1", {20, 160, 0}}}, "CLP");
+    for (zvdb::BlockReference* e : {e1, e2})
+        e->setXData("KVR_ZV_EQUIPO", zvsample::XDataItems().text("EQUIPO").tags());
+    borne("X1", "2", {20, 100, 0});
+    fio({{20, 190, 0}, {20, 170, 0}, {20, 160, 0}, {20, 100, 0}}, "20");
+    // Not an equipment: a component touched twice in a row ends a stretch on itself.
+    borne("X3", "1", {120, 200, 0});
+    componente("-K1", {{"A1", {120, 170, 0}}, {"A2", {120, 160, 0}}});
+    borne("X3", "2", {120, 100, 0});
+    fio({{120, 190, 0}, {120, 170, 0}, {120, 160, 0}, {120, 100, 0}}, "21");
+    CCFioDataReader leitor;
+    le(leitor);
+    EXPECT_EQ(cadeias(), QStringList({"X1:1/>-A1:I1 -A1:I1>-A2:I1 -A2:I1>X1:2/",
+                                      "X3:1/>-K1:A1 -K1:A1>-K1:A2 -K1:A2>X3:2/"}));
+}
+
+TEST_F(WireReaderTest, AWireTouchingNothingIsOneItemWithoutEnds) {
+    fio({{200, 200, 0}, {250, 200, 0}}, "30");
+    CCFioDataReader leitor;
+    ASSERT_EQ(le(leitor).size(), 1u);
+    const CEItemLista& item = *itens_[0];
+    EXPECT_EQ(item.valorCampo("FIO"), "30");
+    EXPECT_EQ(item.ligado, nullptr);
+    EXPECT_FALSE(item.temCampo("HANDLE_INI"));
+    EXPECT_FALSE(item.temCampo("COMPRIMENTO"));
+}
+
+TEST_F(WireReaderTest, AnElementThatNoLongerExistsLeavesTheStretchOpen) {
+    const zvdb::BlockReference* x1 = borne("X1", "1", {20, 200, 0});
+    const zvdb::BlockReference* x2 = borne("X1", "2", {20, 100, 0});
+    fio({{20, 190, 0}, {20, 100, 0}}, "12");
+    // The product's answer names an element that the drawing does not hold (any more).
+    ASSERT_TRUE(lisp(QString("(defun getConexoesTodosFios () (list (list \"12\" (list \"%1#\" "
+                             "20.0 190.0 0.0) (list \"FFFFF#A1#X\" 20.0 150.0 0.0) (list "
+                             "\"%2#\" 20.0 100.0 0.0))))")
+                         .arg(handle(x1), handle(x2))));
+    CCFioDataReader leitor;
+    le(leitor);
+    ASSERT_EQ(itens_.size(), 1u);
+    EXPECT_EQ(itens_[0]->valorCampo("RELACAO_INI"), "X1:1/");
+    EXPECT_FALSE(itens_[0]->temCampo("HANDLE_FIM"));
+    EXPECT_EQ(itens_[0]->ligado, nullptr);
+}
+
+// ---- which wires
+
+TEST_F(WireReaderTest, AWireWhoseKeyIsNotListedIsLeftOutWithoutAMessage) {
+    borne("X1", "1", {20, 200, 0});
+    borne("X1", "2", {20, 100, 0});
+    fio({{20, 190, 0}, {20, 100, 0}}, "40", kPagina1, "10099");
+    fio({{60, 190, 0}, {60, 100, 0}}, "41");
+    const QString antes = saida();
+    CCFioDataReader leitor;
+    le(leitor);
+    QStringList numeros;
+    for (const CEItemLista* item : itens_)
+        numeros << item->valorCampo("FIO");
+    EXPECT_EQ(numeros, QStringList({"41"}));
+    EXPECT_EQ(saida(), antes);
+}
+
+TEST_F(WireReaderTest, TheNumberIsReadFromAnyLanguagesWireField) {
+    fio({{0, 10, 0}, {10, 10, 0}}, "7", kPagina1, "10006", "WIRE");
+    fio({{0, 20, 0}, {10, 20, 0}}, "8", kPagina1, "10006", "ALAMBRE");
+    fio({{0, 30, 0}, {10, 30, 0}}, "9", kPagina1, "10006", "CABO");
+    fio({{0, 40, 0}, {10, 40, 0}}, "", kPagina1, "10006", "CABO");  // no number: left out
+    CCFioDataReader leitor;
+    le(leitor);
+    QStringList numeros;
+    for (const CEItemLista* item : itens_) {
+        const QString campo = CCDataReader::CampoFio(*item);
+        numeros << campo + "=" + item->valorCampo(campo);
+    }
+    numeros.sort();
+    EXPECT_EQ(numeros, QStringList({"ALAMBRE=8", "CABO=9", "WIRE=7"}));
+}
+
+class FiltroTemplate : public TemplateDouble {
+public:
+    bool FiltraItem(const CEItemLista& item) override { return item.valorCampo("FIO") != "51"; }
+};
+
+TEST_F(WireReaderTest, TheTemplatesFilterRefusesWires) {
+    fio({{0, 10, 0}, {10, 10, 0}}, "50");
+    fio({{0, 20, 0}, {10, 20, 0}}, "51");
+    FiltroTemplate filtro;
+    CCFioDataReader leitor;
+    std::unique_ptr<VetorItens> lidos(leitor.LeFios(std::nullopt, &filtro, nullptr));
+    ASSERT_EQ(lidos->size(), 1u);
+    EXPECT_EQ((*lidos)[0]->valorCampo("FIO"), "50");
+    lidos->destruirItens();
+}
+
+// ---- pages
+
+class WirePagesTest : public FioFixture {
+protected:
+    void SetUp() override {
+        FioFixture::SetUp();
+        borne("X1", "1", {20, 200, 0});
+        componente("-K1", {{"A1", {20, 150, 0}}});
+        componente("-K2", {{"A1", {50, 150, 0}}}, "BOBINA", kPagina2);
+        borne("X2", "1", {50, 100, 0}, kPagina2);
+        fio({{20, 190, 0}, {20, 150, 0}}, "12");
+        fio({{50, 150, 0}, {50, 100, 0}}, "12", kPagina2);
+        fio({{90, 150, 0}, {90, 100, 0}}, "13", kPagina2);
+    }
+};
+
+TEST_F(WirePagesTest, OnlyTheSecondPageStillGivesTheWholeChainOfAWireThatStartsOnTheFirst) {
+    CCFioDataReader leitor;
+    le(leitor, QStringList{kPagina2});
+    EXPECT_EQ(cadeias(), QStringList({">", "X1:1/>-K1:A1 -K1:A1>-K2:A1 -K2:A1>X2:1/"}));
+}
+
+TEST_F(WirePagesTest, AnEmptyPageListReadsNothingAndNoListReadsEveryPage) {
+    CCFioDataReader vazio;
+    EXPECT_TRUE(le(vazio, QStringList()).empty());
+    CCFioDataReader todos;
+    le(todos);
+    EXPECT_EQ(itens_.size(), 4u);
+    EXPECT_EQ(cadeias(), QStringList({">", "X1:1/>-K1:A1 -K1:A1>-K2:A1 -K2:A1>X2:1/"}));
+}
+
+TEST_F(WirePagesTest, ThePagePickerOfTheTemplateChoosesThePages) {
+    auto* ui = dynamic_cast<zvhost::ConsoleUserInterface*>(app_->userInterface());
+    ASSERT_TRUE(ui);
+    ui->setAnswer("pages", kPagina1);
+    modelo_.simbolos["*SELECAO_PAG_FIOS*"] = true;
+    CCFioDataReader leitor;
+    CIProgress progresso;
+    std::unique_ptr<VetorItens> lidos(leitor.LerDados(&db(), std::nullopt, modelo_, progresso));
+    itens_.juntarSemRepetir(*lidos);
+    // Wire 13 lies on the second page only.
+    EXPECT_EQ(itens_.size(), 3u);
+    for (const CEItemLista* item : itens_)
+        EXPECT_EQ(item->valorCampo("FIO"), "12");
+    // The pipeline's page list is not the reader's business.
+    modelo_.simbolos["*SELECAO_PAG_FIOS*"] = false;
+    CCFioDataReader semPicker;
+    std::unique_ptr<VetorItens> todos(
+        semPicker.LerDados(&db(), QStringList{kPagina1}, modelo_, progresso));
+    EXPECT_EQ(todos->size(), 4u);
+    todos->destruirItens();
+}
+
+// ---- the relation texts of an end
+
+class EndTextTest : public FioFixture {
+protected:
+    QString compoe(CEItemLista& item, const QString& ligacao, CETemplate* modelo) {
+        CCFioDataReader leitor;
+        std::unique_ptr<zv::CEAtributo> atributo;
+        if (!ligacao.isNull())
+            atributo =
+                std::make_unique<zv::CEAtributo>("LIGACAO1", "", ligacao, OdDbObjectId(), false);
+        leitor.ComporRelacaoFio("_FIM", item, modelo, atributo.get());
+        return item.valorCampo("RELACAO_FIM") + "|" + item.valorCampo("TAG_FIM") + "|" +
+               item.valorCampo("ETIQUETA_FIM") + "|" + item.valorCampo("REL_FIM") + "|" +
+               item.valorCampo("LIG_FIM");
+    }
+    static CEItemLista campos(const std::vector<std::pair<QString, QString>>& pares) {
+        CEItemLista item;
+        for (const auto& [k, v] : pares)
+            item.definirCampo(k, v);
+        return item;
+    }
+};
+
+TEST_F(EndTextTest, ATerminalIsStripAndNumberInEitherOrder) {
+    CEItemLista borne = campos({{"REGUA_FIM", "X1"}, {"NUMERO_FIM", "7"}});
+    EXPECT_EQ(compoe(borne, "A", &modelo_), "X1:7/A|X1:7/A|X1:7/A|X1:7|A");
+    modelo_.simbolos["*ORDEM_CONCAT_STD*"] = "2";
+    CEItemLista outra = campos({{"REGUA_FIM", "X1"}, {"NUMERO_FIM", "7"}});
+    EXPECT_EQ(compoe(outra, "A", &modelo_), "A/7:X1|A/7:X1|A/7:X1|X1:7|A");
+}
+
+TEST_F(EndTextTest, ASeparatorOfTheTemplateOrOfTheExportSettingsStandsBetween) {
+    modelo_.simbolos["*CHAR_SEP_STD_CFG*"] = ".";
+    modelo_.simbolos["*CHAR_SEP_LIG_CFG*"] = "_";
+    CEItemLista borne = campos({{"STRIP_FIM", "X2"}, {"NUMBER_FIM", "3"}});
+    EXPECT_EQ(compoe(borne, "B", &modelo_), "X2.3_B|X2.3_B|X2.3_B|X2.3|B");
+    // Without a separator of its own the first is ":", the second nothing.
+    modelo_.simbolos.clear();
+    CEItemLista semSep = campos({{"REGUA_FIM", "X2"}, {"NUMERO_FIM", "3"}});
+    EXPECT_EQ(compoe(semSep, "B", &modelo_), "B3:X2|B3:X2|B3:X2|X2:3|B");
+    // Without a template (the exports): the export symbols, relation first.
+    CICad::SetStringLisp("*EXPORT_CHAR_SEP*", "-");
+    CICad::SetStringLisp("*EXPORT_CHAR_SEP_LIG*", "+");
+    CEItemLista exportado = campos({{"REGUA_FIM", "X2"}, {"NUMERO_FIM", "3"}});
+    EXPECT_EQ(compoe(exportado, "B", nullptr), "X2-3+B|X2-3+B|X2-3+B|X2-3|B");
+}
+
+TEST_F(EndTextTest, TheLastLanguageWithStripAndNumberWritesTheText) {
+    CEItemLista borne = campos({{"REGUA_FIM", "X1"},
+                                {"NUMERO_FIM", "7"},
+                                {"REGLETA_FIM", "XS"},
+                                {"STRIP_FIM", "XE"},
+                                {"NUMBER_FIM", "9"}});
+    // Spanish pairs REGLETA with NUMERO and comes last; REL takes the first language.
+    EXPECT_EQ(compoe(borne, "", &modelo_), "XS:7/|XS:7/|XS:7/|X1:7|");
+}
+
+TEST_F(EndTextTest, AnyOtherElementIsItsRelationAndConnection) {
+    CEItemLista rele = campos({{"RELACAO_FIM", "-K1"}});
+    EXPECT_EQ(compoe(rele, "A2", &modelo_), "-K1:A2|-K1:A2|-K1:A2|-K1|A2");
+    CEItemLista ingles = campos({{"TAG_FIM", "-K9"}});
+    EXPECT_EQ(compoe(ingles, QString(), &modelo_), "-K9:|-K9:|-K9:|-K9|");
+    modelo_.simbolos["*ORDEM_CONCAT_STD*"] = "0";
+    CEItemLista invertido = campos({{"RELACAO_FIM", "-K1"}});
+    EXPECT_EQ(compoe(invertido, "A2", &modelo_), "A2:-K1|A2:-K1|A2:-K1|-K1|A2");
+    // Nothing to name the element by: empty texts, the connection still kept.
+    CEItemLista nada = campos({{"OUTRO_FIM", "?"}});
+    EXPECT_EQ(compoe(nada, "A2", &modelo_), "||||A2");
+}
+
+TEST_F(EndTextTest, APinIsItsConnectorAndPinAndComesBeforeEverythingElse) {
+    CEItemLista pino =
+        campos({{"CONECTOR_FIM", "-X5"}, {"ID_PINO_FIM", "3"}, {"RELACAO_FIM", "-K1"}});
+    // The pin's own connection attribute does not count: LIG is the pin.
+    EXPECT_EQ(compoe(pino, "A1", &modelo_), "-X5:3|||-X5|3");
+    modelo_.simbolos["*ORDEM_CONCAT_STD*"] = "0";
+    CEItemLista ingles = campos({{"CONECTOR_FIM", "-X5"}, {"ID_PIN_FIM", "4"}});
+    EXPECT_EQ(compoe(ingles, "", &modelo_), "|4:-X5|4:-X5|-X5|4");
+    // A pin field without a connector is no pin.
+    CEItemLista solto = campos({{"ID_PINO_FIM", "3"}, {"RELACAO_FIM", "-K1"}});
+    EXPECT_EQ(compoe(solto, "A1", &modelo_), "A1:-K1|A1:-K1|A1:-K1|-K1|A1");
+}
+
+TEST_F(EndTextTest, APinBlockOnAWireGivesItsConnectorFromTheDrawing) {
+    zvdb::BlockReference* pino =
+        simbolo("PIN-1", {20, 150, 0}, {{"ID_PINO", "3", {25, 145, 0}}}, "9011");
+    pino->setXData("ZV_PINO", zvsample::XDataItems().text("-X5").tags());
+    borne("X1", "1", {20, 200, 0});
+    fio({{20, 190, 0}, {20, 150, 0}}, "12");
+    CCFioDataReader leitor;
+    le(leitor);
+    EXPECT_EQ(cadeias(), QStringList({"X1:1/>-X5:3"}));
+    EXPECT_EQ(itens_[0]->valorCampo("LIG_FIM"), "3");
+}
+
+// ---- ferrules
+
+TEST_F(WireReaderTest, FerrulesBreakTheWireAtEveryElement) {
+    borne("X1", "1", {20, 200, 0});
+    componente("-K1", {{"A1", {20, 150, 0}}});
+    borne("X1", "2", {20, 100, 0});
+    fio({{20, 190, 0}, {20, 150, 0}, {20, 100, 0}}, "12");
+    // An equipment in and out: its two stretches start at it and become one.
+    borne("X2", "1", {120, 200, 0}, kPagina2);
+    zvdb::BlockReference* e =
+        componente("-A1", {{"I1", {120, 170, 0}}, {"I2", {120, 160, 0}}}, "CLP", kPagina2);
+    e->setXData("KVR_ZV_EQUIPO", zvsample::XDataItems().text("EQUIPO").tags());
+    borne("X2", "2", {120, 100, 0}, kPagina2);
+    fio({{120, 190, 0}, {120, 170, 0}, {120, 160, 0}, {120, 100, 0}}, "13", kPagina2);
+    CCFioDataReader leitor;
+    std::unique_ptr<VetorItens> lidos(leitor.LeAnilhas({}, &modelo_, nullptr));
+    itens_.juntarSemRepetir(*lidos);
+    for (const CEItemLista* item : itens_)
+        EXPECT_EQ(item->valorCampo("ZV_LISTA_TIPO"), "ANILHA");
+    EXPECT_EQ(cadeias(), QStringList({"X1:1/>-K1:A1 -K1:A1>X1:2/", "X2:1/>-A1:I1 -A1:I1>-A1:I2"}));
+    EXPECT_EQ(itens_.size(), 4u);
+    // The PAGINAS option keeps the wires of those pages.
+    CCFioDataReader pagina;
+    std::unique_ptr<VetorItens> segunda(
+        pagina.LeAnilhas({{"PAGINAS", QString(kPagina2) + ";"}}, &modelo_, nullptr));
+    ASSERT_EQ(segunda->size(), 2u);
+    for (const CEItemLista* item : *segunda)
+        EXPECT_EQ(item->valorCampo("FIO"), "13");
+    segunda->destruirItens();
+}
+
+}  // namespace
