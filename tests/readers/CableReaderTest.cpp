@@ -197,7 +197,11 @@ TEST_F(CableReaderTest, ALeadOfAnUnknownCableOrABlindConnectionWithoutItsLeadMak
     const zvdb::XRecord* w1 = cabo("W1");
     zvdb::XRecord* semLista = cabo("W2");
     semLista->setXData("KVR_ZV_CABO", zvsample::XDataItems().text("99999\f1").tags());
+    const std::string caminho[] = {"ZV_CABOS"};
+    zvdb::XRecord* semChave = db().dictionaryAt(caminho, true)->getOrCreateXRecord("W3");
+    semChave->setXData("KVR_ZV_ATT_VIRTUAL", zvsample::XDataItems().text("CABO\fW3\fN").tags());
     borne("X1", "1", {0, 0, 0});
+    condutor(semChave, 2, {0, 0, 0}, {0, 30, 0});  // its cable record has no key
     condutor(nullptr, 1, {0, 0, 0}, {0, 30, 0});   // its cable record does not exist
     condutor(semLista, 1, {0, 0, 0}, {0, 30, 0});  // its cable is not listed
     cega("", {5, 0, 0}, {5, 30, 0}, kPagina1);     // no partner
@@ -312,9 +316,17 @@ protected:
     zvsample::GeneratedCounts contagem_;
 };
 
-TEST_F(GeneratedCablesTest, EveryCoreComesOutOnceWithBothEnds) {
+TEST_F(GeneratedCablesTest, EveryCoreComesOutOnceWithBothEndsOnItsOwnPage) {
     ASSERT_GT(contagem_.blindConnections, 0);
+    // As a list command starts: one page shown, the others frozen.
+    ASSERT_EQ(CICad::MostraPagina("COMANDO$0003$A", false), 0);
     VetorItens itens = ler();
+    // Pages lie on top of each other: a window sees the components of the lead's page only.
+    for (const CEItemLista* item : itens)
+        for (const char* lado : {"LAYER_INI", "LAYER_FIM"})
+            if (item->temCampo(lado)) {
+                EXPECT_EQ(item->valorCampo(lado), item->valorCampo("LAYER")) << lado;
+            }
     EXPECT_EQ(int(itens.size()), contagem_.leads + contagem_.blindConnections);
     VetorItens removidos;
     CCCaboDataReader::FundeLados(itens, removidos);
