@@ -181,6 +181,14 @@ public:
     // path does not exist (it is not made).
     static std::vector<std::pair<QString, OdDbObjectId>> GetEntradasDicionario(
         const QStringList& caminho, zvdb::Database* database = nullptr);
+    // ---- what a crossing window sees
+    // The entities of a block definition (the model space for the drawing), in drawing order.
+    static std::vector<OdDbObjectId> GetEntidades(const OdDbObjectId& bloco);
+    // The box a crossing window tests: the entity's extents without attributes; false for an
+    // entity with no extents.
+    static bool GetCaixaSelecao(const OdDbObjectId& entidade, CEPonto& minimo, CEPonto& maximo);
+    // Frozen layers are not shown, so no window selects their entities.
+    static bool LayerCongelado(const QString& nome, zvdb::Database* database = nullptr);
     // Equal within the drawing's tolerance.
     static bool PontosIguais(const CEPonto& a, const CEPonto& b);
 

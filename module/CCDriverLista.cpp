@@ -4,9 +4,11 @@
 #include "ZVResultado.h"
 #include "cad/CICad.h"
 #include "lists/CCBorneGrfWriter.h"
+#include "lists/CCCaboGrfWriter.h"
 #include "lists/CCFioGrfWriter.h"
 #include "lists/CETemplateLisp.h"
 #include "readers/CCBorneDataReader.h"
+#include "readers/CCCaboDataReader.h"
 #include "readers/CCFioDataReader.h"
 
 namespace {
@@ -86,6 +88,13 @@ void CCDriverLista::Executar(TipoLista tipo) {
         ExecutarLista(leitor, escritor, modelo);
         return;
     }
+    if (tipo == TipoLista::Cabos) {
+        CCCaboDataReader leitor;
+        CCCaboGrfWriter escritor;
+        ModeloComSimbolo modelo(caminho, "FUNCAO_LSTGRW");
+        ExecutarLista(leitor, escritor, modelo);
+        return;
+    }
     CCBorneDataReader leitor;
     CCBorneGrfWriter escritor;
     CETemplateLisp modelo(caminho);
@@ -100,7 +109,7 @@ void CCDriverLista::Exporta(const QString& tipo) {
 // The readers and writers of the other lists and of the exports join the drivers as they
 // are built.
 bool CCDriverLista::Disponivel(TipoLista tipo) {
-    return tipo == TipoLista::Bornes || tipo == TipoLista::Fios;
+    return tipo == TipoLista::Bornes || tipo == TipoLista::Fios || tipo == TipoLista::Cabos;
 }
 
 bool CCDriverLista::ExportacaoDisponivel(const QString& tipo) {

@@ -28,4 +28,7 @@ echo "== zvhost: the demo project, the module loaded, the terminal list command"
 echo "== zvhost: the wire list of the same project"
 "$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$OUT/demo.dxf" \
     -o "$OUT/wire-list.dxf" gerarListaFiosGrf
+echo "== zvhost: the cable list of the same project"
+"$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$OUT/demo.dxf" \
+    -o "$OUT/cable-list.dxf" gerarListaCabosGrf
 echo "== results in $OUT"

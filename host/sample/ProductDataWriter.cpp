@@ -180,13 +180,16 @@ std::vector<ListSpec> listSpecs() {
                                     {"VARIAVEL_DESCRICAO", "DESCRICAO", 140, "Descricao"},
                                     {"VARIAVEL_COMPRIMENTO", "COMPRIMENTO", 300, "mm"},
                                     {"VARIAVEL_CAMINHO", "CAMINHOFIO", 330, "Caminho"}};
-    const std::vector<Cell> cable = {{"VARIAVEL_NOME", "NOME", 2, "Via"},
-                                     {"VARIAVEL_REL_INI", "RELACAO_INI", 22, "De"},
-                                     {"VARIAVEL_REL_FIM", "RELACAO_FIM", 72, "Para"},
-                                     {"VARIAVEL_LAYER", "LAYER", 122, "Pagina"}};
-    const std::vector<Cell> cableFirst = {{"VARIAVEL_CABO", "CABO", 2, "Cabo"},
-                                          {"VARIAVEL_CHAVE", "ZV_KEY", 40, "Codigo"},
-                                          {"VARIAVEL_DESCRICAO", "DESCRICAO", 60, "Descricao"}};
+    // A cable's first row on a page names the cable; every row shows one core and its two
+    // ends, composed by the template's zvCaboLado.
+    const std::vector<Cell> cable = {{"VARIAVEL_NOME", "NOME", 150, "Via"},
+                                     {"FUNCAO_DE", "(zvCaboLado \"INI\")", 166, "De"},
+                                     {"FUNCAO_PARA", "(zvCaboLado \"FIM\")", 216, "Para"},
+                                     {"VARIAVEL_LAYER", "LAYER", 266, "Pagina"}};
+    std::vector<Cell> cableFirst = {{"VARIAVEL_CABO", "CABO", 2, "Cabo"},
+                                    {"VARIAVEL_CHAVE", "ZV_KEY", 18, "Codigo"},
+                                    {"VARIAVEL_DESCRICAO", "DESCRICAO", 34, "Descricao"}};
+    cableFirst.insert(cableFirst.end(), cable.begin(), cable.end());
     const std::vector<Cell> material = {
         {"VARIAVEL_QTD", "QTD", 2, "Qtd."},
         {"VARIAVEL_CHAVE", "ZV_KEY", 16, "Codigo"},
@@ -220,8 +223,8 @@ std::vector<ListSpec> listSpecs() {
              cableFirst,
              {},
              {{"VARIAVEL_QTD", "QTD", 30, "Qtd."}},
-             170,
-             2},
+             300,
+             1},
             {"LST_MAT",
              "LISTA DE MATERIAIS",
              material,
@@ -242,7 +245,9 @@ void ProductDataWriter::writeListBlocks() {
             file.save(written_.back());
         };
         BlockFile header, detail, footer, total;
-        headerRow(header, spec.title, spec.detail, 15, 180, spec.columns, spec.width);
+        // A first row shows more than the others: the header titles all its columns.
+        const std::vector<Cell>& titles = spec.first.empty() ? spec.detail : spec.first;
+        headerRow(header, spec.title, titles, 15, 180, spec.columns, spec.width);
         store(header, "_CAB");
         detailRow(detail, spec.detail, spec.width);
         store(detail, "_DET");

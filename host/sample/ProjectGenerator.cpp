@@ -44,6 +44,11 @@ std::string pageName(const std::string& group, int number) {
     return group + "$" + digits + "$A";
 }
 
+// Catalogue keys of cable cores: 20101 is core 1.
+std::string coreKey(int core) {
+    return std::to_string(20100 + core);
+}
+
 std::string keyText(const std::string& key, const std::string& standard) {
     return key + kSep + standard;
 }
@@ -144,7 +149,7 @@ private:
     std::uint64_t addCableRecord(const std::string& name, const std::string& key, int cores,
                                  const std::string& from);
     zvdb::Polyline* drawLead(const std::string& layer, const std::vector<Point3>& points,
-                             const std::string& key, std::uint64_t record, int core);
+                             std::uint64_t record, int core);
     void drawPendingBlind(const std::string& layer);
     void drawFieldSensor(const std::string& layer, int page, double x, const std::string& standard);
     void drawPowerPage();
@@ -503,7 +508,7 @@ void ProjectGenerator::Impl::drawCables(const std::string& layer, const std::vec
             const bool blind = blindLast && c + 1 == xs.size();
             const Point3 from{xs[c], kTerminalY - SymbolLibrary::kTerminalLength};
             const Point3 to{xs[c], blind ? 40.0 : kPinY};
-            zvdb::Polyline* lead = drawLead(layer, {from, to}, key, record, core);
+            zvdb::Polyline* lead = drawLead(layer, {from, to}, record, core);
             if (blind) {
                 pendingBlinds_.push_back({name, lead->handle()});
                 continue;
@@ -536,11 +541,11 @@ std::uint64_t ProjectGenerator::Impl::addCableRecord(const std::string& name,
 
 zvdb::Polyline* ProjectGenerator::Impl::drawLead(const std::string& layer,
                                                  const std::vector<Point3>& points,
-                                                 const std::string& key, std::uint64_t record,
-                                                 int core) {
+                                                 std::uint64_t record, int core) {
     zvdb::Polyline* lead = db_->modelSpace()->addLwPolyline(points, false, layer);
+    // A lead's key is its core's: the catalogue names the core ("1", "2"...).
     setXData(*lead, "KVR_ZV_CABO",
-             XDataItems().text(keyText(key, "1")).handle(record).handle(record));
+             XDataItems().text(keyText(coreKey(core), "1")).handle(record).handle(record));
     setXData(*lead, "KVR_ZV_ATT_VIRTUAL",
              XDataItems().text("NOME" + std::string(1, kSep) + std::to_string(core) + kSep + "N"));
     ++counts.leads;
@@ -630,7 +635,7 @@ void ProjectGenerator::Impl::drawMotorCircuit(const std::string& layer, int m,
         t.key = i < 3 ? "1002" : "1006";
         t.standard = "1";
         drawTerminal(layer, {x, 80}, t);
-        drawLead(layer, {{x, 70}, {x, 40}}, "20005", record, i + 1);
+        drawLead(layer, {{x, 70}, {x, 40}}, record, i + 1);
         if (i == 3)
             drawWire(layer, "PE", {{x, kPowerBusY[3]}, {x, 80}}, "10015", "1");
         else

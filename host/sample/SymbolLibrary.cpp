@@ -57,6 +57,8 @@ void SymbolLibrary::define(zvdb::BlockRecord& block, std::string_view name) {
         return;
     }
     if (startsWith(name, "TOPO_")) return defineBox(block, 6, 12);
+    // Wide enough that its cable's four cores, 10 apart, end on it.
+    if (name == "MOTOR_TRIFASICO") return defineBox(block, 16, 5);
     if (name == "PAGINA_DE") {
         block.addAttributeDefinition("TOTAL", "Pages", "1", {0, 0}, 2.5);
         return;

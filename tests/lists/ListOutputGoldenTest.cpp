@@ -62,10 +62,10 @@ TEST_P(ListOutputGoldenTest, TheTerminalListPrintsTheSameBytesAsBefore) {
 INSTANTIATE_TEST_SUITE_P(
     GeneratedProjects, ListOutputGoldenTest,
     ::testing::Values(
-        Caso{"3", "60", false, "dabddd54bd0c85c8362ea1a1ce445d6583ba2cc8713c90218a20c45701c25c4d"},
-        Caso{"5", "400", true, "b68a42a9a602d69bc4c8a7abed17381e64578d9adb8443a49f40204144bd7a33"},
+        Caso{"3", "60", false, "9e41d30598c501d9fb825d2b787443c47b9f82a5a01d5b400247a85ef09c688b"},
+        Caso{"5", "400", true, "90330a2972bd27fd28ada4d3b6a53e981072373ab879034a5ab2c1d027bb8735"},
         Caso{"11", "2500", true,
-             "a20ef009b32e56c7adfeb7593f4646da5bc275084236b018b58fc11b83708129"}),
+             "e8008924e15cb6c55a4821ea7814b93ad20a07c2799b8251adf252b980bfa2fe"}),
     [](const ::testing::TestParamInfo<Caso>& info) {
         return std::string("seed") + info.param.seed + "_terminals" + info.param.terminais;
     });

@@ -90,7 +90,7 @@ TEST_F(BracketTest, CommandsNotBuiltYetSaySoBeforeAnythingElse) {
     documento_->database()->setCurrentLayer("ESQ$0002$A");
     const QStringList antes = descongelados();
     for (const char* comando :
-         {"gerarListaCabosGrf", "diagramaTopografico", "exportacao", "exportacaoFios"}) {
+         {"gerarListaBornesDwg", "diagramaTopografico", "exportacao", "exportacaoFios"}) {
         const int inicio = saida().size();
         zvsdk::CommandResult resultado{};
         documento_->execute(comando, &resultado);
