@@ -141,7 +141,7 @@ TEST_F(Reliability, AFailedCommandExitsWithThreeAndSavesNothing) {
     EXPECT_FALSE(QFile::exists(out));
 
     // A command this edition does not have says so first: no bracket, no template dialog.
-    run = zvhost({"--quiet", product_->project(), "-o", out, "gerarListaCabosGrf"});
+    run = zvhost({"--quiet", product_->project(), "-o", out, "diagramaTopografico"});
     EXPECT_EQ(run.status, 3);
     EXPECT_TRUE(run.out.contains("not available")) << run.out.toStdString();
     EXPECT_FALSE(run.err.contains("file dialog"));
