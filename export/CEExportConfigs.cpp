@@ -1,6 +1,5 @@
 #include "CEExportConfigs.h"
 
-#include "cad/CICad.h"
 #include "host/sdk/AtomicFile.h"
 #include "readers/ZVString.h"
 
@@ -188,18 +187,6 @@ QString CEExportConfigs::Caminho(const QString& pasta, const QString& arquivo) {
     return pasta + "/" + arquivo;
 }
 
-QString CEExportConfigs::PastaConfig() {
-    return CICad::GetStringLisp("*DIR_ZVCFG*");
-}
-
-void CEExportConfigs::CarregaConfigs() {
-    CarregaDe(PastaConfig());
-}
-
-bool CEExportConfigs::SalvaConfigs(QString* erro) const {
-    return SalvaEm(PastaConfig(), erro);
-}
-
 void CEExportConfigs::CarregaDe(const QString& pasta) {
     const QString novo = Caminho(pasta, kArquivo);
     const QString antigo = Caminho(pasta, kArquivoAntigo);
@@ -219,10 +206,34 @@ void CEExportConfigs::CarregaDe(const QString& pasta) {
                                    std::filesystem::path(QFile::encodeName(novo).toStdString()));
 }
 
+int CEExportConfigs::LinhaMaisLonga(const QByteArray& texto) {
+    int maior = 0;
+    int inicio = 0;
+    while (inicio < texto.size()) {
+        int fim = texto.indexOf('\n', inicio);
+        if (fim < 0) fim = texto.size();
+        int tamanho = fim - inicio;
+        if (tamanho > 0 && texto[inicio + tamanho - 1] == '\r') --tamanho;
+        maior = std::max(maior, tamanho);
+        inicio = fim + 1;
+    }
+    return maior;
+}
+
 bool CEExportConfigs::SalvaEm(const QString& pasta, QString* erro) const {
     const QByteArray bytes = Texto();
+    const QString caminho = Caminho(pasta, kArquivo);
+    // Escapes and written-out flags make a line longer than it was read; one past the
+    // limit would make the whole file read as damaged next time.
+    if (LinhaMaisLonga(bytes) > kMaxLinha) {
+        if (erro)
+            *erro = QStringLiteral("could not save %1: a line would be longer than %2 characters")
+                        .arg(caminho)
+                        .arg(kMaxLinha);
+        return false;
+    }
     return zvsdk::saveFileAtomically(
-        Caminho(pasta, kArquivo), std::string_view(bytes.constData(), size_t(bytes.size())), erro);
+        caminho, std::string_view(bytes.constData(), size_t(bytes.size())), erro);
 }
 
 CEExportConfig* CEExportConfigs::Config(const QString& nome) const {

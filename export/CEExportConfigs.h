@@ -49,7 +49,10 @@ public:
     // new one without leave to overwrite, which fails with std::filesystem::filesystem_error
     // for "copy_file": the damaged file is never replaced silently.
     void CarregaDe(const QString& pasta);
+    // Refuses, keeping the old file, a list with a line too long to be read back.
     bool SalvaEm(const QString& pasta, QString* erro) const;
+    // The length of the longest line of a text, line ends not counted.
+    static int LinhaMaisLonga(const QByteArray& texto);
     // The folder joined with a file name: a separator goes between them unless the folder
     // ends in one or is a bare drive name ("C:"); an absolute file name wins.
     static QString Caminho(const QString& pasta, const QString& arquivo);
