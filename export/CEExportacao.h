@@ -47,6 +47,12 @@ public:
         Xlsx = 10,
     };
 
+    // The command entry of the exports: the dialog (in a scripted host, its answers), the
+    // run with `leitor` reading the project, and what the user is told. Numbered messages
+    // say why nothing was written.
+    using FuncaoLeitor = std::function<std::unique_ptr<VetorItens>(CEExportacao&)>;
+    static void Exporta(const QString& tipoPalavra, FuncaoLeitor leitor);
+
     // Options seeded with their defaults; the four data writers made.
     CEExportacao();
     ~CEExportacao();
@@ -72,7 +78,7 @@ public:
 
     // Reads the project for the kind of list; set by whoever composes the run, since the
     // reader of exports is its own class.
-    std::function<std::unique_ptr<VetorItens>(CEExportacao&)> Leitor;
+    FuncaoLeitor Leitor;
     // The page exports (kind "PAGINAS": PNG, DWG, DWF, DXF, EMF, and PDF by TipoOutPagina).
     // True when the files were written; otherwise Erro says why.
     std::function<bool(CEExportacao&)> ExportaPaginas;
