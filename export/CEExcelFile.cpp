@@ -292,6 +292,10 @@ bool CEExcelFile::Abre(const QString& caminho) {
         erro_ = "the template workbook " + caminho + " can't be read";
         return false;
     }
+    if (arquivo.size() > qint64(kMaxParte)) {
+        erro_ = "the template workbook " + caminho + " is too large to be a template";
+        return false;
+    }
     original_ = arquivo.readAll();
     Arquivo a;
     QByteArray pasta;
