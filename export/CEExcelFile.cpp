@@ -90,6 +90,15 @@ void EscapaXml(std::string& saida, const QByteArray& utf8) {
     }
 }
 
+// Plain ASCII with nothing to escape goes into the sheet as it is.
+bool TextoSimples(const QString& t) {
+    for (const QChar ch : t) {
+        const char16_t c = ch.unicode();
+        if (c < 0x20 || c >= 0x7F || c == '&' || c == '<' || c == '>' || c == '_') return false;
+    }
+    return true;
+}
+
 bool PareceFormula(const QString& t) {
     if (t.isEmpty()) return false;
     const char16_t c = t.front().unicode();
@@ -167,13 +176,15 @@ bool LeEntrada(zip_t* zip, const std::string& nome, QByteArray& bytes) {
     return lidos == zip_int64_t(st.size);
 }
 
-// Adds or replaces an entry; the bytes must live until the archive is closed.
-bool GravaEntrada(zip_t* zip, const std::string& nome, const QByteArray& bytes) {
+// Adds or replaces an entry; the bytes must live until the archive is closed. Sheets are
+// compressed at the fastest level: they are most of the work and shrink well anyway.
+bool GravaEntrada(zip_t* zip, const std::string& nome, const QByteArray& bytes, int nivel = 6) {
     zip_source_t* fonte = zip_source_buffer(zip, bytes.constData(), zip_uint64_t(bytes.size()), 0);
     if (!fonte) return false;
     const zip_int64_t indice = zip_file_add(zip, nome.c_str(), fonte, ZIP_FL_OVERWRITE);
     if (indice < 0) return zip_source_free(fonte), false;
     zip_file_set_mtime(zip, zip_uint64_t(indice), kHoraFixa, 0);
+    zip_set_file_compression(zip, zip_uint64_t(indice), ZIP_CM_DEFLATE, zip_uint32_t(nivel));
     return true;
 }
 
@@ -365,17 +376,30 @@ QByteArray CEExcelFile::PlanilhaNova() const {
     if (primeira >= 0)
         xml += "<dimension ref=\"A" + std::to_string(primeira + 1) + ":" +
                Referencia(ultima, colunas - 1).toStdString() + "\"/>";
+    // Column letters once, not once a cell.
+    std::vector<std::string> letras(size_t(std::max(colunas, 0)));
+    for (int c = 0; c < colunas; ++c) {
+        const QString ref = Referencia(0, c);
+        letras[size_t(c)] = ref.left(ref.size() - 1).toStdString();
+    }
     xml += "<sheetData>";
     for (size_t r = 0; r < linhas_.size(); ++r) {
         if (linhas_[r].empty()) continue;
-        xml += "<row r=\"" + std::to_string(r + 1) + "\">";
+        const std::string numero = std::to_string(r + 1);
+        xml += "<row r=\"" + numero + "\">";
         for (const auto& [coluna, texto] : linhas_[r]) {
-            xml += "<c r=\"" + Referencia(int(r), coluna).toStdString() + "\"";
-            if (PareceFormula(texto)) xml += " s=\"1\"";
-            xml += " t=\"inlineStr\"><is><t";
+            xml += "<c r=\"";
+            xml += letras[size_t(coluna)];
+            xml += numero;
+            xml += PareceFormula(texto) ? "\" s=\"1\" t=\"inlineStr\"><is><t"
+                                        : "\" t=\"inlineStr\"><is><t";
             if (Espacos(texto)) xml += " xml:space=\"preserve\"";
             xml += ">";
-            EscapaXml(xml, CodificaOoxml(texto).toUtf8());
+            if (TextoSimples(texto))
+                for (const QChar ch : texto)
+                    xml += char(ch.unicode());
+            else
+                EscapaXml(xml, CodificaOoxml(texto).toUtf8());
             xml += "</t></is></c>";
         }
         xml += "</row>";
@@ -400,7 +424,8 @@ QByteArray CEExcelFile::NovaPasta() {
         {"xl/worksheets/sheet1.xml", planilha},
     };
     for (const auto& [nome, bytes] : partes)
-        if (!GravaEntrada(a.zip, nome, bytes)) {
+        if (!GravaEntrada(a.zip, nome, bytes,
+                          std::strcmp(nome, "xl/worksheets/sheet1.xml") == 0 ? 1 : 6)) {
             erro_ = QStringLiteral("could not add %1 to the workbook").arg(nome);
             return {};
         }
@@ -543,7 +568,8 @@ QByteArray CEExcelFile::PastaDoModelo() {
 
     QByteArray novaFolha = Xml(folha);
     QByteArray novasRelacoes, novosTipos;
-    if (!GravaEntrada(a.zip, parte, novaFolha)) return falha("its first sheet can't be replaced");
+    if (!GravaEntrada(a.zip, parte, novaFolha, 1))
+        return falha("its first sheet can't be replaced");
     // A formula that was overwritten must leave the calculation chain too; without one the
     // spreadsheet builds it again.
     if (formulaSobrescrita && calcChain) {

@@ -421,7 +421,15 @@ void CEExportacao::Ordena() {
 
 void CEExportacao::Numera(CEItemLista& item, int n) const {
     const QString numero = QString::number(n);
-    const QString data = Hoje.toString(QStringLiteral("ddMMyyyy"));
+    // Day, month and year as eight digits, worked out once a run.
+    if (dataTexto_.isEmpty() || diaTexto_ != Hoje) {
+        diaTexto_ = Hoje;
+        dataTexto_ = QStringLiteral("%1%2%3")
+                         .arg(Hoje.day(), 2, 10, QChar('0'))
+                         .arg(Hoje.month(), 2, 10, QChar('0'))
+                         .arg(Hoje.year(), 4, 10, QChar('0'));
+    }
+    const QString& data = dataTexto_;
     item.definirCampo("SEQUENCIA", numero);
     item.definirCampo("SEQUENCE", numero);
     item.definirCampo("DATA", data);

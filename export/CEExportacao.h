@@ -132,6 +132,8 @@ public:
 
 private:
     void Numera(CEItemLista& item, int n) const;
+    mutable QDate diaTexto_;
+    mutable QString dataTexto_;
 
     std::unique_ptr<CCExportWriter> WriterCsv;
     std::unique_ptr<CCExportWriter> WriterXml;
