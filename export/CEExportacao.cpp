@@ -13,7 +13,6 @@
 #include <algorithm>
 #include <cmath>
 #include <limits>
-#include <unordered_map>
 
 namespace {
 
@@ -271,21 +270,20 @@ void CEExportacao::Seleciona() {
     if (!ItensLidos) return;
 
     // The items of each kind, in the reader's order, in one pass.
-    std::unordered_map<std::u16string, VetorItens> porTipo;
+    static const QString kTipo = QStringLiteral("ZV_LISTA_TIPO");
+    QHash<QString, VetorItens> porTipo;
     for (CEItemLista* item : *ItensLidos) {
         if (!item) continue;
         if (TipoIn == Tudo) {
             Itens->push_back(item);
             continue;
         }
-        const QString tipo = item->valorCampo("ZV_LISTA_TIPO");
-        porTipo[tipo.toStdU16String()].push_back(item);
+        porTipo[item->valorCampo(kTipo)].push_back(item);
     }
     const auto junta = [&](std::initializer_list<const char16_t*> tipos) {
         for (const char16_t* tipo : tipos) {
-            const auto it = porTipo.find(tipo);
-            if (it != porTipo.end())
-                Itens->insert(Itens->end(), it->second.begin(), it->second.end());
+            const auto it = porTipo.constFind(QString::fromUtf16(tipo));
+            if (it != porTipo.constEnd()) Itens->insert(Itens->end(), it->begin(), it->end());
         }
     };
     switch (TipoIn) {
@@ -430,10 +428,14 @@ void CEExportacao::Numera(CEItemLista& item, int n) const {
                          .arg(Hoje.year(), 4, 10, QChar('0'));
     }
     const QString& data = dataTexto_;
-    item.definirCampo("SEQUENCIA", numero);
-    item.definirCampo("SEQUENCE", numero);
-    item.definirCampo("DATA", data);
-    item.definirCampo("DATE", data);
+    static const QString kSequencia = QStringLiteral("SEQUENCIA");
+    static const QString kSequence = QStringLiteral("SEQUENCE");
+    static const QString kData = QStringLiteral("DATA");
+    static const QString kDate = QStringLiteral("DATE");
+    item.definirCampo(kSequencia, numero);
+    item.definirCampo(kSequence, numero);
+    item.definirCampo(kData, data);
+    item.definirCampo(kDate, data);
 }
 
 VetorItens CEExportacao::Agrupa() {

@@ -263,11 +263,16 @@ TEST_P(FalhasEscrita, AFullDiskKeepsTheOldFile) {
     EXPECT_EQ(QDir(pasta.path()).entryList(QDir::Files | QDir::Hidden).size(), 1);
 }
 
-TEST_P(FalhasEscrita, MissingAndReadOnlyFoldersSaySo) {
+TEST_P(FalhasEscrita, AMissingFolderSaysSo) {
     auto writer = Writer();
     EXPECT_FALSE(writer->Escreve(itens, colunas, Caminho("nao/existe/x")));
     EXPECT_TRUE(writer->Erro().startsWith("could not save ")) << writer->Erro().toStdString();
+    EXPECT_TRUE(writer->Erro().contains("No such file or directory"));
+}
+
+TEST_P(FalhasEscrita, AReadOnlyFolderSaysSo) {
     if (geteuid() == 0) GTEST_SKIP() << "root writes into read-only folders";
+    auto writer = Writer();
     ASSERT_TRUE(QDir(pasta.path()).mkdir("ro"));
     const QString alvo = Caminho("ro/x");
     QFile::setPermissions(Caminho("ro"), QFileDevice::ReadOwner | QFileDevice::ExeOwner);
