@@ -7,10 +7,17 @@ foreach(folder IN LISTS ZV_MODULE_FOLDERS)
 endforeach()
 list(REMOVE_ITEM zvl_sources ${PROJECT_SOURCE_DIR}/module/ModuleExports.cpp)
 
+# Workbooks for the XLSX export are zip archives of XML parts.
+# (through pkg-config: Debian's libzip CMake files want its command-line tools too)
+find_package(PkgConfig REQUIRED)
+pkg_check_modules(LIBZIP REQUIRED IMPORTED_TARGET libzip)
+find_package(pugixml REQUIRED)
+
 add_library(zvl_core STATIC ${zvl_sources})
 target_include_directories(zvl_core PUBLIC ${PROJECT_SOURCE_DIR})
 target_link_libraries(zvl_core PUBLIC Qt5::Core Qt5::Gui Qt5::Widgets Qt5::Sql Qt5::Xml
     zvhostcore zvdrawing zvlisp)
+target_link_libraries(zvl_core PRIVATE PkgConfig::LIBZIP pugixml::pugixml)
 
 # Only cad/ sees the host's own headers.
 file(GLOB cad_sources CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/cad/*.cpp)

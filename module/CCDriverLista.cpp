@@ -3,6 +3,7 @@
 #include "ExecutarLista.h"
 #include "ZVResultado.h"
 #include "cad/CICad.h"
+#include "export/CEExportacao.h"
 #include "lists/CCBorneGrfWriter.h"
 #include "lists/CCCaboGrfWriter.h"
 #include "lists/CCFioGrfWriter.h"
@@ -102,8 +103,9 @@ void CCDriverLista::Executar(TipoLista tipo) {
 }
 
 void CCDriverLista::Exporta(const QString& tipo) {
-    Q_UNUSED(tipo);
-    AvisaIndisponivel();
+    if (!ExportacaoDisponivel(tipo)) return AvisaIndisponivel();
+    // The export reader, when it is built, is handed to the run here.
+    CEExportacao::Exporta(tipo, nullptr);
 }
 
 // The readers and writers of the other lists and of the exports join the drivers as they

@@ -72,6 +72,25 @@ std::optional<QString> ConsoleUserInterface::answer(const QString& name, const Q
     return it.value();
 }
 
+std::optional<QString> ConsoleUserInterface::presetAnswer(const QString& name) {
+    auto it = answers_.constFind(name);
+    if (it == answers_.constEnd()) return std::nullopt;
+    return it.value();
+}
+
+QStringList ConsoleUserInterface::presetAnswerNames(const QString& prefix) {
+    QStringList names;
+    for (auto it = answers_.constBegin(); it != answers_.constEnd(); ++it)
+        if (it.key().startsWith(prefix)) names << it.key();
+    names.sort();
+    return names;
+}
+
+void ConsoleUserInterface::showFile(const QString& path) {
+    out_ << path << "\n";
+    out_.flush();
+}
+
 void ConsoleUserInterface::showProgress(const QString& title) {
     progressOpen_ = true;
     progressTitle_ = title;

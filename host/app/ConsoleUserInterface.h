@@ -25,6 +25,10 @@ public:
     QString fileDialog(const QString& name, bool open, const QString& filter,
                        const QString& startPath, const QString& title) override;
     std::optional<QString> answer(const QString& name, const QString& prompt) override;
+    std::optional<QString> presetAnswer(const QString& name) override;
+    QStringList presetAnswerNames(const QString& prefix) override;
+    // Never opens a viewer: prints the path on stdout.
+    void showFile(const QString& path) override;
 
     void showProgress(const QString& title) override;
     void setProgress(int percent, const QString& text) override;

@@ -20,6 +20,20 @@ public:
                                const QString& startPath, const QString& title) = 0;
     // A free answer by name (pickers, prompts); nothing when the user cancels.
     virtual std::optional<QString> answer(const QString& name, const QString& prompt) = 0;
+    // A setting of a dialog that a script may give or leave out: nothing, and no cancel,
+    // when it gives none. Hosts that show their dialogs have none to give.
+    virtual std::optional<QString> presetAnswer(const QString& name) {
+        Q_UNUSED(name);
+        return std::nullopt;
+    }
+    // The names of the settings given that begin with `prefix`, sorted.
+    virtual QStringList presetAnswerNames(const QString& prefix) {
+        Q_UNUSED(prefix);
+        return {};
+    }
+    // A file the command made, for the user to see: a desktop host opens it with the
+    // system's viewer.
+    virtual void showFile(const QString& path) { Q_UNUSED(path); }
 
     // The progress surface: one bar and one line of text (the title until a text is set).
     virtual void showProgress(const QString& title) = 0;
