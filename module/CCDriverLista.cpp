@@ -4,8 +4,11 @@
 #include "ZVResultado.h"
 #include "cad/CICad.h"
 #include "lists/CCBorneGrfWriter.h"
+#include "lists/CCMaterialGrfWriter.h"
 #include "lists/CETemplateLisp.h"
 #include "readers/CCBorneDataReader.h"
+#include "readers/CCMaterialDataReader.h"
+#include "readers/SelecaoPaginas.h"
 
 namespace {
 
@@ -61,10 +64,26 @@ void CCDriverLista::Executar(TipoLista tipo) {
         ZVResultado::Cancelado();
         return;
     }
+    if (tipo == TipoLista::Materiais) return ExecutarMateriais(caminho);
     CCBorneDataReader leitor;
     CCBorneGrfWriter escritor;
     CETemplateLisp modelo(caminho);
     ExecutarLista(leitor, escritor, modelo);
+}
+
+// The material list loads its template before the pipeline does: the page selection
+// depends on the template's symbols.
+void CCDriverLista::ExecutarMateriais(const QString& caminho) {
+    CETemplateLisp modelo(caminho);
+    if (!modelo.Carregar()) {
+        CICad::ImprimeMensagem(88);
+        ZVResultado::Falhou();
+        return;
+    }
+    CESelecao selecao = SelecaoMateriais();
+    CCMaterialDataReader leitor;
+    CCMaterialGrfWriter escritor;
+    ExecutarLista(leitor, escritor, modelo, &selecao);
 }
 
 void CCDriverLista::Exporta(const QString& tipo) {
@@ -75,7 +94,7 @@ void CCDriverLista::Exporta(const QString& tipo) {
 // The readers and writers of the other lists and of the exports join the drivers as they
 // are built.
 bool CCDriverLista::Disponivel(TipoLista tipo) {
-    return tipo == TipoLista::Bornes;
+    return tipo == TipoLista::Bornes || tipo == TipoLista::Materiais;
 }
 
 bool CCDriverLista::ExportacaoDisponivel(const QString& tipo) {
