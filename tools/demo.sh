@@ -25,4 +25,7 @@ export ZV_PRODUCT_DIR="$PRODUCT/"
 echo "== zvhost: the demo project, the module loaded, the terminal list command"
 "$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$OUT/demo.dxf" \
     -o "$OUT/terminal-list.dxf" gerarListaBornesGrf
+echo "== zvhost: the material list command"
+"$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$OUT/demo.dxf" \
+    -o "$OUT/material-list.dxf" gerarListaMateriaisGrf
 echo "== results in $OUT"
