@@ -7,6 +7,7 @@
 #include "app/HostDocument.h"
 #include "cad/CICad.h"
 #include "catalogue/CEConexaoCatalogo.h"
+#include "drawing/Attribute.h"
 #include "drawing/BlockRecord.h"
 #include "drawing/BlockReference.h"
 #include "drawing/Database.h"
