@@ -163,7 +163,8 @@ bool CCMaterialGrfWriter::LinhaItem(const CEItemLista& item, Especificacoes& spe
 }
 
 bool CCMaterialGrfWriter::LinhaTexto(CEItemLista& item, Especificacoes& specs, int r,
-                                     QHash<QString, QString>& mapa, bool ultima, bool& funcao) {
+                                     QHash<QString, QString>& mapa, bool ultima, bool& funcao,
+                                     bool* temLinha) {
     // The expression runs once per member, not once per wrapped row.
     for (CEItemLista* m = &item; m; m = m->ligado) {
         bool publicado = false;
@@ -198,6 +199,7 @@ bool CCMaterialGrfWriter::LinhaTexto(CEItemLista& item, Especificacoes& specs, i
                 v = v.mid(corte).trimmed();
             }
             mapa[s.texto] = linha;
+            if (temLinha && !linha.isEmpty()) *temLinha = true;
             if (!linha.isEmpty() && (!v.isEmpty() || !ultima)) conteudo = true;
             if (!linha.isEmpty() && EhFuncao(s.tag)) funcao = true;
         }
@@ -323,7 +325,11 @@ std::vector<CEPaginaLista> CCMaterialGrfWriter::Diagrama(VetorItens& entrada, CE
         QHash<QString, QString> mapa;
         bool funcao = false;
         const bool a = LinhaItem(item, specs, r, mapa);
-        const bool b = LinhaTexto(item, specs, r, mapa, g.contagem + 1 >= g.linhas, funcao);
+        bool temLinha = false;
+        const bool b =
+            LinhaTexto(item, specs, r, mapa, g.contagem + 1 >= g.linhas, funcao, &temLinha);
+        // `pede`: the item wants a further row. A last line on a column's last row asks for
+        // none, but is still drawn: its text must not be lost.
         const bool pede = a || funcao || b;
         CEItemLista* linhaItem = nullptr;
         if (r == 0) {
@@ -331,7 +337,7 @@ std::vector<CEPaginaLista> CCMaterialGrfWriter::Diagrama(VetorItens& entrada, CE
             paginaPrimeira = paginas.size() - 1;
             linhaPrimeira = paginas.back().linhas.size() - 1;
             linhaItem = &item;
-        } else if (multi && pede) {
+        } else if (multi && (pede || temLinha)) {
             auto continua = std::make_shared<CEItemLista>();
             if (EhAcessorio(item)) continua->definirCampo("ZV_LISTA_TIPO", "ACE");
             linhaItem = continua.get();

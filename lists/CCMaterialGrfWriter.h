@@ -43,7 +43,8 @@ public:
     static bool LinhaItem(const CEItemLista& item, Especificacoes& specs, int r,
                           QHash<QString, QString>& mapa);
     static bool LinhaTexto(CEItemLista& item, Especificacoes& specs, int r,
-                           QHash<QString, QString>& mapa, bool ultima, bool& funcao);
+                           QHash<QString, QString>& mapa, bool ultima, bool& funcao,
+                           bool* temLinha = nullptr);
 
     Especificacoes especificacoes, especificacoesAce;
     // Field names the total block sums, and their sums.
