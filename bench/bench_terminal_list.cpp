@@ -105,7 +105,7 @@ int main(int argc, char** argv) {
     QStringList sizes = app.arguments().mid(1);
     if (sizes.isEmpty()) sizes = QStringList{"20000", "80000"};
     // Every list command the module has today; the others join as they land.
-    const QStringList comandos{"gerarListaBornesGrf"};
+    const QStringList comandos{"gerarListaBornesGrf", "gerarListaMateriaisGrf"};
     QTemporaryDir folder;
     const QString data = folder.filePath("data"), product = folder.filePath("product") + "/";
     QDir().mkpath(data);

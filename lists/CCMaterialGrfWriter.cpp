@@ -82,13 +82,14 @@ void CCMaterialGrfWriter::SomaGrupos(VetorItens& itens, int digitos) {
             feitos.insert(m);
         }
         const bool inteiro = std::isfinite(qtd) && qtd == std::trunc(qtd) && std::abs(qtd) < 2e9;
+        // One text per group, shared by its members.
+        const QString textoQtd =
+            inteiro ? QString::number(int(qtd)) : ZVString::DeReal(qtd, digitos);
+        const QString textoComprimento = ZVString::DeReal(comprimento, digitos);
         for (CEItemLista* m = item; m; m = m->ligado) {
-            if (inteiro)
-                m->definirCampoInteiro("QTD", int(qtd));
-            else
-                m->definirCampoReal("QTD", qtd, digitos);
-            m->definirCampoReal("COMPRIMENTO", comprimento, digitos);
-            m->definirCampoReal("LENGTH", comprimento, digitos);
+            m->definirCampo("QTD", textoQtd);
+            m->definirCampo("COMPRIMENTO", textoComprimento);
+            m->definirCampo("LENGTH", textoComprimento);
             if (m->ligado == item) break;
         }
     }

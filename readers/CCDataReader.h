@@ -148,6 +148,8 @@ private:
     bool rotasLidas_ = false;
     QHash<QString, QHash<QString, QString>> caminhos_;
     QSet<QString> nomesCampos_;
+    // Per accessory key and standard: the fields of a unit, and its user columns.
+    QHash<QString, CEItemLista> basesAcessorio_, basesColunas_;
     CECacheCatalogo catalogo_;
     double tolerancia_;
 };

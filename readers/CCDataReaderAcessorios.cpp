@@ -58,16 +58,30 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
             Conta(textos[i + 1], ZVString(textos[i]).ParaInteiro(), contados, zerados);
     }
 
-    auto novoItem = [&](const QString& chave) {
-        auto* item = new CEItemLista;
-        item->definirCampo("ZV_LISTA_TIPO", "ACE");
-        item->definirCampo("ZV_LISTA", catalogo_.ListaComp(chave, norma));
-        item->definirCampo("ZV_KEY", chave);
+    // The fields every unit of an accessory key starts with, made once per key and standard
+    // and shared by the units' copies until one of them changes.
+    auto base = [&](const QString& chave) -> const CEItemLista& {
+        const QString nome = chave + QChar(0x1F) + norma;
+        auto it = basesAcessorio_.constFind(nome);
+        if (it != basesAcessorio_.constEnd()) return it.value();
+        CEItemLista item;
+        item.definirCampo("ZV_LISTA_TIPO", "ACE");
+        item.definirCampo("ZV_LISTA", catalogo_.ListaComp(chave, norma));
+        item.definirCampo("ZV_KEY", chave);
         const QString descricao = catalogo_.DescricaoComp(chave);
-        item->definirCampo("DESCRICAO", descricao);
-        item->definirCampo("TP_DESCRI", descricao);
-        return item;
+        item.definirCampo("DESCRICAO", descricao);
+        item.definirCampo("TP_DESCRI", descricao);
+        CEItemLista colunas;
+        LeColunasUsuario(QString(), colunas, catalogo_.ColunasComp(chave));
+        basesAcessorio_.insert(nome, item);
+        basesColunas_.insert(nome, colunas);
+        return basesAcessorio_[nome];
     };
+    auto colunas = [&](const QString& chave) -> const CEItemLista& {
+        base(chave);
+        return basesColunas_[chave + QChar(0x1F) + norma];
+    };
+    auto novoItem = [&](const QString& chave) { return new CEItemLista(base(chave)); };
 
     VetorItens resultado;
     const bool recursivo = modelo && modelo->LerLogico("PBLACERECUR");
@@ -89,11 +103,13 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
                     if (dono.obterCampo(nome, valor)) item->definirCampo(nome, valor);
                 }
         }
-        std::unique_ptr<CEItemLista> base(novoItem(chave));
-        item->copiarCampos(*base);
+        if (item->campos.isEmpty())
+            item->campos = base(chave).campos;
+        else
+            item->copiarCampos(base(chave));
         const QString qtd = dono.valorCampo("QTD");
         item->definirCampo("QTD", qtd.isEmpty() ? QStringLiteral("1") : qtd);
-        LeColunasUsuario(QString(), *item, catalogo_.ColunasComp(chave));
+        item->copiarCampos(colunas(chave));
         const bool listado = item->valorCampo("ZV_LISTA") == "S";
         if (listado && modelo && !modelo->FiltraItem(*item)) {
             delete item;
@@ -112,7 +128,7 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
         if (contados.contains(chave)) continue;
         CEItemLista* item = novoItem(chave);
         item->definirCampo("QTD", "0");
-        LeColunasUsuario(QString(), *item, catalogo_.ColunasComp(chave));
+        item->copiarCampos(colunas(chave));
         if (item->valorCampo("ZV_LISTA") == "S" && (!modelo || modelo->FiltraItem(*item)))
             resultado.push_back(item);
         else

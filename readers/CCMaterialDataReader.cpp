@@ -98,15 +98,13 @@ VetorItens* CCMaterialDataReader::LerDados(zvdb::Database* database,
     if (f == "4" || f == "3") {
         std::unique_ptr<VetorItens> cabos(LeDicionarioCabos(database));
         for (CEItemLista* cabo : *cabos)
-            resultado_.push_back(cabo);
+            Guarda(cabo);
     }
     Agrupa(resultado_, modelo);
     resultado_.ordenar(modelo.LerListaTexto("*LISTA_DE_SORT*"));
     if (modelo.LerTexto("*ORDEM_CRESCENTE*") != "C") resultado_.inverter();
     if (simbolos_.vinculos == 1) IntercalaAcessorios(modelo);
     progresso.Definir(100);
-    for (CEItemLista* item : resultado_)
-        if (item) PartilhaNomes(*item);
     auto* itens = new VetorItens(std::move(resultado_));
     resultado_.clear();
     return itens;
@@ -119,14 +117,20 @@ bool CCMaterialDataReader::Adiciona(CEItemLista* item, bool barramento) {
         relacoes_.insert(relacao);
         if (!nova) return false;
     }
-    resultado_.push_back(item);
+    Guarda(item);
     return true;
+}
+
+void CCMaterialDataReader::Guarda(CEItemLista* item) {
+    // Kept items share their field names from the start: a large list holds millions.
+    PartilhaNomes(*item);
+    resultado_.push_back(item);
 }
 
 void CCMaterialDataReader::AdicionaAcessorios(CEItemLista& item, CETemplate& modelo) {
     // Accessories are new items: nothing of them can be in the result yet.
     for (CEItemLista* acessorio : ExpandeAcessorios(item, nullptr, &modelo, {}, QString()))
-        resultado_.push_back(acessorio);
+        Guarda(acessorio);
 }
 
 void CCMaterialDataReader::LeBlocos(zvdb::Database* database,
@@ -212,7 +216,7 @@ void CCMaterialDataReader::LePinos(zvdb::Database* database, CETemplate& modelo)
             conectores_.insert(nomeConector);
             CEItemLista* item = CriaItemChave(nomeConector, pino[1].texto, pino[2].texto);
             if (Listado(*item, modelo))
-                resultado_.push_back(item);
+                Guarda(item);
             else
                 delete item;
         }
@@ -274,7 +278,7 @@ void CCMaterialDataReader::LeFios(zvdb::Database* database,
             atual->ligado = seguinte;
             atual = seguinte;
         }
-        resultado_.push_back(item.release());
+        Guarda(item.release());
     }
 }
 

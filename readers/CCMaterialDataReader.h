@@ -39,6 +39,7 @@ protected:
 
     // A listed item: a bus bar whose RELACAO was seen already is dropped; true if kept.
     bool Adiciona(CEItemLista* item, bool barramento);
+    void Guarda(CEItemLista* item);
 
     Simbolos simbolos_;
     VetorItens resultado_;
