@@ -79,6 +79,8 @@ VetorItens* CCMaterialDataReader::LerDados(zvdb::Database* database,
                                            CETemplate& modelo, CIProgress& progresso) {
     // A solution project that no file answered for has nothing to read.
     if (!database) return nullptr;
+    // The product's LISP side answers for the active drawing only.
+    const bool ativa = database == CICad::GetDatabase();
     DatabaseLida lida(database);
     resultado_.clear();
     vistos_.clear();
@@ -93,7 +95,9 @@ VetorItens* CCMaterialDataReader::LerDados(zvdb::Database* database,
         LePinos(database, modelo);
     }
     progresso.Definir(70);
-    if (f == "2" || f == "3") LeFios(database, paginas, modelo);
+    // Wires come from the LISP side, which knows only the active drawing: a drawing read
+    // beside it gives its symbols and cables, not its wires.
+    if ((f == "2" || f == "3") && ativa) LeFios(database, paginas, modelo);
     progresso.Definir(90);
     if (f == "4" || f == "3") {
         std::unique_ptr<VetorItens> cabos(LeDicionarioCabos(database));

@@ -162,6 +162,31 @@ TEST_F(MaterialReaderTest, SelectedPagesLimitSymbolsAndLeaveOutVirtualOnes) {
     EXPECT_EQ(leitor.LerDados(nullptr, std::nullopt, modelo, progresso), nullptr);
 }
 
+TEST_F(MaterialReaderTest, ADrawingReadBesideTheActiveOneGivesItsOwnSymbols) {
+    Simbolo("K", "SY", "ESQ$0001$A");
+    zvdb::Database lado;
+    lado.createLayer("ESQ$0001$A");
+    zvdb::BlockRecord* bloco = lado.createBlock("K");
+    for (double x : {0.0, 10.0}) {
+        zvdb::BlockReference* ref =
+            lado.modelSpace()->addBlockReference(*bloco, {x, 0, 0}, {1, 1, 1}, 0, "ESQ$0001$A");
+        CICad::SetXData(OdDbObjectId(&lado, ref->handle()), "KVR_ZV",
+                        {{1000, QString("SO") + QChar(0x0C) + "1"}});
+    }
+    modelo.simbolos["PROC_SIMB_BARR"] = "3";
+    CCMaterialDataReader leitor;
+    CIProgress progresso;
+    std::unique_ptr<VetorItens> itens(leitor.LerDados(&lado, std::nullopt, modelo, progresso));
+    ASSERT_EQ(itens->size(), 1u);
+    EXPECT_EQ(itens->at(0)->valorCampo("ZV_KEY"), "SO");
+    ASSERT_NE(itens->at(0)->ligado, nullptr);
+    EXPECT_EQ(itens->at(0)->ligado->ligado, nullptr);
+    // The active drawing is the facade's default again afterwards.
+    EXPECT_EQ(CICad::GetDatabase(), &db());
+    delete itens->at(0)->ligado;
+    delete itens->at(0);
+}
+
 TEST_F(MaterialReaderTest, GroupingAHundredThousandItemsStaysNearLinear) {
     VetorItens itens;
     for (int i = 0; i < 100000; ++i) {
