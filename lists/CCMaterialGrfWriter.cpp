@@ -52,21 +52,21 @@ struct Grade {
 
 CCMaterialGrfWriter::itemDet CCMaterialGrfWriter::LeEspecificacao(const QString& tag,
                                                                   const QString& texto) {
-    itemDet spec;
-    spec.tag = tag;
-    spec.texto = texto;
-    if (texto.startsWith('%')) return spec;
+    itemDet det;
+    det.tag = tag;
+    det.texto = texto;
+    if (texto.startsWith('%')) return det;
     const QStringList partes = ZVString(texto).Divide("%");
-    if (partes.size() < 2) return spec;
-    spec.campo = partes[0];
+    if (partes.size() < 2) return det;
+    det.campo = partes[0];
     const QStringList quatro = ZVString(partes[1]).Divide("$");
-    if (quatro.size() < 4) return spec;
-    spec.modo = quatro[0];
-    spec.limite = ZVString(quatro[1]).ParaInteiro();
-    spec.submodo = quatro[2];
-    spec.separador = quatro[3];
-    spec.valido = true;
-    return spec;
+    if (quatro.size() < 4) return det;
+    det.modo = quatro[0];
+    det.limite = ZVString(quatro[1]).ParaInteiro();
+    det.submodo = quatro[2];
+    det.separador = quatro[3];
+    det.valido = true;
+    return det;
 }
 
 void CCMaterialGrfWriter::SomaGrupos(VetorItens& itens, int digitos) {
@@ -100,16 +100,16 @@ void CCMaterialGrfWriter::SomaGrupos(VetorItens& itens, int digitos) {
         }
 }
 
-bool CCMaterialGrfWriter::LinhaItem(const CEItemLista& item, Especificacoes& specs, int r,
+bool CCMaterialGrfWriter::LinhaItem(const CEItemLista& item, Especificacoes& defs, int r,
                                     QHash<QString, QString>& mapa) {
     bool conteudo = false;
-    for (itemDet& s : specs)
+    for (itemDet& s : defs)
         s.contador = 0;
-    std::vector<QString> atual(specs.size());
-    std::vector<QSet<QString>> vistos(specs.size());
+    std::vector<QString> atual(defs.size());
+    std::vector<QSet<QString>> vistos(defs.size());
     for (const CEItemLista* m = &item; m; m = m->ligado) {
-        for (size_t k = 0; k < specs.size(); ++k) {
-            itemDet& s = specs[k];
+        for (size_t k = 0; k < defs.size(); ++k) {
+            itemDet& s = defs[k];
             if (!s.valido) continue;
             if (s.modo.compare("M", Qt::CaseInsensitive) != 0) {
                 if (++s.contador == r) mapa[s.texto] = m->valorCampo(s.campo);
@@ -132,7 +132,7 @@ bool CCMaterialGrfWriter::LinhaItem(const CEItemLista& item, Especificacoes& spe
         }
     }
     for (int k = 0; k <= r; ++k)
-        for (itemDet& s : specs) {
+        for (itemDet& s : defs) {
             if (!s.valido || CampoSemFamilia(s.campo)) continue;
             if (s.submodo == "C") {
                 QString texto = item.valorCampo(s.campo);
@@ -152,8 +152,8 @@ bool CCMaterialGrfWriter::LinhaItem(const CEItemLista& item, Especificacoes& spe
                 }
             }
         }
-    for (size_t k = 0; k < specs.size(); ++k) {
-        const itemDet& s = specs[k];
+    for (size_t k = 0; k < defs.size(); ++k) {
+        const itemDet& s = defs[k];
         if (s.valido && s.modo.compare("M", Qt::CaseInsensitive) == 0 && s.submodo == "C" &&
             s.contador == r) {
             mapa[s.texto] = atual[k];
@@ -163,13 +163,13 @@ bool CCMaterialGrfWriter::LinhaItem(const CEItemLista& item, Especificacoes& spe
     return conteudo;
 }
 
-bool CCMaterialGrfWriter::LinhaTexto(CEItemLista& item, Especificacoes& specs, int r,
+bool CCMaterialGrfWriter::LinhaTexto(CEItemLista& item, Especificacoes& defs, int r,
                                      QHash<QString, QString>& mapa, bool ultima, bool& funcao,
                                      bool* temLinha) {
     // The expression runs once per member, not once per wrapped row.
     for (CEItemLista* m = &item; m; m = m->ligado) {
         bool publicado = false;
-        for (const itemDet& s : specs) {
+        for (const itemDet& s : defs) {
             if (!s.valido || s.modo.compare("M", Qt::CaseInsensitive) != 0 || !EhFuncao(s.tag))
                 continue;
             if (m->temCampo(s.campo + kCache)) continue;
@@ -181,7 +181,7 @@ bool CCMaterialGrfWriter::LinhaTexto(CEItemLista& item, Especificacoes& specs, i
     }
     bool conteudo = false;
     for (const CEItemLista* m = &item; m; m = m->ligado)
-        for (const itemDet& s : specs) {
+        for (const itemDet& s : defs) {
             if (!s.valido || s.modo.compare("M", Qt::CaseInsensitive) != 0 || s.submodo == "C")
                 continue;
             QString v = m->valorCampo(s.campo).trimmed();
@@ -321,14 +321,14 @@ std::vector<CEPaginaLista> CCMaterialGrfWriter::Diagrama(VetorItens& entrada, CE
     int r = 0;
     for (int i = 0; i < n;) {
         CEItemLista& item = *itens[size_t(i)];
-        Especificacoes& specs = EhAcessorio(item) ? especificacoesAce : especificacoes;
+        Especificacoes& defs = EhAcessorio(item) ? especificacoesAce : especificacoes;
         const float hh = altura(item);
         QHash<QString, QString> mapa;
         bool funcao = false;
-        const bool a = LinhaItem(item, specs, r, mapa);
+        const bool a = LinhaItem(item, defs, r, mapa);
         bool temLinha = false;
         const bool b =
-            LinhaTexto(item, specs, r, mapa, g.contagem + 1 >= g.linhas, funcao, &temLinha);
+            LinhaTexto(item, defs, r, mapa, g.contagem + 1 >= g.linhas, funcao, &temLinha);
         // `pede`: the item wants a further row. A last line on a column's last row asks for
         // none, but is still drawn: its text must not be lost.
         const bool pede = a || funcao || b;
@@ -388,13 +388,12 @@ std::vector<CEPaginaLista> CCMaterialGrfWriter::Diagrama(VetorItens& entrada, CE
 }
 
 void CCMaterialGrfWriter::LeEspecificacoes(const std::vector<CCListaPaginada::Bloco>& blocos) {
-    auto le = [](const CCListaPaginada::Bloco& bloco, Especificacoes& specs) {
-        specs.clear();
+    auto le = [](const CCListaPaginada::Bloco& bloco, Especificacoes& defs) {
+        defs.clear();
         if (!bloco.existe()) return;
         const auto definicoes = CICad::GetDefinicoesAtributos(bloco.arquivo, bloco.nome);
         for (int i = 0; definicoes && i < definicoes->Quantidade(); ++i)
-            specs.push_back(
-                LeEspecificacao((*definicoes)[i].GetTag(), (*definicoes)[i].GetValor()));
+            defs.push_back(LeEspecificacao((*definicoes)[i].GetTag(), (*definicoes)[i].GetValor()));
     };
     le(blocos[1], especificacoes);
     le(blocos[2], especificacoesAce);

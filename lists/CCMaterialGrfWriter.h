@@ -35,14 +35,14 @@ public:
     // every member; SEQUENCIA and SEQUENCE on each entry.
     static void SomaGrupos(VetorItens& itens, int digitos);
     // The page layout, without touching the drawing. `especificacoes` and `especificacoesAce`
-    // are the detail and accessory specs (normally read from the blocks).
+    // are the detail and accessory defs (normally read from the blocks).
     std::vector<CEPaginaLista> Diagrama(VetorItens& itens, CETemplate& modelo);
 
-    // The texts of row `r` of an item, in `mapa` by each spec's default text; whether the
+    // The texts of row `r` of an item, in `mapa` by each det's default text; whether the
     // row has content of its own.
-    static bool LinhaItem(const CEItemLista& item, Especificacoes& specs, int r,
+    static bool LinhaItem(const CEItemLista& item, Especificacoes& defs, int r,
                           QHash<QString, QString>& mapa);
-    static bool LinhaTexto(CEItemLista& item, Especificacoes& specs, int r,
+    static bool LinhaTexto(CEItemLista& item, Especificacoes& defs, int r,
                            QHash<QString, QString>& mapa, bool ultima, bool& funcao,
                            bool* temLinha = nullptr);
 

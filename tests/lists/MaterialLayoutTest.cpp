@@ -1,4 +1,4 @@
-// The material list's pages laid out in memory: row specs, wrapping, multi-row items at a
+// The material list's pages laid out in memory: row defs, wrapping, multi-row items at a
 // column's end, breaks, blank rows, group sums, totals and the cached template functions.
 #include "QtPrinters.h"
 #include "TemplateDouble.h"
@@ -48,7 +48,7 @@ protected:
         itens.push_back(item);
         return item;
     }
-    // Each page as its rows: the text of the description spec, or "-" for a blank row.
+    // Each page as its rows: the text of the description det, or "-" for a blank row.
     QStringList Paginas() {
         paginas = escritor.Diagrama(itens, modelo);
         QStringList texto;
@@ -75,7 +75,7 @@ protected:
     std::vector<CEPaginaLista> paginas;
 };
 
-TEST_F(MaterialLayoutTest, RowSpecsNeedAllFourParts) {
+TEST_F(MaterialLayoutTest, RowDefinitionsNeedAllFourParts) {
     const Writer::itemDet d = Writer::LeEspecificacao("VARIAVEL_D", "DESCRICAO%M$40$L$ %");
     EXPECT_TRUE(d.valido);
     EXPECT_EQ(d.campo, "DESCRICAO");
@@ -150,7 +150,7 @@ TEST_F(MaterialLayoutTest, KeyChangesBreakPagesOrLeaveBlankRowsAndBlankRowsFollo
     Paginas();
     ASSERT_EQ(paginas.size(), 1u);
     EXPECT_DOUBLE_EQ(paginas[0].linhas[1].y, 90.0);  // one row left free after "x"
-    // Without row specs each item is one row; one blank row after each.
+    // Without row defs each item is one row; one blank row after each.
     escritor.especificacoes = {Writer::LeEspecificacao("VARIAVEL_QTD", "QTD")};
     modelo.simbolos["*ZV_CHAVE_QUEBRA_PAGINA*"] = QStringList{};
     modelo.simbolos["*NUM_LINHAS_BRANCO*"] = 1;
