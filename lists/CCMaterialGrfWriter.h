@@ -35,7 +35,7 @@ public:
     // every member; SEQUENCIA and SEQUENCE on each entry.
     static void SomaGrupos(VetorItens& itens, int digitos);
     // The page layout, without touching the drawing. `especificacoes` and `especificacoesAce`
-    // are the detail and accessory defs (normally read from the blocks).
+    // are the row definitions of the detail and accessory blocks (read from the blocks).
     std::vector<CEPaginaLista> Diagrama(VetorItens& itens, CETemplate& modelo);
 
     // The texts of row `r` of an item, in `mapa` by each det's default text; whether the
