@@ -106,7 +106,8 @@ int main(int argc, char** argv) {
     if (sizes.isEmpty()) sizes = QStringList{"20000", "80000"};
     // Every list command the module has today; the others join as they land.
     // The wire list measures along the generated projects' layout routes.
-    const QStringList comandos{"gerarListaBornesGrf", "gerarListaFiosGrf", "gerarListaCabosGrf"};
+    const QStringList comandos{"gerarListaBornesGrf", "gerarListaFiosGrf", "gerarListaMateriaisGrf",
+                               "gerarListaCabosGrf"};
     QTemporaryDir folder;
     const QString data = folder.filePath("data"), product = folder.filePath("product") + "/";
     QDir().mkpath(data);

@@ -55,6 +55,14 @@ public:
     // The override when one is set, else the active document's database, else null.
     static zvdb::Database* GetDatabase();
     static void SetDatabaseOverride(zvdb::Database* database);
+    // The open documents that have a database, in document order, each with its drawing's
+    // name (the system variable DWGNAME: the file name without its folder).
+    static std::vector<std::pair<QString, zvdb::Database*>> GetDesenhosAbertos();
+    // A drawing file read as a side database, not opened as a document; null (with a line on
+    // the command line) when it can't be read. It lives as long as its last reference.
+    static std::shared_ptr<zvdb::Database> AbreDesenhoLateral(const QString& arquivo);
+    // The database's drawing name as DWGNAME gives it; empty when no document holds it.
+    static QString GetNomeDesenho(zvdb::Database* database = nullptr);
 
     // ---- layers
     static QStringList GetLayers(zvdb::Database* database = nullptr);

@@ -7,10 +7,13 @@
 #include "lists/CCBorneGrfWriter.h"
 #include "lists/CCCaboGrfWriter.h"
 #include "lists/CCFioGrfWriter.h"
+#include "lists/CCMaterialGrfWriter.h"
 #include "lists/CETemplateLisp.h"
 #include "readers/CCBorneDataReader.h"
 #include "readers/CCCaboDataReader.h"
 #include "readers/CCFioDataReader.h"
+#include "readers/CCMaterialDataReader.h"
+#include "readers/SelecaoPaginas.h"
 
 namespace {
 
@@ -96,10 +99,26 @@ void CCDriverLista::Executar(TipoLista tipo) {
         ExecutarLista(leitor, escritor, modelo);
         return;
     }
+    if (tipo == TipoLista::Materiais) return ExecutarMateriais(caminho);
     CCBorneDataReader leitor;
     CCBorneGrfWriter escritor;
     CETemplateLisp modelo(caminho);
     ExecutarLista(leitor, escritor, modelo);
+}
+
+// The material list loads its template before the pipeline does: the page selection
+// depends on the template's symbols.
+void CCDriverLista::ExecutarMateriais(const QString& caminho) {
+    CETemplateLisp modelo(caminho);
+    if (!modelo.Carregar()) {
+        CICad::ImprimeMensagem(88);
+        ZVResultado::Falhou();
+        return;
+    }
+    CESelecao selecao = SelecaoMateriais();
+    CCMaterialDataReader leitor;
+    CCMaterialGrfWriter escritor;
+    ExecutarLista(leitor, escritor, modelo, &selecao);
 }
 
 void CCDriverLista::Exporta(const QString& tipo) {
@@ -111,7 +130,8 @@ void CCDriverLista::Exporta(const QString& tipo) {
 // The readers and writers of the other lists and of the exports join the drivers as they
 // are built.
 bool CCDriverLista::Disponivel(TipoLista tipo) {
-    return tipo == TipoLista::Bornes || tipo == TipoLista::Fios || tipo == TipoLista::Cabos;
+    return tipo == TipoLista::Bornes || tipo == TipoLista::Fios || tipo == TipoLista::Materiais ||
+           tipo == TipoLista::Cabos;
 }
 
 bool CCDriverLista::ExportacaoDisponivel(const QString& tipo) {

@@ -18,4 +18,7 @@ public:
     static bool Disponivel(TipoLista tipo);
     static bool ExportacaoDisponivel(const QString& tipo);
     static void AvisaIndisponivel();
+
+private:
+    static void ExecutarMateriais(const QString& caminho);
 };

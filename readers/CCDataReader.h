@@ -20,7 +20,8 @@ class Database;
 }
 namespace zv {
 class CEAtributo;
-}
+class CEListaAtributos;
+}  // namespace zv
 class CETemplate;
 class CIProgress;
 
@@ -79,6 +80,13 @@ public:
     CEItemLista* CriaItemVirtual(const OdDbObjectId& registro);
     CEItemLista* CriaItemEntidade(const OdDbObjectId& entidade, CETemplate& modelo);
     CEItemLista* CriaItemChave(const QString& relacao, const QString& chave, const QString& norma);
+
+    // ---- accessories
+    // The owner's accessories from the catalogue and the symbol's own ZV_VINC_ADITIVO, each
+    // unit an item marked "ACE"; with a template and PBLACERECUR, accessories of
+    // accessories too, stopped by the keys in `caminho` (callers pass an empty list).
+    VetorItens ExpandeAcessorios(CEItemLista& dono, const zv::CEListaAtributos* atributos,
+                                 CETemplate* modelo, QStringList caminho, const QString& norma);
 
     // ---- routes of the manual wire layout
     // Reads the routes of a wire once: from the first stored route record of the key that
@@ -148,6 +156,8 @@ private:
     QSet<QString> nomesCampos_;
     // Catalogue column texts split into name and value (an empty name: not a column).
     QHash<QString, std::pair<QString, QString>> colunasDivididas_;
+    // Per accessory key and standard: the fields of a unit, and its user columns.
+    QHash<QString, CEItemLista> basesAcessorio_, basesColunas_;
     CECacheCatalogo catalogo_;
     double tolerancia_;
 };

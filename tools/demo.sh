@@ -31,4 +31,7 @@ echo "== zvhost: the wire list of the same project"
 echo "== zvhost: the cable list of the same project"
 "$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$OUT/demo.dxf" \
     -o "$OUT/cable-list.dxf" gerarListaCabosGrf
+echo "== zvhost: the material list command"
+"$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$OUT/demo.dxf" \
+    -o "$OUT/material-list.dxf" gerarListaMateriaisGrf
 echo "== results in $OUT"

@@ -1,5 +1,5 @@
 // Templates and the other services: ZVCarregaTemplate, zvBuild, BuscarCoordenadas,
-// zvGetCircuitoLocalInfo, zvsolution_isloaded, zvsolution_getProjFile,
+// zvGetCircuitoLocalInfo, zvsolution_load, zvsolution_isloaded, zvsolution_getProjFile,
 // zv_interno_get_idioma_corrente, atualizarMacros, atualizaTopografico,
 // zvAlternaStatusBloqueioPalette, zvExportaLayerDxf, zvExportaLayer.
 #include "DrawingStamp.h"
@@ -15,6 +15,8 @@
 #include "drawing/Entity.h"
 #include "lisp/LispFile.h"
 
+#include <QDir>
+#include <QFile>
 #include <QFileInfo>
 
 #include <cmath>
@@ -132,6 +134,31 @@ Value projectFile(Interpreter& lisp, const QString& key) {
     return Value();
 }
 
+// A solution file: one project drawing a line, relative to the file's folder; blank lines
+// and lines that begin with ";" say nothing. The projects become *ZV_SOLUCAO*.
+Value loadSolution(Interpreter& lisp, const ProductContext& context, const QString& path) {
+    QFile file(path);
+    if (!file.open(QIODevice::ReadOnly)) {
+        print(context, "\nzvsolution_load: can't read " + path + "\n");
+        return Value();
+    }
+    const QDir folder = QFileInfo(path).absoluteDir();
+    QStringList projects;
+    for (const QString& raw : QString::fromUtf8(file.readAll()).split('\n')) {
+        QString line = raw.trimmed();
+        if (line.isEmpty() || line.startsWith(';')) continue;
+        line.replace('\\', '/');
+        projects << QDir::cleanPath(folder.absoluteFilePath(line));
+    }
+    if (projects.isEmpty()) {
+        print(context, "\nzvsolution_load: " + path + " names no project drawing\n");
+        return Value();
+    }
+    const Value list = lispTexts(projects);
+    lisp.setGlobal("*ZV_SOLUCAO*", list);
+    return list;
+}
+
 QString currentLanguage(Interpreter& lisp) {
     const Value set = lisp.global("*_ZV_IDIOMA_ATUAL_*");
     if (set.isString() && !set.asString().isEmpty()) return set.asString();
@@ -197,6 +224,10 @@ void installServiceFunctions(Interpreter& lisp, const ProductContext& context) {
             return localCircuit(in, firstPanel(database, *panels), in.toInt(a[0]));
         },
         1, 1);
+    lisp.define(
+        "zvsolution_load",
+        [context](Interpreter& in, Args a) { return loadSolution(in, context, in.toStr(a[0])); }, 1,
+        1);
     lisp.define(
         "zvsolution_isloaded",
         [](Interpreter& in, Args) { return in.boolean(!solutionFiles(in).isEmpty()); }, 0, 0);

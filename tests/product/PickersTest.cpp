@@ -1,6 +1,8 @@
 // Pickers and prompts answered and cancelled; templates; a native function overridden.
 #include "ProductFixture.h"
 
+#include <QDir>
+#include <QFile>
 #include <QTemporaryDir>
 
 namespace zvproduct::testing {
@@ -94,6 +96,31 @@ TEST_F(PickersTest, SheetGridCircuitsSolutionAndLanguage) {
     EXPECT_EQ(show("(zv_interno_get_idioma_corrente)"), "\"ES\"");
     EXPECT_EQ(show("(list (zvAlternaStatusBloqueioPalette) (zvAlternaStatusBloqueioPalette))"),
               "(T nil)");
+}
+
+TEST_F(PickersTest, ASolutionFileListsItsProjectsOrChangesNothing) {
+    QTemporaryDir pasta;
+    ASSERT_TRUE(pasta.isValid());
+    QFile arquivo(pasta.filePath("job.zvs"));
+    ASSERT_TRUE(arquivo.open(QIODevice::WriteOnly));
+    arquivo.write("; job\n\nA.dxf\r\n  b\\B.dxf \n/abs/C.dxf\n");
+    arquivo.close();
+    const QString base = QDir(pasta.path()).absolutePath();
+    EXPECT_EQ(
+        show("(zvsolution_load \"" + pasta.filePath("job.zvs") + "\")"),
+        QString("(\"" + base + "/A.dxf\" \"" + base + "/b/B.dxf\" \"/abs/C.dxf\")").toStdString());
+    EXPECT_EQ(show("(zvsolution_getProjFile \"b\")"),
+              QString("\"" + base + "/b/B.dxf\"").toStdString());
+    // Unreadable or empty: nil, a message, and the solution stays.
+    QFile vazio(pasta.filePath("vazio.zvs"));
+    ASSERT_TRUE(vazio.open(QIODevice::WriteOnly));
+    vazio.write("; nothing\n\n");
+    vazio.close();
+    EXPECT_EQ(show("(zvsolution_load \"" + pasta.filePath("vazio.zvs") + "\")"), "nil");
+    EXPECT_TRUE(printed.contains("names no project drawing"));
+    EXPECT_EQ(show("(zvsolution_load \"" + pasta.filePath("none.zvs") + "\")"), "nil");
+    EXPECT_TRUE(printed.contains("can't read"));
+    EXPECT_EQ(show("(length *ZV_SOLUCAO*)"), "3");
 }
 
 }  // namespace

@@ -1,0 +1,138 @@
+// Accessories: parts a component carries without being drawn, from the catalogue and from
+// the symbol's own extended data.
+#include "CCDataReader.h"
+
+#include "CEAtributo.h"
+#include "CEListaAtributos.h"
+#include "lists/CETemplate.h"
+
+namespace {
+
+// A quantity beyond this is a typing error in the catalogue or the drawing, not a part
+// count: it stops there, so that one bad row can't exhaust memory.
+constexpr int kMaximoUnidades = 100000;
+
+void Conta(const QString& chave, int quantidade, QStringList& contados, QStringList& zerados) {
+    if (chave.isEmpty()) return;
+    if (quantidade == 0) {
+        zerados << chave;
+        return;
+    }
+    if (quantidade > kMaximoUnidades) {
+        CICad::Log("accessory " + chave + ": quantity " + QString::number(quantidade) + " cut to " +
+                   QString::number(kMaximoUnidades));
+        quantidade = kMaximoUnidades;
+    }
+    for (int i = 0; i < quantidade; ++i)
+        contados << chave;
+}
+
+}  // namespace
+
+VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaAtributos* atributos,
+                                           CETemplate* modelo, QStringList caminho,
+                                           const QString& normaDono) {
+    Q_UNUSED(atributos);
+    const OdDbObjectId primeiro = dono.ids.empty() ? OdDbObjectId() : dono.ids.front();
+    QString norma = normaDono;
+    if (!primeiro.isNull()) {
+        QString chave, normaEntidade;
+        if (ChaveENorma(primeiro, chave, normaEntidade)) dono.definirCampo("ZV_KEY", chave);
+        if (norma.isEmpty()) norma = normaEntidade;
+    }
+    const QString chaveDono = dono.valorCampo("ZV_KEY");
+    caminho << chaveDono;
+
+    QStringList contados, zerados;
+    for (const QString& texto : catalogo_.AcessoriosDe(chaveDono)) {
+        const QStringList partes = texto.split('#');
+        Conta(partes.value(0), ZVString(partes.value(1)).ParaInteiro(), contados, zerados);
+    }
+    if (!primeiro.isNull()) {
+        CICad::RegistraApp("ZV_VINC_ADITIVO", primeiro.database());
+        // Pairs of strings, quantity first; a string without its partner is left out.
+        QStringList textos;
+        for (const CEItemXData& item : CICad::GetXData(primeiro, "ZV_VINC_ADITIVO"))
+            if (item.codigo == 1000) textos << item.texto;
+        for (int i = 0; i + 1 < textos.size(); i += 2)
+            Conta(textos[i + 1], ZVString(textos[i]).ParaInteiro(), contados, zerados);
+    }
+
+    // The fields every unit of an accessory key starts with, made once per key and standard
+    // and shared by the units' copies until one of them changes.
+    auto base = [&](const QString& chave) -> const CEItemLista& {
+        const QString nome = chave + QChar(0x1F) + norma;
+        auto it = basesAcessorio_.constFind(nome);
+        if (it != basesAcessorio_.constEnd()) return it.value();
+        CEItemLista item;
+        item.definirCampo("ZV_LISTA_TIPO", "ACE");
+        item.definirCampo("ZV_LISTA", catalogo_.ListaComp(chave, norma));
+        item.definirCampo("ZV_KEY", chave);
+        const QString descricao = catalogo_.DescricaoComp(chave);
+        item.definirCampo("DESCRICAO", descricao);
+        item.definirCampo("TP_DESCRI", descricao);
+        CEItemLista colunas;
+        LeColunasUsuario(QString(), colunas, catalogo_.ColunasComp(chave));
+        basesAcessorio_.insert(nome, item);
+        basesColunas_.insert(nome, colunas);
+        return basesAcessorio_[nome];
+    };
+    auto colunas = [&](const QString& chave) -> const CEItemLista& {
+        base(chave);
+        return basesColunas_[chave + QChar(0x1F) + norma];
+    };
+    auto novoItem = [&](const QString& chave) { return new CEItemLista(base(chave)); };
+
+    VetorItens resultado;
+    const bool recursivo = modelo && modelo->LerLogico("PBLACERECUR");
+    const bool relacao = modelo && modelo->LerLogico("PBLACERELACAO");
+    const bool atributosDono = !modelo && CICad::GetBoolLisp("PBLADDATRIBACE");
+    for (const QString& chave : contados) {
+        auto* item = new CEItemLista;
+        if (atributosDono && !primeiro.isNull()) {
+            std::unique_ptr<zv::CEListaAtributos> lista;
+            CICad::GetAtributosPorId(primeiro, lista, false, false);
+            for (int i = 0; lista && i < lista->Quantidade(); ++i)
+                item->definirCampo((*lista)[i].GetTag(), (*lista)[i].GetValor());
+        } else if (relacao) {
+            for (CampoTraduzido campo :
+                 {CampoTraduzido::Relacao, CampoTraduzido::Regua, CampoTraduzido::Numero})
+                for (int idioma = 1; idioma <= 3; ++idioma) {
+                    const QString nome = CICad::TagTraduzida(campo, idioma);
+                    QString valor;
+                    if (dono.obterCampo(nome, valor)) item->definirCampo(nome, valor);
+                }
+        }
+        if (item->campos.isEmpty())
+            item->campos = base(chave).campos;
+        else
+            item->copiarCampos(base(chave));
+        const QString qtd = dono.valorCampo("QTD");
+        item->definirCampo("QTD", qtd.isEmpty() ? QStringLiteral("1") : qtd);
+        item->copiarCampos(colunas(chave));
+        const bool listado = item->valorCampo("ZV_LISTA") == "S";
+        if (listado && modelo && !modelo->FiltraItem(*item)) {
+            delete item;
+            continue;
+        }
+        if (recursivo && !caminho.contains(chave)) {
+            VetorItens filhos = ExpandeAcessorios(*item, nullptr, modelo, caminho, norma);
+            if (listado) resultado.push_back(item);
+            resultado.juntarSemRepetir(filhos);
+        } else if (listado) {
+            resultado.push_back(item);
+        }
+        if (!listado) delete item;
+    }
+    for (const QString& chave : zerados) {
+        if (contados.contains(chave)) continue;
+        CEItemLista* item = novoItem(chave);
+        item->definirCampo("QTD", "0");
+        item->copiarCampos(colunas(chave));
+        if (item->valorCampo("ZV_LISTA") == "S" && (!modelo || modelo->FiltraItem(*item)))
+            resultado.push_back(item);
+        else
+            delete item;
+    }
+    return resultado;
+}

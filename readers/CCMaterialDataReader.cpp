@@ -1,0 +1,341 @@
+#include "CCMaterialDataReader.h"
+
+#include "CEAtributo.h"
+#include "lists/CETemplate.h"
+#include "module/CIProgress.h"
+
+#include <unordered_map>
+
+namespace {
+
+// The facade's default database is this one while a drawing other than the active one
+// is read.
+class DatabaseLida {
+public:
+    explicit DatabaseLida(zvdb::Database* database) : anterior_(nullptr) {
+        if (database && database != CICad::GetDatabase()) {
+            CICad::SetDatabaseOverride(database);
+            trocada_ = true;
+        }
+    }
+    ~DatabaseLida() {
+        if (trocada_) CICad::SetDatabaseOverride(anterior_);
+    }
+    DatabaseLida(const DatabaseLida&) = delete;
+    DatabaseLida& operator=(const DatabaseLida&) = delete;
+
+private:
+    zvdb::Database* anterior_;
+    bool trocada_ = false;
+};
+
+bool Listado(const CEItemLista& item, CETemplate& modelo) {
+    return item.valorCampo("ZV_LISTA") == "S" && modelo.FiltraItem(item);
+}
+
+// A wire's name; FIO, the name the project format writes, after the three others.
+QString NomeDoFio(const CEItemLista& item) {
+    for (const char* campo : {"CABO", "WIRE", "ALAMBRE", "FIO"}) {
+        const QString valor = item.valorCampo(campo).trimmed();
+        if (!valor.isEmpty()) return valor;
+    }
+    return {};
+}
+
+// The same name from the wire's extended data, without building its item.
+QString NomeNoXData(const OdDbObjectId& fio) {
+    QHash<QString, QString> campos;
+    const CEListaXData dados = CICad::GetXData(fio, "KVR_ZV_WIRE");
+    for (size_t i = 2; i < dados.size(); ++i) {
+        QString nome, valor;
+        if (ZVString(dados[i].texto).DivideEmDois(CCDataReader::kSeparador, nome, valor))
+            campos.insert(nome, valor);
+    }
+    for (const char* campo : {"CABO", "WIRE", "ALAMBRE", "FIO"}) {
+        const QString valor = campos.value(campo).trimmed();
+        if (!valor.isEmpty()) return valor;
+    }
+    return {};
+}
+
+}  // namespace
+
+void CCMaterialDataReader::LerLadoIni(CEItemLista&, const OdDbObjectId&, CETemplate&) {}
+
+void CCMaterialDataReader::LerLadoFim(CEItemLista&, const OdDbObjectId&, CETemplate&) {}
+
+CCMaterialDataReader::Simbolos CCMaterialDataReader::LeSimbolos(CETemplate& modelo) const {
+    Simbolos s;
+    s.selecaoPaginas = modelo.LerLogico("*SELECAO_PAG_MATTABLE*");
+    s.bornes = modelo.LerLogico("PBLCTOBORNE");
+    s.fontes = modelo.LerTexto("PROC_SIMB_BARR");
+    s.aceOrfaos = modelo.LerLogico("PBLACEORF");
+    s.vinculos = modelo.LerInteiro("*IMP_VINCL*");
+    return s;
+}
+
+VetorItens* CCMaterialDataReader::LerDados(zvdb::Database* database,
+                                           const std::optional<QStringList>& paginas,
+                                           CETemplate& modelo, CIProgress& progresso) {
+    // A solution project that no file answered for has nothing to read.
+    if (!database) return nullptr;
+    // The product's LISP side answers for the active drawing only.
+    const bool ativa = database == CICad::GetDatabase();
+    DatabaseLida lida(database);
+    resultado_.clear();
+    vistos_.clear();
+    relacoes_.clear();
+    conectores_.clear();
+    progresso.Definir(10);
+    simbolos_ = LeSimbolos(modelo);
+    const QString& f = simbolos_.fontes;
+    if (f == "1" || f == "3") {
+        LeBlocos(database, paginas, modelo, progresso);
+        if (!simbolos_.selecaoPaginas) LeVirtuais(database, modelo);
+        LePinos(database, modelo);
+    }
+    progresso.Definir(70);
+    // Wires come from the LISP side, which knows only the active drawing: a drawing read
+    // beside it gives its symbols and cables, not its wires.
+    if ((f == "2" || f == "3") && ativa) LeFios(database, paginas, modelo);
+    progresso.Definir(90);
+    if (f == "4" || f == "3") {
+        std::unique_ptr<VetorItens> cabos(LeDicionarioCabos(database));
+        for (CEItemLista* cabo : *cabos)
+            Guarda(cabo);
+    }
+    Agrupa(resultado_, modelo);
+    resultado_.ordenar(modelo.LerListaTexto("*LISTA_DE_SORT*"));
+    if (modelo.LerTexto("*ORDEM_CRESCENTE*") != "C") resultado_.inverter();
+    if (simbolos_.vinculos == 1) IntercalaAcessorios(modelo);
+    progresso.Definir(100);
+    auto* itens = new VetorItens(std::move(resultado_));
+    resultado_.clear();
+    return itens;
+}
+
+bool CCMaterialDataReader::Adiciona(CEItemLista* item, bool barramento) {
+    if (barramento) {
+        const QString relacao = item->valorCampo("RELACAO");
+        const bool nova = !relacoes_.contains(relacao);
+        relacoes_.insert(relacao);
+        if (!nova) return false;
+    }
+    Guarda(item);
+    return true;
+}
+
+void CCMaterialDataReader::Guarda(CEItemLista* item) {
+    // Kept items share their field names from the start: a large list holds millions.
+    PartilhaNomes(*item);
+    resultado_.push_back(item);
+}
+
+void CCMaterialDataReader::AdicionaAcessorios(CEItemLista& item, CETemplate& modelo) {
+    // Accessories are new items: nothing of them can be in the result yet.
+    for (CEItemLista* acessorio : ExpandeAcessorios(item, nullptr, &modelo, {}, QString()))
+        Guarda(acessorio);
+}
+
+void CCMaterialDataReader::LeBlocos(zvdb::Database* database,
+                                    const std::optional<QStringList>& paginas, CETemplate& modelo,
+                                    CIProgress& progresso) {
+    const auto blocos = CICad::GetBlocos(database);
+    const auto referencias = CICad::GetReferenciasPorBloco(database);
+    const OdDbObjectId modelSpace = CICad::GetModelSpace(database);
+    std::optional<QSet<QString>> layers;
+    if (simbolos_.selecaoPaginas && paginas)
+        layers = QSet<QString>(paginas->begin(), paginas->end());
+    const int n = std::max<int>(1, int(blocos.size()));
+    int feitos = 0;
+    for (const auto& [nomeBloco, id] : blocos) {
+        progresso.Definir(10 + 60 * ++feitos / n);
+        const QString nome = nomeBloco.toUpper();
+        if (nome.startsWith('*')) continue;
+        if (nome.startsWith("BOR-") && !simbolos_.bornes) continue;
+        if (nome.startsWith("PIN-")) continue;
+        const bool barramento = nome.startsWith("BUS");
+        for (const OdDbObjectId& ref : referencias.value(nome)) {
+            OdDbObjectId entidade = ref;
+            if (simbolos_.selecaoPaginas) {
+                entidade = CICad::GetSimboloMestre(database, ref);
+                if (entidade.isNull()) continue;
+            }
+            const QString handle = ZVString::DeHandle(entidade.handle());
+            if (vistos_.contains(handle)) continue;
+            if (CICad::EhReferencia(entidade) && CICad::GetDono(entidade) != modelSpace) continue;
+            if (layers && !layers->contains(CICad::GetLayerEntidade(ref))) continue;
+            CEItemLista* item = CriaItemBloco(entidade, modelo);
+            if (!item) continue;
+            if (Listado(*item, modelo)) {
+                vistos_.insert(handle);
+                if (!Adiciona(item, barramento)) {
+                    delete item;
+                    continue;
+                }
+                if (simbolos_.vinculos == 2) AdicionaAcessorios(*item, modelo);
+            } else {
+                if (simbolos_.aceOrfaos && simbolos_.vinculos != 0)
+                    AdicionaAcessorios(*item, modelo);
+                delete item;
+            }
+        }
+    }
+}
+
+void CCMaterialDataReader::LeVirtuais(zvdb::Database* database, CETemplate& modelo) {
+    for (const auto& [nome, id] : CICad::GetEntradasDicionario({"ESQ_VIRTUAL_ZV"}, database)) {
+        const QString handle = ZVString::DeHandle(id.handle());
+        if (vistos_.contains(handle)) continue;
+        CEItemLista* item = CriaItemVirtual(id);
+        if (!item) continue;
+        if (!Listado(*item, modelo)) {
+            delete item;
+            continue;
+        }
+        vistos_.insert(handle);
+        if (!Adiciona(item, item->valorCampo("RELACAO").startsWith("BUS"))) {
+            delete item;
+            continue;
+        }
+        if (simbolos_.vinculos == 2) AdicionaAcessorios(*item, modelo);
+    }
+}
+
+void CCMaterialDataReader::LePinos(zvdb::Database* database, CETemplate& modelo) {
+    const auto referencias = CICad::GetReferenciasPorBloco(database);
+    const OdDbObjectId modelSpace = CICad::GetModelSpace(database);
+    for (const auto& [nomeBloco, id] : CICad::GetBlocos(database)) {
+        const QString nome = nomeBloco.toUpper();
+        if (!nome.startsWith("PIN-")) continue;
+        for (const OdDbObjectId& ref : referencias.value(nome)) {
+            if (CICad::GetDono(ref) != modelSpace) continue;
+            std::unique_ptr<zv::CEAtributo> conector;
+            for (const char* tag : {"CONECTOR", "CONNECTOR", "CONECTOR"})
+                if ((conector = CICad::GetAtributo(tag, ref))) break;
+            const CEListaXData pino = CICad::GetXData(ref, "ZV_PINO");
+            if (!conector || pino.size() < 4) continue;
+            const QString nomeConector = pino[0].texto;
+            if (conectores_.contains(nomeConector)) continue;
+            conectores_.insert(nomeConector);
+            CEItemLista* item = CriaItemChave(nomeConector, pino[1].texto, pino[2].texto);
+            if (Listado(*item, modelo))
+                Guarda(item);
+            else
+                delete item;
+        }
+    }
+}
+
+void CCMaterialDataReader::LeFios(zvdb::Database* database,
+                                  const std::optional<QStringList>& paginas, CETemplate& modelo) {
+    QString desenho = CICad::GetNomeDesenho(database);
+    if (desenho.isEmpty()) desenho = CICad::GetStringLisp("SAVENAME");
+    zvsdk::ResultBuffer* chamada = zvsdk::newString("getListaFiosProj");
+    zvsdk::ResultBuffer* cauda = chamada->rbnext = zvsdk::newString(desenho);
+    if (paginas)
+        for (const QString& pagina : *paginas)
+            cauda = cauda->rbnext = zvsdk::newString(pagina);
+    zvsdk::ResultBuffer* resposta = CICad::InvokeChain(chamada);
+    zvsdk::releaseChain(chamada);
+    std::vector<OdDbObjectId> fios;
+    for (const zvsdk::ResultBuffer* no = resposta; no; no = no->rbnext)
+        if (no->restype == zvsdk::RTSTR) {
+            const OdDbObjectId id = CICad::IdDoHandle(no->rstring, database);
+            if (!id.isNull()) fios.push_back(id);
+        }
+    CICad::LiberaLista(resposta);
+    // Every polyline of each wire by the wire's name: the wires of each page, asked once.
+    std::unordered_map<QString, std::vector<OdDbObjectId>> segmentos;
+    for (const QString& layer : CICad::GetLayers(database)) {
+        zvsdk::ResultBuffer* lista = CICad::zvInvokeLista("getFiosPorLayer", {layer});
+        for (const zvsdk::ResultBuffer* no = lista; no; no = no->rbnext) {
+            if (no->restype != zvsdk::RTSTR) continue;
+            const OdDbObjectId id = CICad::IdDoHandle(no->rstring, database);
+            if (!id.isNull()) segmentos[NomeNoXData(id)].push_back(id);
+        }
+        CICad::LiberaLista(lista);
+    }
+    std::vector<std::unique_ptr<CEItemLista>> itens;
+    for (const OdDbObjectId& fio : fios)
+        itens.emplace_back(CriaItemFio(fio, modelo));
+    QSet<QString> nomes;
+    for (std::unique_ptr<CEItemLista>& item : itens) {
+        if (!item) continue;
+        const QString nome = NomeDoFio(*item);
+        if (item->valorCampo("WIRE_LISTA") != "S" || !modelo.FiltraItem(*item) || nome.isEmpty() ||
+            nomes.contains(nome))
+            continue;
+        nomes.insert(nome);
+        const std::vector<OdDbObjectId>& partes = segmentos[nome];
+        if (partes.empty()) continue;
+        const CEItemLista reserva = *item;
+        CEItemLista* atual = item.get();
+        LeEntidade("_INI", *atual, partes.front(), &modelo);
+        for (size_t s = 1; s < partes.size(); ++s) {
+            LeEntidade("_FIM", *atual, partes[s], &modelo);
+            if (s + 1 == partes.size()) break;
+            auto* seguinte = new CEItemLista;
+            seguinte->campos = reserva.campos;
+            seguinte->ids = reserva.ids;
+            LeEntidade("_INI", *seguinte, partes[s], &modelo);
+            atual->ligado = seguinte;
+            atual = seguinte;
+        }
+        Guarda(item.release());
+    }
+}
+
+void CCMaterialDataReader::Agrupa(VetorItens& itens, CETemplate& modelo) {
+    const QStringList quebra = modelo.LerListaTexto("*ZV_CHAVE_QUEBRA_PAGINA*");
+    const QStringList grupo = modelo.LerListaTexto("PBLLSTAGRUPAMENTO");
+    if (grupo.isEmpty()) return;
+    itens.ordenar(grupo + modelo.LerListaTexto("*LISTA_DE_SORT*"));
+    // The fields that make two items one material, joined with a separator no field holds.
+    auto chave = [&](const CEItemLista& item) {
+        QString texto;
+        for (const QStringList* campos : {&grupo, &quebra})
+            for (const QString& campo : *campos) {
+                texto += item.valorCampo(campo);
+                texto += QChar(0x1F);
+            }
+        return texto;
+    };
+    // Per material its head and the last member of its chain, so joining costs no walk.
+    struct Grupo {
+        CEItemLista* ultimo;
+    };
+    std::unordered_map<QString, Grupo> grupos;
+    VetorItens cabecas;
+    cabecas.reserve(itens.size());
+    for (CEItemLista* item : itens) {
+        if (!item) continue;
+        CEItemLista* fim = item;
+        while (fim->ligado)
+            fim = fim->ligado;
+        auto [it, novo] = grupos.try_emplace(chave(*item), Grupo{fim});
+        if (novo) {
+            cabecas.push_back(item);
+        } else {
+            it->second.ultimo->ligado = item;
+            it->second.ultimo = fim;
+        }
+    }
+    itens = std::move(cabecas);
+}
+
+void CCMaterialDataReader::IntercalaAcessorios(CETemplate& modelo) {
+    VetorItens resultado;
+    resultado.reserve(resultado_.size());
+    for (CEItemLista* item : resultado_) {
+        resultado.push_back(item);
+        if (!item) continue;
+        VetorItens acessorios;
+        for (CEItemLista* membro = item; membro; membro = membro->ligado)
+            for (CEItemLista* a : ExpandeAcessorios(*membro, nullptr, &modelo, {}, QString()))
+                acessorios.push_back(a);
+        Agrupa(acessorios, modelo);
+        resultado.insert(resultado.end(), acessorios.rbegin(), acessorios.rend());
+    }
+    resultado_ = std::move(resultado);
+}

@@ -1,0 +1,49 @@
+#pragma once
+// The bill of materials of one drawing: listed symbols, virtual symbols, pin connectors, and
+// on demand wires and cables, with their accessories; equal materials grouped into chains
+// under one head, then sorted.
+#include "CCDataReader.h"
+
+#include <QSet>
+
+class CCMaterialDataReader : public CCDataReader {
+public:
+    // Nothing on sides: a material has no connections of its own.
+    void LerLadoIni(CEItemLista& item, const OdDbObjectId& entidade, CETemplate& modelo) override;
+    void LerLadoFim(CEItemLista& item, const OdDbObjectId& entidade, CETemplate& modelo) override;
+    VetorItens* LerDados(zvdb::Database* database, const std::optional<QStringList>& paginas,
+                         CETemplate& modelo, CIProgress& progresso) override;
+
+    // Chains the items that are the same material (equal `PBLLSTAGRUPAMENTO` fields and no
+    // `*ZV_CHAVE_QUEBRA_PAGINA*` field apart) behind the first of them through `ligado`, and
+    // leaves only the heads in the vector. Grouped by a hash of those fields.
+    static void Agrupa(VetorItens& itens, CETemplate& modelo);
+
+protected:
+    struct Simbolos {
+        bool selecaoPaginas = false, bornes = false, aceOrfaos = false;
+        QString fontes;
+        int vinculos = 0;
+    };
+    Simbolos LeSimbolos(CETemplate& modelo) const;
+    void LeBlocos(zvdb::Database* database, const std::optional<QStringList>& paginas,
+                  CETemplate& modelo, CIProgress& progresso);
+    void LeVirtuais(zvdb::Database* database, CETemplate& modelo);
+    void LePinos(zvdb::Database* database, CETemplate& modelo);
+    void LeFios(zvdb::Database* database, const std::optional<QStringList>& paginas,
+                CETemplate& modelo);
+    // The accessories of an item, appended to the run's result.
+    void AdicionaAcessorios(CEItemLista& item, CETemplate& modelo);
+    // Behind each item, its chain's accessories, grouped, in reverse order.
+    void IntercalaAcessorios(CETemplate& modelo);
+
+    // A listed item: a bus bar whose RELACAO was seen already is dropped; true if kept.
+    bool Adiciona(CEItemLista* item, bool barramento);
+    void Guarda(CEItemLista* item);
+
+    Simbolos simbolos_;
+    VetorItens resultado_;
+    QSet<QString> vistos_;
+    QSet<QString> relacoes_;
+    QSet<QString> conectores_;
+};

@@ -1,0 +1,88 @@
+// Accessories of a symbol: units as rows, zero rows, the symbol's own pairs, recursion and
+// its guard, and bad extended data.
+#include "ReaderFixture.h"
+#include "lists/TemplateDouble.h"
+#include "readers/CCMaterialDataReader.h"
+
+#include <memory>
+
+namespace {
+
+class AccessoriesTest : public ReaderFixture {
+protected:
+    // The owner's accessories as "KEY/QTD" texts, in order; the items are freed.
+    QStringList Expande(CEItemLista& dono, CETemplate* modelo) {
+        CCMaterialDataReader leitor;
+        VetorItens itens = leitor.ExpandeAcessorios(dono, nullptr, modelo, {}, QString());
+        QStringList textos;
+        for (CEItemLista* item : itens) {
+            EXPECT_EQ(item->valorCampo("ZV_LISTA_TIPO"), "ACE");
+            textos << item->valorCampo("ZV_KEY") + "/" + item->valorCampo("QTD");
+        }
+        itens.destruirItens();
+        return textos;
+    }
+    CEItemLista Dono(const OdDbObjectId& id, const QString& qtd = "1") {
+        CEItemLista dono;
+        dono.ids.push_back(id);
+        dono.definirCampo("QTD", qtd);
+        return dono;
+    }
+};
+
+TEST_F(AccessoriesTest, CatalogueQuantitiesAreUnitsAndAZeroKeyCountedElsewhereHasNoZeroRow) {
+    CEItemLista dono = Dono(Simbolo("K", "A1", "ESQ$0001$A"), "2");
+    TemplateDouble modelo;
+    const QStringList textos = Expande(dono, &modelo);
+    // Three units of B3 and two of Z0, each with the owner's quantity; Z0's zero entry is
+    // not a row of its own, since Z0 is counted.
+    EXPECT_EQ(textos, QStringList({"B3/2", "B3/2", "B3/2", "Z0/2", "Z0/2"}));
+    EXPECT_EQ(dono.valorCampo("ZV_KEY"), "A1");
+}
+
+TEST_F(AccessoriesTest, AnUnlistedOwnerStillHasItsAccessories) {
+    // NL is not listed, but its accessory B3 is: the owner's flag does not matter here.
+    CEItemLista dono = Dono(Simbolo("K", "NL", "ESQ$0001$A"));
+    EXPECT_EQ(Expande(dono, nullptr), QStringList({"B3/1"}));
+}
+
+TEST_F(AccessoriesTest, ACycleStopsAtTheSecondVisitAndWithoutATemplateOneLevelIsExpanded) {
+    CEItemLista dono = Dono(Simbolo("K", "CA", "ESQ$0001$A"));
+    TemplateDouble recursivo;
+    recursivo.simbolos["PBLACERECUR"] = true;
+    // CA gives CB, CB gives CA again, whose own expansion stops: CA is on the path.
+    EXPECT_EQ(Expande(dono, &recursivo), QStringList({"CB/1", "CA/1"}));
+    TemplateDouble plano;
+    EXPECT_EQ(Expande(dono, &plano), QStringList({"CB/1"}));
+    EXPECT_EQ(Expande(dono, nullptr), QStringList({"CB/1"}));
+}
+
+TEST_F(AccessoriesTest, TheSymbolsOwnPairsCountAndBadOnesNeitherCrashNorLoop) {
+    const OdDbObjectId id = Simbolo("K", "SO", "ESQ$0001$A");
+    // Quantity first, then the key; a quantity that is no number reads 0 and makes a zero
+    // row; the lone last string has no partner and is left out.
+    CICad::SetXData(id, "ZV_VINC_ADITIVO",
+                    {{1000, "2"}, {1000, "SY"}, {1000, "abc"}, {1000, "Z0"}, {1000, "7"}});
+    CEItemLista dono = Dono(id);
+    TemplateDouble modelo;
+    EXPECT_EQ(Expande(dono, &modelo), QStringList({"SY/1", "SY/1", "Z0/0"}));
+
+    // A symbol that names itself as its own accessory, with recursion on: one level more,
+    // then the path stops it.
+    const OdDbObjectId ciclo = Simbolo("K", "SY", "ESQ$0001$A", {}, 20);
+    CICad::SetXData(ciclo, "ZV_VINC_ADITIVO", {{1000, "1"}, {1000, "SY"}});
+    CEItemLista proprio = Dono(ciclo);
+    modelo.simbolos["PBLACERECUR"] = true;
+    EXPECT_EQ(Expande(proprio, &modelo), QStringList({"SY/1"}));
+}
+
+TEST_F(AccessoriesTest, AHugeQuantityIsCutInsteadOfExhaustingMemory) {
+    const OdDbObjectId id = Simbolo("K", "SO", "ESQ$0001$A");
+    CICad::SetXData(id, "ZV_VINC_ADITIVO", {{1000, "2000000000"}, {1000, "SY"}});
+    CEItemLista dono = Dono(id);
+    const QStringList textos = Expande(dono, nullptr);
+    EXPECT_EQ(textos.size(), 100000);
+    EXPECT_EQ(textos.front(), "SY/1");
+}
+
+}  // namespace
