@@ -62,6 +62,10 @@ bool HostDocument::execute(const QString& name, zvsdk::CommandResult* result) {
     return true;
 }
 
+bool HostDocument::hasHostCommand(const QString& name) const {
+    return app_.hasHostCommand(name);
+}
+
 bool HostDocument::runCommand(const QStringList& tokens) {
     return app_.runHostCommand(*this, tokens);
 }

@@ -27,6 +27,8 @@ public:
     void startCommand() override { ++commandsStarted_; }
     int commandsStarted() const { return commandsStarted_; }
     bool runCommand(const QStringList& tokens) override;
+    // A command of the host itself (ZOOM, -PRINT...) by this name.
+    bool hasHostCommand(const QString& name) const;
     void reportCommandResult(zvsdk::CommandResult result) override;
     // Runs a command by name as a user typing it; false when no such command exists.
     // `result` gets how it ended: the worst the module reported, a LISP error that reached

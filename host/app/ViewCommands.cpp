@@ -60,13 +60,6 @@ void registerViewCommands(Application& app) {
     app.registerHostCommand("ZOOM", zoom);
     // Nothing is drawn on screen by this host: a regeneration has nothing to repaint.
     app.registerHostCommand("REGEN", [](HostDocument&, const QStringList&) { return true; });
-    // Plotting pages comes with the page renderer; until then the commands say so.
-    for (const char* name : {"-PRINT", "PRINT", "EXPORT"})
-        app.registerHostCommand(name, [name](HostDocument& document, const QStringList&) {
-            document.printMessage(QStringLiteral("\n%1: not available in this edition yet\n")
-                                      .arg(QString::fromLatin1(name)));
-            return true;
-        });
 }
 
 }  // namespace zvhost
