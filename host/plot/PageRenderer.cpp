@@ -293,7 +293,8 @@ std::vector<PatternLine> patternLines(const zvdb::Entity& hatch) {
         for (long i = 0; i < count && c.seek(53); ++i) {
             PatternLine line;
             line.angle = c.real();
-            line.base = c.point(43);
+            const double bx = c.realIf(43, 0.0), by = c.realIf(44, 0.0);
+            line.base = QPointF(bx, by);
             const double ox = c.realIf(45, 0.0), oy = c.realIf(46, 0.0);
             // The spacing is the offset's distance across the line's direction.
             const double a = radians(line.angle);
@@ -815,10 +816,12 @@ void PageRenderer::drawText(QPainter& painter, const TextRun& run, const Context
             else
                 width *= length / textWidth;
         }
-    } else if (run.horizontal == 1 || run.horizontal == 4) {
-        x = -textWidth / 2;
-    } else if (run.horizontal == 2) {
-        x = -textWidth;
+    } else if (run.horizontal == 1 || run.horizontal == 4 || run.horizontal == 2) {
+        // Centred and right texts go by their ink, without the bearings at their ends.
+        const double inkLeft = metrics.leftBearing(run.text.front());
+        const double inkRight = advance - metrics.rightBearing(run.text.back());
+        const double anchorAt = run.horizontal == 2 ? inkRight : (inkLeft + inkRight) / 2;
+        x = -anchorAt * scale * width;
     }
     if (run.horizontal == 4 && run.vertical == 0) y = -cap * scale / 2;
     if (run.vertical == 1) y = metrics.descent() * scale;
