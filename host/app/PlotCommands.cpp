@@ -51,13 +51,6 @@ QString styleFolder() {
     return data.isEmpty() ? QString() : data + "/plotstyles";
 }
 
-// The entities that show, from an index kept while the drawing's content stays the same.
-std::vector<zvdb::Entity*> visibleEntities(zvdb::Database& database) {
-    static std::unique_ptr<zvplot::PageIndex> index;
-    if (!index || !index->matches(database)) index = std::make_unique<zvplot::PageIndex>(database);
-    return index->visibleEntities();
-}
-
 bool fail(HostDocument& document, const QString& command, const QString& why) {
     document.printMessage("\n" + command + ": " + why + "\n");
     document.reportCommandResult(zvsdk::CommandResult::Failed);
@@ -69,7 +62,7 @@ bool plot(HostDocument& document, const QString& command, const QString& format,
     zvdb::Database* database = document.database();
     if (!database) return fail(document, command, "no drawing");
     if (path.isEmpty()) return fail(document, command, "no file name");
-    const std::vector<zvdb::Entity*> entities = visibleEntities(*database);
+    const std::vector<zvdb::Entity*> entities = document.plotIndex().visibleEntities();
     request.entities = &entities;
     QString error;
     bool written = false;
