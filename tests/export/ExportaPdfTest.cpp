@@ -7,6 +7,7 @@
 #include "app/DrawingFiles.h"
 #include "app/HostDocument.h"
 #include "drawing/Database.h"
+#include "export/CEExportaPaginas.h"
 #include "export/CEExportaPdf.h"
 #include "export/CENavegacaoPdf.h"
 #include "module/CIProgress.h"
@@ -14,6 +15,7 @@
 #include <QDir>
 #include <QFile>
 #include <QGuiApplication>
+#include <QImage>
 #include <QJsonArray>
 #include <QJsonDocument>
 #include <QJsonObject>
@@ -232,6 +234,51 @@ TEST(ComandoImpressaoTest, TheAnswersFollowTheHostsPromptOrder) {
     EXPECT_EQ(CEExportaPdf::ComandoImpressao("A3 (420 x 297 mm)", true, false, 0, 0, 0, 0, "1000",
                                              "", false, "/x.pdf")[16],
               "600");
+}
+
+}  // namespace
+
+namespace {
+
+TEST(NomeArquivoTest, PagesAreNumberedBeforeTheExtension) {
+    EXPECT_EQ(CEExportaPaginas::NomeArquivo("/a/lista.png", 1, 2, "_", 3), "/a/lista_001.png");
+    EXPECT_EQ(CEExportaPaginas::NomeArquivo("/a/lista.png", 1000, 1200, "_", 3),
+              "/a/lista_1000.png");
+    EXPECT_EQ(CEExportaPaginas::NomeArquivo("lista", 1, 2, "_", 3), "_001lista");
+    EXPECT_EQ(CEExportaPaginas::NomeArquivo("/a/lista.png", 1, 1, "_", 3), "/a/lista.png");
+}
+
+TEST_F(ExportaPdfTest, PagesBecomeFilesOfTheirOwnInTheListsOrder) {
+    CEExportaPaginas png({{"PAGINAS", "COMANDO$0002$A;CAPA$0001$A"}});
+    ASSERT_TRUE(png.Exporta(CEExportaPaginas::PNG, pasta_.filePath("pagina.png")))
+        << saida().toStdString();
+    ASSERT_EQ(png.Arquivos,
+              QStringList({pasta_.filePath("pagina_001.png"), pasta_.filePath("pagina_002.png")}));
+    QImage comando(png.Arquivos[0]), capa(png.Arquivos[1]);
+    ASSERT_FALSE(comando.isNull());
+    ASSERT_FALSE(capa.isNull());
+    EXPECT_NE(comando, capa);
+    CEExportaPaginas emf({{"PAGINAS", "COMANDO$0001$A"}});
+    ASSERT_TRUE(emf.Exporta(CEExportaPaginas::EMF, pasta_.filePath("pagina.emf")));
+    QFile metafile(pasta_.filePath("pagina.emf"));
+    ASSERT_TRUE(metafile.open(QIODevice::ReadOnly));
+    EXPECT_EQ(metafile.read(44).mid(40), QByteArray(" EMF"));
+    CEExportaPaginas dxf({{"PAGINAS", "FORCA$0001$A;COMANDO$0001$A"}});
+    ASSERT_TRUE(dxf.Exporta(CEExportaPaginas::DXF, pasta_.filePath("pagina.dxf")))
+        << saida().toStdString();
+    EXPECT_TRUE(QFile::exists(pasta_.filePath("pagina_001.dxf")));
+    EXPECT_TRUE(QFile::exists(pasta_.filePath("pagina_002.dxf")));
+}
+
+TEST_F(ExportaPdfTest, DwgAndDwfPagesAreRefusedWithAMessageAndNothingIsWritten) {
+    for (int formato : {CEExportaPaginas::DWG, CEExportaPaginas::DWF}) {
+        CEExportaPaginas paginas({{"PAGINAS", "COMANDO$0001$A"}});
+        EXPECT_FALSE(paginas.Exporta(formato, pasta_.filePath("pagina.dwg")));
+        EXPECT_TRUE(paginas.Arquivos.isEmpty());
+    }
+    EXPECT_EQ(saida().count("not available in this edition; no file was written"), 2)
+        << saida().toStdString();
+    EXPECT_FALSE(QFile::exists(pasta_.filePath("pagina.dwg")));
 }
 
 }  // namespace
