@@ -3,6 +3,10 @@
 
 #include "CICadInterno.h"
 
+#include "app/HostDocument.h"
+#include "plot/PageIndex.h"
+#include "sdk/SystemServices.h"
+
 #include "drawing/BlockRecord.h"
 #include "drawing/Database.h"
 #include "drawing/Entity.h"
@@ -13,10 +17,17 @@ bool CICad::ExtensaoVisivel(double& xMin, double& yMin, double& xMax, double& yM
     zvdb::Database* database = GetDatabase();
     if (!database || !database->modelSpace()) return false;
     zvdb::BoundingBox box;
-    for (const zvdb::Entity* entity : database->modelSpace()->entities()) {
-        const zvdb::LayerRecord* layer = database->layer(entity->layer());
-        if (layer && (layer->isFrozen() || layer->isOff())) continue;
-        box.add(zvdb::Extents::ofEntity(*entity, true));
+    auto* documento = dynamic_cast<zvhost::HostDocument*>(zvsdk::activeDocument());
+    if (documento && documento->database() == database) {
+        // The host's index by layer: only the layers that show are walked.
+        for (const zvdb::Entity* entity : documento->plotIndex().visibleEntities())
+            box.add(zvdb::Extents::ofEntity(*entity, true));
+    } else {
+        for (const zvdb::Entity* entity : database->modelSpace()->entities()) {
+            const zvdb::LayerRecord* layer = database->layer(entity->layer());
+            if (layer && (layer->isFrozen() || layer->isOff())) continue;
+            box.add(zvdb::Extents::ofEntity(*entity, true));
+        }
     }
     if (box.isEmpty()) return false;
     xMin = box.min.x, yMin = box.min.y, xMax = box.max.x, yMax = box.max.y;

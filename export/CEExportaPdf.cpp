@@ -189,8 +189,10 @@ bool CEExportaPdf::Exporta(const QString& arquivo) {
             if (!pronto) CICad::MessageBox(Texto(kMsgFalhaPdf) + arquivo + "\n" + erro);
         }
     }
-    for (const QString& temporario : ArquivosPdf)
+    for (const QString& temporario : ArquivosPdf) {
+        BytesPaginas += QFileInfo(temporario).size();
         QFile::remove(temporario);
+    }
     if (progresso_) progresso_->Fechar();
     return pronto;
 }
@@ -226,7 +228,10 @@ bool CEExportaPdf::ExtensaoPagina(const QString& pagina, double& x1, double& y1,
                                   double& y2) {
     if (pagina.isEmpty() || pagina == "0") return false;
     const QString bloco = "FORMATO_" + pagina.section('$', 0, 0);
-    const OdDbObjectId referencia = CICad::GetReferenciaNoLayer(bloco, pagina);
+    OdDbObjectId definicao, referencia;
+    // Only a drawing that has the block is searched for its reference.
+    if (CICad::GetBlocoId(bloco, definicao))
+        referencia = CICad::GetReferenciaNoLayer(bloco, pagina);
     double xMax, xMin, yMax, yMin;
     if (referencia.isNull() || !CICad::GetExtensao(referencia, xMax, xMin, yMax, yMin, false)) {
         CICad::ZoomExtents();

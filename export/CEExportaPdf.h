@@ -44,6 +44,8 @@ public:
     std::vector<int> RotacaoPdf;
     QStringList ArquivosPdf;
     QStringList PaginasImpressas;
+    // The bytes of the one-page files, all together.
+    qint64 BytesPaginas = 0;
 
 private:
     bool ImprimePagina(int i, int total, const QString& pagina, const QString& folha, bool paisagem,

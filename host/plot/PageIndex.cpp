@@ -21,8 +21,8 @@ PageIndex::PageIndex(const zvdb::Database& database)
 }
 
 bool PageIndex::matches(const zvdb::Database& database) const {
-    return database_ == &database && handleSeed_ == database.handleSeed() &&
-           database.modelSpace() && entityCount_ == database.modelSpace()->entityCount();
+    // New entities take new handles; erased ones are left out when the index is read.
+    return database_ == &database && handleSeed_ == database.handleSeed();
 }
 
 std::vector<std::string> PageIndex::pageLayers(const zvdb::Database& database,

@@ -26,7 +26,8 @@ public:
     std::vector<zvdb::Entity*> entitiesOn(const std::vector<std::string>& layers) const;
     // The entities on the layers that are neither frozen nor off, in drawing order.
     std::vector<zvdb::Entity*> visibleEntities() const;
-    // Still a true picture of this drawing: nothing was added or taken out since.
+    // Still a true picture of this drawing: nothing was added since (what was erased is left
+    // out as the index is read).
     bool matches(const zvdb::Database& database) const;
 
 private:
