@@ -18,6 +18,9 @@ target_include_directories(zvl_core PUBLIC ${PROJECT_SOURCE_DIR})
 target_link_libraries(zvl_core PUBLIC Qt5::Core Qt5::Gui Qt5::Widgets Qt5::Sql Qt5::Xml
     zvhostcore zvdrawing zvlisp)
 target_link_libraries(zvl_core PRIVATE PkgConfig::LIBZIP pugixml::pugixml)
+# The PDF export joins pages and adds bookmarks and links with Debian's qpdf library.
+target_link_libraries(zvl_core PUBLIC qpdf)
+target_compile_definitions(zvl_core PUBLIC POINTERHOLDER_TRANSITION=4)
 
 # Only cad/ sees the host's own headers.
 file(GLOB cad_sources CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/cad/*.cpp)

@@ -53,3 +53,10 @@ void CIProgress::Fechar() {
     aberta_ = false;
     if (ui) ui->closeProgress();
 }
+
+bool CIProgress::Cancelado() {
+    if (cancelado_) return true;
+    zvsdk::UserInterface* ui = Interface();
+    if (ui && ui->progressCancelled()) cancelado_ = true;
+    return cancelado_;
+}

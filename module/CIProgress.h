@@ -19,6 +19,11 @@ public:
     // creation waits 50 ms once, so a fast run does not just flicker.
     void Fechar();
 
+    // The cancel flag: set by Cancelar() or by the user through the host; a long run tests
+    // it between its steps and ends early.
+    void Cancelar() { cancelado_ = true; }
+    bool Cancelado();
+
     int Percentual() const { return percentual_; }
     bool Aberta() const { return aberta_; }
 
@@ -27,4 +32,5 @@ private:
     QElapsedTimer criacao_;
     int percentual_ = 0;
     bool aberta_ = false;
+    bool cancelado_ = false;
 };

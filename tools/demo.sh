@@ -34,4 +34,8 @@ echo "== zvhost: the cable list of the same project"
 echo "== zvhost: the material list command"
 "$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$OUT/demo.dxf" \
     -o "$OUT/material-list.dxf" gerarListaMateriaisGrf
+echo "== the pages as one PDF with bookmarks and links, and one page as PNG, in $OUT/exports"
+mkdir -p "$OUT/exports"
+"$BIN/zvexport" "$OUT/terminal-list.dxf" --pdf "$OUT/exports/demo.pdf" --smart
+"$BIN/zvexport" "$OUT/terminal-list.dxf" --png "$OUT/exports/comando-0001.png" --pages 'COMANDO$0001$A'
 echo "== results in $OUT"

@@ -3,6 +3,7 @@
 #include "DocumentSetup.h"
 #include "HostDocument.h"
 #include "ModuleLoader.h"
+#include "PlotCommands.h"
 #include "ViewCommands.h"
 #include "drawing/Database.h"
 #include "sdk/UserInterface.h"
@@ -21,6 +22,7 @@ Application::Application(std::unique_ptr<zvsdk::UserInterface> ui, QTextStream& 
     : ui_(std::move(ui)), out_(out) {
     theApplication = this;
     registerViewCommands(*this);
+    registerPlotCommands(*this);
 }
 
 Application::~Application() {
@@ -115,12 +117,25 @@ void Application::registerHostCommand(const QString& name, HostCommand command) 
     hostCommands_.insert(name.toUpper(), std::move(command));
 }
 
-bool Application::runHostCommand(HostDocument& document, const QStringList& tokens) {
-    if (tokens.isEmpty()) return false;
-    // "_." and "_" only say: the command's global, built-in name.
-    QString name = tokens.first().toUpper();
+namespace {
+
+// "_." and "_" only say: the command's global, built-in name.
+QString globalName(const QString& token) {
+    QString name = token.toUpper();
     while (name.startsWith('_') || name.startsWith('.'))
         name.remove(0, 1);
+    return name;
+}
+
+}  // namespace
+
+bool Application::hasHostCommand(const QString& name) const {
+    return hostCommands_.contains(globalName(name));
+}
+
+bool Application::runHostCommand(HostDocument& document, const QStringList& tokens) {
+    if (tokens.isEmpty()) return false;
+    const QString name = globalName(tokens.first());
     auto it = hostCommands_.constFind(name);
     if (it == hostCommands_.constEnd()) return false;
     return it.value()(document, tokens.mid(1));

@@ -57,6 +57,7 @@ public:
     using HostCommand = std::function<bool(HostDocument&, const QStringList& args)>;
     void registerHostCommand(const QString& name, HostCommand command);
     bool runHostCommand(HostDocument& document, const QStringList& tokens);
+    bool hasHostCommand(const QString& name) const;
 
     // Called for every new document, before the reactors, so the host's own services
     // (LISP environment, product functions) are there when modules see it.

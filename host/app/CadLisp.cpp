@@ -562,7 +562,9 @@ void CadFunctions::install() {
             for (const Value& v : a)
                 tokens << (v.isString() ? v.asString() : QString::number(in.toNumber(v)));
             if (!tokens.isEmpty() && !self->document_.runCommand(tokens))
-                in.fail("Unknown command " + tokens.first());
+                in.fail((self->document_.hasHostCommand(tokens.first()) ? "Command failed: "
+                                                                        : "Unknown command ") +
+                        tokens.first());
             return Value();
         },
         0, zvlisp::kVariadic);

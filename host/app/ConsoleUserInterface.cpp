@@ -1,5 +1,7 @@
 #include "ConsoleUserInterface.h"
 
+#include "Interrupts.h"
+
 #include "sdk/Document.h"
 #include "sdk/SystemServices.h"
 
@@ -129,6 +131,11 @@ void ConsoleUserInterface::drawProgress() {
     out_ << "\r\033[2K[" << QString(filled, '#') << QString(kBarWidth - filled, '.') << "] "
          << progressPercent_ << "% " << line.left(60);
     out_.flush();
+}
+
+// Ctrl+C is the command line's cancel button.
+bool ConsoleUserInterface::progressCancelled() {
+    return interruptRequested();
 }
 
 }  // namespace zvhost

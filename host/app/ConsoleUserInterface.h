@@ -34,6 +34,7 @@ public:
     void setProgress(int percent, const QString& text) override;
     void closeProgress() override;
     void processEvents(int maxEvents) override;
+    bool progressCancelled() override;
     void enableMainWindow(bool enable) override { mainWindowEnabled_ = enable; }
     bool mainWindowEnabled() const { return mainWindowEnabled_; }
     // Every progress step as a line on stderr, for logs and scripts.

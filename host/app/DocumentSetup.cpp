@@ -1,9 +1,9 @@
 #include "DocumentSetup.h"
 
+#include "Application.h"
 #include "CadLisp.h"
 #include "DocumentLisp.h"
 #include "HostDocument.h"
-#include "Application.h"
 #include "product/ProductLisp.h"
 #include "product/UserConfig.h"
 

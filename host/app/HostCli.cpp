@@ -30,6 +30,10 @@ const Subcommand kSubcommands[] = {
      "generate --out FILE.dxf [--seed N] [--terminals N] [--pages N] [--data DIR]\n"
      "                    a sample project; --blocks DIR writes the product's block drawings",
      runGenerateSubcommand},
+    {"plot",
+     "plot DRAWING --out FILE.pdf|.png|.emf [--page LAYER] [--paper W,H] [--portrait] [--dpi N]\n"
+     "        [--monochrome] [--no-lineweights]   one page drawn as a file",
+     runPlotSubcommand},
 };
 
 const char* const kUsage =

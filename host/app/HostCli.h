@@ -37,5 +37,6 @@ int runLispSubcommand(CliContext& context);
 int runDxfInfoSubcommand(CliContext& context);
 int runCatalogueSubcommand(CliContext& context);
 int runGenerateSubcommand(CliContext& context);
+int runPlotSubcommand(CliContext& context);
 
 }  // namespace zvhost

@@ -1,5 +1,7 @@
 #include "HostDocument.h"
 
+#include "plot/PageIndex.h"
+
 #include "Application.h"
 #include "DocumentLisp.h"
 #include "Interrupts.h"
@@ -60,6 +62,16 @@ bool HostDocument::execute(const QString& name, zvsdk::CommandResult* result) {
     if (interruptRequested()) reportCommandResult(zvsdk::CommandResult::Cancelled);
     if (result) *result = result_;
     return true;
+}
+
+const zvplot::PageIndex& HostDocument::plotIndex() {
+    if (!plotIndex_ || !plotIndex_->matches(*database()))
+        plotIndex_ = std::make_unique<zvplot::PageIndex>(*database());
+    return *plotIndex_;
+}
+
+bool HostDocument::hasHostCommand(const QString& name) const {
+    return app_.hasHostCommand(name);
 }
 
 bool HostDocument::runCommand(const QStringList& tokens) {

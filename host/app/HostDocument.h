@@ -6,6 +6,10 @@
 
 #include <memory>
 
+namespace zvplot {
+class PageIndex;
+}
+
 namespace zvhost {
 
 class Application;
@@ -27,6 +31,8 @@ public:
     void startCommand() override { ++commandsStarted_; }
     int commandsStarted() const { return commandsStarted_; }
     bool runCommand(const QStringList& tokens) override;
+    // A command of the host itself (ZOOM, -PRINT...) by this name.
+    bool hasHostCommand(const QString& name) const;
     void reportCommandResult(zvsdk::CommandResult result) override;
     // Runs a command by name as a user typing it; false when no such command exists.
     // `result` gets how it ended: the worst the module reported, a LISP error that reached
@@ -43,6 +49,8 @@ public:
         double minX = 0.0, minY = 0.0, maxX = 1.0, maxY = 1.0;
     };
     const View& view() const { return view_; }
+    // Model space by layer for plotting, made again when entities were added or erased.
+    const zvplot::PageIndex& plotIndex();
     void setView(const View& view) { view_ = view; }
 
 private:
@@ -60,6 +68,7 @@ private:
     int commandsStarted_ = 0;
     zvsdk::CommandResult result_ = zvsdk::CommandResult::Succeeded;
     View view_;
+    std::unique_ptr<zvplot::PageIndex> plotIndex_;
 };
 
 }  // namespace zvhost

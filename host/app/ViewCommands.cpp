@@ -7,6 +7,7 @@
 #include "drawing/Entity.h"
 #include "drawing/Extents.h"
 #include "drawing/LayerRecord.h"
+#include "plot/PageIndex.h"
 
 #include <QStringList>
 
@@ -37,11 +38,9 @@ bool zoomExtents(HostDocument& document) {
     zvdb::Database* db = document.database();
     if (!db || !db->modelSpace()) return false;
     zvdb::BoundingBox box;
-    for (const zvdb::Entity* entity : db->modelSpace()->entities()) {
-        const zvdb::LayerRecord* layer = db->layer(entity->layer());
-        if (layer && layer->isFrozen()) continue;
+    // The index by layer keeps this to the entities of the layers that show.
+    for (const zvdb::Entity* entity : document.plotIndex().visibleEntities())
         box.add(zvdb::Extents::ofEntity(*entity, true));
-    }
     if (box.isEmpty()) box = zvdb::BoundingBox{{0, 0, 0}, {1, 1, 0}};
     document.setView({box.min.x, box.min.y, box.max.x, box.max.y});
     return true;
@@ -60,13 +59,6 @@ void registerViewCommands(Application& app) {
     app.registerHostCommand("ZOOM", zoom);
     // Nothing is drawn on screen by this host: a regeneration has nothing to repaint.
     app.registerHostCommand("REGEN", [](HostDocument&, const QStringList&) { return true; });
-    // Plotting pages comes with the page renderer; until then the commands say so.
-    for (const char* name : {"-PRINT", "PRINT", "EXPORT"})
-        app.registerHostCommand(name, [name](HostDocument& document, const QStringList&) {
-            document.printMessage(QStringLiteral("\n%1: not available in this edition yet\n")
-                                      .arg(QString::fromLatin1(name)));
-            return true;
-        });
 }
 
 }  // namespace zvhost

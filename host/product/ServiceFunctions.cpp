@@ -13,7 +13,9 @@
 #include "drawing/DeepCloner.h"
 #include "drawing/DxfWriter.h"
 #include "drawing/Entity.h"
+#include "drawing/LayerRecord.h"
 #include "lisp/LispFile.h"
+#include "plot/PageIndex.h"
 
 #include <QDir>
 #include <QFile>
@@ -168,18 +170,29 @@ QString currentLanguage(Interpreter& lisp) {
     return "PT";
 }
 
+// The page as it shows (its layer and its frame, title block and page-count layers) in a
+// new drawing with what its entities use: blocks, layers, linetypes, text styles and their
+// extension dictionaries. The page's own layer comes along even when it is empty, with its
+// cover or index mark.
 bool exportPageDxf(zvdb::Database& database, const std::string& page, const QString& path,
                    QString* error) {
-    std::vector<zvdb::Entity*> entities;
-    for (zvdb::Entity* entity : database.modelSpace()->entities())
-        if (entity->layer() == page) entities.push_back(entity);
-    if (!database.layer(page)) {
+    const zvdb::LayerRecord* pageLayer = database.layer(page);
+    if (!pageLayer) {
         *error = "no such page: " + QString::fromStdString(page);
         return false;
     }
+    const zvplot::PageIndex index(database);
+    const std::vector<zvdb::Entity*> entities =
+        index.entitiesOn(zvplot::PageIndex::pageLayers(database, page));
     try {
         zvdb::Database target;
         zvdb::DeepCloner(database, target).cloneEntities(entities, *target.modelSpace());
+        zvdb::LayerRecord* copy = target.createLayer(page);
+        for (const char* mark : {"KVR_ZV_CAPA", "KVR_ZV_INDICE"}) {
+            const std::vector<zvdb::Tag> items = pageLayer->xdata(mark);
+            if (!items.empty()) copy->setXData(mark, items);
+        }
+        target.setCurrentLayer(page);
         zvdb::DxfWriter::saveFile(target, path.toStdString());
     } catch (const std::exception& failure) {
         *error = QString::fromUtf8(failure.what());
@@ -261,7 +274,11 @@ void installServiceFunctions(Interpreter& lisp, const ProductContext& context) {
         [context](Interpreter& in, Args a) {
             zvdb::Database* database = context.database ? context.database() : nullptr;
             QString error = "no drawing";
-            if (database && exportPageDxf(*database, stdText(in, a[0]), in.toStr(a[1]), &error))
+            // (zvExportaLayerDxf FILE PAGE), as the page export calls it; the file name comes
+            // with its backslashes doubled.
+            QString file = in.toStr(a[0]);
+            file.replace(QLatin1String("\\\\"), QLatin1String("/")).replace('\\', '/');
+            if (database && exportPageDxf(*database, stdText(in, a[1]), file, &error))
                 return in.t();
             print(context, "\nzvExportaLayerDxf: " + error + "\n");
             return Value();

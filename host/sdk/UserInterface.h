@@ -41,6 +41,9 @@ public:
     virtual void closeProgress() = 0;
     // Lets the host handle at most `maxEvents` pending window events.
     virtual void processEvents(int maxEvents) = 0;
+    // Whether the user asked to stop the running work (the progress window's cancel
+    // button, Ctrl+C); a long run polls it between steps.
+    virtual bool progressCancelled() { return false; }
     // The main window's enable call.
     virtual void enableMainWindow(bool enable) = 0;
 };

@@ -145,8 +145,13 @@ TEST_F(CadLispTest, DictionariesAndCommands) {
     lisp("(command \"_.zoom\" \"_W\" \"0,0\" \"2,3\")");
     EXPECT_EQ(documento_->view().maxY, 3.0);
     EXPECT_EQ(lisp("(vl-cmdf \"_.zoom\" \"_E\")"), "T");
-    lisp("(command \"_-PRINT\" \"pagina\")");
-    EXPECT_TRUE(saida_.contains("-PRINT: not available in this edition yet"));
+    // A print that can't be made fails and says why, as an unknown command would not.
+    auto* documentLisp = static_cast<zvhost::DocumentLisp*>(documento_->lisp());
+    zvlisp::Value valor;
+    EXPECT_FALSE(documentLisp->interpreter().evaluate("(command \"_-PRINT\" \"pagina\")", &valor));
+    EXPECT_TRUE(saida_.contains("-PRINT: only the detailed configuration is answered by this host"))
+        << saida_.toStdString();
+    EXPECT_TRUE(saida_.contains("Command failed: _-PRINT")) << saida_.toStdString();
     EXPECT_EQ(lisp("(vl-catch-all-error-p (vl-catch-all-apply 'command '(\"_.NAOEXISTE\")))"), "T");
     // The reference at (10, 20) with its attribute shows; the line of the frozen page not.
     EXPECT_GE(documento_->view().maxX, 11.0);

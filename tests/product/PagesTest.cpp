@@ -141,11 +141,11 @@ TEST_F(PagesTest, PageExportedToItsOwnDxf) {
     wire("ESQ$0002$A", {{0, 0, 0}, {5, 5, 0}}, "2");
     QTemporaryDir out;
     const QString path = out.path() + "/page.dxf";
-    EXPECT_EQ(show("(zvExportaLayerDxf \"ESQ$0001$A\" \"" + path + "\")"), "T");
+    EXPECT_EQ(show("(zvExportaLayerDxf \"" + path + "\" \"ESQ$0001$A\")"), "T");
     auto page = zvdb::DxfLoader::loadFile(path.toStdString());
     EXPECT_EQ(page->modelSpace()->entities().size(), 2u);
     EXPECT_NE(page->block("BORNE_1"), nullptr);
-    EXPECT_EQ(show("(zvExportaLayerDxf \"NADA$0001$A\" \"" + path + "x\")"), "nil");
+    EXPECT_EQ(show("(zvExportaLayerDxf \"" + path + "x\" \"NADA$0001$A\")"), "nil");
     EXPECT_FALSE(QFileInfo::exists(path + "x"));
     EXPECT_EQ(show("(zvExportaLayer \"ESQ$0001$A\" \"x.dwg\")"), "nil");
     EXPECT_TRUE(printed.contains("not available")) << printed.toStdString();

@@ -1,0 +1,45 @@
+// The facade's part for printing pages: what shows and where.
+#include "CICad.h"
+
+#include "CICadInterno.h"
+
+#include "app/HostDocument.h"
+#include "plot/PageIndex.h"
+#include "sdk/SystemServices.h"
+
+#include "drawing/BlockRecord.h"
+#include "drawing/Database.h"
+#include "drawing/Entity.h"
+#include "drawing/Extents.h"
+#include "drawing/LayerRecord.h"
+
+bool CICad::ExtensaoVisivel(double& xMin, double& yMin, double& xMax, double& yMax) {
+    zvdb::Database* database = GetDatabase();
+    if (!database || !database->modelSpace()) return false;
+    zvdb::BoundingBox box;
+    auto* documento = dynamic_cast<zvhost::HostDocument*>(zvsdk::activeDocument());
+    if (documento && documento->database() == database) {
+        // The host's index by layer: only the layers that show are walked.
+        for (const zvdb::Entity* entity : documento->plotIndex().visibleEntities())
+            box.add(zvdb::Extents::ofEntity(*entity, true));
+    } else {
+        for (const zvdb::Entity* entity : database->modelSpace()->entities()) {
+            const zvdb::LayerRecord* layer = database->layer(entity->layer());
+            if (layer && (layer->isFrozen() || layer->isOff())) continue;
+            box.add(zvdb::Extents::ofEntity(*entity, true));
+        }
+    }
+    if (box.isEmpty()) return false;
+    xMin = box.min.x, yMin = box.min.y, xMax = box.max.x, yMax = box.max.y;
+    return true;
+}
+
+std::vector<OdDbObjectId> CICad::GetEntidadesComXData(const QString& aplicacao) {
+    std::vector<OdDbObjectId> ids;
+    zvdb::Database* database = GetDatabase();
+    if (!database || !database->modelSpace()) return ids;
+    const std::string nome = aplicacao.toStdString();
+    for (const zvdb::Entity* entity : database->modelSpace()->entities())
+        if (!entity->xdata(nome).empty()) ids.emplace_back(database, entity->handle());
+    return ids;
+}
