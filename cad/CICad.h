@@ -95,8 +95,6 @@ public:
     // The bounds of what shows (model space on layers neither frozen nor off); false when
     // nothing shows.
     static bool ExtensaoVisivel(double& xMin, double& yMin, double& xMax, double& yMax);
-    // Model-space entities that carry extended data of the application, in drawing order.
-    static std::vector<OdDbObjectId> GetEntidadesComXData(const QString& aplicacao);
 
     // ---- files: "DADOS\\x.dwg" paths resolved for this platform
     // Backslashes become slashes; a ".dwg" that does not exist is looked for as ".dxf".

@@ -33,13 +33,3 @@ bool CICad::ExtensaoVisivel(double& xMin, double& yMin, double& xMax, double& yM
     xMin = box.min.x, yMin = box.min.y, xMax = box.max.x, yMax = box.max.y;
     return true;
 }
-
-std::vector<OdDbObjectId> CICad::GetEntidadesComXData(const QString& aplicacao) {
-    std::vector<OdDbObjectId> ids;
-    zvdb::Database* database = GetDatabase();
-    if (!database || !database->modelSpace()) return ids;
-    const std::string nome = aplicacao.toStdString();
-    for (const zvdb::Entity* entity : database->modelSpace()->entities())
-        if (!entity->xdata(nome).empty()) ids.emplace_back(database, entity->handle());
-    return ids;
-}
