@@ -34,4 +34,13 @@ echo "== zvhost: the cable list of the same project"
 echo "== zvhost: the material list command"
 "$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$OUT/demo.dxf" \
     -o "$OUT/material-list.dxf" gerarListaMateriaisGrf
+echo "== zvhost: one export of each data format (configuration Completa) into $OUT/exports"
+mkdir -p "$OUT/exports"
+for job in "exportacaoBornes BORNES CSV terminals.csv" "exportacaoFios FIOS XLSX wires.xlsx" \
+    "exportacaoCabos CABOS HTML cables.html" "exportacao COMPS XML components.xml"; do
+    read -r command kind format file <<<"$job"
+    "$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" --answer export:config=Completa \
+        --answer "export:type=$kind" --answer "export:format=$format" \
+        --answer "export:file=$OUT/exports/$file" "$OUT/demo.dxf" "$command"
+done
 echo "== results in $OUT"
