@@ -73,17 +73,19 @@ VetorItens* CCExportDataReader::Le(zvdb::Database* database, CETemplate* modelo,
     ModeloExportacao padrao;
     CETemplate& usado = modelo ? *modelo : padrao;
     auto* itens = new VetorItens;
-    CarregaConexoesFios();
     const int tipo = CICad::GetIntLisp("EXPORTA", 4);
-    if (tipo == 1) {
-        CarregaConexoesCabos();
-        LeBornes(database, usado, *itens);
-    }
-    if (tipo == 3 || tipo == 4 || tipo == 5 || tipo == 7) {
+    // The connections are the expensive question to the LISP side. The terminal, wire and
+    // ferrule readers ask it for themselves, so this reader asks only when its own hooks
+    // or the component kinds need them; a reader built on this one finds them loaded.
+    const bool componentes = tipo == 3 || tipo == 4 || tipo == 5 || tipo == 7;
+    const bool fios = tipo == 2 || tipo == 4 || tipo == 5 || tipo == 7;
+    if (componentes || fios) CarregaConexoesFios();
+    if (tipo == 1) LeBornes(database, usado, *itens);
+    if (componentes) {
         CarregaConexoesCabos();
         LeComponentes(database, usado, *itens);
     }
-    if (tipo == 2 || tipo == 4 || tipo == 5 || tipo == 7) {
+    if (fios) {
         std::optional<QStringList> escolhidas;
         const QString texto = PaginasOpcao();
         if (!texto.isEmpty()) escolhidas = texto.split(';', Qt::SkipEmptyParts);
