@@ -11,6 +11,7 @@
 #include "lists/CETemplateLisp.h"
 #include "readers/CCBorneDataReader.h"
 #include "readers/CCCaboDataReader.h"
+#include "readers/CCExportDataReader.h"
 #include "readers/CCFioDataReader.h"
 #include "readers/CCMaterialDataReader.h"
 #include "readers/SelecaoPaginas.h"
@@ -123,8 +124,12 @@ void CCDriverLista::ExecutarMateriais(const QString& caminho) {
 
 void CCDriverLista::Exporta(const QString& tipo) {
     if (!ExportacaoDisponivel(tipo)) return AvisaIndisponivel();
-    // The export reader, when it is built, is handed to the run here.
-    CEExportacao::Exporta(tipo, nullptr);
+    CEExportacao::Exporta(tipo, [](CEExportacao& exportacao) {
+        CCExportDataReader leitor;
+        leitor.Exportacao = &exportacao;
+        return std::unique_ptr<VetorItens>(
+            leitor.Le(CICad::GetDatabase(), nullptr, true, std::nullopt));
+    });
 }
 
 // The readers and writers of the other lists and of the exports join the drivers as they
@@ -134,9 +139,10 @@ bool CCDriverLista::Disponivel(TipoLista tipo) {
            tipo == TipoLista::Cabos;
 }
 
+// Every export command has its reader; the page formats are the run's to refuse.
 bool CCDriverLista::ExportacaoDisponivel(const QString& tipo) {
     Q_UNUSED(tipo);
-    return false;
+    return true;
 }
 
 void CCDriverLista::AvisaIndisponivel() {

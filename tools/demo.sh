@@ -34,8 +34,16 @@ echo "== zvhost: the cable list of the same project"
 echo "== zvhost: the material list command"
 "$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$OUT/demo.dxf" \
     -o "$OUT/material-list.dxf" gerarListaMateriaisGrf
-echo "== the pages as one PDF with bookmarks and links, and one page as PNG, in $OUT/exports"
+echo "== zvhost: one export of each data format (configuration Completa) into $OUT/exports"
 mkdir -p "$OUT/exports"
+for job in "exportacaoBornes BORNES CSV terminals.csv" "exportacaoFios FIOS XLSX wires.xlsx" \
+    "exportacaoCabos CABOS HTML cables.html" "exportacao COMPS XML components.xml"; do
+    read -r command kind format file <<<"$job"
+    "$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" --answer export:config=Completa \
+        --answer "export:type=$kind" --answer "export:format=$format" \
+        --answer "export:file=$OUT/exports/$file" "$OUT/demo.dxf" "$command"
+done
+echo "== the pages as one PDF with bookmarks and links, and one page as PNG, in $OUT/exports"
 "$BIN/zvexport" "$OUT/terminal-list.dxf" --pdf "$OUT/exports/demo.pdf" --smart
 "$BIN/zvexport" "$OUT/terminal-list.dxf" --png "$OUT/exports/comando-0001.png" --pages 'COMANDO$0001$A'
 echo "== results in $OUT"

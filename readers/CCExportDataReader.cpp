@@ -1,0 +1,273 @@
+#include "CCExportDataReader.h"
+
+#include "CCBorneDataReader.h"
+#include "CCCaboDataReader.h"
+#include "CCFioDataReader.h"
+#include "CEAtributo.h"
+#include "catalogue/CEConexaoCatalogo.h"
+#include "export/CEExportacao.h"
+#include "lists/CETemplate.h"
+#include "module/CIProgress.h"
+
+#include <memory>
+
+namespace {
+
+constexpr const char* kRelacoes[3] = {"RELACAO", "TAG", "ETIQUETA"};
+constexpr const char* kReguas[3] = {"REGUA", "STRIP", "REGLETA"};
+constexpr const char* kNumeros[3] = {"NUMERO", "NUMBER", "NUMERO"};
+
+QString Primeiro(const CEItemLista& item, const char* const (&nomes)[3], const QString& sufixo) {
+    for (const char* nome : nomes) {
+        const QString valor = item.valorCampo(nome + sufixo);
+        if (!valor.isEmpty()) return valor;
+    }
+    return {};
+}
+
+bool EhBorne(const QString& nomeBloco) {
+    const QString nome = nomeBloco.toUpper();
+    return nome.startsWith("BORNE") || nome.startsWith("BOR-");
+}
+
+// The exports read without a template: the readers they borrow ask it for separators,
+// order and sources, which the export's own LISP settings answer; no item is filtered out
+// here (the export has its own filters) and the reader's order is kept.
+class ModeloExportacao : public CETemplate {
+public:
+    ModeloExportacao() : CETemplate(QString()) {}
+    bool Carregar() override { return true; }
+    int LerInteiro(const QString&) override { return 0; }
+    double LerReal(const QString&) override { return 0.0; }
+    QString LerTexto(const QString& simbolo) override {
+        if (simbolo == "*CHAR_SEP_STD_CFG*") return CICad::GetStringLisp("*EXPORT_CHAR_SEP*");
+        if (simbolo == "*CHAR_SEP_LIG_CFG*") return CICad::GetStringLisp("*EXPORT_CHAR_SEP_LIG*");
+        if (simbolo == "*ORDEM_CONCAT_STD*") return CICad::GetStringLisp("*EXPORT_ORDEM_REL*");
+        if (simbolo == "*ORDEM_CRESCENTE*") return QStringLiteral("C");
+        if (simbolo == "PROC_SIMB_BARR") return QStringLiteral("1");
+        return {};
+    }
+    QStringList LerListaTexto(const QString&) override { return {}; }
+    bool LerLogico(const QString& simbolo) override { return simbolo == "PBLCTOBORNE"; }
+    void LerPonto(const QString&, double& x, double& y) override { x = y = 0.0; }
+    bool FiltraItem(const CEItemLista&) override { return true; }
+};
+
+void Junta(VetorItens& destino, VetorItens* origem) {
+    if (!origem) return;
+    destino.insert(destino.end(), origem->begin(), origem->end());
+    delete origem;
+}
+
+}  // namespace
+
+QString CCExportDataReader::PaginasOpcao() const {
+    return Exportacao ? Exportacao->GetOpcao("PAGINAS") : QString();
+}
+
+VetorItens* CCExportDataReader::Le(zvdb::Database* database, CETemplate* modelo, bool flag,
+                                   const std::optional<QStringList>& paginas) {
+    Q_UNUSED(flag);
+    Q_UNUSED(paginas);
+    if (!database) return nullptr;
+    ModeloExportacao padrao;
+    CETemplate& usado = modelo ? *modelo : padrao;
+    auto* itens = new VetorItens;
+    const int tipo = CICad::GetIntLisp("EXPORTA", 4);
+    // The connections are the expensive question to the LISP side. The terminal, wire and
+    // ferrule readers ask it for themselves, so this reader asks only when its own hooks
+    // or the component kinds need them; a reader built on this one finds them loaded.
+    const bool componentes = tipo == 3 || tipo == 4 || tipo == 5 || tipo == 7;
+    const bool fios = tipo == 2 || tipo == 4 || tipo == 5 || tipo == 7;
+    if (componentes || fios) CarregaConexoesFios();
+    if (tipo == 1) LeBornes(database, usado, *itens);
+    if (componentes) {
+        CarregaConexoesCabos();
+        LeComponentes(database, usado, *itens);
+    }
+    if (fios) {
+        std::optional<QStringList> escolhidas;
+        const QString texto = PaginasOpcao();
+        if (!texto.isEmpty()) escolhidas = texto.split(';', Qt::SkipEmptyParts);
+        LeFiosExportacao(escolhidas, modelo, *itens);
+    }
+    if (tipo == 8) {
+        CCFioDataReader fios;
+        QHash<QString, QString> opcoes;
+        opcoes.insert("PAGINAS", PaginasOpcao());
+        Junta(*itens, fios.LeAnilhas(opcoes, modelo, nullptr));
+    }
+    if ((tipo == 6 || tipo == 7) && Exportacao) {
+        CCCaboDataReader cabos;
+        Junta(*itens, cabos.LerCabosPaginas(database, PaginasOpcao(), usado));
+    }
+    return itens;
+}
+
+void CCExportDataReader::LeBornes(zvdb::Database* database, CETemplate& modelo, VetorItens& itens) {
+    CCBorneDataReader bornes;
+    CIProgress progresso;
+    std::unique_ptr<VetorItens> lidos(bornes.LerDados(database, std::nullopt, modelo, progresso));
+    if (!lidos) return;
+    for (CEItemLista* item : *lidos) {
+        if (!item) continue;
+        item->definirCampo("ZV_LISTA_TIPO", "BORNE");
+        PartilhaNomes(*item);
+        itens.push_back(item);
+        for (CEItemLista* acessorio : ExpandeAcessorios(*item, nullptr, nullptr, {}, QString()))
+            itens.push_back(acessorio);
+    }
+}
+
+void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& modelo,
+                                       VetorItens& itens) {
+    resultado_.clear();
+    vistos_.clear();
+    relacoes_.clear();
+    conectores_.clear();
+    simbolos_ = Simbolos{};
+    simbolos_.bornes = true;
+    // Accessories are read with their owner and follow it.
+    simbolos_.vinculos = 2;
+    CIProgress progresso;
+    LeBlocos(database, std::nullopt, modelo, progresso);
+    LeVirtuais(database, modelo);
+    LePinos(database, modelo);
+    for (CEItemLista* item : resultado_) {
+        if (!item) continue;
+        if (item->valorCampo("ZV_LISTA_TIPO").isEmpty()) {
+            const bool borne = !item->ids.empty() && CICad::EhReferencia(item->ids.front()) &&
+                               EhBorne(CICad::GetNomeBloco(item->ids.front()));
+            item->definirCampo("ZV_LISTA_TIPO", borne ? "BORNE" : "COMP");
+        }
+        if (item->valorCampo("ZV_LISTA_TIPO") == "COMP") {
+            const QString relacao = Primeiro(*item, kRelacoes, QString());
+            const QString handle = item->valorCampo("HANDLE");
+            if (!relacao.isEmpty() && !handle.isEmpty() && !relacoesComponentes_.contains(relacao))
+                relacoesComponentes_.insert(relacao, handle);
+        }
+        itens.push_back(item);
+    }
+    resultado_.clear();
+}
+
+void CCExportDataReader::LeFiosExportacao(const std::optional<QStringList>& paginas,
+                                          CETemplate* modelo, VetorItens& itens) {
+    CCFioDataReader fios;
+    std::unique_ptr<VetorItens> lidos(fios.LeFios(paginas, modelo, nullptr));
+    if (!lidos) return;
+    fios.AplicaCaminhos(*lidos);
+    for (CEItemLista* item : *lidos) {
+        if (!item) continue;
+        // Both ends are taken before the hooks write: an end's fields may land on the other.
+        const OdDbObjectId inicio = CICad::IdDoHandle(item->valorCampo("HANDLE_INI"));
+        const OdDbObjectId fim = CICad::IdDoHandle(item->valorCampo("HANDLE_FIM"));
+        AoLigarInicio(*item, inicio, modelo);
+        AoLigarFim(*item, fim, modelo);
+        itens.push_back(item);
+    }
+}
+
+void CCExportDataReader::AoLigarInicio(CEItemLista& item, const OdDbObjectId& entidade,
+                                       CETemplate* modelo) {
+    AoLigar(item, entidade, modelo, true);
+}
+
+void CCExportDataReader::AoLigarFim(CEItemLista& item, const OdDbObjectId& entidade,
+                                    CETemplate* modelo) {
+    AoLigar(item, entidade, modelo, false);
+}
+
+void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade,
+                                 CETemplate* modelo, bool inicio) {
+    if (entidade.isNull() || !CICad::EhReferencia(entidade)) return;
+    if (!EhBorne(CICad::GetNomeBloco(entidade))) return;
+    // An inverted wire keeps its ends; any other wire has them the other way round.
+    const bool invertido = item.valorCampo("INVERTIDO").toUpper() == "S";
+    const QString sufixo = inicio == invertido ? QStringLiteral("_INI") : QStringLiteral("_FIM");
+    // The terminal is met where this wire touches it, which may be its cut point.
+    const QString campo = CampoFio(item);
+    const QString fio = campo.isEmpty() ? QString() : item.valorCampo(campo);
+    const QString proprio = ZVString::DeHandle(entidade.handle());
+    const QStringList* elementos = ListaConexoes(fio);
+    const CEPonto ponto = elementos && elementos->contains(proprio) ? PontoDaConexao(fio, proprio)
+                                                                    : CICad::GetPosicao(entidade);
+    QString conectado = VizinhoNaConexao(entidade, ponto, true);
+    if (conectado.isEmpty()) conectado = VizinhoNaConexao(entidade, ponto, false);
+    const OdDbObjectId objeto = CICad::IdDoHandle(conectado);
+    QString ligacao;
+    if (!objeto.isNull()) {
+        const std::unique_ptr<zv::CEAtributo> atributo =
+            AtributoConexaoProximo(objeto, PontoDaConexao(fio, conectado));
+        if (atributo) ligacao = atributo->GetValor();
+        // The relation the wire reader composed for this end is no field of the object:
+        // a terminal, which has no relation, is told by its strip and number instead.
+        for (const char* nome : kRelacoes)
+            item.definirCampo(nome + sufixo, QString());
+        CopiaAtributos(sufixo, item, conectado);
+    }
+    CompoeRelacao(sufixo, item, modelo, ligacao, proprio);
+}
+
+void CCExportDataReader::CopiaAtributos(const QString& sufixo, CEItemLista& item,
+                                        const QString& handle) {
+    QString alvo = handle;
+    const OdDbObjectId id = CICad::IdDoHandle(handle);
+    if (id.isNull()) return;
+    const QString nome = CICad::GetNomeBloco(id).toUpper();
+    // A contact or a terminal speaks for its component, when the reader listed it.
+    for (const char* prefixo : {"NA-", "NF-", "BT-", "NAF-", "BOR-"}) {
+        if (!nome.startsWith(prefixo)) continue;
+        for (int idioma = 1; idioma <= 3; ++idioma) {
+            const std::unique_ptr<zv::CEAtributo> relacao =
+                CICad::GetAtributo(CICad::TagTraduzida(CampoTraduzido::Relacao, idioma), id);
+            if (!relacao || relacao->GetValor().isEmpty()) continue;
+            const auto achado = relacoesComponentes_.constFind(relacao->GetValor());
+            if (achado != relacoesComponentes_.constEnd()) alvo = achado.value();
+            break;
+        }
+        break;
+    }
+    const OdDbObjectId final = CICad::IdDoHandle(alvo);
+    if (!final.isNull()) LeBloco(sufixo, item, final, nullptr);
+}
+
+void CCExportDataReader::CompoeRelacao(const QString& sufixo, CEItemLista& item, CETemplate* modelo,
+                                       const QString& ligacao, const QString& handle) {
+    const QString r = Primeiro(item, kRelacoes, sufixo);
+    const QString a = Primeiro(item, kReguas, sufixo);
+    const QString n = Primeiro(item, kNumeros, sufixo);
+    const QString& g = ligacao;
+    QString sep, ordem;
+    if (modelo) {
+        sep = modelo->LerTexto("*CHAR_SEP_STD_CFG*");
+        ordem = modelo->LerTexto("*ORDEM_CONCAT_STD*");
+    } else {
+        sep = CICad::GetStringLisp("*EXPORT_CHAR_SEP*");
+        ordem = CICad::GetStringLisp("*EXPORT_ORDEM_REL*");
+    }
+    const bool relacaoPrimeiro = ordem == "1";
+    item.definirCampo("REL" + sufixo, !r.isEmpty() ? r : a + sep + n);
+    item.definirCampo("LIG" + sufixo, g);
+    if (!handle.isEmpty()) item.definirCampo("HANDLE" + sufixo, handle);
+    for (const char* campo : kRelacoes) {
+        if (!g.isEmpty())
+            item.definirCampo(campo + sufixo, relacaoPrimeiro ? r + sep + g : g + sep + r);
+        // A terminal has no relation of its own: strip and number stand for it.
+        if (!a.isEmpty() && !n.isEmpty() && r.isEmpty())
+            item.definirCampo(campo + sufixo, relacaoPrimeiro ? a + sep + n : n + sep + a);
+    }
+}
+
+QString CCExportDataReader::PromptCampo(const QString& tag, bool web) {
+    CEConexaoCatalogo* catalogo = CEConexaoCatalogo::ObterCatalogo();
+    if (!catalogo) return tag;
+    QString campo = tag;
+    campo.replace('\'', "''");
+    const QString sql =
+        web ? QString("SELECT WDIC_PROMP FROM BDWDIC WHERE WDIC_FIELD='" + campo + "'")
+            : QString("SELECT DIC_PROMPT FROM BDDIC WHERE DIC_FIELD='" + campo + "'");
+    const CERegistrosCatalogo resposta = catalogo->Consultar(sql);
+    const QString texto = resposta.Valor(0, 0).trimmed();
+    return texto.isEmpty() ? tag : texto;
+}

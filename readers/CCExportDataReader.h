@@ -1,0 +1,51 @@
+#pragma once
+// The reader of the exports: in one pass every kind of item the export asked for
+// (terminals, components, accessories, wires, ferrules, cables), each marked with its kind
+// in ZV_LISTA_TIPO; a wire's item also learns what stands at its two ends.
+#include "CCMaterialDataReader.h"
+
+#include <optional>
+
+class CEExportacao;
+
+class CCExportDataReader : public CCMaterialDataReader {
+public:
+    // The first and the second end of a wire stretch, with the entity standing there.
+    virtual void AoLigarInicio(CEItemLista& item, const OdDbObjectId& entidade, CETemplate* modelo);
+    virtual void AoLigarFim(CEItemLista& item, const OdDbObjectId& entidade, CETemplate* modelo);
+    // The items of the kinds that the LISP variable EXPORTA asks for (4 when unset). The
+    // template is null for the exports; `paginas` is not used: the pages of wires, ferrules
+    // and cables come from the export's PAGINAS option. Null without a database.
+    virtual VetorItens* Le(zvdb::Database* database, CETemplate* modelo, bool flag,
+                           const std::optional<QStringList>& paginas);
+
+    // The export this reader reads for; null for the topographic diagram.
+    CEExportacao* Exportacao = nullptr;
+
+    // The heading of a field from the catalogue's dictionary (the web one with `web`); the
+    // tag itself when the catalogue has none.
+    QString PromptCampo(const QString& tag, bool web);
+
+    // The fields of the entity at `handle` under the suffix: for a contact or terminal
+    // symbol, those of the component that owns it, when the reader knows it.
+    void CopiaAtributos(const QString& sufixo, CEItemLista& item, const QString& handle);
+    // REL, LIG, HANDLE and the three relation fields of one end under the suffix.
+    void CompoeRelacao(const QString& sufixo, CEItemLista& item, CETemplate* modelo,
+                       const QString& ligacao, const QString& handle);
+
+protected:
+    // Terminals, each followed by its accessories.
+    void LeBornes(zvdb::Database* database, CETemplate& modelo, VetorItens& itens);
+    // Components, terminals and accessories as the material reader finds them.
+    void LeComponentes(zvdb::Database* database, CETemplate& modelo, VetorItens& itens);
+    // The wire stretches with both ends told by the hooks.
+    void LeFiosExportacao(const std::optional<QStringList>& paginas, CETemplate* modelo,
+                          VetorItens& itens);
+
+    // Component relations to the handle whose fields stand for the component.
+    QHash<QString, QString> relacoesComponentes_;
+
+private:
+    void AoLigar(CEItemLista& item, const OdDbObjectId& entidade, CETemplate* modelo, bool inicio);
+    QString PaginasOpcao() const;
+};
