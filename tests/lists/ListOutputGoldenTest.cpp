@@ -62,10 +62,10 @@ TEST_P(ListOutputGoldenTest, TheTerminalListPrintsTheSameBytesAsBefore) {
 INSTANTIATE_TEST_SUITE_P(
     GeneratedProjects, ListOutputGoldenTest,
     ::testing::Values(
-        Caso{"3", "60", false, "9e41d30598c501d9fb825d2b787443c47b9f82a5a01d5b400247a85ef09c688b"},
-        Caso{"5", "400", true, "90330a2972bd27fd28ada4d3b6a53e981072373ab879034a5ab2c1d027bb8735"},
+        Caso{"3", "60", false, "2087118e531dfa4e251ba2dd6523dee6437ebb37fa589563be5d055a1de856fe"},
+        Caso{"5", "400", true, "58ec5ad683a3524f379173c705d958c28da44154acc6d5db0e66ab87efe3876e"},
         Caso{"11", "2500", true,
-             "e8008924e15cb6c55a4821ea7814b93ad20a07c2799b8251adf252b980bfa2fe"}),
+             "23181992992a4495e0d8eec2e80a1ca7420035eb135b2d9fd2186c7a1bd9ce86"}),
     [](const ::testing::TestParamInfo<Caso>& info) {
         return std::string("seed") + info.param.seed + "_terminals" + info.param.terminais;
     });
