@@ -5,6 +5,8 @@
 #include "CCXlsxWriter.h"
 #include "CCXmlWriter.h"
 #include "CEExportConfigs.h"
+#include "CEExportaPaginas.h"
+#include "CEExportaPdf.h"
 #include "cad/CICad.h"
 #include "readers/ZVString.h"
 
@@ -76,6 +78,21 @@ void ParaFrente(std::vector<T>& v, size_t indice) {
                 v.begin() + std::ptrdiff_t(indice) + 1);
 }
 
+// The pages of the project: the PDF export for the PDF format, one file a page otherwise.
+bool ExportaPaginasDoProjeto(CEExportacao& exportacao) {
+    QHash<QString, QString> opcoes;
+    for (const auto& [chave, valor] : exportacao.Opcoes)
+        opcoes.insert(chave, valor);
+    if (exportacao.TipoOutPagina == CEExportacao::Pdf) {
+        if (CEExportaPdf(opcoes, nullptr).Exporta(exportacao.Arquivo)) return true;
+        exportacao.Erro = QStringLiteral("the PDF could not be written");
+        return false;
+    }
+    if (CEExportaPaginas(opcoes).Exporta(exportacao.TipoOutPagina, exportacao.Arquivo)) return true;
+    exportacao.Erro = QStringLiteral("the pages could not be written");
+    return false;
+}
+
 }  // namespace
 
 CEExportacao::CEExportacao()
@@ -91,6 +108,7 @@ CEExportacao::CEExportacao()
         else
             Opcoes.definir(chave, valor);
     }
+    ExportaPaginas = ExportaPaginasDoProjeto;
     Opcoes.definir("PAGINAS", QString());
 }
 

@@ -15,15 +15,15 @@
 
 namespace zvtest {
 
-// Painting text needs the GUI library's application; the tests run without a screen.
+// Painting text needs the GUI library's application; the tests run without a screen. It is
+// never destroyed: at exit the GUI library's own statics may already be gone.
 inline void ensureGuiApplication() {
-    static std::unique_ptr<QGuiApplication> app;
     if (QCoreApplication::instance()) return;
     if (qEnvironmentVariableIsEmpty("QT_QPA_PLATFORM")) qputenv("QT_QPA_PLATFORM", "offscreen");
     static int argc = 1;
     static char name[] = "plot_tests";
     static char* argv[] = {name, nullptr};
-    app = std::make_unique<QGuiApplication>(argc, argv);
+    new QGuiApplication(argc, argv);  // it registers itself as the instance
 }
 
 // The drawing window of every scene: 100 by 100 units on a 200 by 200 pixel image, so a
