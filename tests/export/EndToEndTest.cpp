@@ -5,10 +5,12 @@
 #include "QtPrinters.h"
 
 #include <QFile>
+#include <QImage>
 #include <QJsonArray>
 #include <QJsonDocument>
 #include <QJsonObject>
 #include <QProcess>
+#include <QRegularExpression>
 
 #include <gtest/gtest.h>
 
@@ -187,6 +189,55 @@ TEST_F(ExportEndToEnd, TerminalsToXlsxReadBackWithOpenpyxl) {
         }
     EXPECT_GT(vistas, linhasCsv.size());
     EXPECT_FALSE(celulas.contains("A" + QString::number(linhasCsv.size() + 1)));
+}
+
+}  // namespace
+
+namespace {
+
+// The page kind through the same command: every page of the project into one PDF, and the
+// pages named into numbered images.
+TEST_F(ExportEndToEnd, ThePageKindWritesThePagesAsOnePdfOrAsOneImageAPage) {
+    const auto pagina = [&](const QString& formato, const QString& alvo, const QString& paginas) {
+        QStringList args{"--quiet", "--load", produto_->path("produto/config/zvconfig.lsp")};
+        for (const QString& a : QStringList{"export:config=Completa", "export:type=PAGINAS",
+                                            "export:format=" + formato, "export:file=" + alvo})
+            args << "--answer" << a;
+        if (!paginas.isEmpty())
+            args << "--answer"
+                 << "export:pages=" + paginas;
+        return produto_->zvhost(args << produto_->project() << "exportacao");
+    };
+    const QString pdf = produto_->path("paginas.pdf");
+    const zvtest::HostRun r = pagina("PDF", pdf, QString());
+    ASSERT_EQ(r.status, 0) << r.err.toStdString();
+    QProcess check;
+    check.start("qpdf", {"--check", pdf});
+    ASSERT_TRUE(check.waitForFinished(60000));
+    EXPECT_EQ(check.exitCode(), 0) << check.readAllStandardOutput().constData();
+    QProcess info;
+    info.start("qpdf", {"--show-npages", pdf});
+    ASSERT_TRUE(info.waitForFinished(60000));
+    // One PDF page for each page of the project's registry: cover, index, power and
+    // schematic pages and the panel layout.
+    const QString lista =
+        produto_
+            ->zvhost({"--quiet", "--eval",
+                      "(princ (strcat \"pages=\" (itoa (length (buscalistapaginas)))))",
+                      produto_->project()})
+            .out;
+    const QRegularExpressionMatch n = QRegularExpression("pages=(\\d+)").match(lista);
+    ASSERT_TRUE(n.hasMatch()) << lista.toStdString();
+    EXPECT_EQ(QString::fromLatin1(info.readAllStandardOutput()).trimmed(), n.captured(1));
+
+    const zvtest::HostRun png =
+        pagina("PNG", produto_->path("pg.png"), "COMANDO$0001$A;COMANDO$0002$A");
+    ASSERT_EQ(png.status, 0) << png.err.toStdString();
+    for (const char* nome : {"pg_001.png", "pg_002.png"}) {
+        QImage imagem(produto_->path(nome));
+        EXPECT_FALSE(imagem.isNull()) << nome;
+    }
+    EXPECT_FALSE(QFile::exists(produto_->path("pg_003.png")));
 }
 
 }  // namespace
