@@ -42,8 +42,7 @@ QString fileName(QString name) {
 // Plot styles this host knows by name; others must be files in the plot style folder.
 bool knownStyle(const QString& name) {
     const QString lower = name.toLower();
-    return lower == "monochrome.ctb" || lower == "monochrome.stb" || lower == "acad.ctb" ||
-           lower == "acad.stb" || lower == "default.stb";
+    return lower == "monochrome.ctb" || lower == "monochrome.stb" || lower == "default.stb";
 }
 
 QString styleFolder() {
