@@ -37,7 +37,8 @@ struct CCCaboDataReader::Janela {
     std::vector<Grade> grades;
     std::uint64_t versao = 0;
     bool lida = false;
-    std::vector<const Grade*> visiveis;
+    std::vector<size_t> visiveis;  // the grades of the layers shown
+    QHash<QString, size_t> porLayer;
 
     static std::int64_t Coluna(double v) { return std::int64_t(std::floor(v / kCelula)); }
     static std::int64_t Celula(std::int64_t cx, std::int64_t cy) {
@@ -45,7 +46,6 @@ struct CCCaboDataReader::Janela {
     }
 
     Janela(zvdb::Database* db, const std::vector<OdDbObjectId>& ids) : database(db) {
-        QHash<QString, size_t> porLayer;
         for (const OdDbObjectId& id : ids) {
             Entrada e{id, {}, {}};
             if (!CICad::GetCaixaSelecao(id, e.minimo, e.maximo)) continue;
@@ -73,20 +73,36 @@ struct CCCaboDataReader::Janela {
     }
 
     // Layers are frozen and thawed by page swaps: the shown ones are taken again whenever
-    // the drawing changed.
+    // the drawing changed behind the reader's back.
     void AtualizaVisiveis() {
         const std::uint64_t agora = CICad::VersaoDesenho(database);
         if (lida && agora == versao) return;
         lida = true, versao = agora;
         visiveis.clear();
-        for (const Grade& grade : grades)
-            if (!CICad::LayerCongelado(grade.layer, database)) visiveis.push_back(&grade);
+        for (size_t g = 0; g < grades.size(); ++g)
+            if (!CICad::LayerCongelado(grades[g].layer, database)) visiveis.push_back(g);
+    }
+
+    // After a page swap of the reader's own only the layers it touched are looked at again,
+    // so that a project of thousands of pages is not walked at every swap. The shown layers
+    // must have been up to date before the swap.
+    void Reavalia(const QStringList& layers) {
+        for (const QString& layer : layers) {
+            const auto onde = porLayer.constFind(layer.toUpper());
+            if (onde == porLayer.constEnd()) continue;
+            const auto lugar = std::find(visiveis.begin(), visiveis.end(), *onde);
+            const bool mostrado = !CICad::LayerCongelado(grades[*onde].layer, database);
+            if (mostrado && lugar == visiveis.end()) visiveis.push_back(*onde);
+            if (!mostrado && lugar != visiveis.end()) visiveis.erase(lugar);
+        }
+        versao = CICad::VersaoDesenho(database);
     }
 
     std::vector<OdDbObjectId> Seleciona(const CEPonto& a, const CEPonto& b) {
         AtualizaVisiveis();
         std::vector<std::uint32_t> achados;
-        for (const Grade* grade : visiveis) {
+        for (size_t g : visiveis) {
+            const Grade* grade = &grades[g];
             achados.insert(achados.end(), grade->grandes.begin(), grade->grandes.end());
             for (std::int64_t cx = Coluna(a.x); cx <= Coluna(b.x); ++cx)
                 for (std::int64_t cy = Coluna(a.y); cy <= Coluna(b.y); ++cy) {
@@ -187,8 +203,16 @@ void CCCaboDataReader::LeLado(const QString& lado, const CEPonto& ponto, CEItemL
                               const OdDbObjectId& proprio, CETemplate& modelo) {
     // The window sees what is shown: the lead's page becomes the current one, and stays.
     const QString layer = item.valorCampo("LAYER");
-    if (layer.compare(CICad::GetLayerCorrente(), Qt::CaseInsensitive) != 0)
+    const QString atual = CICad::GetLayerCorrente();
+    if (layer.compare(atual, Qt::CaseInsensitive) != 0) {
+        janela_->AtualizaVisiveis();
         CICad::TrocaPagina(layer);
+        QStringList tocados;
+        for (const QString& pagina : {atual, layer})
+            tocados << pagina << CICad::NomeBase(pagina) + "$DE"
+                    << CICad::NomeBase(pagina) + "$FORMATO" << CICad::NomeBase(pagina) + "$SELO";
+        janela_->Reavalia(tocados);
+    }
     const CEPonto a{ponto.x - kRaio, ponto.y - kRaio, 0}, b{ponto.x + kRaio, ponto.y + kRaio, 0};
     for (const OdDbObjectId& id : janela_->Seleciona(a, b)) {
         if (id.isNull() || id == proprio || !CICad::EhReferencia(id)) continue;

@@ -44,6 +44,11 @@ for job in "exportacaoBornes BORNES CSV terminals.csv" "exportacaoFios FIOS XLSX
         --answer "export:file=$OUT/exports/$file" "$OUT/demo.dxf" "$command"
 done
 echo "== the pages as one PDF with bookmarks and links, and one page as PNG, in $OUT/exports"
-"$BIN/zvexport" "$OUT/terminal-list.dxf" --pdf "$OUT/exports/demo.pdf" --smart
-"$BIN/zvexport" "$OUT/terminal-list.dxf" --png "$OUT/exports/comando-0001.png" --pages 'COMANDO$0001$A'
+for job in "PDF demo.pdf" "PNG comando-0001.png COMANDO\$0001\$A"; do
+    read -r format file pages <<<"$job"
+    "$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" --answer export:config=Completa \
+        --answer export:type=PAGINAS --answer "export:format=$format" \
+        --answer export:option:PDF_SMART_SN=S --answer "export:pages=$pages" \
+        --answer "export:file=$OUT/exports/$file" "$OUT/terminal-list.dxf" exportacao
+done
 echo "== results in $OUT"
