@@ -49,6 +49,7 @@ for job in "PDF demo.pdf" "PNG comando-0001.png COMANDO\$0001\$A"; do
     "$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" --answer export:config=Completa \
         --answer export:type=PAGINAS --answer "export:format=$format" \
         --answer export:option:PDF_SMART_SN=S --answer "export:pages=$pages" \
+        --answer "export:option:PDF_PAPER_SIZE_PZ=A3 (420 x 297 mm)" \
         --answer "export:file=$OUT/exports/$file" "$OUT/terminal-list.dxf" exportacao
 done
 echo "== results in $OUT"
