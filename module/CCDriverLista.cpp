@@ -15,6 +15,8 @@
 #include "readers/CCFioDataReader.h"
 #include "readers/CCMaterialDataReader.h"
 #include "readers/SelecaoPaginas.h"
+#include "strips/CCBorneDwgDataReader.h"
+#include "strips/CCBorneDwgWriter.h"
 
 namespace {
 
@@ -93,6 +95,13 @@ void CCDriverLista::Executar(TipoLista tipo) {
         ExecutarLista(leitor, escritor, modelo);
         return;
     }
+    if (tipo == TipoLista::BornesDesenho) {
+        CCBorneDwgDataReader leitor;
+        CCBorneDwgWriter escritor;
+        CETemplateLisp modelo(caminho);
+        ExecutarLista(leitor, escritor, modelo);
+        return;
+    }
     if (tipo == TipoLista::Cabos) {
         CCCaboDataReader leitor;
         CCCaboGrfWriter escritor;
@@ -135,8 +144,7 @@ void CCDriverLista::Exporta(const QString& tipo) {
 // The readers and writers of the other lists and of the exports join the drivers as they
 // are built.
 bool CCDriverLista::Disponivel(TipoLista tipo) {
-    return tipo == TipoLista::Bornes || tipo == TipoLista::Fios || tipo == TipoLista::Materiais ||
-           tipo == TipoLista::Cabos;
+    return tipo != TipoLista::DiagramaTopografico;
 }
 
 // Every export command has its reader; the page formats are the run's to refuse.

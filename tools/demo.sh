@@ -34,6 +34,9 @@ echo "== zvhost: the cable list of the same project"
 echo "== zvhost: the material list command"
 "$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$OUT/demo.dxf" \
     -o "$OUT/material-list.dxf" gerarListaMateriaisGrf
+echo "== zvhost: the terminal-strip drawing"
+"$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$OUT/demo.dxf" \
+    -o "$OUT/strip-drawing.dxf" gerarListaBornesDwg
 echo "== zvhost: one export of each data format (configuration Completa) into $OUT/exports"
 mkdir -p "$OUT/exports"
 for job in "exportacaoBornes BORNES CSV terminals.csv" "exportacaoFios FIOS XLSX wires.xlsx" \

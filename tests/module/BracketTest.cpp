@@ -89,7 +89,7 @@ TEST_F(BracketTest, CommandsNotBuiltYetSaySoBeforeAnythingElse) {
     lisp("(setq PBLBLNRUNONLSTS T PBLBLNRUNONEXPORT T construiu T)");
     documento_->database()->setCurrentLayer("ESQ$0002$A");
     const QStringList antes = descongelados();
-    for (const char* comando : {"gerarListaBornesDwg", "diagramaTopografico"}) {
+    for (const char* comando : {"diagramaTopografico"}) {
         const int inicio = saida().size();
         zvsdk::CommandResult resultado{};
         documento_->execute(comando, &resultado);
