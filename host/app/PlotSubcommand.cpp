@@ -68,7 +68,12 @@ int runPlotSubcommand(CliContext& context) {
             context.err << "zvhost: no such page: " << page << "\n";
             return kExitFailure;
         }
-        entities = index.entitiesOn(zvplot::PageIndex::pageLayers(*database, page.toStdString()));
+        const auto layers = zvplot::PageIndex::pageLayers(*database, page.toStdString());
+        // The page asked for is shown, as the product shows a page: its layers thawed, in
+        // this copy of the drawing only.
+        for (const auto& name : layers)
+            if (zvdb::LayerRecord* layer = database->layer(name)) layer->setFrozen(false);
+        entities = index.entitiesOn(layers);
     } else {
         entities = index.visibleEntities();
     }

@@ -4,7 +4,9 @@
 #include "ZvhostRun.h"
 
 #include "app/PlotCommands.h"
+#include "drawing/DxfLoader.h"
 #include "drawing/DxfWriter.h"
+#include "drawing/LayerRecord.h"
 
 #include <QDir>
 #include <QFile>
@@ -232,6 +234,32 @@ TEST_F(PlotCommandsTest, ExportWritesImagesAndMetafilesOfTheViewAndRefusesOtherF
     EXPECT_NE(result.status, 0);
     EXPECT_TRUE(result.out.contains("not available in this edition"));
     EXPECT_FALSE(QFile::exists(dwf));
+}
+
+}  // namespace
+}  // namespace zvtest
+
+namespace zvtest {
+namespace {
+
+// A saved project shows one page; the plot of another page shows that one, as the product
+// shows a page before it prints it.
+TEST_F(PlotCommandsTest, APageAskedForIsDrawnEvenWhenTheDrawingKeepsItFrozen) {
+    db.createLayer("ESQ$0002$A")->setFrozen(true);
+    model().addLine({0, 0}, {400, 280}, "ESQ$0002$A");
+    zvdb::DxfWriter::saveFile(db, drawing.toStdString());
+    const QString png = folder.filePath("p2.png");
+    const HostRun result =
+        runZvhost({"plot", drawing, "--page", "ESQ$0002$A", "--out", png},
+                  QProcessEnvironment::systemEnvironment(), folder.path(), 60000);
+    ASSERT_EQ(result.status, 0) << result.err.toStdString();
+    const QImage image(png);
+    ASSERT_FALSE(image.isNull());
+    EXPECT_GT(inkCount(image), 100);
+    // The page's line only: the frozen page stays frozen in the file.
+    const auto saved = zvdb::DxfLoader::loadFile(drawing.toStdString());
+    ASSERT_TRUE(saved);
+    EXPECT_TRUE(saved->layer("ESQ$0002$A")->isFrozen());
 }
 
 }  // namespace
