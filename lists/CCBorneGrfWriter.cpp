@@ -14,29 +14,7 @@ constexpr auto& kReguas = CCBorneDataReader::kCamposRegua;
 constexpr auto& kNumeros = CCBorneDataReader::kCamposNumero;
 constexpr int kSemMarca = 4;
 
-// The running grid of the layout, in single precision as the drawing keeps it.
-struct Grade {
-    float x0, y0, x, y, h;
-    double espaco;
-    int linhas, colunas, contagem = 0, coluna = 0;
-
-    void Coloca(CEPaginaLista& pagina, CEItemLista* item,
-                std::shared_ptr<CEItemLista> proprio = {}) {
-        pagina.linhas.push_back({item,
-                                 double(CICad::Simples(x)),
-                                 double(CICad::Simples(y)),
-                                 {},
-                                 {},
-                                 std::move(proprio)});
-        ++contagem;
-        y = float(CICad::Simples(y - h));
-    }
-    void Reinicia() {
-        contagem = coluna = 0;
-        x = x0;
-        y = y0;
-    }
-};
+using Grade = CCListaPaginada::Grade;
 
 void NovaPagina(std::vector<CEPaginaLista>& paginas, Grade& grade, const CEItemLista& item,
                 int indice) {
@@ -72,16 +50,7 @@ std::vector<CEPaginaLista> CCBorneGrfWriter::Diagrama(VetorItens& itens, CETempl
     for (CEItemLista* item : itens)
         if (item) presentes.push_back(item);
     if (presentes.empty()) return paginas;
-    Grade grade{
-        float(CICad::Simples(modelo.LerReal("*X_INIC_LISTA*"))),
-        float(CICad::Simples(modelo.LerReal("*Y_INIC_LISTA*"))),
-        0,
-        0,
-        float(CICad::Simples(CETemplateLisp::TextoParaReal(modelo.LerTexto("TAM_DETALHE")))),
-        modelo.LerReal("*ESPACO_HORIZONTAL*"),
-        modelo.LerInteiro("*LINHAS_POR_PAGINA*"),
-        modelo.LerLogico("*COLUNA_SN*") ? modelo.LerInteiro("*NUMERO_COLUNA*") : 1};
-    grade.Reinicia();
+    Grade grade = Grade::DoModelo(modelo);
     const QStringList chaves = modelo.LerListaTexto("*ZV_CHAVE_QUEBRA_PAGINA*");
     const int n = int(presentes.size());
     paginas.push_back({});

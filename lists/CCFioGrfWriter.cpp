@@ -11,29 +11,7 @@ namespace {
 
 enum { kCabecalho, kDetalhe, kPrimeira, kRodape, kTotal };
 
-// The running grid of the layout, in single precision as the drawing keeps it.
-struct Grade {
-    float x0, y0, x, y, h;
-    double espaco;
-    int linhas, colunas, contagem = 0, coluna = 0;
-
-    void Coloca(CEPaginaLista& pagina, CEItemLista* item,
-                std::shared_ptr<CEItemLista> proprio = {}) {
-        pagina.linhas.push_back({item,
-                                 double(CICad::Simples(x)),
-                                 double(CICad::Simples(y)),
-                                 {},
-                                 {},
-                                 std::move(proprio)});
-        ++contagem;
-        y = float(CICad::Simples(y - h));
-    }
-    void Reinicia() {
-        contagem = coluna = 0;
-        x = x0;
-        y = y0;
-    }
-};
+using Grade = CCListaPaginada::Grade;
 
 // A new page goes on with the fields of the page before; PAGINA is the running index of
 // the item it starts at.
@@ -75,16 +53,7 @@ bool CCFioGrfWriter::QuebraComBranco(CETemplate& modelo) {
 std::vector<CEPaginaLista> CCFioGrfWriter::Diagrama(VetorItens& itens, CETemplate& modelo,
                                                     const QStringList& totais) {
     std::vector<CEPaginaLista> paginas;
-    Grade grade{
-        float(CICad::Simples(modelo.LerReal("*X_INIC_LISTA*"))),
-        float(CICad::Simples(modelo.LerReal("*Y_INIC_LISTA*"))),
-        0,
-        0,
-        float(CICad::Simples(CETemplateLisp::TextoParaReal(modelo.LerTexto("TAM_DETALHE")))),
-        modelo.LerReal("*ESPACO_HORIZONTAL*"),
-        modelo.LerInteiro("*LINHAS_POR_PAGINA*"),
-        modelo.LerLogico("*COLUNA_SN*") ? modelo.LerInteiro("*NUMERO_COLUNA*") : 1};
-    grade.Reinicia();
+    Grade grade = Grade::DoModelo(modelo);
     // Null entries are tolerated, and skipped here.
     VetorItens presentes;
     for (CEItemLista* item : itens)

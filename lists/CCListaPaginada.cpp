@@ -1,6 +1,7 @@
 #include "CCListaPaginada.h"
 
 #include "CETemplate.h"
+#include "CETemplateLisp.h"
 #include "cad/CICad.h"
 #include "host/sdk/SystemServices.h"
 #include "host/sdk/UserInterface.h"
@@ -123,4 +124,32 @@ void CCListaPaginada::InsereDetalhe(const Bloco& bloco, const QString& layer,
     if (!variasColunas && !linha.item->ids.empty() && !linha.item->ids.front().isNull())
         CICad::SetXData(ref, "KVR_ZV_LINK",
                         {{1000, ZVString::DeHandle(linha.item->ids.front().handle())}});
+}
+
+CCListaPaginada::Grade CCListaPaginada::Grade::DoModelo(CETemplate& modelo) {
+    Grade grade{
+        float(CICad::Simples(modelo.LerReal("*X_INIC_LISTA*"))),
+        float(CICad::Simples(modelo.LerReal("*Y_INIC_LISTA*"))),
+        0,
+        0,
+        float(CICad::Simples(CETemplateLisp::TextoParaReal(modelo.LerTexto("TAM_DETALHE")))),
+        modelo.LerReal("*ESPACO_HORIZONTAL*"),
+        modelo.LerInteiro("*LINHAS_POR_PAGINA*"),
+        modelo.LerLogico("*COLUNA_SN*") ? modelo.LerInteiro("*NUMERO_COLUNA*") : 1};
+    grade.Reinicia();
+    return grade;
+}
+
+void CCListaPaginada::Grade::Coloca(CEPaginaLista& pagina, CEItemLista* item,
+                                    std::shared_ptr<CEItemLista> proprio) {
+    pagina.linhas.push_back(
+        {item, double(CICad::Simples(x)), double(CICad::Simples(y)), {}, {}, std::move(proprio)});
+    ++contagem;
+    y = float(CICad::Simples(y - h));
+}
+
+void CCListaPaginada::Grade::Reinicia() {
+    contagem = coluna = 0;
+    x = x0;
+    y = y0;
 }

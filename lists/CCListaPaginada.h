@@ -5,6 +5,7 @@
 
 #include <QStringList>
 
+#include <memory>
 #include <vector>
 
 class CETemplate;
@@ -42,4 +43,19 @@ public:
                               bool variasColunas);
     // The value of a FUNCAO expression for the published item; empty unless a string.
     static QString AvaliaFuncao(const QString& expressao);
+
+    // The running grid of a list's rows, in single precision as the drawing keeps it.
+    struct Grade {
+        float x0, y0, x, y, h;
+        double espaco;
+        int linhas, colunas, contagem = 0, coluna = 0;
+
+        // Start point, row height, column step, rows and columns of the template, at the
+        // start of the first column.
+        static Grade DoModelo(CETemplate& modelo);
+        // A row for the item at the running point; the row may own its item.
+        void Coloca(CEPaginaLista& pagina, CEItemLista* item,
+                    std::shared_ptr<CEItemLista> proprio = {});
+        void Reinicia();
+    };
 };

@@ -1,5 +1,5 @@
 #pragma once
-// A template whose symbols the test sets directly.
+// A template whose symbols the test sets directly; points are "X,Y" texts.
 #include "lists/CETemplate.h"
 #include "readers/CEItemLista.h"
 
@@ -19,6 +19,10 @@ public:
         return simbolos.value(s).toStringList();
     }
     bool LerLogico(const QString& s) override { return simbolos.value(s).toBool(); }
-    void LerPonto(const QString&, double& x, double& y) override { x = y = 0; }
+    void LerPonto(const QString& s, double& x, double& y) override {
+        const QStringList partes = LerTexto(s).split(',');
+        x = partes.value(0).toDouble();
+        y = partes.value(1).toDouble();
+    }
     bool FiltraItem(const CEItemLista&) override { return true; }
 };

@@ -15,6 +15,7 @@
 #include "drawing/PythonChecker.h"
 #include "lists/CETemplate.h"
 #include "lists/CETemplateLisp.h"
+#include "lists/TemplateDouble.h"
 #include "settings/CIMensagens.h"
 #include "strips/CCBorneDwgWriter.h"
 
@@ -28,28 +29,6 @@
 #include <QVariant>
 
 namespace {
-
-// A template whose symbols the test sets; points are "X,Y" texts.
-class ModeloReguas : public CETemplate {
-public:
-    ModeloReguas() : CETemplate("reguas.grx") {}
-    QHash<QString, QVariant> simbolos;
-
-    bool Carregar() override { return true; }
-    int LerInteiro(const QString& s) override { return simbolos.value(s).toInt(); }
-    double LerReal(const QString& s) override { return simbolos.value(s).toDouble(); }
-    QString LerTexto(const QString& s) override { return simbolos.value(s).toString(); }
-    QStringList LerListaTexto(const QString& s) override {
-        return simbolos.value(s).toStringList();
-    }
-    bool LerLogico(const QString& s) override { return simbolos.value(s).toBool(); }
-    void LerPonto(const QString& s, double& x, double& y) override {
-        const QStringList partes = LerTexto(s).split(',');
-        x = partes.value(0).toDouble();
-        y = partes.value(1).toDouble();
-    }
-    bool FiltraItem(const CEItemLista&) override { return true; }
-};
 
 struct Insercao {
     QString nome, layer;
@@ -203,7 +182,7 @@ protected:
     std::unique_ptr<zvhost::Application> app_;
     zvhost::ConsoleUserInterface* ui_ = nullptr;
     zvhost::HostDocument* documento_ = nullptr;
-    ModeloReguas modelo_;
+    TemplateDouble modelo_;
     ItensRegua itens_;
     QStringList layers_;
 };
