@@ -22,35 +22,30 @@ cp -r "$ROOT/data/templates" "$ROOT/data/config" "$PRODUCT/"
 "$BIN/zvhost" generate --out "$OUT/demo.dxf" --seed 1 --terminals 120 --pages 10 --numbers project \
     --data "$PRODUCT"
 export ZV_PRODUCT_DIR="$PRODUCT/"
-echo "== zvhost: the demo project, the module loaded, the terminal list command"
-"$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$OUT/demo.dxf" \
-    -o "$OUT/terminal-list.dxf" gerarListaBornesGrf
-echo "== zvhost: the wire list of the same project"
-"$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$OUT/demo.dxf" \
-    -o "$OUT/wire-list.dxf" gerarListaFiosGrf
-echo "== zvhost: the cable list of the same project"
-"$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$OUT/demo.dxf" \
-    -o "$OUT/cable-list.dxf" gerarListaCabosGrf
-echo "== zvhost: the material list command"
-"$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$OUT/demo.dxf" \
-    -o "$OUT/material-list.dxf" gerarListaMateriaisGrf
-echo "== zvhost: the terminal-strip drawing"
-"$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$OUT/demo.dxf" \
-    -o "$OUT/strip-drawing.dxf" gerarListaBornesDwg
+# The module's commands on the demo project, the user configuration loaded.
+run() {
+    "$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" "$@"
+}
+echo "== zvhost: the graphic lists and the strip drawing of the demo project"
+for job in "gerarListaBornesGrf terminal-list.dxf" "gerarListaFiosGrf wire-list.dxf" \
+    "gerarListaCabosGrf cable-list.dxf" "gerarListaMateriaisGrf material-list.dxf" \
+    "gerarListaBornesDwg strip-drawing.dxf"; do
+    read -r command file <<<"$job"
+    echo "-- $command: $OUT/$file"
+    run "$OUT/demo.dxf" -o "$OUT/$file" "$command"
+done
 echo "== zvhost: one export of each data format (configuration Completa) into $OUT/exports"
 mkdir -p "$OUT/exports"
 for job in "exportacaoBornes BORNES CSV terminals.csv" "exportacaoFios FIOS XLSX wires.xlsx" \
     "exportacaoCabos CABOS HTML cables.html" "exportacao COMPS XML components.xml"; do
     read -r command kind format file <<<"$job"
-    "$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" --answer export:config=Completa \
-        --answer "export:type=$kind" --answer "export:format=$format" \
+    run --answer export:config=Completa --answer "export:type=$kind" --answer "export:format=$format" \
         --answer "export:file=$OUT/exports/$file" "$OUT/demo.dxf" "$command"
 done
 echo "== the pages as one PDF with bookmarks and links, and one page as PNG, in $OUT/exports"
 for job in "PDF demo.pdf" "PNG comando-0001.png COMANDO\$0001\$A"; do
     read -r format file pages <<<"$job"
-    "$BIN/zvhost" --quiet --load "$PRODUCT/config/zvconfig.lsp" --answer export:config=Completa \
-        --answer export:type=PAGINAS --answer "export:format=$format" \
+    run --answer export:config=Completa --answer export:type=PAGINAS --answer "export:format=$format" \
         --answer export:option:PDF_SMART_SN=S --answer "export:pages=$pages" \
         --answer "export:option:PDF_PAPER_SIZE_PZ=A3 (420 x 297 mm)" \
         --answer "export:file=$OUT/exports/$file" "$OUT/terminal-list.dxf" exportacao
