@@ -42,6 +42,16 @@ public:
     virtual LispInterface* lisp() = 0;
     // RTNORM and the picked entity, or RTCAN when the user picked nothing.
     virtual int pickEntity(const QString& prompt, EntityName* picked) = 0;
+
+    // The undo bracket: everything done between begin and end is one step of Undo. Brackets
+    // nest; only the outermost one makes a step. A host without undo ignores them.
+    virtual void beginUndoGroup() {}
+    virtual void endUndoGroup() {}
+    // Takes the last step back out / puts the last undone step back; false when there is none.
+    virtual bool undo() { return false; }
+    virtual bool redo() { return false; }
+    virtual bool canUndo() const { return false; }
+    virtual bool canRedo() const { return false; }
 };
 
 }  // namespace zvsdk

@@ -44,6 +44,9 @@ public:
     // Whether the user asked to stop the running work (the progress window's cancel
     // button, Ctrl+C); a long run polls it between steps.
     virtual bool progressCancelled() { return false; }
+    // Whether this host shows the module's own dialogs as windows; a host that answers from
+    // a script does not, and the module fills them from presetAnswer() instead.
+    virtual bool showsDialogs() const { return false; }
     // The main window's enable call.
     virtual void enableMainWindow(bool enable) = 0;
 };
