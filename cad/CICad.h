@@ -87,6 +87,12 @@ public:
     static bool IsPaginaIndice(const QString& layer);
     static void MarcaPagina(const QString& layer, const QString& palavra);
 
+    // ---- undo
+    // The undo bracket around a batch that changes the drawing: an open undo block is
+    // closed and the whole batch becomes one step of the host's Undo. Brackets nest.
+    static void AbreDesfazer();
+    static void FechaDesfazer();
+
     // ---- views
     static void ZoomExtents();
     static int Regenera();

@@ -33,10 +33,21 @@ void IniciaComando() {
     if (zvsdk::Document* documento = zvsdk::activeDocument()) documento->startCommand();
 }
 
+// The command's whole batch, bracket included, is one step of the host's Undo; the step
+// closes however the command ends.
+class PassoDesfazer {
+public:
+    PassoDesfazer() { CICad::AbreDesfazer(); }
+    ~PassoDesfazer() { CICad::FechaDesfazer(); }
+    PassoDesfazer(const PassoDesfazer&) = delete;
+    PassoDesfazer& operator=(const PassoDesfazer&) = delete;
+};
+
 // The six steps every handler takes. Nothing escapes a handler.
 int RodarComando(Preflight tipo, const std::function<void()>& driver) {
     try {
         IniciaComando();
+        const PassoDesfazer passo;
         if (!RodarPreflight(tipo)) {
             ZVResultado::Falhou();
             return 1;

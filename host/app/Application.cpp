@@ -4,6 +4,7 @@
 #include "HostDocument.h"
 #include "ModuleLoader.h"
 #include "PlotCommands.h"
+#include "UndoCommands.h"
 #include "ViewCommands.h"
 #include "drawing/Database.h"
 #include "sdk/UserInterface.h"
@@ -22,6 +23,7 @@ Application::Application(std::unique_ptr<zvsdk::UserInterface> ui, QTextStream& 
     : ui_(std::move(ui)), out_(out) {
     theApplication = this;
     registerViewCommands(*this);
+    registerUndoCommands(*this);
     registerPlotCommands(*this);
 }
 

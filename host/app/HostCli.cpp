@@ -55,6 +55,8 @@ const char* const kUsage =
     "                        question:89=yes, strips=X1,X2, prompt:Client=ACME.\n"
     "                        A question without an answer gets what a cancelling user\n"
     "                        would give, and a line on stderr names the missing answer\n"
+    "  --undo                keep an undo journal: each command is one step that the\n"
+    "                        commands UNDO [N] and REDO take back and put back\n"
     "  --quiet               no progress bar\n"
     "  --progress-log        write every progress step as a line on stderr\n"
     "  --module FILE         load this module instead of the ZVListas module beside zvhost\n"
@@ -76,6 +78,7 @@ struct Options {
     QStringList evals;
     QStringList answers;
     bool quiet = false;
+    bool undo = false;
     bool progressLog = false;
     QString module;
     bool noModule = false;
@@ -111,6 +114,8 @@ QString parseOptions(const QStringList& args, Options& options) {
         } else if (arg == "--answer") {
             if (!value(text) || text.indexOf('=') <= 0) return "--answer needs NAME=VALUE";
             options.answers << text;
+        } else if (arg == "--undo") {
+            options.undo = true;
         } else if (arg == "--quiet") {
             options.quiet = true;
         } else if (arg == "--progress-log") {
@@ -203,6 +208,7 @@ int runDrawing(const Options& options, QTextStream& out, QTextStream& err) {
     }
     HostDocument* document =
         app.openDocument(QFileInfo(options.drawing).absoluteFilePath(), std::move(database));
+    document->setUndoEnabled(options.undo);
 
     if (!options.noModule) {
         const QString module =

@@ -6,6 +6,7 @@
 #include "DocumentLisp.h"
 #include "Interrupts.h"
 #include "drawing/Database.h"
+#include "drawing/UndoJournal.h"
 #include "sdk/LispInterface.h"
 #include "sdk/UserInterface.h"
 
@@ -48,7 +49,8 @@ bool HostDocument::execute(const QString& name, zvsdk::CommandResult* result) {
     const int errorsBefore = documentLisp ? documentLisp->interpreter().errorsReported() : 0;
     auto it = commands_.constFind(name.toUpper());
     if (it == commands_.constEnd()) {
-        if (!app_.runHostCommand(*this, {name})) return false;
+        if (!app_.hasHostCommand(name)) return false;
+        if (!app_.runHostCommand(*this, {name})) reportCommandResult(zvsdk::CommandResult::Failed);
     } else {
         zvsdk::CommandHandler handler = it.value().handler;  // it may remove commands
         try {
@@ -68,6 +70,37 @@ const zvplot::PageIndex& HostDocument::plotIndex() {
     if (!plotIndex_ || !plotIndex_->matches(*database()))
         plotIndex_ = std::make_unique<zvplot::PageIndex>(*database());
     return *plotIndex_;
+}
+
+void HostDocument::setUndoEnabled(bool enabled) {
+    if (!enabled)
+        undo_.reset();
+    else if (!undo_)
+        undo_ = std::make_unique<zvdb::UndoJournal>();
+}
+
+void HostDocument::beginUndoGroup() {
+    if (undo_) undo_->beginGroup(*database());
+}
+
+void HostDocument::endUndoGroup() {
+    if (undo_) undo_->endGroup(*database());
+}
+
+bool HostDocument::undo() {
+    return undo_ && undo_->undo(*database());
+}
+
+bool HostDocument::redo() {
+    return undo_ && undo_->redo(*database());
+}
+
+bool HostDocument::canUndo() const {
+    return undo_ && undo_->canUndo();
+}
+
+bool HostDocument::canRedo() const {
+    return undo_ && undo_->canRedo();
 }
 
 bool HostDocument::hasHostCommand(const QString& name) const {

@@ -6,6 +6,10 @@
 
 #include <memory>
 
+namespace zvdb {
+class UndoJournal;
+}
+
 namespace zvplot {
 class PageIndex;
 }
@@ -53,6 +57,17 @@ public:
     const zvplot::PageIndex& plotIndex();
     void setView(const View& view) { view_ = view; }
 
+    // Undo is kept only where a user can ask for it (the desktop); a host that runs its
+    // commands once and exits leaves it off and pays nothing for the brackets.
+    void setUndoEnabled(bool enabled);
+    bool undoEnabled() const { return undo_ != nullptr; }
+    void beginUndoGroup() override;
+    void endUndoGroup() override;
+    bool undo() override;
+    bool redo() override;
+    bool canUndo() const override;
+    bool canRedo() const override;
+
 private:
     Application& app_;
     QString fileName_;
@@ -69,6 +84,7 @@ private:
     zvsdk::CommandResult result_ = zvsdk::CommandResult::Succeeded;
     View view_;
     std::unique_ptr<zvplot::PageIndex> plotIndex_;
+    std::unique_ptr<zvdb::UndoJournal> undo_;
 };
 
 }  // namespace zvhost

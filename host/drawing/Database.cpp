@@ -52,6 +52,27 @@ void Database::noteChange() {
     changes_ = sequence.fetch_add(1, std::memory_order_relaxed) + 1;
 }
 
+void Database::swapContents(Database& other) {
+    std::swap(arena_, other.arena_);
+    header_.swap(other.header_);
+    fileTags_.swap(other.fileTags_);
+    storage_.swap(other.storage_);
+    byHandle_.swap(other.byHandle_);
+    std::swap(nextHandle_, other.nextHandle_);
+    tables_.swap(other.tables_);
+    objects_.swap(other.objects_);
+    rawSections_.swap(other.rawSections_);
+    sectionOrder_.swap(other.sectionOrder_);
+    warnings_.swap(other.warnings_);
+    std::swap(namedObjects_, other.namedObjects_);
+    for (const auto& object : storage_)
+        object->database_ = this;
+    for (const auto& object : other.storage_)
+        object->database_ = &other;
+    noteChange();
+    other.noteChange();
+}
+
 DbObject* Database::adopt(std::unique_ptr<DbObject> object) {
     DbObject* raw = object.get();
     storage_.push_back(std::move(object));

@@ -57,6 +57,9 @@ public:
     // drawing stays good while the count stays the same. The values come from one sequence
     // for all drawings of the process, so two drawings never show the same count.
     std::uint64_t changeCount() const { return changes_; }
+    // Trades the whole content with another database, this object staying where it is:
+    // what holds a Database& goes on working and sees the other drawing (undo, reload).
+    void swapContents(Database& other);
 
     // Tables -------------------------------------------------------------------------------
     SymbolTable* table(std::string_view name) const;  // "LAYER", "BLOCK_RECORD"...

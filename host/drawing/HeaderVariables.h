@@ -39,6 +39,11 @@ public:
 
     const std::vector<Variable>& variables() const { return variables_; }
     void clear();
+    // Trades variables with another header whose values live in the arena traded alongside.
+    void swap(HeaderVariables& other) {
+        variables_.swap(other.variables_);
+        index_.swap(other.index_);
+    }
 
 private:
     std::string key(std::string_view name) const;

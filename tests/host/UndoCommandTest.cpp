@@ -1,0 +1,89 @@
+// A whole terminal list as one step of undo, through zvhost's UNDO and REDO commands.
+#include "ProductFolder.h"
+#include "QtPrinters.h"
+
+#include <gtest/gtest.h>
+
+#include <QFile>
+#include <QRegularExpression>
+
+namespace {
+
+QByteArray bytes(const QString& path) {
+    QFile file(path);
+    return file.open(QIODevice::ReadOnly) ? file.readAll() : QByteArray();
+}
+
+// Empty when equal, else the first line that differs, for a readable failure. The list's
+// header carries the time of its run, which two runs do not share.
+std::string diferenca(const QByteArray& a, const QByteArray& b) {
+    const QList<QByteArray> la = a.split('\n'), lb = b.split('\n');
+    const QRegularExpression hora("^\\d\\d:\\d\\d:\\d\\d$");
+    for (int i = 0; i < std::max(la.size(), lb.size()); ++i)
+        if (la.value(i) != lb.value(i) &&
+            !(hora.match(la.value(i)).hasMatch() && hora.match(lb.value(i)).hasMatch()))
+            return "line " + std::to_string(i + 1) + ": '" + la.value(i).toStdString() +
+                   "' against '" + lb.value(i).toStdString() + "'";
+    return {};
+}
+
+class UndoCommandTest : public ::testing::Test {
+protected:
+    static void SetUpTestSuite() {
+        pasta_ = new zvtest::ProductFolder;
+        const QString problema = pasta_->prepare({"--seed", "5", "--terminals", "40"});
+        ASSERT_TRUE(problema.isEmpty()) << problema.toStdString();
+    }
+    static void TearDownTestSuite() { delete pasta_; }
+
+    // The project saved after the given commands, run with the undo journal on.
+    static QByteArray depois(const QString& saida, const QStringList& comandos,
+                             QString* erros = nullptr) {
+        QStringList args = {"--quiet",          "--undo",
+                            "--load",           pasta_->path("produto/config/zvconfig.lsp"),
+                            pasta_->project(),  "-o",
+                            pasta_->path(saida)};
+        const zvtest::HostRun run = pasta_->zvhost(args << comandos);
+        if (erros) *erros = run.err + run.out;
+        EXPECT_EQ(run.status, 0) << run.err.toStdString();
+        return bytes(pasta_->path(saida));
+    }
+
+    static zvtest::ProductFolder* pasta_;
+};
+
+zvtest::ProductFolder* UndoCommandTest::pasta_ = nullptr;
+
+TEST_F(UndoCommandTest, UndoTakesTheWholeListBackOutAndRedoPutsItBack) {
+    const QByteArray intacto = depois("intacto.dxf", {});
+    const QByteArray lista = depois("lista.dxf", {"gerarListaBornesGrf"});
+    ASSERT_FALSE(intacto.isEmpty());
+    ASSERT_NE(lista, intacto);
+    ASSERT_TRUE(lista.contains("LISTAS$0001$A"));
+
+    // Pages, rows, group registry and layer states all go.
+    EXPECT_EQ(diferenca(depois("desfeito.dxf", {"gerarListaBornesGrf", "UNDO"}), intacto), "");
+    EXPECT_EQ(diferenca(depois("refeito.dxf", {"gerarListaBornesGrf", "UNDO", "REDO"}), lista), "");
+    // Two lists, two steps: the wire list replaced the terminal list's pages, and taking it
+    // back brings them back.
+    EXPECT_EQ(diferenca(depois("dois.dxf", {"--answer", "question:89=yes", "gerarListaBornesGrf",
+                                            "gerarListaFiosGrf", "UNDO"}),
+                        lista),
+              "");
+}
+
+TEST_F(UndoCommandTest, NothingToUndoOrUndoOffIsAFailedCommandAndNothingIsSaved) {
+    QStringList args = {"--quiet", pasta_->project(), "-o", pasta_->path("x.dxf"), "UNDO"};
+    zvtest::HostRun run = pasta_->zvhost(args);
+    EXPECT_EQ(run.status, 3);
+    EXPECT_TRUE(run.out.contains("Undo is off")) << run.out.toStdString();
+    EXPECT_FALSE(QFile::exists(pasta_->path("x.dxf")));
+
+    run = pasta_->zvhost(
+        {"--quiet", "--undo", pasta_->project(), "-o", pasta_->path("y.dxf"), "REDO"});
+    EXPECT_EQ(run.status, 3);
+    EXPECT_TRUE(run.out.contains("Nothing to redo.")) << run.out.toStdString();
+    EXPECT_FALSE(QFile::exists(pasta_->path("y.dxf")));
+}
+
+}  // namespace
