@@ -71,6 +71,8 @@ void Database::swapContents(Database& other) {
         object->database_ = &other;
     noteChange();
     other.noteChange();
+    contentId_ = changes_;
+    other.contentId_ = other.changes_;
 }
 
 DbObject* Database::adopt(std::unique_ptr<DbObject> object) {

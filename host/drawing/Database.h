@@ -57,6 +57,9 @@ public:
     // drawing stays good while the count stays the same. The values come from one sequence
     // for all drawings of the process, so two drawings never show the same count.
     std::uint64_t changeCount() const { return changes_; }
+    // Changes whenever swapContents puts other objects in: pointers to objects taken
+    // before are then no longer this drawing's.
+    std::uint64_t contentId() const { return contentId_; }
     // Trades the whole content with another database, this object staying where it is:
     // what holds a Database& goes on working and sees the other drawing (undo, reload).
     void swapContents(Database& other);
@@ -164,6 +167,7 @@ private:
     std::vector<std::string> warnings_;
     std::uint64_t namedObjects_ = 0;
     std::uint64_t changes_ = 0;
+    std::uint64_t contentId_ = 0;
 };
 
 }  // namespace zvdb

@@ -10,7 +10,7 @@
 namespace zvplot {
 
 PageIndex::PageIndex(const zvdb::Database& database)
-    : database_(&database), handleSeed_(database.handleSeed()) {
+    : database_(&database), handleSeed_(database.handleSeed()), contentId_(database.contentId()) {
     const zvdb::BlockRecord* model = database.modelSpace();
     if (!model) return;
     std::size_t order = 0;
@@ -22,7 +22,8 @@ PageIndex::PageIndex(const zvdb::Database& database)
 
 bool PageIndex::matches(const zvdb::Database& database) const {
     // New entities take new handles; erased ones are left out when the index is read.
-    return database_ == &database && handleSeed_ == database.handleSeed();
+    return database_ == &database && handleSeed_ == database.handleSeed() &&
+           contentId_ == database.contentId();
 }
 
 std::vector<std::string> PageIndex::pageLayers(const zvdb::Database& database,

@@ -37,6 +37,7 @@ private:
     };
     const zvdb::Database* database_;
     std::uint64_t handleSeed_ = 0;
+    std::uint64_t contentId_ = 0;
     std::size_t entityCount_ = 0;
     std::unordered_map<std::string, std::vector<Placed>> byLayer_;
 };

@@ -49,7 +49,10 @@ QSizeF PagePlotter::orientedPaper(const QSizeF& sides, bool landscape) {
 
 QRectF PagePlotter::windowOf(const zvdb::Database& database, const PlotRequest& request) {
     QRectF window = request.window.normalized();
-    if (window.isEmpty()) window = PageRenderer::visibleExtents(database);
+    // A page's own entities give its extents without walking the whole drawing.
+    if (window.isEmpty())
+        window = request.entities ? PageRenderer::extentsOf(*request.entities)
+                                  : PageRenderer::visibleExtents(database);
     if (window.isEmpty()) window = QRectF(0, 0, 1, 1);
     return window;
 }

@@ -415,6 +415,14 @@ QRectF PageRenderer::visibleExtents(const zvdb::Database& database) {
     return QRectF(QPointF(box.min.x, box.min.y), QPointF(box.max.x, box.max.y));
 }
 
+QRectF PageRenderer::extentsOf(std::span<zvdb::Entity* const> entities) {
+    zvdb::BoundingBox box;
+    for (const zvdb::Entity* entity : entities)
+        box.add(zvdb::Extents::ofEntity(*entity, true));
+    if (box.isEmpty()) return {};
+    return QRectF(QPointF(box.min.x, box.min.y), QPointF(box.max.x, box.max.y));
+}
+
 const PageRenderer::LayerLook& PageRenderer::layerLook(std::string_view name) {
     auto it = layers_.find(name);
     if (it != layers_.end()) return it->second;

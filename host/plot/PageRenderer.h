@@ -49,6 +49,8 @@ public:
 
     // The bounds of the visible model-space entities; empty when nothing shows.
     static QRectF visibleExtents(const zvdb::Database& database);
+    // The bounds of these entities (a page's, already known to show).
+    static QRectF extentsOf(std::span<zvdb::Entity* const> entities);
     // Drawing coordinates (y up) to device coordinates (y down), aspect kept, centred.
     static QTransform windowToTarget(const QRectF& window, const QRectF& target);
     // The colour of an index of the drawing's 256-colour palette.

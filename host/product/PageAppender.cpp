@@ -33,8 +33,9 @@ PageAppender::Fingerprint PageAppender::fingerprint(zvdb::Database& database) {
 }
 
 bool PageAppender::current(zvdb::Database& database) const {
-    return registry_ && database_ == &database && handleSeed_ == database.handleSeed() &&
-           objectCount_ == database.objectCount() && fingerprint_ == fingerprint(database);
+    return registry_ && database_ == &database && contentId_ == database.contentId() &&
+           handleSeed_ == database.handleSeed() && objectCount_ == database.objectCount() &&
+           fingerprint_ == fingerprint(database);
 }
 
 void PageAppender::load(zvdb::Database& database) {
@@ -77,6 +78,7 @@ PageAppender::Page PageAppender::append(zvdb::Database& database, const std::str
 void PageAppender::settle(zvdb::Database& database) {
     database_ = &database;
     handleSeed_ = database.handleSeed();
+    contentId_ = database.contentId();
     objectCount_ = database.objectCount();
     fingerprint_ = fingerprint(database);
 }

@@ -45,6 +45,7 @@ private:
     std::optional<PageRegistry> registry_;
     zvdb::Database* database_ = nullptr;
     std::uint64_t handleSeed_ = 0;
+    std::uint64_t contentId_ = 0;
     std::size_t objectCount_ = 0;
     Fingerprint fingerprint_;
     std::unordered_map<std::string, int> highest_;  // each group's highest page number

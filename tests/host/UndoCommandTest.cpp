@@ -1,6 +1,10 @@
 // A whole terminal list as one step of undo, through zvhost's UNDO and REDO commands.
 #include "ProductFolder.h"
 #include "QtPrinters.h"
+#include "drawing/BlockRecord.h"
+#include "drawing/Database.h"
+#include "drawing/UndoJournal.h"
+#include "plot/PageIndex.h"
 
 #include <gtest/gtest.h>
 
@@ -84,6 +88,24 @@ TEST_F(UndoCommandTest, NothingToUndoOrUndoOffIsAFailedCommandAndNothingIsSaved)
     EXPECT_EQ(run.status, 3);
     EXPECT_TRUE(run.out.contains("Nothing to redo.")) << run.out.toStdString();
     EXPECT_FALSE(QFile::exists(pasta_->path("y.dxf")));
+}
+
+TEST(UndoAndIndexes, AnIndexOfTheDrawingMadeBeforeAStepIsStaleAfterUndo) {
+    zvdb::Database db;
+    db.modelSpace()->addLine({0, 0, 0}, {1, 1, 0}, "P$0001$A");
+    zvdb::UndoJournal journal;
+    journal.beginGroup(db);
+    db.modelSpace()->addLine({0, 0, 0}, {2, 2, 0}, "P$0001$A");
+    journal.endGroup(db);
+    ASSERT_TRUE(journal.undo(db));
+    // Same database object, same handle seed as when this index is made: only the content
+    // differs from what the next undo or redo brings.
+    const zvplot::PageIndex index(db);
+    EXPECT_TRUE(index.matches(db));
+    ASSERT_EQ(index.visibleEntities().size(), 1u);
+    ASSERT_TRUE(journal.redo(db));
+    ASSERT_TRUE(journal.undo(db));
+    EXPECT_FALSE(index.matches(db)) << "its entities were the drawing's before the swap";
 }
 
 }  // namespace
