@@ -27,7 +27,7 @@ namespace cadlisp {
 
 Kind kindOf(int code) {
     if (zvdb::isPointerCode(code) && code != 1005) return Kind::Pointer;
-    if ((code >= 10 && code <= 18) || (code >= 110 && code <= 112) ||
+    if ((code >= 10 && code <= 18) || (code >= 110 && code <= 112) || code == 210 ||
         (code >= 1010 && code <= 1013))
         return Kind::Point;
     switch (zvdb::valueKind(code)) {

@@ -306,8 +306,10 @@ Value CadFunctions::entmake(Args a, bool returnName) {
 // value (a text its UTF-8 bytes and a length byte, a real 8, a point 24, a 16-bit integer 2,
 // a 32-bit one 4, a handle 8, binary data its bytes); -1 for an invalid list.
 int CadFunctions::xdataSize(const Value& list) {
+    // ((-3 (APP ...) ...)), (-3 (APP ...) ...) or ((APP ...) ...).
     Value apps = list;
     if (car(apps).isInt() && car(apps).asInt() == -3) apps = cdr(apps);
+    if (car(car(apps)).isInt() && car(car(apps)).asInt() == -3) apps = cdr(car(apps));
     int size = 0;
     for (Value g = apps; !g.isNil(); g = cdr(g)) {
         const Value& app = car(g);

@@ -14,7 +14,7 @@ class LispInputTest : public LispHostFixture {};
 TEST_F(LispInputTest, NumbersAndTexts) {
     ui->setAnswer("prompt:Número de cópias", "3");
     EXPECT_EQ(ev("(getint \"\\nNúmero de cópias: \")"), "3");
-    EXPECT_TRUE(commandLine.contains("Número de cópias: 3\n")) << commandLine;
+    EXPECT_TRUE(commandLine.contains("Número de cópias: 3\n")) << commandLine.toStdString();
     ui->setAnswer("prompt:Escala", "2.5");
     EXPECT_EQ(ev("(getreal \"Escala: \")"), "2.5");
     ui->setAnswer("prompt:Escala", "7");
@@ -32,19 +32,19 @@ TEST_F(LispInputTest, NumbersAndTexts) {
 TEST_F(LispInputTest, RejectedAnswersAreToldAndARepeatedOneCancels) {
     ui->setAnswer("prompt:N", "abc");
     EXPECT_EQ(ev("(getint \"N: \")"), "ERROR: Function cancelled");
-    EXPECT_TRUE(commandLine.contains("Requires an integer value.")) << commandLine;
+    EXPECT_TRUE(commandLine.contains("Requires an integer value.")) << commandLine.toStdString();
     ui->setAnswer("prompt:N", "40000");
     EXPECT_EQ(ev("(getint \"N: \")"), "ERROR: Function cancelled");
     EXPECT_TRUE(commandLine.contains("Requires an integer between -32768 and 32767."));
     ui->setAnswer("prompt:N", "0");
     EXPECT_EQ(ev("(initget 2) (getint \"N: \")"), "ERROR: Function cancelled");
-    EXPECT_TRUE(commandLine.contains("Value must not be zero.")) << commandLine;
+    EXPECT_TRUE(commandLine.contains("Value must not be zero.")) << commandLine.toStdString();
     ui->setAnswer("prompt:N", "-2");
     EXPECT_EQ(ev("(initget 4) (getreal \"N: \")"), "ERROR: Function cancelled");
     EXPECT_EQ(ev("(getreal \"N: \")"), "-2.0");  // initget spoke for one call only
     ui->setAnswer("prompt:N", "");
     EXPECT_EQ(ev("(initget 1) (getint \"N: \")"), "ERROR: Function cancelled");
-    EXPECT_TRUE(commandLine.contains("A value is required.")) << commandLine;
+    EXPECT_TRUE(commandLine.contains("A value is required.")) << commandLine.toStdString();
     // Arbitrary input comes back as typed.
     ui->setAnswer("prompt:N", "muitos");
     EXPECT_EQ(ev("(initget 128) (getint \"N: \")"), "\"muitos\"");
@@ -60,7 +60,7 @@ TEST_F(LispInputTest, KeywordsOfInitget) {
     ui->setAnswer("prompt:Continuar? [Sim/Nao]", "talvez");
     EXPECT_EQ(ev("(initget \"Sim Nao\") (getkword \"Continuar? [Sim/Nao]: \")"),
               "ERROR: Function cancelled");
-    EXPECT_TRUE(commandLine.contains("Invalid option keyword.")) << commandLine;
+    EXPECT_TRUE(commandLine.contains("Invalid option keyword.")) << commandLine.toStdString();
     // An all-capitals keyword is typed whole; "LType,LT" sets its shortest form.
     ui->setAnswer("prompt:Opcao", "tod");
     EXPECT_EQ(ev("(initget \"TODOS\") (getkword \"Opcao: \")"), "ERROR: Function cancelled");
@@ -127,7 +127,8 @@ TEST_F(LispInputTest, PicksByPoint) {
 
 TEST_F(LispInputTest, AnUnansweredPromptCancels) {
     EXPECT_EQ(ev("(getint \"Quantidade: \")"), "ERROR: Function cancelled");
-    EXPECT_TRUE(messages.contains("no answer for prompt 'prompt:Quantidade'")) << messages;
+    EXPECT_TRUE(messages.contains("no answer for prompt 'prompt:Quantidade'"))
+        << messages.toStdString();
     // A program can catch it, as it would catch the user's Esc.
     EXPECT_EQ(ev("(vl-catch-all-error-message (vl-catch-all-apply 'getpoint '(\"P: \")))"),
               "\"Function cancelled\"");

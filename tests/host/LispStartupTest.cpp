@@ -2,8 +2,10 @@
 // script; and the same questions unanswered, which cancel the load.
 #include "QtPrinters.h"
 #include "ZvhostRun.h"
+#include "drawing/BlockRecord.h"
 #include "drawing/Database.h"
 #include "drawing/DxfLoader.h"
+#include "drawing/Entity.h"
 #include "drawing/LayerRecord.h"
 #include "drawing/XRecord.h"
 
@@ -39,8 +41,9 @@ TEST_F(LispStartupTest, LoadsIntoADrawingWithScriptedAnswers) {
                               answers() + QStringList{folder.filePath("projeto.dxf"), "-o", output},
                           environment, folder.path());
     ASSERT_EQ(run.status, 0) << run.out.toStdString() << run.err.toStdString();
-    EXPECT_TRUE(run.out.contains("Pronto: 2 (10.0 20.0 0.0) Nao ok 25.4 zv000")) << run.out;
-    EXPECT_TRUE(run.out.contains("Unknown command \"_.DESCONHECIDO\".")) << run.out;
+    EXPECT_TRUE(run.out.contains("Pronto: 2 (10.0 20.0 0.0) Nao ok 25.4 zv000"))
+        << run.out.toStdString();
+    EXPECT_TRUE(run.out.contains("Unknown command \"_.DESCONHECIDO\".")) << run.out.toStdString();
     auto db = zvdb::DxfLoader::loadFile(output.toStdString());
     ASSERT_NE(db, nullptr);
     ASSERT_NE(db->layer("ZV_NOTAS"), nullptr);
@@ -60,8 +63,9 @@ TEST_F(LispStartupTest, AnUnansweredQuestionStopsTheLoad) {
                                                    folder.filePath("projeto.dxf"), "-o", output},
                                                   environment, folder.path());
     EXPECT_NE(run.status, 0);
-    EXPECT_TRUE(run.err.contains("no answer for prompt 'prompt:Número de cópias'")) << run.err;
-    EXPECT_TRUE(run.out.contains("Function cancelled")) << run.out;
+    EXPECT_TRUE(run.err.contains("no answer for prompt 'prompt:Número de cópias'"))
+        << run.err.toStdString();
+    EXPECT_TRUE(run.out.contains("Function cancelled")) << run.out.toStdString();
     EXPECT_FALSE(QFile::exists(output));
 }
 
@@ -69,7 +73,7 @@ TEST_F(LispStartupTest, TheLispSubcommandTakesAnswersToo) {
     const zvtest::HostRun run = zvtest::runZvhost(
         QStringList{"lisp"} + answers() + QStringList{"inicio.lsp"}, environment, folder.path());
     ASSERT_EQ(run.status, 0) << run.out.toStdString() << run.err.toStdString();
-    EXPECT_TRUE(run.out.contains("Pronto: 2 (10.0 20.0 0.0) Nao ok 25.4")) << run.out;
+    EXPECT_TRUE(run.out.contains("Pronto: 2 (10.0 20.0 0.0) Nao ok 25.4")) << run.out.toStdString();
     const zvtest::HostRun usage = zvtest::runZvhost({"lisp", "a.lsp", "b.lsp"}, environment);
     EXPECT_EQ(usage.status, 2);
 }

@@ -73,7 +73,7 @@ TEST_F(SystemLispTest, AFileMissingIsMadeAndABrokenOneIsKept) {
 
 TEST_F(SystemLispTest, AlertStartappAndHelp) {
     EXPECT_EQ(ev("(alert \"Lista pronta\")"), "nil");
-    EXPECT_TRUE(messages.contains("ZVListas: Lista pronta")) << messages;
+    EXPECT_TRUE(messages.contains("ZVListas: Lista pronta")) << messages.toStdString();
     EXPECT_EQ(ev("(alert 3)"), "ERROR: bad argument type: stringp 3");
     const QString marker = folder.filePath("started");
     EXPECT_EQ(ev("(type (startapp \"/usr/bin/touch\" " + zvlisp::Printer::quoted(marker) + "))"),
@@ -83,7 +83,7 @@ TEST_F(SystemLispTest, AlertStartappAndHelp) {
     EXPECT_TRUE(QFile::exists(marker));
     EXPECT_EQ(ev("(startapp \"/nao/existe/programa\")"), "nil");
     EXPECT_EQ(ev("(help \"zv.chm\" \"entmake\")"), "\"zv.chm\"");
-    EXPECT_TRUE(commandLine.contains("docs/lisp.md")) << commandLine;
+    EXPECT_TRUE(commandLine.contains("docs/lisp.md")) << commandLine.toStdString();
 }
 
 }  // namespace
