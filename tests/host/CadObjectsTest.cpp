@@ -49,6 +49,26 @@ TEST_F(CadObjectsTest, EntmakeMakesEntitiesAsListed) {
                                  "LWPOLYLINE 0 0", "LWPOLYLINE 0 0"}));
 }
 
+TEST_F(CadObjectsTest, EntmakeMakesArcsBlocksReferencesAndPaperSpaceEntities) {
+    document->database()->createBlock("BORNE")->addCircle({0, 0, 0}, 1);
+    ev("(setq r (entmakex '((0 . \"INSERT\") (2 . \"BORNE\") (10 5 5) (41 . 2.0) (50 . 0.5))))");
+    EXPECT_EQ(ev("(cdr (assoc 2 (entget r)))"), "\"BORNE\"");
+    EXPECT_EQ(ev("(cdr (assoc 41 (entget r)))"), "2.0");
+    ev("(setq a (entmakex '((0 . \"ARC\") (10 0 0) (40 . 3.0) (50 . 0.0) (51 . 1.5))))");
+    EXPECT_EQ(ev("(mapcar '(lambda (c) (cdr (assoc c (entget a)))) '(40 50 51))"), "(3.0 0.0 1.5)");
+    EXPECT_EQ(ev("(cdr (assoc 1 (entget (entmakex '((0 . \"MTEXT\") (10 0 0) (40 . 2.0) (1 . "
+                 "\"Nota\"))))))"),
+              "\"Nota\"");
+    ev("(setq p (entmakex '((0 . \"POINT\") (67 . 1) (10 1 1))))");
+    EXPECT_EQ(ev("(cdr (assoc 67 (entget p)))"), "1");
+    // Model space holds the others, in the order made.
+    EXPECT_EQ(ev("(equal (entlast) p)"), "nil");
+    const auto entities = document->database()->modelSpace()->entities();
+    ASSERT_EQ(entities.size(), 3u);
+    EXPECT_EQ(entities[0]->type(), "INSERT");
+    EXPECT_EQ(entities[1]->type(), "ARC");
+}
+
 TEST_F(CadObjectsTest, EntmakeAnswersNilForAnInvalidList) {
     const int before = int(document->database()->modelSpace()->entities().size());
     EXPECT_EQ(ev("(entmake)"), "nil");
