@@ -80,8 +80,7 @@ std::optional<double> UnitTable::convert(double value, const QString& from,
     const double base = value * a->factor + a->offset;
     const double result = (base - b->offset) / b->factor;
     // Through an offset scale, a zero comes out as rounding noise: 32 F is 0 C, not 6e-14.
-    if (b->offset != 0.0 && std::fabs(result) < 1e-9 * std::fabs(b->offset / b->factor))
-        return 0.0;
+    if (b->offset != 0.0 && std::fabs(result) < 1e-9 * std::fabs(b->offset / b->factor)) return 0.0;
     return result;
 }
 

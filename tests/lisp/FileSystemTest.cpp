@@ -40,7 +40,8 @@ protected:
 
 TEST_F(FileSystemTest, FileNameParts) {
     EXPECT_EQ(ev("(vl-filename-base \"c:\\\\zv\\\\bin\\\\zvhost.exe\")"), "\"zvhost\"");
-    EXPECT_EQ(ev("(vl-filename-directory \"c:\\\\zv\\\\bin\\\\zvhost.exe\")"), "\"c:\\\\zv\\\\bin\"");
+    EXPECT_EQ(ev("(vl-filename-directory \"c:\\\\zv\\\\bin\\\\zvhost.exe\")"),
+              "\"c:\\\\zv\\\\bin\"");
     EXPECT_EQ(ev("(vl-filename-extension \"c:\\\\zv\\\\bin\\\\zvhost.exe\")"), "\".exe\"");
     EXPECT_EQ(ev("(vl-filename-base \"/home/u/projeto.v2.dxf\")"), "\"projeto.v2\"");
     EXPECT_EQ(ev("(vl-filename-directory \"/home/u/projeto.dxf\")"), "\"/home/u\"");
