@@ -1,5 +1,6 @@
 #include "CadLisp.h"
 
+#include "CadFunctions.h"
 #include "HostDocument.h"
 #include "drawing/BlockRecord.h"
 #include "drawing/Database.h"
@@ -22,20 +23,11 @@
 
 namespace zvhost {
 
-using zvlisp::Args;
-using zvlisp::Interpreter;
-using zvlisp::ListBuilder;
-using zvlisp::Type;
-using zvlisp::Value;
-
-namespace {
-
-// How a group code's value reads in LISP.
-enum class Kind { Text, Real, Integer, Point, Pointer };
+namespace cadlisp {
 
 Kind kindOf(int code) {
     if (zvdb::isPointerCode(code) && code != 1005) return Kind::Pointer;
-    if ((code >= 10 && code <= 18) || (code >= 110 && code <= 112) ||
+    if ((code >= 10 && code <= 18) || (code >= 110 && code <= 112) || code == 210 ||
         (code >= 1010 && code <= 1013))
         return Kind::Point;
     switch (zvdb::valueKind(code)) {
@@ -54,92 +46,6 @@ Kind kindOf(int code) {
 QString text(std::string_view v) {
     return QString::fromUtf8(v.data(), int(v.size()));
 }
-
-class CadFunctions : public std::enable_shared_from_this<CadFunctions> {
-public:
-    CadFunctions(Interpreter& lisp, HostDocument& document) : lisp_(lisp), document_(document) {}
-    // Each function holds the shared state, so it lives as long as the interpreter.
-    void install();
-
-private:
-    zvdb::Database& db() { return *document_.database(); }
-    Value ename(const zvdb::DbObject* object) {
-        if (!object) return {};
-        return Value::object(Type::Ename,
-                             new zvlisp::EnameObject({&object->database(), object->handle()}));
-    }
-    zvdb::DbObject* object(const Value& v) {
-        if (v.type() != Type::Ename) lisp_.badType("lentityp", v);
-        const auto name = static_cast<zvlisp::EnameObject*>(v.asObject())->name;
-        if (name.database != document_.database()) return nullptr;
-        zvdb::DbObject* o = db().objectByHandle(name.handle);
-        return o && !o->isErased() ? o : nullptr;
-    }
-    Value pair(int code, Value v) { return Value::cons(Value::integer(code), std::move(v)); }
-    Value point(int code, const zvdb::Point3& p) {
-        ListBuilder list;
-        list.add(Value::integer(code));
-        list.add(Value::real(p.x));
-        list.add(Value::real(p.y));
-        list.add(Value::real(p.z));
-        return list.take();
-    }
-    Value groupValue(int code, std::string_view raw) {
-        switch (kindOf(code)) {
-            case Kind::Real:
-                return Value::real(zvdb::TagValues::toReal(raw));
-            case Kind::Integer:
-                return Value::integer(std::int32_t(zvdb::TagValues::toInteger(raw)));
-            case Kind::Pointer:
-                return ename(db().objectByHandle(zvdb::TagValues::toHandle(raw)));
-            default:
-                return Value::string(text(raw));
-        }
-    }
-    // The tags of a range as dotted pairs, points gathered from their three groups.
-    void addGroups(ListBuilder& list, std::span<const zvdb::Tag> tags, size_t from, size_t to) {
-        for (size_t i = from; i < to; ++i) {
-            const int code = tags[i].code;
-            if (code == 102) {  // application groups stay out, as CAD users see them
-                while (i + 1 < to && !(tags[i + 1].code == 102))
-                    ++i;
-                ++i;
-                continue;
-            }
-            if (kindOf(code) == Kind::Point) {
-                zvdb::Point3 p{zvdb::TagValues::toReal(tags[i].value), 0, 0};
-                if (i + 1 < to && tags[i + 1].code == code + 10)
-                    p.y = zvdb::TagValues::toReal(tags[++i].value);
-                if (i + 1 < to && tags[i + 1].code == code + 20)
-                    p.z = zvdb::TagValues::toReal(tags[++i].value);
-                list.add(point(code, p));
-            } else {
-                list.add(pair(code, groupValue(code, tags[i].value)));
-            }
-        }
-    }
-    Value xdata(const zvdb::DbObject& o, const Value& applications);
-    Value entget(Args a);
-    Value entmod(Args a);
-    void setGroup(zvdb::DbObject& o, int code, int occurrence, const Value& value);
-    Value entnext(Args a);
-    Value tblsearch(Args a, bool next);
-    Value getvar(Args a);
-    Value setvar(Args a);
-    Value dictsearch(Args a);
-    Value dictnext(Args a);
-    std::vector<zvdb::Entity*> sequence();
-    Value ssget(Args a);
-    bool passes(const zvdb::Entity& e, const Value& filter);
-    zvlisp::PicksetObject* pickset(const Value& v);
-    zvdb::SymbolTable* table(const Value& name);
-
-    Interpreter& lisp_;
-    HostDocument& document_;
-    QHash<QString, int> tableCursor_;
-    QHash<quint64, int> dictCursor_;
-    int filedia_ = 1;
-};
 
 Value CadFunctions::xdata(const zvdb::DbObject& o, const Value& applications) {
     ListBuilder groups;
@@ -555,25 +461,60 @@ void CadFunctions::install() {
             return result;
         },
         0, 2);
-    lisp_.define(
-        "command",
-        [self](Interpreter& in, Args a) {
-            QStringList tokens;
-            for (const Value& v : a)
-                tokens << (v.isString() ? v.asString() : QString::number(in.toNumber(v)));
-            if (!tokens.isEmpty() && !self->document_.runCommand(tokens))
-                in.fail((self->document_.hasHostCommand(tokens.first()) ? "Command failed: "
-                                                                        : "Unknown command ") +
-                        tokens.first());
-            return Value();
-        },
-        0, zvlisp::kVariadic);
+    const zvlisp::NativeFn command = [self](Interpreter& in, Args a) {
+        return self->command(in, a);
+    };
+    lisp_.define("command", command, 0, zvlisp::kVariadic);
+    lisp_.define("command-s", command, 0, zvlisp::kVariadic);
 }
 
-}  // namespace
+// A command's tokens as a user types them: texts as they are, numbers, points as "x,y,z";
+// nil adds nothing. An unknown command says so and answers nil, as CAD hosts do, so a
+// start-up file goes on; a host command that fails is an error.
+Value CadFunctions::command(Interpreter& in, Args a) {
+    QStringList tokens;
+    for (const Value& v : a) {
+        if (v.isNil()) continue;
+        if (v.isString()) {
+            tokens << v.asString();
+        } else if (v.isInt()) {
+            tokens << QString::number(v.asInt());
+        } else if (v.isReal()) {
+            tokens << QString::number(v.asReal(), 'g', 17);
+        } else if (v.isCons()) {
+            QStringList xyz;
+            for (const Value& c : in.toVector(v))
+                xyz << QString::number(in.toNumber(c), 'g', 17);
+            tokens << xyz.join(',');
+        } else if (v.type() == Type::Ename) {
+            const zvdb::DbObject* o = object(v);
+            tokens << (o ? QString::fromStdString(zvdb::TagValues::fromHandle(o->handle()))
+                         : QString());
+        } else {
+            in.badType("stringp", v);
+        }
+    }
+    if (tokens.isEmpty()) return {};
+    if (!document_.hasHostCommand(tokens.first())) {
+        in.write("Unknown command \"" + tokens.first() + "\".\n");
+        return {};
+    }
+    if (!document_.runCommand(tokens)) in.fail("Command failed: " + tokens.first());
+    return {};
+}
+
+}  // namespace cadlisp
+
+using zvlisp::Args;
+using zvlisp::Interpreter;
+using zvlisp::Value;
 
 void installCadFunctions(Interpreter& lisp, HostDocument& document) {
-    std::make_shared<CadFunctions>(lisp, document)->install();
+    auto functions = std::make_shared<cadlisp::CadFunctions>(lisp, document);
+    functions->install();
+    functions->installObjects();
+    functions->installSelection();
+    functions->installInput();
     lisp.define(
         "vl-cmdf",
         [](Interpreter& in, Args a) {

@@ -4,6 +4,7 @@
 #include "CadLisp.h"
 #include "DocumentLisp.h"
 #include "HostDocument.h"
+#include "SystemLisp.h"
 #include "product/ProductLisp.h"
 #include "product/UserConfig.h"
 
@@ -36,7 +37,11 @@ void setUpDocument(HostDocument& document) {
         [&document](const QString& text) { document.printMessage(text); });
     if (!document.fileName().isEmpty())
         lisp->interpreter().searchPaths() << QFileInfo(document.fileName()).absolutePath();
+    lisp->interpreter().unitTableFile =
+        (Application::instance() ? Application::instance()->executableFolder() : QString()) +
+        "/program/units.txt";
     installCadFunctions(lisp->interpreter(), document);
+    installSystemFunctions(lisp->interpreter());
     installProduct(lisp->interpreter(), document);
     document.setLisp(std::move(lisp));
 }

@@ -19,7 +19,8 @@ namespace zvhost {
 namespace {
 
 const Subcommand kSubcommands[] = {
-    {"lisp", "lisp [FILE.lsp]   run a LISP file, or an interactive LISP prompt", runLispSubcommand},
+    {"lisp", "lisp [--answer N=V]... [FILE.lsp]  run a LISP file, or an interactive LISP prompt",
+     runLispSubcommand},
     {"dxf-info", "dxf-info DRAWING  version, entity counts, layers, blocks and dictionaries",
      runDxfInfoSubcommand},
     {"catalogue",

@@ -1,6 +1,6 @@
-// zvhost lisp [FILE.lsp]: runs a LISP file in a new document, or reads, evaluates and
-// prints expressions from the standard input until it ends. An expression may span lines;
-// an error is reported and the session goes on; Ctrl-C cancels a running evaluation.
+// zvhost lisp [--answer NAME=VALUE]... [FILE.lsp]: runs a LISP file in a new document, or reads,
+// evaluates and prints expressions from the standard input until it ends. An expression may span
+// lines; an error is reported and the session goes on; Ctrl-C cancels a running evaluation.
 #include "Application.h"
 #include "ConsoleUserInterface.h"
 #include "DocumentLisp.h"
@@ -76,12 +76,24 @@ int repl(zvlisp::Interpreter& lisp, CliContext& context) {
 }  // namespace
 
 int runLispSubcommand(CliContext& context) {
-    if (context.args.size() > 1 || (context.args.size() == 1 && context.args[0].startsWith('-'))) {
-        context.err << "usage: zvhost lisp [FILE.lsp]\n";
+    // --answer NAME=VALUE answers the prompts of getint, getpoint... as in a drawing run.
+    auto ui = std::make_unique<ConsoleUserInterface>(context.out, context.err, false);
+    QStringList files;
+    for (int i = 0; i < context.args.size(); ++i) {
+        const QString& arg = context.args[i];
+        if (arg == "--answer" && i + 1 < context.args.size() && ui->addAnswer(context.args[i + 1]))
+            ++i;
+        else if (arg.startsWith("--answer=") && ui->addAnswer(arg.mid(9)))
+            continue;
+        else
+            files << arg;
+    }
+    if (files.size() > 1 || (files.size() == 1 && files[0].startsWith('-'))) {
+        context.err << "usage: zvhost lisp [--answer NAME=VALUE]... [FILE.lsp]\n";
         return kExitUsage;
     }
-    Application app(std::make_unique<ConsoleUserInterface>(context.out, context.err, false),
-                    context.out);
+    context.args = files;
+    Application app(std::move(ui), context.out);
     HostDocument* document = app.openDocument(QString());
     auto* lisp = dynamic_cast<DocumentLisp*>(document->lisp());
     if (!lisp) {

@@ -46,19 +46,25 @@ bool zoomExtents(HostDocument& document) {
     return true;
 }
 
+// Window and extents set the view; all shows the extents; the other ways (previous,
+// centre, scale...) leave it, as there is no screen whose view they would change.
 bool zoom(HostDocument& document, const QStringList& args) {
     const QString option = args.value(0).toUpper().remove('_');
     if (option == "W" || option == "WINDOW") return zoomWindow(document, args.mid(1));
-    if (option == "E" || option == "EXTENTS") return zoomExtents(document);
-    return false;
+    if (option == "E" || option == "EXTENTS" || option == "A" || option == "ALL")
+        return zoomExtents(document);
+    return true;
 }
 
 }  // namespace
 
 void registerViewCommands(Application& app) {
     app.registerHostCommand("ZOOM", zoom);
-    // Nothing is drawn on screen by this host: a regeneration has nothing to repaint.
-    app.registerHostCommand("REGEN", [](HostDocument&, const QStringList&) { return true; });
+    // Nothing is drawn on screen by this host: what a start-up file asks of the display
+    // (regenerations, redraws, resolution, pans, visual styles) has nothing to change.
+    for (const char* name : {"REGEN", "REGENALL", "REDRAW", "REDRAWALL", "VIEWRES", "PAN", "-PAN",
+                             "VSCURRENT", "-VSCURRENT", "SHADEMODE", "UCSICON"})
+        app.registerHostCommand(name, [](HostDocument&, const QStringList&) { return true; });
 }
 
 }  // namespace zvhost

@@ -1,5 +1,6 @@
 #pragma once
-// The host's view commands: ZOOM (window and extents) and REGEN, with a view per document.
+// The host's view commands: ZOOM (window and extents), with a view per document, and the
+// display commands that have nothing to do without a screen (REGEN, VIEWRES, PAN...).
 namespace zvhost {
 
 class Application;

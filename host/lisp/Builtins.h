@@ -14,5 +14,10 @@ void registerListBuiltins(Interpreter& in);
 void registerStringBuiltins(Interpreter& in);
 // Files, load and getenv.
 void registerFileBuiltins(Interpreter& in);
+// File names, copying, renaming, sizes, times and folder listings (vl-file-*).
+void registerFileSystemBuiltins(Interpreter& in);
+// Units, versions, memory calls kept for old programs, and the functions that need a
+// screen or a system service this host lacks, which fail with their name.
+void registerSystemBuiltins(Interpreter& in);
 
 }  // namespace zvlisp

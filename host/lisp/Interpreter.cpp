@@ -75,6 +75,8 @@ void Interpreter::registerBuiltins() {
     registerListBuiltins(*this);
     registerStringBuiltins(*this);
     registerFileBuiltins(*this);
+    registerFileSystemBuiltins(*this);
+    registerSystemBuiltins(*this);
 }
 
 void Interpreter::define(const QString& name, NativeFn fn, int minArgs, int maxArgs) {
@@ -85,7 +87,15 @@ void Interpreter::define(const QString& name, NativeFn fn, int minArgs, int maxA
 }
 
 void Interpreter::defineSpecial(const QString& name, SpecialForm form) {
-    intern(name)->special = form;
+    Symbol* symbol = intern(name);
+    symbol->special = form;
+    // As a value the form is a built-in function: (type if) is SUBR, as user code tests it.
+    // Applied as a function it refuses, since its arguments would already be evaluated.
+    if (symbol->value.isNil())
+        define(
+            name,
+            [symbol](Interpreter& in, Args) -> Value { in.fail("bad function: " + symbol->name); },
+            0, kVariadic);
 }
 
 void Interpreter::setGlobal(const QString& name, Value value) {

@@ -125,6 +125,8 @@ public:
     QString findFile(const QString& name) const;
 
     Units units;
+    // The units table of cvunit (see UnitTable); the host sets it to the file it ships.
+    QString unitTableFile;
     // Functions that build text fail with "string too long: NAME" beyond this many
     // characters, long before the memory runs out.
     int maxStringLength = 64 << 20;

@@ -174,3 +174,78 @@ std::optional<double> NumberFormat::parseLinear(const QString& input) {
 }
 
 }  // namespace zvlisp
+
+namespace zvlisp {
+
+// 45d30'15.5" with minutes and seconds optional; a bare number is degrees.
+std::optional<double> NumberFormat::parseDms(const QString& input) {
+    static const QRegularExpression pattern(
+        QStringLiteral("^(\\d+(?:\\.\\d*)?)(?:d(?:(\\d+(?:\\.\\d*)?)')?"
+                       "(?:(\\d+(?:\\.\\d*)?)\")?)?$"));
+    const QRegularExpressionMatch m = pattern.match(input.trimmed());
+    if (!m.hasMatch()) return std::nullopt;
+    return m.captured(1).toDouble() + m.captured(2).toDouble() / 60.0 +
+           m.captured(3).toDouble() / 3600.0;
+}
+
+std::optional<double> NumberFormat::parseAngle(const QString& input, int mode) {
+    QString text = input.trimmed();
+    if (text.isEmpty()) return std::nullopt;
+    bool negative = false;
+    if (mode != 4 && (text.startsWith('-') || text.startsWith('+'))) {
+        negative = text.startsWith('-');
+        text = text.mid(1).trimmed();
+    }
+    const double toRadians = M_PI / 180.0;
+    std::optional<double> result;
+    bool ok = false;
+    switch (mode) {
+        case 0: {
+            const double degrees = text.toDouble(&ok);
+            if (ok) result = degrees * toRadians;
+            break;
+        }
+        case 1:
+            if (const auto degrees = parseDms(text)) result = *degrees * toRadians;
+            break;
+        case 2: {
+            if (text.endsWith('g', Qt::CaseInsensitive)) text.chop(1);
+            const double grads = text.toDouble(&ok);
+            if (ok) result = grads * M_PI / 200.0;
+            break;
+        }
+        case 3: {
+            if (text.endsWith('r', Qt::CaseInsensitive)) text.chop(1);
+            const double radians = text.toDouble(&ok);
+            if (ok) result = radians;
+            break;
+        }
+        case 4: {
+            // N, S, E, W, or N 45d0'0" E: an angle off north or south toward east or west.
+            const QString upper = text.toUpper().simplified();
+            if (upper == "E") return 0.0;
+            if (upper == "N") return M_PI / 2;
+            if (upper == "W") return M_PI;
+            if (upper == "S") return 3 * M_PI / 2;
+            if (upper.size() < 3) return std::nullopt;
+            const QChar from = upper.front(), toward = upper.back();
+            if ((from != 'N' && from != 'S') || (toward != 'E' && toward != 'W'))
+                return std::nullopt;
+            const auto off = parseDms(upper.mid(1, upper.size() - 2).toLower().trimmed());
+            if (!off) return std::nullopt;
+            const double o = *off;
+            double degrees = 0;
+            if (from == 'N')
+                degrees = toward == 'E' ? 90.0 - o : 90.0 + o;
+            else
+                degrees = toward == 'E' ? 270.0 + o : 270.0 - o;
+            return degrees * toRadians;
+        }
+        default:
+            return std::nullopt;
+    }
+    if (!result) return std::nullopt;
+    return negative ? -*result : *result;
+}
+
+}  // namespace zvlisp

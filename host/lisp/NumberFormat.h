@@ -18,12 +18,16 @@ public:
     static QString angle(double radians, int mode, int precision);
     // The value of a text in any linear format; none when it is no number.
     static std::optional<double> parseLinear(const QString& text);
+    // The radians of a text in an angle mode as angtos writes it (a bare number reads in
+    // the mode's unit); none when the text is no angle of that mode.
+    static std::optional<double> parseAngle(const QString& text, int mode);
 
 private:
     static QString decimal(double value, int precision, int dimzin);
     static QString fraction(double value, int precision, bool spaceBetween, bool* carried);
     static QString feetAndInches(double value, int mode, int precision, int dimzin);
     static QString dms(double degrees, int precision);
+    static std::optional<double> parseDms(const QString& text);
 };
 
 }  // namespace zvlisp

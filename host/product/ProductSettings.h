@@ -14,6 +14,9 @@ public:
 
     static QString file();
     QString value(const QString& key) const { return values_.value(key); }
+    // Sets one record of the file (added when missing) and saves it atomically; false with
+    // `error` set when the file does not parse (it is never replaced then) or the save fails.
+    static bool store(const QString& key, const QString& value, QString* error);
     // DBPass is kept as the hex of its UTF-16 code units, each mixed with a fixed key.
     QString password() const;
 

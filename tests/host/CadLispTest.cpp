@@ -152,7 +152,9 @@ TEST_F(CadLispTest, DictionariesAndCommands) {
     EXPECT_TRUE(saida_.contains("-PRINT: only the detailed configuration is answered by this host"))
         << saida_.toStdString();
     EXPECT_TRUE(saida_.contains("Command failed: _-PRINT")) << saida_.toStdString();
-    EXPECT_EQ(lisp("(vl-catch-all-error-p (vl-catch-all-apply 'command '(\"_.NAOEXISTE\")))"), "T");
+    // An unknown command says so and answers nil: the program goes on.
+    EXPECT_EQ(lisp("(list (command \"_.NAOEXISTE\" 1) 2)"), "(nil 2)");
+    EXPECT_TRUE(saida_.contains("Unknown command \"_.NAOEXISTE\".")) << saida_.toStdString();
     // The reference at (10, 20) with its attribute shows; the line of the frozen page not.
     EXPECT_GE(documento_->view().maxX, 11.0);
     EXPECT_LT(documento_->view().maxX, 100.0);

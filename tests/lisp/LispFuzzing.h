@@ -18,7 +18,10 @@ public:
     static Result run(const QByteArray& bytes) {
         zvlisp::Interpreter lisp;
         lisp.setOutput([](const QString&) {});
-        for (const char* name : {"open", "load", "findfile", "close"})
+        for (const char* name :
+             {"open", "load", "findfile", "close", "vl-file-copy", "vl-file-delete",
+              "vl-file-rename", "vl-file-size", "vl-file-systime", "vl-file-directory-p",
+              "vl-directory-files", "vl-filename-mktemp"})
             lisp.setGlobal(name, {});
         lisp.maxStringLength = 1 << 16;
         int polls = 0;
