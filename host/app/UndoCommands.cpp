@@ -15,7 +15,21 @@ int stepCount(const QStringList& args) {
     return ok && count > 0 ? count : 0;
 }
 
+// The options start-up files and routines give: BEgin and End bracket a group of their own,
+// the others (Auto, Control, Mark, Back) have nothing to set in this host.
+bool undoOption(HostDocument& document, const QString& option) {
+    if (option == "BE" || option == "BEGIN")
+        document.beginUndoGroup();
+    else if (option == "E" || option == "END")
+        document.endUndoGroup();
+    return true;
+}
+
 bool undoSteps(HostDocument& document, const QStringList& args) {
+    const QString option = args.value(0).toUpper().remove('_');
+    static const QStringList kOptions = {"BE", "BEGIN",   "E", "END",  "A", "AUTO",
+                                         "C",  "CONTROL", "M", "MARK", "B", "BACK"};
+    if (kOptions.contains(option)) return undoOption(document, option);
     const int count = stepCount(args);
     if (count == 0) return false;
     if (!document.undoEnabled()) {

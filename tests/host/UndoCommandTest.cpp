@@ -90,6 +90,21 @@ TEST_F(UndoCommandTest, NothingToUndoOrUndoOffIsAFailedCommandAndNothingIsSaved)
     EXPECT_FALSE(QFile::exists(pasta_->path("y.dxf")));
 }
 
+TEST_F(UndoCommandTest, TheGroupOptionsOfStartUpFilesAreAcceptedAndBracketAStep) {
+    // A routine's own group is one step; the options that set nothing pass quietly.
+    const QString rotina =
+        "(progn (command \"_.UNDO\" \"_BE\")"
+        " (entmake '((0 . \"LINE\") (8 . \"X\") (10 0.0 0.0 0.0) (11 1.0 1.0 0.0)))"
+        " (entmake '((0 . \"LINE\") (8 . \"X\") (10 0.0 0.0 0.0) (11 2.0 1.0 0.0)))"
+        " (command \"_.UNDO\" \"_E\") (command \"_.UNDO\" \"_M\")";
+    const QByteArray feito = depois("feito.dxf", {"--eval", rotina + ")"});
+    ASSERT_EQ(feito.count("\nLINE\n") - depois("sem.dxf", {}).count("\nLINE\n"), 2);
+    EXPECT_EQ(diferenca(depois("g.dxf", {"--eval", rotina + " (command \"_.UNDO\" \"1\"))"}),
+                        depois("sem.dxf", {})),
+              "")
+        << "both lines went in one step";
+}
+
 TEST(UndoAndIndexes, AnIndexOfTheDrawingMadeBeforeAStepIsStaleAfterUndo) {
     zvdb::Database db;
     db.modelSpace()->addLine({0, 0, 0}, {1, 1, 0}, "P$0001$A");
