@@ -120,13 +120,16 @@ TEST_F(FacadeFixture, ABlockFileLoadsAtTheOriginThroughItsWindowsPath) {
     EXPECT_TRUE(achouLinha);
 }
 
-TEST_F(FacadeFixture, ARealDwgFileIsRefusedWithAMessage) {
+TEST_F(FacadeFixture, ADamagedDwgBlockFileIsRefusedWithAMessageNamingIt) {
     QFile dwg(arquivo("REAL.dwg"));
     ASSERT_TRUE(dwg.open(QIODevice::WriteOnly));
     dwg.write("AC1032\0\0\0binary", 16);
     dwg.close();
+    const std::size_t blocos = db().blocks().size();
     EXPECT_TRUE(CICad::CarregaBloco("REAL", arquivo("REAL.dwg")).isNull());
-    EXPECT_TRUE(saida().contains("this edition reads DXF drawings only"));
+    EXPECT_TRUE(saida().contains("REAL.dwg: ")) << saida().toStdString();
+    EXPECT_TRUE(saida().contains("DWG")) << saida().toStdString();
+    EXPECT_EQ(db().blocks().size(), blocos);
 }
 
 TEST_F(FacadeFixture, InsertingMakesAttributesAndKeepsSinglePrecision) {
