@@ -17,7 +17,7 @@ namespace {
 zvdb::DwgImport::Setup dwgSetup() {
     zvdb::DwgImport::Setup setup;
     if (qEnvironmentVariableIsEmpty("ZV_DWG_CONVERTER") && QCoreApplication::instance())
-        setup.converterDir = (QCoreApplication::applicationDirPath() + "/dwg").toStdString();
+        setup.converterDir = QString(QCoreApplication::applicationDirPath() + "/dwg").toStdString();
     return setup;
 }
 

@@ -141,8 +141,10 @@ std::unique_ptr<Database> DwgImport::loadFile(const std::string& path, const Set
                        " s and was stopped; the drawing may be damaged (ZV_DWG_TIMEOUT sets "
                        "the limit in seconds)");
     }
-    const std::string said =
-        QString::fromUtf8(converter.readAllStandardError()).trimmed().toStdString();
+    // The converter's own message is its last line; the package logs before it.
+    const QStringList lines =
+        QString::fromUtf8(converter.readAllStandardError()).trimmed().split('\n');
+    const std::string said = lines.last().trimmed().toStdString();
     if (converter.exitStatus() != QProcess::NormalExit)
         throw DxfError("the DWG converter stopped while reading it; the drawing may be damaged" +
                        (said.empty() ? std::string() : " (" + said + ")"));

@@ -11,9 +11,7 @@
 #include <QJsonDocument>
 #include <QJsonParseError>
 
-#include <bit>
 #include <charconv>
-#include <cmath>
 #include <numbers>
 #include <unordered_map>
 #include <unordered_set>
@@ -53,6 +51,9 @@ public:
         group = Group{code, valueLine, begin, at_};
         return true;
     }
+
+    std::size_t position() const { return at_; }
+    void seek(std::size_t position) { at_ = position; }
 
 private:
     bool line(std::string_view& out) {
@@ -146,6 +147,67 @@ void writeAttribute(GroupWriter& out, const QJsonObject& attribute, std::uint64_
     if (valign != 0) out.integer(74, valign);
 }
 
+// Where the converter's text groups (codes 3, then 1) that start at `begin` end. This build
+// may write bytes from past the end of a long text there, a line that is no group code
+// among them: the groups resume at the next code-1 line. npos when they can't be found.
+std::size_t textGroupsEnd(std::string_view dxf, std::size_t begin) {
+    std::size_t at = begin;
+    auto nextLine = [&](std::string_view& line) {
+        if (at >= dxf.size()) return false;
+        std::size_t end = dxf.find('\n', at);
+        if (end == std::string_view::npos) end = dxf.size();
+        line = dxf.substr(at, end - at);
+        if (!line.empty() && line.back() == '\r') line.remove_suffix(1);
+        while (!line.empty() && line.front() == ' ')
+            line.remove_prefix(1);
+        at = end < dxf.size() ? end + 1 : end;
+        return true;
+    };
+    std::string_view code, value;
+    while (nextLine(code)) {
+        if (code == "3" && nextLine(value)) continue;
+        if (code == "1") return nextLine(value) ? at : std::string_view::npos;
+        // Not a text group: look a few lines on for the closing one.
+        constexpr int kLookAhead = 16;
+        for (int i = 0; i < kLookAhead && nextLine(code); ++i)
+            if (code == "1") return nextLine(value) ? at : std::string_view::npos;
+        return std::string_view::npos;
+    }
+    return std::string_view::npos;
+}
+
+// A long text as the format holds it: pieces of at most 250 bytes (code 3), the last one
+// with code 1, never parting a UTF-8 character.
+void writeLongText(GroupWriter& out, std::string_view text) {
+    constexpr std::size_t kPiece = 250;
+    while (text.size() > kPiece) {
+        std::size_t cut = kPiece;
+        while (cut > 0 && (static_cast<unsigned char>(text[cut]) & 0xC0) == 0x80)
+            --cut;
+        out.put(3, text.substr(0, cut));
+        text.remove_prefix(cut);
+    }
+    out.put(1, text);
+}
+
+// A text value as the format writes it: a control character (a line feed in a multi-line
+// text) as ^ and a letter, a caret as "^ ", so that the value stays one line.
+std::string caretEncoded(std::string_view text) {
+    std::string out;
+    out.reserve(text.size());
+    for (const char c : text) {
+        if (c == '^') {
+            out += "^ ";
+        } else if (static_cast<unsigned char>(c) < 0x20) {
+            out += '^';
+            out += static_cast<char>(c + 0x40);
+        } else {
+            out += c;
+        }
+    }
+    return out;
+}
+
 bool allDigits(std::string_view text) {
     if (text.empty()) return false;
     for (const char c : text)
@@ -173,6 +235,12 @@ std::string DwgRepair::repairText(std::string_view dxf) {
         const QJsonObject reference = entry.toObject();
         attributesOf.emplace(handleOf(reference.value("handle")),
                              reference.value("attributes").toArray());
+    }
+    std::unordered_map<std::uint64_t, std::string> longTexts;
+    for (const QJsonValue& entry : facts_.value("longTexts").toArray()) {
+        const QJsonObject text = entry.toObject();
+        longTexts.emplace(handleOf(text.value("handle")),
+                          caretEncoded(text.value("text").toString().toStdString()));
     }
     std::unordered_map<std::uint64_t, std::string_view> layerNames;
     std::unordered_set<std::string_view> names;
@@ -217,6 +285,7 @@ std::string DwgRepair::repairText(std::string_view dxf) {
     std::unordered_set<std::uint64_t> present;
     std::string_view entityType;
     bool inXData = false;
+    const std::string* longText = nullptr;  // the multi-line text being read, when long
     while (reader.next(group)) {
         if (group.code == 0) {
             inXData = false;
@@ -236,6 +305,7 @@ std::string DwgRepair::repairText(std::string_view dxf) {
                 wanted = nullptr;  // no SEQEND to put them before: left as they are
             }
             entityType = group.value;
+            longText = nullptr;
             inReference = entityType == "INSERT";
             if (inReference) {
                 reference = 0;
@@ -253,7 +323,33 @@ std::string DwgRepair::repairText(std::string_view dxf) {
         } else if (wanted && entityType == "ATTRIB" && group.code == 5) {
             present.insert(TagValues::toHandle(group.value));
         }
+        if (entityType == "MTEXT" && group.code == 5) {
+            const auto it = longTexts.find(TagValues::toHandle(group.value));
+            longText = it == longTexts.end() ? nullptr : &it->second;
+        } else if (longText && (group.code == 3 || group.code == 1)) {
+            // The text as the model holds it, in place of the converter's groups.
+            const std::size_t end = textGroupsEnd(dxf, group.begin);
+            if (end != std::string_view::npos) {
+                copyTo(group.begin);
+                writeLongText(writer, *longText);
+                copied = end;
+                reader.seek(end);
+                ++counts_.longTexts;
+            }
+            longText = nullptr;
+            continue;
+        }
         if (group.code == 1001) inXData = true;
+        if (!inXData && group.code >= 420 && group.code <= 427) {
+            // A true colour is 24 bits of RGB; this build leaves its colour-method byte on.
+            const long long value = TagValues::toInteger(group.value);
+            if (value < 0 || value > 0xFFFFFF) {
+                copyTo(group.begin);
+                writer.integer(group.code, value & 0xFFFFFF);
+                copied = group.end;
+                ++counts_.trueColors;
+            }
+        }
         if (!inXData) continue;
         if (group.code == 1070) {
             // A 16-bit signed number that came out unsigned: 65535 is -1.
@@ -269,7 +365,7 @@ std::string DwgRepair::repairText(std::string_view dxf) {
             const auto result =
                 std::from_chars(group.value.data(), group.value.data() + group.value.size(), raw);
             if (result.ec != std::errc()) continue;
-            const auto it = layerNames.find(std::byteswap(raw));
+            const auto it = layerNames.find(__builtin_bswap64(raw));
             if (it == layerNames.end()) continue;
             copyTo(group.begin);
             writer.put(1003, it->second);

@@ -8,9 +8,10 @@
 //        ..., "layer": ..., "color": ..., "position": [x, y, z], "alignment": [x, y, z],
 //        "height": ..., "rotation": radians, "widthFactor": ..., "oblique": radians,
 //        "style": ..., "halign": ..., "valign": ..., "flags": ...}, ...]}, ...],
-//    "xrecordAngles": [{"handle": "309", "angles": [radians, ...]}, ...]}
-// Attributes and extended data are mended in the DXF text before it is read (they keep
-// their handles that way); the rest in the drawing read from it.
+//    "xrecordAngles": [{"handle": "309", "angles": [radians, ...]}, ...],
+//    "longTexts": [{"handle": "779", "text": ...}, ...]}
+// Attributes, long multi-line texts and extended data are mended in the DXF text before it is read
+// (they keep their handles that way); the rest in the drawing read from it.
 #include <QJsonObject>
 
 #include <cstddef>
@@ -31,6 +32,8 @@ public:
         std::size_t xrecordAngles = 0;   // angles of Xrecords put back in radians
         std::size_t xdataIntegers = 0;   // 1070 values read back as signed 16-bit numbers
         std::size_t xdataLayers = 0;     // 1003 values put back as layer names
+        std::size_t longTexts = 0;       // long multi-line texts written from the model
+        std::size_t trueColors = 0;      // true colours cut to their 24 bits of RGB
     };
 
     // Throws DxfError when the facts are not a JSON object.

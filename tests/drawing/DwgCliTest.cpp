@@ -89,7 +89,7 @@ TEST_F(ZvhostDwg, ADwgOpensAsTheDocumentAndSavesAsDxf) {
     ASSERT_TRUE(reference);
     EXPECT_EQ(reference->attributes().size(), 3u);
 
-    const HostRun info = zvtest::runZvhost({"dxfinfo", drawing});
+    const HostRun info = zvtest::runZvhost({"dxf-info", drawing});
     ASSERT_EQ(info.status, 0) << info.err.toStdString();
     EXPECT_TRUE(info.out.contains("version: AC1015")) << info.out.toStdString();
     EXPECT_TRUE(info.out.contains("Layer_Freeze frozen")) << info.out.toStdString();
@@ -120,7 +120,9 @@ TEST_F(ZvhostDwg, UnreadableDwgFilesEndInStatusOneAndWriteNothing) {
     run = zvhost({cut, "-o", output});
     EXPECT_EQ(run.status, 1);
     EXPECT_TRUE(run.err.contains(cut + ": ")) << run.err.toStdString();
-    if (!nodeAbsent()) EXPECT_TRUE(run.err.contains("may be damaged")) << run.err.toStdString();
+    if (!nodeAbsent()) {
+        EXPECT_TRUE(run.err.contains("may be damaged")) << run.err.toStdString();
+    }
     EXPECT_FALSE(QFileInfo::exists(output));
     EXPECT_EQ(contents(cut), cutBefore);
 }

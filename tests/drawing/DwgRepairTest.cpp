@@ -4,6 +4,7 @@
 #include "drawing/BlockRecord.h"
 #include "drawing/BlockReference.h"
 #include "drawing/Database.h"
+#include "drawing/Dictionary.h"
 #include "drawing/DwgRepair.h"
 #include "drawing/DxfError.h"
 #include "drawing/DxfLoader.h"
@@ -14,7 +15,6 @@
 
 #include <gtest/gtest.h>
 
-#include <bit>
 #include <numbers>
 
 using namespace zvdb;
@@ -38,10 +38,6 @@ Repaired repairAndLoad(const std::string& text, const std::string& facts) {
 
 std::string hex(std::uint64_t handle) {
     return TagValues::fromHandle(handle);
-}
-
-std::vector<Tag> tagsOf(const DbObject& object) {
-    return std::vector<Tag>(object.tags().begin(), object.tags().end());
 }
 
 }  // namespace
@@ -89,11 +85,15 @@ TEST(DwgRepairPolylines, VertexWidthsArePutBackAfterEachVertex) {
     std::vector<std::pair<double, double>> widths;
     double x = -1;
     for (const Tag& tag : read->tags()) {
-        if (tag.code == 43) ADD_FAILURE() << "a constant width of 0 stays beside vertex widths";
+        if (tag.code == 43) {
+            ADD_FAILURE() << "a constant width of 0 stays beside vertex widths";
+        }
         if (tag.code == 10) x = TagValues::toReal(tag.value);
         if (tag.code == 40) widths.emplace_back(TagValues::toReal(tag.value), 0.0);
         if (tag.code == 41) widths.back().second = TagValues::toReal(tag.value);
-        if (tag.code == 40 && widths.size() == 3) EXPECT_EQ(x, 20.0);
+        if (tag.code == 40 && widths.size() == 3) {
+            EXPECT_EQ(x, 20.0);
+        }
     }
     EXPECT_EQ(widths, (std::vector<std::pair<double, double>>{{0.2, 0.1}, {0, 0}, {0.1, 0.5}}));
     // Three widths for two vertices: not the polyline the model knows, left as it was.
@@ -218,7 +218,7 @@ TEST(DwgRepairExtendedData, SixteenBitNumbersAreSignedAndLayerNamesComeBack) {
     TagListBuilder body(db.arena());
     body.text(100, "AcDbLine").point(10, {0, 0, 0}).point(11, {1, 0, 0});
     Entity* line = db.addEntity(*db.modelSpace(), "LINE", body.take(), "0");
-    const std::string swapped = std::to_string(std::byteswap(layer->handle()));
+    const std::string swapped = std::to_string(__builtin_bswap64(layer->handle()));
     const std::vector<Tag> items{{1003, swapped}, {1070, "65535"}, {1070, "32767"},
                                  {1070, "32768"}, {1070, "-5"},    {1003, "123"},
                                  {1071, "65535"}, {1000, "65535"}};
@@ -254,4 +254,74 @@ TEST(DwgRepairFacts, FactsThatAreNotJsonAreRefused) {
     EXPECT_THROW(DwgRepair("not json"), DxfError);
     EXPECT_THROW(DwgRepair("[1, 2]"), DxfError);
     EXPECT_NO_THROW(DwgRepair("{}"));
+}
+
+namespace {
+
+// A multi-line text's whole text: its code-3 pieces, then its code-1 one.
+std::string wholeText(const DbObject& text) {
+    std::string whole, last;
+    for (const Tag& tag : text.tags()) {
+        if (tag.code == 3) whole += tag.value;
+        if (tag.code == 1) last = tag.value;
+    }
+    return whole + last;
+}
+
+}  // namespace
+
+TEST(DwgRepairTexts, ALongTextEndedWithStrayBytesIsWrittenFromTheModel) {
+    // 600 bytes with a two-byte character across the first 250-byte boundary.
+    std::string text = std::string(249, 'a') + "\xC3\xA7" + std::string(349, 'b');
+    Database db;
+    TagListBuilder body(db.arena());
+    body.text(100, "AcDbMText").point(10, {1, 2, 0}).real(40, 2.5);
+    body.text(3, std::string(250, 'a')).text(3, std::string(250, 'b'));
+    body.text(1, "TAIL_MARK").text(7, "Standard");
+    Entity* mtext = db.addEntity(*db.modelSpace(), "MTEXT", body.take(), "0");
+    Entity* intact = db.addEntity(*db.modelSpace(), "MTEXT",
+                                  TagListBuilder(db.arena())
+                                      .text(100, "AcDbMText")
+                                      .point(10, {0, 0, 0})
+                                      .text(1, "short")
+                                      .take(),
+                                  "0");
+    // What this converter build may write: a stray line among the groups, a stray value.
+    std::string dxf = DxfWriter::toText(db);
+    const std::size_t tail = dxf.find("TAIL_MARK");
+    ASSERT_NE(tail, std::string::npos);
+    const std::size_t codeLine = dxf.rfind("  1\n", tail);
+    dxf.replace(tail, 9, "0721Sf`\x01#");
+    dxf.insert(codeLine, "S)\x01\x04TS\x17R\x15M\n");
+    EXPECT_THROW(DxfLoader::load(dxf), DxfError);
+
+    const std::string facts = R"({"longTexts": [{"handle": ")" + hex(mtext->handle()) +
+                              R"(", "text": ")" + text + R"(\nend"}]})";
+    const auto result = repairAndLoad(dxf, facts);
+    const DbObject* read = result.database->objectByHandle(mtext->handle());
+    ASSERT_TRUE(read);
+    // A line feed in the model's text is written as the format writes control characters.
+    EXPECT_EQ(wholeText(*read), text + "^Jend");
+    EXPECT_EQ(read->text(7), "Standard");  // the groups after the text are read again
+    for (const Tag& tag : read->tags()) {
+        if (tag.code == 3) {
+            EXPECT_LE(tag.value.size(), 250u);
+        }
+    }
+    EXPECT_EQ(wholeText(*result.database->objectByHandle(intact->handle())), "short");
+    EXPECT_EQ(result.counts.longTexts, 1u);
+}
+
+TEST(DwgRepairColors, TrueColorsKeepTheirTwentyFourBitsOfRgb) {
+    Database db;
+    LayerRecord* layer = db.createLayer("TRUE");
+    layer->setInteger(420, -1039035666);  // 0xC21192EE as a signed 32-bit number
+    TagListBuilder body(db.arena());
+    body.text(100, "AcDbLine").point(10, {0, 0, 0}).point(11, {1, 0, 0});
+    Entity* line = db.addEntity(*db.modelSpace(), "LINE", body.take(), "0");
+    line->setInteger(420, 0x00FF8000, "AcDbEntity");
+    const auto result = repairAndLoad(DxfWriter::toText(db), "{}");
+    EXPECT_EQ(result.database->layer("TRUE")->integer(420), 0x1192EE);
+    EXPECT_EQ(result.database->objectByHandle(line->handle())->integer(420), 0xFF8000);
+    EXPECT_EQ(result.counts.trueColors, 1u);
 }

@@ -37,9 +37,9 @@ try {
 }
 const buffer = bytes.buffer.slice(bytes.byteOffset, bytes.byteOffset + bytes.byteLength);
 
-// The package's log lines go to stdout, which nobody reads; keep them off stderr's message.
-console.log = () => {};
-console.error = () => {};
+// The package's console lines stay as they are: silencing them changes what this build
+// writes for long multi-line texts (it reads past their end), and the host reads only the
+// last line of stderr, ours.
 
 const { LibreDwg, Dwg_File_Type } = await import(pathToFileURL(entry).href);
 const converter = await LibreDwg.create(path.join(packageDir, 'wasm') + '/');
@@ -52,7 +52,7 @@ if (data === undefined || data === null) fail(3, 'the converter could not read t
 const model = converter.convert(data);
 converter.dwg_free(data);
 
-const facts = { layers: [], polylineWidths: [], attributes: [], xrecordAngles: [] };
+const facts = { layers: [], polylineWidths: [], attributes: [], xrecordAngles: [], longTexts: [] };
 
 for (const layer of model.tables?.LAYER?.entries ?? [])
     facts.layers.push({ handle: layer.handle, off: !!layer.off });
@@ -92,6 +92,9 @@ function visit(entity) {
                 handle: entity.handle,
                 widths: vertices.map((v) => [v.startWidth ?? 0, v.endWidth ?? 0]),
             });
+    } else if (entity.type === 'MTEXT' && typeof entity.text === 'string' && entity.text.length >= 250) {
+        // This build's DXF writer may end a long text with bytes from past its end.
+        facts.longTexts.push({ handle: entity.handle, text: entity.text });
     } else if (entity.type === 'INSERT' && (entity.attribs ?? []).length > 1) {
         facts.attributes.push({ handle: entity.handle, attributes: entity.attribs.map(attribute) });
     }
