@@ -1,17 +1,17 @@
 #include "CICad.h"
 #include "CICadInterno.h"
+#include "app/DrawingFiles.h"
 
 #include "drawing/Attribute.h"
 #include "drawing/BlockRecord.h"
 #include "drawing/BlockReference.h"
 #include "drawing/DeepCloner.h"
-#include "drawing/DxfLoader.h"
 #include "drawing/Entity.h"
 #include "readers/CEAtributo.h"
 #include "readers/CEListaAtributos.h"
 #include "settings/CIMensagens.h"
 
-#include <QFile>
+#include <QFileInfo>
 #include <QRandomGenerator>
 
 #include <cmath>
@@ -26,24 +26,15 @@ QString CaminhoParaMensagem(QString caminho) {
     return caminho.replace("\\\\", "\\").replace("//", "/");
 }
 
-// Reads a drawing file into a side database; null (with a line on the command line for a
-// file that is not a readable DXF) when it can't be read.
+// Reads a drawing file (DXF, or DWG through the host's converter) into a side database;
+// null, with a line on the command line that names the file, when it can't be read.
 std::unique_ptr<zvdb::Database> LeDesenho(const QString& caminho) {
     const QString arquivo = CICad::ResolveArquivo(caminho);
-    QFile f(arquivo);
-    if (!f.open(QIODevice::ReadOnly)) return nullptr;
-    const QByteArray inicio = f.peek(6);
-    if (inicio.startsWith("AC10") || inicio.startsWith("AC1.")) {
-        CICad::Imprime("\n" + arquivo +
-                       ": a DWG drawing; this edition reads DXF drawings only. Save it as DXF.\n");
-        return nullptr;
-    }
-    try {
-        return zvdb::DxfLoader::loadFile(arquivo.toStdString());
-    } catch (const std::exception& erro) {
-        CICad::Imprime("\n" + arquivo + ": " + QString::fromUtf8(erro.what()) + "\n");
-        return nullptr;
-    }
+    if (!QFileInfo(arquivo).isFile()) return nullptr;
+    QString erro;
+    auto lado = zvhost::readDrawing(arquivo, &erro);
+    if (!lado) CICad::Imprime("\n" + erro + "\n");
+    return lado;
 }
 
 void RejeitaBloco(const QString& mensagem, const QString& nome, const QString& arquivo) {

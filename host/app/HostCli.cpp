@@ -194,6 +194,12 @@ int runDrawing(const Options& options, QTextStream& out, QTextStream& err) {
     ui->setProgressLog(options.progressLog);
     Application app(std::move(ui), out);
 
+    // No DWG writer: refused before any command runs, so the file stays as it is.
+    const QString target = options.inPlace ? options.drawing : options.output;
+    if (!target.isEmpty() && isDwgDrawing(target)) {
+        err << "zvhost: " << dwgWriteRefusal(target) << "\n";
+        return kExitFailure;
+    }
     std::unique_ptr<zvdb::Database> database;
     if (QFileInfo(options.drawing).isDir()) {
         err << "zvhost: " << options.drawing << ": is a directory, not a drawing\n";
@@ -240,7 +246,6 @@ int runDrawing(const Options& options, QTextStream& out, QTextStream& err) {
         }
         if (const int status = commandStatus(command, result, err)) return status;
     }
-    const QString target = options.inPlace ? options.drawing : options.output;
     if (target.isEmpty()) return kExitOk;
     QString error;
     if (!writeDrawing(*document->database(), target, &error)) {

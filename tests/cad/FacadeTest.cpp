@@ -15,6 +15,7 @@
 #include "readers/CEListaAtributos.h"
 
 #include <QFile>
+#include <QStandardPaths>
 
 namespace {
 
@@ -120,13 +121,35 @@ TEST_F(FacadeFixture, ABlockFileLoadsAtTheOriginThroughItsWindowsPath) {
     EXPECT_TRUE(achouLinha);
 }
 
-TEST_F(FacadeFixture, ARealDwgFileIsRefusedWithAMessage) {
+TEST_F(FacadeFixture, ASideDrawingNamedDwgIsReadThroughTheConverter) {
+    if (qEnvironmentVariableIsEmpty("ZV_NODE") && QStandardPaths::findExecutable("node").isEmpty())
+        GTEST_SKIP() << "Node.js is not installed; reading DWG drawings needs it";
+    // The converter lies beside zvhost; this test program is elsewhere.
+    qputenv("ZV_DWG_CONVERTER", ZV_BIN_DIR "/dwg");
+    const QString dwg = arquivo("project.dwg");
+    ASSERT_TRUE(QFile::copy(ZV_SOURCE_DIR "/tests/drawing/dwg/xdata.dwg", dwg));
+    const auto lado = CICad::AbreDesenhoLateral(dwg);
+    qunsetenv("ZV_DWG_CONVERTER");
+    ASSERT_TRUE(lado) << saida().toStdString();
+    EXPECT_TRUE(lado->layer("app_layer"));
+    // Its extended data as the CAD program has it: the layer name, not a number.
+    const zvdb::DbObject* texto = lado->objectByHandle(0x248);
+    ASSERT_TRUE(texto);
+    const auto itens = texto->xdata("LAYER_APP");
+    ASSERT_EQ(itens.size(), 3u);
+    EXPECT_EQ(itens[1], (zvdb::Tag{1003, "app_layer"}));
+}
+
+TEST_F(FacadeFixture, ADamagedDwgBlockFileIsRefusedWithAMessageNamingIt) {
     QFile dwg(arquivo("REAL.dwg"));
     ASSERT_TRUE(dwg.open(QIODevice::WriteOnly));
     dwg.write("AC1032\0\0\0binary", 16);
     dwg.close();
+    const std::size_t blocos = db().blocks().size();
     EXPECT_TRUE(CICad::CarregaBloco("REAL", arquivo("REAL.dwg")).isNull());
-    EXPECT_TRUE(saida().contains("this edition reads DXF drawings only"));
+    EXPECT_TRUE(saida().contains("REAL.dwg: ")) << saida().toStdString();
+    EXPECT_TRUE(saida().contains("DWG")) << saida().toStdString();
+    EXPECT_EQ(db().blocks().size(), blocos);
 }
 
 TEST_F(FacadeFixture, InsertingMakesAttributesAndKeepsSinglePrecision) {
