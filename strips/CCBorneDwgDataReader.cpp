@@ -81,6 +81,9 @@ VetorItens* CCBorneDwgDataReader::LerDados(zvdb::Database* database,
         borne->anterior = borne->proximo = nullptr;
     if (CICad::GetBoolLisp("*MOSTRA_JUMPER_GRX*")) CCBorneDataReader::LigaJumpers(bornes);
 
+    // Nothing to draw: the writer adds no page, and the user hears why.
+    if (bornes.empty()) CICad::ImprimeMensagem(64);
+
     auto* resposta = new VetorItens(componentes);
     resposta->insert(resposta->end(), bornes.begin(), bornes.end());
     // What the filters took out is freed now: nothing that stays points at it.
