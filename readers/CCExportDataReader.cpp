@@ -131,7 +131,7 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
     simbolos_ = Simbolos{};
     simbolos_.bornes = true;
     // Accessories are read with their owner and follow it.
-    simbolos_.vinculos = 2;
+    simbolos_.vinculos = lerAcessorios_ ? 2 : 0;
     CIProgress progresso;
     ladosAdiados_ = true;
     LeBlocos(database, std::nullopt, modelo, progresso);

@@ -48,6 +48,9 @@ protected:
 
     // Component relations to the handle whose fields stand for the component.
     QHash<QString, QString> relacoesComponentes_;
+    // Whether the components' accessories follow them; a reader that keeps only components
+    // and terminals leaves them unread.
+    bool lerAcessorios_ = true;
 
 private:
     void AoLigar(CEItemLista& item, const OdDbObjectId& entidade, CETemplate* modelo, bool inicio);

@@ -47,7 +47,8 @@ VetorItens* CCBorneDwgDataReader::LerDados(zvdb::Database* database,
                                            const std::optional<QStringList>& paginas,
                                            CETemplate& modelo, CIProgress& progresso) {
     CICad::SetIntLisp("EXPORTA", 3);
-    CarregaConexoesCabos();
+    // The cable connections: the export read loads them for the components it reads, and
+    // once is enough for a run.
     std::unique_ptr<VetorItens> lidos(Le(database, &modelo, true, paginas));
     if (!lidos) return nullptr;
     progresso.Definir(80);
