@@ -107,7 +107,7 @@ int main(int argc, char** argv) {
     // Every list command the module has today; the others join as they land.
     // The wire list measures along the generated projects' layout routes.
     const QStringList comandos{"gerarListaBornesGrf", "gerarListaFiosGrf", "gerarListaMateriaisGrf",
-                               "gerarListaCabosGrf"};
+                               "gerarListaCabosGrf", "gerarListaBornesDwg"};
     QTemporaryDir folder;
     const QString data = folder.filePath("data"), product = folder.filePath("product") + "/";
     QDir().mkpath(data);

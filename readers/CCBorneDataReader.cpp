@@ -61,40 +61,70 @@ void CCBorneDataReader::LerLadoFim(CEItemLista& item, const OdDbObjectId& borne,
     LeLado(item, borne, Lado{false}, modelo);
 }
 
+namespace {
+
+bool Invertido(const CEItemLista& borne) {
+    return borne.valorCampo("INVERTIDO").toUpper() == "S";
+}
+
+}  // namespace
+
+QString CCBorneDataReader::SufixoElemento(const CEItemLista& borne, bool insercao) {
+    return insercao != Invertido(borne) ? QStringLiteral("_FIM") : QStringLiteral("_INI");
+}
+
+QString CCBorneDataReader::SufixoFio(const CEItemLista& borne, bool insercao) {
+    return insercao != Invertido(borne) ? QStringLiteral("_SEGFIM") : QStringLiteral("_SEGINI");
+}
+
 // The insertion side looks forward first, the cut side backward first, so that the two
 // sides take different neighbours on a wire that passes straight through the terminal.
+CCBorneDataReader::LadoBorne CCBorneDataReader::AchaLado(CCDataReader& leitor,
+                                                         const OdDbObjectId& borne, bool insercao) {
+    LadoBorne lado;
+    const CEPonto p = CICad::GetPosicao(borne);
+    const CEPonto q = leitor.PontoDeCorte(borne);
+    lado.ponto = insercao ? p : q;
+    lado.outro = insercao ? q : p;
+    lado.vizinho = leitor.VizinhoNaConexao(borne, lado.ponto, !insercao);
+    if (lado.vizinho.isEmpty()) lado.vizinho = leitor.VizinhoNaConexao(borne, lado.ponto, insercao);
+    if (lado.vizinho.isEmpty()) return lado;
+    // A stale handle in the connection answer: the element is null, the side stays blank.
+    lado.elemento = CICad::IdDoHandle(lado.vizinho, borne.database());
+    lado.fio = leitor.FioNoPonto(CICad::GetLayerEntidade(borne), lado.ponto);
+    lado.pontoElemento = leitor.PontoDaConexao(leitor.NumeroDoFio(lado.fio), lado.vizinho);
+    return lado;
+}
+
 void CCBorneDataReader::LeLado(CEItemLista& item, const OdDbObjectId& borne, const Lado& lado,
                                CETemplate& modelo) {
-    const CEPonto p = CICad::GetPosicao(borne);
-    const CEPonto q = PontoDeCorte(borne);
-    const CEPonto& aqui = lado.insercao ? p : q;
-    QString vizinho = VizinhoNaConexao(borne, aqui, !lado.insercao);
-    if (vizinho.isEmpty()) vizinho = VizinhoNaConexao(borne, aqui, lado.insercao);
-    if (vizinho.isEmpty()) return;
+    const LadoBorne achado = AchaLado(*this, borne, lado.insercao);
+    if (achado.elemento.isNull()) return;
+    const QString sufixo = SufixoElemento(item, lado.insercao);
+    LeBloco(sufixo, item, achado.elemento, &modelo);
+    CompoeRelacaoBorne(sufixo, item, achado.elemento, achado.pontoElemento, modelo);
 
-    const bool invertido = item.valorCampo("INVERTIDO").toUpper() == "S";
-    const bool fimNaInsercao = lado.insercao != invertido;
-    const QString sufixo = fimNaInsercao ? "_FIM" : "_INI";
-    // A stale handle in the connection answer: the element is skipped, the side stays blank.
-    const OdDbObjectId elemento = CICad::IdDoHandle(vizinho, borne.database());
-    if (elemento.isNull()) return;
+    LeFiosLado(*this, item, borne, achado, lado.insercao, &modelo);
+}
+
+void CCBorneDataReader::LeFiosLado(CCDataReader& leitor, CEItemLista& item,
+                                   const OdDbObjectId& borne, const LadoBorne& lado, bool insercao,
+                                   CETemplate* modelo) {
+    if (!leitor.EhFioNumerado(lado.fio)) return;
     const QString layer = CICad::GetLayerEntidade(borne);
-    const OdDbObjectId fio = FioNoPonto(layer, aqui);
-    const CEPonto r = PontoDaConexao(NumeroDoFio(fio), vizinho);
-    LeBloco(sufixo, item, elemento, &modelo);
-    CompoeRelacaoBorne(sufixo, item, elemento, r, modelo);
-
-    if (!EhFioNumerado(fio)) return;
-    const OdDbObjectId fioP = FioNoPonto(layer, p);
-    const OdDbObjectId fioQ = FioNoPonto(layer, q);
-    const QString segP = invertido ? "_SEGINI" : "_SEGFIM";
-    const QString segQ = invertido ? "_SEGFIM" : "_SEGINI";
-    if (lado.insercao) {
-        if (!fioQ.isNull()) LeEntidade(segQ, item, fioQ, &modelo);
-        if (!fioP.isNull()) LeEntidade(segP, item, fioP, &modelo);
+    const OdDbObjectId fioAqui = leitor.FioNoPonto(layer, lado.ponto);
+    const OdDbObjectId fioOutro = leitor.FioNoPonto(layer, lado.outro);
+    // The cut point's wire is read first on the insertion side, last on the cut side.
+    const OdDbObjectId& fioP = insercao ? fioAqui : fioOutro;
+    const OdDbObjectId& fioQ = insercao ? fioOutro : fioAqui;
+    const QString segP = SufixoFio(item, true);
+    const QString segQ = SufixoFio(item, false);
+    if (insercao) {
+        if (!fioQ.isNull()) leitor.LeEntidade(segQ, item, fioQ, modelo);
+        if (!fioP.isNull()) leitor.LeEntidade(segP, item, fioP, modelo);
     } else {
-        if (!fioP.isNull()) LeEntidade(segP, item, fioP, &modelo);
-        if (!fioQ.isNull()) LeEntidade(segQ, item, fioQ, &modelo);
+        if (!fioP.isNull()) leitor.LeEntidade(segP, item, fioP, modelo);
+        if (!fioQ.isNull()) leitor.LeEntidade(segQ, item, fioQ, modelo);
     }
 }
 
@@ -201,7 +231,7 @@ VetorItens* CCBorneDataReader::LerDados(zvdb::Database* database,
     progresso.Definir(97);
     if (!duplicado_)
         LigaJumpers(*itens);
-    else
+    else if (AvisaNumerosRepetidos)
         CICad::ImprimeMensagem(329);
     if (itens->empty()) CICad::ImprimeMensagem(64);
     progresso.Definir(100);

@@ -25,6 +25,30 @@ public:
     static QString Regua(const CEItemLista& item);
     static QString Numero(const CEItemLista& item);
 
+    // One side of a terminal as any reader finds it: the element wired at the side's point
+    // (the insertion point, or the cut point) and the wire there.
+    struct LadoBorne {
+        CEPonto ponto;          // the side's point
+        CEPonto outro;          // the terminal's other point
+        QString vizinho;        // handle of the element wired there; empty when none
+        OdDbObjectId elemento;  // that element, null when its handle is stale
+        OdDbObjectId fio;       // the wire at the side's point, null when none
+        CEPonto pontoElemento;  // where the wire meets the element
+    };
+    // Repeated numbers leave the jumpers unlinked; the terminal list says so (message 329),
+    // the exports, which draw no jumpers, do not.
+    bool AvisaNumerosRepetidos = true;
+
+    static LadoBorne AchaLado(CCDataReader& leitor, const OdDbObjectId& borne, bool insercao);
+    // The wires at the terminal's two points under their suffixes, when the side's wire is
+    // a numbered one.
+    static void LeFiosLado(CCDataReader& leitor, CEItemLista& item, const OdDbObjectId& borne,
+                           const LadoBorne& lado, bool insercao, CETemplate* modelo);
+    // The suffix of the element wired at the insertion side (or the cut side), and of the
+    // wire at the insertion point (or the cut point), for the terminal's INVERTIDO.
+    static QString SufixoElemento(const CEItemLista& borne, bool insercao);
+    static QString SufixoFio(const CEItemLista& borne, bool insercao);
+
 private:
     struct Lado;
     void LeLado(CEItemLista& item, const OdDbObjectId& borne, const Lado& lado, CETemplate& modelo);

@@ -9,6 +9,8 @@
 #include "lists/CETemplate.h"
 #include "module/CIProgress.h"
 
+#include <array>
+#include <cmath>
 #include <memory>
 
 namespace {
@@ -106,6 +108,7 @@ VetorItens* CCExportDataReader::Le(zvdb::Database* database, CETemplate* modelo,
 
 void CCExportDataReader::LeBornes(zvdb::Database* database, CETemplate& modelo, VetorItens& itens) {
     CCBorneDataReader bornes;
+    bornes.AvisaNumerosRepetidos = false;
     CIProgress progresso;
     std::unique_ptr<VetorItens> lidos(bornes.LerDados(database, std::nullopt, modelo, progresso));
     if (!lidos) return;
@@ -128,17 +131,21 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
     simbolos_ = Simbolos{};
     simbolos_.bornes = true;
     // Accessories are read with their owner and follow it.
-    simbolos_.vinculos = 2;
+    simbolos_.vinculos = lerAcessorios_ ? 2 : 0;
     CIProgress progresso;
+    ladosAdiados_ = true;
     LeBlocos(database, std::nullopt, modelo, progresso);
     LeVirtuais(database, modelo);
     LePinos(database, modelo);
+    ladosAdiados_ = false;
+    std::vector<CEItemLista*> bornes;
     for (CEItemLista* item : resultado_) {
         if (!item) continue;
         if (item->valorCampo("ZV_LISTA_TIPO").isEmpty()) {
             const bool borne = !item->ids.empty() && CICad::EhReferencia(item->ids.front()) &&
                                EhBorne(CICad::GetNomeBloco(item->ids.front()));
             item->definirCampo("ZV_LISTA_TIPO", borne ? "BORNE" : "COMP");
+            if (borne) bornes.push_back(item);
         }
         if (item->valorCampo("ZV_LISTA_TIPO") == "COMP") {
             const QString relacao = Primeiro(*item, kRelacoes, QString());
@@ -149,6 +156,10 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
         itens.push_back(item);
     }
     resultado_.clear();
+    for (CEItemLista* borne : bornes) {
+        AoLigarInicio(*borne, borne->ids.front(), &modelo);
+        AoLigarFim(*borne, borne->ids.front(), &modelo);
+    }
 }
 
 void CCExportDataReader::LeFiosExportacao(const std::optional<QStringList>& paginas,
@@ -168,6 +179,16 @@ void CCExportDataReader::LeFiosExportacao(const std::optional<QStringList>& pagi
     }
 }
 
+void CCExportDataReader::LerLadoIni(CEItemLista& item, const OdDbObjectId& entidade,
+                                    CETemplate& modelo) {
+    if (!ladosAdiados_) AoLigarInicio(item, entidade, &modelo);
+}
+
+void CCExportDataReader::LerLadoFim(CEItemLista& item, const OdDbObjectId& entidade,
+                                    CETemplate& modelo) {
+    if (!ladosAdiados_) AoLigarFim(item, entidade, &modelo);
+}
+
 void CCExportDataReader::AoLigarInicio(CEItemLista& item, const OdDbObjectId& entidade,
                                        CETemplate* modelo) {
     AoLigar(item, entidade, modelo, true);
@@ -178,6 +199,25 @@ void CCExportDataReader::AoLigarFim(CEItemLista& item, const OdDbObjectId& entid
     AoLigar(item, entidade, modelo, false);
 }
 
+QString CCExportDataReader::VizinhoPorLigacao(const QString& fio, const QString& proprio,
+                                              const QString& ligacao, bool anteriorPrimeiro) const {
+    const QStringList* completas = ListaConexoesCompletas(fio);
+    if (!completas) return {};
+    const auto handle = [&](qsizetype i) { return completas->at(i).section('#', 0, 0); };
+    for (qsizetype i = 0; i < completas->size(); ++i) {
+        if (handle(i) != proprio || completas->at(i).section('#', 1, 1) != ligacao) continue;
+        const qsizetype antes = i - 1, depois = i + 1;
+        for (const qsizetype j :
+             anteriorPrimeiro ? std::array{antes, depois} : std::array{depois, antes})
+            if (j >= 0 && j < completas->size() && handle(j) != proprio) return handle(j);
+        return {};
+    }
+    return {};
+}
+
+// An end of a wire that stands on a terminal, or a side of the terminal itself: the
+// element wired there under the first suffix, the wire at the terminal's other point under
+// the second, and the relation of the end composed.
 void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade,
                                  CETemplate* modelo, bool inicio) {
     if (entidade.isNull() || !CICad::EhReferencia(entidade)) return;
@@ -185,16 +225,51 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
     // An inverted wire keeps its ends; any other wire has them the other way round.
     const bool invertido = item.valorCampo("INVERTIDO").toUpper() == "S";
     const QString sufixo = inicio == invertido ? QStringLiteral("_INI") : QStringLiteral("_FIM");
-    // The terminal is met where this wire touches it, which may be its cut point.
-    const QString campo = CampoFio(item);
-    const QString fio = campo.isEmpty() ? QString() : item.valorCampo(campo);
+    const QString segundo =
+        inicio == invertido ? QStringLiteral("_SEGFIM") : QStringLiteral("_SEGINI");
     const QString proprio = ZVString::DeHandle(entidade.handle());
-    const QStringList* elementos = ListaConexoes(fio);
-    const CEPonto ponto = elementos && elementos->contains(proprio) ? PontoDaConexao(fio, proprio)
-                                                                    : CICad::GetPosicao(entidade);
-    QString conectado = VizinhoNaConexao(entidade, ponto, true);
-    if (conectado.isEmpty()) conectado = VizinhoNaConexao(entidade, ponto, false);
+    const QString layer = CICad::GetLayerEntidade(entidade);
+    const bool doBorne = !item.ids.empty() && item.ids.front() == entidade;
+
+    CEPonto ponto, outro;
+    QString fio, conectado;
+    std::optional<CCBorneDataReader::LadoBorne> lado;
+    if (doBorne) {
+        // The terminal's own side: the insertion point for the first hook, the cut point
+        // for the second, looked at as the terminal list does.
+        lado = CCBorneDataReader::AchaLado(*this, entidade, inicio);
+        if (lado->vizinho.isEmpty()) return;
+        ponto = lado->ponto;
+        outro = lado->outro;
+        fio = NumeroDoFio(lado->fio);
+        conectado = lado->vizinho;
+    } else {
+        // The terminal is met where this wire touches it, which may be its cut point.
+        const QString campo = CampoFio(item);
+        fio = campo.isEmpty() ? QString() : item.valorCampo(campo);
+        const QStringList* elementos = ListaConexoes(fio);
+        const CEPonto p = CICad::GetPosicao(entidade);
+        const CEPonto q = PontoDeCorte(entidade);
+        ponto = elementos && elementos->contains(proprio) ? PontoDaConexao(fio, proprio) : p;
+        const auto distancia = [](const CEPonto& a, const CEPonto& b) {
+            return std::hypot(a.x - b.x, a.y - b.y, a.z - b.z);
+        };
+        outro = distancia(ponto, p) <= distancia(ponto, q) ? q : p;
+        conectado = VizinhoNaConexao(entidade, ponto, true);
+        if (conectado.isEmpty()) conectado = VizinhoNaConexao(entidade, ponto, false);
+    }
+    // An equipment's points may lie closer together than a wire's catch: its connection
+    // name tells which of its entries on the wire this end is.
+    if (CICad::TemXData(entidade, "KVR_ZV_EQUIPO")) {
+        const std::unique_ptr<zv::CEAtributo> propria = AtributoConexaoProximo(entidade, ponto);
+        if (propria && !propria->GetValor().isEmpty()) {
+            const QString achado =
+                VizinhoPorLigacao(fio, proprio, propria->GetValor(), doBorne ? !inicio : true);
+            if (!achado.isEmpty()) conectado = achado;
+        }
+    }
     const OdDbObjectId objeto = CICad::IdDoHandle(conectado);
+    if (doBorne && objeto.isNull()) return;
     QString ligacao;
     if (!objeto.isNull()) {
         const std::unique_ptr<zv::CEAtributo> atributo =
@@ -206,7 +281,17 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
             item.definirCampo(nome + sufixo, QString());
         CopiaAtributos(sufixo, item, conectado);
     }
-    CompoeRelacao(sufixo, item, modelo, ligacao, proprio);
+    // The wire at the terminal's other point; a terminal's side reads the wires of both its
+    // points, as the terminal list does, the other one under the second suffix.
+    if (lado) {
+        CCBorneDataReader::LeFiosLado(*this, item, entidade, *lado, inicio, modelo);
+    } else {
+        const OdDbObjectId fioOutro = FioNoPonto(layer, outro);
+        if (!fioOutro.isNull())
+            CopiaAtributos(segundo, item, ZVString::DeHandle(fioOutro.handle()));
+    }
+    // The terminal's side names the element by the handle its fields came from.
+    CompoeRelacao(sufixo, item, modelo, ligacao, doBorne ? QString() : proprio);
 }
 
 void CCExportDataReader::CopiaAtributos(const QString& sufixo, CEItemLista& item,
@@ -229,7 +314,7 @@ void CCExportDataReader::CopiaAtributos(const QString& sufixo, CEItemLista& item
         break;
     }
     const OdDbObjectId final = CICad::IdDoHandle(alvo);
-    if (!final.isNull()) LeBloco(sufixo, item, final, nullptr);
+    if (!final.isNull()) LeEntidade(sufixo, item, final, nullptr);
 }
 
 void CCExportDataReader::CompoeRelacao(const QString& sufixo, CEItemLista& item, CETemplate* modelo,

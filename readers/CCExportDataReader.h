@@ -10,6 +10,10 @@ class CEExportacao;
 
 class CCExportDataReader : public CCMaterialDataReader {
 public:
+    // A terminal's two sides are the hooks on the terminal itself: what is wired at its
+    // insertion point, and at its cut point.
+    void LerLadoIni(CEItemLista& item, const OdDbObjectId& entidade, CETemplate& modelo) override;
+    void LerLadoFim(CEItemLista& item, const OdDbObjectId& entidade, CETemplate& modelo) override;
     // The first and the second end of a wire stretch, with the entity standing there.
     virtual void AoLigarInicio(CEItemLista& item, const OdDbObjectId& entidade, CETemplate* modelo);
     virtual void AoLigarFim(CEItemLista& item, const OdDbObjectId& entidade, CETemplate* modelo);
@@ -44,8 +48,18 @@ protected:
 
     // Component relations to the handle whose fields stand for the component.
     QHash<QString, QString> relacoesComponentes_;
+    // Whether the components' accessories follow them; a reader that keeps only components
+    // and terminals leaves them unread.
+    bool lerAcessorios_ = true;
 
 private:
     void AoLigar(CEItemLista& item, const OdDbObjectId& entidade, CETemplate* modelo, bool inicio);
+    // The element next to an equipment's own entry of the connection (its handle and
+    // connection name) in the wire's full connection list; empty when there is none.
+    QString VizinhoPorLigacao(const QString& fio, const QString& proprio, const QString& ligacao,
+                              bool anteriorPrimeiro) const;
+    // While components are read the sides wait: a contact names its component only once
+    // every component is known.
+    bool ladosAdiados_ = false;
     QString PaginasOpcao() const;
 };

@@ -47,7 +47,8 @@ VetorItens* CCBorneDwgDataReader::LerDados(zvdb::Database* database,
                                            const std::optional<QStringList>& paginas,
                                            CETemplate& modelo, CIProgress& progresso) {
     CICad::SetIntLisp("EXPORTA", 3);
-    CarregaConexoesCabos();
+    // The cable connections: the export read loads them for the components it reads, and
+    // once is enough for a run.
     std::unique_ptr<VetorItens> lidos(Le(database, &modelo, true, paginas));
     if (!lidos) return nullptr;
     progresso.Definir(80);
@@ -80,6 +81,9 @@ VetorItens* CCBorneDwgDataReader::LerDados(zvdb::Database* database,
     for (CEItemLista* borne : bornes)
         borne->anterior = borne->proximo = nullptr;
     if (CICad::GetBoolLisp("*MOSTRA_JUMPER_GRX*")) CCBorneDataReader::LigaJumpers(bornes);
+
+    // Nothing to draw: the writer adds no page, and the user hears why.
+    if (bornes.empty()) CICad::ImprimeMensagem(64);
 
     auto* resposta = new VetorItens(componentes);
     resposta->insert(resposta->end(), bornes.begin(), bornes.end());

@@ -6,6 +6,7 @@
 
 class CCBorneDwgDataReader : public CCExportDataReader {
 public:
+    CCBorneDwgDataReader() { lerAcessorios_ = false; }
     VetorItens* LerDados(zvdb::Database* database, const std::optional<QStringList>& paginas,
                          CETemplate& modelo, CIProgress& progresso) override;
 

@@ -86,8 +86,7 @@ void CCBorneDwgWriter::DesenhaRegua(const CEReguaDwg& regua, const QString& laye
     for (const CEDetalheReguaDwg& detalhe : regua.detalhes) {
         const double k = detalhe.quantidade;
         CEItemLista campos;
-        for (auto it = detalhe.campos.cbegin(); it != detalhe.campos.cend(); ++it)
-            campos.definirCampo(it.key(), it.value());
+        campos.campos = detalhe.campos;
         Preenche(Insere(detalhe_, layer, c + k * passo_ * 0.5 - passo_ * 0.5, regua.y), campos);
         contagem += detalhe.quantidade;
         if (contagem < limite) Insere(traco_, layer, c + k * passo_ - passo_ * 0.5, regua.y);

@@ -4,9 +4,7 @@
 
 CEDetalheReguaDwg::CEDetalheReguaDwg(std::int32_t quantidade, const CEItemLista* ultimo)
     : quantidade(quantidade) {
-    if (!ultimo) return;
-    for (const QString& nome : NomesCampos(*ultimo))
-        campos.insert(nome, ultimo->valorCampo(nome));
+    if (ultimo) campos = ultimo->campos;
 }
 
 QStringList CEDetalheReguaDwg::NomesCampos(const CEItemLista& item) {

@@ -1,7 +1,8 @@
 #pragma once
 // One run of a strip's detail band: how many terminals it spans, and the fields of the
 // run's last terminal, which the detail block prints.
-#include <QHash>
+#include "readers/CamposItem.h"
+
 #include <QString>
 #include <QStringList>
 
@@ -18,5 +19,7 @@ public:
     static QStringList NomesCampos(const CEItemLista& item);
 
     std::int32_t quantidade = 0;
-    QHash<QString, QString> campos;
+    // A flat copy: a terminal with both sides read holds a few hundred fields, and a strip
+    // drawing makes a run at nearly every terminal.
+    CamposItem campos;
 };

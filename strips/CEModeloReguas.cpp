@@ -129,21 +129,20 @@ std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& sim
     // The symbol's connections by suffix: LIGACAO_1, CONNECTION_2...
     QMap<QString, QString> ligacoes;
     // A suffix given in two languages keeps the first language's value.
-    const QStringList nomes = CEDetalheReguaDwg::NomesCampos(*simbolo.item);
     for (const char* prefixo : {"LIGACAO_", "CONNECTION_", "CONEXION_"})
-        for (const QString& nome : nomes)
-            if (nome.startsWith(QLatin1String(prefixo))) {
-                const QString sufixo = nome.mid(int(qstrlen(prefixo)));
-                if (!ligacoes.contains(sufixo))
-                    ligacoes.insert(sufixo, simbolo.item->valorCampo(nome));
+        for (auto campo = simbolo.item->campos.begin(); campo != simbolo.item->campos.end();
+             ++campo)
+            if (campo.key().startsWith(QLatin1String(prefixo))) {
+                const QString sufixo = campo.key().mid(int(qstrlen(prefixo)));
+                if (!ligacoes.contains(sufixo)) ligacoes.insert(sufixo, campo.value());
             }
     // The terminals of each connection value, in the symbol's own order.
     QHash<QString, std::vector<CEBorneDwg*>> porLigacao;
     for (CEItemDwg* ligado : simbolo.ligados) {
         auto* borne = static_cast<CEBorneDwg*>(ligado);
-        for (const QString& nome : CEDetalheReguaDwg::NomesCampos(*borne->item))
-            if (nome.startsWith(QLatin1String("LIG_"))) {
-                auto& lista = porLigacao[borne->item->valorCampo(nome)];
+        for (auto campo = borne->item->campos.begin(); campo != borne->item->campos.end(); ++campo)
+            if (campo.key().startsWith(QLatin1String("LIG_"))) {
+                auto& lista = porLigacao[campo.value()];
                 if (lista.empty() || lista.back() != borne) lista.push_back(borne);
             }
     }

@@ -317,7 +317,9 @@ void ProductDataWriter::writeStripBlocks() {
     terminal.model().addLine({-3, 8}, {3, 8});
     terminal.model().addLine({0, 14}, {0, 16});
     terminal.model().addLine({0, -12}, {0, -14});
+    // The number in whichever language the terminal is tagged: the other one stays empty.
     stripText(terminal, "VARIAVEL_NUMERO", "NUMERO", {-2.2, 9.8}, 2.2);
+    stripText(terminal, "VARIAVEL_NUMBER", "NUMBER", {-2.2, 9.8}, 2.2);
     stripText(terminal, "VARIAVEL_REL_INI", "RELACAO_INI", {1.0, 16.5}, 1.6, true);
     stripText(terminal, "VARIAVEL_FIO_INI", "FIO_SEGINI", {-1.2, 16.5}, 1.4, true);
     stripText(terminal, "VARIAVEL_REL_FIM", "RELACAO_FIM", {1.0, -38}, 1.6, true);

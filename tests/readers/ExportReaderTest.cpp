@@ -1,9 +1,11 @@
 // The export reader on small schematics: the kinds it reads for each EXPORTA value, each
 // marked in ZV_LISTA_TIPO, and what a wire's item learns about a terminal at its ends.
+#include "readers/CCBorneDataReader.h"
 #include "readers/CCExportDataReader.h"
 #include "readers/FioFixture.h"
 
 #include "export/CEExportacao.h"
+#include "settings/CIMensagens.h"
 
 #include <QMap>
 
@@ -281,6 +283,191 @@ TEST_F(ExportRelationTest, ATemplateGivesTheSeparatorAndOrder) {
 TEST_F(ExportRelationTest, AFieldWithoutHeadingAnswersItsTag) {
     EXPECT_EQ(leitor.PromptCampo("CAMPO_QUE_NAO_HA", false), "CAMPO_QUE_NAO_HA");
     EXPECT_EQ(leitor.PromptCampo("O'BRIEN", true), "O'BRIEN");
+}
+
+}  // namespace
+
+namespace {
+
+// ---- a terminal's own sides, read with the components
+
+class ExportTerminalSidesTest : public ExportReaderTest {
+protected:
+    const CEItemLista* borneLido(const QString& numero) const {
+        for (const CEItemLista* item : lidos_)
+            if (item->valorCampo("ZV_LISTA_TIPO") == "BORNE" &&
+                item->valorCampo("NUMERO") == numero)
+                return item;
+        return nullptr;
+    }
+    // The side fields of an item, by name.
+    static QMap<QString, QString> lados(const CEItemLista& item) {
+        QMap<QString, QString> campos;
+        for (const char* nome : {"RELACAO_INI", "RELACAO_FIM", "FIO_SEGINI", "FIO_SEGFIM",
+                                 "REGUA_INI", "NUMERO_FIM", "HANDLE_INI", "HANDLE_FIM"})
+            if (item.temCampo(nome)) campos.insert(nome, item.valorCampo(nome));
+        return campos;
+    }
+    // One wire runs from -K1 through both points of an equipment's terminal, 2 apart, to
+    // -K2: the points alone are too close to tell apart, the connection names are not.
+    void equipamento(bool comDados) {
+        zvdb::BlockReference* ref = simbolo("BORNE_EQ", {20, 200, 0},
+                                            {{"REGUA", "XE", {24, 197, 0}},
+                                             {"NUMERO", "1", {24, 194, 0}},
+                                             {"LIGACAO1", "1", {20, 200, 0}},
+                                             {"LIGACAO2", "2", {20, 198, 0}}},
+                                            "1001");
+        ref->setXData("KVR_ZV_PTS_CORTE",
+                      zvsample::XDataItems().point({20, 200, 0}).point({20, 198, 0}).tags());
+        if (comDados) ref->setXData("KVR_ZV_EQUIPO", zvsample::XDataItems().text("EQUIPO").tags());
+        componente("-K1", {{"A1", {20, 300, 0}}});
+        componente("-K2", {{"A1", {20, 100, 0}}});
+        fio({{20, 300, 0}, {20, 200, 0}, {20, 198, 0}, {20, 100, 0}}, "7");
+    }
+};
+
+TEST_F(ExportTerminalSidesTest, ATerminalCarriesTheElementsAndWiresAtItsTwoPoints) {
+    // X1:1 has -K1 at its cut point (wire 1) and X1:2 at its insertion point (wire 5);
+    // X1:3 is wired to nothing.
+    x1_ = borne("X1", "1", {20, 200, 0});
+    x2_ = borne("X1", "2", {60, 200, 0});
+    borne("X1", "3", {100, 200, 0});
+    k1_ = componente("-K1", {{"A1", {20, 100, 0}}});
+    fio({{20, 190, 0}, {20, 100, 0}}, "1");
+    fio({{20, 200, 0}, {20, 220, 0}, {60, 220, 0}, {60, 200, 0}}, "5");
+    le(3);
+    const CEItemLista* um = borneLido("1");
+    ASSERT_TRUE(um);
+    // The cut point's element under _INI, the insertion point's under _FIM.
+    EXPECT_EQ(um->valorCampo("RELACAO_INI"), "-K1:A1");
+    EXPECT_EQ(um->valorCampo("HANDLE_INI"), handle(k1_));
+    EXPECT_EQ(um->valorCampo("LIG_INI"), "A1");
+    EXPECT_EQ(um->valorCampo("FIO_SEGINI"), "1");
+    EXPECT_EQ(um->valorCampo("RELACAO_FIM"), "X1:2");
+    EXPECT_EQ(um->valorCampo("HANDLE_FIM"), handle(x2_));
+    EXPECT_EQ(um->valorCampo("FIO_SEGFIM"), "5");
+    // Its own fields stay its own.
+    EXPECT_EQ(um->valorCampo("HANDLE"), handle(x1_));
+    EXPECT_EQ(um->valorCampo("NUMERO"), "1");
+    const CEItemLista* tres = borneLido("3");
+    ASSERT_TRUE(tres);
+    EXPECT_TRUE(lados(*tres).isEmpty());
+    EXPECT_FALSE(tres->temCampo("REL_INI"));
+    EXPECT_FALSE(tres->temCampo("REL_FIM"));
+}
+
+TEST_F(ExportTerminalSidesTest, AnInvertedTerminalSwapsItsSides) {
+    x1_ = borne("X1", "1", {20, 200, 0});
+    x1_->addAttribute("INVERTIDO", "s", {24, 191, 0}, 1.0);
+    k1_ = componente("-K1", {{"A1", {20, 100, 0}}});
+    fio({{20, 190, 0}, {20, 100, 0}}, "1");
+    le(3);
+    const CEItemLista* um = borneLido("1");
+    ASSERT_TRUE(um);
+    EXPECT_EQ(um->valorCampo("RELACAO_FIM"), "-K1:A1");
+    EXPECT_EQ(um->valorCampo("FIO_SEGFIM"), "1");
+    EXPECT_FALSE(um->temCampo("RELACAO_INI"));
+    EXPECT_FALSE(um->temCampo("FIO_SEGINI"));
+}
+
+TEST_F(ExportTerminalSidesTest, TheSidesAreThoseTheTerminalListReads) {
+    x1_ = borne("X1", "1", {20, 200, 0});
+    x2_ = borne("X1", "2", {60, 200, 0});
+    k1_ = componente("-K1", {{"A1", {20, 100, 0}}, {"A2", {60, 100, 0}}});
+    fio({{20, 190, 0}, {20, 100, 0}}, "1");
+    fio({{60, 190, 0}, {60, 100, 0}}, "2");
+    fio({{20, 200, 0}, {20, 220, 0}, {60, 220, 0}, {60, 200, 0}}, "5");
+    le(3);
+    CCBorneDataReader lista;
+    CIProgress progresso;
+    std::unique_ptr<VetorItens> lidos(lista.LerDados(&db(), std::nullopt, modelo_, progresso));
+    ASSERT_TRUE(lidos);
+    ASSERT_EQ(lidos->size(), 2u);
+    for (const CEItemLista* daLista : *lidos) {
+        const CEItemLista* exportado = borneLido(daLista->valorCampo("NUMERO"));
+        ASSERT_TRUE(exportado);
+        EXPECT_FALSE(lados(*exportado).isEmpty());
+        EXPECT_EQ(lados(*exportado), lados(*daLista));
+    }
+    lidos->destruirItens();
+}
+
+TEST_F(ExportTerminalSidesTest, AContactOnATerminalNamesItsComponent) {
+    // The coil comes first in the block table, the contact after the terminal: the
+    // terminal's side is read once both are known.
+    k1_ = componente("-K1", {{"A1", {200, 100, 0}}});
+    x1_ = borne("X1", "1", {20, 200, 0});
+    const zvdb::BlockReference* contato = componente("-K1", {{"13", {20, 100, 0}}}, "NA-1");
+    fio({{20, 190, 0}, {20, 100, 0}}, "1");
+    le(3);
+    const CEItemLista* um = borneLido("1");
+    ASSERT_TRUE(um);
+    EXPECT_EQ(um->valorCampo("HANDLE_INI"), handle(k1_));
+    EXPECT_NE(um->valorCampo("HANDLE_INI"), handle(contato));
+    // The contact's connection, the component's relation.
+    EXPECT_EQ(um->valorCampo("RELACAO_INI"), "-K1:13");
+    EXPECT_EQ(um->valorCampo("REL_INI"), "-K1");
+}
+
+TEST_F(ExportTerminalSidesTest, AnEquipmentsConnectionNameTellsItsEntryOnTheWire) {
+    equipamento(true);
+    le(3);
+    const CEItemLista* eq = borneLido("1");
+    ASSERT_TRUE(eq);
+    // Connection 1 (the insertion point) meets -K1, connection 2 (the cut point) -K2.
+    EXPECT_EQ(eq->valorCampo("RELACAO_FIM"), "-K1:A1");
+    EXPECT_EQ(eq->valorCampo("RELACAO_INI"), "-K2:A1");
+}
+
+TEST_F(ExportTerminalSidesTest, WithoutTheEquipmentsDataThePointsMixUpItsSides) {
+    equipamento(false);
+    le(3);
+    const CEItemLista* eq = borneLido("1");
+    ASSERT_TRUE(eq);
+    EXPECT_EQ(eq->valorCampo("RELACAO_FIM"), "-K2:A1");
+    EXPECT_EQ(eq->valorCampo("RELACAO_INI"), "-K1:A1");
+}
+
+// ---- the other side of a wire's terminal end
+
+TEST_F(ExportReaderTest, AWiresTerminalEndTellsTheWireAcrossTheTerminal) {
+    // Wire 1 ends at X1:1's cut point; wire 9 leaves its insertion point to -K2.
+    x1_ = borne("X1", "1", {20, 200, 0});
+    componente("-K1", {{"A1", {20, 100, 0}}});
+    componente("-K2", {{"A1", {20, 300, 0}}}, "BOBINA2");
+    fio({{20, 190, 0}, {20, 100, 0}}, "1");
+    fio({{20, 200, 0}, {20, 300, 0}}, "9");
+    le(2);
+    const CEItemLista* fio1 = doFio("1");
+    const CEItemLista* fio9 = doFio("9");
+    ASSERT_TRUE(fio1);
+    ASSERT_TRUE(fio9);
+    // Each wire's terminal end names the other wire under the second suffix.
+    EXPECT_EQ(fio1->valorCampo("FIO_SEGINI"), "9");
+    EXPECT_EQ(fio9->valorCampo("FIO_SEGINI"), "1");
+    // A wire's end away from the terminal keeps its own stretch.
+    EXPECT_EQ(fio1->valorCampo("FIO_SEGFIM"), "1");
+}
+
+// ---- messages
+
+TEST_F(ExportReaderTest, TheTerminalExportSaysNothingOfRepeatedNumbers) {
+    // Two strips that both start at 1, the first bridged: the terminal list says its
+    // jumpers stay unlinked, the export, which draws no jumpers, does not.
+    borne("X1", "1", {20, 200, 0})->addAttribute("JUMPER", "2", {24, 191, 0}, 1.0);
+    borne("X1", "2", {60, 200, 0});
+    borne("X2", "1", {100, 200, 0});
+    const QString aviso = CIMensagens::Mensagem("ZVLISTAS", 329);
+    ASSERT_FALSE(aviso.isEmpty());
+    le(1);
+    EXPECT_EQ(tipos().value("BORNE"), 3);
+    EXPECT_FALSE(saida().contains(aviso)) << saida().toStdString();
+    CCBorneDataReader lista;
+    CIProgress progresso;
+    std::unique_ptr<VetorItens> lidos(lista.LerDados(&db(), std::nullopt, modelo_, progresso));
+    ASSERT_TRUE(lidos);
+    EXPECT_TRUE(saida().contains(aviso)) << saida().toStdString();
+    lidos->destruirItens();
 }
 
 }  // namespace

@@ -1,0 +1,322 @@
+// gerarListaBornesDwg through zvhost on a generated project with strips of the test's own
+// added: strips of one terminal, numbers that are no numbers, jumpers to other strips,
+// strips the picker or the filter empties, and missing block files.
+#include "ProductFolder.h"
+#include "drawing/Attribute.h"
+#include "drawing/BlockRecord.h"
+#include "drawing/BlockReference.h"
+#include "drawing/Database.h"
+#include "drawing/DxfLoader.h"
+#include "drawing/DxfWriter.h"
+#include "sample/XDataItems.h"
+
+#include <gtest/gtest.h>
+
+#include <QCryptographicHash>
+#include <QFile>
+#include <QMap>
+#include <QRegularExpression>
+#include <QSet>
+
+#include <algorithm>
+#include <map>
+#include <memory>
+
+namespace {
+
+struct Borne {
+    const char* regua;
+    const char* numero;
+    const char* jumper;
+};
+
+// What a drawn strip row shows: its terminals' numbers from left to right and the x of its
+// jumper marks by kind.
+struct Linha {
+    QStringList numeros;
+    QMap<QString, QList<double>> pontes;
+    QStringList internos, externos;  // the elements above and below each terminal
+};
+
+class ComandoReguasTest : public ::testing::Test {
+protected:
+    static void SetUpTestSuite() {
+        pasta_ = new zvtest::ProductFolder;
+        const QString problema = pasta_->prepare({"--seed", "5", "--terminals", "40"});
+        ASSERT_TRUE(problema.isEmpty()) << problema.toStdString();
+    }
+    static void TearDownTestSuite() {
+        delete pasta_;
+        pasta_ = nullptr;
+    }
+
+    // The generated project with the terminals added on its first schematic page, far from
+    // any wire: nothing is wired to them, only their jumpers can keep them.
+    static QString Projeto(const QString& nome, const std::vector<Borne>& bornes) {
+        auto db = zvdb::DxfLoader::loadFile(pasta_->project().toStdString());
+        zvdb::BlockRecord* bloco = nullptr;
+        std::string layer;
+        for (zvdb::Entity* e : db->modelSpace()->entities())
+            if (auto* ref = dynamic_cast<zvdb::BlockReference*>(e))
+                if (ref->blockName().starts_with("BORNE") && ref->hasXData("KVR_ZV")) {
+                    bloco = db->block(std::string(ref->blockName()));
+                    layer = std::string(ref->layer());
+                    break;
+                }
+        EXPECT_TRUE(bloco);
+        if (!bloco) return {};
+        double x = 5000;
+        for (const Borne& b : bornes) {
+            zvdb::BlockReference* ref =
+                db->modelSpace()->addBlockReference(*bloco, {x, 5000, 0}, {1, 1, 1}, 0, layer);
+            ref->addAttribute("REGUA", b.regua, {x + 2, 4997, 0}, 1.0);
+            ref->addAttribute("NUMERO", b.numero, {x + 2, 4994, 0}, 1.0);
+            if (*b.jumper) ref->addAttribute("JUMPER", b.jumper, {x + 2, 4991, 0}, 1.0);
+            ref->setXData("KVR_ZV", zvsample::XDataItems().text("1001\f1").tags());
+            x += 40;
+        }
+        const QString caminho = pasta_->path(nome);
+        zvdb::DxfWriter::saveFile(*db, caminho.toStdString());
+        return caminho;
+    }
+
+    // The shipped template with a few lines of the test's own behind it.
+    static QString Modelo(const QString& nome, const QString& linhas) {
+        QFile modelo(pasta_->path("produto/templates/" + nome + ".grx"));
+        EXPECT_TRUE(modelo.open(QIODevice::WriteOnly));
+        modelo.write("(load (strcat *DIR_ZVCFG_TEMPL* \"reguas.grx\"))\n" + linhas.toUtf8() + "\n");
+        return nome + ".grx";
+    }
+
+    static zvtest::HostRun Desenha(const QString& projeto, const QString& saida,
+                                   const QString& modelo, const QStringList& extra = {}) {
+        QStringList args{"--quiet", "--load", pasta_->path("produto/config/zvconfig.lsp")};
+        if (!modelo.isEmpty())
+            args << "--eval"
+                 << "(setq *DEF_LISTA_BOR_DES* \"" + modelo + "\")";
+        args << extra << projeto << "-o" << saida << "gerarListaBornesDwg";
+        return pasta_->zvhost(args);
+    }
+
+    // The strip rows of a drawing by strip name (a strip cut in two rows gives two).
+    static std::multimap<QString, Linha> Linhas(const QString& arquivo) {
+        std::multimap<QString, Linha> linhas;
+        if (!QFile::exists(arquivo)) return linhas;
+        const auto db = zvdb::DxfLoader::loadFile(arquivo.toStdString());
+        struct Marca {
+            QString bloco, valor, interno, externo, layer;
+            double x, y;
+        };
+        std::vector<Marca> marcas;
+        for (zvdb::Entity* e : db->modelSpace()->entities()) {
+            auto* ref = dynamic_cast<zvdb::BlockReference*>(e);
+            if (!ref || !ref->layer().starts_with("REGUAS$")) continue;
+            QString valor, interno, externo;
+            for (zvdb::Attribute* a : ref->attributes()) {
+                const QString texto = QString::fromStdString(std::string(a->textValue()));
+                if (a->tag() == "REGUA" || a->tag() == "VARIAVEL_NUMERO" ||
+                    a->tag() == "VARIAVEL_NUMBER")
+                    valor += texto;
+                if (a->tag() == "VARIAVEL_REL_INI") interno = texto;
+                if (a->tag() == "VARIAVEL_REL_FIM") externo = texto;
+            }
+            marcas.push_back({QString::fromStdString(std::string(ref->blockName())), valor, interno,
+                              externo, QString::fromStdString(std::string(ref->layer())),
+                              ref->position().x, ref->position().y});
+        }
+        std::sort(marcas.begin(), marcas.end(),
+                  [](const Marca& a, const Marca& b) { return a.x < b.x; });
+        for (const Marca& cab : marcas) {
+            if (cab.bloco != "REGUA_CAB") continue;
+            Linha linha;
+            for (const Marca& m : marcas) {
+                if (m.layer != cab.layer || m.y > cab.y + 0.01 || m.y < cab.y - 20) continue;
+                if (m.bloco == "REGUA_BORNE" && std::abs(m.y - cab.y) < 0.01) {
+                    linha.numeros << m.valor;
+                    linha.internos << m.interno;
+                    linha.externos << m.externo;
+                } else if (m.bloco.startsWith("REGUA_PONTE"))
+                    linha.pontes[m.bloco] << m.x;
+            }
+            linhas.insert({cab.valor, linha});
+        }
+        return linhas;
+    }
+
+    // A message as zvhost prints it, in English, the second language of the message file.
+    static QString Mensagem(int numero) {
+        QFile arquivo(QStringLiteral(ZV_SOURCE_DIR "/data/program/ZVListas.config"));
+        if (!arquivo.open(QIODevice::ReadOnly)) return {};
+        const QString texto = QString::fromUtf8(arquivo.readAll());
+        auto achados =
+            QRegularExpression("numero=\"" + QString::number(numero) + "\" texto=\"([^\"]+)\"")
+                .globalMatch(texto);
+        for (int lingua = 1; achados.hasNext(); ++lingua) {
+            const QRegularExpressionMatch achado = achados.next();
+            if (lingua == 2) return achado.captured(1);
+        }
+        return {};
+    }
+
+    static QByteArray Hash(const QString& arquivo) {
+        QFile f(arquivo);
+        if (!f.open(QIODevice::ReadOnly)) return {};
+        return QCryptographicHash::hash(f.readAll(), QCryptographicHash::Sha256);
+    }
+
+    static zvtest::ProductFolder* pasta_;
+};
+
+zvtest::ProductFolder* ComandoReguasTest::pasta_ = nullptr;
+
+TEST_F(ComandoReguasTest, LoneStripsOddNumbersAndJumpersToOtherStrips) {
+    const QString projeto = Projeto("estranhos.dxf", {
+                                                         {"ZA", "1", "3"},
+                                                         {"ZA", "2", ""},
+                                                         {"ZA", "3", "1"},
+                                                         {"ZA", "4", "9"},
+                                                         {"ZA", "5", "2"},
+                                                         {"ZB", "9", ""},
+                                                         {"ZC", "1", "1"},
+                                                         {"ZD", "PE", "N"},
+                                                         {"ZD", "N", "PE"},
+                                                         {"ZD", "A", "zz,,x"},
+                                                     });
+    ASSERT_FALSE(projeto.isEmpty());
+    const QString saida = pasta_->path("estranhos-reguas.dxf");
+    const zvtest::HostRun r = Desenha(projeto, saida, QString());
+    ASSERT_EQ(r.status, 0) << r.err.toStdString();
+    const auto linhas = Linhas(saida);
+    // Bridged 1 and 3 stay, and 5, whose jumper names 2; 2 names none and goes, and 4's
+    // jumper reaches only another strip's 9. 5 alone in its chain has no mark.
+    ASSERT_EQ(linhas.count("ZA"), 1u);
+    const Linha& za = linhas.find("ZA")->second;
+    EXPECT_EQ(za.numeros, QStringList({"1", "3", "5"}));
+    EXPECT_EQ(za.pontes.value("REGUA_PONTEI").size(), 1);
+    EXPECT_EQ(za.pontes.value("REGUA_PONTEF").size(), 1);
+    EXPECT_EQ(linhas.count("ZB"), 0u);
+    // A strip of one terminal, bridged to itself: drawn, with no jumper mark.
+    ASSERT_EQ(linhas.count("ZC"), 1u);
+    EXPECT_EQ(linhas.find("ZC")->second.numeros, QStringList({"1"}));
+    EXPECT_TRUE(linhas.find("ZC")->second.pontes.isEmpty());
+    // Numbers that are no numbers: PE and N bridged and drawn, A's jumper finds nothing.
+    ASSERT_EQ(linhas.count("ZD"), 1u);
+    const Linha& zd = linhas.find("ZD")->second;
+    QStringList numeros = zd.numeros;
+    numeros.sort();
+    EXPECT_EQ(numeros, QStringList({"N", "PE"}));
+    EXPECT_EQ(zd.pontes.value("REGUA_PONTEI").size(), 1);
+    EXPECT_EQ(zd.pontes.value("REGUA_PONTEF").size(), 1);
+
+    // With every terminal kept, each added one is drawn.
+    const QString todos = pasta_->path("estranhos-todos.dxf");
+    ASSERT_EQ(
+        Desenha(projeto, todos, Modelo("reguas-todos", "(setq *BORNES_SEM_LIG_GRX* T)")).status, 0);
+    const auto todas = Linhas(todos);
+    ASSERT_EQ(todas.count("ZA"), 1u);
+    EXPECT_EQ(todas.find("ZA")->second.numeros, QStringList({"1", "2", "3", "4", "5"}));
+    ASSERT_EQ(todas.count("ZB"), 1u);
+    EXPECT_EQ(todas.find("ZB")->second.numeros, QStringList({"9"}));
+    ASSERT_EQ(todas.count("ZD"), 1u);
+    EXPECT_EQ(todas.find("ZD")->second.numeros.size(), 3);
+}
+
+TEST_F(ComandoReguasTest, TheDrawnTerminalsShowTheSidesTheTerminalExportLists) {
+    const QString saida = pasta_->path("lados.dxf");
+    zvtest::HostRun r = Desenha(pasta_->project(), saida, QString());
+    ASSERT_EQ(r.status, 0) << r.err.toStdString();
+    // The terminal export reads the sides with the terminal list's own reader.
+    const QString csv = pasta_->path("bornes.csv");
+    r = pasta_->zvhost({"--quiet", "--load", pasta_->path("produto/config/zvconfig.lsp"),
+                        "--answer", "export:config=Completa", "--answer", "export:type=BORNES",
+                        "--answer", "export:format=CSV", "--answer", "export:file=" + csv,
+                        pasta_->project(), "exportacaoBornes"});
+    ASSERT_EQ(r.status, 0) << r.err.toStdString();
+    QFile arquivo(csv);
+    ASSERT_TRUE(arquivo.open(QIODevice::ReadOnly));
+    const QStringList linhasCsv = QString::fromUtf8(arquivo.readAll()).split('\n');
+    ASSERT_GT(linhasCsv.size(), 2);
+    const QStringList cabecalho = linhasCsv[0].trimmed().split(';');
+    ASSERT_EQ(cabecalho.size(), 5) << linhasCsv[0].toStdString();
+    QMap<QString, QPair<QString, QString>> exportados;
+    for (const QString& linha : linhasCsv.mid(1)) {
+        QStringList campos = linha.trimmed().split(';');
+        if (campos.size() != 5) continue;
+        for (QString& campo : campos)
+            campo = campo.mid(1, campo.size() - 2);  // the quotes
+        if (campos[0].isEmpty()) continue;           // an accessory
+        bool numerico = false;
+        const int numero = campos[1].toInt(&numerico);
+        const QString chave = campos[0] + ":" + (numerico ? QString::number(numero) : campos[1]);
+        exportados.insert(chave, {campos[2], campos[3]});
+    }
+    int desenhados = 0, comLado = 0;
+    QSet<QString> vistos;
+    for (const auto& [regua, linha] : Linhas(saida))
+        for (int i = 0; i < linha.numeros.size(); ++i) {
+            const QString chave = regua + ":" + linha.numeros[i];
+            ++desenhados;
+            vistos.insert(chave);
+            ASSERT_TRUE(exportados.contains(chave))
+                << chave.toStdString() << " in " << linha.numeros.join(",").toStdString();
+            EXPECT_EQ(linha.internos[i], exportados[chave].first) << chave.toStdString();
+            EXPECT_EQ(linha.externos[i], exportados[chave].second) << chave.toStdString();
+            if (!linha.internos[i].isEmpty() || !linha.externos[i].isEmpty()) ++comLado;
+        }
+    EXPECT_GT(comLado, desenhados / 2);
+    // No terminal with something wired is left out.
+    for (auto it = exportados.cbegin(); it != exportados.cend(); ++it) {
+        if (it.value().first.isEmpty() && it.value().second.isEmpty()) continue;
+        EXPECT_TRUE(vistos.contains(it.key())) << it.key().toStdString();
+    }
+    // The components wired to the strips stand under them.
+    int simbolos = 0;
+    const auto db = zvdb::DxfLoader::loadFile(saida.toStdString());
+    for (zvdb::Entity* e : db->modelSpace()->entities())
+        if (auto* ref = dynamic_cast<zvdb::BlockReference*>(e))
+            simbolos += ref->blockName() == "REGUA_COMP" && ref->layer().starts_with("REGUAS$") &&
+                        ref->hasXData("KVR_ZV_REPRESENTACAO");
+    EXPECT_GT(simbolos, 0);
+}
+
+TEST_F(ComandoReguasTest, NoTerminalLeftDrawsNoPageAndSaysSo) {
+    const QString semBornes = Mensagem(64);
+    ASSERT_FALSE(semBornes.isEmpty());
+    const QByteArray antes = Hash(pasta_->project());
+    // A picked strip that the project does not have.
+    const QString saida = pasta_->path("nenhuma.dxf");
+    zvtest::HostRun r = Desenha(pasta_->project(), saida,
+                                Modelo("reguas-escolha", "(setq *SEL_REGUA_BORNE_CFG* T)"),
+                                {"--answer", "strips=NAO_HA"});
+    ASSERT_EQ(r.status, 0) << r.err.toStdString();
+    EXPECT_TRUE(r.out.contains(semBornes)) << r.out.toStdString();
+    EXPECT_TRUE(Linhas(saida).empty());
+    // A filter that refuses every terminal.
+    const QString filtrada = pasta_->path("filtrada.dxf");
+    r = Desenha(pasta_->project(), filtrada,
+                Modelo("reguas-filtro", "(setq *FILTRO_TEMPLATE* \"(= 1 2)\")"));
+    ASSERT_EQ(r.status, 0) << r.err.toStdString();
+    EXPECT_TRUE(r.out.contains(semBornes)) << r.out.toStdString();
+    const auto db = zvdb::DxfLoader::loadFile(filtrada.toStdString());
+    for (zvdb::Entity* e : db->modelSpace()->entities())
+        EXPECT_FALSE(e->layer().starts_with("REGUAS$")) << e->layer();
+    EXPECT_EQ(Hash(pasta_->project()), antes);
+}
+
+TEST_F(ComandoReguasTest, AMissingBlockFileEndsTheCommandAndNothingIsSaved) {
+    const QByteArray antes = Hash(pasta_->project());
+    const QString saida = pasta_->path("sem-bloco.dxf");
+    const zvtest::HostRun r =
+        Desenha(pasta_->project(), saida,
+                Modelo("reguas-sem-bloco",
+                       "(setq *BLOCO_PONTE_GRX* \"DADOS\\\\1\\\\BLOCOS\\\\NAO_EXISTE\")"));
+    EXPECT_EQ(r.status, 3) << r.err.toStdString();
+    const QString texto = r.out + r.err;
+    ASSERT_FALSE(Mensagem(150).isEmpty());
+    EXPECT_TRUE(texto.contains(Mensagem(150))) << texto.toStdString();
+    EXPECT_TRUE(texto.contains("NAO_EXISTE.dwg")) << texto.toStdString();
+    EXPECT_FALSE(QFile::exists(saida));
+    EXPECT_EQ(Hash(pasta_->project()), antes);
+}
+
+}  // namespace
