@@ -107,6 +107,7 @@ CIDlgExporta::CIDlgExporta(CEExportacao* exportacao, CEExportConfigs* configs,
       botaoExcluir_(Botao(kExcluir)) {
     nome_->setReadOnly(true);
     paginas_->setReadOnly(true);
+    paginas_->setPlaceholderText(Mensagem(kTodasPaginas));
     arquivo_->setMinimumWidth(380);
     for (const auto& [rotulo, numero] : kTipos)
         tipo_->addItem(Mensagem(rotulo), numero);
@@ -153,6 +154,7 @@ CIDlgExporta::CIDlgExporta(CEExportacao* exportacao, CEExportConfigs* configs,
     resumo_->setFocusPolicy(Qt::NoFocus);
     resumo_->setMinimumHeight(150);
     formulario->addRow(Mensagem(kColunasExportadas), resumo_);
+    rotuloResumo_ = formulario->labelForField(resumo_);
 
     auto* editores = new QHBoxLayout;
     QPushButton* colunas = Botao(kColunasBotao);
@@ -174,6 +176,7 @@ CIDlgExporta::CIDlgExporta(CEExportacao* exportacao, CEExportConfigs* configs,
 
     auto* layout = new QVBoxLayout(this);
     layout->addLayout(formulario);
+    layout->addStretch();
     layout->addLayout(editores);
     setWindowTitle(Mensagem(kTituloJanela));
 }
@@ -430,6 +433,9 @@ void CIDlgExporta::Atualiza() {
                               formato == CEExportacao::Dwg);
     botaoFiltros_->setEnabled(tipoIn != CEExportacao::Paginas);
     paginas_->setText(rascunho_->GetOpcao("PAGINAS"));
+    // Whole pages have no columns to show.
+    resumo_->setVisible(tipoIn != CEExportacao::Paginas);
+    if (rotuloResumo_) rotuloResumo_->setVisible(tipoIn != CEExportacao::Paginas);
     resumo_->clear();
     for (const CEPropExport& coluna : rascunho_->Colunas)
         if (coluna.Visivel) resumo_->addItem(coluna.Titulo);

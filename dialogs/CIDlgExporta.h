@@ -107,6 +107,7 @@ private:
     QLineEdit* arquivo_;
     QLineEdit* paginas_;
     QListWidget* resumo_;
+    QWidget* rotuloResumo_ = nullptr;
     QPushButton* botaoPaginas_;
     QPushButton* botaoFiltros_;
     QPushButton* botaoExcluir_;

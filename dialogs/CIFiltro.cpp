@@ -17,6 +17,8 @@
 #include <QTreeWidget>
 #include <QVBoxLayout>
 
+#include <algorithm>
+
 using namespace JanelaDialogo;
 
 namespace {
@@ -32,6 +34,19 @@ QString Caminho() {
 QString RotuloOperador(int operador) {
     return operador >= 0 && operador < kOperadores ? Mensagem(kPrimeiroOperador + operador)
                                                    : QString::number(operador);
+}
+
+// The heading, the rows and the widest operator label with some room, never below the
+// default nor wider than a third of a usual window.
+int LarguraInicial(const QTreeWidget& lista, int coluna) {
+    const QFontMetrics medida = lista.fontMetrics();
+    int largura = medida.horizontalAdvance(lista.headerItem()->text(coluna));
+    if (coluna == 1)
+        for (int i = 0; i < kOperadores; ++i)
+            largura = std::max(largura, medida.horizontalAdvance(RotuloOperador(i)));
+    for (int i = 0; i < lista.topLevelItemCount(); ++i)
+        largura = std::max(largura, medida.horizontalAdvance(lista.topLevelItem(i)->text(coluna)));
+    return std::clamp(largura + 24, kPadraoLarguraColuna, 240);
 }
 
 }  // namespace
@@ -124,7 +139,7 @@ CIFiltro::CIFiltro(CEExportacao& exportacao, QWidget* pai)
     grade->addLayout(direcao, 2, 0, 1, 3);
     disponiveis_->setMinimumHeight(100);
     ordenar_->setMinimumHeight(100);
-    auto* ordenacao = new QGroupBox(Mensagem(kOrdenarPor));
+    auto* ordenacao = new QGroupBox(Mensagem(kOrdenacao));
     ordenacao->setLayout(grade);
 
     auto* botoes = new QDialogButtonBox;
@@ -140,15 +155,17 @@ CIFiltro::CIFiltro(CEExportacao& exportacao, QWidget* pai)
     layout->addWidget(botoes);
     Preenche(linhas_.empty() ? -1 : 0);
 
-    std::vector<int> valores(kLinhasArquivo - 4, kPadraoLarguraColuna);
+    // Without a stored width a column starts at 75, or wider when its heading needs it.
+    std::vector<int> valores(kLinhasArquivo - 4, 0);
     if (const auto lidos = LeArquivo(Caminho(), kLinhasArquivo)) {
         AplicaPosicao(*this, *lidos);
         for (size_t i = 4; i < lidos->size(); ++i)
             valores[i - 4] = (*lidos)[i];
     }
-    for (int i = 0; i < 3; ++i)
-        lista_->setColumnWidth(i,
-                               valores[size_t(i)] > 10 ? valores[size_t(i)] : kPadraoLarguraColuna);
+    for (int i = 0; i < 3; ++i) {
+        const int guardada = valores[size_t(i)];
+        lista_->setColumnWidth(i, guardada > 10 ? guardada : LarguraInicial(*lista_, i));
+    }
 }
 
 void CIFiltro::Preenche(int atual) {

@@ -62,6 +62,8 @@ enum Texto : int {
     kDireita = 1143,
     kOrdem = 1144,
     kColunasExportadas = 1145,
+    kOrdenacao = 1146,
+    kTodasPaginas = 1147,
     kSim = 0x34,
     kNao = 0x35,
 };

@@ -67,6 +67,16 @@ protected:
             EXPECT_GE(botao->width(), botao->sizeHint().width())
                 << nome.toStdString() << ": " << botao->text().toStdString() << " is cut";
         }
+        for (const QTreeWidget* arvore : d.findChildren<QTreeWidget*>()) {
+            if (!arvore->isVisible()) continue;
+            for (int i = 0; i < arvore->columnCount(); ++i) {
+                const QString cabecalho = arvore->headerItem()->text(i);
+                EXPECT_GE(arvore->columnWidth(i),
+                          arvore->fontMetrics().horizontalAdvance(cabecalho))
+                    << nome.toStdString() << ": the heading " << cabecalho.toStdString()
+                    << " is cut";
+            }
+        }
         for (const QComboBox* lista : d.findChildren<QComboBox*>()) {
             if (!lista->isVisible() || lista->isEditable()) continue;
             EXPECT_GT(lista->count(), 0) << nome.toStdString() << ": an empty list";

@@ -171,8 +171,11 @@ TEST_F(Exporta, ChangingTheKindLoadsItsSectionAndCrossingToPagesChangesTheFormat
     EXPECT_EQ(d.Arquivo()->text(), pasta.filePath("projeto.png"));
     EXPECT_TRUE(d.BotaoPaginas()->isEnabled());
     EXPECT_FALSE(d.BotaoFiltros()->isEnabled());
+    // Whole pages have no columns to list.
+    EXPECT_TRUE(d.Resumo()->isHidden());
 
     Escolhe(d.Tipo(), CEExportacao::Bornes);
+    EXPECT_FALSE(d.Resumo()->isHidden());
     EXPECT_EQ(Textos(d.Formato()).size(), 4);
     EXPECT_EQ(d.Rascunho().TipoOut, CEExportacao::Html);
     EXPECT_EQ(d.Arquivo()->text(), pasta.filePath("projeto.html"));
@@ -341,11 +344,13 @@ TEST_F(Exporta, CancelLeavesTheDriverAndTheFilesUntouched) {
     d.AbreOpcoes();
     EXPECT_EQ(d.Rascunho().GetOpcao("XLSX_TEMPLATE"), "modelo.xlsx");
     // Cancel, then the question: cancel stays, no leaves.
+    d.show();
     RespondePergunta(0xFF, QMessageBox::Cancel);
     d.reject();
-    EXPECT_NE(d.result(), QDialog::Rejected);
+    EXPECT_TRUE(d.isVisible());
     RespondePergunta(0xFF, QMessageBox::No);
     d.reject();
+    EXPECT_FALSE(d.isVisible());
     EXPECT_EQ(d.result(), QDialog::Rejected);
     EXPECT_EQ(exp.TipoIn, novo.TipoIn);
     EXPECT_EQ(exp.TipoOut, novo.TipoOut);

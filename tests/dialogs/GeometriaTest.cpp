@@ -84,7 +84,7 @@ TEST_F(GeometriaDialogos, ABadFileLeavesTheDialogAsItWas) {
     {
         CIFiltro d(exp);
         EXPECT_EQ(d.geometry(), QRect(10, 20, 700, 580));
-        EXPECT_EQ(d.Lista()->columnWidth(2), 75);
+        EXPECT_EQ(d.Lista()->columnWidth(0), larguraPadrao);
     }
     // A size too small for a window is not applied.
     std::vector<CEPropExport> colunas;
