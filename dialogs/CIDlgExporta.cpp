@@ -394,7 +394,11 @@ bool CIDlgExporta::GuardaAlteracoes() {
 
 void CIDlgExporta::accept() {
     const QString arquivo = arquivo_->text().trimmed();
-    if (arquivo.isEmpty()) return;
+    if (arquivo.isEmpty()) {
+        // Nothing to write to: the user types or browses for a file first.
+        arquivo_->setFocus();
+        return;
+    }
     if (QFile existente(arquivo); existente.open(QIODevice::ReadOnly)) {
         existente.close();
         if (Pergunta(MostraDialogo, this, kArquivoExiste, QMessageBox::Yes | QMessageBox::No) !=

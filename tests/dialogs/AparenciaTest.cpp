@@ -11,6 +11,7 @@
 #include "dialogs/CISelProps.h"
 #include "export/CEExportConfigs.h"
 #include "export/CEExportacao.h"
+#include "settings/CIRegistro.h"
 
 #include <QAbstractButton>
 #include <QComboBox>
@@ -164,4 +165,32 @@ TEST_F(Aparencia, TheNameAndTheListOfConfigurations) {
     CIDlgExportConfig lista({"", "Painel", "Outra"}, "Painel");
     EXPECT_EQ(lista.Lista()->topLevelItemCount(), 2);
     Olha(lista, "configurations");
+}
+
+TEST_F(Aparencia, EveryLanguageFits) {
+    for (const auto& [idioma, sufixo] : {std::pair{1, "pt"}, std::pair{3, "es"}}) {
+        ASSERT_TRUE(CIRegistro::SetIdiomaMenuSel(idioma));
+        CIMensagens::Descarregar();
+        CEExportConfigs configs;
+        configs.CarregaConfigs();
+        CEExportacao exp;
+        CIDlgExporta d(&exp, &configs, QString());
+        d.Inicia();
+        // The texts are the language's own: "Bornes" for terminals in both.
+        EXPECT_EQ(d.Tipo()->itemText(0), "Bornes");
+        EXPECT_EQ(d.Tipo()->itemText(7), idioma == 1 ? "Tudo" : "Todo");
+        Olha(d, QString("export-") + sufixo);
+        exp.Colunas = Colunas();
+        CIFiltro filtro(exp);
+        Olha(filtro, QString("filters-") + sufixo);
+        CEPropExport coluna("REGUA");
+        CIDlgPropDetail detalhe(coluna);
+        Olha(detalhe, QString("column-") + sufixo);
+        CIDlgOpcoes opcoes(exp, CEExportacao::Pdf);
+        Olha(opcoes, QString("options-pdf-") + sufixo);
+        std::vector<CEPropExport> lista = Colunas();
+        CISelProps props(lista);
+        Olha(props, QString("columns-") + sufixo);
+    }
+    CIRegistro::SetIdiomaMenuSel(2);
 }
