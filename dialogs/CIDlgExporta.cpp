@@ -362,8 +362,9 @@ bool CIDlgExporta::SalvaConfig() {
     configs_->DefineConfigAtiva(NomeConfig);
     QString erro;
     const bool gravou = configs_->SalvaConfigs(&erro);
+    // The user is not told, but the mark stays while the file does not hold the changes.
     if (!gravou) CICad::Log("The export configuration was not saved: " + erro);
-    modificada_ = false;
+    modificada_ = !gravou;
     Atualiza();
     return gravou;
 }

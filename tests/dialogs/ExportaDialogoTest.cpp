@@ -558,3 +558,27 @@ TEST_F(Exporta, AConfigurationEditedInTheDialogIsWrittenAndReadBackUnchanged) {
     EXPECT_EQ(Textos(outro.Resumo()), Textos(d.Resumo()));
     EXPECT_EQ(Textos(outro.Resumo()), QStringList({"A*B", "Rotulo"}));
 }
+
+TEST_F(Exporta, OkWithoutAFileStaysInTheDialog) {
+    CIDlgExporta& d = Abre();
+    d.show();
+    d.Arquivo()->setText("  ");
+    d.accept();
+    EXPECT_TRUE(d.isVisible());
+    EXPECT_NE(d.result(), QDialog::Accepted);
+    EXPECT_TRUE(exp.Arquivo.isEmpty());
+    EXPECT_TRUE(exp.Colunas.empty());
+    d.hide();
+}
+
+TEST_F(Exporta, ASaveThatFailsKeepsTheUnsavedMarkAndTheOldFile) {
+    CIDlgExporta& d = Abre();
+    Escolhe(d.Formato(), CEExportacao::Csv);
+    ASSERT_TRUE(
+        documento->lisp()->lispEvaluate("(setq *DIR_ZVCFG* \"" + pasta.path() + "/nao/existe/\")"));
+    EXPECT_FALSE(d.SalvaConfig());
+    EXPECT_TRUE(d.Modificada());
+    EXPECT_EQ(d.windowTitle(), Titulo("Painel", true));
+    EXPECT_EQ(teste::Le(ArquivoConfig()), teste::kConfiguracoes);
+    EXPECT_FALSE(QDir(pasta.filePath("nao")).exists());
+}
