@@ -1,6 +1,7 @@
 // The export dialog: what it loads, what each field does to the driver, the questions on
 // OK and Cancel, and the configurations it makes, opens, saves and deletes.
 #include "AmbienteDialogos.h"
+#include "cad/CICad.h"
 #include "dialogs/CIDlgExportConfig.h"
 #include "dialogs/CIDlgExporta.h"
 #include "dialogs/CIDlgNome.h"
@@ -581,4 +582,16 @@ TEST_F(Exporta, ASaveThatFailsKeepsTheUnsavedMarkAndTheOldFile) {
     EXPECT_EQ(d.windowTitle(), Titulo("Painel", true));
     EXPECT_EQ(teste::Le(ArquivoConfig()), teste::kConfiguracoes);
     EXPECT_FALSE(QDir(pasta.filePath("nao")).exists());
+}
+
+TEST_F(Exporta, BrowseGoesThroughTheHostsFileDialogWithThePaletteLocked) {
+    CIDlgExporta& d = Abre("BORNES");
+    ASSERT_TRUE(ui->addAnswer("export:file=" + pasta.filePath("escolhido.html")));
+    ASSERT_TRUE(documento->lisp()->lispEvaluate(
+        "(progn (defun zvAlternaStatusBloqueioPalette () (setq trocas (1+ trocas))) "
+        "(setq trocas 0))"));
+    d.Procura();
+    EXPECT_EQ(d.Arquivo()->text(), pasta.filePath("escolhido.html"));
+    // Locked before the file dialog and unlocked after it.
+    EXPECT_EQ(CICad::GetIntLisp("trocas"), 2);
 }
