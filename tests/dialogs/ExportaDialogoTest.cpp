@@ -595,3 +595,30 @@ TEST_F(Exporta, BrowseGoesThroughTheHostsFileDialogWithThePaletteLocked) {
     // Locked before the file dialog and unlocked after it.
     EXPECT_EQ(CICad::GetIntLisp("trocas"), 2);
 }
+
+TEST_F(Exporta, WithoutAnyStoredConfigurationItStartsFromTheDefaults) {
+    ASSERT_TRUE(QFile::remove(ArquivoConfig()));
+    CEExportConfigs nenhuma;
+    nenhuma.CarregaConfigs();
+    ASSERT_TRUE(nenhuma.Configs.empty());
+    CIDlgExporta d(&exp, &nenhuma, QString());
+    d.MostraDialogo = Mostrador();
+    d.Inicia();
+    EXPECT_TRUE(d.NomeConfig.isEmpty());
+    EXPECT_EQ(d.windowTitle(), Titulo(""));
+    EXPECT_FALSE(d.BotaoExcluir()->isEnabled());
+    EXPECT_EQ(d.Rascunho().TipoIn, CEExportacao::Bornes);
+    EXPECT_EQ(d.Rascunho().TipoOut, CEExportacao::Csv);
+    EXPECT_EQ(Campos(d.Rascunho().Colunas),
+              Campos(CEExportacao::ColunasPadrao(CEExportacao::Bornes, 2)));
+    EXPECT_EQ(d.Arquivo()->text(), pasta.filePath("projeto.csv"));
+    EXPECT_TRUE(d.SalvaConfig());
+    CEExportConfigs lidas;
+    lidas.CarregaConfigs();
+    ASSERT_NE(lidas.Config(""), nullptr);
+    EXPECT_EQ(lidas.Config("")->Secao("BORNES")->Colunas.size(),
+              CEExportacao::ColunasPadrao(CEExportacao::Bornes, 2).size());
+    d.accept();
+    EXPECT_EQ(d.result(), QDialog::Accepted);
+    EXPECT_EQ(exp.Arquivo, pasta.filePath("projeto.csv"));
+}
