@@ -3,10 +3,13 @@
 #include "CEExportacao.h"
 #include "RespostasExportacao.h"
 #include "cad/CICad.h"
+#include "dialogs/CIDlgExporta.h"
 #include "host/sdk/SystemServices.h"
 #include "host/sdk/UserInterface.h"
 #include "module/ZVResultado.h"
 #include "settings/CIMensagens.h"
+
+#include <QApplication>
 
 #include <exception>
 
@@ -19,6 +22,17 @@ constexpr int kRespostaInvalida = 962;
 void Avisa(int numero, const QString& detalhe) {
     CICad::Imprime("\n" + CIMensagens::Mensagem("ZVLISTAS", numero) + detalhe + "\n");
     ZVResultado::Falhou();
+}
+
+// A host without windows answers the dialog from its script; a bad answer is reported.
+RespostasExportacao::Resultado PreencheDoRoteiro(CEExportacao& exp, CEExportConfigs& configs,
+                                                 const QString& tipoPalavra,
+                                                 zvsdk::UserInterface& ui) {
+    QString erro;
+    const auto resultado = RespostasExportacao::Preenche(exp, configs, tipoPalavra, ui,
+                                                         CIMensagens::IdiomaAtual(), &erro);
+    if (resultado == RespostasExportacao::Resultado::Invalido) Avisa(kRespostaInvalida, erro);
+    return resultado;
 }
 
 }  // namespace
@@ -35,16 +49,23 @@ void CEExportacao::Exporta(const QString& tipoPalavra, FuncaoLeitor leitor) {
         return Avisa(kConfiguracaoDanificada, QString::fromLocal8Bit(e.what()));
     }
     CEExportacao exp;
-    QString erro;
-    switch (RespostasExportacao::Preenche(exp, configs, tipoPalavra, *ui,
-                                          CIMensagens::IdiomaAtual(), &erro)) {
-        case RespostasExportacao::Resultado::Cancelado:
+    // A host that shows dialogs runs in a widget application; any other answers from a script.
+    if (ui->showsDialogs() && qobject_cast<QApplication*>(QCoreApplication::instance())) {
+        CIDlgExporta dialogo(&exp, &configs, tipoPalavra);
+        if (dialogo.Executa() != 1) {
             ZVResultado::Cancelado();
             return;
-        case RespostasExportacao::Resultado::Invalido:
-            return Avisa(kRespostaInvalida, erro);
-        case RespostasExportacao::Resultado::Confirmado:
-            break;
+        }
+    } else {
+        switch (PreencheDoRoteiro(exp, configs, tipoPalavra, *ui)) {
+            case RespostasExportacao::Resultado::Cancelado:
+                ZVResultado::Cancelado();
+                return;
+            case RespostasExportacao::Resultado::Invalido:
+                return;
+            case RespostasExportacao::Resultado::Confirmado:
+                break;
+        }
     }
     // The routes module that wire lengths need is part of this host, so there is nothing
     // to load before the run.

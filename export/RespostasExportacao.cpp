@@ -48,6 +48,25 @@ void CarregaSecao(CEExportacao& exp, CEExportConfigs& configs, const QString& co
     }
 }
 
+QString PalavraInicial(const CEExportConfigs& configs, const QString& config,
+                       const QString& tipoPalavra) {
+    QString palavra = tipoPalavra;
+    if (palavra.isEmpty())
+        if (const CEExportConfig* c = configs.Config(config))
+            if (const CEExportSecao* geral = c->Secao(QString()))
+                palavra = geral->Opcoes.valor("TIPO_IN");
+    if (CEExportacao::TipoInDePalavra(palavra) == 0) palavra = QStringLiteral("BORNES");
+    return palavra;
+}
+
+void CarregaTela(CEExportacao& exp, CEExportConfigs& configs, const QString& config,
+                 const QString& palavra, int idioma) {
+    exp.TipoIn = CEExportacao::TipoInDePalavra(palavra);
+    if (!exp.AplicaConfig(configs, palavra, config))
+        exp.Colunas = CEExportacao::ColunasPadrao(exp.TipoIn, idioma);
+    CarregaSecao(exp, configs, config, palavra);
+}
+
 Resultado Preenche(CEExportacao& exp, CEExportConfigs& configs, const QString& tipoPalavra,
                    zvsdk::UserInterface& ui, int idioma, QString* erro) {
     const auto invalido = [erro](const QString& porque) {
@@ -68,21 +87,13 @@ Resultado Preenche(CEExportacao& exp, CEExportConfigs& configs, const QString& t
         config = *dada;
     }
 
-    QString palavra = tipoPalavra;
-    if (palavra.isEmpty())
-        if (const CEExportConfig* c = configs.Config(config))
-            if (const CEExportSecao* geral = c->Secao(QString()))
-                palavra = geral->Opcoes.valor("TIPO_IN");
-    if (CEExportacao::TipoInDePalavra(palavra) == 0) palavra = QStringLiteral("BORNES");
+    QString palavra = PalavraInicial(configs, config, tipoPalavra);
     if (const auto dada = ui.presetAnswer("export:type")) {
         if (CEExportacao::TipoInDePalavra(*dada) == 0)
             return invalido("'" + *dada + "' is no kind of list (export:type)");
         palavra = *dada;
     }
-    exp.TipoIn = CEExportacao::TipoInDePalavra(palavra);
-    if (!exp.AplicaConfig(configs, palavra, config))
-        exp.Colunas = CEExportacao::ColunasPadrao(exp.TipoIn, idioma);
-    CarregaSecao(exp, configs, config, palavra);
+    CarregaTela(exp, configs, config, palavra, idioma);
 
     if (const auto dada = ui.presetAnswer("export:format")) {
         const int formato = CEExportacao::TipoOutDePalavra(*dada);

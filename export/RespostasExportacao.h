@@ -31,4 +31,15 @@ Resultado Preenche(CEExportacao& exp, CEExportConfigs& configs, const QString& t
 void CarregaSecao(CEExportacao& exp, CEExportConfigs& configs, const QString& config,
                   const QString& secao);
 
+// The kind of list a dialog opens with: the command's word, else the one last exported with
+// the configuration, else "BORNES".
+QString PalavraInicial(const CEExportConfigs& configs, const QString& config,
+                       const QString& tipoPalavra);
+
+// The whole load of one kind of list, as the dialog shows it: the kind, its stored columns
+// and filters (or the kind's default columns in the language `idioma`), then the section's
+// format, options and column flags (CarregaSecao).
+void CarregaTela(CEExportacao& exp, CEExportConfigs& configs, const QString& config,
+                 const QString& palavra, int idioma);
+
 }  // namespace RespostasExportacao
