@@ -30,7 +30,7 @@ LispConsole::LispConsole(QWidget* parent)
     const QFont fixed = QFontDatabase::systemFont(QFontDatabase::FixedFont);
     output_->setFont(fixed);
     input_->setFont(fixed);
-    input_->setPlaceholderText("(command \"gerarListaBornesGrf\")  (princ (getvar \"CLAYER\"))");
+    input_->setPlaceholderText("(getprimeirapagina)  (princ (getvar \"CLAYER\"))");
     auto* layout = new QVBoxLayout(this);
     layout->setContentsMargins(2, 2, 2, 2);
     layout->addWidget(output_);

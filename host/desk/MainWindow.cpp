@@ -156,6 +156,7 @@ void MainWindow::buildActions() {
     main->addAction(out);
     for (QAction* action : {open, save_, undo_, redo_, fit, in, out})
         action->setIconText(action->text().remove('&').remove("..."));
+    addToolBarBreak();
     commandsBar_ = addToolBar(plain(Text::CommandsMenu));
     commandsBar_->setObjectName("commandsToolBar");
     commandsBar_->setToolButtonStyle(Qt::ToolButtonTextOnly);

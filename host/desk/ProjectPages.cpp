@@ -31,9 +31,13 @@ QStringList stripNames(const zvdb::Database& database) {
             !QString::fromUtf8(reference->blockName().data(), int(reference->blockName().size()))
                  .startsWith(QLatin1String("BORNE"), Qt::CaseInsensitive))
             continue;
-        if (const zvdb::Attribute* strip = reference->attribute("REGUA")) {
+        // The strip's tag in Portuguese, English or Spanish, the first one found.
+        for (const char* tag : {"REGUA", "STRIP", "REGLETA"}) {
+            const zvdb::Attribute* strip = reference->attribute(tag);
+            if (!strip) continue;
             const std::string_view value = strip->textValue();
             if (!value.empty()) strips.insert(QString::fromUtf8(value.data(), int(value.size())));
+            break;
         }
     }
     return QStringList(strips.begin(), strips.end());

@@ -17,8 +17,8 @@ namespace zvdesk {
 
 // The page registry's pages, all groups in order.
 QStringList pageNames(zvdb::Database& database);
-// The names of the terminal strips (the REGUA of the BORNE blocks in model space), sorted,
-// each once.
+// The names of the terminal strips (the REGUA, STRIP or REGLETA of the BORNE blocks in model
+// space), sorted, each once.
 QStringList stripNames(const zvdb::Database& database);
 bool isCoverOrIndex(const zvdb::Database& database, const std::string& page, bool* cover);
 // Freezes every layer but the page's own ones (its "$SELO" stays frozen on a cover or an

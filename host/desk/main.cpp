@@ -113,7 +113,9 @@ int main(int argc, char** argv) {
     static QtMessageHandler previous = nullptr;
     previous = qInstallMessageHandler(
         [](QtMsgType type, const QMessageLogContext& context, const QString& message) {
-            if (message.startsWith(QLatin1String("QStandardPaths: XDG_RUNTIME_DIR not set")))
+            // Platform notes that say nothing to a user.
+            if (message.startsWith(QLatin1String("QStandardPaths: XDG_RUNTIME_DIR not set")) ||
+                message.contains(QLatin1String("does not support propagateSizeHints")))
                 return;
             if (previous) previous(type, context, message);
         });
