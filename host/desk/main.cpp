@@ -29,8 +29,9 @@ const char* const kUsage =
     "  --load FILE.lsp       load a LISP file into every drawing opened (repeatable)\n"
     "  --module FILE         load this module instead of the ZVListas module beside zvdesk\n"
     "  --no-module           load no module\n"
-    "  --screenshot FILE.png open DRAWING, show its first page fitted, write a picture of\n"
-    "                        the main window and exit (works without a display)\n"
+    "  --page PAGE           show this page first (a page layer, e.g. COMANDO$0001$A)\n"
+    "  --screenshot FILE.png open DRAWING, show its first page (or --page) fitted, write a\n"
+    "                        picture of the main window and exit (works without a display)\n"
     "  -h, --help            this text\n"
     "\n"
     "exit status: 0; 1 when the drawing, the module or the screenshot fails; 2 for a usage\n"
@@ -42,6 +43,7 @@ struct Options {
     QString module;
     bool noModule = false;
     QString screenshot;
+    QString page;
 };
 
 // Empty when the arguments are good, else what is wrong.
@@ -61,6 +63,8 @@ QString parse(const QStringList& args, Options& options) {
             if (!value(options.module)) return "--module needs a file";
         } else if (arg == "--no-module") {
             options.noModule = true;
+        } else if (arg == "--page") {
+            if (!value(options.page)) return "--page needs a page";
         } else if (arg == "--screenshot") {
             if (!value(options.screenshot)) return "--screenshot needs a file";
         } else if (arg.startsWith('-') && arg.size() > 1) {
@@ -160,10 +164,14 @@ int main(int argc, char** argv) {
         }
     }
     if (!opened) window.newDrawing();
+    if (!options.page.isEmpty() && !window.showPage(options.page)) {
+        fail("no such page: " + options.page);
+        if (screenshot) return 1;
+    }
     if (!screenshot) return QApplication::exec();
 
     const QString first = window.pageBrowser()->firstPage();
-    if (!first.isEmpty()) window.showPage(first);
+    if (options.page.isEmpty() && !first.isEmpty()) window.showPage(first);
     QApplication::processEvents();
     window.pageView()->fit();
     if (!window.screenshot(options.screenshot)) {

@@ -13,7 +13,10 @@
 #include "drawing/LayerRecord.h"
 
 #include <QAction>
+#include <QGuiApplication>
 #include <QImage>
+#include <QScreen>
+#include <QThread>
 #include <QLineEdit>
 #include <QMessageBox>
 #include <QProcess>
@@ -34,6 +37,22 @@ int inkOf(const QImage& image, const QRect& area) {
         for (int x = box.left(); x <= box.right(); ++x)
             if (qGray(image.pixel(x, y)) < 160) ++ink;
     return ink;
+}
+
+// ZV_DESK_SHOTS=FOLDER keeps pictures of the windows for a look by eye: the whole screen
+// on a display (run under xvfb-run with QT_QPA_PLATFORM=xcb), else the window itself.
+void keepShot(const QString& name, QWidget* window) {
+    const QString folder = qEnvironmentVariable("ZV_DESK_SHOTS");
+    if (folder.isEmpty()) return;
+    // Let the display draw what was shown last.
+    for (int i = 0; i < 5; ++i) {
+        QApplication::processEvents();
+        QThread::msleep(60);
+    }
+    const QPixmap shot = QGuiApplication::platformName() == "xcb"
+                             ? QGuiApplication::primaryScreen()->grabWindow(0)
+                             : window->grab();
+    shot.save(folder + "/" + name + ".png");
 }
 
 class MainWindowTest : public DeskTest {};
@@ -120,7 +139,7 @@ TEST_F(MainWindowTest, TheTwelveCommandsAreInTheMenuAndRunFromIt) {
     QTimer watch;
     QObject::connect(&watch, &QTimer::timeout, [&] {
         zvdesk::ProgressWindow* progress = ui_->progressWindow();
-        if (progress->isVisible()) ++progressSeen;
+        if (progress->isVisible() && ++progressSeen == 1) keepShot("progress", progress);
         if (window_->isBusy() && !window_->commandAction("exportacao")->isEnabled())
             commandsOff = true;
     });
@@ -140,6 +159,8 @@ TEST_F(MainWindowTest, TheTwelveCommandsAreInTheMenuAndRunFromIt) {
     EXPECT_TRUE(window_->commandAction("exportacao")->isEnabled());
     // The user is back on the page shown before, as the product leaves them.
     EXPECT_EQ(window_->pageView()->page(), "CAPA$0001$A");
+    window_->showPage("LISTAS$0001$A");
+    keepShot("terminal-list", window_.get());
 }
 
 TEST_F(MainWindowTest, UndoAndRedoFollowTheDocument) {
