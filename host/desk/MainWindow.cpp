@@ -91,7 +91,7 @@ MainWindow::MainWindow(zvhost::Application& app, DeskUserInterface& ui)
     consoleDock->setWidget(console_);
     consoleDock->setFeatures(QDockWidget::DockWidgetMovable | QDockWidget::DockWidgetFloatable);
     addDockWidget(Qt::BottomDockWidgetArea, consoleDock);
-    resizeDocks({pagesDock}, {260}, Qt::Horizontal);
+    resizeDocks({pagesDock}, {300}, Qt::Horizontal);
     resizeDocks({consoleDock}, {170}, Qt::Vertical);
     statusBar()->addWidget(status_, 1);
     status_->setText(words(Text::Ready));
