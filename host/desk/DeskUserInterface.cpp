@@ -129,6 +129,12 @@ std::optional<QString> DeskUserInterface::answer(const QString& name, const QStr
         return picker.chosen().join(pages ? ';' : ',');
     }
     if (name == QLatin1String("pick")) return std::nullopt;  // no picking on the page view
+    // A file to write ("export:file"): the save dialog, not a line to type a path into.
+    if (name.endsWith(QLatin1String(":file"))) {
+        const QString file = fileDialog(name, false, QString(), QString(), prompt);
+        if (file.isEmpty()) return std::nullopt;
+        return file;
+    }
     QInputDialog dialog(parent_);
     dialog.setObjectName(name);
     dialog.setWindowTitle(words(Text::Input));

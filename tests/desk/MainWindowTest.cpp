@@ -13,15 +13,16 @@
 #include "drawing/LayerRecord.h"
 
 #include <QAction>
+#include <QFileDialog>
 #include <QGuiApplication>
 #include <QImage>
-#include <QScreen>
-#include <QThread>
 #include <QLineEdit>
 #include <QMessageBox>
 #include <QProcess>
 #include <QPushButton>
+#include <QScreen>
 #include <QTest>
+#include <QThread>
 #include <QWheelEvent>
 
 namespace {
@@ -204,6 +205,39 @@ TEST_F(MainWindowTest, TheConsoleEvaluatesLispAndShowsWhatThePrints) {
     // What the document prints on its command line (the module's messages) reaches it too.
     window_->document()->printMessage("\nmessage 326\n");
     EXPECT_TRUE(window_->console()->text().endsWith("\nmessage 326\n"));
+}
+
+TEST_F(MainWindowTest, AnExportFromTheMenuAsksForTheFileAndShowsIt) {
+    ASSERT_TRUE(window_->openDrawing(copyOfProject("export.dxf")));
+    const QString target = path("exported-terminals.csv");
+    QFile::remove(target);
+    QString asked;
+    ModalAnswer answer([&](QWidget* modal) {
+        auto* files = qobject_cast<QFileDialog*>(modal);
+        ASSERT_NE(files, nullptr) << (modal ? modal->metaObject()->className() : "no window");
+        asked = files->objectName();
+        EXPECT_EQ(files->acceptMode(), QFileDialog::AcceptSave);
+        files->selectFile(target);
+        static_cast<QDialog*>(files)->accept();
+    });
+    zvsdk::CommandResult result = zvsdk::CommandResult::Failed;
+    window_->commandAction("exportacaoBornes")->trigger();
+    EXPECT_EQ(asked, "export:file");
+    ASSERT_EQ(shown_, QStringList({target}));
+    QFile written(target);
+    ASSERT_TRUE(written.open(QIODevice::ReadOnly));
+    // One row per terminal of the project, and more: a real export.
+    EXPECT_GT(written.readAll().count('\n'), 20);
+    // Cancelled: nothing written, nothing shown.
+    QFile::remove(target);
+    ModalAnswer cancel([](QWidget* modal) {
+        ASSERT_NE(modal, nullptr);
+        static_cast<QDialog*>(modal)->reject();
+    });
+    window_->runCommand("exportacaoBornes", &result);
+    EXPECT_EQ(result, zvsdk::CommandResult::Cancelled);
+    EXPECT_FALSE(QFileInfo::exists(target));
+    EXPECT_EQ(shown_.size(), 1);
 }
 
 TEST_F(MainWindowTest, ScreenshotOfTheMainWindowIsNotEmpty) {
