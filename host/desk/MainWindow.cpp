@@ -11,8 +11,8 @@
 #include "app/DocumentLisp.h"
 #include "app/DrawingFiles.h"
 #include "app/HostDocument.h"
+#include "app/LispListener.h"
 #include "drawing/Database.h"
-#include "lisp/LispError.h"
 #include "lisp/Printer.h"
 
 #include <QAction>
@@ -224,8 +224,8 @@ void MainWindow::updateActions() {
     if (document_) {
         for (const QString& name : document_->commandNames()) {
             if (commandActions_.contains(name)) continue;
-            QAction* action =
-                commandsMenu_->addAction(name, this, [this, name] { runCommand(name); });
+            if (!otherMenu_) otherMenu_ = commandsMenu_->addMenu(words(Text::OtherCommands));
+            QAction* action = otherMenu_->addAction(name, this, [this, name] { runCommand(name); });
             action->setObjectName(name);
             commandActions_.insert(name, action);
             action->setEnabled(free);
@@ -238,6 +238,8 @@ void MainWindow::updateActions() {
 
 void MainWindow::setBusy(bool busy) {
     busy_ = busy;
+    // Let go only after the drawing settled: syncFromDrawing() reads it again.
+    if (busy) view_->hold(true);
     updateActions();
 }
 
@@ -357,6 +359,7 @@ bool MainWindow::showPage(const QString& page) {
 
 void MainWindow::syncFromDrawing(const QString& wanted) {
     if (!document_ || !document_->database()) return;
+    view_->hold(false);
     zvdb::Database& database = *document_->database();
     browser_->load(&database);
     const QStringList pages = browser_->pages();
@@ -420,17 +423,8 @@ void MainWindow::evaluate(const QString& text) {
     // One typed line is one step of Undo.
     document_->beginUndoGroup();
     try {
-        zvlisp::Value forms = interpreter.readAll(text);
-        for (const zvlisp::Value* cell = &forms; cell->isCons(); cell = &cell->asCons()->cdr) {
-            zvlisp::Value value;
-            if (!interpreter.evaluateForms(
-                    zvlisp::Value::cons(cell->asCons()->car, zvlisp::Value()), &value))
-                continue;
-            if (value.isSymbol() && value.asSymbol()->name.isEmpty()) continue;  // (princ)
-            print(zvlisp::Printer::prin1(value) + "\n");
-        }
-    } catch (zvlisp::LispError& error) {
-        interpreter.report(error);
+        zvhost::evaluateTyped(
+            interpreter, text, [this](const QString& line) { print(line); }, true);
     } catch (const std::bad_alloc&) {
         print("\nout of memory\n");
     }

@@ -93,6 +93,7 @@ private:
     LispConsole* console_;
     QLabel* status_;
     QMenu* commandsMenu_ = nullptr;
+    QMenu* otherMenu_ = nullptr;
     QToolBar* commandsBar_ = nullptr;
     QHash<QString, QAction*> commandActions_;
     QList<QAction*> fileActions_;

@@ -55,6 +55,13 @@ void PageView::collect() {
     extents_ = extentsOf(entities_);
 }
 
+void PageView::hold(bool held) {
+    held_ = held;
+    dragging_ = false;
+    dragOffset_ = {};
+    if (!held) refresh();
+}
+
 void PageView::refresh() {
     if (document_ && document_->database()) {
         // Entities added or erased since: gather the page again, keep the view.
@@ -67,6 +74,7 @@ void PageView::refresh() {
 }
 
 void PageView::fit() {
+    if (held_) return;
     if (extents_.isEmpty()) {
         window_ = QRectF(0, 0, 420, 297);
     } else {
@@ -80,7 +88,7 @@ void PageView::fit() {
 }
 
 void PageView::zoom(double factor, const QPointF& about) {
-    if (!window_.isValid() || factor <= 0) return;
+    if (held_ || !window_.isValid() || factor <= 0) return;
     const QTransform toScreen = zvplot::PageRenderer::windowToTarget(window_, QRectF(rect()));
     bool invertible = false;
     const QTransform toDrawing = toScreen.inverted(&invertible);
@@ -97,7 +105,7 @@ void PageView::zoom(double factor, const QPointF& about) {
 }
 
 void PageView::pan(const QPointF& pixels) {
-    if (!window_.isValid() || width() <= 0 || height() <= 0) return;
+    if (held_ || !window_.isValid() || width() <= 0 || height() <= 0) return;
     const QTransform toScreen = zvplot::PageRenderer::windowToTarget(window_, QRectF(rect()));
     const double scale = std::hypot(toScreen.m11(), toScreen.m12());
     if (scale <= 0) return;
@@ -121,7 +129,8 @@ void PageView::render() {
 }
 
 void PageView::paintEvent(QPaintEvent*) {
-    if (dirty_ || picture_.size() != size() * devicePixelRatioF()) render();
+    // The entities the picture was made of may be changing under a running command.
+    if (!held_ && (dirty_ || picture_.size() != size() * devicePixelRatioF())) render();
     QPainter painter(this);
     if (!dragOffset_.isNull()) painter.fillRect(rect(), kDesk);
     painter.drawImage(dragOffset_, picture_);
@@ -138,6 +147,7 @@ void PageView::wheelEvent(QWheelEvent* event) {
 }
 
 void PageView::mousePressEvent(QMouseEvent* event) {
+    if (held_) return;
     if (event->button() != Qt::LeftButton && event->button() != Qt::MiddleButton) return;
     dragging_ = true;
     dragFrom_ = event->pos();
@@ -162,7 +172,7 @@ void PageView::mouseReleaseEvent(QMouseEvent* event) {
 }
 
 void PageView::mouseDoubleClickEvent(QMouseEvent*) {
-    fit();
+    if (!held_) fit();
 }
 
 }  // namespace zvdesk

@@ -38,6 +38,10 @@ public:
     void pan(const QPointF& pixels);
     // Drops the picture: the drawing changed.
     void refresh();
+    // While held (a command runs and changes the drawing) the last picture stays and the
+    // view does not move; the drawing is read again when let go.
+    void hold(bool held);
+    bool held() const { return held_; }
     // How many entities the page has.
     std::size_t entityCount() const { return entities_.size(); }
 
@@ -61,6 +65,7 @@ private:
     QRectF window_;
     QImage picture_;
     bool dirty_ = true;
+    bool held_ = false;
     bool dragging_ = false;
     QPoint dragFrom_;
     QPoint dragOffset_;

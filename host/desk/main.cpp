@@ -136,6 +136,11 @@ int main(int argc, char** argv) {
     zvdesk::MainWindow window(host, desk);
     window.setLoadFiles(options.loads);
     commandLine.setListener([&window](const QString& text) { window.print(text); });
+    // What the module says while it unloads comes after the window has gone.
+    struct Unlisten {
+        zvdesk::CommandLineDevice& device;
+        ~Unlisten() { device.setListener({}); }
+    } unlisten{commandLine};
     auto fail = [&](const QString& text) {
         if (screenshot)
             std::fprintf(stderr, "zvdesk: %s\n", qPrintable(text));

@@ -137,18 +137,28 @@ TEST_F(MainWindowTest, TheTwelveCommandsAreInTheMenuAndRunFromIt) {
     // The progress window shows while the list runs, the main window's commands are off.
     int progressSeen = 0;
     bool commandsOff = false;
+    bool viewHeld = false;
     QTimer watch;
     QObject::connect(&watch, &QTimer::timeout, [&] {
         zvdesk::ProgressWindow* progress = ui_->progressWindow();
         if (progress->isVisible() && ++progressSeen == 1) keepShot("progress", progress);
         if (window_->isBusy() && !window_->commandAction("exportacao")->isEnabled())
             commandsOff = true;
+        // The page view keeps its picture while the drawing changes under it.
+        if (window_->isBusy()) {
+            const QRectF before = window_->pageView()->window();
+            window_->pageView()->zoom(3.0);
+            if (window_->pageView()->held() && window_->pageView()->window() == before)
+                viewHeld = true;
+        }
     });
     watch.start(0);
     window_->commandAction("gerarListaBornesGrf")->trigger();
     watch.stop();
     EXPECT_GT(progressSeen, 0);
     EXPECT_TRUE(commandsOff);
+    EXPECT_TRUE(viewHeld);
+    EXPECT_FALSE(window_->pageView()->held());
     EXPECT_FALSE(window_->isBusy());
     EXPECT_FALSE(ui_->progressWindow()->isVisible());
     // The list's pages are in the browser, the drawing waits to be saved.
