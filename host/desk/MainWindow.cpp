@@ -292,8 +292,12 @@ bool MainWindow::openDrawing(const QString& path, QString* error, bool quiet) {
 
 bool MainWindow::save() {
     if (!document_) return false;
-    if (document_->fileName().isEmpty()) return saveFromDialog();
-    return saveAs(document_->fileName());
+    // Drawings are written as DXF: a drawing read from another format is not written over
+    // its own file but saved under a name the user gives.
+    const QString file = document_->fileName();
+    if (file.isEmpty() || QFileInfo(file).suffix().toLower() != QLatin1String("dxf"))
+        return saveFromDialog();
+    return saveAs(file);
 }
 
 bool MainWindow::saveAs(const QString& path) {
@@ -311,7 +315,12 @@ bool MainWindow::saveAs(const QString& path) {
 
 bool MainWindow::saveFromDialog() {
     if (!document_) return false;
-    QString path = ui_.fileDialog("drawing", false, words(Text::Drawings), document_->fileName(),
+    QString start = document_->fileName();
+    if (!start.isEmpty()) {
+        const QFileInfo info(start);
+        start = info.absolutePath() + "/" + info.completeBaseName() + ".dxf";
+    }
+    QString path = ui_.fileDialog("drawing", false, words(Text::Drawings), start,
                                   plain(Text::SaveAs).remove("..."));
     if (path.isEmpty()) return false;
     if (QFileInfo(path).suffix().isEmpty()) path += ".dxf";

@@ -12,6 +12,7 @@
 #include <QAction>
 #include <QCloseEvent>
 #include <QDialog>
+#include <QFileDialog>
 #include <QMessageBox>
 #include <QPushButton>
 #include <QTest>
@@ -152,6 +153,36 @@ TEST_F(BadInputTest, SavingWhereNothingCanBeWrittenKeepsTheDrawingOpenAndUnsaved
     EXPECT_TRUE(window_->save());
     EXPECT_FALSE(window_->isModified());
     EXPECT_TRUE(contentOf(project_).contains("LISTAS$0001$A"));
+}
+
+TEST_F(BadInputTest, ADrawingFromAnotherFormatIsNeverWrittenOverItsOwnFile) {
+    // A drawing read from a file that is not a .dxf (here a DXF named .dwg, as an importer
+    // would leave it): Save asks where, proposing the same name as .dxf.
+    const QString imported = path("imported.dwg");
+    QFile::remove(imported);
+    QFile::remove(path("imported.dxf"));
+    ASSERT_TRUE(QFile::copy(product_->project(), imported));
+    const QByteArray original = contentOf(imported);
+    ASSERT_TRUE(window_->openDrawing(imported));
+    ASSERT_TRUE(window_->runCommand("gerarListaBornesGrf"));
+    QString proposed;
+    ModalAnswer answer([&](QWidget* modal) {
+        auto* dialog = qobject_cast<QFileDialog*>(modal);
+        ASSERT_NE(dialog, nullptr);
+        EXPECT_EQ(dialog->objectName(), "drawing");
+        EXPECT_EQ(dialog->acceptMode(), QFileDialog::AcceptSave);
+        proposed = dialog->selectedFiles().value(0);
+        dialog->selectFile(path("imported.dxf"));
+        static_cast<QDialog*>(dialog)->accept();
+    });
+    EXPECT_TRUE(window_->save());
+    EXPECT_EQ(QFileInfo(proposed).fileName(), "imported.dxf");
+    EXPECT_EQ(contentOf(imported), original);
+    EXPECT_TRUE(contentOf(path("imported.dxf")).contains("LISTAS$0001$A"));
+    EXPECT_EQ(window_->document()->fileName(), QFileInfo(path("imported.dxf")).absoluteFilePath());
+    EXPECT_FALSE(window_->isModified());
+    // From now on Save writes the .dxf without asking.
+    EXPECT_TRUE(window_->save());
 }
 
 TEST_F(BadInputTest, AReadOnlyFolderRefusesTheSaveWithAMessage) {
