@@ -50,4 +50,12 @@ for job in "PDF demo.pdf" "PNG comando-0001.png COMANDO\$0001\$A"; do
         --answer "export:option:PDF_PAPER_SIZE_PZ=A3 (420 x 297 mm)" \
         --answer "export:file=$OUT/exports/$file" "$OUT/terminal-list.dxf" exportacao
 done
+if [ -x "$BIN/zvdesk" ]; then
+    "$BIN/zvdesk" --load "$PRODUCT/config/zvconfig.lsp" --screenshot "$OUT/zvdesk.png" \
+        "$OUT/terminal-list.dxf"
+fi
 echo "== results in $OUT"
+DEMO="$(cd "$OUT" && pwd)"
+echo "== the desktop program on the demo project (a window: needs a display, or xvfb-run):"
+echo "   ZV_DATA_DIR=$DEMO/data ZV_PRODUCT_DIR=$DEMO/produto/ \\"
+echo "       $(cd "$BIN" && pwd)/zvdesk --load $DEMO/produto/config/zvconfig.lsp $DEMO/demo.dxf"

@@ -6,6 +6,7 @@
 #include "DocumentLisp.h"
 #include "HostCli.h"
 #include "HostDocument.h"
+#include "LispListener.h"
 #include "lisp/Printer.h"
 
 #include <QFileInfo>
@@ -27,29 +28,11 @@ void onInterrupt(int) {
 
 // Evaluates what was typed; false when the text needs more lines to be complete (at the
 // end of the input, `last`, it is reported as it is).
-bool evaluateTyped(zvlisp::Interpreter& lisp, const QString& text, QTextStream& out,
-                   bool last = false) {
-    zvlisp::Value forms;
-    try {
-        forms = lisp.readAll(text);
-    } catch (zvlisp::LispError& error) {
-        if (error.incompleteInput && !last) return false;
-        lisp.report(error);
-        return true;
-    }
-    for (const zvlisp::Value* cell = &forms; cell->isCons(); cell = &cell->asCons()->cdr) {
-        zvlisp::Value result;
-        if (!lisp.evaluateForms(zvlisp::Value::cons(cell->asCons()->car, zvlisp::Value()), &result))
-            continue;
-        if (result.isSymbol() && result.asSymbol()->name.isEmpty()) continue;  // (princ)
-        try {
-            out << zvlisp::Printer::prin1(result) << "\n";
-        } catch (zvlisp::LispError& error) {  // nested too deep to print
-            lisp.report(error);
-        }
-    }
+bool echo(zvlisp::Interpreter& lisp, const QString& text, QTextStream& out, bool last = false) {
+    const bool complete = zvhost::evaluateTyped(
+        lisp, text, [&out](const QString& line) { out << line; }, last);
     out.flush();
-    return true;
+    return complete;
 }
 
 int repl(zvlisp::Interpreter& lisp, CliContext& context) {
@@ -65,9 +48,9 @@ int repl(zvlisp::Interpreter& lisp, CliContext& context) {
         const QString line = context.in.readLine();
         if (line.isNull()) break;
         pending += line + "\n";
-        if (evaluateTyped(lisp, pending, context.out)) pending.clear();
+        if (echo(lisp, pending, context.out)) pending.clear();
     }
-    if (!pending.trimmed().isEmpty()) evaluateTyped(lisp, pending, context.out, true);
+    if (!pending.trimmed().isEmpty()) echo(lisp, pending, context.out, true);
     std::signal(SIGINT, previous);
     interrupted = nullptr;
     return kExitOk;
