@@ -375,8 +375,9 @@ void ProductDataWriter::writeViews() {
                 if (terminal) {
                     file.model().addCircle({width / 2, height - 4}, 1.5);
                     file.model().addCircle({width / 2, 4}, 1.5);
-                    file.model().addAttributeDefinition("NUMERO", "Number", "", {1, height / 2},
-                                                        1.5);
+                    // The English library's terminals say NUMBER, as its symbols do.
+                    const char* number = std::string_view(standard) == "2" ? "NUMBER" : "NUMERO";
+                    file.model().addAttributeDefinition(number, "Number", "", {1, height / 2}, 1.5);
                 } else {
                     file.box(2, height - 10, width - 2, height - 3);
                     file.box(4, 4, width - 4, height - 14);

@@ -34,7 +34,7 @@ struct Insercao {
     QString handle, nome, layer;
     double x = 0, y = 0;
     QJsonObject atributos;
-    QStringList rep, esq;
+    QStringList rep;
 };
 
 class DiagramaTopograficoTest : public ::testing::Test {
@@ -129,7 +129,7 @@ protected:
         QFile f(modelo());
         ASSERT_TRUE(f.open(QIODevice::WriteOnly));
         for (const auto& [nome, valor] : simbolos)
-            if (!valor.isEmpty()) f.write(("(setq " + nome + " " + valor + ")\n").toUtf8());
+            f.write(("(setq " + nome + " " + (valor.isEmpty() ? "nil" : valor) + ")\n").toUtf8());
     }
 
     zvdb::BlockRecord& Bloco(const std::string& nome) {
@@ -201,6 +201,11 @@ protected:
         const int estado = zvtest::PythonChecker::run("topografico_dxf.py", {arquivo}, &saida);
         EXPECT_EQ(estado, 0) << saida.toStdString();
         const QJsonObject raiz = QJsonDocument::fromJson(saida.toUtf8()).object();
+        esq_.clear();
+        const QJsonObject cadeias = raiz["esq"].toObject();
+        for (auto it = cadeias.begin(); it != cadeias.end(); ++it)
+            for (const QJsonValue& e : it.value().toArray())
+                esq_[it.key()] << e.toString();
         for (const QJsonValue& v : raiz["inserts"].toArray()) {
             const QJsonObject o = v.toObject();
             Insercao i{o["handle"].toString(),
@@ -209,12 +214,9 @@ protected:
                        o["x"].toDouble(),
                        o["y"].toDouble(),
                        o["attribs"].toObject(),
-                       {},
                        {}};
             for (const QJsonValue& r : o["rep"].toArray())
                 i.rep << r.toString();
-            for (const QJsonValue& r : o["esq"].toArray())
-                i.esq << r.toString();
             insercoes.push_back(i);
         }
         return insercoes;
@@ -223,7 +225,7 @@ protected:
     static std::map<QString, Insercao> PorSimbolo(const std::vector<Insercao>& todas) {
         std::map<QString, Insercao> blocos;
         for (const Insercao& i : todas)
-            if (i.rep.size() == 2) {
+            if (i.rep.size() == 2 && i.rep[0] == "1") {
                 EXPECT_EQ(blocos.count(i.rep[1]), 0u)
                     << "two blocks for " << i.rep[1].toStdString();
                 blocos[i.rep[1]] = i;
@@ -233,12 +235,6 @@ protected:
     static QString H(const zvdb::DbObject* objeto) {
         return QString::fromStdString(zvsample::handleText(objeto->handle()));
     }
-    static const Insercao* Achar(const std::vector<Insercao>& todas, const QString& handle) {
-        for (const Insercao& i : todas)
-            if (i.handle == handle) return &i;
-        return nullptr;
-    }
-
     static QTemporaryDir* pasta_;
     QTemporaryDir trabalho_;
     QString saida_, erros_;
@@ -250,6 +246,7 @@ protected:
     zvdb::BlockReference *k1_ = nullptr, *k2_ = nullptr, *x11_ = nullptr, *x12_ = nullptr,
                          *x21_ = nullptr;
     std::uint64_t g1_ = 0;
+    std::map<QString, QStringList> esq_;  // the representation chains by handle
 };
 
 QTemporaryDir* DiagramaTopograficoTest::pasta_ = nullptr;
@@ -317,16 +314,13 @@ TEST_F(DiagramaTopograficoTest, AttributesTakeTheSymbolsFieldsAndBothEndsKnowEac
     const Insercao& x12 = blocos.at(H(x12_));
     EXPECT_EQ(x12.atributos["NUMERO"].toString(), "2");
     EXPECT_EQ(x12.atributos["PASSO"].toString(), "6");
-    // The symbols name their blocks.
-    const Insercao* simbolo = Achar(todas, H(k1_));
-    ASSERT_NE(simbolo, nullptr);
-    EXPECT_EQ(simbolo->esq, QStringList({"1", k1.handle}));
-    simbolo = Achar(todas, H(k2_));
-    ASSERT_NE(simbolo, nullptr);
-    EXPECT_EQ(simbolo->esq, QStringList({"7", H(x11_), "1", blocos.at(H(k2_)).handle}));
-    simbolo = Achar(todas, H(x21_));
-    ASSERT_NE(simbolo, nullptr);
-    EXPECT_EQ(simbolo->esq, QStringList({"1", blocos.at(H(x21_)).handle}));
+    // The symbols name their blocks, the virtual one too.
+    EXPECT_EQ(esq_[H(k1_)], QStringList({"1", k1.handle}));
+    EXPECT_EQ(esq_[H(k2_)], QStringList({"7", H(x11_), "1", blocos.at(H(k2_)).handle}));
+    EXPECT_EQ(esq_[H(x21_)], QStringList({"1", blocos.at(H(x21_)).handle}));
+    const QString g1 = QString::fromStdString(zvsample::handleText(g1_));
+    EXPECT_EQ(esq_[g1], QStringList({"1", blocos.at(g1).handle}));
+    EXPECT_EQ(esq_.size(), 6u);
 }
 
 TEST_F(DiagramaTopograficoTest, ARunOnItsOwnOutputAddsOnlyWhatIsNew) {
@@ -369,9 +363,7 @@ TEST_F(DiagramaTopograficoTest, DeletingTheGroupDrawsEverythingAgainAndAnErasedB
     const auto ultima = PorSimbolo(todas);
     EXPECT_EQ(ultima.size(), antes.size());
     ASSERT_EQ(ultima.count(H(k2_)), 1u);
-    const Insercao* k2 = Achar(todas, H(k2_));
-    ASSERT_NE(k2, nullptr);
-    EXPECT_EQ(k2->esq, QStringList({"1", ultima.at(H(k2_)).handle}));
+    EXPECT_EQ(esq_[H(k2_)], QStringList({"1", ultima.at(H(k2_)).handle}));
 }
 
 TEST_F(DiagramaTopograficoTest, WithoutTerminalStripsTerminalsAreOrdinaryBlocks) {
@@ -383,8 +375,14 @@ TEST_F(DiagramaTopograficoTest, WithoutTerminalStripsTerminalsAreOrdinaryBlocks)
     for (const auto& [simbolo, bloco] : blocos)
         paginas.insert(bloco.layer);
     EXPECT_EQ(paginas.size(), 1);
-    // One justified row: the terminals sort first (by strip), starting at the left side.
-    EXPECT_EQ(blocos.at(H(x11_)).x, 0.0);
+    // One row justified over the width of 1000: widths 30, 20, 20, 6, 6 and 8 leave 910 in
+    // five gaps of 182; the terminals, with a strip, sort after the blocks without one.
+    const QString g1 = QString::fromStdString(zvsample::handleText(g1_));
+    EXPECT_EQ(blocos.at(g1).x, 0.0);
+    EXPECT_EQ(blocos.at(H(k1_)).x, 212.0);
+    EXPECT_EQ(blocos.at(H(x11_)).x, 616.0);
+    EXPECT_EQ(blocos.at(H(x21_)).x + 8.0, 1000.0);
+    EXPECT_EQ(blocos.at(H(x21_)).y, 100.0 - 50.0 + 2.5);
 }
 
 TEST_F(DiagramaTopograficoTest, BadParametersEndTheRunWithAMessageAndDrawNothing) {
