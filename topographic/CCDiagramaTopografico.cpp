@@ -353,7 +353,7 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     std::vector<QString> comuns, bornes;
     for (const auto& [chave, candidato] : candidatos_) {
         if (p.borne) {
-            if (CICad::IdDoHandle(HandleDoSimbolo(chave)).isNull()) continue;
+            if (candidato.simbolo.isNull()) continue;
             (Catalogo().TipoComp(candidato.chave).trimmed() == kTipoBorne ? bornes : comuns)
                 .push_back(chave);
         } else {
@@ -428,14 +428,13 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
 
 void CCDiagramaTopografico::ColetaCandidatos(Candidatos& candidatos) {
     zvdb::Database* db = CICad::GetDatabase();
-    const OdDbObjectId modelSpace = CICad::GetModelSpace(db);
+    // Symbols carry the key application: one walk of model space finds them all.
     std::vector<OdDbObjectId> ids;
-    const auto referencias = CICad::GetReferenciasPorBloco(db);
-    for (auto it = referencias.constBegin(); it != referencias.constEnd(); ++it) {
+    for (const OdDbObjectId& id : CICad::GetEntidadesComXData(kAppSimbolo, db)) {
+        if (!CICad::EhReferencia(id)) continue;
         // Anonymous blocks and connector pins are never drawn.
-        if (it.key().startsWith('*') || it.key().startsWith("PIN-")) continue;
-        for (const OdDbObjectId& ref : it.value())
-            if (CICad::GetDono(ref) == modelSpace) ids.push_back(ref);
+        const QString bloco = CICad::GetNomeBloco(id).toUpper();
+        if (!bloco.startsWith('*') && !bloco.startsWith("PIN-")) ids.push_back(id);
     }
     for (const auto& [nome, id] : CICad::GetEntradasDicionario({"ESQ_VIRTUAL_ZV"}, db))
         if (CICad::TipoEntidade(id) == "XRECORD") ids.push_back(id);
@@ -443,10 +442,8 @@ void CCDiagramaTopografico::ColetaCandidatos(Candidatos& candidatos) {
         const CEListaXData dados = CICad::GetXData(id, kAppSimbolo);
         if (dados.empty() || dados.front().codigo != 1000) continue;
         const QStringList partes = dados.front().texto.split(CCDataReader::kSeparador);
-        Candidato candidato;
-        candidato.chave = partes.value(0);
-        candidato.norma = partes.value(1);
-        candidatos.emplace(ZVString::DeHandle(id.handle()), std::move(candidato));
+        candidatos.emplace(ZVString::DeHandle(id.handle()),
+                           Candidato{partes.value(0), partes.value(1), QString(), id});
     }
 }
 
@@ -458,15 +455,16 @@ void CCDiagramaTopografico::AdicionaAcessorios(Candidatos& candidatos) {
             const QString acessorio = acessorios[i].section('#', 0, 0);
             if (!acessorio.isEmpty())
                 novos.push_back({"*" + QString::number(i) + "_" + chave,
-                                 {acessorio, simbolo.norma, QString()}});
+                                 {acessorio, simbolo.norma, QString(), simbolo.simbolo}});
         }
-        const CEListaXData aditivos = CICad::GetXData(CICad::IdDoHandle(chave), "ZV_VINC_ADITIVO");
+        const CEListaXData aditivos = CICad::GetXData(simbolo.simbolo, "ZV_VINC_ADITIVO");
         int indice = 0;
         for (size_t i = 0; i + 1 < aditivos.size(); i += 2) {
             const int quantidade = ZVString(aditivos[i].texto).ParaInteiro();
             for (int n = 0; n < quantidade && n < 1000; ++n)
-                novos.push_back({"#" + QString::number(indice++) + "_" + chave,
-                                 {aditivos[i + 1].texto, simbolo.norma, QString()}});
+                novos.push_back(
+                    {"#" + QString::number(indice++) + "_" + chave,
+                     {aditivos[i + 1].texto, simbolo.norma, QString(), simbolo.simbolo}});
         }
     }
     for (auto& [chave, candidato] : novos)
@@ -486,11 +484,6 @@ QString CCDiagramaTopografico::Arquivo(const Candidato& candidato) const {
 
 QString CCDiagramaTopografico::NomeBloco(const Candidato& candidato) {
     return candidato.bloco + "_" + candidato.norma;
-}
-
-QString CCDiagramaTopografico::HandleDoSimbolo(const QString& chave) {
-    const int corte = chave.lastIndexOf('_');
-    return corte < 0 ? chave : chave.mid(corte + 1);
 }
 
 void CCDiagramaTopografico::MantemComArquivo(Candidatos& candidatos) {
@@ -513,28 +506,34 @@ void CCDiagramaTopografico::MantemComArquivo(Candidatos& candidatos) {
 }
 
 void CCDiagramaTopografico::RenovaBlocos(Candidatos& candidatos) {
-    // A redefinition also refreshes the blocks already on earlier pages. A file the facade
-    // refuses, and whose block the drawing lacks, can't be inserted: its candidates go.
-    QHash<QString, bool> prontos;
-    for (auto it = candidatos.begin(); it != candidatos.end();) {
-        const QString nome = NomeBloco(it->second);
-        auto achado = prontos.constFind(nome);
-        if (achado == prontos.constEnd()) {
-            OdDbObjectId id;
-            const bool pronto =
-                CICad::RecarregaBloco(Arquivo(it->second), nome) || CICad::GetBlocoId(nome, id);
-            achado = prontos.insert(nome, pronto);
-        }
-        it = achado.value() ? std::next(it) : candidatos.erase(it);
+    // Each distinct block once, in candidate order; a redefinition also refreshes the blocks
+    // already on earlier pages. A file the facade refuses, and whose block the drawing lacks,
+    // can't be inserted: its candidates go.
+    std::vector<std::pair<QString, QString>> blocos;
+    QHash<QString, int> indices;
+    for (const auto& [chave, candidato] : candidatos) {
+        const QString nome = NomeBloco(candidato);
+        if (indices.contains(nome)) continue;
+        indices.insert(nome, int(blocos.size()));
+        blocos.emplace_back(Arquivo(candidato), nome);
     }
+    const std::vector<bool> recarregados = CICad::RecarregaBlocos(blocos);
+    QSet<QString> prontos;
+    for (size_t i = 0; i < blocos.size(); ++i) {
+        OdDbObjectId id;
+        if (recarregados[i] || CICad::GetBlocoId(blocos[i].second, id))
+            prontos.insert(blocos[i].second);
+    }
+    for (auto it = candidatos.begin(); it != candidatos.end();)
+        it = prontos.contains(NomeBloco(it->second)) ? std::next(it) : candidatos.erase(it);
 }
 
 void CCDiagramaTopografico::DescartaDesenhados(Candidatos& candidatos) {
     const QString& representacao = parametros_.representacao;
     for (auto it = candidatos.begin(); it != candidatos.end();) {
-        const OdDbObjectId simbolo = CICad::IdDoHandle(HandleDoSimbolo(it->first));
         bool desenhado = false;
-        for (const auto& [rep, handle] : Pares(CICad::GetXData(simbolo, kAppRepresentacaoEsq)))
+        for (const auto& [rep, handle] :
+             Pares(CICad::GetXData(it->second.simbolo, kAppRepresentacaoEsq)))
             if (rep == representacao && !CICad::IdDoHandle(handle).isNull()) desenhado = true;
         it = desenhado ? candidatos.erase(it) : std::next(it);
     }
@@ -545,12 +544,11 @@ VetorItens CCDiagramaTopografico::LeItens(const std::vector<QString>& chaves, CE
     for (const QString& chave : chaves) {
         // An accessory's key is no handle: it has no entity to read an item from.
         if (chave.contains('_')) continue;
-        const OdDbObjectId id = CICad::IdDoHandle(chave);
+        const OdDbObjectId id = candidatos_.at(chave).simbolo;
         if (id.isNull()) continue;
         std::unique_ptr<CEItemLista> item(CriaItemEntidade(id, modelo));
         if (!item || item->valorCampo("ZV_LISTA") != "S") continue;
         item->definirCampo("HANDLE", chave);
-        PartilhaNomes(*item);
         itensPorHandle_.insert(chave, item.get());
         itens.push_back(item.release());
     }
@@ -635,12 +633,10 @@ void CCDiagramaTopografico::Insere(const QString& chave, const QString& layer,
     ++inseridos_;
     std::unique_ptr<zv::CEListaAtributos> atributos;
     CICad::GetAtributos(ref, atributos, false, false);
-    if (atributos && atributos->Quantidade() > 0) {
-        for (int i = 0; i < atributos->Quantidade(); ++i) {
-            zv::CEAtributo& atributo = (*atributos)[i];
-            atributo.SetValor(item->valorCampo(atributo.GetTag()));
-        }
-        CICad::SetAtributosLista(ref, *atributos);
+    for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
+        const zv::CEAtributo& atributo = (*atributos)[i];
+        const QString* valor = item->campo(atributo.GetTag());
+        CICad::SetValorAtributo(atributo.GetId(), valor ? *valor : QString());
     }
     // The block names its symbol; an accessory's block also its place and catalogue key.
     QString handle = item->valorCampo("HANDLE");
@@ -655,12 +651,11 @@ void CCDiagramaTopografico::Insere(const QString& chave, const QString& layer,
         link.push_back(Texto(candidato->second.chave));
     }
     CICad::SetXData(ref, acessorio ? kAppRepresentacaoAce : kAppRepresentacao, link);
-    LigaSimbolo(handle, acessorio, ZVString::DeHandle(ref.handle()));
+    LigaSimbolo(candidato->second.simbolo, acessorio, ZVString::DeHandle(ref.handle()));
 }
 
-void CCDiagramaTopografico::LigaSimbolo(const QString& handle, bool acessorio,
+void CCDiagramaTopografico::LigaSimbolo(const OdDbObjectId& simbolo, bool acessorio,
                                         const QString& bloco) {
-    const OdDbObjectId simbolo = CICad::IdDoHandle(handle);
     if (simbolo.isNull()) return;  // the block stays unlinked; the next run adds it again
     const QString aplicacao = acessorio ? kAppRepresentacaoAceEsq : kAppRepresentacaoEsq;
     // At most one block per representation: a stale pair or this key's old pair goes.

@@ -92,6 +92,7 @@ public:
 private:
     struct Candidato {
         QString chave, norma, bloco;
+        OdDbObjectId simbolo;  // the symbol itself, or the one whose accessory it is
     };
     // Candidates by key, in key order.
     using Candidatos = std::map<QString, Candidato>;
@@ -109,11 +110,10 @@ private:
     // Makes the pages of one pass and inserts its blocks.
     void Desenha(const std::vector<Pagina>& paginas, const QHash<QString, CEPonto>& posicoes);
     void Insere(const QString& chave, const QString& layer, const CEPonto& ponto);
-    void LigaSimbolo(const QString& handle, bool acessorio, const QString& bloco);
+    void LigaSimbolo(const OdDbObjectId& simbolo, bool acessorio, const QString& bloco);
 
     QString Arquivo(const Candidato& candidato) const;
     static QString NomeBloco(const Candidato& candidato);
-    static QString HandleDoSimbolo(const QString& chave);
 
     Parametros parametros_;
     QString diretorio_;

@@ -388,15 +388,13 @@ void ProductDataWriter::writeViews() {
                 file.model().addLine({0, 0}, {width, height});
                 file.model().addAttributeDefinition("VARIAVEL_RELACAO", "Tag", "RELACAO",
                                                     {1, height + 1}, 2.0);
+                file.model().addAttributeDefinition("CPOINT1", "Connection", "1",
+                                                    {width / 2, height}, 1.0);
+                file.model().addAttributeDefinition("CPOINT2", "Connection", "2", {width / 2, 0},
+                                                    1.0);
             }
-            // In a front view connection points and the step are data, not text to show.
-            file.model()
-                .addAttributeDefinition("CPOINT1", "Connection", "1", {width / 2, height}, 1.0)
-                ->setInvisible(front);
-            file.model()
-                .addAttributeDefinition("CPOINT2", "Connection", "2", {width / 2, 0}, 1.0)
-                ->setInvisible(front);
-            // The step of a terminal in the topographic diagram's strips.
+            // The step of a terminal in the topographic diagram's strips; hidden in a front
+            // view, which shows only what the diagram fills from the symbol's fields.
             if (terminal)
                 file.model()
                     .addAttributeDefinition("PASSO", "Step", realText(width), {0, -2}, 1.0)
