@@ -385,7 +385,7 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     LePassos(itensBornes);
     itensComuns.ordenar(p.ordenacao);
     itensBornes.ordenar(p.ordenacao);
-    LeExtensoes(candidatos_);
+    LeExtensoes();
     progresso.Definir(50);
 
     CICad::RegistraApp(kAppRepresentacao);
@@ -579,10 +579,12 @@ void CCDiagramaTopografico::LePassos(const VetorItens& bornes) {
     }
 }
 
-void CCDiagramaTopografico::LeExtensoes(const Candidatos& candidatos) {
+void CCDiagramaTopografico::LeExtensoes() {
+    // Once per block, for the candidates that have an item: only those are laid out.
     QHash<QString, Extensao> porBloco;
-    for (const auto& [chave, candidato] : candidatos) {
-        const QString nome = NomeBloco(candidato);
+    for (auto it = itensPorHandle_.constBegin(); it != itensPorHandle_.constEnd(); ++it) {
+        const QString& chave = it.key();
+        const QString nome = NomeBloco(candidatos_.at(chave));
         auto achado = porBloco.constFind(nome);
         if (achado == porBloco.constEnd()) {
             Extensao extensao;

@@ -106,7 +106,7 @@ private:
     // The items of the keys, in key order; those that give none or are not listed fall out.
     VetorItens LeItens(const std::vector<QString>& chaves, CETemplate& modelo);
     void LePassos(const VetorItens& bornes);
-    void LeExtensoes(const Candidatos& candidatos);
+    void LeExtensoes();
     // Makes the pages of one pass and inserts its blocks.
     void Desenha(const std::vector<Pagina>& paginas, const QHash<QString, CEPonto>& posicoes);
     void Insere(const QString& chave, const QString& layer, const CEPonto& ponto);
