@@ -327,6 +327,14 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
 
     CIProgress progresso;
     progresso_ = &progresso;
+    // Nothing of the run outlives it: the window, and the items by key.
+    struct Fim {
+        CCDiagramaTopografico& d;
+        ~Fim() {
+            d.progresso_ = nullptr;
+            d.itensPorHandle_.clear();
+        }
+    } fim{*this};
     progresso.Mostrar();
     progresso.Definir(0);
 
@@ -418,8 +426,6 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     CICad::zvInvokeVoid("atualizaTopografico");
     progresso.Definir(100);
     progresso.Fechar();
-    progresso_ = nullptr;
-    itensPorHandle_.clear();
     ImprimeCom(kMsgDesenhado,
                QString::number(inseridos_) + " / " + QString::number(paginasCriadas_));
 }

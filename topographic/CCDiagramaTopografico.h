@@ -85,10 +85,6 @@ public:
     // The symbols' parameters, as the template left them.
     static Parametros LeParametros();
 
-    // What the last run did, for its callers and tests.
-    int Inseridos() const { return inseridos_; }
-    int PaginasCriadas() const { return paginasCriadas_; }
-
 private:
     struct Candidato {
         QString chave, norma, bloco;
