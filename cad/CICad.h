@@ -113,6 +113,10 @@ public:
     static QString GetNomeBloco(const OdDbObjectId& referencia);
     static OdDbObjectId CarregaBloco(const QString& nome, const QString& arquivo);
     static bool RecarregaBloco(const QString& arquivo, const QString& nome);
+    // RecarregaBloco for each (file, block name) pair in order, the references of all the
+    // redefined blocks refreshed in one walk of the drawing; one result per pair.
+    static std::vector<bool> RecarregaBlocos(
+        const std::vector<std::pair<QString, QString>>& blocos);
     static OdDbObjectId InsereBloco(const QString& arquivo, const QString& nome,
                                     const QString& layer, double x, double y, double z,
                                     double rotacao);

@@ -16,6 +16,8 @@
 
 #include <cmath>
 #include <exception>
+#include <string>
+#include <unordered_map>
 
 using namespace cicad;
 
@@ -97,40 +99,59 @@ OdDbObjectId CICad::CarregaBloco(const QString& nome, const QString& arquivo) {
 }
 
 bool CICad::RecarregaBloco(const QString& arquivo, const QString& nome) {
+    return RecarregaBlocos({{arquivo, nome}}).front();
+}
+
+std::vector<bool> CICad::RecarregaBlocos(const std::vector<std::pair<QString, QString>>& blocos) {
+    std::vector<bool> resultados(blocos.size(), false);
     zvdb::Database* db = GetDatabase();
-    if (!db) return false;
-    std::unique_ptr<zvdb::Database> lado = ExisteArquivo(arquivo) ? LeDesenho(arquivo) : nullptr;
-    if (!lado || !ConfereBloco(*lado, nome, arquivo)) return false;
-    zvdb::BlockRecord* existente = db->block(U8(nome));
-    if (!existente) return InsereComoBloco(*db, *lado, nome) != nullptr;
-    QString temporario;
-    do {
-        temporario = "ZV_TMP_" + QString::number(QRandomGenerator::global()->bounded(1 << 30));
-    } while (db->block(U8(temporario)));
-    zvdb::BlockRecord* novo = InsereComoBloco(*db, *lado, temporario);
-    if (!novo) return false;
-    existente->setBasePoint({});
-    for (zvdb::Entity* entidade : existente->entities())
-        entidade->erase();
-    const std::vector<zvdb::Entity*> fontes = novo->entities();
-    zvdb::DeepCloner(*db, *db).cloneEntities(fontes, *existente);
-    novo->erase();
-    const OdDbObjectId definicao = Id(existente);
-    // Every reference: those of model and paper space and those nested in other blocks.
+    if (!db) return resultados;
+    // The blocks redefined here, by name: their references take the new attributes after.
+    std::unordered_map<std::string, OdDbObjectId> redefinidos;
+    for (size_t i = 0; i < blocos.size(); ++i) {
+        const auto& [arquivo, nome] = blocos[i];
+        std::unique_ptr<zvdb::Database> lado =
+            ExisteArquivo(arquivo) ? LeDesenho(arquivo) : nullptr;
+        if (!lado || !ConfereBloco(*lado, nome, arquivo)) continue;
+        zvdb::BlockRecord* existente = db->block(U8(nome));
+        if (!existente) {
+            resultados[i] = InsereComoBloco(*db, *lado, nome) != nullptr;
+            continue;
+        }
+        QString temporario;
+        do {
+            temporario = "ZV_TMP_" + QString::number(QRandomGenerator::global()->bounded(1 << 30));
+        } while (db->block(U8(temporario)));
+        zvdb::BlockRecord* novo = InsereComoBloco(*db, *lado, temporario);
+        if (!novo) continue;
+        existente->setBasePoint({});
+        for (zvdb::Entity* entidade : existente->entities())
+            entidade->erase();
+        const std::vector<zvdb::Entity*> fontes = novo->entities();
+        zvdb::DeepCloner(*db, *db).cloneEntities(fontes, *existente);
+        novo->erase();
+        redefinidos[std::string(existente->name())] = Id(existente);
+        resultados[i] = true;
+    }
+    if (redefinidos.empty()) return resultados;
+    // Every reference: those of model and paper space and those nested in other blocks,
+    // found in one walk however many blocks were redefined.
     for (zvdb::BlockRecord* dono : db->blocks()) {
         if (dono->isErased()) continue;
         for (zvdb::Entity* entidade : dono->entities()) {
             auto* ref = dynamic_cast<zvdb::BlockReference*>(entidade);
-            if (!ref || ref->blockName() != existente->name()) continue;
+            if (!ref) continue;
+            const auto definicao = redefinidos.find(std::string(ref->blockName()));
+            if (definicao == redefinidos.end()) continue;
             std::unique_ptr<zv::CEListaAtributos> valores;
             GetAtributos(Id(ref), valores, true, false);
             for (zvdb::Attribute* atributo : ref->attributes())
                 atributo->erase();
-            CriarAtributos(definicao, Id(ref));
+            CriarAtributos(definicao->second, Id(ref));
             if (valores) SetAtributosLista(Id(ref), *valores);
         }
     }
-    return true;
+    return resultados;
 }
 
 OdDbObjectId CICad::InsereBloco(const QString& arquivo, const QString& nome, const QString& layer,

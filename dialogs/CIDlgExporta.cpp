@@ -109,6 +109,9 @@ CIDlgExporta::CIDlgExporta(CEExportacao* exportacao, CEExportConfigs* configs,
     paginas_->setReadOnly(true);
     paginas_->setPlaceholderText(Mensagem(kTodasPaginas));
     arquivo_->setMinimumWidth(380);
+    // The desktop's tests and a user's accessibility tools find the file field by name.
+    arquivo_->setObjectName("export:file");
+    setObjectName("export");
     for (const auto& [rotulo, numero] : kTipos)
         tipo_->addItem(Mensagem(rotulo), numero);
     connect(tipo_, QOverload<int>::of(&QComboBox::activated), this, &CIDlgExporta::MudaTipo);

@@ -17,6 +17,7 @@
 #include "readers/SelecaoPaginas.h"
 #include "strips/CCBorneDwgDataReader.h"
 #include "strips/CCBorneDwgWriter.h"
+#include "topographic/CCDiagramaTopografico.h"
 
 namespace {
 
@@ -83,6 +84,7 @@ QString CCDriverLista::EscolherModelo(TipoLista tipo) {
 
 void CCDriverLista::Executar(TipoLista tipo) {
     if (!Disponivel(tipo)) return AvisaIndisponivel();
+    if (tipo == TipoLista::DiagramaTopografico) return ExecutarDiagrama();
     const QString caminho = EscolherModelo(tipo);
     if (caminho.isEmpty()) {
         ZVResultado::Cancelado();
@@ -131,6 +133,21 @@ void CCDriverLista::ExecutarMateriais(const QString& caminho) {
     ExecutarLista(leitor, escritor, modelo, &selecao);
 }
 
+// The diagram has no default template, and without a template folder nothing happens.
+void CCDriverLista::ExecutarDiagrama() {
+    if (CICad::GetStringLisp("*DIR_ZVCFG_TEMPL*").isEmpty()) {
+        ZVResultado::Cancelado();
+        return;
+    }
+    const QString caminho = EscolherModelo(TipoLista::DiagramaTopografico);
+    if (caminho.isEmpty()) {
+        ZVResultado::Cancelado();
+        return;
+    }
+    CCDiagramaTopografico diagrama;
+    diagrama.Executar(caminho);
+}
+
 void CCDriverLista::Exporta(const QString& tipo) {
     if (!ExportacaoDisponivel(tipo)) return AvisaIndisponivel();
     CEExportacao::Exporta(tipo, [](CEExportacao& exportacao) {
@@ -141,10 +158,11 @@ void CCDriverLista::Exporta(const QString& tipo) {
     });
 }
 
-// The readers and writers of the other lists and of the exports join the drivers as they
-// are built.
+// Every list of this edition has its reader and writer; a list that a later edition adds
+// is refused here until it is built.
 bool CCDriverLista::Disponivel(TipoLista tipo) {
-    return tipo != TipoLista::DiagramaTopografico;
+    Q_UNUSED(tipo);
+    return true;
 }
 
 // Every export command has its reader; the page formats are the run's to refuse.

@@ -21,4 +21,5 @@ public:
 
 private:
     static void ExecutarMateriais(const QString& caminho);
+    static void ExecutarDiagrama();
 };

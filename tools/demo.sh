@@ -34,6 +34,9 @@ for job in "gerarListaBornesGrf terminal-list.dxf" "gerarListaFiosGrf wire-list.
     echo "-- $command: $OUT/$file"
     run "$OUT/demo.dxf" -o "$OUT/$file" "$command"
 done
+echo "-- diagramaTopografico: $OUT/topographic.dxf"
+run --answer "template=$PRODUCT/templates/topografico.dtp" "$OUT/demo.dxf" -o "$OUT/topographic.dxf" \
+    diagramaTopografico
 echo "== zvhost: one export of each data format (configuration Completa) into $OUT/exports"
 mkdir -p "$OUT/exports"
 for job in "exportacaoBornes BORNES CSV terminals.csv" "exportacaoFios FIOS XLSX wires.xlsx" \

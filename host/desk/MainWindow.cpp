@@ -246,6 +246,8 @@ void MainWindow::setBusy(bool busy) {
 void MainWindow::setDocument(zvhost::HostDocument* document) {
     zvhost::HostDocument* old = document_;
     document_ = document;
+    // A user at the desktop can take a command back: each command is one step.
+    if (document) document->setUndoEnabled(true);
     view_->setDocument(document);
     // The old document goes only when the view no longer shows it.
     if (old) app_.closeDocument(old);

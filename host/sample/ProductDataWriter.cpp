@@ -369,15 +369,38 @@ void ProductDataWriter::writeViews() {
             const double height = terminal ? 45 : 50 + 10 * static_cast<double>(view.size() % 3);
             BlockFile file;
             file.box(0, 0, width, height);
-            file.model().addLine({0, 0}, {width, height});
-            file.model().addAttributeDefinition("VARIAVEL_RELACAO", "Tag", "RELACAO",
-                                                {1, height + 1}, 2.0);
-            file.model().addAttributeDefinition("CPOINT1", "Connection", "1", {width / 2, height},
-                                                1.0);
-            file.model().addAttributeDefinition("CPOINT2", "Connection", "2", {width / 2, 0}, 1.0);
-            // The step of a terminal in the topographic diagram's strips.
+            const bool front = view.starts_with("TOPO_");
+            if (front) {
+                // A front view as the panel shows it: a device with its marker plate, or a
+                // terminal with its two screws; the diagram fills the attributes named after
+                // the symbol's fields.
+                if (terminal) {
+                    file.model().addCircle({width / 2, height - 4}, 1.5);
+                    file.model().addCircle({width / 2, 4}, 1.5);
+                    // The English library's terminals say NUMBER, as its symbols do.
+                    const char* number = std::string_view(standard) == "2" ? "NUMBER" : "NUMERO";
+                    file.model().addAttributeDefinition(number, "Number", "", {1, height / 2}, 1.5);
+                } else {
+                    file.box(2, height - 10, width - 2, height - 3);
+                    file.box(4, 4, width - 4, height - 14);
+                    file.model().addAttributeDefinition("RELACAO", "Tag", "", {3, height - 8}, 2.5);
+                    file.model().addAttributeDefinition("ZV_KEY", "Key", "", {5, 6}, 1.8);
+                }
+            } else {
+                file.model().addLine({0, 0}, {width, height});
+                file.model().addAttributeDefinition("VARIAVEL_RELACAO", "Tag", "RELACAO",
+                                                    {1, height + 1}, 2.0);
+                file.model().addAttributeDefinition("CPOINT1", "Connection", "1",
+                                                    {width / 2, height}, 1.0);
+                file.model().addAttributeDefinition("CPOINT2", "Connection", "2", {width / 2, 0},
+                                                    1.0);
+            }
+            // The step of a terminal in the topographic diagram's strips; hidden in a front
+            // view, which shows only what the diagram fills from the symbol's fields.
             if (terminal)
-                file.model().addAttributeDefinition("PASSO", "Step", realText(width), {0, -2}, 1.0);
+                file.model()
+                    .addAttributeDefinition("PASSO", "Step", realText(width), {0, -2}, 1.0)
+                    ->setInvisible(front);
             written_.push_back(blockPath(root_, standard, view));
             file.save(written_.back());
         }

@@ -222,6 +222,36 @@ TEST_F(FacadeFixture, RedefiningABlockRefreshesReferencesNestedInOtherBlocks) {
     EXPECT_EQ(pares(dentro), QStringList({"REGUA=X9", "NOVO="}));
 }
 
+// Several blocks redefined in one call, each with its own result.
+TEST_F(FacadeFixture, RedefiningBlocksTogetherRefreshesEachBlocksReferences) {
+    const OdDbObjectId a = CICad::InsereBloco(arquivoBloco("VISTA_A1", {"RELACAO", "VELHO"}),
+                                              "VISTA_A", "0", 0, 0, 0, 0);
+    const OdDbObjectId b =
+        CICad::InsereBloco(arquivoBloco("VISTA_B1", {"NUMERO"}), "VISTA_B", "0", 10, 0, 0, 0);
+    CICad::SetAtributo(a, "RELACAO", "-K1");
+    CICad::SetAtributo(b, "NUMERO", "7");
+    const std::vector<bool> feitos =
+        CICad::RecarregaBlocos({{arquivoBloco("VISTA_A2", {"RELACAO", "NOVO"}), "VISTA_A"},
+                                {arquivo("nao-existe.dxf"), "VISTA_C"},
+                                {arquivoBloco("VISTA_B2", {"NUMERO", "PASSO"}), "VISTA_B"},
+                                {arquivoBloco("VISTA_D", {"X"}), "VISTA_D"}});
+    EXPECT_EQ(feitos, std::vector<bool>({true, false, true, true}));
+    auto pares = [](const OdDbObjectId& ref) {
+        std::unique_ptr<zv::CEListaAtributos> atributos;
+        CICad::GetAtributos(ref, atributos, false, false);
+        QStringList texto;
+        for (int i = 0; atributos && i < atributos->Quantidade(); ++i)
+            texto << (*atributos)[i].GetTag() + "=" + (*atributos)[i].GetValor();
+        return texto;
+    };
+    EXPECT_EQ(pares(a), QStringList({"RELACAO=-K1", "NOVO="}));
+    EXPECT_EQ(pares(b), QStringList({"NUMERO=7", "PASSO="}));
+    OdDbObjectId novo;
+    EXPECT_TRUE(CICad::GetBlocoId("VISTA_D", novo));
+    EXPECT_FALSE(CICad::GetBlocoId("VISTA_C", novo));
+    EXPECT_TRUE(CICad::RecarregaBlocos({}).empty());
+}
+
 TEST_F(FacadeFixture, AttributesByLanguageTriple) {
     const QString caminho = arquivoBloco("TERMINAL_EN", {"STRIP", "NUMBER"});
     const OdDbObjectId ref = CICad::InsereBloco(caminho, "TERMINAL_EN", "0", 0, 0, 0, 0);

@@ -177,12 +177,12 @@ TEST_F(MainWindowTest, TheTwelveCommandsAreInTheMenuAndRunFromIt) {
 TEST_F(MainWindowTest, UndoAndRedoFollowTheDocument) {
     ASSERT_TRUE(window_->openDrawing(copyOfProject("undo.dxf")));
     zvhost::HostDocument* document = window_->document();
-    EXPECT_EQ(window_->undoAction()->isEnabled(), document->canUndo());
+    EXPECT_FALSE(window_->undoAction()->isEnabled());
     EXPECT_FALSE(window_->redoAction()->isEnabled());
     ASSERT_TRUE(window_->runCommand("gerarListaBornesGrf"));
-    EXPECT_EQ(window_->undoAction()->isEnabled(), document->canUndo());
-    EXPECT_EQ(window_->redoAction()->isEnabled(), document->canRedo());
-    if (!document->canUndo()) return;  // a document without an undo journal
+    ASSERT_TRUE(document->canUndo());
+    EXPECT_TRUE(window_->undoAction()->isEnabled());
+    EXPECT_FALSE(window_->redoAction()->isEnabled());
     window_->undoAction()->trigger();
     EXPECT_FALSE(window_->pageBrowser()->pages().contains("LISTAS$0001$A"));
     EXPECT_TRUE(window_->redoAction()->isEnabled());
@@ -217,22 +217,23 @@ TEST_F(MainWindowTest, TheConsoleEvaluatesLispAndShowsWhatThePrints) {
     EXPECT_TRUE(window_->console()->text().endsWith("\nmessage 326\n"));
 }
 
-TEST_F(MainWindowTest, AnExportFromTheMenuAsksForTheFileAndShowsIt) {
+TEST_F(MainWindowTest, AnExportFromTheMenuShowsTheExportDialogAndTheFile) {
     ASSERT_TRUE(window_->openDrawing(copyOfProject("export.dxf")));
     const QString target = path("exported-terminals.csv");
     QFile::remove(target);
     QString asked;
     ModalAnswer answer([&](QWidget* modal) {
-        auto* files = qobject_cast<QFileDialog*>(modal);
-        ASSERT_NE(files, nullptr) << (modal ? modal->metaObject()->className() : "no window");
-        asked = files->objectName();
-        EXPECT_EQ(files->acceptMode(), QFileDialog::AcceptSave);
-        files->selectFile(target);
-        static_cast<QDialog*>(files)->accept();
+        auto* dialog = qobject_cast<QDialog*>(modal);
+        ASSERT_NE(dialog, nullptr) << (modal ? modal->metaObject()->className() : "no window");
+        asked = dialog->objectName();
+        auto* file = dialog->findChild<QLineEdit*>("export:file");
+        ASSERT_NE(file, nullptr);
+        file->setText(target);
+        dialog->accept();
     });
     zvsdk::CommandResult result = zvsdk::CommandResult::Failed;
     window_->commandAction("exportacaoBornes")->trigger();
-    EXPECT_EQ(asked, "export:file");
+    EXPECT_EQ(asked, "export") << "the module's export dialog, not a bare file dialog";
     ASSERT_EQ(shown_, QStringList({target}));
     QFile written(target);
     ASSERT_TRUE(written.open(QIODevice::ReadOnly));

@@ -140,11 +140,13 @@ TEST_F(Reliability, AFailedCommandExitsWithThreeAndSavesNothing) {
     EXPECT_EQ(run.status, 3);
     EXPECT_FALSE(QFile::exists(out));
 
-    // A command this edition does not have says so first: no bracket, no template dialog.
-    run = zvhost({"--quiet", product_->project(), "-o", out, "diagramaTopografico"});
+    // A diagram template that names no representation: said so, and nothing saved.
+    writeText(path("norep.dtp"), "(setq PBLTOPO_GRUPO \"TOPO\")\n");
+    run = zvhost({"--quiet", "--load", product_->path("produto/config/zvconfig.lsp"), "--answer",
+                  "template=" + path("norep.dtp"), product_->project(), "-o", out,
+                  "diagramaTopografico"});
     EXPECT_EQ(run.status, 3);
-    EXPECT_TRUE(run.out.contains("not available")) << run.out.toStdString();
-    EXPECT_FALSE(run.err.contains("file dialog"));
+    EXPECT_TRUE(run.out.contains("names no representation")) << run.out.toStdString();
     EXPECT_FALSE(QFile::exists(out));
 }
 

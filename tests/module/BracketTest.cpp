@@ -84,23 +84,40 @@ TEST_F(BracketTest, AFailedBuildStopsTheListsWithMessage326AndChangesNothing) {
     EXPECT_EQ(resultado, zvsdk::CommandResult::Failed);
 }
 
-TEST_F(BracketTest, CommandsNotBuiltYetSaySoBeforeAnythingElse) {
+TEST_F(BracketTest, TheDiagramStopsOnAFailedBuildWithItsOwnMessageBeforeAnythingElse) {
     // Every flag that would run a build, open the bracket or ask for a template is set.
-    lisp("(setq PBLBLNRUNONLSTS T PBLBLNRUNONEXPORT T construiu T)");
+    lisp("(setq PBLBLNRUNONLSTS T PBLBLNRUNONEXPORT T construiu nil)");
+    lisp("(setq *DIR_ZVCFG_TEMPL* \"/modelos/\")");
     documento_->database()->setCurrentLayer("ESQ$0002$A");
     const QStringList antes = descongelados();
-    for (const char* comando : {"diagramaTopografico"}) {
-        const int inicio = saida().size();
-        zvsdk::CommandResult resultado{};
-        documento_->execute(comando, &resultado);
-        EXPECT_EQ(saida().mid(inicio),
-                  "\nThis list or export is not available in this edition yet.\n")
-            << comando;
-        EXPECT_EQ(resultado, zvsdk::CommandResult::Failed) << comando;
-    }
-    EXPECT_EQ(simbolo("chamadas"), "");
+    const int inicio = saida().size();
+    zvsdk::CommandResult resultado{};
+    documento_->execute("diagramaTopografico", &resultado);
+    EXPECT_EQ(saida().mid(inicio),
+              "\nThe project build failed. The topographic diagram was not drawn.\n");
+    EXPECT_EQ(resultado, zvsdk::CommandResult::Failed);
+    EXPECT_EQ(simbolo("chamadas"), "build");
     EXPECT_EQ(descongelados(), antes);
     EXPECT_FALSE(erros().contains("file dialog"));
+}
+
+TEST_F(BracketTest, TheDiagramWithoutATemplateFolderDoesNothingInsideTheBracket) {
+    lisp("(setq PBLBLNRUNONLSTS T construiu T)");
+    documento_->database()->setCurrentLayer("ESQ$0002$A");
+    const int layers = int(documento_->database()->layers().size());
+    zvsdk::CommandResult resultado{};
+    documento_->execute("diagramaTopografico", &resultado);
+    // Built, bracket opened and closed, and no template asked for.
+    EXPECT_EQ(simbolo("chamadas"), "descongela ESQ$0002$A|atualizar|build");
+    EXPECT_FALSE(erros().contains("file dialog"));
+    EXPECT_EQ(int(documento_->database()->layers().size()), layers);
+    EXPECT_EQ(resultado, zvsdk::CommandResult::Cancelled);
+    // With a folder, the template is asked for, and nobody answers.
+    lisp("(setq chamadas nil *DIR_ZVCFG_TEMPL* \"/modelos/\")");
+    documento_->execute("diagramaTopografico", &resultado);
+    EXPECT_TRUE(erros().contains("file dialog 'template'"));
+    EXPECT_EQ(simbolo("chamadas"), "descongela ESQ$0002$A|atualizar|build");
+    EXPECT_EQ(resultado, zvsdk::CommandResult::Cancelled);
 }
 
 TEST_F(BracketTest, APassingBuildRunsTheCommandInsideTheBracket) {

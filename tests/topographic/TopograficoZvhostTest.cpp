@@ -1,0 +1,158 @@
+// The diagram through zvhost as a user runs it, on a generated project with the product's
+// template and configuration: the written drawing is audited with ezdxf, every block is
+// tied to a symbol that names it back, and runs on the diagram's own output add nothing
+// twice.
+#include "ProductFolder.h"
+#include "QtPrinters.h"
+#include "drawing/PythonChecker.h"
+
+#include <gtest/gtest.h>
+
+#include <QFile>
+#include <QJsonArray>
+#include <QJsonDocument>
+#include <QJsonObject>
+
+#include <map>
+#include <set>
+
+namespace {
+
+struct Diagrama {
+    bool ok = false;
+    std::map<QString, QString> blocoDoSimbolo;  // symbol handle -> block handle
+    std::map<QString, QString> paginaDoBloco;   // block handle -> layer
+    std::map<QString, QStringList> esq;         // symbol handle -> its representation chain
+    std::set<QString> handles;
+};
+
+class TopograficoZvhost : public ::testing::Test {
+protected:
+    static void SetUpTestSuite() {
+        product_ = new zvtest::ProductFolder;
+        const QString erro =
+            product_->prepare({"--seed", "5", "--terminals", "80", "--numbers", "project"});
+        ASSERT_TRUE(erro.isEmpty()) << erro.toStdString();
+    }
+    static void TearDownTestSuite() {
+        delete product_;
+        product_ = nullptr;
+    }
+    static QString path(const QString& nome) { return product_->path(nome); }
+    static zvtest::HostRun Diagrama(const QString& entrada, const QString& saida,
+                                    const QStringList& respostas = {}) {
+        QStringList args = {"--quiet", "--load", path("produto/config/zvconfig.lsp"), "--answer",
+                            "template=" + path("produto/templates/topografico.dtp")};
+        for (const QString& r : respostas)
+            args << "--answer" << r;
+        return product_->zvhost(args << entrada << "-o" << saida << "diagramaTopografico");
+    }
+    static ::Diagrama Le(const QString& arquivo) {
+        ::Diagrama d;
+        const QString falta = zvtest::PythonChecker::missing();
+        if (!falta.isEmpty()) {
+            ADD_FAILURE() << falta.toStdString();
+            return d;
+        }
+        QString saida;
+        const int estado = zvtest::PythonChecker::run("topografico_dxf.py", {arquivo}, &saida);
+        EXPECT_EQ(estado, 0) << saida.toStdString();
+        for (const QJsonValue& v :
+             QJsonDocument::fromJson(saida.toUtf8()).object()["inserts"].toArray()) {
+            const QJsonObject o = v.toObject();
+            const QString handle = o["handle"].toString();
+            d.handles.insert(handle);
+            const QJsonArray rep = o["rep"].toArray();
+            // The diagram's representation; the project's layout ties others of its own.
+            if (rep.size() == 2 && rep[0].toString() == "1") {
+                const QString simbolo = rep[1].toString();
+                EXPECT_EQ(d.blocoDoSimbolo.count(simbolo), 0u)
+                    << "two blocks for " << simbolo.toStdString();
+                d.blocoDoSimbolo[simbolo] = handle;
+                d.paginaDoBloco[handle] = o["layer"].toString();
+            }
+        }
+        const QJsonObject cadeias =
+            QJsonDocument::fromJson(saida.toUtf8()).object()["esq"].toObject();
+        for (auto it = cadeias.begin(); it != cadeias.end(); ++it)
+            for (const QJsonValue& e : it.value().toArray())
+                d.esq[it.key()] << e.toString();
+        d.ok = estado == 0;
+        return d;
+    }
+
+    static zvtest::ProductFolder* product_;
+};
+
+zvtest::ProductFolder* TopograficoZvhost::product_ = nullptr;
+
+TEST_F(TopograficoZvhost, TheDemoTemplateDrawsEveryListedSymbolOnceTiedBothWays) {
+    const QString saida = path("topo.dxf");
+    const zvtest::HostRun run = Diagrama(product_->project(), saida);
+    ASSERT_EQ(run.status, 0) << run.out.toStdString() << run.err.toStdString();
+    EXPECT_TRUE(run.out.contains("Topographic diagram drawn.")) << run.out.toStdString();
+    const ::Diagrama d = Le(saida);
+    ASSERT_TRUE(d.ok);
+    // The generated project has contactors, relays, lamps, buttons and 80 terminals.
+    EXPECT_GT(d.blocoDoSimbolo.size(), 80u);
+    std::set<QString> paginas;
+    for (const auto& [simbolo, bloco] : d.blocoDoSimbolo) {
+        ASSERT_TRUE(d.esq.count(simbolo)) << simbolo.toStdString();
+        EXPECT_EQ(d.esq.at(simbolo), QStringList({"1", bloco})) << simbolo.toStdString();
+        paginas.insert(d.paginaDoBloco.at(bloco));
+    }
+    // Ordinary blocks and terminals on pages of their own in the template's group.
+    EXPECT_GE(paginas.size(), 2u);
+    for (const QString& p : paginas)
+        EXPECT_TRUE(p.startsWith("TOPOGRAFICO$")) << p.toStdString();
+    // The input drawing is never written.
+    EXPECT_TRUE(Le(product_->project()).blocoDoSimbolo.empty());
+}
+
+TEST_F(TopograficoZvhost, RunsOnItsOwnOutputKeepOrReplaceButNeverDuplicate) {
+    const QString primeira = path("r1.dxf"), mantida = path("r2.dxf"), refeita = path("r3.dxf");
+    ASSERT_EQ(Diagrama(product_->project(), primeira).status, 0);
+    const ::Diagrama d1 = Le(primeira);
+    // Keep the group: nothing new to add, the drawing saved as it was asked.
+    zvtest::HostRun run = Diagrama(primeira, mantida, {"question:89=no"});
+    ASSERT_EQ(run.status, 0) << run.out.toStdString() << run.err.toStdString();
+    EXPECT_TRUE(run.out.contains("Every symbol is on the diagram already"))
+        << run.out.toStdString();
+    const ::Diagrama d2 = Le(mantida);
+    EXPECT_EQ(d2.blocoDoSimbolo, d1.blocoDoSimbolo);
+    // Delete the group: every symbol drawn again, by new blocks, each once.
+    run = Diagrama(primeira, refeita, {"question:89=yes"});
+    ASSERT_EQ(run.status, 0) << run.out.toStdString() << run.err.toStdString();
+    const ::Diagrama d3 = Le(refeita);
+    ASSERT_EQ(d3.blocoDoSimbolo.size(), d1.blocoDoSimbolo.size());
+    for (const auto& [simbolo, bloco] : d3.blocoDoSimbolo) {
+        EXPECT_EQ(d1.handles.count(bloco), 0u) << bloco.toStdString();
+        EXPECT_EQ(d3.esq.at(simbolo), QStringList({"1", bloco}));
+    }
+    // Nobody answers the question: the run is cancelled and nothing is saved.
+    const QString cancelada = path("r4.dxf");
+    run = Diagrama(primeira, cancelada);
+    EXPECT_EQ(run.status, 4) << run.err.toStdString();
+    EXPECT_FALSE(QFile::exists(cancelada));
+}
+
+TEST_F(TopograficoZvhost, AMissingTemplateOrFolderWritesNothing) {
+    const QString saida = path("nada.dxf");
+    // A template that is not there.
+    zvtest::HostRun run =
+        product_->zvhost({"--quiet", "--load", path("produto/config/zvconfig.lsp"), "--answer",
+                          "template=" + path("nao-existe.dtp"), product_->project(), "-o", saida,
+                          "diagramaTopografico"});
+    EXPECT_EQ(run.status, 3) << run.err.toStdString();
+    EXPECT_TRUE(run.out.contains("The template could not be loaded.")) << run.out.toStdString();
+    EXPECT_FALSE(QFile::exists(saida));
+    // Without the configuration there is no template folder: nothing happens.
+    run = product_->zvhost({"--quiet", "--answer",
+                            "template=" + path("produto/templates/topografico.dtp"),
+                            product_->project(), "-o", saida, "diagramaTopografico"});
+    EXPECT_EQ(run.status, 4) << run.err.toStdString();
+    EXPECT_FALSE(run.out.contains("Topographic diagram drawn."));
+    EXPECT_FALSE(QFile::exists(saida));
+}
+
+}  // namespace

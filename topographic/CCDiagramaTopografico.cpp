@@ -1,0 +1,679 @@
+#include "CCDiagramaTopografico.h"
+
+#include "cad/CICad.h"
+#include "host/sdk/SystemServices.h"
+#include "host/sdk/UserInterface.h"
+#include "lists/CETemplateLisp.h"
+#include "module/CIProgress.h"
+#include "module/ZVResultado.h"
+#include "readers/CEAtributo.h"
+#include "readers/CEListaAtributos.h"
+#include "readers/ZVString.h"
+#include "settings/CIMensagens.h"
+
+#include <QFile>
+#include <QSet>
+
+#include <algorithm>
+#include <cmath>
+#include <memory>
+
+namespace {
+
+constexpr int kMsgModelo = 88;
+constexpr int kMsgGrupoExiste = 89;
+constexpr int kMsgSemRepresentacao = 970;
+constexpr int kMsgSemGrupo = 971;
+constexpr int kMsgCanto = 972;
+constexpr int kMsgRetangulo = 973;
+constexpr int kMsgArquivoBloco = 974;
+constexpr int kMsgNadaADesenhar = 975;
+constexpr int kMsgDesenhado = 976;
+constexpr int kMsgJaDesenhados = 977;
+
+const char* const kAppSimbolo = "KVR_ZV";
+const char* const kAppRepresentacao = "KVR_ZV_REPRESENTACAO";
+const char* const kAppRepresentacaoEsq = "KVR_ZV_REPRESENTACAO_ESQ";
+const char* const kAppRepresentacaoAce = "KVR_ZV_REPRESENTACAO_ACE";
+const char* const kAppRepresentacaoAceEsq = "KVR_ZV_REPRESENTACAO_ACE_ESQ";
+const char* const kPassoPadrao = "15";
+
+// The catalogue type of terminal blocks.
+const char* const kTipoBorne = "5";
+
+QString Mensagem(int numero) {
+    return CIMensagens::Mensagem("ZVLISTAS", numero);
+}
+
+// A message with a text of the run behind it, on a line of its own.
+void ImprimeCom(int numero, const QString& texto) {
+    CICad::Imprime("\n" + Mensagem(numero) + texto + "\n");
+}
+
+bool GrupoExiste(const QString& grupo) {
+    zvsdk::ResultBuffer* grupos = CICad::zvInvokeLista("buscaListaGrupos");
+    bool existe = false;
+    for (const zvsdk::ResultBuffer* no = grupos; no && !existe; no = no->rbnext)
+        existe = no->restype == zvsdk::RTSTR && no->rstring == grupo;
+    CICad::LiberaLista(grupos);
+    return existe;
+}
+
+bool PerguntaSimNao(int numero) {
+    zvsdk::SystemServices* servicos = zvsdk::systemServices();
+    if (!servicos || !servicos->userInterface()) return false;
+    return servicos->userInterface()->askYesNo("question:" + QString::number(numero),
+                                               Mensagem(numero), false);
+}
+
+QString CriaPagina(const QString& grupo) {
+    zvsdk::ResultBuffer* chamada = zvsdk::newString("criarpagina");
+    chamada->rbnext = zvsdk::newString(grupo);
+    chamada->rbnext->rbnext = zvsdk::newShort(0);
+    CICad::LiberaLista(CICad::InvokeChain(chamada));
+    zvsdk::releaseChain(chamada);
+    // Whatever layer criarpagina left current is the page.
+    return CICad::GetLayerCorrente();
+}
+
+// The strip of a terminal, in the first language that names one.
+QString ReguaDe(const CEItemLista& item) {
+    for (const char* campo : {"REGUA", "STRIP", "REGLETA"})
+        if (const QString* valor = item.campo(campo); valor && !valor->isEmpty()) return *valor;
+    return QString();
+}
+
+// The pairs of a representation chain: key and handle, one after the other.
+std::vector<std::pair<QString, QString>> Pares(const CEListaXData& cadeia) {
+    std::vector<std::pair<QString, QString>> pares;
+    for (size_t i = 0; i + 1 < cadeia.size(); i += 2)
+        pares.emplace_back(cadeia[i].texto, cadeia[i + 1].texto);
+    return pares;
+}
+
+CEItemXData Texto(const QString& texto) {
+    CEItemXData item;
+    item.codigo = 1000;
+    item.texto = texto;
+    return item;
+}
+
+}  // namespace
+
+// ---- extents and the rectangle
+
+double CCDiagramaTopografico::Extensao::Largura() const {
+    return std::max(xMin, xMax) - std::min(xMin, xMax);
+}
+
+double CCDiagramaTopografico::Extensao::Altura() const {
+    return std::max(yMin, yMax) - std::min(yMin, yMax);
+}
+
+double CCDiagramaTopografico::Extensao::MenorX() const {
+    return std::min(xMin, xMax);
+}
+
+CCDiagramaTopografico::Extensao CCDiagramaTopografico::ExtensaoAbsoluta(double xMin, double xMax,
+                                                                        double yMin, double yMax) {
+    // Stored as absolute values: an extent that crosses an axis reads narrower than it is,
+    // and the layouts made so far rely on that reading.
+    return {std::abs(xMin), std::abs(xMax), std::abs(yMin), std::abs(yMax)};
+}
+
+bool CCDiagramaTopografico::LeCanto(const QString& texto, CEPonto& canto) {
+    canto = {};
+    QStringList partes = texto.split(',');
+    if (partes.size() == 2) partes << "0";
+    if (partes.size() != 3) return false;
+    double valores[3];
+    for (int i = 0; i < 3; ++i) {
+        bool ok = false;
+        valores[i] = partes[i].trimmed().toDouble(&ok);
+        if (!ok || !std::isfinite(valores[i])) return false;
+    }
+    canto = {CICad::Simples(valores[0]), CICad::Simples(valores[1]), CICad::Simples(valores[2])};
+    return true;
+}
+
+CCDiagramaTopografico::Retangulo CCDiagramaTopografico::RetanguloDe(const CEPonto& a,
+                                                                    const CEPonto& b) {
+    return {std::min(a.x, b.x), std::max(a.y, b.y), std::abs(a.x - b.x), std::abs(a.y - b.y)};
+}
+
+// ---- rows and pages
+
+std::vector<CCDiagramaTopografico::Linha> CCDiagramaTopografico::LinhasBlocos(
+    const std::vector<QString>& chaves, const Extensoes& extensoes, double largura, double margem,
+    int colunas) {
+    std::vector<Linha> linhas;
+    size_t i = 0;
+    while (i < chaves.size()) {
+        Linha linha;
+        double t = 0.0;
+        do {
+            const double w = extensoes.value(chaves[i]).Largura() + margem;
+            t += w;
+            // A block wider than the rectangle gets a row of its own and sticks out.
+            if (!(t < largura || (linha.empty() && w >= largura))) break;
+            linha.push_back(chaves[i++]);
+        } while (t < largura && i < chaves.size() &&
+                 (colunas < 1 || linha.size() < size_t(colunas)));
+        if (linha.empty()) linha.push_back(chaves[i++]);  // a negative margin: still progress
+        linhas.push_back(std::move(linha));
+    }
+    return linhas;
+}
+
+std::vector<CCDiagramaTopografico::Linha> CCDiagramaTopografico::LinhasBornes(
+    const std::vector<Borne>& bornes, double largura, double margem) {
+    std::vector<Linha> linhas;
+    QString ultimaRegua;
+    size_t i = 0;
+    while (i < bornes.size()) {
+        Linha linha;
+        double t = 0.0;
+        while (t < largura && i < bornes.size()) {
+            const Borne& borne = bornes[i];
+            const double d = borne.passo;
+            t += d;
+            if (ultimaRegua.isEmpty()) ultimaRegua = borne.regua;
+            // A new strip: the terminal stands twice, and so one step further on.
+            if (borne.regua != ultimaRegua) {
+                ultimaRegua = borne.regua;
+                linha.push_back(borne.chave);
+            }
+            if (t + margem < largura || (linha.empty() && d >= largura)) {
+                linha.push_back(borne.chave);
+                ++i;
+            } else if (d <= 0.0) {
+                break;  // a step that doesn't grow the row would try forever
+            }
+        }
+        // Nothing fitted and nothing grew: the terminal goes alone rather than never.
+        if (linha.empty()) linha.push_back(bornes[i++].chave);
+        linhas.push_back(std::move(linha));
+    }
+    return linhas;
+}
+
+std::vector<CCDiagramaTopografico::Pagina> CCDiagramaTopografico::Paginas(
+    const std::vector<Linha>& linhas, const Extensoes& extensoes, double altura, double margem,
+    int maxLinhas) {
+    std::vector<Pagina> paginas;
+    if (linhas.empty()) return paginas;
+    paginas.emplace_back();
+    double u = 0.0;
+    for (const Linha& linha : linhas) {
+        double h = 0.0;
+        for (const QString& chave : linha)
+            h = std::max(h, extensoes.value(chave).Altura());
+        Pagina& atual = paginas.back();
+        if ((u + h > altura && !atual.empty()) ||
+            (maxLinhas > 0 && atual.size() >= size_t(maxLinhas))) {
+            paginas.emplace_back();
+            u = 0.0;
+        }
+        paginas.back().push_back(linha);
+        u += h + margem;
+    }
+    return paginas;
+}
+
+QHash<QString, CEPonto> CCDiagramaTopografico::PosicoesBlocos(const std::vector<Pagina>& paginas,
+                                                              const Extensoes& extensoes,
+                                                              const Retangulo& retangulo,
+                                                              double margem) {
+    QHash<QString, CEPonto> posicoes;
+    for (const Pagina& pagina : paginas) {
+        double y = retangulo.topo;
+        for (const Linha& linha : pagina) {
+            double soma = 0.0, h = 0.0;
+            for (const QString& chave : linha) {
+                const Extensao e = extensoes.value(chave);
+                if (e.xMin >= 0 && e.xMax >= 0) soma += e.Largura();
+                h = std::max(h, e.Altura());
+            }
+            // The row fills the whole width, with equal gaps between its blocks.
+            const double folga = retangulo.largura - soma;
+            const double n = double(linha.size());
+            double c = retangulo.esquerda;
+            for (const QString& chave : linha) {
+                const Extensao e = extensoes.value(chave);
+                posicoes[chave] = {c - e.MenorX(), (h - e.Altura()) * 0.5 + y - h, 0.0};
+                if (linha.size() > 1) c += e.Largura() + folga / (n - 1);
+            }
+            y -= h + margem;
+        }
+    }
+    return posicoes;
+}
+
+QHash<QString, CEPonto> CCDiagramaTopografico::PosicoesBornes(const std::vector<Pagina>& paginas,
+                                                              const Extensoes& extensoes,
+                                                              const QHash<QString, double>& passos,
+                                                              const Retangulo& retangulo,
+                                                              double margem) {
+    QHash<QString, CEPonto> posicoes;
+    for (const Pagina& pagina : paginas) {
+        double y = retangulo.topo;
+        for (const Linha& linha : pagina) {
+            double h = 0.0;
+            for (const QString& chave : linha)
+                h = std::max(h, extensoes.value(chave).Altura());
+            double c = retangulo.esquerda;
+            for (const QString& chave : linha) {
+                const double d = passos.value(chave);
+                const Extensao e = extensoes.value(chave);
+                // A doubled entry writes twice: the later, further point stays.
+                posicoes[chave] = {c - d, (h - e.Altura()) * 0.5 + y - h, 0.0};
+                c += d;
+            }
+            y -= h + margem;
+        }
+    }
+    return posicoes;
+}
+
+// ---- the run
+
+CCDiagramaTopografico::Parametros CCDiagramaTopografico::LeParametros() {
+    Parametros p;
+    p.representacao = CICad::GetStringLisp("PBLREPTOPOGRAFICO");
+    p.grupo = CICad::GetStringLisp("PBLTOPO_GRUPO");
+    p.canto1 = CICad::GetStringLisp("PBLTOPO_PTLIM1");
+    p.canto2 = CICad::GetStringLisp("PBLTOPO_PTLIM2");
+    p.ordenacao = CICad::GetListaLisp("PBLTOPO_ORDENACAO");
+    p.margem = CICad::GetRealLisp("PBLTOPO_MARGEM", 0.0);
+    p.linhas = int(std::trunc(std::clamp(CICad::GetRealLisp("PBLTOPO_LINHAS", 0.0), -1e9, 1e9)));
+    p.colunas = int(std::trunc(std::clamp(CICad::GetRealLisp("PBLTOPO_COLUNAS", 0.0), -1e9, 1e9)));
+    p.borne = CICad::GetBoolLisp("PBLTOPO_BORNE");
+    p.borneDist = CICad::GetStringLisp("PBLTOPO_BORNEDIST");
+    return p;
+}
+
+void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
+    inseridos_ = paginasCriadas_ = 0;
+    CETemplateLisp modelo(caminhoModelo);
+    if (!modelo.Carregar()) {
+        CICad::ImprimeMensagem(kMsgModelo);
+        ZVResultado::Falhou();
+        return;
+    }
+    parametros_ = LeParametros();
+    const Parametros& p = parametros_;
+    if (p.representacao.isEmpty() || p.representacao == "-1") {
+        CICad::ImprimeMensagem(kMsgSemRepresentacao);
+        throw int(SemRepresentacao);
+    }
+    if (p.grupo.isEmpty() || p.grupo == "-1") {
+        CICad::ImprimeMensagem(kMsgSemGrupo);
+        throw int(SemGrupo);
+    }
+    CEPonto a, b;
+    if (!LeCanto(p.canto1, a) || !LeCanto(p.canto2, b)) {
+        ImprimeCom(kMsgCanto, "\"" + p.canto1 + "\" \"" + p.canto2 + "\"");
+        throw int(SemCanto);
+    }
+    const Retangulo retangulo = RetanguloDe(a, b);
+    if (!(retangulo.largura > 0.0) || !(retangulo.altura > 0.0)) {
+        ImprimeCom(kMsgRetangulo, "\"" + p.canto1 + "\" \"" + p.canto2 + "\"");
+        ZVResultado::Falhou();
+        return;
+    }
+    if (GrupoExiste(p.grupo) && PerguntaSimNao(kMsgGrupoExiste))
+        CICad::zvInvokeVoid("apagargrupo", {p.grupo});
+    diretorio_ = CICad::GetStringLisp("*DIRETORIO_REDE*");
+
+    CIProgress progresso;
+    progresso_ = &progresso;
+    // Nothing of the run outlives it: the window, and the items by key.
+    struct Fim {
+        CCDiagramaTopografico& d;
+        ~Fim() {
+            d.progresso_ = nullptr;
+            d.itensPorHandle_.clear();
+        }
+    } fim{*this};
+    progresso.Mostrar();
+    progresso.Definir(0);
+
+    Candidatos candidatos;
+    ColetaCandidatos(candidatos);
+    AdicionaAcessorios(candidatos);
+    progresso.Definir(10);
+    ProcuraBlocos(candidatos);
+    MantemComArquivo(candidatos);
+    RenovaBlocos(candidatos);
+    progresso.Definir(20);
+    if (candidatos.empty()) {
+        CICad::ImprimeMensagem(kMsgNadaADesenhar);
+        ZVResultado::Falhou();
+        progresso.Fechar();
+        return;
+    }
+    const size_t antes = candidatos.size();
+    DescartaDesenhados(candidatos);
+    const bool algumDesenhado = candidatos.size() < antes;
+    candidatos_ = std::move(candidatos);
+
+    // Terminals apart when asked; a handle that is no object joins neither list.
+    std::vector<QString> comuns, bornes;
+    for (const auto& [chave, candidato] : candidatos_) {
+        if (p.borne) {
+            if (candidato.simbolo.isNull()) continue;
+            (Catalogo().TipoComp(candidato.chave).trimmed() == kTipoBorne ? bornes : comuns)
+                .push_back(chave);
+        } else {
+            comuns.push_back(chave);
+        }
+    }
+    VetorItens itensComuns = LeItens(comuns, modelo);
+    VetorItens itensBornes = LeItens(bornes, modelo);
+    progresso.Definir(40);
+    struct Destroi {
+        VetorItens& a;
+        VetorItens& b;
+        ~Destroi() {
+            a.destruirItens();
+            b.destruirItens();
+        }
+    } destroi{itensComuns, itensBornes};
+    if (itensComuns.empty() && itensBornes.empty()) {
+        // A run over a diagram that is up to date draws nothing, and that is no failure.
+        if (algumDesenhado) {
+            CICad::ImprimeMensagem(kMsgJaDesenhados);
+        } else {
+            CICad::ImprimeMensagem(kMsgNadaADesenhar);
+            ZVResultado::Falhou();
+        }
+        progresso.Fechar();
+        return;
+    }
+    LePassos(itensBornes);
+    itensComuns.ordenar(p.ordenacao);
+    itensBornes.ordenar(p.ordenacao);
+    LeExtensoes();
+    progresso.Definir(50);
+
+    CICad::RegistraApp(kAppRepresentacao);
+    CICad::RegistraApp(kAppRepresentacaoEsq);
+    CICad::RegistraApp(kAppRepresentacaoAce);
+    CICad::RegistraApp(kAppRepresentacaoAceEsq);
+
+    if (!itensComuns.empty()) {
+        std::vector<QString> chaves;
+        chaves.reserve(itensComuns.size());
+        for (const CEItemLista* item : itensComuns)
+            chaves.push_back(item->valorCampo("HANDLE"));
+        const auto linhas =
+            LinhasBlocos(chaves, extensoes_, retangulo.largura, p.margem, p.colunas);
+        const auto paginas = Paginas(linhas, extensoes_, retangulo.altura, p.margem, p.linhas);
+        Desenha(paginas, PosicoesBlocos(paginas, extensoes_, retangulo, p.margem));
+    }
+    progresso.Definir(75);
+    if (!itensBornes.empty()) {
+        std::vector<Borne> lista;
+        lista.reserve(itensBornes.size());
+        for (const CEItemLista* item : itensBornes) {
+            const QString chave = item->valorCampo("HANDLE");
+            lista.push_back({chave, passos_.value(chave), ReguaDe(*item)});
+        }
+        const auto linhas = LinhasBornes(lista, retangulo.largura, p.margem);
+        const auto paginas = Paginas(linhas, extensoes_, retangulo.altura, p.margem, p.linhas);
+        Desenha(paginas, PosicoesBornes(paginas, extensoes_, passos_, retangulo, p.margem));
+    }
+    CICad::zvInvokeVoid("atualizaTopografico");
+    progresso.Definir(100);
+    progresso.Fechar();
+    ImprimeCom(kMsgDesenhado,
+               QString::number(inseridos_) + " / " + QString::number(paginasCriadas_));
+}
+
+// ---- candidates
+
+void CCDiagramaTopografico::ColetaCandidatos(Candidatos& candidatos) {
+    zvdb::Database* db = CICad::GetDatabase();
+    // Symbols carry the key application: one walk of model space finds them all.
+    std::vector<OdDbObjectId> ids;
+    for (const OdDbObjectId& id : CICad::GetEntidadesComXData(kAppSimbolo, db)) {
+        if (!CICad::EhReferencia(id)) continue;
+        // Anonymous blocks and connector pins are never drawn.
+        const QString bloco = CICad::GetNomeBloco(id).toUpper();
+        if (!bloco.startsWith('*') && !bloco.startsWith("PIN-")) ids.push_back(id);
+    }
+    for (const auto& [nome, id] : CICad::GetEntradasDicionario({"ESQ_VIRTUAL_ZV"}, db))
+        if (CICad::TipoEntidade(id) == "XRECORD") ids.push_back(id);
+    for (const OdDbObjectId& id : ids) {
+        const CEListaXData dados = CICad::GetXData(id, kAppSimbolo);
+        if (dados.empty() || dados.front().codigo != 1000) continue;
+        const QStringList partes = dados.front().texto.split(CCDataReader::kSeparador);
+        candidatos.emplace(ZVString::DeHandle(id.handle()),
+                           Candidato{partes.value(0), partes.value(1), QString(), id});
+    }
+}
+
+void CCDiagramaTopografico::AdicionaAcessorios(Candidatos& candidatos) {
+    std::vector<std::pair<QString, Candidato>> novos;
+    for (const auto& [chave, simbolo] : candidatos) {
+        const QStringList acessorios = Catalogo().AcessoriosDe(simbolo.chave);
+        for (int i = 0; i < acessorios.size(); ++i) {
+            const QString acessorio = acessorios[i].section('#', 0, 0);
+            if (!acessorio.isEmpty())
+                novos.push_back({"*" + QString::number(i) + "_" + chave,
+                                 {acessorio, simbolo.norma, QString(), simbolo.simbolo}});
+        }
+        const CEListaXData aditivos = CICad::GetXData(simbolo.simbolo, "ZV_VINC_ADITIVO");
+        int indice = 0;
+        for (size_t i = 0; i + 1 < aditivos.size(); i += 2) {
+            const int quantidade = ZVString(aditivos[i].texto).ParaInteiro();
+            for (int n = 0; n < quantidade && n < 1000; ++n)
+                novos.push_back(
+                    {"#" + QString::number(indice++) + "_" + chave,
+                     {aditivos[i + 1].texto, simbolo.norma, QString(), simbolo.simbolo}});
+        }
+    }
+    for (auto& [chave, candidato] : novos)
+        candidatos.emplace(chave, std::move(candidato));
+}
+
+void CCDiagramaTopografico::ProcuraBlocos(Candidatos& candidatos) {
+    // The catalogue cache answers each key and standard once.
+    for (auto& [chave, candidato] : candidatos)
+        candidato.bloco = Catalogo().BlocoRepresentacao(candidato.chave, candidato.norma,
+                                                        parametros_.representacao);
+}
+
+QString CCDiagramaTopografico::Arquivo(const Candidato& candidato) const {
+    return diretorio_ + "DADOS\\" + candidato.norma + "\\BLOCOS\\" + candidato.bloco + ".dwg";
+}
+
+QString CCDiagramaTopografico::NomeBloco(const Candidato& candidato) {
+    return candidato.bloco + "_" + candidato.norma;
+}
+
+void CCDiagramaTopografico::MantemComArquivo(Candidatos& candidatos) {
+    QHash<QString, bool> legiveis;
+    for (auto it = candidatos.begin(); it != candidatos.end();) {
+        bool fica = !it->second.bloco.isEmpty();
+        if (fica) {
+            const QString arquivo = Arquivo(it->second);
+            auto achado = legiveis.constFind(arquivo);
+            if (achado == legiveis.constEnd()) {
+                QFile f(CICad::ResolveArquivo(arquivo));
+                const bool legivel = f.open(QIODevice::ReadOnly);
+                if (!legivel) ImprimeCom(kMsgArquivoBloco, arquivo);
+                achado = legiveis.insert(arquivo, legivel);
+            }
+            fica = achado.value();
+        }
+        it = fica ? std::next(it) : candidatos.erase(it);
+    }
+}
+
+void CCDiagramaTopografico::RenovaBlocos(Candidatos& candidatos) {
+    // Each distinct block once, in candidate order; a redefinition also refreshes the blocks
+    // already on earlier pages. A file the facade refuses, and whose block the drawing lacks,
+    // can't be inserted: its candidates go.
+    std::vector<std::pair<QString, QString>> blocos;
+    QHash<QString, int> indices;
+    for (const auto& [chave, candidato] : candidatos) {
+        const QString nome = NomeBloco(candidato);
+        if (indices.contains(nome)) continue;
+        indices.insert(nome, int(blocos.size()));
+        blocos.emplace_back(Arquivo(candidato), nome);
+    }
+    const std::vector<bool> recarregados = CICad::RecarregaBlocos(blocos);
+    QSet<QString> prontos;
+    for (size_t i = 0; i < blocos.size(); ++i) {
+        OdDbObjectId id;
+        if (recarregados[i] || CICad::GetBlocoId(blocos[i].second, id))
+            prontos.insert(blocos[i].second);
+    }
+    for (auto it = candidatos.begin(); it != candidatos.end();)
+        it = prontos.contains(NomeBloco(it->second)) ? std::next(it) : candidatos.erase(it);
+}
+
+void CCDiagramaTopografico::DescartaDesenhados(Candidatos& candidatos) {
+    const QString& representacao = parametros_.representacao;
+    for (auto it = candidatos.begin(); it != candidatos.end();) {
+        bool desenhado = false;
+        for (const auto& [rep, handle] :
+             Pares(CICad::GetXData(it->second.simbolo, kAppRepresentacaoEsq)))
+            if (rep == representacao && !CICad::IdDoHandle(handle).isNull()) desenhado = true;
+        it = desenhado ? candidatos.erase(it) : std::next(it);
+    }
+}
+
+VetorItens CCDiagramaTopografico::LeItens(const std::vector<QString>& chaves, CETemplate& modelo) {
+    VetorItens itens;
+    for (const QString& chave : chaves) {
+        // An accessory's key is no handle: it has no entity to read an item from.
+        if (chave.contains('_')) continue;
+        const OdDbObjectId id = candidatos_.at(chave).simbolo;
+        if (id.isNull()) continue;
+        std::unique_ptr<CEItemLista> item(CriaItemEntidade(id, modelo));
+        if (!item || item->valorCampo("ZV_LISTA") != "S") continue;
+        item->definirCampo("HANDLE", chave);
+        itensPorHandle_.insert(chave, item.get());
+        itens.push_back(item.release());
+    }
+    return itens;
+}
+
+void CCDiagramaTopografico::LePassos(const VetorItens& bornes) {
+    // The step is the default text of the block's attribute named by PBLTOPO_BORNEDIST.
+    QHash<QString, QString> porBloco;
+    const QString& tag = parametros_.borneDist;
+    for (CEItemLista* item : bornes) {
+        const QString chave = item->valorCampo("HANDLE");
+        const Candidato& candidato = candidatos_.at(chave);
+        const QString nome = NomeBloco(candidato);
+        auto achado = porBloco.constFind(nome);
+        if (achado == porBloco.constEnd()) {
+            QString passo;
+            const auto definicoes = CICad::GetDefinicoesAtributos(Arquivo(candidato), nome);
+            for (int i = 0; definicoes && !tag.isEmpty() && i < definicoes->Quantidade(); ++i)
+                if ((*definicoes)[i].GetTag() == tag) {
+                    passo = (*definicoes)[i].GetValor();
+                    break;
+                }
+            achado = porBloco.insert(nome, passo.isEmpty() ? QString(kPassoPadrao) : passo);
+        }
+        if (!tag.isEmpty()) item->definirCampo(tag, achado.value());
+        passos_.insert(chave, CETemplateLisp::TextoParaReal(achado.value()));
+    }
+}
+
+void CCDiagramaTopografico::LeExtensoes() {
+    // Once per block, for the candidates that have an item: only those are laid out.
+    QHash<QString, Extensao> porBloco;
+    for (auto it = itensPorHandle_.constBegin(); it != itensPorHandle_.constEnd(); ++it) {
+        const QString& chave = it.key();
+        const QString nome = NomeBloco(candidatos_.at(chave));
+        auto achado = porBloco.constFind(nome);
+        if (achado == porBloco.constEnd()) {
+            Extensao extensao;
+            OdDbObjectId bloco;
+            double xMax = 0, xMin = 0, yMax = 0, yMin = 0;
+            if (CICad::GetBlocoId(nome, bloco) &&
+                CICad::GetExtensaoBloco(bloco, xMax, xMin, yMax, yMin))
+                extensao = ExtensaoAbsoluta(xMin, xMax, yMin, yMax);
+            achado = porBloco.insert(nome, extensao);
+        }
+        extensoes_.insert(chave, achado.value());
+    }
+}
+
+// ---- pages and insertion
+
+void CCDiagramaTopografico::Desenha(const std::vector<Pagina>& paginas,
+                                    const QHash<QString, CEPonto>& posicoes) {
+    // Every page first, so that no page change happens while blocks go in.
+    QStringList layers;
+    for (size_t i = 0; i < paginas.size(); ++i)
+        layers << CriaPagina(parametros_.grupo);
+    paginasCriadas_ += int(paginas.size());
+    // A terminal that starts a strip stands twice in its row: it goes in once, at its
+    // last entry, where its point was left.
+    QHash<QString, int> restantes;
+    for (const Pagina& pagina : paginas)
+        for (const Linha& linha : pagina)
+            for (const QString& chave : linha)
+                ++restantes[chave];
+    for (size_t i = 0; i < paginas.size(); ++i) {
+        for (const Linha& linha : paginas[i])
+            for (const QString& chave : linha)
+                if (--restantes[chave] == 0) Insere(chave, layers[int(i)], posicoes.value(chave));
+        if (progresso_) progresso_->Definir(progresso_->Percentual());
+    }
+}
+
+void CCDiagramaTopografico::Insere(const QString& chave, const QString& layer,
+                                   const CEPonto& ponto) {
+    CEItemLista* item = itensPorHandle_.value(chave);
+    const auto candidato = candidatos_.find(chave);
+    if (!item || candidato == candidatos_.end()) return;
+    const OdDbObjectId ref =
+        CICad::InsereBloco(Arquivo(candidato->second), NomeBloco(candidato->second), layer, ponto.x,
+                           ponto.y, 0.0, 0.0);
+    if (ref.isNull()) return;  // left out; the run goes on
+    ++inseridos_;
+    std::unique_ptr<zv::CEListaAtributos> atributos;
+    CICad::GetAtributos(ref, atributos, false, false);
+    for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
+        const zv::CEAtributo& atributo = (*atributos)[i];
+        const QString* valor = item->campo(atributo.GetTag());
+        CICad::SetValorAtributo(atributo.GetId(), valor ? *valor : QString());
+    }
+    // The block names its symbol; an accessory's block also its place and catalogue key.
+    QString handle = item->valorCampo("HANDLE");
+    const int corte = handle.indexOf('_');
+    const bool acessorio = corte >= 0;
+    CEListaXData link{Texto(parametros_.representacao)};
+    const QString prefixo = acessorio ? handle.left(corte) : QString();
+    if (acessorio) handle = handle.mid(corte + 1);
+    link.push_back(Texto(handle));
+    if (acessorio) {
+        link.push_back(Texto(prefixo));
+        link.push_back(Texto(candidato->second.chave));
+    }
+    CICad::SetXData(ref, acessorio ? kAppRepresentacaoAce : kAppRepresentacao, link);
+    LigaSimbolo(candidato->second.simbolo, acessorio, ZVString::DeHandle(ref.handle()));
+}
+
+void CCDiagramaTopografico::LigaSimbolo(const OdDbObjectId& simbolo, bool acessorio,
+                                        const QString& bloco) {
+    if (simbolo.isNull()) return;  // the block stays unlinked; the next run adds it again
+    const QString aplicacao = acessorio ? kAppRepresentacaoAceEsq : kAppRepresentacaoEsq;
+    // At most one block per representation: a stale pair or this key's old pair goes.
+    CEListaXData cadeia;
+    for (const auto& [rep, ligado] : Pares(CICad::GetXData(simbolo, aplicacao))) {
+        if (rep == parametros_.representacao || CICad::IdDoHandle(ligado).isNull()) continue;
+        cadeia.push_back(Texto(rep));
+        cadeia.push_back(Texto(ligado));
+    }
+    cadeia.push_back(Texto(parametros_.representacao));
+    cadeia.push_back(Texto(bloco));
+    CICad::SetXData(simbolo, aplicacao, cadeia);
+}

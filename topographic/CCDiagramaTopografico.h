@@ -1,0 +1,123 @@
+#pragma once
+// The topographic diagram: the physical view of a project. Every listed symbol that has a
+// block of the chosen representation in the catalogue is inserted on new pages of a page
+// group, in rows and pages inside a rectangle of the sheet, and tied to its symbol by
+// extended data both ways, so that a later run adds only what is new.
+#include "readers/CCExportDataReader.h"
+
+#include <QHash>
+#include <QString>
+#include <QStringList>
+
+#include <map>
+#include <vector>
+
+class CETemplate;
+class CIProgress;
+
+class CCDiagramaTopografico : public CCExportDataReader {
+public:
+    // The ways a run ends before it draws, thrown as integers and swallowed by the command.
+    enum Codigo { SemRepresentacao = 1, SemGrupo = 2, SemCanto = 3 };
+
+    // What the template's LISP symbols ask of the run.
+    struct Parametros {
+        QString representacao, grupo;
+        QString canto1, canto2;
+        QStringList ordenacao;
+        double margem = 0.0;
+        int linhas = 0, colunas = 0;
+        bool borne = false;
+        QString borneDist;
+    };
+    // The drawing area: left side, top side, width and height.
+    struct Retangulo {
+        double esquerda = 0.0, topo = 0.0, largura = 0.0, altura = 0.0;
+    };
+    // A block's extents, each bound kept as its absolute value.
+    struct Extensao {
+        double xMin = 0.0, xMax = 0.0, yMin = 0.0, yMax = 0.0;
+        double Largura() const;
+        double Altura() const;
+        double MenorX() const;
+    };
+    // One terminal as its strip's rows see it.
+    struct Borne {
+        QString chave;
+        double passo = 0.0;
+        QString regua;
+    };
+    using Linha = std::vector<QString>;
+    using Pagina = std::vector<Linha>;
+    using Extensoes = QHash<QString, Extensao>;
+
+    // ---- the layout, on candidate keys
+    // "x,y,z" or "x,y" (z 0), single precision; false, and zeros, for anything else.
+    static bool LeCanto(const QString& texto, CEPonto& canto);
+    static Retangulo RetanguloDe(const CEPonto& a, const CEPonto& b);
+    static Extensao ExtensaoAbsoluta(double xMin, double xMax, double yMin, double yMax);
+    // Blocks in order, cut into rows no wider than the width (a wider block: a row of its
+    // own), at most `colunas` a row when that is 1 or more.
+    static std::vector<Linha> LinhasBlocos(const std::vector<QString>& chaves,
+                                           const Extensoes& extensoes, double largura,
+                                           double margem, int colunas);
+    // Terminals by their steps; a new strip name takes one more step before it.
+    static std::vector<Linha> LinhasBornes(const std::vector<Borne>& bornes, double largura,
+                                           double margem);
+    // Rows into pages by the rows' heights, at most `linhas` a page when that is 1 or more.
+    static std::vector<Pagina> Paginas(const std::vector<Linha>& linhas, const Extensoes& extensoes,
+                                       double altura, double margem, int maxLinhas);
+    // Insertion points: ordinary rows justified to the full width, centred on their height.
+    static QHash<QString, CEPonto> PosicoesBlocos(const std::vector<Pagina>& paginas,
+                                                  const Extensoes& extensoes,
+                                                  const Retangulo& retangulo, double margem);
+    // Terminal rows step by step from the left side, not justified.
+    static QHash<QString, CEPonto> PosicoesBornes(const std::vector<Pagina>& paginas,
+                                                  const Extensoes& extensoes,
+                                                  const QHash<QString, double>& passos,
+                                                  const Retangulo& retangulo, double margem);
+
+    // ---- the run
+    // Loads the template and draws. A missing representation, group or corner ends it with
+    // a Codigo thrown; every other end is told on the command line.
+    void Executar(const QString& caminhoModelo);
+
+    // The symbols' parameters, as the template left them.
+    static Parametros LeParametros();
+
+private:
+    struct Candidato {
+        QString chave, norma, bloco;
+        OdDbObjectId simbolo;  // the symbol itself, or the one whose accessory it is
+    };
+    // Candidates by key, in key order.
+    using Candidatos = std::map<QString, Candidato>;
+
+    void ColetaCandidatos(Candidatos& candidatos);
+    void AdicionaAcessorios(Candidatos& candidatos);
+    void ProcuraBlocos(Candidatos& candidatos);
+    void MantemComArquivo(Candidatos& candidatos);
+    void RenovaBlocos(Candidatos& candidatos);
+    void DescartaDesenhados(Candidatos& candidatos);
+    // The items of the keys, in key order; those that give none or are not listed fall out.
+    VetorItens LeItens(const std::vector<QString>& chaves, CETemplate& modelo);
+    void LePassos(const VetorItens& bornes);
+    void LeExtensoes();
+    // Makes the pages of one pass and inserts its blocks.
+    void Desenha(const std::vector<Pagina>& paginas, const QHash<QString, CEPonto>& posicoes);
+    void Insere(const QString& chave, const QString& layer, const CEPonto& ponto);
+    void LigaSimbolo(const OdDbObjectId& simbolo, bool acessorio, const QString& bloco);
+
+    QString Arquivo(const Candidato& candidato) const;
+    static QString NomeBloco(const Candidato& candidato);
+
+    Parametros parametros_;
+    QString diretorio_;
+    Candidatos candidatos_;
+    Extensoes extensoes_;
+    QHash<QString, double> passos_;
+    QHash<QString, CEItemLista*> itensPorHandle_;
+    CIProgress* progresso_ = nullptr;
+    int inseridos_ = 0;
+    int paginasCriadas_ = 0;
+};
