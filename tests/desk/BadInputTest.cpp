@@ -15,6 +15,7 @@
 #include <QFileDialog>
 #include <QMessageBox>
 #include <QPushButton>
+#include <QStandardPaths>
 #include <QTest>
 
 #include <sys/resource.h>
@@ -156,15 +157,24 @@ TEST_F(BadInputTest, SavingWhereNothingCanBeWrittenKeepsTheDrawingOpenAndUnsaved
 }
 
 TEST_F(BadInputTest, ADrawingFromAnotherFormatIsNeverWrittenOverItsOwnFile) {
-    // A drawing read from a file that is not a .dxf (here a DXF named .dwg, as an importer
-    // would leave it): Save asks where, proposing the same name as .dxf.
+    // A drawing read from a DWG: Save asks where, proposing the same name as .dxf.
+    if (QStandardPaths::findExecutable("node").isEmpty())
+        GTEST_SKIP() << "node is not installed: no DWG converter";
     const QString imported = path("imported.dwg");
     QFile::remove(imported);
     QFile::remove(path("imported.dxf"));
-    ASSERT_TRUE(QFile::copy(product_->project(), imported));
+    ASSERT_TRUE(QFile::copy(QString(ZV_SOURCE_DIR) + "/tests/drawing/dwg/xdata.dwg", imported));
     const QByteArray original = contentOf(imported);
-    ASSERT_TRUE(window_->openDrawing(imported));
-    ASSERT_TRUE(window_->runCommand("gerarListaBornesGrf"));
+    // The converter lies beside the programs, not beside the tests.
+    qputenv("ZV_DWG_CONVERTER", ZV_BIN_DIR "/dwg");
+    QString error;
+    const bool opened = window_->openDrawing(imported, &error, true);
+    qunsetenv("ZV_DWG_CONVERTER");
+    ASSERT_TRUE(opened) << error.toStdString();
+    window_->evaluate(
+        "(entmake '((0 . \"LINE\") (8 . \"ADDED\") (10 0.0 0.0 0.0)"
+        " (11 1.0 1.0 0.0)))");
+    ASSERT_TRUE(window_->isModified());
     QString proposed;
     ModalAnswer answer([&](QWidget* modal) {
         auto* dialog = qobject_cast<QFileDialog*>(modal);
@@ -178,11 +188,22 @@ TEST_F(BadInputTest, ADrawingFromAnotherFormatIsNeverWrittenOverItsOwnFile) {
     EXPECT_TRUE(window_->save());
     EXPECT_EQ(QFileInfo(proposed).fileName(), "imported.dxf");
     EXPECT_EQ(contentOf(imported), original);
-    EXPECT_TRUE(contentOf(path("imported.dxf")).contains("LISTAS$0001$A"));
+    EXPECT_TRUE(contentOf(path("imported.dxf")).contains("\nADDED\n"));
     EXPECT_EQ(window_->document()->fileName(), QFileInfo(path("imported.dxf")).absoluteFilePath());
     EXPECT_FALSE(window_->isModified());
     // From now on Save writes the .dxf without asking.
     EXPECT_TRUE(window_->save());
+}
+
+TEST_F(BadInputTest, AFileNamedDwgThatIsNotOneIsRefusedWithAMessage) {
+    const QString disguised = path("disguised.dwg");
+    QFile::remove(disguised);
+    ASSERT_TRUE(QFile::copy(product_->project(), disguised));
+    const QByteArray original = contentOf(disguised);
+    QString error;
+    EXPECT_FALSE(window_->openDrawing(disguised, &error, true));
+    EXPECT_TRUE(error.contains("disguised.dwg")) << error.toStdString();
+    EXPECT_EQ(contentOf(disguised), original);
 }
 
 TEST_F(BadInputTest, AReadOnlyFolderRefusesTheSaveWithAMessage) {
