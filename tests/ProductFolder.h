@@ -16,22 +16,17 @@ public:
     QString prepare(const QStringList& generate = {"--seed", "3", "--terminals", "60"}) {
         if (!folder_.isValid()) return "no temporary folder";
         QDir().mkpath(path("dados"));
-        const QString catalogue = QString(ZV_SOURCE_DIR) + "/data/catalogue/";
-        HostRun run =
-            zvhost({"catalogue", "--build", path("dados/catalogo.db"),
-                    catalogue + "catalogo-esquema.sql", catalogue + "catalogo-dados.sql"});
-        if (run.status != 0) return run.err;
-        run = zvhost({"catalogue", "--set", "Database=SQLITE", "NetworkZV=" + path("dados") + "/",
-                      "DBName=catalogo.db", "libLang=1"});
-        if (run.status != 0) return run.err;
+        const QString catalogue = buildDemoCatalogue(path("dados"), environment());
+        if (!catalogue.isEmpty()) return catalogue;
         for (const char* sub : {"templates", "config"}) {
             const QString from = QString(ZV_SOURCE_DIR) + "/data/" + sub + "/";
             QDir().mkpath(path("produto/") + sub);
             for (const QString& f : QDir(from).entryList(QDir::Files))
                 QFile::copy(from + f, path("produto/") + sub + "/" + f);
         }
-        run = zvhost(QStringList{"generate", "--out", project(), "--data", path("produto") + "/"}
-                     << generate);
+        const HostRun run =
+            zvhost(QStringList{"generate", "--out", project(), "--data", path("produto") + "/"}
+                   << generate);
         return run.status == 0 ? QString() : run.err;
     }
 

@@ -58,4 +58,19 @@ inline HostRun runZvhost(
     return run;
 }
 
+// The demo catalogue built into `folder` (ZV_DATA_DIR of `environment`) and the settings
+// there that name it. Empty on success, else what zvhost said.
+inline QString buildDemoCatalogue(const QString& folder, const QProcessEnvironment& environment) {
+    const QString sql = QString(ZV_SOURCE_DIR) + "/data/catalogue/";
+    HostRun run = runZvhost({"catalogue", "--build", folder + "/catalogo.db",
+                             sql + "catalogo-esquema.sql", sql + "catalogo-dados.sql"},
+                            environment);
+    if (run.status != 0) return run.err.isEmpty() ? "catalogue --build failed" : run.err;
+    run = runZvhost({"catalogue", "--set", "Database=SQLITE", "NetworkZV=" + folder + "/",
+                     "DBName=catalogo.db", "libLang=1"},
+                    environment);
+    if (run.status != 0) return run.err.isEmpty() ? "catalogue --set failed" : run.err;
+    return {};
+}
+
 }  // namespace zvtest

@@ -157,6 +157,11 @@ private:
     Value entsel(Args a, bool nested);
     // The point an answer gives, "x,y[,z]" or "@dx,dy[,dz]" from `base`.
     std::optional<zvdb::Point3> parsePoint(const QString& answer, const zvdb::Point3* base) const;
+    // The two ends of a distance or direction given as points: the answer is the second
+    // point from `base`, or, with no base, the first of two (the second is asked for).
+    // Nothing, and `complaint` set, when the answer or the second point is not a point.
+    std::optional<std::pair<zvdb::Point3, zvdb::Point3>> pointPair(
+        const QString& answer, const std::optional<zvdb::Point3>& base, QString* complaint);
 
     Interpreter& lisp_;
     HostDocument& document_;

@@ -270,18 +270,10 @@ Value CadFunctions::getDistance(Args a) {
             double distance = 0.0;
             if (const std::optional<double> typed = zvlisp::NumberFormat::parseLinear(answer)) {
                 distance = *typed;
-            } else if (const auto p = parsePoint(answer, base ? &*base : nullptr)) {
-                zvdb::Point3 from = base ? *base : *p;
-                zvdb::Point3 to = *p;
-                if (!base) {
-                    const auto second =
-                        parsePoint(ask(QStringLiteral("\nSpecify second point: ")), &from);
-                    if (!second) {
-                        *complaint = QStringLiteral("Requires a point (x,y or x,y,z).");
-                        return std::nullopt;
-                    }
-                    to = *second;
-                }
+            } else if (parsePoint(answer, base ? &*base : nullptr)) {
+                auto ends = pointPair(answer, base, complaint);
+                if (!ends) return std::nullopt;
+                auto [from, to] = *ends;
                 if (bits & 64) from.z = to.z = 0.0;
                 distance = zvdb::length(to - from);
             } else {
@@ -291,6 +283,19 @@ Value CadFunctions::getDistance(Args a) {
             if (!signAllowed(distance, bits, complaint)) return std::nullopt;
             return Value::real(distance);
         });
+}
+
+std::optional<std::pair<zvdb::Point3, zvdb::Point3>> CadFunctions::pointPair(
+    const QString& answer, const std::optional<zvdb::Point3>& base, QString* complaint) {
+    const auto first = parsePoint(answer, base ? &*base : nullptr);
+    if (!first) return std::nullopt;
+    if (base) return std::pair(*base, *first);
+    const auto second = parsePoint(ask(QStringLiteral("\nSpecify second point: ")), &*first);
+    if (!second) {
+        *complaint = QStringLiteral("Requires a point (x,y or x,y,z).");
+        return std::nullopt;
+    }
+    return std::pair(*first, *second);
 }
 
 // An angle typed in the drawing's angle units, or the direction from the base point to a
@@ -306,18 +311,10 @@ Value CadFunctions::getAngle(Args a) {
                      double angle = 0.0;
                      if (const auto typed = zvlisp::NumberFormat::parseAngle(answer, mode)) {
                          angle = *typed;
-                     } else if (const auto p = parsePoint(answer, base ? &*base : nullptr)) {
-                         zvdb::Point3 from = base ? *base : *p;
-                         zvdb::Point3 to = *p;
-                         if (!base) {
-                             const auto second =
-                                 parsePoint(ask(QStringLiteral("\nSpecify second point: ")), &from);
-                             if (!second) {
-                                 *complaint = QStringLiteral("Requires a point (x,y or x,y,z).");
-                                 return std::nullopt;
-                             }
-                             to = *second;
-                         }
+                     } else if (parsePoint(answer, base ? &*base : nullptr)) {
+                         const auto ends = pointPair(answer, base, complaint);
+                         if (!ends) return std::nullopt;
+                         const auto& [from, to] = *ends;
                          angle = std::atan2(to.y - from.y, to.x - from.x);
                      } else {
                          *complaint = QStringLiteral("Requires an angle or a point.");

@@ -31,13 +31,8 @@ QString PastaCatalogo() {
         feito = true;
         QProcessEnvironment env = QProcessEnvironment::systemEnvironment();
         env.insert("ZV_DATA_DIR", pasta.path());
-        const QString sql = QString(ZV_SOURCE_DIR) + "/data/catalogue/";
-        zvtest::runZvhost({"catalogue", "--build", pasta.filePath("catalogo.db"),
-                           sql + "catalogo-esquema.sql", sql + "catalogo-dados.sql"},
-                          env);
-        zvtest::runZvhost({"catalogue", "--set", "Database=SQLITE",
-                           "NetworkZV=" + pasta.path() + "/", "DBName=catalogo.db", "libLang=1"},
-                          env);
+        const QString problema = zvtest::buildDemoCatalogue(pasta.path(), env);
+        EXPECT_TRUE(problema.isEmpty()) << problema.toStdString();
     }
     return pasta.path();
 }

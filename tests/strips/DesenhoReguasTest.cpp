@@ -44,17 +44,8 @@ protected:
         ASSERT_TRUE(pasta_->isValid());
         QProcessEnvironment env = QProcessEnvironment::systemEnvironment();
         env.insert("ZV_DATA_DIR", pasta_->path());
-        const QString sql = QString(ZV_SOURCE_DIR) + "/data/catalogue/";
-        zvtest::HostRun r =
-            zvtest::runZvhost({"catalogue", "--build", pasta_->filePath("catalogo.db"),
-                               sql + "catalogo-esquema.sql", sql + "catalogo-dados.sql"},
-                              env);
-        ASSERT_EQ(r.status, 0) << r.err.toStdString();
-        r = zvtest::runZvhost(
-            {"catalogue", "--set", "Database=SQLITE", "NetworkZV=" + pasta_->path() + "/",
-             "DBName=catalogo.db", "libLang=1"},
-            env);
-        ASSERT_EQ(r.status, 0) << r.err.toStdString();
+        const QString problema = zvtest::buildDemoCatalogue(pasta_->path(), env);
+        ASSERT_TRUE(problema.isEmpty()) << problema.toStdString();
         // The strip pieces: each a frame with the attributes that its role fills.
         Bloco("REGUA_CAB", {{"REGUA", ""}, {"TITULO", "Regua"}});
         Bloco("REGUA_BORNE", {{"VARIAVEL_NUMERO", "NUMERO"}, {"ZV_KEY", ""}});
