@@ -190,14 +190,16 @@ QString CEExportConfigs::Caminho(const QString& pasta, const QString& arquivo) {
 void CEExportConfigs::CarregaDe(const QString& pasta) {
     const QString novo = Caminho(pasta, kArquivo);
     const QString antigo = Caminho(pasta, kArquivoAntigo);
-    if (!Existe(novo)) {
-        if (!Existe(antigo)) return;
-        QFile::copy(antigo, novo);
-    }
-    QFile arquivo(novo);
+    if (!Existe(novo) && !Existe(antigo)) return;
+    QFile arquivo(Existe(novo) ? novo : antigo);
     if (!arquivo.open(QIODevice::ReadOnly)) return;
     const QByteArray bytes = arquivo.readAll();
     arquivo.close();
+    // The older file is taken over under the new name through the one checked save.
+    if (!Existe(novo)) {
+        zvsdk::AtomicFile copia(novo);
+        if (copia.open() && copia.write(bytes)) copia.commit();
+    }
     if (LeTexto(bytes)) return;
     // Damaged. Copying the older file without leave to overwrite fails on purpose: the
     // error reaches the caller and the damaged file stays for the user to look at.
