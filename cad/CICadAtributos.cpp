@@ -10,6 +10,7 @@
 
 #include <QHash>
 
+#include <array>
 #include <exception>
 
 using namespace cicad;
@@ -144,8 +145,16 @@ QString CICad::TagTraduzida(CampoTraduzido campo, int indice) {
                                             {"POSICAO_CTT", "POSITION_CTT", "POSICION_CTT"},
                                             {"ID_PINO", "ID_PIN", "ID_PIN"},
                                             {"DISTANCIA", "DISTANCE", "DISTANCIA"}};
+    // Made once: readers ask for these names for every field they compose.
+    static const auto kTextos = [] {
+        std::array<std::array<QString, 3>, 9> textos;
+        for (size_t c = 0; c < 9; ++c)
+            for (size_t i = 0; i < 3; ++i)
+                textos[c][i] = QString::fromLatin1(kTags[c][i]);
+        return textos;
+    }();
     if (indice < 1 || indice > 3) indice = 1;
-    return kTags[int(campo) - 1][indice - 1];
+    return kTextos[size_t(int(campo) - 1)][size_t(indice - 1)];
 }
 
 bool CICad::EhTagFio(const QString& tag) {

@@ -101,7 +101,11 @@ void CCBorneDataReader::LeLado(CEItemLista& item, const OdDbObjectId& borne, con
     const LadoBorne achado = AchaLado(*this, borne, lado.insercao);
     if (achado.elemento.isNull()) return;
     const QString sufixo = SufixoElemento(item, lado.insercao);
-    LeBloco(sufixo, item, achado.elemento, &modelo);
+    // A neighbour that is no block reference is read as such (what a copy would not do).
+    if (CICad::EhReferencia(achado.elemento))
+        CopiaEntidade(sufixo, item, achado.elemento, &modelo);
+    else
+        LeBloco(sufixo, item, achado.elemento, &modelo);
     CompoeRelacaoBorne(sufixo, item, achado.elemento, achado.pontoElemento, modelo);
 
     LeFiosLado(*this, item, borne, achado, lado.insercao, &modelo);
@@ -120,11 +124,11 @@ void CCBorneDataReader::LeFiosLado(CCDataReader& leitor, CEItemLista& item,
     const QString segP = SufixoFio(item, true);
     const QString segQ = SufixoFio(item, false);
     if (insercao) {
-        if (!fioQ.isNull()) leitor.LeEntidade(segQ, item, fioQ, modelo);
-        if (!fioP.isNull()) leitor.LeEntidade(segP, item, fioP, modelo);
+        if (!fioQ.isNull()) leitor.CopiaEntidade(segQ, item, fioQ, modelo);
+        if (!fioP.isNull()) leitor.CopiaEntidade(segP, item, fioP, modelo);
     } else {
-        if (!fioP.isNull()) leitor.LeEntidade(segP, item, fioP, modelo);
-        if (!fioQ.isNull()) leitor.LeEntidade(segQ, item, fioQ, modelo);
+        if (!fioP.isNull()) leitor.CopiaEntidade(segP, item, fioP, modelo);
+        if (!fioQ.isNull()) leitor.CopiaEntidade(segQ, item, fioQ, modelo);
     }
 }
 

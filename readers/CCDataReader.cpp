@@ -288,14 +288,13 @@ std::optional<QString> NumeroNoCampoFio(const OdDbObjectId& entidade) {
     return std::nullopt;
 }
 
-}  // namespace
-
-QString CCDataReader::NumeroDoFio(const OdDbObjectId& entidade) const {
-    if (std::optional<QString> numero = NumeroNoCampoFio(entidade)) return *numero;
+// A cable core's number: the cable's own number (a CABO or CABLE attribute of its record)
+// and the core, from KVR_ZV_CABO; empty when there is none.
+QString NumeroNoCabo(const OdDbObjectId& entidade) {
     const CEListaXData cabo = CICad::GetXData(entidade, "KVR_ZV_CABO");
     if (cabo.size() < 2 || !EhTexto(cabo[0]) || !EhTexto(cabo[1])) return {};
     QString esquerda, direita;
-    ZVString(cabo[0].texto).DivideEmDois(kSeparador, esquerda, direita);
+    ZVString(cabo[0].texto).DivideEmDois(CCDataReader::kSeparador, esquerda, direita);
     for (size_t i = 2; i < cabo.size(); ++i) {
         if (!EhTexto(cabo[i])) continue;
         std::unique_ptr<zv::CEListaAtributos> atributos;
@@ -303,14 +302,43 @@ QString CCDataReader::NumeroDoFio(const OdDbObjectId& entidade) const {
         for (int a = 0; atributos && a < atributos->Quantidade(); ++a) {
             const QString tag = (*atributos)[a].GetTag().toUpper();
             if (tag == "CABO" || tag == "CABLE")
-                return (*atributos)[a].GetValor() + kSeparador + esquerda;
+                return (*atributos)[a].GetValor() + CCDataReader::kSeparador + esquerda;
         }
     }
     return {};
 }
 
+}  // namespace
+
+void CCDataReader::ConfereVersao() const {
+    const std::uint64_t versao = CICad::VersaoDesenho();
+    if (versao == versaoLidas_) return;
+    numerosFios_.clear();
+    entidadesLidas_.clear();
+    versaoLidas_ = versao;
+}
+
+const CCDataReader::NumeroFio& CCDataReader::NumeroDoFioGuardado(
+    const OdDbObjectId& entidade) const {
+    ConfereVersao();
+    auto achado = numerosFios_.find(entidade);
+    if (achado != numerosFios_.end()) return achado->second;
+    NumeroFio numero;
+    if (std::optional<QString> proprio = NumeroNoCampoFio(entidade)) {
+        numero.numero = *proprio;
+        numero.proprio = true;
+    } else {
+        numero.numero = NumeroNoCabo(entidade);
+    }
+    return numerosFios_.emplace(entidade, std::move(numero)).first->second;
+}
+
+QString CCDataReader::NumeroDoFio(const OdDbObjectId& entidade) const {
+    return NumeroDoFioGuardado(entidade).numero;
+}
+
 bool CCDataReader::EhFioNumerado(const OdDbObjectId& entidade) const {
-    return NumeroNoCampoFio(entidade).has_value();
+    return NumeroDoFioGuardado(entidade).proprio;
 }
 
 QString CCDataReader::VizinhoNaConexao(const OdDbObjectId& entidade, const CEPonto& ponto,
@@ -547,6 +575,15 @@ void CCDataReader::LeBloco(const QString& s, CEItemLista& item, const OdDbObject
 
 void CCDataReader::LeFio(const QString& s, CEItemLista& item, const OdDbObjectId& polilinha,
                          CETemplate* modelo) {
+    if (LeCamposFio(s, item, polilinha)) LeRotasDoItem(item, modelo);
+}
+
+void CCDataReader::LeRotasDoItem(const CEItemLista& item, CETemplate* modelo) {
+    const QString campoFio = CampoFio(item);
+    if (!campoFio.isEmpty()) LeRotasFio(item.valorCampo(campoFio), modelo);
+}
+
+bool CCDataReader::LeCamposFio(const QString& s, CEItemLista& item, const OdDbObjectId& polilinha) {
     const QString chaveTexto = ChaveDaEntidade(polilinha);
     LeColunasUsuario(s, item, catalogo_.ColunasFio(chaveTexto));
     CICad::RegistraApp("KVR_ZV_WIRE", polilinha.database());
@@ -556,7 +593,7 @@ void CCDataReader::LeFio(const QString& s, CEItemLista& item, const OdDbObjectId
         ZVString(fio[0].texto).DivideEmDois(kSeparador, chave, norma);
         const QString segundo = fio.size() > 1 ? fio[1].texto : QString();
         // Without key, standard and its second item the polyline is no complete wire.
-        if (chave.isEmpty() || norma.isEmpty() || segundo.isEmpty()) return;
+        if (chave.isEmpty() || norma.isEmpty() || segundo.isEmpty()) return false;
         item.definirCampo("ZV_KEY" + s, chave);
         for (size_t i = 2; i < fio.size(); ++i) {
             QString nome, valor;
@@ -564,8 +601,6 @@ void CCDataReader::LeFio(const QString& s, CEItemLista& item, const OdDbObjectId
                 item.definirCampo(nome + s, valor);
         }
     }
-    const QString campoFio = CampoFio(item);
-    if (!campoFio.isEmpty()) LeRotasFio(item.valorCampo(campoFio), modelo);
     item.definirCampo("WIRE_LISTA" + s, catalogo_.ListaFio(chave, norma));
     const QString descricao = catalogo_.DescricaoFio(chave);
     item.definirCampo("DESCRICAO" + s, descricao);
@@ -574,6 +609,7 @@ void CCDataReader::LeFio(const QString& s, CEItemLista& item, const OdDbObjectId
     LeLayer(s, item, CICad::GetLayerEntidade(polilinha));
     if (item.valorCampo("QTD" + s).isEmpty()) item.definirCampo("QTD" + s, "1");
     item.definirCampo("SAP_MATERIAL" + s, QString());
+    return true;
 }
 
 void CCDataReader::LeEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
@@ -582,6 +618,49 @@ void CCDataReader::LeEntidade(const QString& sufixo, CEItemLista& item, const Od
         LeBloco(sufixo, item, id, modelo);
     else if (CICad::EhPolilinha(id))
         LeFio(sufixo, item, id, modelo);
+}
+
+void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
+                                 CETemplate* modelo) {
+    ConfereVersao();
+    auto achado = entidadesLidas_.find(id);
+    if (achado == entidadesLidas_.end()) {
+        // A QTD of the entity's own replaces this mark; without one the mark stays.
+        static const QString kQtd = QStringLiteral("QTD"), kMarca = QStringLiteral("\x01");
+        CEItemLista lido;
+        EntidadeLida lida;
+        bool completa = false;
+        if (CICad::EhReferencia(id)) {
+            lido.definirCampo(kQtd, kMarca);
+            LeBloco(QString(), lido, id, modelo);
+            completa = true;
+        } else if (CICad::EhPolilinha(id)) {
+            lido.definirCampo(kQtd, kMarca);
+            completa = lida.rotas = LeCamposFio(QString(), lido, id);
+        }
+        const bool marcada = lido.valorCampo(kQtd) == kMarca;
+        if (marcada) lido.campos.remove(kQtd);
+        lida.qtdPadrao = marcada && completa;
+        lida.campos = lido.campos.todos();
+        achado = entidadesLidas_.emplace(id, std::move(lida)).first;
+    }
+    const EntidadeLida& lida = achado->second;
+    const bool qtdPadrao = lida.qtdPadrao, rotas = lida.rotas;
+    if (sufixo.isEmpty()) {
+        item.campos.juntarOrdenados(lida.campos);
+    } else {
+        std::vector<CamposItem::Campo> lote;
+        lote.reserve(lida.campos.size());
+        for (const CamposItem::Campo& campo : lida.campos)
+            lote.push_back({CamposItem::numeroComSufixo(campo.nome, sufixo), campo.valor});
+        std::sort(
+            lote.begin(), lote.end(),
+            [](const CamposItem::Campo& a, const CamposItem::Campo& b) { return a.nome < b.nome; });
+        item.campos.juntarOrdenados(lote);
+    }
+    if (qtdPadrao && item.valorCampo("QTD" + sufixo).isEmpty())
+        item.definirCampo("QTD" + sufixo, "1");
+    if (rotas) LeRotasDoItem(item, modelo);
 }
 
 CEItemLista* CCDataReader::CriaItemBloco(const OdDbObjectId& referencia, CETemplate& modelo) {
@@ -695,11 +774,17 @@ void CCDataReader::Separadores(CETemplate* modelo, QString& primeiro, QString& s
 }
 
 QString CCDataReader::CampoFio(const CEItemLista& item, const QString& sufixo) {
-    for (int i = 1; i <= 3; ++i) {
-        const QString campo = CICad::TagTraduzida(CampoTraduzido::Fio, i) + sufixo;
-        if (item.temCampo(campo)) return campo;
+    // Asked for every stretch end: the names are looked up by their numbers.
+    static const std::array<std::uint32_t, 4> kNomes{
+        CamposItem::numero(CICad::TagTraduzida(CampoTraduzido::Fio, 1)),
+        CamposItem::numero(CICad::TagTraduzida(CampoTraduzido::Fio, 2)),
+        CamposItem::numero(CICad::TagTraduzida(CampoTraduzido::Fio, 3)),
+        CamposItem::numero(QStringLiteral("FIO"))};
+    for (const std::uint32_t nome : kNomes) {
+        const std::uint32_t numero = CamposItem::numeroComSufixo(nome, sufixo);
+        if (item.campos.procura(numero)) return CamposItem::nome(numero);
     }
-    return item.temCampo("FIO" + sufixo) ? "FIO" + sufixo : QString();
+    return QString();
 }
 
 QString CCDataReader::RotuloElemento(const QString& handle, const QString& conexao,

@@ -75,6 +75,10 @@ public:
                CETemplate* modelo);
     void LeEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
                     CETemplate* modelo);
+    // What LeEntidade gives, from the entity's fields read once for the run: an element or a
+    // wire stands at the ends of many wires and sides, and its copies share their texts.
+    void CopiaEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
+                       CETemplate* modelo);
     CEItemLista* CriaItemBloco(const OdDbObjectId& referencia, CETemplate& modelo);
     CEItemLista* CriaItemFio(const OdDbObjectId& polilinha, CETemplate& modelo);
     CEItemLista* CriaItemVirtual(const OdDbObjectId& registro);
@@ -115,7 +119,7 @@ public:
 protected:
     CECacheCatalogo& Catalogo() { return catalogo_; }
     // An item kept for the list shares its field names with the items kept before it.
-    void PartilhaNomes(CEItemLista& item) { item.partilharNomes(nomesCampos_); }
+    void PartilhaNomes(CEItemLista& item) { item.partilharNomes(); }
     double Tolerancia() const { return tolerancia_; }
 
 private:
@@ -131,6 +135,11 @@ private:
     struct FiosDoLayer;
     const FiosDoLayer& IndiceFios(const QString& layer);
     void LeCircuitoLocal(const QString& sufixo, CEItemLista& item, const OdDbObjectId& entidade);
+    // The wire's fields without the look-up of its routes; false when the polyline is no
+    // complete wire (the reading stops there).
+    bool LeCamposFio(const QString& s, CEItemLista& item, const OdDbObjectId& polilinha);
+    // The routes of the wire number the item holds without a suffix.
+    void LeRotasDoItem(const CEItemLista& item, CETemplate* modelo);
     void LeLayout(const QString& sufixo, CEItemLista& item, const OdDbObjectId& entidade);
     // The key text's two parts; false when no key application is there.
     bool ChaveENorma(const OdDbObjectId& entidade, QString& chave, QString& norma) const;
@@ -153,7 +162,27 @@ private:
     QHash<QString, std::vector<std::size_t>> rotasPorChave_;  // record places by wire key
     bool rotasLidas_ = false;
     QHash<QString, QHash<QString, QString>> caminhos_;
-    QSet<QString> nomesCampos_;
+    // The fields of entities read for CopiaEntidade. `qtdPadrao`: the entity gave no QTD,
+    // so the copy puts "1" only where the item has none, as a reading would; `rotas`: a
+    // complete wire, after which a reading looks up the routes of the item's wire.
+    struct EntidadeLida {
+        std::vector<CamposItem::Campo> campos;
+        bool qtdPadrao = false;
+        bool rotas = false;
+    };
+    mutable std::unordered_map<OdDbObjectId, EntidadeLida> entidadesLidas_;
+    // Per wire polyline: its number as NumeroDoFio gives it, and whether its own field holds
+    // one; every terminal side and neighbour asks for the wires at its points.
+    struct NumeroFio {
+        QString numero;
+        bool proprio = false;
+    };
+    mutable std::unordered_map<OdDbObjectId, NumeroFio> numerosFios_;
+    // The drawing's version the entity caches above were read at.
+    mutable std::uint64_t versaoLidas_ = 0;
+    // Empties the caches of entities when the drawing changed since they were read.
+    void ConfereVersao() const;
+    const NumeroFio& NumeroDoFioGuardado(const OdDbObjectId& entidade) const;
     // Catalogue column texts split into name and value (an empty name: not a column).
     QHash<QString, std::pair<QString, QString>> colunasDivididas_;
     // Per accessory key and standard: the fields of a unit, and its user columns.

@@ -74,26 +74,6 @@ CEItemLista* CCFioDataReader::ItemFio(const OdDbObjectId& polilinha, CETemplate*
     return item;
 }
 
-void CCFioDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item,
-                                    const OdDbObjectId& id, CETemplate* modelo) {
-    auto achado = camposPorEntidade_.find(id);
-    if (achado == camposPorEntidade_.end()) {
-        CEItemLista lido;
-        LeEntidade(QString(), lido, id, modelo);
-        Campos campos;
-        campos.reserve(size_t(lido.campos.size()));
-        for (auto it = lido.campos.constBegin(); it != lido.campos.constEnd(); ++it)
-            campos.emplace_back(it.key(), it.value());
-        achado = camposPorEntidade_.emplace(id, std::move(campos)).first;
-    }
-    QHash<QString, QString>& nomes = nomesComSufixo_[sufixo];
-    for (const auto& [nome, valor] : achado->second) {
-        auto n = nomes.constFind(nome);
-        if (n == nomes.constEnd()) n = nomes.insert(nome, nome + sufixo);
-        item.definirCampo(n.value(), valor);
-    }
-}
-
 std::optional<QString> CCFioDataReader::LigacaoProxima(const QString& elemento,
                                                        const CEPonto& ponto) {
     const PontoElemento chave{elemento, ponto.x, ponto.y, ponto.z};

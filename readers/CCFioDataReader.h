@@ -81,10 +81,6 @@ private:
     // The value of the element's connection attribute nearest the point; null when it has
     // none. Each end is asked twice (its texts and its length): answered once.
     std::optional<QString> LigacaoProxima(const QString& elemento, const CEPonto& ponto);
-    // The fields of an element or wire polyline under the suffix. An entity stands at the
-    // ends of many stretches: its fields are read once and copied, sharing their texts.
-    void CopiaEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
-                       CETemplate* modelo);
 
     struct PontoElemento {
         QString elemento;
@@ -101,9 +97,6 @@ private:
     // Per wire number, the first place of each full connection text: a bus wire holds
     // thousands of entries, and each of its ends looks its own up.
     QHash<QString, QHash<QString, int>> lugaresCompletos_;
-    using Campos = std::vector<std::pair<QString, QString>>;
-    std::unordered_map<OdDbObjectId, Campos> camposPorEntidade_;
-    QHash<QString, QHash<QString, QString>> nomesComSufixo_;  // by suffix, then bare name
     QHash<QString, QString> rotasLayoutFio_;  // wire key (and key + "$") to route handle
     QHash<QString, QString> paineisLayout_;   // panel key to view handle
     QHash<QString, QString> layoutPorRelacao_;

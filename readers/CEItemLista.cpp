@@ -27,12 +27,6 @@ void CEItemLista::copiarCamposComSufixo(const CEItemLista& origem, const QString
         campos.insert(it.key() + "_" + sufixo, it.value());
 }
 
-void CEItemLista::partilharNomes(QSet<QString>& nomes) {
-    for (auto it = campos.constBegin(); it != campos.constEnd(); ++it)
-        nomes.insert(it.key());
-    campos.compactar();
-}
-
 void CEItemLista::paraLisp() const {
     // The texts are not copied: the host builds `reg` straight from them.
     std::vector<zvsdk::StringPair> pares;

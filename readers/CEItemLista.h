@@ -30,9 +30,9 @@ public:
     void copiarCampos(const CEItemLista& origem);
     // Each source field under "key_suffix"; an empty suffix keeps the keys.
     void copiarCamposComSufixo(const CEItemLista& origem, const QString& sufixo);
-    // Puts the field names in `nomes` and gives back the spare room of the item's fields (the
-    // names themselves are kept once for the whole program).
-    void partilharNomes(QSet<QString>& nomes);
+    // Gives back the spare room of the item's fields once it is complete (the names
+    // themselves are kept once for the whole program).
+    void partilharNomes() { campos.compactar(); }
     // Publishes the item to LISP: `reg` the fields as an association list, `ename` the
     // first object (left as it was when the item has none).
     void paraLisp() const;

@@ -14,6 +14,8 @@ constexpr std::uint32_t kSemNumero = std::numeric_limits<std::uint32_t>::max();
 struct TabelaNomes {
     std::deque<QString> textos;  // stable addresses: iterators hand out references
     QHash<QString, std::uint32_t> numeros;
+    // By suffix: the number of each name with the suffix, kSemNumero until first asked.
+    QHash<QString, std::vector<std::uint32_t>> comSufixo;
 
     std::uint32_t procura(const QString& nome) const { return numeros.value(nome, kSemNumero); }
 };
@@ -37,6 +39,33 @@ std::uint32_t CamposItem::numero(const QString& nome) {
     tabela.textos.push_back(nome);
     tabela.numeros.insert(nome, novo);
     return novo;
+}
+
+std::uint32_t CamposItem::numeroComSufixo(std::uint32_t numero, const QString& sufixo) {
+    if (sufixo.isEmpty()) return numero;
+    std::vector<std::uint32_t>& numeros = Tabela().comSufixo[sufixo];
+    if (numero >= numeros.size()) numeros.resize(numero + 1, kSemNumero);
+    if (numeros[numero] == kSemNumero) numeros[numero] = CamposItem::numero(nome(numero) + sufixo);
+    return numeros[numero];
+}
+
+void CamposItem::renomearComSufixo(std::vector<Campo>& lote, const QString& sufixo) {
+    if (sufixo.isEmpty()) return;
+    std::vector<std::uint32_t>& numeros = Tabela().comSufixo[sufixo];
+    for (Campo& campo : lote) {
+        if (campo.nome >= numeros.size()) numeros.resize(campo.nome + 1, kSemNumero);
+        std::uint32_t& novo = numeros[campo.nome];
+        // numero() may grow the name table but not this suffix's array.
+        if (novo == kSemNumero) novo = numero(nome(campo.nome) + sufixo);
+        campo.nome = novo;
+    }
+    std::sort(lote.begin(), lote.end(),
+              [](const Campo& a, const Campo& b) { return a.nome < b.nome; });
+}
+
+const QString* CamposItem::procura(std::uint32_t numero) const {
+    const auto it = lugar(numero);
+    return it != campos_.end() && it->nome == numero ? &it->valor : nullptr;
 }
 
 std::vector<CamposItem::Campo>::const_iterator CamposItem::lugar(std::uint32_t numero) const {
@@ -100,23 +129,35 @@ int CamposItem::remove(const QString& chave) {
 }
 
 void CamposItem::juntar(const CamposItem& origem) {
-    if (&origem == this) return;
+    if (&origem != this) juntarOrdenados(origem.campos_);
+}
+
+void CamposItem::juntarOrdenados(const std::vector<Campo>& lote) {
     if (campos_.empty()) {
-        campos_ = origem.campos_;
+        campos_ = lote;
         return;
     }
-    // Both arrays are sorted: one merge, the source winning on equal names.
-    std::vector<Campo> juntos;
-    juntos.reserve(campos_.size() + origem.campos_.size());
-    auto a = campos_.begin();
-    auto b = origem.campos_.begin();
-    while (a != campos_.end() || b != origem.campos_.end()) {
-        if (b == origem.campos_.end() || (a != campos_.end() && a->nome < b->nome)) {
-            juntos.push_back(std::move(*a++));
+    // Both arrays are sorted: one merge in place from the back, the batch winning on equal
+    // names, after counting the names both hold.
+    std::size_t repetidos = 0;
+    for (auto a = campos_.cbegin(), b = lote.cbegin(); a != campos_.cend() && b != lote.cend();) {
+        if (a->nome < b->nome)
+            ++a;
+        else if (b->nome < a->nome)
+            ++b;
+        else
+            ++repetidos, ++a, ++b;
+    }
+    std::ptrdiff_t i = std::ptrdiff_t(campos_.size()) - 1;
+    std::ptrdiff_t j = std::ptrdiff_t(lote.size()) - 1;
+    campos_.resize(campos_.size() + lote.size() - repetidos);
+    std::ptrdiff_t k = std::ptrdiff_t(campos_.size()) - 1;
+    while (j >= 0) {
+        if (i >= 0 && campos_[size_t(i)].nome > lote[size_t(j)].nome) {
+            campos_[size_t(k--)] = std::move(campos_[size_t(i--)]);
         } else {
-            if (a != campos_.end() && a->nome == b->nome) ++a;
-            juntos.push_back(*b++);
+            if (i >= 0 && campos_[size_t(i)].nome == lote[size_t(j)].nome) --i;
+            campos_[size_t(k--)] = lote[size_t(j--)];
         }
     }
-    campos_ = std::move(juntos);
 }

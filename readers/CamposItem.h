@@ -55,6 +55,12 @@ public:
     void clear() { campos_.clear(); }
     // Each field of `origem` under the same name, replacing what was there.
     void juntar(const CamposItem& origem);
+    // The fields of `lote`, sorted by name number without repeats, replacing what was there.
+    void juntarOrdenados(const std::vector<Campo>& lote);
+    // The value under a name number, or null; valid until the next change of the fields.
+    const QString* procura(std::uint32_t numero) const;
+    // The fields in name-number order.
+    const std::vector<Campo>& todos() const { return campos_; }
     // Gives back the spare room of the array once the item is complete.
     void compactar() { campos_.shrink_to_fit(); }
 
@@ -69,6 +75,11 @@ public:
     static const QString& nome(std::uint32_t numero);
     // The number of a name, added when new.
     static std::uint32_t numero(const QString& nome);
+    // The number of the name followed by the suffix: readers copy the fields of one entity
+    // under a few suffixes into many items, and the joined names are made once.
+    static std::uint32_t numeroComSufixo(std::uint32_t numero, const QString& sufixo);
+    // Each field of the batch renamed to its name with the suffix, then sorted by number.
+    static void renomearComSufixo(std::vector<Campo>& lote, const QString& sufixo);
 
 private:
     std::vector<Campo>::const_iterator lugar(std::uint32_t numero) const;

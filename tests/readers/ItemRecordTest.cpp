@@ -9,6 +9,7 @@
 
 #include <QSet>
 
+#include <algorithm>
 #include <memory>
 #include <vector>
 
@@ -116,14 +117,12 @@ TEST(ItemRecordTest, CopiesOverwriteAndSuffixGetsItsUnderscore) {
 
 // Items of one run keep one copy of each field name; their fields stay as they were.
 TEST(ItemRecordTest, ItemsOfARunShareTheirFieldNames) {
-    QSet<QString> nomes;
     CEItemLista a, b;
     for (CEItemLista* item : {&a, &b}) {
         item->definirCampo(QString("NUMERO") + "_FIM", item == &a ? "1" : "2");
         item->definirCampo(QString("REGUA"), "X1");
-        item->partilharNomes(nomes);
+        item->partilharNomes();
     }
-    EXPECT_EQ(nomes.size(), 2);
     EXPECT_EQ(a.valorCampo("NUMERO_FIM"), "1");
     EXPECT_EQ(b.valorCampo("NUMERO_FIM"), "2");
     EXPECT_EQ(b.campos.size(), 2);
@@ -186,6 +185,49 @@ TEST(ItemRecordTest, FieldsInAnyOrderAreFoundOverwrittenMergedAndRemoved) {
     ASSERT_NE(semCopia, nullptr);
     EXPECT_EQ(*semCopia, "fica");
     EXPECT_EQ(destino.campo("F3"), nullptr);
+}
+
+// A batch merged into an item: new names go in their place, equal names take the batch's
+// value, the item's other fields stay; names with a suffix are the joined names.
+TEST(ItemRecordTest, ASortedBatchMergesIntoTheFieldsInPlace) {
+    auto numerado = [](const char* nome, const char* valor) {
+        return CamposItem::Campo{CamposItem::numero(nome), valor};
+    };
+    std::vector<CamposItem::Campo> lote{numerado("LOTE_B", "b2"), numerado("LOTE_D", "d2"),
+                                        numerado("LOTE_E", "e2"), numerado("LOTE_A", "a2")};
+    std::sort(lote.begin(), lote.end(),
+              [](const auto& x, const auto& y) { return x.nome < y.nome; });
+    CEItemLista item;
+    item.definirCampo("LOTE_A", "a1");
+    item.definirCampo("LOTE_C", "c1");
+    item.definirCampo("LOTE_E", "e1");
+    item.definirCampo("LOTE_F", "f1");
+    item.campos.juntarOrdenados(lote);
+    EXPECT_EQ(item.campos.size(), 6);
+    const QStringList esperados{"LOTE_A=a2", "LOTE_B=b2", "LOTE_C=c1",
+                                "LOTE_D=d2", "LOTE_E=e2", "LOTE_F=f1"};
+    QStringList vistos;
+    for (auto it = item.campos.constBegin(); it != item.campos.constEnd(); ++it)
+        vistos << it.key() + "=" + it.value();
+    vistos.sort();
+    EXPECT_EQ(vistos, esperados);
+    for (std::size_t i = 1; i < item.campos.todos().size(); ++i)
+        EXPECT_LT(item.campos.todos()[i - 1].nome, item.campos.todos()[i].nome);
+    // Into an empty item, and a batch of names the item all has.
+    CEItemLista vazio;
+    vazio.campos.juntarOrdenados(lote);
+    EXPECT_EQ(vazio.campos.size(), 4);
+    EXPECT_EQ(vazio.valorCampo("LOTE_E"), "e2");
+    vazio.campos.juntarOrdenados(item.campos.todos());
+    EXPECT_EQ(vazio.campos.size(), 6);
+    EXPECT_EQ(vazio.valorCampo("LOTE_C"), "c1");
+
+    const std::uint32_t a = CamposItem::numero("LOTE_A");
+    const std::uint32_t fim = CamposItem::numeroComSufixo(a, "_FIM");
+    EXPECT_EQ(CamposItem::nome(fim), "LOTE_A_FIM");
+    EXPECT_EQ(CamposItem::numeroComSufixo(a, "_FIM"), fim);
+    EXPECT_EQ(CamposItem::numero("LOTE_A_FIM"), fim);
+    EXPECT_EQ(CamposItem::numeroComSufixo(a, ""), a);
 }
 
 // Asking for a name no item ever had does not add it to the program's name table.
