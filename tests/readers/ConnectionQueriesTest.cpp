@@ -350,3 +350,60 @@ TEST_F(ConnectionQueriesTest, TheNearestConnectionAttributeOfAnyLanguageIsCopied
 }
 
 }  // namespace
+
+// ---- what a reader keeps for the run
+
+// A wire's number and an entity's fields are read once; a change to the drawing is seen by
+// the next question.
+TEST_F(ConnectionQueriesTest, KeptNumbersAndFieldsFollowAChangeOfTheDrawing) {
+    zvdb::Polyline* w = fio({{0, 0, 0}, {10, 0, 0}}, "5");
+    zvdb::BlockReference* k = simbolo("NA-1", {50, 50, 0});
+    k->addAttribute("TAG", "K1", {50, 50, 0}, 2.5);
+    auto r = leitor();
+    EXPECT_EQ(r->NumeroDoFio(id(w)), "5");
+    CEItemLista primeiro;
+    r->CopiaEntidade("_FIM", primeiro, id(k), nullptr);
+    EXPECT_EQ(primeiro.valorCampo("TAG_FIM"), "K1");
+
+    w->setXData("KVR_ZV_WIRE",
+                zvsample::XDataItems().text("10006\f1").text("1").text("FIO\f6").tags());
+    k->attribute("TAG")->setTextValue("K2");
+    EXPECT_EQ(r->NumeroDoFio(id(w)), "6");
+    EXPECT_TRUE(r->EhFioNumerado(id(w)));
+    CEItemLista segundo;
+    r->CopiaEntidade("_FIM", segundo, id(k), nullptr);
+    EXPECT_EQ(segundo.valorCampo("TAG_FIM"), "K2");
+}
+
+// A copy gives the item what reading the entity under the suffix gives it: the same fields,
+// the QTD of its own, or "1" only where the item has no QTD under that suffix yet.
+TEST_F(ConnectionQueriesTest, ACopyOfAnEntityEqualsReadingItUnderTheSuffix) {
+    zvdb::BlockReference* k = simbolo("NA-1", {50, 50, 0});
+    k->addAttribute("TAG", "K1", {50, 50, 0}, 2.5);
+    zvdb::BlockReference* q = simbolo("NA-1", {80, 50, 0});
+    q->addAttribute("QTD", "4", {80, 50, 0}, 2.5);
+    zvdb::Polyline* w = fio({{0, 0, 0}, {10, 0, 0}}, "5");
+    auto r = leitor();
+    for (const zvdb::DbObject* entidade : std::initializer_list<const zvdb::DbObject*>{k, q, w}) {
+        for (const QString& antes : {QString(), QString("7")}) {
+            CEItemLista lido, copiado;
+            if (!antes.isEmpty()) {
+                lido.definirCampo("QTD_INI", antes);
+                copiado.definirCampo("QTD_INI", antes);
+            }
+            r->LeEntidade("_INI", lido, id(entidade), nullptr);
+            r->CopiaEntidade("_INI", copiado, id(entidade), nullptr);
+            EXPECT_EQ(copiado.campos.keys(), lido.campos.keys());
+            EXPECT_EQ(copiado.campos.values(), lido.campos.values());
+        }
+    }
+    CEItemLista item;
+    r->CopiaEntidade("_INI", item, id(q), nullptr);
+    EXPECT_EQ(item.valorCampo("QTD_INI"), "4");
+    item.definirCampo("QTD_FIM", "9");
+    r->CopiaEntidade("_FIM", item, id(k), nullptr);
+    EXPECT_EQ(item.valorCampo("QTD_FIM"), "9");
+    r->CopiaEntidade("", item, id(k), nullptr);
+    EXPECT_EQ(item.valorCampo("QTD"), "1");
+    EXPECT_EQ(item.valorCampo("TAG"), "K1");
+}
