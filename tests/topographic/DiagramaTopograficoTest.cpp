@@ -153,7 +153,7 @@ protected:
         Simbolo("RELE_TERMICO", "3007\f1", {{"RELACAO", "-F1"}});           // no file
         Simbolo("CANALETA", "8503\f1", {{"RELACAO", "-W1"}});               // not listed
         Simbolo("MOTOR_TRIFASICO", "7401\f1", {{"RELACAO", "-M1"}});        // no front view
-        Simbolo("PIN-CONECTOR", "9011\f1", {{"RELACAO", "-XS1"}});          // a pin
+        Simbolo("PIN-CONECTOR", "9003\f1", {{"RELACAO", "-XS1"}});          // a pin
         Simbolo("NOTA", "", {{"RELACAO", "-N1"}});                          // no key
         // A contactor drawn inside another block is not in model space.
         Simbolo("BOBINA_CONTATOR", "2001\f1", {{"RELACAO", "-K9"}}, db().createBlock("MACRO"));
@@ -271,7 +271,7 @@ TEST_F(DiagramaTopograficoTest, ListedSymbolsWithAFrontViewFileAreDrawnEachOnce)
     EXPECT_EQ(saida.count("TOPO_RT13.dwg"), 1) << saida.toStdString();
     EXPECT_TRUE(saida.contains("Block file not found; the symbols that use it are left out"));
     EXPECT_TRUE(saida.contains("TOPO_DM4")) << saida.toStdString();
-    EXPECT_FALSE(saida.contains("TOPO_CF15"));  // the pin's view is never looked for
+    EXPECT_FALSE(saida.contains("TOPO_M12F4"));  // the pin's view is never looked for
     EXPECT_TRUE(saida.contains("Topographic diagram drawn. Blocks inserted / pages made: 6 / 2"))
         << saida.toStdString();
 }
