@@ -371,15 +371,26 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
         }
     }
     // Each symbol followed by its accessories, so that an accessory that sorts like its
-    // symbol stands right after it.
-    const auto porSimbolo = [](const QString& a, const QString& b) {
-        const QString sa = a.section('_', -1), sb = b.section('_', -1);
-        if (sa != sb) return sa < sb;
-        const bool aa = a.contains('_'), ab = b.contains('_');
-        return aa != ab ? ab : a < b;
+    // symbol stands right after it. The symbol's handle is cut out once per key.
+    const auto porSimbolo = [](std::vector<QString>& chaves) {
+        std::vector<std::pair<QString, size_t>> ordem;
+        ordem.reserve(chaves.size());
+        for (size_t i = 0; i < chaves.size(); ++i)
+            ordem.emplace_back(chaves[i].section('_', -1), i);
+        std::sort(ordem.begin(), ordem.end(), [&](const auto& a, const auto& b) {
+            if (a.first != b.first) return a.first < b.first;
+            const QString &ca = chaves[a.second], &cb = chaves[b.second];
+            const bool aa = ca.contains('_'), ab = cb.contains('_');
+            return aa != ab ? ab : ca < cb;
+        });
+        std::vector<QString> ordenadas;
+        ordenadas.reserve(chaves.size());
+        for (const auto& [simbolo, i] : ordem)
+            ordenadas.push_back(std::move(chaves[i]));
+        chaves = std::move(ordenadas);
     };
-    std::sort(comuns.begin(), comuns.end(), porSimbolo);
-    std::sort(bornes.begin(), bornes.end(), porSimbolo);
+    porSimbolo(comuns);
+    porSimbolo(bornes);
     VetorItens itensComuns = LeItens(comuns, modelo);
     VetorItens itensBornes = LeItens(bornes, modelo);
     progresso.Definir(40);
