@@ -37,6 +37,8 @@ const char* const kAppRepresentacaoEsq = "KVR_ZV_REPRESENTACAO_ESQ";
 const char* const kAppRepresentacaoAce = "KVR_ZV_REPRESENTACAO_ACE";
 const char* const kAppRepresentacaoAceEsq = "KVR_ZV_REPRESENTACAO_ACE_ESQ";
 const char* const kPassoPadrao = "15";
+// The item's place as read, the last key of the sort.
+const char* const kCampoSequencia = "ZV_TOPO_SEQUENCIA";
 
 // The catalogue type of terminal blocks.
 const char* const kTipoBorne = "5";
@@ -368,6 +370,27 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
             comuns.push_back(chave);
         }
     }
+    // Each symbol followed by its accessories, so that an accessory that sorts like its
+    // symbol stands right after it. The symbol's handle is cut out once per key.
+    const auto porSimbolo = [](std::vector<QString>& chaves) {
+        std::vector<std::pair<QString, size_t>> ordem;
+        ordem.reserve(chaves.size());
+        for (size_t i = 0; i < chaves.size(); ++i)
+            ordem.emplace_back(chaves[i].section('_', -1), i);
+        std::sort(ordem.begin(), ordem.end(), [&](const auto& a, const auto& b) {
+            if (a.first != b.first) return a.first < b.first;
+            const QString &ca = chaves[a.second], &cb = chaves[b.second];
+            const bool aa = ca.contains('_'), ab = cb.contains('_');
+            return aa != ab ? ab : ca < cb;
+        });
+        std::vector<QString> ordenadas;
+        ordenadas.reserve(chaves.size());
+        for (const auto& [simbolo, i] : ordem)
+            ordenadas.push_back(std::move(chaves[i]));
+        chaves = std::move(ordenadas);
+    };
+    porSimbolo(comuns);
+    porSimbolo(bornes);
     VetorItens itensComuns = LeItens(comuns, modelo);
     VetorItens itensBornes = LeItens(bornes, modelo);
     progresso.Definir(40);
@@ -391,8 +414,11 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
         return;
     }
     LePassos(itensBornes);
-    itensComuns.ordenar(p.ordenacao);
-    itensBornes.ordenar(p.ordenacao);
+    // Items that sort alike keep the order above.
+    const QStringList ordenacao =
+        p.ordenacao.isEmpty() ? QStringList() : p.ordenacao + QStringList{kCampoSequencia};
+    itensComuns.ordenar(ordenacao);
+    itensBornes.ordenar(ordenacao);
     LeExtensoes();
     progresso.Definir(50);
 
@@ -538,27 +564,96 @@ void CCDiagramaTopografico::DescartaDesenhados(Candidatos& candidatos) {
     const QString& representacao = parametros_.representacao;
     for (auto it = candidatos.begin(); it != candidatos.end();) {
         bool desenhado = false;
-        for (const auto& [rep, handle] :
-             Pares(CICad::GetXData(it->second.simbolo, kAppRepresentacaoEsq)))
-            if (rep == representacao && !CICad::IdDoHandle(handle).isNull()) desenhado = true;
+        if (it->first.contains('_')) {
+            desenhado = AcessorioDesenhado(it->first, it->second);
+        } else {
+            for (const auto& [rep, handle] :
+                 Pares(CICad::GetXData(it->second.simbolo, kAppRepresentacaoEsq)))
+                if (rep == representacao && !CICad::IdDoHandle(handle).isNull()) desenhado = true;
+        }
         it = desenhado ? candidatos.erase(it) : std::next(it);
     }
+}
+
+bool CCDiagramaTopografico::AcessorioDesenhado(const QString& chave,
+                                               const Candidato& candidato) const {
+    // The symbol's chain names its accessories' blocks; each block says which place of the
+    // symbol's list it shows and with which key (a changed catalogue draws the new one).
+    const QString lugar = chave.section('_', 0, 0);
+    const QString simbolo = chave.section('_', -1);
+    for (const auto& [rep, handle] :
+         Pares(CICad::GetXData(candidato.simbolo, kAppRepresentacaoAceEsq))) {
+        if (rep != parametros_.representacao) continue;
+        const OdDbObjectId bloco = CICad::IdDoHandle(handle);
+        if (bloco.isNull()) continue;
+        const CEListaXData link = CICad::GetXData(bloco, kAppRepresentacaoAce);
+        if (link.size() >= 4 && link[0].texto == rep && link[1].texto == simbolo &&
+            link[2].texto == lugar && link[3].texto == candidato.chave)
+            return true;
+    }
+    return false;
 }
 
 VetorItens CCDiagramaTopografico::LeItens(const std::vector<QString>& chaves, CETemplate& modelo) {
     VetorItens itens;
     for (const QString& chave : chaves) {
-        // An accessory's key is no handle: it has no entity to read an item from.
-        if (chave.contains('_')) continue;
-        const OdDbObjectId id = candidatos_.at(chave).simbolo;
-        if (id.isNull()) continue;
-        std::unique_ptr<CEItemLista> item(CriaItemEntidade(id, modelo));
-        if (!item || item->valorCampo("ZV_LISTA") != "S") continue;
+        const Candidato& candidato = candidatos_.at(chave);
+        if (candidato.simbolo.isNull()) continue;
+        std::unique_ptr<CEItemLista> item;
+        if (chave.contains('_')) {
+            item.reset(LeItemAcessorio(chave, candidato, modelo));
+        } else if (const auto dono = donos_.constFind(chave); dono != donos_.constEnd()) {
+            // Read already for its accessories.
+            if (dono.value()) item = std::make_unique<CEItemLista>(*dono.value());
+        } else {
+            item.reset(CriaItemEntidade(candidato.simbolo, modelo));
+            if (item && item->valorCampo("ZV_LISTA") != "S") item.reset();
+        }
+        if (!item) continue;
         item->definirCampo("HANDLE", chave);
+        item->definirCampo(kCampoSequencia, QString::number(itens.size()));
         itensPorHandle_.insert(chave, item.get());
         itens.push_back(item.release());
     }
     return itens;
+}
+
+CEItemLista* CCDiagramaTopografico::LeItemAcessorio(const QString& chave,
+                                                    const Candidato& candidato,
+                                                    CETemplate& modelo) {
+    const QString simbolo = chave.section('_', -1);
+    auto dono = donos_.constFind(simbolo);
+    if (dono == donos_.constEnd()) {
+        std::shared_ptr<const CEItemLista> lido(CriaItemEntidade(candidato.simbolo, modelo));
+        if (lido && lido->valorCampo("ZV_LISTA") != "S") lido.reset();
+        dono = donos_.insert(simbolo, lido);
+    }
+    // The accessory of a symbol that is not on the lists is not in the panel either.
+    if (!dono.value()) return nullptr;
+    const CEItemLista& origem = *dono.value();
+    auto item = std::make_unique<CEItemLista>();
+    item->ids = origem.ids;
+    // It sits with its owner: the owner's tag, strip, number and page, in every language.
+    for (CampoTraduzido campo :
+         {CampoTraduzido::Relacao, CampoTraduzido::Regua, CampoTraduzido::Numero})
+        for (int idioma = 1; idioma <= 3; ++idioma) {
+            const QString nome = CICad::TagTraduzida(campo, idioma);
+            if (const QString* valor = origem.campo(nome)) item->definirCampo(nome, *valor);
+        }
+    for (const char* nome : {"PAGINA", "GRUPO", "LAYER", "POSICAO"})
+        if (const QString* valor = origem.campo(nome)) item->definirCampo(nome, *valor);
+    // Everything else is the accessory's own.
+    item->definirCampo("ZV_LISTA_TIPO", "ACE");
+    item->definirCampo("ZV_LISTA", Catalogo().ListaComp(candidato.chave, candidato.norma));
+    item->definirCampo("ZV_KEY", candidato.chave);
+    const QString descricao = Catalogo().DescricaoComp(candidato.chave);
+    item->definirCampo("DESCRICAO", descricao);
+    item->definirCampo("TP_DESCRI", descricao);
+    const QString qtd = origem.valorCampo("QTD");
+    item->definirCampo("QTD", qtd.isEmpty() ? QStringLiteral("1") : qtd);
+    LeColunasUsuario(QString(), *item, Catalogo().ColunasComp(candidato.chave));
+    if (item->valorCampo("ZV_LISTA") != "S") return nullptr;
+    return item.release();
 }
 
 void CCDiagramaTopografico::LePassos(const VetorItens& bornes) {
@@ -659,17 +754,25 @@ void CCDiagramaTopografico::Insere(const QString& chave, const QString& layer,
         link.push_back(Texto(candidato->second.chave));
     }
     CICad::SetXData(ref, acessorio ? kAppRepresentacaoAce : kAppRepresentacao, link);
-    LigaSimbolo(candidato->second.simbolo, acessorio, ZVString::DeHandle(ref.handle()));
+    LigaSimbolo(candidato->second.simbolo, prefixo, ZVString::DeHandle(ref.handle()));
 }
 
-void CCDiagramaTopografico::LigaSimbolo(const OdDbObjectId& simbolo, bool acessorio,
+void CCDiagramaTopografico::LigaSimbolo(const OdDbObjectId& simbolo, const QString& lugar,
                                         const QString& bloco) {
     if (simbolo.isNull()) return;  // the block stays unlinked; the next run adds it again
+    const bool acessorio = !lugar.isEmpty();
     const QString aplicacao = acessorio ? kAppRepresentacaoAceEsq : kAppRepresentacaoEsq;
-    // At most one block per representation: a stale pair or this key's old pair goes.
+    // At most one block per representation, and for accessories one per place in the
+    // symbol's list: a stale pair, or the old block of the same one, goes.
     CEListaXData cadeia;
     for (const auto& [rep, ligado] : Pares(CICad::GetXData(simbolo, aplicacao))) {
-        if (rep == parametros_.representacao || CICad::IdDoHandle(ligado).isNull()) continue;
+        const OdDbObjectId id = CICad::IdDoHandle(ligado);
+        if (id.isNull()) continue;
+        if (rep == parametros_.representacao) {
+            if (!acessorio) continue;
+            const CEListaXData link = CICad::GetXData(id, kAppRepresentacaoAce);
+            if (link.size() < 3 || link[2].texto == lugar) continue;
+        }
         cadeia.push_back(Texto(rep));
         cadeia.push_back(Texto(ligado));
     }

@@ -2,7 +2,9 @@
 // The topographic diagram: the physical view of a project. Every listed symbol that has a
 // block of the chosen representation in the catalogue is inserted on new pages of a page
 // group, in rows and pages inside a rectangle of the sheet, and tied to its symbol by
-// extended data both ways, so that a later run adds only what is new.
+// extended data both ways, so that a later run adds only what is new. A symbol's accessories
+// (from the catalogue, or added on the symbol) that have a block of the representation are
+// laid out as blocks of their own, each tied to its symbol and its place in the list.
 #include "readers/CCExportDataReader.h"
 
 #include <QHash>
@@ -10,6 +12,7 @@
 #include <QStringList>
 
 #include <map>
+#include <memory>
 #include <vector>
 
 class CETemplate;
@@ -101,12 +104,20 @@ private:
     void DescartaDesenhados(Candidatos& candidatos);
     // The items of the keys, in key order; those that give none or are not listed fall out.
     VetorItens LeItens(const std::vector<QString>& chaves, CETemplate& modelo);
+    // An accessory's item: its own catalogue fields under its owner's relation, strip,
+    // number and page; none when the owner or the accessory is not listed.
+    CEItemLista* LeItemAcessorio(const QString& chave, const Candidato& candidato,
+                                 CETemplate& modelo);
+    // Is an accessory's block of this representation, for this place in the symbol's list,
+    // still in the drawing?
+    bool AcessorioDesenhado(const QString& chave, const Candidato& candidato) const;
     void LePassos(const VetorItens& bornes);
     void LeExtensoes();
     // Makes the pages of one pass and inserts its blocks.
     void Desenha(const std::vector<Pagina>& paginas, const QHash<QString, CEPonto>& posicoes);
     void Insere(const QString& chave, const QString& layer, const CEPonto& ponto);
-    void LigaSimbolo(const OdDbObjectId& simbolo, bool acessorio, const QString& bloco);
+    // `lugar` is an accessory's place ("*0", "#1"), empty for the symbol's own block.
+    void LigaSimbolo(const OdDbObjectId& simbolo, const QString& lugar, const QString& bloco);
 
     QString Arquivo(const Candidato& candidato) const;
     static QString NomeBloco(const Candidato& candidato);
@@ -117,6 +128,8 @@ private:
     Extensoes extensoes_;
     QHash<QString, double> passos_;
     QHash<QString, CEItemLista*> itensPorHandle_;
+    // The owners of accessories, read once each; null for one that gives no listed item.
+    QHash<QString, std::shared_ptr<const CEItemLista>> donos_;
     CIProgress* progresso_ = nullptr;
     int inseridos_ = 0;
     int paginasCriadas_ = 0;

@@ -35,6 +35,7 @@ struct Insercao {
     double x = 0, y = 0;
     QJsonObject atributos;
     QStringList rep;
+    QStringList ace;  // an accessory's block: representation, symbol, place, key
 };
 
 class DiagramaTopograficoTest : public ::testing::Test {
@@ -148,12 +149,12 @@ protected:
         x11_ = Simbolo("BORNE_PASSAGEM", "1001\f1", {{"REGUA", "X1"}, {"NUMERO", "1"}});
         x12_ = Simbolo("BORNE_PASSAGEM", "1001\f1", {{"REGUA", "X1"}, {"NUMERO", "2"}});
         x21_ = Simbolo("BORNE_SECCIONAVEL", "1007\f1", {{"REGUA", "X2"}, {"NUMERO", "1"}});
-        Simbolo("DISJUNTOR_MOTOR", "3001\f1", {{"RELACAO", "-Q1"}});  // refused file
-        Simbolo("RELE_TERMICO", "3007\f1", {{"RELACAO", "-F1"}});     // no file
-        Simbolo("CANALETA", "8503\f1", {{"RELACAO", "-W1"}});         // not listed
-        Simbolo("MOTOR_TRIFASICO", "7401\f1", {{"RELACAO", "-M1"}});  // no front view
-        Simbolo("PIN-CONECTOR", "9011\f1", {{"RELACAO", "-XS1"}});    // a pin
-        Simbolo("NOTA", "", {{"RELACAO", "-N1"}});                    // no key
+        q1_ = Simbolo("DISJUNTOR_MOTOR", "3001\f1", {{"RELACAO", "-Q1"}});  // refused file
+        Simbolo("RELE_TERMICO", "3007\f1", {{"RELACAO", "-F1"}});           // no file
+        Simbolo("CANALETA", "8503\f1", {{"RELACAO", "-W1"}});               // not listed
+        Simbolo("MOTOR_TRIFASICO", "7401\f1", {{"RELACAO", "-M1"}});        // no front view
+        Simbolo("PIN-CONECTOR", "9003\f1", {{"RELACAO", "-XS1"}});          // a pin
+        Simbolo("NOTA", "", {{"RELACAO", "-N1"}});                          // no key
         // A contactor drawn inside another block is not in model space.
         Simbolo("BOBINA_CONTATOR", "2001\f1", {{"RELACAO", "-K9"}}, db().createBlock("MACRO"));
         // A virtual power supply.
@@ -193,10 +194,15 @@ protected:
         EXPECT_EQ(estado, 0) << saida.toStdString();
         const QJsonObject raiz = QJsonDocument::fromJson(saida.toUtf8()).object();
         esq_.clear();
+        aceEsq_.clear();
         const QJsonObject cadeias = raiz["esq"].toObject();
         for (auto it = cadeias.begin(); it != cadeias.end(); ++it)
             for (const QJsonValue& e : it.value().toArray())
                 esq_[it.key()] << e.toString();
+        const QJsonObject cadeiasAce = raiz["ace_esq"].toObject();
+        for (auto it = cadeiasAce.begin(); it != cadeiasAce.end(); ++it)
+            for (const QJsonValue& e : it.value().toArray())
+                aceEsq_[it.key()] << e.toString();
         for (const QJsonValue& v : raiz["inserts"].toArray()) {
             const QJsonObject o = v.toObject();
             Insercao i{o["handle"].toString(),
@@ -205,9 +211,12 @@ protected:
                        o["x"].toDouble(),
                        o["y"].toDouble(),
                        o["attribs"].toObject(),
+                       {},
                        {}};
             for (const QJsonValue& r : o["rep"].toArray())
                 i.rep << r.toString();
+            for (const QJsonValue& r : o["ace"].toArray())
+                i.ace << r.toString();
             insercoes.push_back(i);
         }
         return insercoes;
@@ -235,9 +244,10 @@ protected:
     zvhost::HostDocument* documento_ = nullptr;
     double x_ = 0;
     zvdb::BlockReference *k1_ = nullptr, *k2_ = nullptr, *x11_ = nullptr, *x12_ = nullptr,
-                         *x21_ = nullptr;
+                         *x21_ = nullptr, *q1_ = nullptr;
     std::uint64_t g1_ = 0;
-    std::map<QString, QStringList> esq_;  // the representation chains by handle
+    std::map<QString, QStringList> esq_;     // the representation chains by handle
+    std::map<QString, QStringList> aceEsq_;  // the accessories' chains by handle
 };
 
 QTemporaryDir* DiagramaTopograficoTest::pasta_ = nullptr;
@@ -261,7 +271,7 @@ TEST_F(DiagramaTopograficoTest, ListedSymbolsWithAFrontViewFileAreDrawnEachOnce)
     EXPECT_EQ(saida.count("TOPO_RT13.dwg"), 1) << saida.toStdString();
     EXPECT_TRUE(saida.contains("Block file not found; the symbols that use it are left out"));
     EXPECT_TRUE(saida.contains("TOPO_DM4")) << saida.toStdString();
-    EXPECT_FALSE(saida.contains("TOPO_CF15"));  // the pin's view is never looked for
+    EXPECT_FALSE(saida.contains("TOPO_M12F4"));  // the pin's view is never looked for
     EXPECT_TRUE(saida.contains("Topographic diagram drawn. Blocks inserted / pages made: 6 / 2"))
         << saida.toStdString();
 }
@@ -423,6 +433,168 @@ TEST_F(DiagramaTopograficoTest, ARectangleSmallerThanEveryBlockGivesEachItsRowAn
     // Each sticks out from the left side, its top on the top side.
     EXPECT_EQ(blocos.at(H(k1_)).x, 0.0);
     EXPECT_EQ(blocos.at(H(k1_)).y, 1.0 - 40.0);
+}
+
+// ---- accessories: the catalogue's (2101 goes with 2001) and those a symbol adds
+
+class AcessoriosTopograficos : public DiagramaTopograficoTest {
+protected:
+    static void SetUpTestSuite() {
+        DiagramaTopograficoTest::SetUpTestSuite();
+        Vista("TOPO_BA11", 10, 40, {{"RELACAO", "?"}, {"ZV_KEY", ""}});  // 2101
+        Vista("TOPO_AUX11", 12, 30, {{"ZV_KEY", ""}});                   // 3006
+    }
+    void SetUp() override {
+        DiagramaTopograficoTest::SetUp();
+        db().registerApplication("ZV_VINC_ADITIVO");
+        // -K1 adds two side contacts; -K2 a motor (no front view) and a duct (not listed).
+        k1_->setXData("ZV_VINC_ADITIVO", XDataItems().text("2").text("3006").tags());
+        k2_->setXData("ZV_VINC_ADITIVO",
+                      XDataItems().text("1").text("7401").text("1").text("8503").tags());
+    }
+    // The accessories' blocks by place and symbol ("#0_2F").
+    static std::map<QString, Insercao> PorAcessorio(const std::vector<Insercao>& todas) {
+        std::map<QString, Insercao> blocos;
+        for (const Insercao& i : todas)
+            if (!i.ace.isEmpty()) {
+                EXPECT_EQ(i.ace.size(), 4) << i.ace.join('|').toStdString();
+                EXPECT_TRUE(i.rep.isEmpty());
+                const QString chave = i.ace.value(2) + "_" + i.ace.value(1);
+                EXPECT_EQ(blocos.count(chave), 0u) << "two blocks for " << chave.toStdString();
+                blocos[chave] = i;
+            }
+        return blocos;
+    }
+    static std::map<QString, QString> Handles(const std::map<QString, Insercao>& blocos) {
+        std::map<QString, QString> handles;
+        for (const auto& [chave, bloco] : blocos)
+            handles[chave] = bloco.handle;
+        return handles;
+    }
+};
+
+TEST_F(AcessoriosTopograficos, AccessoriesWithAFrontViewStandBesideTheirSymbolsWhereTheLayoutSays) {
+    ASSERT_EQ(Executa(), zvsdk::CommandResult::Succeeded) << Saida().toStdString();
+    const auto todas = Salvo();
+    const auto blocos = PorSimbolo(todas);
+    const auto acessorios = PorAcessorio(todas);
+    const QString k1 = H(k1_), k2 = H(k2_), q1 = H(q1_);
+    std::set<QString> lugares;
+    for (const auto& [chave, bloco] : acessorios)
+        lugares.insert(chave);
+    // The catalogue's auxiliary block on both contactors, the two side contacts of -K1, the
+    // catalogue's side contact of -Q1 (whose own view is refused); neither the motor (no
+    // front view) nor the duct (not listed).
+    EXPECT_EQ(lugares,
+              std::set<QString>({"*0_" + k1, "*0_" + k2, "#0_" + k1, "#1_" + k1, "*0_" + q1}));
+    EXPECT_EQ(acessorios.at("*0_" + k1).nome, "TOPO_BA11_1");
+    EXPECT_EQ(acessorios.at("#1_" + k1).nome, "TOPO_AUX11_1");
+    EXPECT_FALSE(Saida().contains("TOPO_M15_4P")) << Saida().toStdString();
+    EXPECT_FALSE(Saida().contains("TOPO_CR4060.dwg")) << Saida().toStdString();
+    EXPECT_TRUE(Saida().contains("Blocks inserted / pages made: 11 / 2")) << Saida().toStdString();
+
+    // Sorted by RELACAO, each accessory with its symbol's: -G1 (30 wide), -K1 (20), its side
+    // contacts (12, 12), its auxiliary block (10) fill the first row: 100 - 84 leaves four
+    // gaps of 4. The row is 50 high (-G1); each block centred on it.
+    const QString g1 = QString::fromStdString(zvsample::handleText(g1_));
+    EXPECT_EQ(blocos.at(g1).x, 0.0);
+    EXPECT_EQ(blocos.at(k1).x, 34.0);
+    EXPECT_EQ(blocos.at(k1).y, 55.0);
+    EXPECT_EQ(acessorios.at("#0_" + k1).x, 58.0);
+    EXPECT_EQ(acessorios.at("#0_" + k1).y, 60.0);
+    EXPECT_EQ(acessorios.at("#1_" + k1).x, 74.0);
+    EXPECT_EQ(acessorios.at("*0_" + k1).x, 90.0);
+    EXPECT_EQ(acessorios.at("*0_" + k1).y, 55.0);
+    // -K2, its auxiliary block and the side contact of -Q1 under the first row (its top at
+    // 100 - 50 - 2 = 48, 40 high): 100 - 42 leaves two gaps of 29.
+    EXPECT_EQ(blocos.at(k2).x, 0.0);
+    EXPECT_EQ(blocos.at(k2).y, 8.0);
+    EXPECT_EQ(acessorios.at("*0_" + k2).x, 49.0);
+    EXPECT_EQ(acessorios.at("*0_" + k2).y, 8.0);
+    EXPECT_EQ(acessorios.at("*0_" + q1).x, 88.0);
+    EXPECT_EQ(acessorios.at("*0_" + q1).y, 13.0);
+    EXPECT_EQ(acessorios.at("*0_" + q1).nome, "TOPO_AUX11_1");
+    for (const auto& [chave, bloco] : acessorios)
+        EXPECT_EQ(bloco.layer, blocos.at(k1).layer) << chave.toStdString();
+}
+
+TEST_F(AcessoriosTopograficos, EachAccessoryBlockAndItsSymbolNameEachOther) {
+    ASSERT_EQ(Executa(), zvsdk::CommandResult::Succeeded) << Saida().toStdString();
+    const auto todas = Salvo();
+    const auto blocos = PorSimbolo(todas);
+    const auto acessorios = PorAcessorio(todas);
+    const QString k1 = H(k1_), k2 = H(k2_);
+    // The block: representation, symbol, place in the symbol's list, the accessory's key.
+    const Insercao& auxiliar = acessorios.at("*0_" + k1);
+    EXPECT_EQ(auxiliar.ace, QStringList({"1", k1, "*0", "2101"}));
+    EXPECT_EQ(acessorios.at("#1_" + k1).ace, QStringList({"1", k1, "#1", "3006"}));
+    // Its attributes: the accessory's own key under its symbol's tag.
+    EXPECT_EQ(auxiliar.atributos["RELACAO"].toString(), "-K1");
+    EXPECT_EQ(auxiliar.atributos["ZV_KEY"].toString(), "2101");
+    EXPECT_EQ(acessorios.at("#0_" + k1).atributos["ZV_KEY"].toString(), "3006");
+    // The symbol: its own block in its chain, its accessories' blocks in the other.
+    EXPECT_EQ(esq_[k1], QStringList({"1", blocos.at(k1).handle}));
+    EXPECT_EQ(aceEsq_[k1], QStringList({"1", acessorios.at("#0_" + k1).handle, "1",
+                                        acessorios.at("#1_" + k1).handle, "1", auxiliar.handle}));
+    EXPECT_EQ(aceEsq_[k2], QStringList({"1", acessorios.at("*0_" + k2).handle}));
+    EXPECT_EQ(aceEsq_[H(q1_)], QStringList({"1", acessorios.at("*0_" + H(q1_)).handle}));
+    EXPECT_EQ(aceEsq_.size(), 3u);
+}
+
+TEST_F(AcessoriosTopograficos, RunsOnTheOutputAddOnlyMissingAccessoriesAndNeverTwice) {
+    ASSERT_EQ(Executa(), zvsdk::CommandResult::Succeeded) << Saida().toStdString();
+    const auto primeira = PorAcessorio(Salvo());
+    ASSERT_EQ(primeira.size(), 5u);
+    const QString k1 = H(k1_), k2 = H(k2_);
+
+    // Keeping the group: all there, nothing drawn.
+    ui_->setAnswer("question:89", "no");
+    EXPECT_EQ(Executa(), zvsdk::CommandResult::Succeeded);
+    EXPECT_TRUE(Saida().contains("Every symbol is on the diagram already; no page was made."));
+    EXPECT_EQ(Handles(PorAcessorio(Salvo())), Handles(primeira));
+
+    // One side contact erased by hand and a new one given to -K2, which is drawn already:
+    // both accessories come, not -K2 again, and the chains keep one block a place.
+    zvdb::DbObject* apagado =
+        db().objectByHandle(primeira.at("#1_" + k1).handle.toULongLong(nullptr, 16));
+    ASSERT_NE(apagado, nullptr);
+    apagado->erase();
+    k2_->setXData(
+        "ZV_VINC_ADITIVO",
+        XDataItems().text("1").text("7401").text("1").text("8503").text("1").text("3006").tags());
+    const size_t simbolos = PorSimbolo(Salvo()).size();
+    ASSERT_EQ(Executa(), zvsdk::CommandResult::Succeeded) << Saida().toStdString();
+    EXPECT_TRUE(Saida().contains("Blocks inserted / pages made: 2 / 1")) << Saida().toStdString();
+    const auto todas = Salvo();
+    const auto segunda = PorAcessorio(todas);
+    EXPECT_EQ(PorSimbolo(todas).size(), simbolos);
+    ASSERT_EQ(segunda.size(), 6u);
+    EXPECT_NE(segunda.at("#1_" + k1).handle, primeira.at("#1_" + k1).handle);
+    EXPECT_EQ(segunda.at("#0_" + k1).handle, primeira.at("#0_" + k1).handle);
+    EXPECT_EQ(segunda.at("#2_" + k2).ace, QStringList({"1", k2, "#2", "3006"}));
+    EXPECT_EQ(aceEsq_[k1],
+              QStringList({"1", segunda.at("#0_" + k1).handle, "1", segunda.at("*0_" + k1).handle,
+                           "1", segunda.at("#1_" + k1).handle}));
+    EXPECT_EQ(aceEsq_[k2], QStringList({"1", segunda.at("*0_" + k2).handle, "1",
+                                        segunda.at("#2_" + k2).handle}));
+
+    // Deleting the group draws them all again, each once; old pairs don't linger.
+    ui_->setAnswer("question:89", "yes");
+    ASSERT_EQ(Executa(), zvsdk::CommandResult::Succeeded) << Saida().toStdString();
+    const auto terceira = PorAcessorio(Salvo());
+    ASSERT_EQ(terceira.size(), 6u);
+    for (const auto& [chave, bloco] : terceira)
+        EXPECT_NE(bloco.handle, segunda.at(chave).handle) << chave.toStdString();
+    EXPECT_EQ(aceEsq_[k1].size(), 6);
+    EXPECT_EQ(aceEsq_[k2].size(), 4);
+}
+
+TEST_F(AcessoriosTopograficos, AnAccessoryWhoseSymbolIsNotListedIsLeftOutWithIt) {
+    // A duct, not on the lists, that adds a side contact: neither is drawn.
+    Simbolo("CANALETA", "8503\f1", {{"RELACAO", "-W2"}})
+        ->setXData("ZV_VINC_ADITIVO", XDataItems().text("1").text("3006").tags());
+    ASSERT_EQ(Executa(), zvsdk::CommandResult::Succeeded) << Saida().toStdString();
+    EXPECT_EQ(PorAcessorio(Salvo()).size(), 5u);
 }
 
 }  // namespace

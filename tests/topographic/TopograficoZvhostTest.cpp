@@ -20,9 +20,12 @@ namespace {
 
 struct Diagrama {
     bool ok = false;
-    std::map<QString, QString> blocoDoSimbolo;  // symbol handle -> block handle
-    std::map<QString, QString> paginaDoBloco;   // block handle -> layer
-    std::map<QString, QStringList> esq;         // symbol handle -> its representation chain
+    std::map<QString, QString> blocoDoSimbolo;    // symbol handle -> block handle
+    std::map<QString, QString> paginaDoBloco;     // block handle -> layer
+    std::map<QString, QStringList> esq;           // symbol handle -> its representation chain
+    std::map<QString, QString> blocoDoAcessorio;  // place "_" symbol handle -> block handle
+    std::map<QString, QString> chaveDoAcessorio;  // place "_" symbol handle -> catalogue key
+    std::map<QString, QStringList> aceEsq;        // symbol handle -> its accessories' chain
     std::set<QString> handles;
 };
 
@@ -71,7 +74,22 @@ protected:
                 d.blocoDoSimbolo[simbolo] = handle;
                 d.paginaDoBloco[handle] = o["layer"].toString();
             }
+            // An accessory's block: representation, symbol, place, key.
+            const QJsonArray ace = o["ace"].toArray();
+            if (ace.size() == 4 && ace[0].toString() == "1") {
+                const QString lugar = ace[2].toString() + "_" + ace[1].toString();
+                EXPECT_EQ(d.blocoDoAcessorio.count(lugar), 0u)
+                    << "two blocks for " << lugar.toStdString();
+                d.blocoDoAcessorio[lugar] = handle;
+                d.chaveDoAcessorio[lugar] = ace[3].toString();
+                d.paginaDoBloco[handle] = o["layer"].toString();
+            }
         }
+        const QJsonObject cadeiasAce =
+            QJsonDocument::fromJson(saida.toUtf8()).object()["ace_esq"].toObject();
+        for (auto it = cadeiasAce.begin(); it != cadeiasAce.end(); ++it)
+            for (const QJsonValue& e : it.value().toArray())
+                d.aceEsq[it.key()] << e.toString();
         const QJsonObject cadeias =
             QJsonDocument::fromJson(saida.toUtf8()).object()["esq"].toObject();
         for (auto it = cadeias.begin(); it != cadeias.end(); ++it)
@@ -101,6 +119,30 @@ TEST_F(TopograficoZvhost, TheDemoTemplateDrawsEveryListedSymbolOnceTiedBothWays)
         EXPECT_EQ(d.esq.at(simbolo), QStringList({"1", bloco})) << simbolo.toStdString();
         paginas.insert(d.paginaDoBloco.at(bloco));
     }
+    // Accessories with a front view: their symbols' chains name exactly their blocks.
+    EXPECT_GT(d.blocoDoAcessorio.size(), 10u);
+    std::map<QString, std::set<QString>> porSimbolo;
+    for (const auto& [lugar, bloco] : d.blocoDoAcessorio) {
+        porSimbolo[lugar.section('_', -1)].insert(bloco);
+        paginas.insert(d.paginaDoBloco.at(bloco));
+    }
+    EXPECT_EQ(porSimbolo.size(), d.aceEsq.size());
+    for (const auto& [simbolo, blocos] : porSimbolo) {
+        const auto achada = d.aceEsq.find(simbolo);
+        const QStringList cadeia = achada == d.aceEsq.end() ? QStringList() : achada->second;
+        std::set<QString> nomeados;
+        for (int i = 0; i + 1 < cadeia.size(); i += 2) {
+            EXPECT_EQ(cadeia[i], "1");
+            nomeados.insert(cadeia[i + 1]);
+        }
+        EXPECT_EQ(nomeados, blocos) << simbolo.toStdString();
+    }
+    // The demo catalogue's end covers of terminals have one; its jumpers don't.
+    std::set<QString> chaves;
+    for (const auto& [lugar, chave] : d.chaveDoAcessorio)
+        chaves.insert(chave);
+    EXPECT_EQ(chaves.count("1101"), 1u);
+    EXPECT_EQ(chaves.count("1102"), 0u);
     // Ordinary blocks and terminals on pages of their own in the template's group.
     EXPECT_GE(paginas.size(), 2u);
     for (const QString& p : paginas)
@@ -120,6 +162,8 @@ TEST_F(TopograficoZvhost, RunsOnItsOwnOutputKeepOrReplaceButNeverDuplicate) {
         << run.out.toStdString();
     const ::Diagrama d2 = Le(mantida);
     EXPECT_EQ(d2.blocoDoSimbolo, d1.blocoDoSimbolo);
+    EXPECT_FALSE(d1.blocoDoAcessorio.empty());
+    EXPECT_EQ(d2.blocoDoAcessorio, d1.blocoDoAcessorio);
     // Delete the group: every symbol drawn again, by new blocks, each once.
     run = Diagrama(primeira, refeita, {"question:89=yes"});
     ASSERT_EQ(run.status, 0) << run.out.toStdString() << run.err.toStdString();
@@ -129,6 +173,9 @@ TEST_F(TopograficoZvhost, RunsOnItsOwnOutputKeepOrReplaceButNeverDuplicate) {
         EXPECT_EQ(d1.handles.count(bloco), 0u) << bloco.toStdString();
         EXPECT_EQ(d3.esq.at(simbolo), QStringList({"1", bloco}));
     }
+    ASSERT_EQ(d3.blocoDoAcessorio.size(), d1.blocoDoAcessorio.size());
+    for (const auto& [lugar, bloco] : d3.blocoDoAcessorio)
+        EXPECT_EQ(d1.handles.count(bloco), 0u) << lugar.toStdString();
     // Nobody answers the question: the run is cancelled and nothing is saved.
     const QString cancelada = path("r4.dxf");
     run = Diagrama(primeira, cancelada);

@@ -1,7 +1,8 @@
 """Reads a drawing with ezdxf, audits it and prints one JSON object: the layers, and per
 block reference of model space its handle, block, layer, insertion point, attributes and the
-strings of its representation data (KVR_ZV_REPRESENTACAO); and by handle the representation
-chain (KVR_ZV_REPRESENTACAO_ESQ) of every object that has one, Xrecords included. Exit status 1 when the file does not load or the audit
+strings of its representation data (KVR_ZV_REPRESENTACAO, and KVR_ZV_REPRESENTACAO_ACE for an
+accessory's block); and by handle the representation chains (KVR_ZV_REPRESENTACAO_ESQ, and
+KVR_ZV_REPRESENTACAO_ACE_ESQ for accessories) of every object that has one, Xrecords included. Exit status 1 when the file does not load or the audit
 finds errors (they are printed instead).
 """
 import json
@@ -31,13 +32,16 @@ def main():
         inserts.append({"handle": e.dxf.handle, "name": e.dxf.name, "layer": e.dxf.layer,
                         "x": e.dxf.insert.x, "y": e.dxf.insert.y,
                         "attribs": {a.dxf.tag: a.dxf.text for a in e.attribs},
-                        "rep": strings(e, "KVR_ZV_REPRESENTACAO")})
-    esq = {}
+                        "rep": strings(e, "KVR_ZV_REPRESENTACAO"),
+                        "ace": strings(e, "KVR_ZV_REPRESENTACAO_ACE")})
+    esq, ace_esq = {}, {}
     for e in doc.entitydb.values():
         if e.is_alive and e.has_xdata("KVR_ZV_REPRESENTACAO_ESQ"):
             esq[e.dxf.handle] = strings(e, "KVR_ZV_REPRESENTACAO_ESQ")
+        if e.is_alive and e.has_xdata("KVR_ZV_REPRESENTACAO_ACE_ESQ"):
+            ace_esq[e.dxf.handle] = strings(e, "KVR_ZV_REPRESENTACAO_ACE_ESQ")
     print(json.dumps({"layers": [l.dxf.name for l in doc.layers], "inserts": inserts,
-                      "esq": esq}))
+                      "esq": esq, "ace_esq": ace_esq}))
     return 0
 
 
