@@ -667,7 +667,10 @@ CEItemLista* CCDataReader::CriaItemBloco(const OdDbObjectId& referencia, CETempl
     if (ChaveDaEntidade(referencia).isEmpty()) return nullptr;
     auto* item = new CEItemLista;
     item->ids.push_back(referencia);
-    LeBloco(QString(), *item, referencia, &modelo);
+    if (GuardaSimbolos && CICad::EhReferencia(referencia))
+        CopiaEntidade(QString(), *item, referencia, &modelo);
+    else
+        LeBloco(QString(), *item, referencia, &modelo);
     LerLadoIni(*item, referencia, modelo);
     LerLadoFim(*item, referencia, modelo);
     return item;

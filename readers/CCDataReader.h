@@ -117,6 +117,9 @@ public:
     static QString TextoTipo(const QString& tipo);
 
 protected:
+    // The symbols an item is made of are kept for CopiaEntidade: set by the readers that
+    // read them again as neighbours of other symbols (the export reader's sides).
+    bool GuardaSimbolos = false;
     CECacheCatalogo& Catalogo() { return catalogo_; }
     // An item kept for the list shares its field names with the items kept before it.
     void PartilhaNomes(CEItemLista& item) { item.partilharNomes(); }

@@ -314,7 +314,7 @@ void CCExportDataReader::CopiaAtributos(const QString& sufixo, CEItemLista& item
         break;
     }
     const OdDbObjectId final = CICad::IdDoHandle(alvo);
-    if (!final.isNull()) LeEntidade(sufixo, item, final, nullptr);
+    if (!final.isNull()) CopiaEntidade(sufixo, item, final, nullptr);
 }
 
 void CCExportDataReader::CompoeRelacao(const QString& sufixo, CEItemLista& item, CETemplate* modelo,

@@ -271,14 +271,14 @@ void CCMaterialDataReader::LeFios(zvdb::Database* database,
         if (partes.empty()) continue;
         const CEItemLista reserva = *item;
         CEItemLista* atual = item.get();
-        LeEntidade("_INI", *atual, partes.front(), &modelo);
+        CopiaEntidade("_INI", *atual, partes.front(), &modelo);
         for (size_t s = 1; s < partes.size(); ++s) {
-            LeEntidade("_FIM", *atual, partes[s], &modelo);
+            CopiaEntidade("_FIM", *atual, partes[s], &modelo);
             if (s + 1 == partes.size()) break;
             auto* seguinte = new CEItemLista;
             seguinte->campos = reserva.campos;
             seguinte->ids = reserva.ids;
-            LeEntidade("_INI", *seguinte, partes[s], &modelo);
+            CopiaEntidade("_INI", *seguinte, partes[s], &modelo);
             atual->ligado = seguinte;
             atual = seguinte;
         }
