@@ -3,14 +3,24 @@
 #include <cstdio>
 
 QStringList ZVString::Divide(const QString& separadores) const {
+    // Called for every layer name, key and extended-data text a reader meets: plain loops
+    // over the characters, no per-character calls.
+    const QChar* texto = constData();
+    const QChar* sep = separadores.constData();
+    const int n = size(), m = separadores.size();
+    const auto separa = [sep, m](QChar c) {
+        for (int k = 0; k < m; ++k)
+            if (sep[k] == c) return true;
+        return false;
+    };
     QStringList tokens;
     int inicio = -1;
-    for (int i = 0; i <= size(); ++i) {
-        const bool separa = i == size() || separadores.contains(at(i));
-        if (separa && inicio >= 0) {
-            tokens << mid(inicio, i - inicio);
+    for (int i = 0; i <= n; ++i) {
+        const bool corta = i == n || separa(texto[i]);
+        if (corta && inicio >= 0) {
+            tokens << QString(texto + inicio, i - inicio);
             inicio = -1;
-        } else if (!separa && inicio < 0) {
+        } else if (!corta && inicio < 0) {
             inicio = i;
         }
     }
