@@ -36,9 +36,8 @@ void Database::setVersion(std::string_view version) {
 
 DbObject* Database::objectByHandle(std::uint64_t handle) const {
     if (handle == 0) return nullptr;
-    const auto it = byHandle_.find(handle);
-    if (it == byHandle_.end() || it->second->isErased()) return nullptr;
-    return it->second;
+    DbObject* object = byHandle_.find(handle);
+    return object && !object->isErased() ? object : nullptr;
 }
 
 Entity* Database::entityByHandle(std::uint64_t handle) const {
@@ -91,7 +90,7 @@ DbObject* Database::adopt(std::unique_ptr<DbObject> object) {
 
 std::size_t Database::storageBytes() const {
     return arena_.bytesUsed() + fileTags_.capacity() * sizeof(Tag) +
-           storage_.size() * (sizeof(Entity) + 48) + byHandle_.size() * 32;
+           storage_.size() * (sizeof(Entity) + 48) + byHandle_.bytes();
 }
 
 // Tables -----------------------------------------------------------------------------------
@@ -369,11 +368,11 @@ Entity* Database::addEntity(BlockRecord& block, std::string_view type, const std
 
 void Database::ensureSeqend(Entity& parent) {
     if (parent.seqend()) return;
-    auto seqend = DxfLoader::makeOwnedObject(*this,
-                                             entityHead("SEQEND", allocateHandle(), parent.handle(),
-                                                        parent.layer(), parent.inPaperSpace()),
-                                             DxfLoader::Context::Entity);
-    auto* raw = static_cast<Entity*>(adopt(std::move(seqend)));
+    // A SEQEND is hardly ever changed: its few tags go to the arena.
+    const std::vector<Tag> head = entityHead("SEQEND", allocateHandle(), parent.handle(),
+                                             parent.layer(), parent.inPaperSpace());
+    auto* raw =
+        static_cast<Entity*>(adopt(std::make_unique<Entity>(*this, arena_.storeTags(head))));
     parent.setSeqend(raw);
 }
 
@@ -452,10 +451,10 @@ Attribute* Database::addAttributeFromDefinition(BlockReference& reference,
                       "AcDbEntity");
     if (definition.has(6)) TagList::setValue(all, 6, keep(definition.linetype()), "AcDbEntity");
 
-    // Tags of their own at their exact size: the attribute is rarely changed afterwards.
-    auto made = std::make_unique<Attribute>(*this, std::span<const Tag>());
-    made->takeTags(std::vector<Tag>(all.begin(), all.end()));
-    auto* attribute = static_cast<Attribute*>(adopt(std::move(made)));
+    // The tags go to the arena at their exact size: an attribute's later changes are mostly
+    // new values, made in place; one that gains a tag takes a list of its own then.
+    auto* attribute =
+        static_cast<Attribute*>(adopt(std::make_unique<Attribute>(*this, arena_.storeTags(all))));
     reference.addSubEntity(attribute);
     if (reference.integer(66) != 1) reference.setInteger(66, 1, "AcDbBlockReference");
     ensureSeqend(reference);

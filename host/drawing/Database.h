@@ -7,6 +7,7 @@
 // A new Database is an empty drawing (AC1027). DxfLoader reads one from a file and
 // DxfWriter writes it back; objects we do not know are kept as their tags.
 #include "Geometry.h"
+#include "HandleIndex.h"
 #include "HeaderVariables.h"
 #include "StringArena.h"
 #include "Tag.h"
@@ -167,7 +168,7 @@ private:
     HeaderVariables header_;
     std::vector<Tag> fileTags_;
     std::vector<std::unique_ptr<DbObject>> storage_;
-    std::unordered_map<std::uint64_t, DbObject*> byHandle_;
+    HandleIndex byHandle_;
     std::uint64_t nextHandle_ = 1;
     std::vector<std::unique_ptr<SymbolTable>> tables_;
     std::vector<DbObject*> objects_;

@@ -204,9 +204,20 @@ std::size_t DbObject::subclassEnd(std::string_view subclass) const {
     return TagList::subclassEnd(tags(), subclass);
 }
 
+Tag& DbObject::tagForValue(std::size_t index) {
+    database_->noteChange();
+    // The tags outside own_ are this object's alone (its range of the file's tag list or of
+    // the arena), so a value changes there without a copy of the list.
+    return owned_ ? own_[index] : const_cast<Tag*>(fileTags_)[index];
+}
+
 void DbObject::setTagValue(int code, std::string_view value, std::string_view subclass) {
+    const int i = indexOf(code);
     const std::string_view stored = store(value);
-    TagList::setValue(editTags(), code, stored, subclass);
+    if (i >= 0)
+        tagForValue(static_cast<std::size_t>(i)).value = stored;
+    else
+        TagList::setValue(editTags(), code, stored, subclass);
 }
 
 void DbObject::setText(int code, std::string_view value, std::string_view subclass) {
@@ -225,7 +236,18 @@ void DbObject::setPoint(int code, const Point3& p, std::string_view subclass, bo
     const std::string_view values[3] = {
         store(TagValues::fromReal(p.x)), store(TagValues::fromReal(p.y)),
         withZ ? store(TagValues::fromReal(p.z)) : std::string_view()};
-    TagList::setPoint(editTags(), code, values, subclass, withZ);
+    const int i = indexOf(code);
+    const auto all = tags();
+    const std::size_t axes = withZ ? 3 : 2;
+    bool whole = i >= 0 && static_cast<std::size_t>(i) + axes <= all.size();
+    for (std::size_t axis = 1; whole && axis < axes; ++axis)
+        whole = all[static_cast<std::size_t>(i) + axis].code == code + 10 * static_cast<int>(axis);
+    if (!whole) {
+        TagList::setPoint(editTags(), code, values, subclass, withZ);
+        return;
+    }
+    for (std::size_t axis = 0; axis < axes; ++axis)
+        tagForValue(static_cast<std::size_t>(i) + axis).value = values[axis];
 }
 
 void DbObject::removeAll(int code) {
