@@ -14,7 +14,6 @@
 #include "XRecord.h"
 
 #include <atomic>
-#include <cmath>
 
 namespace zvdb {
 
