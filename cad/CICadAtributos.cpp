@@ -12,6 +12,7 @@
 
 #include <array>
 #include <exception>
+#include <vector>
 
 using namespace cicad;
 
@@ -47,7 +48,8 @@ void CICad::GetAtributos(const OdDbObjectId& referencia,
     lista.reset();
     auto* ref = Como<zvdb::BlockReference>(referencia);
     if (!ref) return;
-    const OdDbObjectId bloco = Id(ref->definition());
+    // The definition is looked up by name: only when prompts or defaults are asked for.
+    const OdDbObjectId bloco = comPrompts || usarPadroes ? Id(ref->definition()) : OdDbObjectId();
     lista = std::make_unique<zv::CEListaAtributos>();
     for (zvdb::Attribute* atributo : ref->attributes()) {
         QString tag = Q(atributo->tag());
@@ -225,8 +227,10 @@ void CICad::CriarAtributos(const OdDbObjectId& definicao, const OdDbObjectId& re
         auto* bloco = Como<zvdb::BlockRecord>(definicao);
         auto* ref = Como<zvdb::BlockReference>(referencia);
         if (!bloco || !ref) return;
+        std::vector<const zvdb::Attribute*> definicoes;
         for (zvdb::Attribute* def : bloco->attributeDefinitions())
-            if (!def->isConstant()) ref->addAttributeFromDefinition(*def);
+            if (!def->isConstant()) definicoes.push_back(def);
+        ref->addAttributesFromDefinitions(definicoes);
     } catch (const std::exception& erro) {
         Log("CICAd::CriarAtributos: " + QString::fromUtf8(erro.what()));
     }

@@ -55,36 +55,22 @@ Attribute* BlockReference::addAttribute(std::string_view tag, std::string_view v
 }
 
 Attribute* BlockReference::addAttributeFromDefinition(const Attribute& definition) {
-    const Transform t = transform();
-    std::vector<Tag> body;
-    const auto all = definition.tags();
-    const std::size_t end = definition.xdataStart();
-    bool started = false;
-    for (std::size_t i = 1; i < end; ++i) {
-        const Tag& tag = all[i];
-        if (tag.code == 100 && tag.value == "AcDbText") started = true;
-        if (!started) continue;
-        if (tag.code == 100 && tag.value == "AcDbText") continue;
-        if (tag.code == 100 && tag.value == "AcDbAttributeDefinition") {
-            body.push_back(Tag{100, "AcDbAttribute"});
-            continue;
-        }
-        if (tag.code == 3) continue;  // the prompt belongs to the definition
-        body.push_back(tag);
-    }
-    // A definition of the same drawing lends its values as they are; the marker put in is a
-    // literal, which lives as long as any drawing.
-    Attribute* attribute = database().addAttribute(*this, body, definition.layer(),
-                                                   &definition.database() == &database());
-    attribute->setPosition(t.apply(definition.position()));
-    if (definition.has(11)) attribute->setPoint(11, t.apply(definition.point(11)), "AcDbText");
-    const double s = scale().y;
-    attribute->setReal(40, definition.height() * std::abs(s), "AcDbText");
-    if (rotation() != 0.0 || definition.rotation() != 0.0)
-        attribute->setReal(50, definition.rotation() + rotation(), "AcDbText");
-    attribute->setColor(definition.color());
-    if (definition.has(6)) attribute->setLinetype(definition.linetype());
-    return attribute;
+    const Attribute* const one[1] = {&definition};
+    return addAttributesFromDefinitions(one).front();
+}
+
+std::vector<Attribute*> BlockReference::addAttributesFromDefinitions(
+    std::span<const Attribute* const> definitions) {
+    std::vector<Attribute*> made;
+    if (definitions.empty()) return made;
+    made.reserve(definitions.size());
+    const Transform placement = transform();
+    const double heightScale = std::abs(scale().y);
+    const double degrees = rotation();
+    for (const Attribute* definition : definitions)
+        made.push_back(database().addAttributeFromDefinition(*this, *definition, placement,
+                                                             heightScale, degrees));
+    return made;
 }
 
 }  // namespace zvdb

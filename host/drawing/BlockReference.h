@@ -2,6 +2,8 @@
 // An INSERT: a reference to a block definition, with its attributes.
 #include "Entity.h"
 
+#include <span>
+
 namespace zvdb {
 
 class Attribute;
@@ -32,6 +34,9 @@ public:
     // A new attribute made from a definition of the block: its properties, placed by the
     // reference's transform, with the definition's default value.
     Attribute* addAttributeFromDefinition(const Attribute& definition);
+    // The same for several definitions at once (the placement is worked out once), in order.
+    std::vector<Attribute*> addAttributesFromDefinitions(
+        std::span<const Attribute* const> definitions);
 };
 
 }  // namespace zvdb

@@ -9,6 +9,7 @@
 #include "LayerRecord.h"
 #include "Polyline.h"
 #include "SymbolTable.h"
+#include "TagList.h"
 #include "TagValues.h"
 #include "XRecord.h"
 
@@ -34,9 +35,8 @@ void Database::setVersion(std::string_view version) {
 
 DbObject* Database::objectByHandle(std::uint64_t handle) const {
     if (handle == 0) return nullptr;
-    const auto it = byHandle_.find(handle);
-    if (it == byHandle_.end() || it->second->isErased()) return nullptr;
-    return it->second;
+    DbObject* object = byHandle_.find(handle);
+    return object && !object->isErased() ? object : nullptr;
 }
 
 Entity* Database::entityByHandle(std::uint64_t handle) const {
@@ -54,6 +54,7 @@ void Database::noteChange() {
 
 void Database::swapContents(Database& other) {
     std::swap(arena_, other.arena_);
+    shared_.swap(other.shared_);
     header_.swap(other.header_);
     fileTags_.swap(other.fileTags_);
     storage_.swap(other.storage_);
@@ -88,7 +89,7 @@ DbObject* Database::adopt(std::unique_ptr<DbObject> object) {
 
 std::size_t Database::storageBytes() const {
     return arena_.bytesUsed() + fileTags_.capacity() * sizeof(Tag) +
-           storage_.size() * (sizeof(Entity) + 48) + byHandle_.size() * 32;
+           storage_.size() * (sizeof(Entity) + 48) + byHandle_.bytes();
 }
 
 // Tables -----------------------------------------------------------------------------------
@@ -366,11 +367,11 @@ Entity* Database::addEntity(BlockRecord& block, std::string_view type, const std
 
 void Database::ensureSeqend(Entity& parent) {
     if (parent.seqend()) return;
-    auto seqend = DxfLoader::makeOwnedObject(*this,
-                                             entityHead("SEQEND", allocateHandle(), parent.handle(),
-                                                        parent.layer(), parent.inPaperSpace()),
-                                             DxfLoader::Context::Entity);
-    auto* raw = static_cast<Entity*>(adopt(std::move(seqend)));
+    // A SEQEND is hardly ever changed: its few tags go to the arena.
+    const std::vector<Tag> head = entityHead("SEQEND", allocateHandle(), parent.handle(),
+                                             parent.layer(), parent.inPaperSpace());
+    auto* raw =
+        static_cast<Entity*>(adopt(std::make_unique<Entity>(*this, arena_.storeTags(head))));
     parent.setSeqend(raw);
 }
 
@@ -384,6 +385,75 @@ Attribute* Database::addAttribute(BlockReference& reference, const std::vector<T
         tags.push_back(Tag{tag.code, stored ? tag.value : store(tag.value)});
     auto* attribute = static_cast<Attribute*>(
         adopt(DxfLoader::makeOwnedObject(*this, std::move(tags), DxfLoader::Context::Entity)));
+    reference.addSubEntity(attribute);
+    if (reference.integer(66) != 1) reference.setInteger(66, 1, "AcDbBlockReference");
+    ensureSeqend(reference);
+    return attribute;
+}
+
+std::string_view Database::storeShared(std::string_view text) {
+    constexpr std::size_t kSlots = 4096;
+    if (text.size() > 24) return store(text);
+    if (shared_.empty()) shared_.resize(kSlots);
+    std::size_t hash = 14695981039346656037ull;
+    for (const char c : text)
+        hash = (hash ^ static_cast<unsigned char>(c)) * 1099511628211ull;
+    std::string_view& slot = shared_[hash % kSlots];
+    if (slot != text) slot = store(text);
+    return slot;
+}
+
+Attribute* Database::addAttributeFromDefinition(BlockReference& reference,
+                                                const Attribute& definition,
+                                                const Transform& placement, double heightScale,
+                                                double rotation) {
+    // The tags come out as making a bare attribute and setting its properties one by one
+    // would leave them, without the searches and copies of each step.
+    const bool sameDrawing = &definition.database() == this;
+    const auto keep = [&](std::string_view value) { return sameDrawing ? value : store(value); };
+    const auto real = [&](double value) { return storeShared(TagValues::fromReal(value)); };
+    std::vector<Tag>& all = scratch_;
+    all.clear();
+    const std::uint64_t handle = allocateHandle();
+    all.push_back(Tag{0, "ATTRIB"});
+    all.push_back(Tag{5, store(TagValues::fromHandle(handle))});
+    all.push_back(Tag{330, store(TagValues::fromHandle(reference.handle()))});
+    all.push_back(Tag{100, "AcDbEntity"});
+    if (reference.inPaperSpace()) all.push_back(Tag{67, "1"});
+    const std::string_view layer = definition.layer();
+    all.push_back(Tag{8, layer.empty() ? std::string_view("0") : keep(layer)});
+    all.push_back(Tag{100, "AcDbText"});
+    const auto source = definition.tags();
+    const std::size_t end = definition.xdataStart();
+    bool started = false;
+    for (std::size_t i = 1; i < end; ++i) {
+        const Tag& tag = source[i];
+        const bool textMarker = tag.code == 100 && tag.value == "AcDbText";
+        started = started || textMarker;
+        if (!started || textMarker || tag.code == 3) continue;  // the prompt stays behind
+        if (tag.code == 100 && tag.value == "AcDbAttributeDefinition")
+            all.push_back(Tag{100, "AcDbAttribute"});
+        else
+            all.push_back(Tag{tag.code, keep(tag.value)});
+    }
+    const auto setPoint = [&](int code, const Point3& p) {
+        const std::string_view values[3] = {real(p.x), real(p.y), real(p.z)};
+        TagList::setPoint(all, code, values, "AcDbText");
+    };
+    setPoint(10, placement.apply(definition.position()));
+    if (definition.has(11)) setPoint(11, placement.apply(definition.point(11)));
+    TagList::setValue(all, 40, real(definition.height() * heightScale), "AcDbText");
+    const double ownRotation = definition.rotation();
+    if (rotation != 0.0 || ownRotation != 0.0)
+        TagList::setValue(all, 50, real(ownRotation + rotation), "AcDbText");
+    TagList::setValue(all, 62, storeShared(TagValues::fromInteger(definition.color())),
+                      "AcDbEntity");
+    if (definition.has(6)) TagList::setValue(all, 6, keep(definition.linetype()), "AcDbEntity");
+
+    // The tags go to the arena at their exact size: an attribute's later changes are mostly
+    // new values, made in place; one that gains a tag takes a list of its own then.
+    auto* attribute =
+        static_cast<Attribute*>(adopt(std::make_unique<Attribute>(*this, arena_.storeTags(all))));
     reference.addSubEntity(attribute);
     if (reference.integer(66) != 1) reference.setInteger(66, 1, "AcDbBlockReference");
     ensureSeqend(reference);

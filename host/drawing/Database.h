@@ -7,6 +7,7 @@
 // A new Database is an empty drawing (AC1027). DxfLoader reads one from a file and
 // DxfWriter writes it back; objects we do not know are kept as their tags.
 #include "Geometry.h"
+#include "HandleIndex.h"
 #include "HeaderVariables.h"
 #include "StringArena.h"
 #include "Tag.h"
@@ -119,9 +120,18 @@ public:
     // `stored`: the body's values are already held by this database (they are not copied).
     Attribute* addAttribute(BlockReference& reference, const std::vector<Tag>& body,
                             std::string_view layer, bool stored = false);
+    // A new attribute of `reference` made from a block's definition: its properties, placed
+    // by `placement` (the reference's transform), its height scaled by `heightScale` and
+    // `rotation` degrees added to its own. Its tags are made whole before it is adopted.
+    Attribute* addAttributeFromDefinition(BlockReference& reference, const Attribute& definition,
+                                          const Transform& placement, double heightScale,
+                                          double rotation);
     Entity* addVertex(Polyline& polyline, const Point3& p);
     StringArena& arena() { return arena_; }
     std::string_view store(std::string_view text) { return arena_.store(text); }
+    // As store, for short values that come back often (coordinates, colours): a value held
+    // already is answered again instead of being copied.
+    std::string_view storeShared(std::string_view text);
 
     // Memory held by tag storage, for the benchmarks.
     std::size_t storageBytes() const;
@@ -158,7 +168,7 @@ private:
     HeaderVariables header_;
     std::vector<Tag> fileTags_;
     std::vector<std::unique_ptr<DbObject>> storage_;
-    std::unordered_map<std::uint64_t, DbObject*> byHandle_;
+    HandleIndex byHandle_;
     std::uint64_t nextHandle_ = 1;
     std::vector<std::unique_ptr<SymbolTable>> tables_;
     std::vector<DbObject*> objects_;
@@ -166,6 +176,10 @@ private:
     std::vector<std::string> sectionOrder_;
     std::vector<std::string> warnings_;
     std::uint64_t namedObjects_ = 0;
+    // The values storeShared handed out lately, by a hash of their text.
+    std::vector<std::string_view> shared_;
+    // Room where new objects' tags are put together before they get their own.
+    std::vector<Tag> scratch_;
     std::uint64_t changes_ = 0;
     std::uint64_t contentId_ = 0;
 };

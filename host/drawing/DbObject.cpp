@@ -2,6 +2,7 @@
 
 #include "Database.h"
 #include "Dictionary.h"
+#include "TagList.h"
 #include "TagValues.h"
 
 #include <algorithm>
@@ -160,40 +161,11 @@ std::size_t DbObject::appGroupEnd(std::string_view group) const {
 }
 
 std::size_t DbObject::xdataStart() const {
-    const auto all = tags();
-    // Extended data is the run of codes 1000 and above at the end, opened by a 1001; an
-    // Xrecord's own data stays below 1000, so the rule holds for it too.
-    std::size_t start = all.size();
-    while (start > 1 && all[start - 1].code >= 1000)
-        --start;
-    while (start < all.size() && all[start].code != 1001)
-        ++start;
-    return start;
+    return TagList::xdataStart(tags());
 }
 
 int DbObject::indexOf(int code, std::size_t from) const {
-    const auto all = tags();
-    // The extended data's start is looked for only when a tag of 1000 or above is reached:
-    // below the first such tag there is no extended data.
-    std::size_t end = all.size();
-    bool endKnown = code >= 1000;
-    bool inGroup = false;
-    for (std::size_t i = 1; i < end; ++i) {
-        const Tag& tag = all[i];
-        if (!endKnown && tag.code >= 1000) {
-            end = xdataStart();
-            endKnown = true;
-            if (i >= end) break;
-        }
-        if (opensGroup(tag)) {
-            inGroup = true;
-        } else if (closesGroup(tag)) {
-            inGroup = false;
-        } else if (!inGroup && tag.code == code && i >= from) {
-            return static_cast<int>(i);
-        }
-    }
-    return -1;
+    return TagList::indexOf(tags(), code, from);
 }
 
 std::string_view DbObject::text(int code, std::string_view fallback) const {
@@ -229,31 +201,23 @@ std::uint64_t DbObject::handleAt(int code) const {
 }
 
 std::size_t DbObject::subclassEnd(std::string_view subclass) const {
-    const auto all = tags();
-    const std::size_t end = xdataStart();
-    if (subclass.empty()) return end;
-    for (std::size_t i = 1; i < end; ++i) {
-        if (all[i].code == 100 && all[i].value == subclass) {
-            std::size_t k = i + 1;
-            while (k < end && all[k].code != 100)
-                ++k;
-            return k;
-        }
-    }
-    return end;
+    return TagList::subclassEnd(tags(), subclass);
+}
+
+Tag& DbObject::tagForValue(std::size_t index) {
+    database_->noteChange();
+    // The tags outside own_ are this object's alone (its range of the file's tag list or of
+    // the arena), so a value changes there without a copy of the list.
+    return owned_ ? own_[index] : const_cast<Tag*>(fileTags_)[index];
 }
 
 void DbObject::setTagValue(int code, std::string_view value, std::string_view subclass) {
     const int i = indexOf(code);
     const std::string_view stored = store(value);
-    if (i >= 0) {
-        editTags()[static_cast<std::size_t>(i)].value = stored;
-        return;
-    }
-    const std::size_t at = subclassEnd(subclass);
-    auto& all = editTags();
-    all.insert(all.begin() + static_cast<std::ptrdiff_t>(at),
-               Tag{static_cast<std::int16_t>(code), stored});
+    if (i >= 0)
+        tagForValue(static_cast<std::size_t>(i)).value = stored;
+    else
+        TagList::setValue(editTags(), code, stored, subclass);
 }
 
 void DbObject::setText(int code, std::string_view value, std::string_view subclass) {
@@ -269,29 +233,21 @@ void DbObject::setInteger(int code, long long value, std::string_view subclass) 
 }
 
 void DbObject::setPoint(int code, const Point3& p, std::string_view subclass, bool withZ) {
+    const std::string_view values[3] = {
+        store(TagValues::fromReal(p.x)), store(TagValues::fromReal(p.y)),
+        withZ ? store(TagValues::fromReal(p.z)) : std::string_view()};
     const int i = indexOf(code);
-    if (i < 0) {
-        const std::size_t at = subclassEnd(subclass);
-        TagListBuilder builder(database_->arena());
-        builder.point(code, p, withZ);
-        const auto added = builder.take();
-        auto& all = editTags();
-        all.insert(all.begin() + static_cast<std::ptrdiff_t>(at), added.begin(), added.end());
+    const auto all = tags();
+    const std::size_t axes = withZ ? 3 : 2;
+    bool whole = i >= 0 && static_cast<std::size_t>(i) + axes <= all.size();
+    for (std::size_t axis = 1; whole && axis < axes; ++axis)
+        whole = all[static_cast<std::size_t>(i) + axis].code == code + 10 * static_cast<int>(axis);
+    if (!whole) {
+        TagList::setPoint(editTags(), code, values, subclass, withZ);
         return;
     }
-    auto& all = editTags();
-    std::size_t k = static_cast<std::size_t>(i);
-    all[k].value = store(TagValues::fromReal(p.x));
-    const double rest[2] = {p.y, p.z};
-    for (int axis = 0; axis < (withZ ? 2 : 1); ++axis) {
-        const std::int16_t axisCode = static_cast<std::int16_t>(code + 10 * (axis + 1));
-        const std::string_view value = store(TagValues::fromReal(rest[axis]));
-        if (k + 1 < all.size() && all[k + 1].code == axisCode) {
-            all[++k].value = value;
-        } else {
-            all.insert(all.begin() + static_cast<std::ptrdiff_t>(++k), Tag{axisCode, value});
-        }
-    }
+    for (std::size_t axis = 0; axis < axes; ++axis)
+        tagForValue(static_cast<std::size_t>(i) + axis).value = values[axis];
 }
 
 void DbObject::removeAll(int code) {

@@ -1,8 +1,9 @@
 #pragma once
 // One object of a drawing: a table record, an entity or an object of the OBJECTS section.
 // Its tags are the truth; typed classes read and write them, so groups we do not know stay
-// where they were. Tags read from a file are shared with the file buffer until the object
-// is first changed.
+// where they were. Tags read from a file stay in the file's tag list (and those of objects
+// made whole at once in the database's arena) until a tag is added or taken out: a new
+// value for a tag is written where the tag is.
 #include "Geometry.h"
 #include "Tag.h"
 
@@ -99,6 +100,8 @@ protected:
 
 private:
     void setTagValue(int code, std::string_view value, std::string_view subclass);
+    // The tag at `index`, to take a new value where it is.
+    Tag& tagForValue(std::size_t index);
     void cacheIdentity();
 
     Database* database_;

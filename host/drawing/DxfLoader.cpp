@@ -283,7 +283,7 @@ DbObject* DxfLoader::adopt(std::size_t begin, std::size_t end, Context context) 
     const std::uint64_t handle = object->handle();
     // A handle used twice stays with the first object; the later one gets a new handle
     // once every handle of the file is known, as CAD programs recover such files.
-    const bool duplicate = handle != 0 && db_.byHandle_.count(handle) != 0;
+    const bool duplicate = handle != 0 && db_.byHandle_.contains(handle);
     if (duplicate) object->handle_ = 0;
     DbObject* raw = db_.adopt(std::move(object));
     if (duplicate)

@@ -161,8 +161,8 @@ void DxfWriter::writeObject(const DbObject& object) {
 
 bool DxfWriter::isErasedObject(const Tag& pointer) const {
     if (pointer.code != 350 && pointer.code != 360) return false;
-    const auto it = db_.byHandle_.find(TagValues::toHandle(pointer.value));
-    return it != db_.byHandle_.end() && it->second->isErased();
+    const DbObject* object = db_.byHandle_.find(TagValues::toHandle(pointer.value));
+    return object && object->isErased();
 }
 
 void DxfWriter::writeEntity(const Entity& entity) {

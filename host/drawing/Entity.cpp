@@ -11,10 +11,21 @@ BlockRecord* Entity::block() const {
     return dynamic_cast<BlockRecord*>(database().objectByHandle(ownerHandle()));
 }
 
+const std::vector<Entity*>& Entity::subEntities() const {
+    static const std::vector<Entity*> none;
+    return children_ ? children_->subs : none;
+}
+
+Entity::Children& Entity::children() {
+    if (!children_) children_ = std::make_unique<Children>();
+    return *children_;
+}
+
 std::vector<Entity*> Entity::liveSubEntities() const {
+    const std::vector<Entity*>& subs = subEntities();
     std::vector<Entity*> live;
-    live.reserve(subs_.size());
-    for (Entity* sub : subs_)
+    live.reserve(subs.size());
+    for (Entity* sub : subs)
         if (!sub->isErased()) live.push_back(sub);
     return live;
 }
@@ -22,9 +33,9 @@ std::vector<Entity*> Entity::liveSubEntities() const {
 void Entity::erase() {
     if (isErased()) return;
     DbObject::erase();
-    for (Entity* sub : subs_)
+    for (Entity* sub : subEntities())
         sub->erase();
-    if (seqend_) seqend_->erase();
+    if (Entity* end = seqend()) end->erase();
 }
 
 namespace {
@@ -70,7 +81,7 @@ bool Entity::moveBy(const Point3& offset) {
         return true;
     }
     if (type == "POLYLINE") {
-        for (Entity* vertex : subs_)
+        for (Entity* vertex : subEntities())
             vertex->moveBy(offset);
         return true;
     }
@@ -78,19 +89,19 @@ bool Entity::moveBy(const Point3& offset) {
     if (codes.empty()) return false;
     for (int code : codes)
         if (has(code)) setPoint(code, point(code) + move);
-    for (Entity* sub : subs_)
+    for (Entity* sub : subEntities())
         sub->moveBy(offset);
     return true;
 }
 
 void Entity::addSubEntity(Entity* sub) {
     sub->parent_ = this;
-    subs_.push_back(sub);
+    children().subs.push_back(sub);
 }
 
 void Entity::setSeqend(Entity* seqend) {
     seqend->parent_ = this;
-    seqend_ = seqend;
+    children().seqend = seqend;
 }
 
 }  // namespace zvdb

@@ -4,6 +4,9 @@
 // with the closing SEQEND.
 #include "DbObject.h"
 
+#include <memory>
+#include <vector>
+
 namespace zvdb {
 
 class BlockRecord;
@@ -25,9 +28,9 @@ public:
     // The INSERT of an ATTRIB, the POLYLINE of a VERTEX or SEQEND; else null.
     Entity* parent() const { return parent_; }
     // ATTRIBs or VERTEXes, erased ones included; see liveSubEntities().
-    const std::vector<Entity*>& subEntities() const { return subs_; }
+    const std::vector<Entity*>& subEntities() const;
     std::vector<Entity*> liveSubEntities() const;
-    Entity* seqend() const { return seqend_; }
+    Entity* seqend() const { return children_ ? children_->seqend : nullptr; }
     void erase() override;
     // Moves the entity (and its attributes or vertices) by a world offset; false for kinds
     // whose geometry is not known here (they stay where they are).
@@ -43,8 +46,13 @@ protected:
     void setSeqend(Entity* seqend);
 
 private:
-    std::vector<Entity*> subs_;
-    Entity* seqend_ = nullptr;
+    // Held apart: most entities have none, and they are the most numerous objects.
+    struct Children {
+        std::vector<Entity*> subs;
+        Entity* seqend = nullptr;
+    };
+    Children& children();
+    std::unique_ptr<Children> children_;
     Entity* parent_ = nullptr;
 };
 

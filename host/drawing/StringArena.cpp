@@ -1,6 +1,8 @@
 #include "StringArena.h"
 
 #include <cstring>
+#include <memory>
+#include <type_traits>
 
 namespace zvdb {
 
@@ -27,6 +29,31 @@ std::string_view StringArena::store(std::string_view text) {
     cursor_ += text.size();
     left_ -= text.size();
     return result;
+}
+
+std::span<Tag> StringArena::storeTags(std::span<const Tag> tags) {
+    constexpr std::size_t kTagChunk = 4096;
+    static_assert(std::is_trivially_copyable_v<Tag> && alignof(Tag) <= alignof(std::max_align_t));
+    const auto room = [this](std::size_t count) {
+        tagChunks_.push_back(std::make_unique_for_overwrite<std::byte[]>(count * sizeof(Tag)));
+        used_ += count * sizeof(Tag);
+        return reinterpret_cast<Tag*>(tagChunks_.back().get());
+    };
+    if (tags.empty()) return {};
+    Tag* at = nullptr;
+    if (tags.size() > kTagChunk / 8) {
+        at = room(tags.size());
+    } else {
+        if (tags.size() > tagsLeft_) {
+            tagCursor_ = room(kTagChunk);
+            tagsLeft_ = kTagChunk;
+        }
+        at = tagCursor_;
+        tagCursor_ += tags.size();
+        tagsLeft_ -= tags.size();
+    }
+    std::uninitialized_copy(tags.begin(), tags.end(), at);
+    return {at, tags.size()};
 }
 
 std::string_view StringArena::adopt(std::string&& buffer) {

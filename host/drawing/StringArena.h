@@ -1,8 +1,13 @@
 #pragma once
 // Storage for tag values that do not live in a file buffer: values set by the program,
-// decoded text, converted binary values. Nothing is freed before the arena dies, so every
-// view it hands out stays valid for the life of its database.
+// decoded text, converted binary values; and for the tag lists of objects that are made
+// whole at once. Nothing is freed before the arena dies, so every view it hands out stays
+// valid for the life of its database.
+#include "Tag.h"
+
+#include <cstddef>
 #include <memory>
+#include <span>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -14,6 +19,9 @@ public:
     std::string_view store(std::string_view text);
     // Keeps a whole buffer (a file's text) and answers a view of it.
     std::string_view adopt(std::string&& buffer);
+    // A copy of a tag list (its values must be held already), at its exact size, with no
+    // allocation of its own; its owner may change the values in place.
+    std::span<Tag> storeTags(std::span<const Tag> tags);
     std::size_t bytesUsed() const { return used_; }
 
 private:
@@ -21,6 +29,10 @@ private:
     std::vector<std::unique_ptr<std::string>> buffers_;
     char* cursor_ = nullptr;
     std::size_t left_ = 0;
+    // Raw room for tags: a list is copied in whole, so nothing is set beforehand.
+    std::vector<std::unique_ptr<std::byte[]>> tagChunks_;
+    Tag* tagCursor_ = nullptr;
+    std::size_t tagsLeft_ = 0;
     std::size_t used_ = 0;
 };
 

@@ -1,0 +1,34 @@
+#pragma once
+// The objects of a drawing by handle. Handles are given out in sequence from 1, so most of
+// them index a plain table; the few far above the rest (files from other programs) go to a
+// hash map.
+#include <cstdint>
+#include <unordered_map>
+#include <vector>
+
+namespace zvdb {
+
+class DbObject;
+
+class HandleIndex {
+public:
+    // Null when the handle is not in the index (0 never is).
+    DbObject* find(std::uint64_t handle) const;
+    bool contains(std::uint64_t handle) const { return find(handle) != nullptr; }
+    // Adds the object unless the handle is in the index already; false then.
+    bool emplace(std::uint64_t handle, DbObject* object);
+    // Room for this many handles in the table.
+    void reserve(std::size_t count);
+    std::size_t size() const { return count_; }
+    // Memory held, for the benchmarks.
+    std::size_t bytes() const;
+    void swap(HandleIndex& other) noexcept;
+
+private:
+    std::vector<DbObject*> table_;
+    std::unordered_map<std::uint64_t, DbObject*> far_;
+    std::size_t count_ = 0;
+    std::size_t expected_ = 0;
+};
+
+}  // namespace zvdb

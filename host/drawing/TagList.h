@@ -1,0 +1,36 @@
+#pragma once
+// Searches and edits on an object's tag list, shared by DbObject and by the builders that
+// make an object's final tags before it is adopted (so both place a group the same way).
+// Index 0 is the object's type; application groups (102) and extended data (1001 on) are
+// passed over by the searches.
+#include "Tag.h"
+
+#include <cstddef>
+#include <span>
+#include <string_view>
+#include <vector>
+
+namespace zvdb {
+
+class TagList {
+public:
+    // Index of the first extended-data tag (1001), or the tag count.
+    static std::size_t xdataStart(std::span<const Tag> all);
+    // Index of the first tag with the code, outside application groups and before the
+    // extended data, from `from` on; -1 when absent.
+    static int indexOf(std::span<const Tag> all, int code, std::size_t from = 1);
+    // Index after the last tag of `subclass` (a subclass marker, code 100); the start of the
+    // extended data when the subclass is empty or absent.
+    static std::size_t subclassEnd(std::span<const Tag> all, std::string_view subclass);
+
+    // Sets the first tag with the code or adds one at the end of `subclass`; the value is
+    // taken as it is (it must outlive the list).
+    static void setValue(std::vector<Tag>& all, int code, std::string_view value,
+                         std::string_view subclass);
+    // Sets `code`, `code + 10` and, with `withZ`, `code + 20` from `values` (x, y, z),
+    // adding the axes that are missing after the first.
+    static void setPoint(std::vector<Tag>& all, int code, const std::string_view (&values)[3],
+                         std::string_view subclass, bool withZ = true);
+};
+
+}  // namespace zvdb
