@@ -73,7 +73,7 @@ void ConnectionChains::install(DocumentLisp& lisp, const zvproduct::ProductConte
                                                                         ResultBuffer** chain) {
             // without a drawing the usual road fails as the LISP function does
             if (!context.database || !context.database()) return false;
-            *chain = toChain(answers->answer(in, context, kind), details);
+            *chain = toChain(answers->answer(in, context, kind, true), details);
             return true;
         });
     };

@@ -9,7 +9,7 @@
 namespace zvproduct {
 
 std::vector<WireConnections> ConnectionAnswers::answer(zvdb::Database& database, double tolerance,
-                                                       Kind kind) {
+                                                       Kind kind, bool keepOther) {
     std::optional<std::vector<WireConnections>> kept = std::move(kept_);
     kept_.reset();
     if (kept && keptKind_ == kind && stamp_ == DrawingStamp::of(database) &&
@@ -18,6 +18,7 @@ std::vector<WireConnections> ConnectionAnswers::answer(zvdb::Database& database,
     kept.reset();
     const ConnectionFinder finder(database, tolerance);
     std::vector<WireConnections> asked = kind == Kind::Wires ? finder.wires() : finder.cables();
+    if (!keepOther) return asked;
     kept_ = kind == Kind::Wires ? finder.cables() : finder.wires();
     keptKind_ = kind == Kind::Wires ? Kind::Cables : Kind::Wires;
     stamp_ = DrawingStamp::of(database);
@@ -26,10 +27,11 @@ std::vector<WireConnections> ConnectionAnswers::answer(zvdb::Database& database,
 }
 
 std::vector<WireConnections> ConnectionAnswers::answer(zvlisp::Interpreter& lisp,
-                                                       const ProductContext& context, Kind kind) {
+                                                       const ProductContext& context, Kind kind,
+                                                       bool keepOther) {
     zvdb::Database* database = context.database ? context.database() : nullptr;
     if (!database) lisp.fail("no drawing");
-    return answer(*database, tolerance(lisp), kind);
+    return answer(*database, tolerance(lisp), kind, keepOther);
 }
 
 double ConnectionAnswers::tolerance(zvlisp::Interpreter& lisp) {

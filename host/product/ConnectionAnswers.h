@@ -1,9 +1,9 @@
 #pragma once
 // The answers of getConexoesTodosFios and getConexoesTodosCabos for one document. Both come
-// from one index of the drawing (ConnectionFinder), and a reader asks for the two in a row:
-// so the first call works out both kinds and keeps the one not asked for the next call.
-// The kept answer serves only while the drawing and the tolerance are the same, and the
-// next call drops it in any case: nothing big stays behind between commands.
+// from one index of the drawing (ConnectionFinder), and a reader of the module asks for the
+// two in a row: so its call works out both kinds and keeps the one not asked for the next
+// call. The kept answer serves only while the drawing and the tolerance are the same, and
+// the next call drops it in any case: nothing big stays behind between commands.
 #include "ConnectionFinder.h"
 #include "DrawingStamp.h"
 
@@ -23,12 +23,14 @@ class ConnectionAnswers {
 public:
     enum class Kind { Wires, Cables };
 
-    std::vector<WireConnections> answer(zvdb::Database& database, double tolerance, Kind kind);
-    // The same for a LISP call on the context's drawing, at the tolerance that
+    // `keepOther` works out the other kind too and keeps it for the next call.
+    std::vector<WireConnections> answer(zvdb::Database& database, double tolerance, Kind kind,
+                                        bool keepOther = true);
+    // The same for a call on the context's drawing, at the tolerance that
     // *ESPESSURA_BARRAMENTO* sets (0.1 unless a positive number); fails the LISP way when
     // there is no drawing.
     std::vector<WireConnections> answer(zvlisp::Interpreter& lisp, const ProductContext& context,
-                                        Kind kind);
+                                        Kind kind, bool keepOther);
 
     // The text of an entry: the symbol's handle in upper-case hexadecimal, with
     // "#CONNECTION#BLOCK" behind it for `details`; appended to `out`.

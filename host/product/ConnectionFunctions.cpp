@@ -80,21 +80,22 @@ std::unordered_set<std::string> layerNames(Args args, int from) {
 }  // namespace
 
 void installConnectionFunctions(Interpreter& lisp, const ProductContext& context) {
-    // a reader asks for the wires and then the cables: one index of the drawing for both
+    // a LISP caller asks for one kind; the host's module path (see ConnectionAnswers) asks
+    // for both in a row and shares these answers
     auto answers =
         context.connections ? context.connections : std::make_shared<ConnectionAnswers>();
     lisp.define(
         "getConexoesTodosFios",
         [context, answers](Interpreter& in, Args) {
-            return connectionList(answers->answer(in, context, ConnectionAnswers::Kind::Wires),
-                                  true);
+            return connectionList(
+                answers->answer(in, context, ConnectionAnswers::Kind::Wires, false), true);
         },
         0, 0);
     lisp.define(
         "getConexoesTodosCabos",
         [context, answers](Interpreter& in, Args) {
-            return connectionList(answers->answer(in, context, ConnectionAnswers::Kind::Cables),
-                                  false);
+            return connectionList(
+                answers->answer(in, context, ConnectionAnswers::Kind::Cables, false), false);
         },
         0, 0);
     lisp.define(

@@ -53,51 +53,60 @@ protected:
     zvdb::BlockReference* far = nullptr;
     zvdb::Polyline* line = nullptr;
     zvdb::Polyline* lead = nullptr;
+    ConnectionAnswers answers;
 };
 
 TEST_F(ConnectionAnswersTest, TheSecondCallSeesWhatChangedAfterTheFirst) {
-    const std::string cables = show("(getConexoesTodosCabos)");
-    EXPECT_EQ(show("(length (cdr (car (getConexoesTodosCabos))))"), "2");
+    using Kind = ConnectionAnswers::Kind;
+    auto touches = [&](Kind kind, double tolerance = 0.1) {
+        const auto answer = answers.answer(*database, tolerance, kind);
+        return answer.empty() ? -1 : static_cast<int>(answer.front().touches.size());
+    };
+    const std::string cables = summary(answers.answer(*database, 0.1, Kind::Cables));
+    EXPECT_EQ(touches(Kind::Cables), 2);
     // the wires first, then the lead's far end moved off the terminal
-    EXPECT_EQ(show("(length (cdr (car (getConexoesTodosFios))))"), "2");
+    EXPECT_EQ(touches(Kind::Wires), 2);
     lead->setVertices({{100, 90, 0}, {250, 90, 0}});
-    EXPECT_EQ(show("(length (cdr (car (getConexoesTodosCabos))))"), "1");
+    EXPECT_EQ(touches(Kind::Cables), 1);
     // the cables first, then the wire erased
-    show("(getConexoesTodosCabos)");
+    touches(Kind::Cables);
     line->erase();
-    EXPECT_EQ(show("(getConexoesTodosFios)"), "nil");
+    EXPECT_EQ(touches(Kind::Wires), -1);
     // and the other way round: a wire drawn after the cables were asked
     lead->setVertices({{100, 90, 0}, {300, 90, 0}});
-    show("(getConexoesTodosCabos)");
+    touches(Kind::Cables);
     wire("ESQ$0001$A", {{100, 100, 0}, {200, 150, 0}, {300, 100, 0}}, "102");
-    EXPECT_EQ(show("(car (car (getConexoesTodosFios)))"), "\"102\"");
-    EXPECT_EQ(show("(getConexoesTodosCabos)"), cables);
+    EXPECT_EQ(answers.answer(*database, 0.1, Kind::Wires).front().number, "102");
+    EXPECT_EQ(summary(answers.answer(*database, 0.1, Kind::Cables)), cables);
+    // a changed tolerance is worked out again
+    line = wire("ESQ$0001$A", {{100, 100.2, 0}, {300, 100, 0}}, "101");  // 0.2 off
+    touches(Kind::Cables, 0.1);
+    EXPECT_EQ(summary(answers.answer(*database, 0.5, Kind::Wires)),
+              summary(ConnectionFinder(*database, 0.5).wires()));
+    touches(Kind::Cables, 0.5);
+    EXPECT_EQ(summary(answers.answer(*database, 0.1, Kind::Wires)),
+              summary(ConnectionFinder(*database, 0.1).wires()));
+    EXPECT_NE(summary(ConnectionFinder(*database, 0.1).wires()),
+              summary(ConnectionFinder(*database, 0.5).wires()));
 }
 
 TEST_F(ConnectionAnswersTest, AnAnswerServedFromTheFirstCallIsTheOneWorkedOutAlone) {
-    const std::string wiresAlone = show("(getConexoesTodosFios)");
-    const std::string cablesAfterWires = show("(getConexoesTodosCabos)");
-    const std::string cablesAlone = show("(getConexoesTodosCabos)");
-    const std::string wiresAfterCables = show("(getConexoesTodosFios)");
-    EXPECT_EQ(cablesAfterWires, cablesAlone);
-    EXPECT_EQ(wiresAfterCables, wiresAlone);
+    using Kind = ConnectionAnswers::Kind;
+    const std::string wiresAlone = summary(ConnectionFinder(*database, 0.1).wires());
+    const std::string cablesAlone = summary(ConnectionFinder(*database, 0.1).cables());
+    EXPECT_EQ(summary(answers.answer(*database, 0.1, Kind::Wires)), wiresAlone);
+    EXPECT_EQ(summary(answers.answer(*database, 0.1, Kind::Cables)), cablesAlone);
+    EXPECT_EQ(summary(answers.answer(*database, 0.1, Kind::Cables)), cablesAlone);
+    EXPECT_EQ(summary(answers.answer(*database, 0.1, Kind::Wires)), wiresAlone);
     EXPECT_NE(wiresAlone, cablesAlone);
-    const std::string h = QString::number(far->handle(), 16).toUpper().toStdString();
+    const std::string h = std::to_string(far->handle());
     EXPECT_NE(wiresAlone.find(h + "##BORNE_1"), std::string::npos) << wiresAlone;
-}
-
-TEST_F(ConnectionAnswersTest, AChangedToleranceIsWorkedOutAgain) {
-    line->setVertices({{100, 100.2, 0}, {300, 100, 0}});  // 0.2 off the near terminal
-    show("(getConexoesTodosCabos)");
-    run("(setq *ESPESSURA_BARRAMENTO* 0.5)");
+    // the LISP functions answer alike, one kind at a time
     EXPECT_EQ(show("(length (cdr (car (getConexoesTodosFios))))"), "2");
-    run("(setq *ESPESSURA_BARRAMENTO* 0.1)");
-    show("(getConexoesTodosCabos)");
-    EXPECT_EQ(show("(length (cdr (car (getConexoesTodosFios))))"), "1");
+    EXPECT_EQ(show("(length (cdr (car (getConexoesTodosCabos))))"), "2");
 }
 
 TEST_F(ConnectionAnswersTest, TwoDrawingsAndAnUndoSwapDoNotShareAnswers) {
-    ConnectionAnswers answers;
     zvsample::ProjectGenerator generator({7, 60, 4});
     std::unique_ptr<zvdb::Database> other = generator.generate();
     const std::string otherCables = summary(ConnectionFinder(*other, 0.1).cables());
