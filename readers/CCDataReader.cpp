@@ -82,7 +82,9 @@ void CCDataReader::CarregaConexoes(const QString& funcao, bool detalhes) {
             if (no->restype == zvsdk::RTLE && no->rbnext && no->rbnext->restype == zvsdk::RTLE)
                 break;
             if (no->restype == zvsdk::RTSTR) {
-                conexoes.elementos << (detalhes ? no->rstring.section('#', 0, 0) : no->rstring);
+                // the handle before the first "#", or the whole text
+                conexoes.elementos
+                    << (detalhes ? no->rstring.left(no->rstring.indexOf('#')) : no->rstring);
                 if (detalhes) conexoes.completas << no->rstring;
                 conexoes.pontos.push_back({});
                 coordenada = 0;

@@ -51,6 +51,7 @@ zvsdk::ResultBuffer* DocumentLisp::lispInvoke(const zvsdk::ResultBuffer* call) {
     // functions of the product. Errors inside a defined one are reported as usual.
     if (lisp_.global(call->rstring).isNil()) return nullptr;
     zvsdk::ResultBuffer* chain = nullptr;
+    if (!call->rbnext && answerAsChain(call->rstring, &chain)) return chain;
     {
         const std::vector<zvlisp::Value> args = LispChains::values(lisp_, call->rbnext);
         const zvlisp::Value function = zvlisp::Value::symbol(lisp_.intern(call->rstring));
@@ -67,6 +68,26 @@ zvsdk::ResultBuffer* DocumentLisp::lispInvoke(const zvsdk::ResultBuffer* call) {
     // blocks it took go back for the rest of the command.
     zvlisp::trimPool();
     return chain;
+}
+
+void DocumentLisp::addChainAnswer(const QString& function, ChainAnswer answer) {
+    chainAnswers_.insert(function, {lisp_.global(function), std::move(answer)});
+}
+
+bool DocumentLisp::answerAsChain(const QString& function, zvsdk::ResultBuffer** chain) {
+    if (chainAnswers_.isEmpty()) return false;
+    auto source = chainAnswers_.constFind(function);
+    if (source == chainAnswers_.constEnd() || !source->function.isFunction() ||
+        !lisp_.global(function).same(source->function))
+        return false;
+    try {
+        return source->answer(lisp_, chain);
+    } catch (zvlisp::LispError& error) {
+        // as the usual road does with an error: reported, and no answer
+        if (!error.handled) lisp_.report(error);
+        *chain = nullptr;
+        return true;
+    }
 }
 
 bool DocumentLisp::lispEvaluate(const QString& text) {

@@ -29,9 +29,25 @@ public:
     // The same text is read once: a list run evaluates one expression per item.
     bool lispEvaluate(const QString& text) override;
 
+    // A native function can also answer a call without arguments straight as a chain,
+    // without a LISP list in between: a list of the whole drawing costs as much again as
+    // values. The answer must be the chain that the function's value would give. It stands
+    // while the function's symbol holds the function it holds now (a user's defun takes
+    // over as usual); returning false leaves the call to the usual road.
+    using ChainAnswer = std::function<bool(zvlisp::Interpreter&, zvsdk::ResultBuffer**)>;
+    void addChainAnswer(const QString& function, ChainAnswer answer);
+
 private:
+    struct ChainSource {
+        zvlisp::Value function;
+        ChainAnswer answer;
+    };
+    // True when a chain answer took the call; `chain` is then its result.
+    bool answerAsChain(const QString& function, zvsdk::ResultBuffer** chain);
+
     zvlisp::Interpreter lisp_;
     QHash<QString, zvlisp::Value> readTexts_;
+    QHash<QString, ChainSource> chainAnswers_;
 };
 
 }  // namespace zvhost

@@ -2,9 +2,11 @@
 
 #include "Application.h"
 #include "CadLisp.h"
+#include "ConnectionChains.h"
 #include "DocumentLisp.h"
 #include "HostDocument.h"
 #include "SystemLisp.h"
+#include "product/ConnectionAnswers.h"
 #include "product/ProductLisp.h"
 #include "product/UserConfig.h"
 
@@ -15,7 +17,8 @@ namespace zvhost {
 namespace {
 
 // The product's LISP functions on this document, then the user's configuration file.
-void installProduct(zvlisp::Interpreter& lisp, HostDocument& document) {
+void installProduct(DocumentLisp& documentLisp, HostDocument& document) {
+    zvlisp::Interpreter& lisp = documentLisp.interpreter();
     zvproduct::ProductContext context;
     context.database = [&document] { return document.database(); };
     context.userInterface = [] {
@@ -23,7 +26,9 @@ void installProduct(zvlisp::Interpreter& lisp, HostDocument& document) {
     };
     context.print = [&document](const QString& text) { document.printMessage(text); };
     context.fileName = [&document] { return document.fileName(); };
+    context.connections = std::make_shared<zvproduct::ConnectionAnswers>();
     zvproduct::installProductFunctions(lisp, context);
+    ConnectionChains::install(documentLisp, context);
     const QString config = zvproduct::UserConfig::file();
     if (!config.isEmpty()) zvproduct::UserConfig::load(lisp, config);
 }
@@ -42,7 +47,7 @@ void setUpDocument(HostDocument& document) {
         "/program/units.txt";
     installCadFunctions(lisp->interpreter(), document);
     installSystemFunctions(lisp->interpreter());
-    installProduct(lisp->interpreter(), document);
+    installProduct(*lisp, document);
     document.setLisp(std::move(lisp));
 }
 

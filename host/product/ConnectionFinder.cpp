@@ -12,6 +12,7 @@
 #include <algorithm>
 #include <climits>
 #include <cmath>
+#include <span>
 
 namespace zvproduct {
 
@@ -36,62 +37,172 @@ double distance(const zvdb::Point3& a, const zvdb::Point3& b) {
     return std::sqrt(d.x * d.x + d.y * d.y + d.z * d.z);
 }
 
-std::string upper(std::string_view text) {
-    std::string out(text);
-    for (char& c : out)
-        c = static_cast<char>(std::toupper(static_cast<unsigned char>(c)));
-    return out;
-}
-
-// Value of "NAME\fVALUE\f..." when the name is one of `names`.
-std::string fieldValue(std::string_view item, std::initializer_list<std::string_view> names) {
+// Value of "NAME\fVALUE\f..." when the name is one of `names`, ignoring case; empty.
+std::string_view fieldValue(std::string_view item, std::initializer_list<std::string_view> names) {
     const auto sep = item.find('\f');
     if (sep == std::string_view::npos) return {};
-    const std::string name = upper(item.substr(0, sep));
-    if (std::find(names.begin(), names.end(), name) == names.end()) return {};
-    std::string_view value = item.substr(sep + 1);
-    return std::string(value.substr(0, value.find('\f')));
+    const std::string_view name = item.substr(0, sep);
+    if (std::none_of(names.begin(), names.end(),
+                     [&](std::string_view n) { return zvdb::TagValues::sameName(name, n); }))
+        return {};
+    const std::string_view value = item.substr(sep + 1);
+    return value.substr(0, value.find('\f'));
 }
 
-// Extended data of any object, Xrecords included (their data may hold codes of the 1000
-// range, so the groups are found by their 1001 name).
-std::vector<zvdb::Tag> appItems(const zvdb::DbObject& object, std::string_view application) {
-    std::vector<zvdb::Tag> items;
-    bool in = false;
-    for (const zvdb::Tag& tag : object.tags()) {
-        if (tag.code == 1001) {
-            if (in) break;
-            in = upper(tag.value) == upper(application);
-        } else if (in) {
-            items.push_back(tag);
-        }
+// The items of the application's first extended-data group of an object, Xrecords included
+// (their data may hold codes of the 1000 range, so the groups are found by their 1001 name).
+std::span<const zvdb::Tag> appItems(const zvdb::DbObject& object, std::string_view application) {
+    const auto all = object.tags();
+    for (std::size_t i = 0; i < all.size(); ++i) {
+        if (all[i].code != 1001 || !zvdb::TagValues::sameName(all[i].value, application)) continue;
+        std::size_t end = i + 1;
+        while (end < all.size() && all[end].code != 1001)
+            ++end;
+        return all.subspan(i + 1, end - i - 1);
     }
-    return items;
+    return {};
 }
+
+std::string wireNumberOf(std::span<const zvdb::Tag> items) {
+    for (std::size_t i = 2; i < items.size(); ++i) {
+        const std::string_view value =
+            fieldValue(items[i].value, {"CABO", "FIO", "WIRE", "ALAMBRE"});
+        if (!value.empty()) return std::string(value);
+    }
+    return {};
+}
+
+// The applications that decide what a model-space entity is to the connection rule, with
+// the items of the first group of each: one walk over the entity's extended data.
+struct Roles {
+    enum App { Symbol, Equipment, CutPoints, Wire, Cable, Blind, Count };
+    std::size_t begin[Count] = {};
+    std::size_t end[Count] = {};
+    bool has[Count] = {};
+
+    explicit Roles(const zvdb::DbObject& object) {
+        static constexpr std::string_view kNames[Count] = {
+            "KVR_ZV",      "KVR_ZV_EQUIPO", "KVR_ZV_PTS_CORTE",
+            "KVR_ZV_WIRE", "KVR_ZV_CABO",   "KVR_ZV_CONEX_BLIND"};
+        const auto all = object.tags();
+        int open = -1;
+        for (std::size_t i = object.xdataStart(); i < all.size(); ++i) {
+            if (all[i].code != 1001) continue;
+            if (open >= 0) end[open] = i;
+            open = -1;
+            const std::string_view name = all[i].value;
+            if (name.size() < 6 || !zvdb::TagValues::sameName(name.substr(0, 6), "KVR_ZV"))
+                continue;
+            for (int app = 0; app < Count; ++app)
+                if (zvdb::TagValues::sameName(name, kNames[app])) {
+                    if (!has[app]) {
+                        has[app] = true;
+                        begin[app] = i + 1;
+                        open = app;
+                    }
+                    break;
+                }
+        }
+        if (open >= 0) end[open] = all.size();
+    }
+    std::span<const zvdb::Tag> items(const zvdb::DbObject& object, App app) const {
+        return has[app] ? object.tags().subspan(begin[app], end[app] - begin[app])
+                        : std::span<const zvdb::Tag>();
+    }
+};
 
 }  // namespace
+
+// What one vertex query needs, kept between queries so that they allocate nothing.
+struct ConnectionFinder::Scratch {
+    std::vector<const Spot*> near;
+    std::vector<std::uint32_t> seen;
+};
 
 ConnectionFinder::ConnectionFinder(zvdb::Database& database, double tolerance)
     : database_(database),
       tolerance_(tolerance > 0 ? tolerance : 0.1),
       cell_(std::max({tolerance_, kLeadTolerance, 1.0})) {
-    indexSymbols();
+    readModelSpace();
     buildGrid();
+    sortLines();
 }
 
-int ConnectionFinder::layerId(const std::string& layer) {
-    return layers_.emplace(layer, static_cast<int>(layers_.size())).first->second;
+std::int32_t ConnectionFinder::layerId(std::string_view layer) {
+    return layers_.emplace(layer, static_cast<std::int32_t>(layers_.size())).first->second;
 }
 
 std::uint64_t ConnectionFinder::cellKey(long long x, long long y) const {
     return (static_cast<std::uint64_t>(x) << 32) ^ (static_cast<std::uint64_t>(y) & 0xFFFFFFFF);
 }
 
-void ConnectionFinder::addSpot(std::uint32_t symbol, int layer, const zvdb::Point3& p,
+void ConnectionFinder::addSpot(std::uint32_t symbol, std::int32_t layer, const zvdb::Point3& p,
                                std::string_view connection) {
     const auto cx = static_cast<long long>(std::floor(p.x / cell_));
     const auto cy = static_cast<long long>(std::floor(p.y / cell_));
-    spots_.push_back({symbol, layer, cellKey(cx, cy), p, connection});
+    spots_.push_back({cellKey(cx, cy), p, connection, symbol, layer});
+}
+
+// The symbols (KVR_ZV or KVR_ZV_EQUIPO references) and the polylines of the wires, the
+// cable leads and the blind connections, in model-space order.
+void ConnectionFinder::readModelSpace() {
+    const auto entities = database_.modelSpace()->entities();
+    symbols_.reserve(entities.size() / 2);
+    spots_.reserve(entities.size());
+    for (zvdb::Entity* entity : entities) {
+        const Roles roles(*entity);
+        auto* reference = roles.has[Roles::Symbol] || roles.has[Roles::Equipment]
+                              ? dynamic_cast<zvdb::BlockReference*>(entity)
+                              : nullptr;
+        if (reference) {
+            indexSymbol(*reference, layerId(entity->layer()), roles.begin[Roles::CutPoints],
+                        roles.has[Roles::CutPoints] ? roles.end[Roles::CutPoints] : 0);
+            continue;
+        }
+        if (!roles.has[Roles::Wire] && !roles.has[Roles::Cable] && !roles.has[Roles::Blind])
+            continue;
+        auto* polyline = dynamic_cast<zvdb::Polyline*>(entity);
+        if (!polyline) continue;
+        const Line line{polyline, polyline->handle(), 0, layerId(polyline->layer())};
+        if (roles.has[Roles::Wire]) wireLines_.push_back(line);
+        if (roles.has[Roles::Cable]) leadLines_.push_back(line);
+        if (roles.has[Roles::Blind]) blindLines_.push_back(line);
+    }
+}
+
+// A project symbol gives its connection attributes' text positions, its insertion point and
+// its cut point; the two latter take the name of a connection attribute standing on them.
+void ConnectionFinder::indexSymbol(const zvdb::BlockReference& reference, std::int32_t layer,
+                                   std::size_t cutBegin, std::size_t cutEnd) {
+    const auto symbol = static_cast<std::uint32_t>(symbols_.size());
+    symbols_.push_back({reference.handle(), reference.blockName()});
+    const std::size_t firstSpot = spots_.size();
+    for (zvdb::Entity* sub : reference.subEntities()) {
+        if (sub->isErased()) continue;
+        auto* attribute = dynamic_cast<zvdb::Attribute*>(sub);
+        if (attribute && isConnectionTag(attribute->tag()))
+            addSpot(symbol, layer, attribute->position(), attribute->text(1));
+    }
+    const std::size_t named = spots_.size();
+    zvdb::Point3 ends[2] = {reference.position(), {}};
+    int endCount = 1;
+    // the cut point: the second point of KVR_ZV_PTS_CORTE
+    const auto all = reference.tags();
+    int points = 0;
+    for (std::size_t i = cutBegin; cutEnd > 0 && i + 2 < cutEnd; ++i)
+        if (all[i].code == 1010 && ++points == 2) {
+            ends[1] = {zvdb::TagValues::toReal(all[i].value),
+                       zvdb::TagValues::toReal(all[i + 1].value),
+                       zvdb::TagValues::toReal(all[i + 2].value)};
+            endCount = 2;
+            break;
+        }
+    for (int e = 0; e < endCount; ++e) {
+        bool onNamed = false;
+        for (std::size_t s = firstSpot; s < named && !onNamed; ++s)
+            onNamed = distance(spots_[s].point, ends[e]) < tolerance_;
+        if (!onNamed) addSpot(symbol, layer, ends[e], {});
+    }
 }
 
 // One sort puts each page's spots together, cell by cell: a page's wires then look at a
@@ -112,47 +223,36 @@ void ConnectionFinder::buildGrid() {
     }
 }
 
-// Every project symbol (KVR_ZV or KVR_ZV_EQUIPO) gives its connection attributes' text
-// positions, its insertion point and its cut point; the two latter take the name of a
-// connection attribute standing on them.
-void ConnectionFinder::indexSymbols() {
-    for (zvdb::Entity* entity : database_.modelSpace()->entities()) {
-        auto* reference = dynamic_cast<zvdb::BlockReference*>(entity);
-        if (!reference || !(reference->hasXData("KVR_ZV") || reference->hasXData("KVR_ZV_EQUIPO")))
-            continue;
-        const auto symbol = static_cast<std::uint32_t>(symbols_.size());
-        symbols_.push_back({reference->handle(), std::string(reference->blockName())});
-        const int layer = layerId(std::string(reference->layer()));
-        std::vector<std::pair<zvdb::Point3, std::string_view>> named;
-        for (zvdb::Attribute* attribute : reference->attributes())
-            if (isConnectionTag(attribute->tag()))
-                named.emplace_back(attribute->position(), attribute->text(1));
-        std::vector<zvdb::Point3> ends = {reference->position()};
-        const auto cut = reference->xdata("KVR_ZV_PTS_CORTE");
-        std::vector<zvdb::Point3> points;
-        for (std::size_t i = 0; i + 2 < cut.size(); ++i)
-            if (cut[i].code == 1010)
-                points.push_back({zvdb::TagValues::toReal(cut[i].value),
-                                  zvdb::TagValues::toReal(cut[i + 1].value),
-                                  zvdb::TagValues::toReal(cut[i + 2].value)});
-        if (points.size() >= 2) ends.push_back(points[1]);
-        for (const auto& [point, name] : named)
-            addSpot(symbol, layer, point, name);
-        for (const zvdb::Point3& end : ends) {
-            auto on = std::find_if(named.begin(), named.end(), [&](const auto& n) {
-                return distance(n.first, end) < tolerance_;
-            });
-            if (on == named.end()) addSpot(symbol, layer, end, {});
-        }
+// Each role's polylines by registry page order, then by handle.
+void ConnectionFinder::sortLines() {
+    std::unordered_map<std::string_view, std::int32_t> order;
+    const PageRegistry registry(database_);
+    std::int32_t index = 0;
+    for (const PageGroup& group : registry.groups())
+        for (const std::string& page : group.pages)
+            order.emplace(page, index++);
+    std::vector<std::int32_t> rankOf(layers_.size(), INT_MAX);
+    for (const auto& [name, id] : layers_) {
+        auto page = order.find(name);
+        if (page != order.end()) rankOf[static_cast<std::size_t>(id)] = page->second;
+    }
+    for (std::vector<Line>* lines : {&wireLines_, &leadLines_, &blindLines_}) {
+        for (Line& line : *lines)
+            line.rank = rankOf[static_cast<std::size_t>(line.layer)];
+        std::sort(lines->begin(), lines->end(), [](const Line& a, const Line& b) {
+            return a.rank != b.rank ? a.rank < b.rank : a.handle < b.handle;
+        });
     }
 }
 
-std::vector<const ConnectionFinder::Spot*> ConnectionFinder::spotsNear(int layer,
-                                                                       const zvdb::Point3& p,
-                                                                       double radius) const {
-    std::vector<const Spot*> near;
-    if (layer < 0 || static_cast<std::size_t>(layer) >= grid_.size()) return near;
+// One touch per symbol near the vertex, at the symbol's nearest point, nearest first.
+void ConnectionFinder::touchesAt(std::int32_t layer, const zvdb::Point3& p, double radius,
+                                 std::vector<Touch>& out, Scratch& scratch) const {
+    if (layer < 0 || static_cast<std::size_t>(layer) >= grid_.size()) return;
     const CellRuns& cells = grid_[static_cast<std::size_t>(layer)];
+    if (cells.empty()) return;
+    auto& near = scratch.near;
+    near.clear();
     const auto cx = static_cast<long long>(std::floor(p.x / cell_));
     const auto cy = static_cast<long long>(std::floor(p.y / cell_));
     for (long long dx = -1; dx <= 1; ++dx)
@@ -162,29 +262,24 @@ std::vector<const ConnectionFinder::Spot*> ConnectionFinder::spotsNear(int layer
             for (std::uint32_t i = cell->second.first; i < cell->second.second; ++i)
                 if (distance(spots_[i].point, p) <= radius) near.push_back(&spots_[i]);
         }
-    return near;
-}
-
-// One touch per symbol near the vertex, at the symbol's nearest point, nearest first.
-void ConnectionFinder::touchesAt(int layer, const zvdb::Point3& p, double radius,
-                                 std::vector<Touch>& out) const {
-    auto near = spotsNear(layer, p, radius);
+    if (near.empty()) return;
     std::stable_sort(near.begin(), near.end(), [&](const Spot* a, const Spot* b) {
         const double da = distance(a->point, p), db = distance(b->point, p);
         if (da != db) return da < db;
         return symbols_[a->symbol].handle < symbols_[b->symbol].handle;
     });
-    std::vector<std::uint32_t> seen;
+    auto& seen = scratch.seen;
+    seen.clear();
     for (const Spot* spot : near) {
         if (std::find(seen.begin(), seen.end(), spot->symbol) != seen.end()) continue;
         seen.push_back(spot->symbol);
         const Symbol& symbol = symbols_[spot->symbol];
-        Touch touch{symbol.handle, std::string(spot->connection), symbol.block, spot->point};
+        const Touch touch{symbol.handle, spot->connection, symbol.block, spot->point};
         // two vertices on one point of a symbol are one touch
         if (!out.empty() && out.back().symbol == touch.symbol &&
             out.back().connection == touch.connection && out.back().point == touch.point)
             continue;
-        out.push_back(std::move(touch));
+        out.push_back(touch);
     }
 }
 
@@ -212,73 +307,71 @@ std::vector<zvdb::Polyline*> ConnectionFinder::polylinesInPageOrder(zvdb::Databa
 }
 
 std::string ConnectionFinder::wireNumber(const zvdb::Polyline& polyline) {
-    const auto items = polyline.xdata("KVR_ZV_WIRE");
-    for (std::size_t i = 2; i < items.size(); ++i) {
-        std::string value = fieldValue(items[i].value, {"CABO", "FIO", "WIRE", "ALAMBRE"});
-        if (!value.empty()) return value;
-    }
-    return {};
+    return wireNumberOf(Roles(polyline).items(polyline, Roles::Wire));
 }
 
-std::vector<WireConnections> ConnectionFinder::wires() {
+std::vector<WireConnections> ConnectionFinder::wires() const {
     std::vector<WireConnections> result;
     std::unordered_map<std::string, std::size_t> byNumber;
-    for (zvdb::Polyline* polyline : polylinesInPageOrder(database_, "KVR_ZV_WIRE")) {
-        std::string number = wireNumber(*polyline);
+    Scratch scratch;
+    for (const Line& line : wireLines_) {
+        std::string number = wireNumberOf(Roles(*line.polyline).items(*line.polyline, Roles::Wire));
         if (number.empty()) continue;  // an unnumbered wire joins nothing
-        auto [it, added] = byNumber.emplace(number, result.size());
-        if (added) result.push_back({number, {}, {}});
+        auto [it, added] = byNumber.emplace(std::move(number), result.size());
+        if (added) result.push_back({it->first, {}, {}});
         WireConnections& wire = result[it->second];
-        wire.polylines.push_back(polyline->handle());
-        const int layer = layerId(std::string(polyline->layer()));
-        for (const zvdb::Point3& vertex : polyline->vertices())
-            touchesAt(layer, vertex, tolerance_, wire.touches);
+        wire.polylines.push_back(line.handle);
+        for (const zvdb::Point3& vertex : line.polyline->vertices())
+            touchesAt(line.layer, vertex, tolerance_, wire.touches, scratch);
     }
     return result;
 }
 
-std::vector<WireConnections> ConnectionFinder::cables() {
+std::vector<WireConnections> ConnectionFinder::cables() const {
     // blind connections by the handle of their lead
-    std::unordered_map<std::uint64_t, std::vector<zvdb::Polyline*>> blinds;
-    for (zvdb::Polyline* blind : polylinesInPageOrder(database_, "KVR_ZV_CONEX_BLIND")) {
-        const auto items = blind->xdata("KVR_ZV_CONEX_BLIND");
-        if (items.size() >= 2) blinds[zvdb::TagValues::toHandle(items[1].value)].push_back(blind);
+    std::unordered_map<std::uint64_t, std::vector<const Line*>> blinds;
+    for (const Line& blind : blindLines_) {
+        const auto items = Roles(*blind.polyline).items(*blind.polyline, Roles::Blind);
+        if (items.size() >= 2) blinds[zvdb::TagValues::toHandle(items[1].value)].push_back(&blind);
     }
-    auto ends = [&](zvdb::Polyline& line, bool firstToo, std::vector<Touch>& out) {
-        const auto vertices = line.vertices();
+    Scratch scratch;
+    auto ends = [&](const Line& line, bool firstToo, std::vector<Touch>& out) {
+        const auto vertices = line.polyline->vertices();
         if (vertices.empty()) return;
-        const int layer = layerId(std::string(line.layer()));
-        if (firstToo) touchesAt(layer, vertices.front(), kLeadTolerance, out);
-        if (vertices.size() > 1) touchesAt(layer, vertices.back(), kLeadTolerance, out);
+        if (firstToo) touchesAt(line.layer, vertices.front(), kLeadTolerance, out, scratch);
+        if (vertices.size() > 1)
+            touchesAt(line.layer, vertices.back(), kLeadTolerance, out, scratch);
     };
     std::vector<WireConnections> result;
     std::unordered_map<std::string, std::size_t> byNumber;
-    for (zvdb::Polyline* lead : polylinesInPageOrder(database_, "KVR_ZV_CABO")) {
-        const std::string number = cableNumber(*lead);
+    for (const Line& lead : leadLines_) {
+        std::string number = cableNumber(*lead.polyline);
         if (number.empty()) continue;
-        auto [it, added] = byNumber.emplace(number, result.size());
-        if (added) result.push_back({number, {}, {}});
+        auto [it, added] = byNumber.emplace(std::move(number), result.size());
+        if (added) result.push_back({it->first, {}, {}});
         WireConnections& cable = result[it->second];
-        cable.polylines.push_back(lead->handle());
-        ends(*lead, true, cable.touches);
-        for (zvdb::Polyline* blind : blinds[lead->handle()])
+        cable.polylines.push_back(lead.handle);
+        ends(lead, true, cable.touches);
+        auto own = blinds.find(lead.handle);
+        if (own == blinds.end()) continue;
+        for (const Line* blind : own->second)
             ends(*blind, false, cable.touches);
     }
     return result;
 }
 
 std::string ConnectionFinder::cableNumber(const zvdb::Polyline& lead) const {
-    const auto items = lead.xdata("KVR_ZV_CABO");
+    const auto items = Roles(lead).items(lead, Roles::Cable);
     if (items.size() < 2) return {};
     const std::string_view keyText = items[0].value;
-    const std::string key(keyText.substr(0, keyText.find('\f')));
+    const std::string_view key = keyText.substr(0, keyText.find('\f'));
     for (std::size_t i = 1; i < items.size(); ++i) {
         zvdb::DbObject* record =
             database_.objectByHandle(zvdb::TagValues::toHandle(items[i].value));
         if (!record) continue;
         for (const zvdb::Tag& field : appItems(*record, "KVR_ZV_ATT_VIRTUAL")) {
-            std::string name = fieldValue(field.value, {"CABO", "CABLE"});
-            if (!name.empty()) return name + '\f' + key;
+            const std::string_view name = fieldValue(field.value, {"CABO", "CABLE"});
+            if (!name.empty()) return std::string(name) + '\f' + std::string(key);
         }
     }
     return {};

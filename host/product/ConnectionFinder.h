@@ -3,6 +3,10 @@
 // symbols' connection points go into a grid of cells keyed by layer and cell, so each
 // polyline vertex looks at nine cells: the whole drawing is read in near-linear time.
 // The rule is told in docs/project-format.md ("Wires and the connection rule").
+//
+// One pass over model space gathers the symbols and the wire, lead and blind-connection
+// polylines, so the wires and the cables of a drawing cost one walk of the drawing. Texts
+// of the answers are views into the drawing's storage: they hold while it is unchanged.
 #include "drawing/Geometry.h"
 
 #include <cstdint>
@@ -12,6 +16,7 @@
 #include <vector>
 
 namespace zvdb {
+class BlockReference;
 class Database;
 class Polyline;
 }  // namespace zvdb
@@ -20,8 +25,8 @@ namespace zvproduct {
 
 struct Touch {
     std::uint64_t symbol = 0;
-    std::string connection;  // value of the touching connection attribute, or empty
-    std::string block;
+    std::string_view connection;  // value of the touching connection attribute, or empty
+    std::string_view block;
     zvdb::Point3 point;
 };
 
@@ -36,10 +41,11 @@ public:
     ConnectionFinder(zvdb::Database& database, double tolerance);
 
     // Wires (KVR_ZV_WIRE), in the order their first polyline comes in page order.
-    std::vector<WireConnections> wires();
+    std::vector<WireConnections> wires() const;
     // Cables by "NAME\fKEY": the two ends of each lead and the ends of its blind
     // connections, leads in page order (tolerance 0.3).
-    std::vector<WireConnections> cables();
+    std::vector<WireConnections> cables() const;
+    double tolerance() const { return tolerance_; }
 
     // The wire number of a KVR_ZV_WIRE polyline (FIO, WIRE, ALAMBRE or CABO item); empty.
     static std::string wireNumber(const zvdb::Polyline& polyline);
@@ -53,33 +59,46 @@ public:
 private:
     struct Symbol {
         std::uint64_t handle;
-        std::string block;
+        std::string_view block;
     };
     struct Spot {
-        std::uint32_t symbol;
-        int layer;
         std::uint64_t cell;
         zvdb::Point3 point;
         std::string_view connection;  // in the drawing's storage: the spots sort cheaply
+        std::uint32_t symbol;
+        std::int32_t layer;
+    };
+    // A polyline of a role with what orders it.
+    struct Line {
+        zvdb::Polyline* polyline;
+        std::uint64_t handle;
+        std::int32_t rank;  // registry page order; off the pages last
+        std::int32_t layer;
     };
     // Spots sorted by layer and cell; per layer, a cell's run in that order.
     using CellRuns = std::unordered_map<std::uint64_t, std::pair<std::uint32_t, std::uint32_t>>;
-    void indexSymbols();
-    void addSpot(std::uint32_t symbol, int layer, const zvdb::Point3& p,
+    struct Scratch;
+
+    void readModelSpace();
+    void indexSymbol(const zvdb::BlockReference& reference, std::int32_t layer,
+                     std::size_t cutBegin, std::size_t cutEnd);
+    void addSpot(std::uint32_t symbol, std::int32_t layer, const zvdb::Point3& p,
                  std::string_view connection);
     std::uint64_t cellKey(long long x, long long y) const;
     void buildGrid();
-    std::vector<const Spot*> spotsNear(int layer, const zvdb::Point3& p, double radius) const;
-    void touchesAt(int layer, const zvdb::Point3& p, double radius, std::vector<Touch>& out) const;
-    int layerId(const std::string& layer);
+    void sortLines();
+    void touchesAt(std::int32_t layer, const zvdb::Point3& p, double radius,
+                   std::vector<Touch>& out, Scratch& scratch) const;
+    std::int32_t layerId(std::string_view layer);
 
     zvdb::Database& database_;
     double tolerance_;
     double cell_;
-    std::unordered_map<std::string, int> layers_;
+    std::unordered_map<std::string_view, std::int32_t> layers_;  // views into the drawing
     std::vector<Symbol> symbols_;
     std::vector<Spot> spots_;
     std::vector<CellRuns> grid_;  // by layer id
+    std::vector<Line> wireLines_, leadLines_, blindLines_;
 };
 
 }  // namespace zvproduct

@@ -1,6 +1,6 @@
 // Connections: getConexoesTodosFios, getConexoesTodosCabos, getFiosPorLayer, getListaFios,
 // getListaFiosProj.
-#include "ConnectionFinder.h"
+#include "ConnectionAnswers.h"
 #include "LispHelpers.h"
 #include "PageRegistry.h"
 #include "ProductLisp.h"
@@ -30,26 +30,26 @@ zvdb::Database& databaseOf(Interpreter& lisp, const ProductContext& context) {
     return *database;
 }
 
-double tolerance(Interpreter& lisp) {
-    const Value value = lisp.global("*ESPESSURA_BARRAMENTO*");
-    return value.isNumber() && lisp.toNumber(value) > 0 ? lisp.toNumber(value) : 0.1;
-}
-
 std::string handleText(std::uint64_t handle) {
     return QString::number(handle, 16).toUpper().toStdString();
+}
+
+QString qText(const std::string& text) {
+    return QString::fromUtf8(text.data(), static_cast<int>(text.size()));
 }
 
 // ((NUMBER (TEXT x y z) ...) ...); `details` adds "#CONNECTION#BLOCK" to the handle.
 Value connectionList(const std::vector<WireConnections>& wires, bool details) {
     zvlisp::ListBuilder all;
+    std::string text;
     for (const WireConnections& wire : wires) {
         zvlisp::ListBuilder one;
-        one.add(lispText(wire.number));
+        one.add(Value::string(qText(wire.number)));
         for (const Touch& touch : wire.touches) {
-            std::string text = handleText(touch.symbol);
-            if (details) text += "#" + touch.connection + "#" + touch.block;
+            text.clear();
+            ConnectionAnswers::appendEntryText(touch, details, text);
             zvlisp::ListBuilder entry;
-            entry.add(lispText(text));
+            entry.add(Value::string(qText(text)));
             entry.add(Value::real(touch.point.x));
             entry.add(Value::real(touch.point.y));
             entry.add(Value::real(touch.point.z));
@@ -80,18 +80,22 @@ std::unordered_set<std::string> layerNames(Args args, int from) {
 }  // namespace
 
 void installConnectionFunctions(Interpreter& lisp, const ProductContext& context) {
+    // a LISP caller asks for one kind; the host's module path (see ConnectionAnswers) asks
+    // for both in a row and shares these answers
+    auto answers =
+        context.connections ? context.connections : std::make_shared<ConnectionAnswers>();
     lisp.define(
         "getConexoesTodosFios",
-        [context](Interpreter& in, Args) {
-            ConnectionFinder finder(databaseOf(in, context), tolerance(in));
-            return connectionList(finder.wires(), true);
+        [context, answers](Interpreter& in, Args) {
+            return connectionList(
+                answers->answer(in, context, ConnectionAnswers::Kind::Wires, false), true);
         },
         0, 0);
     lisp.define(
         "getConexoesTodosCabos",
-        [context](Interpreter& in, Args) {
-            ConnectionFinder finder(databaseOf(in, context), tolerance(in));
-            return connectionList(finder.cables(), false);
+        [context, answers](Interpreter& in, Args) {
+            return connectionList(
+                answers->answer(in, context, ConnectionAnswers::Kind::Cables, false), false);
         },
         0, 0);
     lisp.define(

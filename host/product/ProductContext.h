@@ -4,6 +4,7 @@
 #include <QString>
 
 #include <functional>
+#include <memory>
 
 namespace zvdb {
 class Database;
@@ -14,11 +15,16 @@ class UserInterface;
 
 namespace zvproduct {
 
+class ConnectionAnswers;
+
 struct ProductContext {
     std::function<zvdb::Database*()> database;
     std::function<zvsdk::UserInterface*()> userInterface;
     std::function<void(const QString&)> print;
     std::function<QString()> fileName;
+    // The connection answers of the document, for a host that also hands them out without
+    // LISP in between; installConnectionFunctions makes its own when null.
+    std::shared_ptr<ConnectionAnswers> connections;
 };
 
 }  // namespace zvproduct

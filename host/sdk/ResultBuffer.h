@@ -3,6 +3,7 @@
 // between the host and a module as such chains.
 #include <QString>
 
+#include <cstddef>
 #include <cstdint>
 
 namespace zvdb {
@@ -39,15 +40,35 @@ struct EntityName {
     friend bool operator==(const EntityName&, const EntityName&) = default;
 };
 
+// Where a node was made: its place in a block of nodes (see newNode), 0 for a node of its
+// own. A copy of a node is a node of its own, and assigning to a node keeps its place.
+class NodePlace {
+public:
+    NodePlace() = default;
+    NodePlace(const NodePlace&) {}
+    NodePlace& operator=(const NodePlace&) { return *this; }
+
+private:
+    friend struct NodeBlocks;
+    std::uint16_t index_ = 0;
+};
+
+// The value is by type: a real (5001), a point (5002, 5009), a short (5003), a long (5010)
+// or an entity name (5006) share their storage; a string (5005) has its own.
 struct ResultBuffer {
+    ResultBuffer() : rpoint{0.0, 0.0, 0.0} {}
+
     ResultBuffer* rbnext = nullptr;
     short restype = RTNONE;
-    double rreal = 0.0;
-    double rpoint[3] = {0.0, 0.0, 0.0};
-    short rint = 0;
-    std::int32_t rlong = 0;
+    NodePlace place;
+    union {
+        double rpoint[3];
+        double rreal;
+        short rint;
+        std::int32_t rlong;
+        EntityName rlname;
+    };
     QString rstring;
-    EntityName rlname;
 };
 
 // One element of an association list of strings; the texts stay the caller's.
@@ -56,7 +77,8 @@ struct StringPair {
     const QString* value;
 };
 
-// Builds a node; the chain's owner frees it with releaseChain.
+// Builds a node; the chain's owner frees it with releaseChain. Nodes are made in blocks:
+// a chain of the whole drawing has a million of them.
 ResultBuffer* newNode(short type);
 ResultBuffer* newString(const QString& text);
 ResultBuffer* newShort(short value);
@@ -68,5 +90,8 @@ ResultBuffer* newPoint(double x, double y, double z, bool threeD = false);
 void releaseChain(ResultBuffer* chain);
 // A deep copy of a chain.
 ResultBuffer* copyChain(const ResultBuffer* chain);
+// Blocks of nodes that hold nodes not yet freed, or take new nodes (one per thread that made
+// nodes): for tests.
+std::size_t nodeBlocksInUse();
 
 }  // namespace zvsdk

@@ -1,0 +1,29 @@
+#pragma once
+// The product's connection answers (getConexoesTodosFios, getConexoesTodosCabos) handed to a
+// module as chains built straight from the product's data: the very nodes that
+// LispChains::toChain makes of the functions' LISP lists, without making the lists.
+#include "product/ConnectionFinder.h"
+#include "sdk/ResultBuffer.h"
+
+#include <vector>
+
+namespace zvproduct {
+struct ProductContext;
+}
+
+namespace zvhost {
+
+class DocumentLisp;
+
+class ConnectionChains {
+public:
+    // ((NUMBER (TEXT x y z) ...) ...); one nil node (5019) when there is nothing. The text
+    // of an entry is the symbol's handle, with "#CONNECTION#BLOCK" for `details`.
+    static zvsdk::ResultBuffer* toChain(const std::vector<zvproduct::WireConnections>& wires,
+                                        bool details);
+    // Lets the document's two connection functions answer the module as chains, from the
+    // same answers as their LISP side (the context's, which must be set).
+    static void install(DocumentLisp& lisp, const zvproduct::ProductContext& context);
+};
+
+}  // namespace zvhost

@@ -1,0 +1,54 @@
+#include "ConnectionAnswers.h"
+
+#include "ProductContext.h"
+
+#include "lisp/Interpreter.h"
+
+#include <charconv>
+
+namespace zvproduct {
+
+std::vector<WireConnections> ConnectionAnswers::answer(zvdb::Database& database, double tolerance,
+                                                       Kind kind, bool keepOther) {
+    std::optional<std::vector<WireConnections>> kept = std::move(kept_);
+    kept_.reset();
+    if (kept && keptKind_ == kind && stamp_ == DrawingStamp::of(database) &&
+        tolerance_ == tolerance)
+        return std::move(*kept);
+    kept.reset();
+    const ConnectionFinder finder(database, tolerance);
+    std::vector<WireConnections> asked = kind == Kind::Wires ? finder.wires() : finder.cables();
+    if (!keepOther) return asked;
+    kept_ = kind == Kind::Wires ? finder.cables() : finder.wires();
+    keptKind_ = kind == Kind::Wires ? Kind::Cables : Kind::Wires;
+    stamp_ = DrawingStamp::of(database);
+    tolerance_ = tolerance;
+    return asked;
+}
+
+std::vector<WireConnections> ConnectionAnswers::answer(zvlisp::Interpreter& lisp,
+                                                       const ProductContext& context, Kind kind,
+                                                       bool keepOther) {
+    zvdb::Database* database = context.database ? context.database() : nullptr;
+    if (!database) lisp.fail("no drawing");
+    return answer(*database, tolerance(lisp), kind, keepOther);
+}
+
+double ConnectionAnswers::tolerance(zvlisp::Interpreter& lisp) {
+    const zvlisp::Value value = lisp.global("*ESPESSURA_BARRAMENTO*");
+    return value.isNumber() && lisp.toNumber(value) > 0 ? lisp.toNumber(value) : 0.1;
+}
+
+void ConnectionAnswers::appendEntryText(const Touch& touch, bool details, std::string& out) {
+    char buffer[24];
+    const auto end = std::to_chars(buffer, buffer + sizeof buffer, touch.symbol, 16).ptr;
+    for (char* c = buffer; c != end; ++c)
+        out += *c >= 'a' && *c <= 'f' ? static_cast<char>(*c - 'a' + 'A') : *c;
+    if (!details) return;
+    out += '#';
+    out += touch.connection;
+    out += '#';
+    out += touch.block;
+}
+
+}  // namespace zvproduct

@@ -1,0 +1,144 @@
+// The connection answers reach the module as chains made straight from the product's data:
+// node for node what the LISP lists would give, and only while the functions are the
+// product's own. Result-buffer nodes are made in blocks that go with their last node.
+#include "LispHostFixture.h"
+
+#include "app/ConnectionChains.h"
+#include "app/LispChains.h"
+#include "drawing/Database.h"
+#include "sample/ProjectGenerator.h"
+#include "sdk/ResultBuffer.h"
+
+#include <algorithm>
+#include <random>
+#include <thread>
+
+namespace {
+
+using zvsdk::ResultBuffer;
+
+// One line per node: type and value.
+std::string dump(const ResultBuffer* chain) {
+    std::string text;
+    for (; chain; chain = chain->rbnext) {
+        text += std::to_string(chain->restype);
+        if (chain->restype == zvsdk::RTSTR || chain->restype == zvsdk::RTREAL ||
+            chain->restype == zvsdk::RTSHORT)
+            text += ' ';
+        if (chain->restype == zvsdk::RTSTR) text += chain->rstring.toStdString();
+        if (chain->restype == zvsdk::RTREAL) text += std::to_string(chain->rreal);
+        if (chain->restype == zvsdk::RTSHORT) text += std::to_string(chain->rint);
+        text += '\n';
+    }
+    return text;
+}
+
+struct Chain {
+    ResultBuffer* head;
+    explicit Chain(ResultBuffer* chain) : head(chain) {}
+    ~Chain() { zvsdk::releaseChain(head); }
+    Chain(const Chain&) = delete;
+    Chain& operator=(const Chain&) = delete;
+    std::string text() const { return dump(head); }
+};
+
+class ConnectionChainsTest : public LispHostFixture {
+protected:
+    void SetUp() override {
+        LispHostFixture::SetUp();
+        zvsample::ProjectGenerator generator({3, 120, 6});
+        project = app->openDocument(folder.filePath("generated.dxf"), generator.generate());
+        app->setActiveDocument(project);
+    }
+    zvhost::DocumentLisp& lisp() { return *static_cast<zvhost::DocumentLisp*>(project->lisp()); }
+    // What the module's call gets.
+    std::string invoked(const char* function) {
+        Chain call(zvsdk::newString(function));
+        return Chain(lisp().lispInvoke(call.head)).text();
+    }
+    // What the LISP value of the call gives as a chain.
+    std::string throughLisp(const char* function) {
+        const zvlisp::Value value = lisp().interpreter().evalText(QString("(%1)").arg(function));
+        return Chain(zvhost::LispChains::toChain(value)).text();
+    }
+
+    zvhost::HostDocument* project = nullptr;
+};
+
+TEST_F(ConnectionChainsTest, TheChainsAreTheNodesOfTheLispAnswers) {
+    for (const char* function : {"getConexoesTodosFios", "getConexoesTodosCabos"}) {
+        const std::string chain = invoked(function);
+        EXPECT_GT(std::count(chain.begin(), chain.end(), '\n'), 100) << function;
+        EXPECT_EQ(chain, throughLisp(function)) << function;
+    }
+    // a pair in a row, as a reader asks, and another tolerance
+    lisp().interpreter().evalText("(setq *ESPESSURA_BARRAMENTO* 4.0)");
+    const std::string wires = invoked("getConexoesTodosFios");
+    const std::string cables = invoked("getConexoesTodosCabos");
+    EXPECT_EQ(wires, throughLisp("getConexoesTodosFios"));
+    EXPECT_EQ(cables, throughLisp("getConexoesTodosCabos"));
+    // an empty drawing answers nil, one node
+    app->setActiveDocument(document);
+    EXPECT_EQ(Chain(zvhost::ConnectionChains::toChain({}, true)).text(), "5019\n");
+    Chain call(zvsdk::newString("getConexoesTodosFios"));
+    EXPECT_EQ(
+        Chain(static_cast<zvhost::DocumentLisp*>(document->lisp())->lispInvoke(call.head)).text(),
+        "5019\n");
+}
+
+TEST_F(ConnectionChainsTest, AUsersDefunOfTheFunctionTakesOver) {
+    lisp().interpreter().evalText(
+        "(defun getConexoesTodosFios () '((\"X\" (\"1A#2#B\" 1.5 2.0 3.0))))");
+    EXPECT_EQ(invoked("getConexoesTodosFios"),
+              "5016\n5016\n5005 X\n5016\n5005 1A#2#B\n5001 1.500000\n5001 2.000000\n"
+              "5001 3.000000\n5017\n5017\n5017\n");
+    // the other function is still the product's
+    EXPECT_EQ(invoked("getConexoesTodosCabos"), throughLisp("getConexoesTodosCabos"));
+}
+
+TEST(ResultBufferBlocks, BlocksGoWithTheirLastNodeInAnyOrderAndFromAnyThread) {
+    const std::size_t before = zvsdk::nodeBlocksInUse();
+    std::vector<ResultBuffer*> nodes;
+    for (int i = 0; i < 3000; ++i)
+        nodes.push_back(zvsdk::newShort(static_cast<short>(i)));
+    EXPECT_GE(zvsdk::nodeBlocksInUse(), before + 2);
+    EXPECT_EQ(nodes[2999]->rint, 2999);
+    std::shuffle(nodes.begin(), nodes.end(), std::mt19937(7));
+    for (ResultBuffer* node : nodes)
+        zvsdk::releaseChain(node);  // each a chain of one
+    EXPECT_LE(zvsdk::nodeBlocksInUse(), before + 1);
+
+    // made on a thread that ends, freed here
+    const std::size_t here = zvsdk::nodeBlocksInUse();
+    ResultBuffer* chain = nullptr;
+    std::thread([&chain] {
+        ResultBuffer** tail = &chain;
+        for (int i = 0; i < 2048; ++i, tail = &(*tail)->rbnext)
+            *tail = zvsdk::newReal(i);
+    }).join();
+    EXPECT_EQ(zvsdk::nodeBlocksInUse(), here + 2);
+    zvsdk::releaseChain(chain);
+    EXPECT_EQ(zvsdk::nodeBlocksInUse(), here);
+}
+
+TEST(ResultBufferBlocks, CopiesAndAssignedNodesKeepTheirOwnPlace) {
+    ResultBuffer* chain = zvsdk::newPoint(1, 2, 3, true);
+    chain->rbnext = zvsdk::newEntity({nullptr, 0x2A});
+    chain->rbnext->rbnext = zvsdk::newString("text");
+    ResultBuffer* copy = zvsdk::copyChain(chain);
+    // a node of its own assigned over a block's node: the block's node stays freeable
+    ResultBuffer own;
+    own.restype = zvsdk::RTLONG;
+    own.rlong = 70000;
+    *chain->rbnext->rbnext = own;
+    ResultBuffer onItsOwn(*chain);
+    EXPECT_EQ(onItsOwn.rpoint[2], 3.0);
+    zvsdk::releaseChain(chain);
+    EXPECT_EQ(dump(copy), "5009\n5006\n5005 text\n");
+    EXPECT_EQ(copy->rpoint[1], 2.0);
+    EXPECT_EQ(copy->rbnext->rlname.handle, 0x2Au);
+    zvsdk::releaseChain(copy);
+    EXPECT_EQ(own.rlong, 70000);
+}
+
+}  // namespace
