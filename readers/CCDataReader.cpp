@@ -316,6 +316,7 @@ void CCDataReader::ConfereVersao() const {
     const std::uint64_t versao = CICad::VersaoDesenho();
     if (versao == versaoLidas_) return;
     numerosFios_.clear();
+    ligacoesPorElemento_.clear();
     entidadesLidas_.clear();
     versaoLidas_ = versao;
 }
@@ -384,20 +385,30 @@ CEPonto CCDataReader::PontoDeCorte(const OdDbObjectId& referencia) const {
 
 std::unique_ptr<zv::CEAtributo> CCDataReader::AtributoConexaoProximo(const OdDbObjectId& elemento,
                                                                      const CEPonto& ponto) const {
-    std::unique_ptr<zv::CEListaAtributos> atributos;
-    CICad::GetAtributos(elemento, atributos, false, false);
-    const zv::CEAtributo* melhor = nullptr;
-    double menor = 0.0;
-    for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
-        const zv::CEAtributo& atributo = (*atributos)[i];
-        const QString tag = atributo.GetTag().toUpper();
-        if (!std::any_of(std::begin(kPalavrasConexao), std::end(kPalavrasConexao),
-                         [&tag](const char* palavra) { return tag.startsWith(palavra); }))
-            continue;
-        const double d = Distancia(CICad::GetPosicaoTexto(atributo.GetId()), ponto);
-        if (!melhor || d < menor) melhor = &atributo, menor = d;
+    // An element is asked at each of its connections: its connection attributes and their
+    // places are read once.
+    ConfereVersao();
+    auto achado = ligacoesPorElemento_.find(elemento);
+    if (achado == ligacoesPorElemento_.end()) {
+        std::vector<LigacaoGuardada> ligacoes;
+        std::unique_ptr<zv::CEListaAtributos> atributos;
+        CICad::GetAtributos(elemento, atributos, false, false);
+        for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
+            const zv::CEAtributo& atributo = (*atributos)[i];
+            const QString tag = atributo.GetTag().toUpper();
+            if (std::any_of(std::begin(kPalavrasConexao), std::end(kPalavrasConexao),
+                            [&tag](const char* palavra) { return tag.startsWith(palavra); }))
+                ligacoes.push_back({CICad::GetPosicaoTexto(atributo.GetId()), atributo});
+        }
+        achado = ligacoesPorElemento_.emplace(elemento, std::move(ligacoes)).first;
     }
-    return melhor ? std::make_unique<zv::CEAtributo>(*melhor) : nullptr;
+    const LigacaoGuardada* melhor = nullptr;
+    double menor = 0.0;
+    for (const LigacaoGuardada& ligacao : achado->second) {
+        const double d = Distancia(ligacao.posicao, ponto);
+        if (!melhor || d < menor) melhor = &ligacao, menor = d;
+    }
+    return melhor ? std::make_unique<zv::CEAtributo>(melhor->atributo) : nullptr;
 }
 
 VetorItens* CCDataReader::LeDicionarioCabos(zvdb::Database* database) {

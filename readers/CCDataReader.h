@@ -2,6 +2,7 @@
 // The base of every reader: the project's connectivity as the product's LISP side answers
 // it, kept in maps for one run, with point and neighbour queries on it; and the building of
 // items from drawing entities, their attributes, extended data and catalogue data.
+#include "CEAtributo.h"
 #include "VetorItens.h"
 #include "cad/CICad.h"
 #include "catalogue/CECacheCatalogo.h"
@@ -181,6 +182,12 @@ private:
         bool proprio = false;
     };
     mutable std::unordered_map<OdDbObjectId, NumeroFio> numerosFios_;
+    // Per element, its connection attributes with the places of their texts.
+    struct LigacaoGuardada {
+        CEPonto posicao;
+        zv::CEAtributo atributo;
+    };
+    mutable std::unordered_map<OdDbObjectId, std::vector<LigacaoGuardada>> ligacoesPorElemento_;
     // The drawing's version the entity caches above were read at.
     mutable std::uint64_t versaoLidas_ = 0;
     // Empties the caches of entities when the drawing changed since they were read.
