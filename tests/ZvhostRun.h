@@ -1,8 +1,10 @@
 #pragma once
 // Runs the built zvhost as a user would, for the tests that drive it from outside.
+#include <QFile>
 #include <QProcess>
 #include <QString>
 #include <QStringList>
+#include <QTemporaryDir>
 
 namespace zvtest {
 
@@ -32,11 +34,37 @@ struct Limits {
     QStringList prlimit;
 };
 
+// A font configuration that reads the system's and writes its cache files into a folder of
+// the test run. A program short of memory finds no fonts it can open; run as the superuser,
+// its font library would then write empty caches over the system's, and every later program
+// would draw its texts without the fonts.
+inline QString privateFontConfig() {
+    static QTemporaryDir folder;
+    static const QString file = [] {
+        const QString path = folder.filePath("fonts.conf");
+        QFile conf(path);
+        if (!conf.open(QIODevice::WriteOnly)) return QString();
+        conf.write(
+            QStringLiteral("<?xml version=\"1.0\"?>\n<fontconfig>\n  <cachedir>%1</cachedir>\n"
+                           "  <include ignore_missing=\"yes\">/etc/fonts/fonts.conf</include>\n"
+                           "</fontconfig>\n")
+                .arg(folder.filePath("cache"))
+                .toUtf8());
+        return path;
+    }();
+    return file;
+}
+
 inline void startZvhost(QProcess& process, const QStringList& arguments, const Limits& limits) {
     if (limits.prlimit.isEmpty()) {
         process.start(QStringLiteral(ZV_BIN_DIR "/zvhost"), arguments);
         return;
     }
+    QProcessEnvironment environment = process.processEnvironment();
+    if (environment.isEmpty()) environment = QProcessEnvironment::systemEnvironment();
+    const QString fonts = privateFontConfig();
+    if (!fonts.isEmpty()) environment.insert("FONTCONFIG_FILE", fonts);
+    process.setProcessEnvironment(environment);
     process.start(QStringLiteral("/usr/bin/prlimit"),
                   QStringList(limits.prlimit) << "--" << ZV_BIN_DIR "/zvhost" << arguments);
 }
