@@ -662,13 +662,8 @@ void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const
     if (sufixo.isEmpty()) {
         item.campos.juntarOrdenados(lida.campos);
     } else {
-        std::vector<CamposItem::Campo> lote;
-        lote.reserve(lida.campos.size());
-        for (const CamposItem::Campo& campo : lida.campos)
-            lote.push_back({CamposItem::numeroComSufixo(campo.nome, sufixo), campo.valor});
-        std::sort(
-            lote.begin(), lote.end(),
-            [](const CamposItem::Campo& a, const CamposItem::Campo& b) { return a.nome < b.nome; });
+        std::vector<CamposItem::Campo> lote = lida.campos;
+        CamposItem::renomearComSufixo(lote, sufixo);
         item.campos.juntarOrdenados(lote);
     }
     if (qtdPadrao && item.valorCampo("QTD" + sufixo).isEmpty())
