@@ -9,17 +9,6 @@
 
 namespace zvdb {
 
-namespace {
-
-bool opensGroup(const Tag& tag) {
-    return tag.code == 102 && !tag.value.empty() && tag.value[0] == '{';
-}
-bool closesGroup(const Tag& tag) {
-    return tag.code == 102 && !tag.value.empty() && tag.value[0] == '}';
-}
-
-}  // namespace
-
 DbObject::DbObject(Database& database, std::span<const Tag> tags)
     : database_(&database),
       fileTags_(tags.data()),
@@ -72,9 +61,9 @@ void DbObject::cacheIdentity() {
     for (std::size_t i = 1; i < all.size(); ++i) {
         const Tag& tag = all[i];
         if (tag.code == 100 || tag.code == 1001) break;
-        if (opensGroup(tag))
+        if (TagList::opensGroup(tag))
             inGroup = true;
-        else if (closesGroup(tag))
+        else if (TagList::closesGroup(tag))
             inGroup = false;
         else if (inGroup)
             continue;
@@ -97,9 +86,9 @@ void DbObject::setOwner(std::uint64_t owner) {
     std::size_t i = 1;
     for (; i < all.size(); ++i) {
         const Tag& tag = all[i];
-        if (opensGroup(tag)) {
+        if (TagList::opensGroup(tag)) {
             inGroup = true;
-        } else if (closesGroup(tag)) {
+        } else if (TagList::closesGroup(tag)) {
             inGroup = false;
         } else if (inGroup) {
             continue;
@@ -137,9 +126,9 @@ std::size_t DbObject::headerEnd() const {
     bool inGroup = false;
     for (; i < all.size(); ++i) {
         const Tag& tag = all[i];
-        if (opensGroup(tag))
+        if (TagList::opensGroup(tag))
             inGroup = true;
-        else if (closesGroup(tag))
+        else if (TagList::closesGroup(tag))
             inGroup = false;
         else if (!inGroup && tag.code != handleCode && tag.code != 330)
             break;
@@ -151,9 +140,9 @@ std::size_t DbObject::appGroupEnd(std::string_view group) const {
     const auto all = tags();
     for (std::size_t i = 1; i < all.size(); ++i) {
         if (all[i].code == 100 || all[i].code == 1001) break;
-        if (opensGroup(all[i]) && all[i].value.substr(1) == group) {
+        if (TagList::opensGroup(all[i]) && all[i].value.substr(1) == group) {
             for (std::size_t k = i + 1; k < all.size(); ++k)
-                if (closesGroup(all[k])) return k;
+                if (TagList::closesGroup(all[k])) return k;
             return 0;
         }
     }
@@ -356,7 +345,7 @@ std::uint64_t DbObject::extensionDictionaryHandle() const {
     if (close == 0) return 0;
     const auto all = tags();
     for (std::size_t i = close; i-- > 1;) {
-        if (opensGroup(all[i])) break;
+        if (TagList::opensGroup(all[i])) break;
         if (all[i].code == 360) return TagValues::toHandle(all[i].value);
     }
     return 0;
@@ -375,7 +364,7 @@ Dictionary* DbObject::getOrCreateExtensionDictionary() {
     // Drop a stale group (its dictionary is gone) before adding the new one.
     if (const std::size_t stale = appGroupEnd("ACAD_XDICTIONARY")) {
         std::size_t open = stale;
-        while (open > 0 && !opensGroup(all[open]))
+        while (open > 0 && !TagList::opensGroup(all[open]))
             --open;
         all.erase(all.begin() + static_cast<std::ptrdiff_t>(open),
                   all.begin() + static_cast<std::ptrdiff_t>(stale) + 1);
@@ -394,7 +383,7 @@ std::vector<std::uint64_t> DbObject::reactors() const {
     if (close == 0) return handles;
     const auto all = tags();
     std::size_t open = close;
-    while (open > 0 && !opensGroup(all[open]))
+    while (open > 0 && !TagList::opensGroup(all[open]))
         --open;
     for (std::size_t i = open + 1; i < close; ++i)
         if (all[i].code == 330) handles.push_back(TagValues::toHandle(all[i].value));

@@ -2,17 +2,6 @@
 
 namespace zvdb {
 
-namespace {
-
-bool opensGroup(const Tag& tag) {
-    return tag.code == 102 && !tag.value.empty() && tag.value[0] == '{';
-}
-bool closesGroup(const Tag& tag) {
-    return tag.code == 102 && !tag.value.empty() && tag.value[0] == '}';
-}
-
-}  // namespace
-
 std::size_t TagList::xdataStart(std::span<const Tag> all) {
     // Extended data is the run of codes 1000 and above at the end, opened by a 1001; an
     // Xrecord's own data stays below 1000, so the rule holds for it too.

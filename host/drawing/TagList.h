@@ -15,6 +15,13 @@ namespace zvdb {
 class TagList {
 public:
     // Index of the first extended-data tag (1001), or the tag count.
+    // "102 {NAME" and "102 }": the tags that open and close an application group.
+    static bool opensGroup(const Tag& tag) {
+        return tag.code == 102 && !tag.value.empty() && tag.value[0] == '{';
+    }
+    static bool closesGroup(const Tag& tag) {
+        return tag.code == 102 && !tag.value.empty() && tag.value[0] == '}';
+    }
     static std::size_t xdataStart(std::span<const Tag> all);
     // Index of the first tag with the code, outside application groups and before the
     // extended data, from `from` on; -1 when absent.
