@@ -84,6 +84,8 @@ public:
     static int MostraPagina(const QString& layer, bool zoom);
     static void TrocaPagina(const QString& layer);
     static bool IsPaginaCapa(const QString& layer);
+    // True when the product's page groups include `grupo`.
+    static bool ExisteGrupo(const QString& grupo);
     static bool IsPaginaIndice(const QString& layer);
     static void MarcaPagina(const QString& layer, const QString& palavra);
 

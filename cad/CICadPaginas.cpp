@@ -119,6 +119,15 @@ void CICad::TrocaPagina(const QString& layer) {
     if (SetLayerCorrente(layer).compare(layer, Qt::CaseInsensitive) == 0) ZoomExtents();
 }
 
+bool CICad::ExisteGrupo(const QString& grupo) {
+    zvsdk::ResultBuffer* grupos = zvInvokeLista("buscaListaGrupos");
+    bool existe = false;
+    for (const zvsdk::ResultBuffer* no = grupos; no && !existe; no = no->rbnext)
+        existe = no->restype == zvsdk::RTSTR && no->rstring == grupo;
+    LiberaLista(grupos);
+    return existe;
+}
+
 bool CICad::IsPaginaCapa(const QString& layer) {
     zvdb::LayerRecord* registro = Layer(layer, nullptr);
     return registro && !registro->xdata("KVR_ZV_CAPA").empty();

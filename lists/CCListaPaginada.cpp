@@ -20,15 +20,6 @@ bool Pergunta(int numero) {
                                                CIMensagens::Mensagem("ZVLISTAS", numero), false);
 }
 
-bool GrupoExiste(const QString& grupo) {
-    zvsdk::ResultBuffer* grupos = CICad::zvInvokeLista("buscaListaGrupos");
-    bool existe = false;
-    for (const zvsdk::ResultBuffer* no = grupos; no && !existe; no = no->rbnext)
-        existe = no->restype == zvsdk::RTSTR && no->rstring == grupo;
-    CICad::LiberaLista(grupos);
-    return existe;
-}
-
 }  // namespace
 
 QString CCListaPaginada::CaminhoBloco(const QString& valor) {
@@ -58,7 +49,7 @@ std::vector<CCListaPaginada::Bloco> CCListaPaginada::ResolveBlocos(CETemplate& m
 }
 
 void CCListaPaginada::CriaPaginas(const QString& grupo, std::vector<CEPaginaLista>& paginas) {
-    if (GrupoExiste(grupo) && Pergunta(89)) CICad::zvInvokeVoid("apagargrupo", {grupo});
+    if (CICad::ExisteGrupo(grupo) && Pergunta(89)) CICad::zvInvokeVoid("apagargrupo", {grupo});
     for (CEPaginaLista& pagina : paginas) {
         zvsdk::ResultBuffer* chamada = zvsdk::newString("criarpagina");
         chamada->rbnext = zvsdk::newString(grupo);

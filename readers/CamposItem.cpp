@@ -41,24 +41,24 @@ std::uint32_t CamposItem::numero(const QString& nome) {
     return novo;
 }
 
-std::uint32_t CamposItem::numeroComSufixo(std::uint32_t numero, const QString& sufixo) {
-    if (sufixo.isEmpty()) return numero;
-    std::vector<std::uint32_t>& numeros = Tabela().comSufixo[sufixo];
+// The number of the name with the suffix, from the suffix's array, made when first asked.
+// CamposItem::numero may grow the name table but not this array.
+std::uint32_t CamposItem::numeroNoSufixo(std::vector<std::uint32_t>& numeros, std::uint32_t numero,
+                                         const QString& sufixo) {
     if (numero >= numeros.size()) numeros.resize(numero + 1, kSemNumero);
     if (numeros[numero] == kSemNumero) numeros[numero] = CamposItem::numero(nome(numero) + sufixo);
     return numeros[numero];
 }
 
+std::uint32_t CamposItem::numeroComSufixo(std::uint32_t numero, const QString& sufixo) {
+    return sufixo.isEmpty() ? numero : numeroNoSufixo(Tabela().comSufixo[sufixo], numero, sufixo);
+}
+
 void CamposItem::renomearComSufixo(std::vector<Campo>& lote, const QString& sufixo) {
     if (sufixo.isEmpty()) return;
     std::vector<std::uint32_t>& numeros = Tabela().comSufixo[sufixo];
-    for (Campo& campo : lote) {
-        if (campo.nome >= numeros.size()) numeros.resize(campo.nome + 1, kSemNumero);
-        std::uint32_t& novo = numeros[campo.nome];
-        // numero() may grow the name table but not this suffix's array.
-        if (novo == kSemNumero) novo = numero(nome(campo.nome) + sufixo);
-        campo.nome = novo;
-    }
+    for (Campo& campo : lote)
+        campo.nome = numeroNoSufixo(numeros, campo.nome, sufixo);
     std::sort(lote.begin(), lote.end(),
               [](const Campo& a, const Campo& b) { return a.nome < b.nome; });
 }

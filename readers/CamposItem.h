@@ -83,6 +83,8 @@ public:
 
 private:
     std::vector<Campo>::const_iterator lugar(std::uint32_t numero) const;
+    static std::uint32_t numeroNoSufixo(std::vector<std::uint32_t>& numeros, std::uint32_t numero,
+                                        const QString& sufixo);
 
     std::vector<Campo> campos_;
 };

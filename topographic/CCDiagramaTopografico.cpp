@@ -52,15 +52,6 @@ void ImprimeCom(int numero, const QString& texto) {
     CICad::Imprime("\n" + Mensagem(numero) + texto + "\n");
 }
 
-bool GrupoExiste(const QString& grupo) {
-    zvsdk::ResultBuffer* grupos = CICad::zvInvokeLista("buscaListaGrupos");
-    bool existe = false;
-    for (const zvsdk::ResultBuffer* no = grupos; no && !existe; no = no->rbnext)
-        existe = no->restype == zvsdk::RTSTR && no->rstring == grupo;
-    CICad::LiberaLista(grupos);
-    return existe;
-}
-
 bool PerguntaSimNao(int numero) {
     zvsdk::SystemServices* servicos = zvsdk::systemServices();
     if (!servicos || !servicos->userInterface()) return false;
@@ -323,7 +314,7 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
         ZVResultado::Falhou();
         return;
     }
-    if (GrupoExiste(p.grupo) && PerguntaSimNao(kMsgGrupoExiste))
+    if (CICad::ExisteGrupo(p.grupo) && PerguntaSimNao(kMsgGrupoExiste))
         CICad::zvInvokeVoid("apagargrupo", {p.grupo});
     diretorio_ = CICad::GetStringLisp("*DIRETORIO_REDE*");
 
