@@ -9,6 +9,7 @@
 #include <QStringList>
 
 #include <memory>
+#include <string_view>
 #include <vector>
 
 namespace zvsdk {
@@ -177,6 +178,9 @@ public:
     static bool EhReferencia(const OdDbObjectId& id);
     static bool EhPolilinha(const OdDbObjectId& id);
     static QString GetLayerEntidade(const OdDbObjectId& id);
+    // The same name as the drawing holds it (UTF-8), valid until the entity changes; empty for
+    // what is no entity.
+    static std::string_view NomeLayerUtf8(const OdDbObjectId& id);
     // The vertices of a polyline, in the drawing's coordinates.
     static std::vector<CEPonto> GetVertices(const OdDbObjectId& polilinha);
     // Grows with every change to the drawing: what was read from it before stays valid while
@@ -220,6 +224,11 @@ public:
     static bool TemXData(const OdDbObjectId& id, const QString& aplicacao);
     // The items behind the application's name; empty when the object has none.
     static CEListaXData GetXData(const OdDbObjectId& id, const QString& aplicacao);
+    static CEListaXData GetXData(const OdDbObjectId& id, const char* aplicacao);
+    // Whether the object has items under the application; `texto` takes the first text item,
+    // if there is one (`temTexto`).
+    static bool TextoXData(const OdDbObjectId& id, const char* aplicacao, QString& texto,
+                           bool& temTexto);
     static void SetXData(const OdDbObjectId& id, const QString& aplicacao,
                          const CEListaXData& itens);
     static OdDbObjectId GetSimboloMestre(zvdb::Database* database, const OdDbObjectId& entidade);

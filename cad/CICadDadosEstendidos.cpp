@@ -46,7 +46,7 @@ void GravaTextoConfiguracao(const QString& aplicacao, const QString& valor) {
     ponto->setXData(U8(aplicacao), std::span<const zvdb::Tag>(&item, 1));
 }
 
-CEItemXData ItemXData(const std::vector<zvdb::Tag>& itens, std::size_t& i) {
+CEItemXData ItemXData(std::span<const zvdb::Tag> itens, std::size_t& i) {
     CEItemXData item;
     item.codigo = itens[i].code;
     item.texto = Q(itens[i].value);
@@ -63,8 +63,9 @@ CEItemXData ItemXData(const std::vector<zvdb::Tag>& itens, std::size_t& i) {
     return item;
 }
 
-CEListaXData ConverteXData(const std::vector<zvdb::Tag>& itens) {
+CEListaXData ConverteXData(std::span<const zvdb::Tag> itens) {
     CEListaXData lista;
+    lista.reserve(itens.size());
     for (std::size_t i = 0; i < itens.size(); ++i)
         lista.push_back(ItemXData(itens, i));
     return lista;
@@ -103,12 +104,33 @@ void CICad::RegistraApp(const QString& aplicacao, zvdb::Database* database) {
 
 bool CICad::TemXData(const OdDbObjectId& id, const QString& aplicacao) {
     zvdb::DbObject* objeto = Objeto(id);
-    return objeto && !objeto->xdata(U8(aplicacao)).empty();
+    return objeto && !objeto->xdataItems(U8(aplicacao)).empty();
 }
 
 CEListaXData CICad::GetXData(const OdDbObjectId& id, const QString& aplicacao) {
     zvdb::DbObject* objeto = Objeto(id);
-    return objeto ? ConverteXData(objeto->xdata(U8(aplicacao))) : CEListaXData();
+    return objeto ? ConverteXData(objeto->xdataItems(U8(aplicacao))) : CEListaXData();
+}
+
+CEListaXData CICad::GetXData(const OdDbObjectId& id, const char* aplicacao) {
+    zvdb::DbObject* objeto = Objeto(id);
+    return objeto ? ConverteXData(objeto->xdataItems(aplicacao)) : CEListaXData();
+}
+
+bool CICad::TextoXData(const OdDbObjectId& id, const char* aplicacao, QString& texto,
+                       bool& temTexto) {
+    zvdb::DbObject* objeto = Objeto(id);
+    const std::span<const zvdb::Tag> itens =
+        objeto ? objeto->xdataItems(aplicacao) : std::span<const zvdb::Tag>();
+    temTexto = false;
+    if (itens.empty()) return false;
+    for (const zvdb::Tag& item : itens)
+        if (item.code == 1000) {
+            texto = Q(item.value);
+            temTexto = true;
+            break;
+        }
+    return true;
 }
 
 void CICad::SetXData(const OdDbObjectId& id, const QString& aplicacao, const CEListaXData& itens) {

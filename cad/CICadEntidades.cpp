@@ -89,6 +89,11 @@ QString CICad::GetLayerEntidade(const OdDbObjectId& id) {
     return entidade ? Q(entidade->layer()) : QString();
 }
 
+std::string_view CICad::NomeLayerUtf8(const OdDbObjectId& id) {
+    auto* entidade = Como<zvdb::Entity>(id);
+    return entidade ? entidade->layer() : std::string_view();
+}
+
 std::vector<CEPonto> CICad::GetVertices(const OdDbObjectId& polilinha) {
     std::vector<CEPonto> pontos;
     if (auto* p = Como<zvdb::Polyline>(polilinha))

@@ -11,12 +11,15 @@ namespace {
 constexpr auto& kReguas = CCBorneDataReader::kCamposRegua;
 constexpr auto& kNumeros = CCBorneDataReader::kCamposNumero;
 
-QString Primeiro(const CEItemLista& item, const char* const (&nomes)[3],
-                 const QString& sufixo = QString()) {
-    for (const char* nome : nomes) {
-        const QString valor = item.valorCampo(nome + sufixo);
-        if (!valor.isEmpty()) return valor;
-    }
+// The first non-empty of three names (the languages' words for one field) under the suffix.
+template <NomeLiteral a, NomeLiteral b, NomeLiteral c>
+QString Primeiro(const CEItemLista& item, const QString& sufixo = QString()) {
+    if (const QString* v = item.campos.procura(NumeroCampo<a>(sufixo)); v && !v->isEmpty())
+        return *v;
+    if (const QString* v = item.campos.procura(NumeroCampo<b>(sufixo)); v && !v->isEmpty())
+        return *v;
+    if (const QString* v = item.campos.procura(NumeroCampo<c>(sufixo)); v && !v->isEmpty())
+        return *v;
     return {};
 }
 
@@ -42,11 +45,11 @@ struct CCBorneDataReader::Lado {
 };
 
 QString CCBorneDataReader::Regua(const CEItemLista& item) {
-    return Primeiro(item, kReguas);
+    return Primeiro<"REGUA", "STRIP", "REGLETA">(item);
 }
 
 QString CCBorneDataReader::Numero(const CEItemLista& item) {
-    return Primeiro(item, kNumeros);
+    return Primeiro<"NUMERO", "NUMBER", "NUMERO">(item);
 }
 
 // ---- sides
@@ -91,7 +94,7 @@ CCBorneDataReader::LadoBorne CCBorneDataReader::AchaLado(CCDataReader& leitor,
     if (lado.vizinho.isEmpty()) return lado;
     // A stale handle in the connection answer: the element is null, the side stays blank.
     lado.elemento = CICad::IdDoHandle(lado.vizinho, borne.database());
-    lado.fio = leitor.FioNoPonto(CICad::GetLayerEntidade(borne), lado.ponto);
+    lado.fio = leitor.FioNoPonto(leitor.LayerDe(borne), lado.ponto);
     lado.pontoElemento = leitor.PontoDaConexao(leitor.NumeroDoFio(lado.fio), lado.vizinho);
     return lado;
 }
@@ -115,7 +118,7 @@ void CCBorneDataReader::LeFiosLado(CCDataReader& leitor, CEItemLista& item,
                                    const OdDbObjectId& borne, const LadoBorne& lado, bool insercao,
                                    CETemplate* modelo) {
     if (!leitor.EhFioNumerado(lado.fio)) return;
-    const QString layer = CICad::GetLayerEntidade(borne);
+    const QString& layer = leitor.LayerDe(borne);
     const OdDbObjectId fioAqui = leitor.FioNoPonto(layer, lado.ponto);
     const OdDbObjectId fioOutro = leitor.FioNoPonto(layer, lado.outro);
     // The cut point's wire is read first on the insertion side, last on the cut side.
@@ -135,17 +138,17 @@ void CCBorneDataReader::LeFiosLado(CCDataReader& leitor, CEItemLista& item,
 void CCBorneDataReader::CompoeRelacaoBorne(const QString& sufixo, CEItemLista& item,
                                            const OdDbObjectId& elemento, const CEPonto& ponto,
                                            CETemplate& modelo) {
-    static const char* const kRelacoes[] = {"RELACAO", "TAG", "ETIQUETA"};
-    const QString rel = Primeiro(item, kRelacoes, sufixo);
-    const QString regua = Primeiro(item, kReguas, sufixo);
-    const QString num = Primeiro(item, kNumeros, sufixo);
+    const QString rel = Primeiro<"RELACAO", "TAG", "ETIQUETA">(item, sufixo);
+    const QString regua = Primeiro<"REGUA", "STRIP", "REGLETA">(item, sufixo);
+    const QString num = Primeiro<"NUMERO", "NUMBER", "NUMERO">(item, sufixo);
     const std::unique_ptr<zv::CEAtributo> ligacao = AtributoConexaoProximo(elemento, ponto);
     const QString lig = ligacao ? ligacao->GetValor() : QString();
     const QString sep = modelo.LerTexto("*CHAR_SEP_STD_CFG*");
     const bool relacaoPrimeiro = modelo.LerTexto("*ORDEM_CONCAT_STD*") == "1";
     auto define = [&](const QString& texto) {
-        for (const char* nome : kRelacoes)
-            item.definirCampo(nome + sufixo, texto);
+        item.definirCampo(NumeroCampo<"RELACAO">(sufixo), texto);
+        item.definirCampo(NumeroCampo<"TAG">(sufixo), texto);
+        item.definirCampo(NumeroCampo<"ETIQUETA">(sufixo), texto);
     };
     if (!lig.isEmpty()) define(relacaoPrimeiro ? rel + sep + lig : lig + sep + rel);
     // A terminal as neighbour has no relation of its own: strip and number stand for it.

@@ -290,32 +290,38 @@ std::optional<QString> NumeroNoCampoFio(const OdDbObjectId& entidade) {
     return std::nullopt;
 }
 
+}  // namespace
+
 // A cable core's number: the cable's own number (a CABO or CABLE attribute of its record)
 // and the core, from KVR_ZV_CABO; empty when there is none.
-QString NumeroNoCabo(const OdDbObjectId& entidade) {
+QString CCDataReader::NumeroNoCabo(const OdDbObjectId& entidade) const {
     const CEListaXData cabo = CICad::GetXData(entidade, "KVR_ZV_CABO");
     if (cabo.size() < 2 || !EhTexto(cabo[0]) || !EhTexto(cabo[1])) return {};
     QString esquerda, direita;
     ZVString(cabo[0].texto).DivideEmDois(CCDataReader::kSeparador, esquerda, direita);
     for (size_t i = 2; i < cabo.size(); ++i) {
         if (!EhTexto(cabo[i])) continue;
-        std::unique_ptr<zv::CEListaAtributos> atributos;
-        CICad::GetAtributosVirtuais(CICad::IdDoHandle(cabo[i].texto), atributos);
-        for (int a = 0; atributos && a < atributos->Quantidade(); ++a) {
-            const QString tag = (*atributos)[a].GetTag().toUpper();
-            if (tag == "CABO" || tag == "CABLE")
-                return (*atributos)[a].GetValor() + CCDataReader::kSeparador + esquerda;
+        auto guardado = numerosCabos_.constFind(cabo[i].texto);
+        if (guardado == numerosCabos_.constEnd()) {
+            std::optional<QString> numero;
+            std::unique_ptr<zv::CEListaAtributos> atributos;
+            CICad::GetAtributosVirtuais(CICad::IdDoHandle(cabo[i].texto), atributos);
+            for (int a = 0; atributos && a < atributos->Quantidade() && !numero; ++a) {
+                const QString tag = (*atributos)[a].GetTag().toUpper();
+                if (tag == "CABO" || tag == "CABLE") numero = (*atributos)[a].GetValor();
+            }
+            guardado = numerosCabos_.insert(cabo[i].texto, numero);
         }
+        if (*guardado) return **guardado + CCDataReader::kSeparador + esquerda;
     }
     return {};
 }
-
-}  // namespace
 
 void CCDataReader::ConfereVersao() const {
     const std::uint64_t versao = CICad::VersaoDesenho();
     if (versao == versaoLidas_) return;
     numerosFios_.clear();
+    numerosCabos_.clear();
     ligacoesPorElemento_.clear();
     entidadesLidas_.clear();
     versaoLidas_ = versao;
@@ -346,7 +352,7 @@ bool CCDataReader::EhFioNumerado(const OdDbObjectId& entidade) const {
 
 QString CCDataReader::VizinhoNaConexao(const OdDbObjectId& entidade, const CEPonto& ponto,
                                        bool anterior) {
-    const OdDbObjectId fio = FioNoPonto(CICad::GetLayerEntidade(entidade), ponto);
+    const OdDbObjectId fio = FioNoPonto(LayerDe(entidade), ponto);
     if (fio.isNull()) return {};
     const QString numero = NumeroDoFio(fio);
     const QStringList* elementos = ListaConexoes(numero);
@@ -433,14 +439,12 @@ bool CCDataReader::EhEquipamento(const OdDbObjectId& id) const {
 
 bool CCDataReader::ChaveENorma(const OdDbObjectId& entidade, QString& chave, QString& norma) const {
     for (const char* aplicacao : kAplicacoesChave) {
-        const CEListaXData itens = CICad::GetXData(entidade, aplicacao);
-        if (itens.empty()) continue;
-        for (const CEItemXData& item : itens)
-            if (EhTexto(item)) {
-                chave.clear(), norma.clear();
-                ZVString(item.texto).DivideEmDois(kSeparador, chave, norma);
-                return true;
-            }
+        QString texto;
+        bool temTexto = false;
+        if (!CICad::TextoXData(entidade, aplicacao, texto, temTexto)) continue;
+        if (!temTexto) return true;
+        chave.clear(), norma.clear();
+        ZVString(texto).DivideEmDois(kSeparador, chave, norma);
         return true;
     }
     return false;
@@ -473,16 +477,32 @@ void CCDataReader::LeColunasUsuario(const QString& sufixo, CEItemLista& item,
 }
 
 void CCDataReader::LeLayer(const QString& sufixo, CEItemLista& item, const QString& layer) {
-    item.definirCampo("LAYER" + sufixo, layer);
-    const QStringList partes = ZVString(layer).Divide("$");
-    item.definirCampo("GRUPO" + sufixo, partes.size() == 3 ? partes[0] : QString());
-    item.definirCampo("PAGINA" + sufixo, partes.size() == 3 ? partes[1] : QString());
+    item.definirCampo(NumeroCampo<"LAYER">(sufixo), layer);
+    auto it = gruposPaginas_.constFind(layer);
+    if (it == gruposPaginas_.constEnd()) {
+        const QStringList partes = ZVString(layer).Divide("$");
+        it = gruposPaginas_.insert(layer, partes.size() == 3 ? std::pair(partes[0], partes[1])
+                                                             : std::pair(QString(), QString()));
+    }
+    item.definirCampo(NumeroCampo<"GRUPO">(sufixo), it->first);
+    item.definirCampo(NumeroCampo<"PAGINA">(sufixo), it->second);
+}
+
+const QString& CCDataReader::LayerDe(const OdDbObjectId& entidade) const {
+    const std::string_view nome = CICad::NomeLayerUtf8(entidade);
+    auto it = layers_.find(nome);
+    if (it == layers_.end()) it = layers_.emplace(nome, CICad::GetLayerEntidade(entidade)).first;
+    return it->second;
 }
 
 QString CCDataReader::TextoTipo(const QString& tipo) {
+    auto it = textosTipo_.constFind(tipo);
+    if (it != textosTipo_.constEnd()) return *it;
     bool ok = false;
     const int n = tipo.trimmed().toInt(&ok);
-    return CIMensagens::Mensagem("ZVLISTAS", ok && n >= 2 && n <= 26 ? 299 + n : 300);
+    return textosTipo_
+        .insert(tipo, CIMensagens::Mensagem("ZVLISTAS", ok && n >= 2 && n <= 26 ? 299 + n : 300))
+        .value();
 }
 
 QString CCDataReader::Posicao(const OdDbObjectId& entidade) const {
@@ -528,9 +548,9 @@ void CCDataReader::LeCircuitoLocal(const QString& sufixo, CEItemLista& item,
         circuito = it.value();
     }
     // PAINEL and LOCAL hold the same value: templates use either name.
-    item.definirCampo("PAINEL" + sufixo, circuito.painel);
-    item.definirCampo("LOCAL" + sufixo, circuito.painel);
-    item.definirCampo("CIRCUITO" + sufixo, circuito.circuito);
+    item.definirCampo(NumeroCampo<"PAINEL">(sufixo), circuito.painel);
+    item.definirCampo(NumeroCampo<"LOCAL">(sufixo), circuito.painel);
+    item.definirCampo(NumeroCampo<"CIRCUITO">(sufixo), circuito.circuito);
 }
 
 void CCDataReader::LeLayout(const QString& sufixo, CEItemLista& item,
@@ -541,8 +561,10 @@ void CCDataReader::LeLayout(const QString& sufixo, CEItemLista& item,
         const OdDbObjectId ref = CICad::IdDoHandle(layout[indice].texto, entidade.database());
         if (!CICad::EhReferencia(ref)) continue;
         const CEPonto p = CICad::GetPosicao(ref);
-        item.definirCampo("LAYOUTPOSITIONX" + sufixo, QString::number(qint64(std::trunc(p.x))));
-        item.definirCampo("LAYOUTPOSITIONY" + sufixo, QString::number(qint64(std::trunc(p.y))));
+        item.definirCampo(NumeroCampo<"LAYOUTPOSITIONX">(sufixo),
+                          QString::number(qint64(std::trunc(p.x))));
+        item.definirCampo(NumeroCampo<"LAYOUTPOSITIONY">(sufixo),
+                          QString::number(qint64(std::trunc(p.y))));
         break;
     }
     QString orientacao = "0";
@@ -551,7 +573,7 @@ void CCDataReader::LeLayout(const QString& sufixo, CEItemLista& item,
         if (CICad::EhReferencia(ref))
             orientacao = ZVString::DeReal(CICad::GetRotacao(ref) * 180.0 / M_PI);
     }
-    item.definirCampo("ORIENTACAO" + sufixo, orientacao);
+    item.definirCampo(NumeroCampo<"ORIENTACAO">(sufixo), orientacao);
 }
 
 void CCDataReader::LeBloco(const QString& s, CEItemLista& item, const OdDbObjectId& referencia,
@@ -569,20 +591,23 @@ void CCDataReader::LeBloco(const QString& s, CEItemLista& item, const OdDbObject
         item.definirCampo((*atributos)[i].GetTag() + s, (*atributos)[i].GetValor());
     if (CICad::GetNomeBloco(referencia).startsWith("PIN-")) {
         const CEListaXData pino = CICad::GetXData(referencia, "ZV_PINO");
-        if (!pino.empty() && EhTexto(pino[0])) item.definirCampo("CONECTOR" + s, pino[0].texto);
+        if (!pino.empty() && EhTexto(pino[0]))
+            item.definirCampo(NumeroCampo<"CONECTOR">(s), pino[0].texto);
     }
-    item.definirCampo("HANDLE" + s, ZVString::DeHandle(referencia.handle()));
+    item.definirCampo(NumeroCampo<"HANDLE">(s), ZVString::DeHandle(referencia.handle()));
     LeCircuitoLocal(s, item, referencia);
-    item.definirCampo("ZV_LISTA" + s, catalogo_.ListaComp(chave, norma));
-    item.definirCampo("ZV_KEY" + s, chave);
+    item.definirCampo(NumeroCampo<"ZV_LISTA">(s), catalogo_.ListaComp(chave, norma));
+    item.definirCampo(NumeroCampo<"ZV_KEY">(s), chave);
     const QString descricao = catalogo_.DescricaoComp(chave);
-    item.definirCampo("DESCRICAO" + s, descricao);
-    item.definirCampo("TP_DESCRI" + s, descricao);
-    item.definirCampo("POSICAO" + s, Posicao(referencia));
-    LeLayer(s, item, CICad::GetLayerEntidade(referencia));
-    item.definirCampo("COMPONENTTYPE" + s, TextoTipo(catalogo_.TipoComp(chave)));
-    if (item.valorCampo("QTD" + s).isEmpty()) item.definirCampo("QTD" + s, "1");
-    item.definirCampo("SAP_MATERIAL" + s, catalogo_.MaterialSap(chave));
+    item.definirCampo(NumeroCampo<"DESCRICAO">(s), descricao);
+    item.definirCampo(NumeroCampo<"TP_DESCRI">(s), descricao);
+    item.definirCampo(NumeroCampo<"POSICAO">(s), Posicao(referencia));
+    LeLayer(s, item, LayerDe(referencia));
+    item.definirCampo(NumeroCampo<"COMPONENTTYPE">(s), TextoTipo(catalogo_.TipoComp(chave)));
+    const std::uint32_t qtd = NumeroCampo<"QTD">(s);
+    if (const QString* valor = item.campos.procura(qtd); !valor || valor->isEmpty())
+        item.definirCampo(qtd, QStringLiteral("1"));
+    item.definirCampo(NumeroCampo<"SAP_MATERIAL">(s), catalogo_.MaterialSap(chave));
     LeLayout(s, item, referencia);
 }
 
@@ -599,7 +624,12 @@ void CCDataReader::LeRotasDoItem(const CEItemLista& item, CETemplate* modelo) {
 bool CCDataReader::LeCamposFio(const QString& s, CEItemLista& item, const OdDbObjectId& polilinha) {
     const QString chaveTexto = ChaveDaEntidade(polilinha);
     LeColunasUsuario(s, item, catalogo_.ColunasFio(chaveTexto));
-    CICad::RegistraApp("KVR_ZV_WIRE", polilinha.database());
+    if (appFioEm_ != polilinha.database() ||
+        appFioVersao_ != CICad::VersaoDesenho(polilinha.database())) {
+        CICad::RegistraApp("KVR_ZV_WIRE", polilinha.database());
+        appFioEm_ = polilinha.database();
+        appFioVersao_ = CICad::VersaoDesenho(polilinha.database());
+    }
     const CEListaXData fio = CICad::GetXData(polilinha, "KVR_ZV_WIRE");
     QString chave, norma;
     if (!fio.empty()) {
@@ -607,21 +637,23 @@ bool CCDataReader::LeCamposFio(const QString& s, CEItemLista& item, const OdDbOb
         const QString segundo = fio.size() > 1 ? fio[1].texto : QString();
         // Without key, standard and its second item the polyline is no complete wire.
         if (chave.isEmpty() || norma.isEmpty() || segundo.isEmpty()) return false;
-        item.definirCampo("ZV_KEY" + s, chave);
+        item.definirCampo(NumeroCampo<"ZV_KEY">(s), chave);
         for (size_t i = 2; i < fio.size(); ++i) {
             QString nome, valor;
             if (ZVString(fio[i].texto).DivideEmDois(kSeparador, nome, valor) && !nome.isEmpty())
                 item.definirCampo(nome + s, valor);
         }
     }
-    item.definirCampo("WIRE_LISTA" + s, catalogo_.ListaFio(chave, norma));
+    item.definirCampo(NumeroCampo<"WIRE_LISTA">(s), catalogo_.ListaFio(chave, norma));
     const QString descricao = catalogo_.DescricaoFio(chave);
-    item.definirCampo("DESCRICAO" + s, descricao);
-    item.definirCampo("TP_DESCRI" + s, descricao);
-    item.definirCampo("POSICAO" + s, Posicao(polilinha));
-    LeLayer(s, item, CICad::GetLayerEntidade(polilinha));
-    if (item.valorCampo("QTD" + s).isEmpty()) item.definirCampo("QTD" + s, "1");
-    item.definirCampo("SAP_MATERIAL" + s, QString());
+    item.definirCampo(NumeroCampo<"DESCRICAO">(s), descricao);
+    item.definirCampo(NumeroCampo<"TP_DESCRI">(s), descricao);
+    item.definirCampo(NumeroCampo<"POSICAO">(s), Posicao(polilinha));
+    LeLayer(s, item, LayerDe(polilinha));
+    const std::uint32_t qtd = NumeroCampo<"QTD">(s);
+    if (const QString* valor = item.campos.procura(qtd); !valor || valor->isEmpty())
+        item.definirCampo(qtd, QStringLiteral("1"));
+    item.definirCampo(NumeroCampo<"SAP_MATERIAL">(s), QString());
     return true;
 }
 
@@ -667,7 +699,7 @@ void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const
         item.campos.juntarOrdenados(lote);
     }
     if (qtdPadrao && item.valorCampo("QTD" + sufixo).isEmpty())
-        item.definirCampo("QTD" + sufixo, "1");
+        item.definirCampo(NumeroCampo<"QTD">(sufixo), "1");
     if (rotas) LeRotasDoItem(item, modelo);
 }
 

@@ -112,10 +112,12 @@ public:
 
     // The position text of the project's grid, or "??".
     QString Posicao(const OdDbObjectId& entidade) const;
+    // The entity's layer name; the texts are made once per name and shared by the items.
+    const QString& LayerDe(const OdDbObjectId& entidade) const;
     // LAYER, GRUPO and PAGINA under the suffix.
-    static void LeLayer(const QString& sufixo, CEItemLista& item, const QString& layer);
+    void LeLayer(const QString& sufixo, CEItemLista& item, const QString& layer);
     // The text of a catalogue type number.
-    static QString TextoTipo(const QString& tipo);
+    QString TextoTipo(const QString& tipo);
 
 protected:
     // The symbols an item is made of are kept for CopiaEntidade: set by the readers that
@@ -182,6 +184,9 @@ private:
         bool proprio = false;
     };
     mutable std::unordered_map<OdDbObjectId, NumeroFio> numerosFios_;
+    // Per cable record (by handle text): its CABO or CABLE attribute, shared by its cores.
+    mutable QHash<QString, std::optional<QString>> numerosCabos_;
+    QString NumeroNoCabo(const OdDbObjectId& entidade) const;
     // Per element, its connection attributes with the places of their texts.
     struct LigacaoGuardada {
         CEPonto posicao;
@@ -195,6 +200,18 @@ private:
     const NumeroFio& NumeroDoFioGuardado(const OdDbObjectId& entidade) const;
     // Catalogue column texts split into name and value (an empty name: not a column).
     QHash<QString, std::pair<QString, QString>> colunasDivididas_;
+    // Per layer name, its group and page (empty unless the name has three parts); per catalogue
+    // type, its text: items repeat a few of each.
+    QHash<QString, std::pair<QString, QString>> gruposPaginas_;
+    QHash<QString, QString> textosTipo_;
+    struct HashTexto {
+        using is_transparent = void;
+        size_t operator()(std::string_view t) const { return std::hash<std::string_view>{}(t); }
+    };
+    mutable std::unordered_map<std::string, QString, HashTexto, std::equal_to<>> layers_;
+    // The drawing and its version where KVR_ZV_WIRE was last registered.
+    const void* appFioEm_ = nullptr;
+    std::uint64_t appFioVersao_ = 0;
     // Per accessory key and standard: the fields of a unit, and its user columns.
     QHash<QString, CEItemLista> basesAcessorio_, basesColunas_;
     CECacheCatalogo catalogo_;

@@ -25,6 +25,8 @@ public:
     // The value without a copy, or null; valid until the item's fields change.
     const QString* campo(const QString& chave) const { return campos.procura(chave); }
     void definirCampo(const QString& chave, const QString& valor) { campos.insert(chave, valor); }
+    // By name number (CamposItem::numero), for names the readers write again and again.
+    void definirCampo(std::uint32_t numero, const QString& valor) { campos.insert(numero, valor); }
     void definirCampoInteiro(const QString& chave, int valor);
     void definirCampoReal(const QString& chave, double valor, int decimais = -1);
     void copiarCampos(const CEItemLista& origem);

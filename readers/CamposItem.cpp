@@ -109,7 +109,10 @@ CamposItem::const_iterator CamposItem::find(const QString& chave) const {
 }
 
 void CamposItem::insert(const QString& chave, const QString& valor) {
-    const std::uint32_t n = numero(chave);
+    insert(numero(chave), valor);
+}
+
+void CamposItem::insert(std::uint32_t n, const QString& valor) {
     // Items hold tens of fields: the first steps of the array's growth are skipped.
     if (campos_.capacity() == 0) campos_.reserve(16);
     const auto it = campos_.begin() + (lugar(n) - campos_.cbegin());

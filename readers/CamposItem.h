@@ -6,6 +6,8 @@
 #include <QString>
 #include <QStringList>
 
+#include <algorithm>
+#include <cstddef>
 #include <cstdint>
 #include <vector>
 
@@ -51,6 +53,7 @@ public:
     // The stored value or null; the pointer lives until the next change of the fields.
     const QString* procura(const QString& chave) const;
     void insert(const QString& chave, const QString& valor);
+    void insert(std::uint32_t numero, const QString& valor);
     int remove(const QString& chave);
     void clear() { campos_.clear(); }
     // Each field of `origem` under the same name, replacing what was there.
@@ -88,3 +91,18 @@ private:
 
     std::vector<Campo> campos_;
 };
+
+// A field name written in the code, as a template argument: NumeroCampo<"LAYER">(sufixo) is
+// the number of "LAYER" plus the suffix, with the name looked up once for the program and the
+// joined names made once per suffix.
+template <std::size_t N>
+struct NomeLiteral {
+    char texto[N];
+    constexpr NomeLiteral(const char (&nome)[N]) { std::copy_n(nome, N, texto); }
+};
+
+template <NomeLiteral nome>
+std::uint32_t NumeroCampo(const QString& sufixo = QString()) {
+    static const std::uint32_t numero = CamposItem::numero(QString::fromLatin1(nome.texto));
+    return CamposItem::numeroComSufixo(numero, sufixo);
+}

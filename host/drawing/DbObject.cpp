@@ -288,8 +288,20 @@ std::vector<std::vector<Tag>> DbObject::xdataGroups(std::string_view application
 }
 
 std::vector<Tag> DbObject::xdata(std::string_view application) const {
-    auto groups = xdataGroups(application);
-    return groups.empty() ? std::vector<Tag>() : std::move(groups.front());
+    const std::span<const Tag> items = xdataItems(application);
+    return std::vector<Tag>(items.begin(), items.end());
+}
+
+std::span<const Tag> DbObject::xdataItems(std::string_view application) const {
+    const auto all = tags();
+    for (std::size_t i = xdataStart(); i < all.size(); ++i) {
+        if (all[i].code != 1001 || !TagValues::sameName(all[i].value, application)) continue;
+        std::size_t end = i + 1;
+        while (end < all.size() && all[end].code != 1001)
+            ++end;
+        return all.subspan(i + 1, end - i - 1);
+    }
+    return {};
 }
 
 void DbObject::setXData(std::string_view application, std::span<const Tag> items) {

@@ -70,6 +70,9 @@ public:
     bool hasXData(std::string_view application) const;
     // The items after the application name of its first group; empty when absent.
     std::vector<Tag> xdata(std::string_view application) const;
+    // The same items as they stand in the object's tags, without a copy; valid until the
+    // object changes.
+    std::span<const Tag> xdataItems(std::string_view application) const;
     std::vector<std::vector<Tag>> xdataGroups(std::string_view application) const;
     // Replaces the application's first group (later groups stay) or appends one; the
     // application is registered in the APPID table.
