@@ -173,6 +173,13 @@ TEST_F(DatabaseApi, ExtendedDataKeepsApplicationsAndRepeatedGroups) {
     EXPECT_EQ(wire->xdataGroups("ZV_OTHER")[1][0].value, "second");
     EXPECT_EQ(wire->xdata("KVR_ZV_WIRE").size(), 2u);
     EXPECT_EQ(wire->xdata("MISSING").size(), 0u);
+    // The view in place holds the first group only, as xdata() does, and nothing when absent.
+    const std::span<const Tag> first = wire->xdataItems("zv_other");
+    ASSERT_EQ(first.size(), 1u);
+    EXPECT_EQ(first[0].value, "changed");
+    EXPECT_EQ(std::vector<Tag>(first.begin(), first.end()), wire->xdata("ZV_OTHER"));
+    EXPECT_EQ(wire->xdataItems("KVR_ZV_WIRE").size(), 2u);
+    EXPECT_TRUE(wire->xdataItems("MISSING").empty());
 
     auto again = reloaded(db);
     Entity* read = again->entityByHandle(wire->handle());

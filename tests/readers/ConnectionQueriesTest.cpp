@@ -4,7 +4,9 @@
 #include "QtPrinters.h"
 #include "cad/CICad.h"
 #include "cad/FacadeFixture.h"
+#include "drawing/Dictionary.h"
 #include "drawing/Polyline.h"
+#include "drawing/XRecord.h"
 #include "lists/TemplateDouble.h"
 #include "readers/CCBorneDataReader.h"
 #include "readers/CCDataReader.h"
@@ -406,4 +408,57 @@ TEST_F(ConnectionQueriesTest, ACopyOfAnEntityEqualsReadingItUnderTheSuffix) {
     r->CopiaEntidade("", item, id(k), nullptr);
     EXPECT_EQ(item.valorCampo("QTD"), "1");
     EXPECT_EQ(item.valorCampo("TAG"), "K1");
+}
+
+// A cable core's number is its record's CABO attribute and the core; cores of one cable share
+// the record, and a new cable number is seen once the drawing changed.
+TEST_F(ConnectionQueriesTest, CoresOfACableTakeItsNumberAndFollowItsChange) {
+    const std::string caminho[] = {"ZV_CABOS"};
+    zvdb::XRecord* registro = db().dictionaryAt(caminho, true)->getOrCreateXRecord("W1");
+    auto nomeia = [&](const std::string& numero) {
+        registro->setXData("KVR_ZV_ATT_VIRTUAL",
+                           zvsample::XDataItems().text("CABO\f" + numero + "\fN").tags());
+    };
+    nomeia("W1");
+    auto via = [&](int n) {
+        zvdb::Polyline* linha = db().modelSpace()->addLwPolyline({{0, 0, 0}, {9, 0, 0}}, false);
+        const std::string h = ZVString::DeHandle(registro->handle()).toStdString();
+        linha->setXData("KVR_ZV_CABO",
+                        zvsample::XDataItems()
+                            .text("2010" + std::to_string(n) + "\f" + std::to_string(n))
+                            .text(h)
+                            .text(h)
+                            .tags());
+        return linha;
+    };
+    zvdb::Polyline* um = via(1);
+    zvdb::Polyline* dois = via(2);
+    auto r = leitor();
+    EXPECT_EQ(r->NumeroDoFio(id(um)), "W1\f20101");
+    EXPECT_EQ(r->NumeroDoFio(id(dois)), "W1\f20102");
+    EXPECT_FALSE(r->EhFioNumerado(id(um)));
+    nomeia("W7");
+    EXPECT_EQ(r->NumeroDoFio(id(dois)), "W7\f20102");
+    // A record without a cable number: the core has none either.
+    registro->setXData("KVR_ZV_ATT_VIRTUAL", zvsample::XDataItems().text("COR\fAZUL\fN").tags());
+    EXPECT_EQ(r->NumeroDoFio(id(um)), "");
+}
+
+// The key and standard come from the first of KVR_ZV, KVR_ZV_WIRE and KVR_ZV_CABO that has
+// items, from its first text item; an application with items but no text gives none.
+TEST_F(ConnectionQueriesTest, TheKeyComesFromTheFirstApplicationWithItems) {
+    auto* ref =
+        db().modelSpace()->addBlockReference(bloco("NA-1"), {0, 0, 0}, {1, 1, 1}, 0, kPagina);
+    ref->setXData("KVR_ZV_CABO", zvsample::XDataItems().text("20003\fIEC").tags());
+    auto r = leitor();
+    EXPECT_EQ(r->ChaveDaEntidade(id(ref)), "20003");
+    EXPECT_EQ(r->NormaDaEntidade(id(ref)), "IEC");
+    ref->setXData("KVR_ZV_WIRE",
+                  zvsample::XDataItems().point({1, 2, 3}).text("10006\fNEMA").tags());
+    EXPECT_EQ(r->ChaveDaEntidade(id(ref)), "10006");
+    EXPECT_EQ(r->NormaDaEntidade(id(ref)), "NEMA");
+    ref->setXData("KVR_ZV", zvsample::XDataItems().point({1, 2, 3}).tags());
+    EXPECT_EQ(r->ChaveDaEntidade(id(ref)), "");
+    auto* sem = db().modelSpace()->addBlockReference(bloco("NA-1"), {0, 0, 0});
+    EXPECT_EQ(r->ChaveDaEntidade(id(sem)), "");
 }
