@@ -85,6 +85,7 @@ void CCDataReader::CarregaConexoes(const QString& funcao, bool detalhes) {
                 // the handle before the first "#", or the whole text
                 conexoes.elementos
                     << (detalhes ? no->rstring.left(no->rstring.indexOf('#')) : no->rstring);
+                conexoes.handles.push_back(ZVString(conexoes.elementos.back()).ParaHandle());
                 if (detalhes) conexoes.completas << no->rstring;
                 conexoes.pontos.push_back({});
                 coordenada = 0;
@@ -322,6 +323,7 @@ void CCDataReader::ConfereVersao() const {
     if (versao == versaoLidas_) return;
     numerosFios_.clear();
     numerosCabos_.clear();
+    corteDe_ = OdDbObjectId();
     ligacoesPorElemento_.clear();
     entidadesLidas_.clear();
     versaoLidas_ = versao;
@@ -354,29 +356,35 @@ QString CCDataReader::VizinhoNaConexao(const OdDbObjectId& entidade, const CEPon
                                        bool anterior) {
     const OdDbObjectId fio = FioNoPonto(LayerDe(entidade), ponto);
     if (fio.isNull()) return {};
-    const QString numero = NumeroDoFio(fio);
-    const QStringList* elementos = ListaConexoes(numero);
-    const std::vector<CEPonto>* pontos = PontosConexao(numero);
-    if (!elementos || !pontos || elementos->size() < 2 || pontos->size() < 2) return {};
-    auto ehEntidade = [&entidade](const QString& handle) {
-        return ZVString(handle).ParaHandle() == entidade.handle();
-    };
+    auto c = conexoes_.constFind(NumeroDoFio(fio));
+    if (c == conexoes_.constEnd()) return {};
+    const QStringList& elementos = c->elementos;
+    const std::vector<CEPonto>& pontos = c->pontos;
+    if (elementos.size() < 2 || pontos.size() < 2) return {};
+    auto ehEntidade = [&](int i) { return c->handles[size_t(i)] == entidade.handle(); };
     bool seguinte = false;
-    for (int i = 0; i < elementos->size() && size_t(i) < pontos->size(); ++i) {
-        const QString& elemento = (*elementos)[i];
+    for (int i = 0; i < elementos.size() && size_t(i) < pontos.size(); ++i) {
         const bool aqui =
-            ehEntidade(elemento) && Distancia((*pontos)[size_t(i)], ponto) < kToleranciaElemento;
+            ehEntidade(i) && Distancia(pontos[size_t(i)], ponto) < kToleranciaElemento;
         if (anterior) {
-            if (aqui && i > 0 && !ehEntidade((*elementos)[i - 1])) return (*elementos)[i - 1];
+            if (aqui && i > 0 && !ehEntidade(i - 1)) return elementos[i - 1];
             continue;
         }
-        if (seguinte && !ehEntidade(elemento)) return elemento;
+        if (seguinte && !ehEntidade(i)) return elementos[i];
         seguinte = aqui;
     }
     return {};
 }
 
 CEPonto CCDataReader::PontoDeCorte(const OdDbObjectId& referencia) const {
+    ConfereVersao();
+    if (!corteDe_.isNull() && corteDe_ == referencia) return corte_;
+    corte_ = LePontoDeCorte(referencia);
+    corteDe_ = referencia;
+    return corte_;
+}
+
+CEPonto CCDataReader::LePontoDeCorte(const OdDbObjectId& referencia) const {
     const CEListaXData corte = CICad::GetXData(referencia, "KVR_ZV_PTS_CORTE");
     std::vector<CEPonto> pontos;
     for (const CEItemXData& item : corte)

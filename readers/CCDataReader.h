@@ -133,6 +133,8 @@ private:
         QStringList elementos;
         QStringList completas;
         std::vector<CEPonto> pontos;
+        // The elements' handles as numbers, for comparing with entities.
+        std::vector<std::uint64_t> handles;
     };
     void CarregaConexoes(const QString& funcao, bool detalhes);
     bool FioSobPonto(const std::vector<CEPonto>& vertices, const CEPonto& ponto) const;
@@ -193,6 +195,10 @@ private:
         zv::CEAtributo atributo;
     };
     mutable std::unordered_map<OdDbObjectId, std::vector<LigacaoGuardada>> ligacoesPorElemento_;
+    // The last cut point asked for: both sides of a terminal ask for it.
+    mutable OdDbObjectId corteDe_;
+    mutable CEPonto corte_;
+    CEPonto LePontoDeCorte(const OdDbObjectId& referencia) const;
     // The drawing's version the entity caches above were read at.
     mutable std::uint64_t versaoLidas_ = 0;
     // Empties the caches of entities when the drawing changed since they were read.
