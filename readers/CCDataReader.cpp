@@ -486,8 +486,22 @@ QString CCDataReader::TextoTipo(const QString& tipo) {
 }
 
 QString CCDataReader::Posicao(const OdDbObjectId& entidade) const {
-    const QStringList partes = ZVString(CICad::GetLayerEntidade(entidade)).Divide("$");
-    if (partes.size() != 3) return "??";
+    // A page's layer is GROUP$PAGE$SHEET: three non-empty parts between the "$"s.
+    const QString layer = CICad::GetLayerEntidade(entidade);
+    int inicio[3], fim[3];
+    int partes = 0;
+    for (int i = 0, n = layer.size(); i < n && partes <= 3;) {
+        if (layer[i] == '$') {
+            ++i;
+            continue;
+        }
+        const int comeco = i;
+        while (i < n && layer[i] != '$')
+            ++i;
+        if (partes < 3) inicio[partes] = comeco, fim[partes] = i;
+        ++partes;
+    }
+    if (partes != 3) return "??";
     CEPonto p;
     if (CICad::EhPolilinha(entidade)) {
         const std::vector<CEPonto> vertices = CICad::GetVertices(entidade);
@@ -498,10 +512,11 @@ QString CCDataReader::Posicao(const OdDbObjectId& entidade) const {
     } else {
         return "??";
     }
-    ResultBuffer* chamada = zvsdk::newString("BuscarCoordenadas");
+    static const QString funcao("BuscarCoordenadas");
+    ResultBuffer* chamada = zvsdk::newString(funcao);
     ResultBuffer* cauda = chamada->rbnext = zvsdk::newEntity(entidade.entityName());
-    cauda = cauda->rbnext = zvsdk::newString(partes[0]);
-    cauda = cauda->rbnext = zvsdk::newString(partes[1]);
+    cauda = cauda->rbnext = zvsdk::newString(layer.mid(inicio[0], fim[0] - inicio[0]));
+    cauda = cauda->rbnext = zvsdk::newString(layer.mid(inicio[1], fim[1] - inicio[1]));
     cauda = cauda->rbnext = zvsdk::newReal(p.x);
     cauda->rbnext = zvsdk::newReal(p.y);
     ResultBuffer* resposta = CICad::InvokeChain(chamada);
