@@ -485,23 +485,41 @@ QString CCDataReader::TextoTipo(const QString& tipo) {
     return CIMensagens::Mensagem("ZVLISTAS", ok && n >= 2 && n <= 26 ? 299 + n : 300);
 }
 
-QString CCDataReader::Posicao(const OdDbObjectId& entidade) const {
-    // A page's layer is GROUP$PAGE$SHEET: three non-empty parts between the "$"s.
-    const QString layer = CICad::GetLayerEntidade(entidade);
-    int inicio[3], fim[3];
-    int partes = 0;
-    for (int i = 0, n = layer.size(); i < n && partes <= 3;) {
-        if (layer[i] == '$') {
-            ++i;
-            continue;
+namespace {
+// A page's layer is GROUP$PAGE$SHEET: three non-empty parts between the "$"s. Symbols and
+// wires come page by page, so the last layer's parts are kept.
+struct PartesLayer {
+    QString layer;
+    bool pagina = false;
+    QString grupo, numero;
+
+    void le(const QString& nome) {
+        if (nome == layer && !layer.isNull()) return;
+        layer = nome;
+        int inicio[3] = {}, fim[3] = {};
+        int partes = 0;
+        for (int i = 0, n = nome.size(); i < n && partes <= 3;) {
+            if (nome[i] == '$') {
+                ++i;
+                continue;
+            }
+            const int comeco = i;
+            while (i < n && nome[i] != '$')
+                ++i;
+            if (partes < 3) inicio[partes] = comeco, fim[partes] = i;
+            ++partes;
         }
-        const int comeco = i;
-        while (i < n && layer[i] != '$')
-            ++i;
-        if (partes < 3) inicio[partes] = comeco, fim[partes] = i;
-        ++partes;
+        pagina = partes == 3;
+        grupo = pagina ? nome.mid(inicio[0], fim[0] - inicio[0]) : QString();
+        numero = pagina ? nome.mid(inicio[1], fim[1] - inicio[1]) : QString();
     }
-    if (partes != 3) return "??";
+};
+}  // namespace
+
+QString CCDataReader::Posicao(const OdDbObjectId& entidade) const {
+    static PartesLayer partes;
+    partes.le(CICad::GetLayerEntidade(entidade));
+    if (!partes.pagina) return "??";
     CEPonto p;
     if (CICad::EhPolilinha(entidade)) {
         const std::vector<CEPonto> vertices = CICad::GetVertices(entidade);
@@ -515,8 +533,8 @@ QString CCDataReader::Posicao(const OdDbObjectId& entidade) const {
     static const QString funcao("BuscarCoordenadas");
     ResultBuffer* chamada = zvsdk::newString(funcao);
     ResultBuffer* cauda = chamada->rbnext = zvsdk::newEntity(entidade.entityName());
-    cauda = cauda->rbnext = zvsdk::newString(layer.mid(inicio[0], fim[0] - inicio[0]));
-    cauda = cauda->rbnext = zvsdk::newString(layer.mid(inicio[1], fim[1] - inicio[1]));
+    cauda = cauda->rbnext = zvsdk::newString(partes.grupo);
+    cauda = cauda->rbnext = zvsdk::newString(partes.numero);
     cauda = cauda->rbnext = zvsdk::newReal(p.x);
     cauda->rbnext = zvsdk::newReal(p.y);
     ResultBuffer* resposta = CICad::InvokeChain(chamada);
