@@ -39,11 +39,19 @@ void CETemplateLisp::LerPonto(const QString& simbolo, double& x, double& y) {
 }
 
 bool CETemplateLisp::FiltraItem(const CEItemLista& item) {
-    const QString filtro = LerTexto("*FILTRO_TEMPLATE*").trimmed();
+    static const QString simboloFiltro("*FILTRO_TEMPLATE*");
+    static const QString simboloResposta("INVOKELISP_LISTAS_TMP");
+    const QString filtro = LerTexto(simboloFiltro).trimmed();
     if (filtro.isEmpty()) return true;
+    // The text to evaluate is made again only when the filter changes: the host keeps what
+    // it read of the same text.
+    if (filtro != filtroLido_) {
+        filtroLido_ = filtro;
+        avaliacao_ = "(progn (setq " + simboloResposta + " " + filtro + " ) (princ))";
+    }
     item.paraLisp();
-    CICad::AvaliaLisp("(progn (setq INVOKELISP_LISTAS_TMP " + filtro + " ) (princ))");
-    zvsdk::ResultBuffer* valor = CICad::LeSimboloLisp("INVOKELISP_LISTAS_TMP");
+    CICad::AvaliaLisp(avaliacao_);
+    zvsdk::ResultBuffer* valor = CICad::LeSimboloLisp(simboloResposta);
     CEItemLista::limparLisp();
     // Anything but nil passes, 0 and "" too.
     const bool passa = valor && valor->restype != zvsdk::RTNIL && valor->restype != zvsdk::RTNONE;

@@ -17,4 +17,9 @@ public:
 
     // The plain text-to-real rule: the leading number, 0.0 when there is none.
     static double TextoParaReal(const QString& texto);
+
+private:
+    // The last filter text read and the expression made of it.
+    QString filtroLido_;
+    QString avaliacao_;
 };

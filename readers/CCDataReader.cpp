@@ -513,9 +513,41 @@ QString CCDataReader::TextoTipo(const QString& tipo) {
         .value();
 }
 
+namespace {
+// A page's layer is GROUP$PAGE$SHEET: three non-empty parts between the "$"s. Symbols and
+// wires come page by page, so the last layer's parts are kept.
+struct PartesLayer {
+    QString layer;
+    bool pagina = false;
+    QString grupo, numero;
+
+    void le(const QString& nome) {
+        if (nome == layer && !layer.isNull()) return;
+        layer = nome;
+        int inicio[3] = {}, fim[3] = {};
+        int partes = 0;
+        for (int i = 0, n = nome.size(); i < n && partes <= 3;) {
+            if (nome[i] == '$') {
+                ++i;
+                continue;
+            }
+            const int comeco = i;
+            while (i < n && nome[i] != '$')
+                ++i;
+            if (partes < 3) inicio[partes] = comeco, fim[partes] = i;
+            ++partes;
+        }
+        pagina = partes == 3;
+        grupo = pagina ? nome.mid(inicio[0], fim[0] - inicio[0]) : QString();
+        numero = pagina ? nome.mid(inicio[1], fim[1] - inicio[1]) : QString();
+    }
+};
+}  // namespace
+
 QString CCDataReader::Posicao(const OdDbObjectId& entidade) const {
-    const QStringList partes = ZVString(CICad::GetLayerEntidade(entidade)).Divide("$");
-    if (partes.size() != 3) return "??";
+    static PartesLayer partes;
+    partes.le(CICad::GetLayerEntidade(entidade));
+    if (!partes.pagina) return "??";
     CEPonto p;
     if (CICad::EhPolilinha(entidade)) {
         const std::vector<CEPonto> vertices = CICad::GetVertices(entidade);
@@ -526,10 +558,11 @@ QString CCDataReader::Posicao(const OdDbObjectId& entidade) const {
     } else {
         return "??";
     }
-    ResultBuffer* chamada = zvsdk::newString("BuscarCoordenadas");
+    static const QString funcao("BuscarCoordenadas");
+    ResultBuffer* chamada = zvsdk::newString(funcao);
     ResultBuffer* cauda = chamada->rbnext = zvsdk::newEntity(entidade.entityName());
-    cauda = cauda->rbnext = zvsdk::newString(partes[0]);
-    cauda = cauda->rbnext = zvsdk::newString(partes[1]);
+    cauda = cauda->rbnext = zvsdk::newString(partes.grupo);
+    cauda = cauda->rbnext = zvsdk::newString(partes.numero);
     cauda = cauda->rbnext = zvsdk::newReal(p.x);
     cauda->rbnext = zvsdk::newReal(p.y);
     ResultBuffer* resposta = CICad::InvokeChain(chamada);

@@ -27,22 +27,32 @@ void CEItemLista::copiarCamposComSufixo(const CEItemLista& origem, const QString
         campos.insert(it.key() + "_" + sufixo, it.value());
 }
 
+namespace {
+const QString& NomeReg() {
+    static const QString nome("reg");
+    return nome;
+}
+}  // namespace
+
 void CEItemLista::paraLisp() const {
-    // The texts are not copied: the host builds `reg` straight from them.
-    std::vector<zvsdk::StringPair> pares;
+    // The texts are not copied: the host builds `reg` straight from them. One item after
+    // another goes out, so the array of pairs is kept from one to the next.
+    static std::vector<zvsdk::StringPair> pares;
+    pares.clear();
     pares.reserve(size_t(campos.size()));
     for (auto it = campos.constBegin(); it != campos.constEnd(); ++it)
         pares.push_back({&it.key(), &it.value()});
-    CICad::SetParesLisp("reg", pares);
+    CICad::SetParesLisp(NomeReg(), pares);
     if (ids.empty()) return;
+    static const QString nomeEname("ename");
     zvsdk::ResultBuffer ename;
     ename.restype = zvsdk::RTENAME;
     ename.rlname = ids.front().entityName();
-    CICad::SetChainLisp("ename", &ename);
+    CICad::SetChainLisp(nomeEname, &ename);
 }
 
 void CEItemLista::limparLisp() {
-    CICad::SetNilLisp("reg");
+    CICad::SetNilLisp(NomeReg());
 }
 
 QString CEItemLista::textoCampos() const {

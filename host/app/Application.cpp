@@ -1,5 +1,6 @@
 #include "Application.h"
 
+#include "DocumentLisp.h"
 #include "DocumentSetup.h"
 #include "HostDocument.h"
 #include "ModuleLoader.h"
@@ -109,6 +110,8 @@ bool Application::loadModule(const QString& path, QString* error) {
 }
 
 void Application::unloadModules() {
+    for (const auto& document : documents_)
+        if (auto* lisp = dynamic_cast<DocumentLisp*>(document->lisp())) lisp->forgetPairs();
     while (!modules_.empty()) {
         modules_.back()->unload();
         modules_.pop_back();

@@ -22,8 +22,13 @@ public:
     // with one 5019 node.
     int lispGetSymbol(const QString& name, zvsdk::ResultBuffer** value) override;
     int lispPutSymbol(const QString& name, const zvsdk::ResultBuffer* value) override;
-    // Builds the list straight from the texts, without a chain in between.
+    // Builds the list straight from the texts, without a chain in between. A list run
+    // publishes one item after another: the cells of the previous list are filled again
+    // when nothing but this document holds them any more.
     int lispPutStringPairs(const QString& name, const zvsdk::StringPair* pairs, int count) override;
+    // Lets go of the list kept for the next pairs: its texts may be a module's own, and
+    // must go before the module is unloaded.
+    void forgetPairs();
     // Errors are printed on the command line and answered with null.
     zvsdk::ResultBuffer* lispInvoke(const zvsdk::ResultBuffer* call) override;
     // The same text is read once: a list run evaluates one expression per item.
@@ -36,16 +41,33 @@ public:
     // over as usual); returning false leaves the call to the usual road.
     using ChainAnswer = std::function<bool(zvlisp::Interpreter&, zvsdk::ResultBuffer**)>;
     void addChainAnswer(const QString& function, ChainAnswer answer);
+    // The same for a function with arguments, read straight from the call's chain (after
+    // the name): a function the module calls for every symbol pays no LISP values on
+    // the way. The answer must be what the function would give for the arguments' values.
+    using ChainCall = std::function<bool(zvlisp::Interpreter&, const zvsdk::ResultBuffer* args,
+                                         zvsdk::ResultBuffer**)>;
+    void addChainCall(const QString& function, ChainCall call);
 
 private:
     struct ChainSource {
+        zvlisp::Symbol* symbol;
         zvlisp::Value function;
         ChainAnswer answer;
+        ChainCall call;
     };
     // True when a chain answer took the call; `chain` is then its result.
-    bool answerAsChain(const QString& function, zvsdk::ResultBuffer** chain);
+    bool answerAsChain(const zvsdk::ResultBuffer* call, zvsdk::ResultBuffer** chain);
+
+    // The symbol of a name the module sets again and again ("reg"), without a look-up.
+    zvlisp::Symbol* symbolOf(const QString& name);
+    // The symbol if the name was ever used, without making it.
+    zvlisp::Symbol* knownSymbol(const QString& name);
+    zvlisp::Symbol* remember(const QString& name, zvlisp::Symbol* symbol);
 
     zvlisp::Interpreter lisp_;
+    QHash<QString, zvlisp::Symbol*> symbolsByName_;
+    // The last list of pairs built, kept to be filled again.
+    zvlisp::Value pairs_;
     QHash<QString, zvlisp::Value> readTexts_;
     QHash<QString, ChainSource> chainAnswers_;
 };

@@ -5,9 +5,11 @@
 #include "ConnectionChains.h"
 #include "DocumentLisp.h"
 #include "HostDocument.h"
+#include "PositionChains.h"
 #include "SystemLisp.h"
 #include "product/ConnectionAnswers.h"
 #include "product/ProductLisp.h"
+#include "product/SheetGridIndex.h"
 #include "product/UserConfig.h"
 
 #include <QFileInfo>
@@ -27,8 +29,10 @@ void installProduct(DocumentLisp& documentLisp, HostDocument& document) {
     context.print = [&document](const QString& text) { document.printMessage(text); };
     context.fileName = [&document] { return document.fileName(); };
     context.connections = std::make_shared<zvproduct::ConnectionAnswers>();
+    context.sheetGrids = std::make_shared<zvproduct::SheetGridIndex>();
     zvproduct::installProductFunctions(lisp, context);
     ConnectionChains::install(documentLisp, context);
+    PositionChains::install(documentLisp, context);
     const QString config = zvproduct::UserConfig::file();
     if (!config.isEmpty()) zvproduct::UserConfig::load(lisp, config);
 }

@@ -48,6 +48,19 @@ Value append(Interpreter& in, Args a) {
 
 Value assoc(Interpreter& in, Args a) {
     const Value* c = &a[1];
+    if (a[0].isString()) {
+        // A text key, as templates look fields up in `reg`: only a text of the same length
+        // can be equal, so most keys are passed over without comparing characters.
+        const QString& key = a[0].asString();
+        for (; c->isCons(); c = &c->asCons()->cdr) {
+            const Value& pair = c->asCons()->car;
+            if (!pair.isCons() || !pair.asCons()->car.isString()) continue;
+            const QString& text = pair.asCons()->car.asString();
+            if (text.size() == key.size() && text == key) return pair;
+        }
+        if (!c->isNil()) in.badType("listp", a[1]);
+        return Value();
+    }
     for (; c->isCons(); c = &c->asCons()->cdr) {
         const Value& pair = c->asCons()->car;
         if (pair.isCons() && Equality::equal(pair.asCons()->car, a[0])) return pair;

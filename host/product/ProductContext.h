@@ -16,6 +16,7 @@ class UserInterface;
 namespace zvproduct {
 
 class ConnectionAnswers;
+class SheetGridIndex;
 
 struct ProductContext {
     std::function<zvdb::Database*()> database;
@@ -25,6 +26,9 @@ struct ProductContext {
     // The connection answers of the document, for a host that also hands them out without
     // LISP in between; installConnectionFunctions makes its own when null.
     std::shared_ptr<ConnectionAnswers> connections;
+    // The sheet grids behind BuscarCoordenadas, likewise; installServiceFunctions makes its
+    // own when null.
+    std::shared_ptr<SheetGridIndex> sheetGrids;
 };
 
 }  // namespace zvproduct

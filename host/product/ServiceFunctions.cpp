@@ -66,7 +66,7 @@ Value gridPosition(Interpreter& lisp, const ProductContext& context, SheetGridIn
                    Args a) {
     if (!a[3].isNumber() || !a[4].isNumber()) return Value::string("??");
     zvdb::Database* database = context.database ? context.database() : nullptr;
-    const std::string group = a[1].isString() ? a[1].asString().toStdString() : std::string();
+    const QString group = a[1].isString() ? a[1].asString() : QString();
     return Value::string(grids.position(database, group, lisp.toNumber(a[3]), lisp.toNumber(a[4])));
 }
 
@@ -226,9 +226,9 @@ void installServiceFunctions(Interpreter& lisp, const ProductContext& context) {
         0, 0);
     lisp.define(
         "BuscarCoordenadas",
-        [context, grids = std::make_shared<SheetGridIndex>()](Interpreter& in, Args a) {
-            return gridPosition(in, context, *grids, a);
-        },
+        [context,
+         grids = context.sheetGrids ? context.sheetGrids : std::make_shared<SheetGridIndex>()](
+            Interpreter& in, Args a) { return gridPosition(in, context, *grids, a); },
         5, 5);
     lisp.define(
         "zvGetCircuitoLocalInfo",

@@ -44,11 +44,19 @@ bool SheetGrid::Axis::parse(const QString& labelText, const QString& intervalTex
     return true;
 }
 
-std::optional<QString> SheetGrid::Axis::at(double distance) const {
-    if (labels.isEmpty()) return QString();
+std::optional<int> SheetGrid::Axis::at(double distance) const {
+    if (labels.isEmpty()) return 0;
     if (!(distance >= 0 && distance <= ends.back())) return std::nullopt;
     const auto cell = std::upper_bound(ends.begin(), ends.end(), distance) - ends.begin();
-    return labels[std::min<int>(static_cast<int>(cell), labels.size() - 1)];
+    return std::min<int>(static_cast<int>(cell), labels.size() - 1);
+}
+
+int SheetGrid::Axis::cells() const {
+    return std::max<int>(1, labels.size());
+}
+
+QString SheetGrid::Axis::label(int cell) const {
+    return labels.isEmpty() ? QString() : labels[cell];
 }
 
 std::optional<SheetGrid> SheetGrid::fromModel(const QString& columnLabels,
@@ -60,6 +68,10 @@ std::optional<SheetGrid> SheetGrid::fromModel(const QString& columnLabels,
         !grid.rows_.parse(rowLabels, rowInterval))
         return std::nullopt;
     if (grid.columns_.labels.isEmpty() && grid.rows_.labels.isEmpty()) return std::nullopt;
+    // every cell's text made once: a list asks for thousands of positions
+    for (int row = 0; row < grid.rows_.cells(); ++row)
+        for (int column = 0; column < grid.columns_.cells(); ++column)
+            grid.cells_ << grid.rows_.label(row) + grid.columns_.label(column);
     return grid;
 }
 
@@ -71,7 +83,7 @@ QString SheetGrid::position(double x, double y) const {
     const auto column = columns_.at(x);
     const auto row = rows_.at(kSheetTop - y);
     if (!column || !row) return QStringLiteral("??");
-    return *row + *column;
+    return cells_[*row * columns_.cells() + *column];
 }
 
 }  // namespace zvproduct

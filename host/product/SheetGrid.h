@@ -31,11 +31,15 @@ private:
         QStringList labels;
         std::vector<double> ends;  // distance from the start to each cell's far side
         bool parse(const QString& labelText, const QString& intervalText);
-        // The label at a distance from the start; nothing outside.
-        std::optional<QString> at(double distance) const;
+        // The cell at a distance from the start (0 on an axis without labels); nothing
+        // outside.
+        std::optional<int> at(double distance) const;
+        int cells() const;
+        QString label(int cell) const;
     };
     Axis columns_;
     Axis rows_;
+    QStringList cells_;  // row by row, each cell's position text
 };
 
 }  // namespace zvproduct

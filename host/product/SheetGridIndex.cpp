@@ -29,6 +29,7 @@ void SheetGridIndex::readCatalogue() {
 void SheetGridIndex::readCatalogue(const CatalogueConnection& catalogue, int language) {
     catalogueRead_ = true;
     byKey_.clear();
+    asked_.clear();
     std::map<int, SheetGrid> models;
     for (const QStringList& row : catalogue.rows(
              "select PAGE_KEY, ERASED, COL_LABEL, COL_INT, ROW_LABEL, ROW_INT from BDPAGE")) {
@@ -54,23 +55,35 @@ void SheetGridIndex::readCatalogue(const CatalogueConnection& catalogue, int lan
 
 void SheetGridIndex::readRegistry(zvdb::Database& database) {
     keyOf_.clear();
+    asked_.clear();
     const PageRegistry registry(database);
     for (const PageGroup& group : registry.groups())
         keyOf_.emplace(upper(group.name), group.key);
     stamp_ = DrawingStamp::of(database);
 }
 
-const SheetGrid& SheetGridIndex::gridOf(zvdb::Database* database, const std::string& group) {
+const SheetGrid& SheetGridIndex::gridOf(zvdb::Database* database, const QString& group) {
     if (!catalogueRead_) readCatalogue();
     if (!database || byKey_.empty()) return fixed_;
     if (!(stamp_ == DrawingStamp::of(*database))) readRegistry(*database);
-    auto key = keyOf_.find(upper(group));
-    if (key == keyOf_.end()) return fixed_;
-    auto grid = byKey_.find(key->second);
-    return grid == byKey_.end() ? fixed_ : grid->second;
+    if (const SheetGrid* known = asked_.value(group)) return *known;
+    const SheetGrid* grid = &fixed_;
+    auto key = keyOf_.find(group.toUpper().toStdString());
+    if (key != keyOf_.end()) {
+        auto model = byKey_.find(key->second);
+        if (model != byKey_.end()) grid = &model->second;
+    }
+    // Not a text the caller may take away (a module's constant): a copy of its own.
+    asked_.insert(QString(group.constData(), group.size()), grid);
+    return *grid;
 }
 
 QString SheetGridIndex::position(zvdb::Database* database, const std::string& group, double x,
+                                 double y) {
+    return position(database, QString::fromStdString(group), x, y);
+}
+
+QString SheetGridIndex::position(zvdb::Database* database, const QString& group, double x,
                                  double y) {
     return gridOf(database, group).position(x, y);
 }

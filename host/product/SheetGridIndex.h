@@ -11,6 +11,7 @@
 #include "DrawingStamp.h"
 #include "SheetGrid.h"
 
+#include <QHash>
 #include <QString>
 
 #include <string>
@@ -24,9 +25,10 @@ class SheetGridIndex {
 public:
     // The position of (x, y) on a page of `group`; "??" outside its grid.
     QString position(zvdb::Database* database, const std::string& group, double x, double y);
+    QString position(zvdb::Database* database, const QString& group, double x, double y);
 
 private:
-    const SheetGrid& gridOf(zvdb::Database* database, const std::string& group);
+    const SheetGrid& gridOf(zvdb::Database* database, const QString& group);
     void readCatalogue();
     void readCatalogue(const CatalogueConnection& catalogue, int language);
     void readRegistry(zvdb::Database& database);
@@ -35,6 +37,9 @@ private:
     std::unordered_map<int, SheetGrid> byKey_;  // groups whose page model has a grid
     DrawingStamp stamp_;
     std::unordered_map<std::string, int> keyOf_;  // upper-case group name to catalogue key
+    // The grid of each group as it was asked for (a list asks for every symbol), until the
+    // registry is read again.
+    QHash<QString, const SheetGrid*> asked_;
     SheetGrid fixed_ = SheetGrid::fixed();
 };
 

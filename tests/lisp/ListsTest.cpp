@@ -28,6 +28,16 @@ TEST_F(ListsTest, Search) {
     EXPECT_EQ(ev("(assoc \"B\" '((\"A\" . 1) (\"B\" . 2)))"), "(\"B\" . 2)");
     EXPECT_EQ(ev("(assoc 'size '((name box) (size 3)))"), "(SIZE 3)");
     EXPECT_EQ(ev("(assoc 'x '((a . 1)))"), "nil");
+    // a text key passes over other keys of any kind and texts that differ in case or length
+    EXPECT_EQ(ev("(assoc \"AB\" '(x 1 (2 . a) (AB . b) (\"ab\" . c) (\"ABC\" . d) (\"AB\" . e) "
+                 "(\"AB\" . f)))"),
+              "(\"AB\" . E)");
+    EXPECT_EQ(ev("(assoc \"\" '((\"x\" . 1) (\"\" . 2)))"), "(\"\" . 2)");
+    EXPECT_EQ(ev("(assoc \"z\" '((\"a\" . 1) (\"b\" . 2)))"), "nil");
+    EXPECT_EQ(ev("(assoc \"a\" '((\"a\" . 1) . 5))"), "(\"a\" . 1)");
+    EXPECT_EQ(ev("(assoc \"z\" '((\"a\" . 1) . 5))"),
+              "ERROR: bad argument type: listp ((\"a\" . 1) . 5)");
+    EXPECT_EQ(ev("(assoc 1 '((1.0 . a)))"), "(1.0 . A)");
     EXPECT_EQ(ev("(member 'c '(a b c d e))"), "(C D E)");
     EXPECT_EQ(ev("(member 'q '(a b c))"), "nil");
     EXPECT_EQ(ev("(nth 3 '(a b c d e))"), "D");
