@@ -486,14 +486,19 @@ void CCDataReader::LeColunasUsuario(const QString& sufixo, CEItemLista& item,
 
 void CCDataReader::LeLayer(const QString& sufixo, CEItemLista& item, const QString& layer) {
     item.definirCampo(NumeroCampo<"LAYER">(sufixo), layer);
+    const std::pair<QString, QString>& partes = GrupoPagina(layer);
+    item.definirCampo(NumeroCampo<"GRUPO">(sufixo), partes.first);
+    item.definirCampo(NumeroCampo<"PAGINA">(sufixo), partes.second);
+}
+
+const std::pair<QString, QString>& CCDataReader::GrupoPagina(const QString& layer) const {
     auto it = gruposPaginas_.constFind(layer);
     if (it == gruposPaginas_.constEnd()) {
         const QStringList partes = ZVString(layer).Divide("$");
         it = gruposPaginas_.insert(layer, partes.size() == 3 ? std::pair(partes[0], partes[1])
                                                              : std::pair(QString(), QString()));
     }
-    item.definirCampo(NumeroCampo<"GRUPO">(sufixo), it->first);
-    item.definirCampo(NumeroCampo<"PAGINA">(sufixo), it->second);
+    return *it;
 }
 
 const QString& CCDataReader::LayerDe(const OdDbObjectId& entidade) const {
@@ -513,41 +518,10 @@ QString CCDataReader::TextoTipo(const QString& tipo) {
         .value();
 }
 
-namespace {
-// A page's layer is GROUP$PAGE$SHEET: three non-empty parts between the "$"s. Symbols and
-// wires come page by page, so the last layer's parts are kept.
-struct PartesLayer {
-    QString layer;
-    bool pagina = false;
-    QString grupo, numero;
-
-    void le(const QString& nome) {
-        if (nome == layer && !layer.isNull()) return;
-        layer = nome;
-        int inicio[3] = {}, fim[3] = {};
-        int partes = 0;
-        for (int i = 0, n = nome.size(); i < n && partes <= 3;) {
-            if (nome[i] == '$') {
-                ++i;
-                continue;
-            }
-            const int comeco = i;
-            while (i < n && nome[i] != '$')
-                ++i;
-            if (partes < 3) inicio[partes] = comeco, fim[partes] = i;
-            ++partes;
-        }
-        pagina = partes == 3;
-        grupo = pagina ? nome.mid(inicio[0], fim[0] - inicio[0]) : QString();
-        numero = pagina ? nome.mid(inicio[1], fim[1] - inicio[1]) : QString();
-    }
-};
-}  // namespace
-
 QString CCDataReader::Posicao(const OdDbObjectId& entidade) const {
-    static PartesLayer partes;
-    partes.le(CICad::GetLayerEntidade(entidade));
-    if (!partes.pagina) return "??";
+    // Parts are never empty: a page's layer has a group exactly when it has three.
+    const std::pair<QString, QString>& partes = GrupoPagina(LayerDe(entidade));
+    if (partes.first.isEmpty()) return "??";
     CEPonto p;
     if (CICad::EhPolilinha(entidade)) {
         const std::vector<CEPonto> vertices = CICad::GetVertices(entidade);
@@ -561,8 +535,8 @@ QString CCDataReader::Posicao(const OdDbObjectId& entidade) const {
     static const QString funcao("BuscarCoordenadas");
     ResultBuffer* chamada = zvsdk::newString(funcao);
     ResultBuffer* cauda = chamada->rbnext = zvsdk::newEntity(entidade.entityName());
-    cauda = cauda->rbnext = zvsdk::newString(partes.grupo);
-    cauda = cauda->rbnext = zvsdk::newString(partes.numero);
+    cauda = cauda->rbnext = zvsdk::newString(partes.first);
+    cauda = cauda->rbnext = zvsdk::newString(partes.second);
     cauda = cauda->rbnext = zvsdk::newReal(p.x);
     cauda->rbnext = zvsdk::newReal(p.y);
     ResultBuffer* resposta = CICad::InvokeChain(chamada);

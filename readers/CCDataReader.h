@@ -208,7 +208,9 @@ private:
     QHash<QString, std::pair<QString, QString>> colunasDivididas_;
     // Per layer name, its group and page (empty unless the name has three parts); per catalogue
     // type, its text: items repeat a few of each.
-    QHash<QString, std::pair<QString, QString>> gruposPaginas_;
+    mutable QHash<QString, std::pair<QString, QString>> gruposPaginas_;
+    // The group and page of a page's layer (GROUP$PAGE$SHEET); both empty for other layers.
+    const std::pair<QString, QString>& GrupoPagina(const QString& layer) const;
     QHash<QString, QString> textosTipo_;
     struct HashTexto {
         using is_transparent = void;

@@ -35,10 +35,8 @@ const QString& NomeReg() {
 }  // namespace
 
 void CEItemLista::paraLisp() const {
-    // The texts are not copied: the host builds `reg` straight from them. One item after
-    // another goes out, so the array of pairs is kept from one to the next.
-    static std::vector<zvsdk::StringPair> pares;
-    pares.clear();
+    // The texts are not copied: the host builds `reg` straight from them.
+    std::vector<zvsdk::StringPair> pares;
     pares.reserve(size_t(campos.size()));
     for (auto it = campos.constBegin(); it != campos.constEnd(); ++it)
         pares.push_back({&it.key(), &it.value()});
