@@ -5,7 +5,9 @@
 #include "CEAtributo.h"
 #include "CEListaAtributos.h"
 
+#include <bit>
 #include <cmath>
+#include <cstdint>
 #include <memory>
 #include <unordered_set>
 
@@ -36,11 +38,23 @@ bool EhContato(const QString& bloco) {
     return ComecaComAlgum(bloco, {"NA-", "NF-", "NAF-", "BT-"});
 }
 
-QString TextoPonto(const CEPonto& p) {
-    return QString::asprintf("%.17g,%.17g,%.17g", p.x, p.y, p.z);
+}  // namespace
+
+// Points are told apart by their bits, as their exact texts would be (-0 is not 0).
+bool CCFioDataReader::Medida::operator==(const Medida& outra) const {
+    for (size_t i = 0; i < pontos.size(); ++i)
+        if (std::bit_cast<std::uint64_t>(pontos[i]) !=
+            std::bit_cast<std::uint64_t>(outra.pontos[i]))
+            return false;
+    return chave == outra.chave;
 }
 
-}  // namespace
+size_t CCFioDataReader::HashMedida::operator()(const Medida& m) const {
+    size_t h = qHash(m.chave);
+    for (const double v : m.pontos)
+        h = h * 1000003u ^ std::hash<std::uint64_t>()(std::bit_cast<std::uint64_t>(v));
+    return h;
+}
 
 void CCFioDataReader::CarregaLayout() {
     if (layoutCarregado_) return;
@@ -146,10 +160,9 @@ void CCFioDataReader::CarregaTransicoes() {
 QString CCFioDataReader::ComprimentoFio(const QString& chave, const CEPonto& inicio,
                                         const CEPonto& fim) {
     if (chave.isEmpty()) return "-";
-    const QString memoria =
-        chave + QChar(0x1F) + TextoPonto(inicio) + QChar(0x1F) + TextoPonto(fim);
-    auto achado = comprimentos_.constFind(memoria);
-    if (achado != comprimentos_.constEnd()) return achado.value();
+    Medida memoria{chave, {inicio.x, inicio.y, inicio.z, fim.x, fim.y, fim.z}};
+    auto achado = comprimentos_.find(memoria);
+    if (achado != comprimentos_.end()) return achado->second;
     CarregaLayout();
 
     struct Vertice {
@@ -185,7 +198,7 @@ QString CCFioDataReader::ComprimentoFio(const QString& chave, const CEPonto& ini
         }
     }
     const QString texto = QString::asprintf("%f", comprimento);
-    comprimentos_.insert(memoria, texto);
+    comprimentos_.emplace(std::move(memoria), texto);
     return texto;
 }
 
@@ -221,8 +234,10 @@ void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const QStringLi
         if (trecho.inicio < 0 || trecho.inicio >= n || trecho.fim >= n) continue;
         const QString& a1 = elementos[trecho.inicio];
         const QString& a2 = elementos[trecho.fim];
-        const QString r1 = LigacaoProxima(a1, pontoDe(trecho.inicio)).value_or(QString());
-        const QString r2 = LigacaoProxima(a2, pontoDe(trecho.fim)).value_or(QString());
+        const QString r1 =
+            LigacaoProxima(chave, a1, trecho.inicio, pontoDe(trecho.inicio)).value_or(QString());
+        const QString r2 =
+            LigacaoProxima(chave, a2, trecho.fim, pontoDe(trecho.fim)).value_or(QString());
         CEPonto inicio, fim;
         posicao(a1, r1, item.valorCampo("REL_INI"), inicio);
         posicao(a2, r2, item.valorCampo("REL_FIM"), fim);
