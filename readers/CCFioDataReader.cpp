@@ -55,11 +55,13 @@ class CCFioDataReader::Caminhada {
 public:
     Caminhada(CCFioDataReader& leitor, CETemplate* modelo) : leitor_(leitor) {
         leitor_.fio_ = FioAtual();
+        leitor_.vistas_.clear();
         leitor_.composicao_ = LeComposicao(modelo);
         leitor_.modeloComposicao_ = modelo;
     }
     ~Caminhada() {
         leitor_.fio_ = FioAtual();
+        leitor_.vistas_.clear();
         leitor_.composicao_.reset();
         leitor_.modeloComposicao_ = nullptr;
     }

@@ -126,8 +126,16 @@ private:
         size_t operator()(const Medida& m) const;
     };
     std::unordered_map<Medida, QString, HashMedida> comprimentos_;
-    QHash<QString, QString> rotasLayoutFio_;  // wire key (and key + "$") to route handle
-    QHash<QString, QString> paineisLayout_;   // panel key to view handle
+    // An element's view in the panel layout, and the CPOINT attributes of the view (value
+    // and text), in order; a null view when it has none.
+    struct VistaLayout {
+        OdDbObjectId id;
+        std::vector<std::pair<QString, OdDbObjectId>> pontos;
+    };
+    VistaLayout LeVista(const QString& elemento);
+    std::unordered_map<QString, VistaLayout> vistas_;  // by element, for one walk
+    QHash<QString, QString> rotasLayoutFio_;           // wire key (and key + "$") to route handle
+    QHash<QString, QString> paineisLayout_;            // panel key to view handle
     QHash<QString, QString> layoutPorRelacao_;
     std::vector<std::pair<OdDbObjectId, OdDbObjectId>> transicoes_;
     bool layoutCarregado_ = false, layoutMapeado_ = false, transicoesCarregadas_ = false;

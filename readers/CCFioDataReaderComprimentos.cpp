@@ -110,38 +110,58 @@ void CCFioDataReader::MapeiaLayout(CETemplate* modelo) {
     }
 }
 
-bool CCFioDataReader::PosicaoLayout(const QString& elemento, const QString& conexao,
-                                    CEPonto& ponto) {
+CCFioDataReader::VistaLayout CCFioDataReader::LeVista(const QString& elemento) {
+    VistaLayout vista;
     OdDbObjectId id = CICad::IdDoHandle(elemento);
-    if (!CICad::EhReferencia(id)) return false;
+    if (!CICad::EhReferencia(id)) return vista;
     if (EhContato(CICad::GetNomeBloco(id))) {
         const std::unique_ptr<zv::CEAtributo> pai = CICad::GetAtributo("PARENT", id);
         const QString mestre = pai ? layoutPorRelacao_.value(pai->GetValor()) : QString();
-        if (mestre.isEmpty()) return false;
+        if (mestre.isEmpty()) return vista;
         id = CICad::IdDoHandle(mestre);
-        if (!CICad::EhReferencia(id)) return false;
+        if (!CICad::EhReferencia(id)) return vista;
     }
     const CEListaXData esquema = CICad::GetXData(id, "KVR_LAYOUT_ESQUEMA");
-    OdDbObjectId vista;
     for (size_t indice : {size_t(0), size_t(2)}) {
         if (indice >= esquema.size()) continue;
         const OdDbObjectId candidata = CICad::IdDoHandle(esquema[indice].texto);
         if (CICad::EhReferencia(candidata)) {
-            vista = candidata;
+            vista.id = candidata;
             break;
         }
     }
-    if (vista.isNull()) return false;
+    if (vista.id.isNull()) return vista;
     std::unique_ptr<zv::CEListaAtributos> atributos;
-    CICad::GetAtributos(vista, atributos, false, false);
+    CICad::GetAtributos(vista.id, atributos, false, false);
     for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
         const zv::CEAtributo& atributo = (*atributos)[i];
-        if (!atributo.GetTag().toUpper().startsWith("CPOINT")) continue;
-        if (atributo.GetValor().compare(conexao, Qt::CaseInsensitive) != 0) continue;
-        ponto = CICad::GetPosicaoTexto(atributo.GetId());
+        if (atributo.GetTag().toUpper().startsWith("CPOINT"))
+            vista.pontos.emplace_back(atributo.GetValor(), atributo.GetId());
+    }
+    return vista;
+}
+
+bool CCFioDataReader::PosicaoLayout(const QString& elemento, const QString& conexao,
+                                    CEPonto& ponto) {
+    // In a walk each element's view is found once; an element stands at the ends of many
+    // stretches.
+    VistaLayout lida;
+    const VistaLayout* vista = nullptr;
+    if (composicao_) {
+        auto achada = vistas_.find(elemento);
+        if (achada == vistas_.end()) achada = vistas_.emplace(elemento, LeVista(elemento)).first;
+        vista = &achada->second;
+    } else {
+        lida = LeVista(elemento);
+        vista = &lida;
+    }
+    if (vista->id.isNull()) return false;
+    for (const auto& [valor, texto] : vista->pontos) {
+        if (valor.compare(conexao, Qt::CaseInsensitive) != 0) continue;
+        ponto = CICad::GetPosicaoTexto(texto);
         return true;
     }
-    ponto = CICad::GetPosicao(vista);
+    ponto = CICad::GetPosicao(vista->id);
     return true;
 }
 
