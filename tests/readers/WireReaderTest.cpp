@@ -144,6 +144,30 @@ TEST_F(WireReaderTest, AReaderWalkingAgainSeesTheChangedConnectionAndSeparators)
     EXPECT_EQ(avulso.valorCampo("RELACAO_FIM"), ".-K2");
 }
 
+TEST_F(WireReaderTest, AReaderThatGaveBackItsReadsReadsTheSameAgain) {
+    borne("X1", "1", {20, 200, 0});
+    componente("-K1", {{"A1", {20, 150, 0}}}, "NA-1");
+    borne("X1", "2", {20, 100, 0});
+    fio({{20, 190, 0}, {20, 150, 0}, {20, 100, 0}}, "12");
+    CCFioDataReader leitor;
+    le(leitor);
+    QStringList antes;
+    for (const CEItemLista* item : itens_)
+        antes << item->textoCampos();
+    ASSERT_EQ(antes.size(), 2);
+    itens_.destruirItens();
+    // Connections, entities read and indexes go; the next walk loads them again.
+    leitor.LiberaLeituras();
+    EXPECT_EQ(leitor.ListaConexoes("12"), nullptr);
+    le(leitor);
+    QStringList depois;
+    for (const CEItemLista* item : itens_)
+        depois << item->textoCampos();
+    EXPECT_EQ(depois, antes);
+    EXPECT_EQ(cadeias(), QStringList({"X1:1/>-K1:A1 -K1:A1>X1:2/"}));
+    EXPECT_EQ(itens_[1]->valorCampo("FIO_SEGFIM"), "12");
+}
+
 TEST_F(WireReaderTest, AWireThroughManyElementsFindsTheWireAtEachEndAndItsConnection) {
     // Past some sixteen entries a wire's repeated texts are found through an index.
     const int n = 24;
