@@ -7,6 +7,8 @@
 #include "readers/VetorItens.h"
 #include "readers/ZVString.h"
 
+#include <optional>
+
 namespace {
 
 enum { kCabecalho, kDetalhe, kPrimeira, kRodape, kTotal };
@@ -116,14 +118,38 @@ std::vector<CEPaginaLista> CCFioGrfWriter::Diagrama(VetorItens& itens, CETemplat
     return paginas;
 }
 
+namespace {
+
+// The length as the list prints it: a 32-bit number with the digits asked.
+QString ComprimentoImpresso(const QString& comprimento, int digitos) {
+    const float numero = float(CETemplateLisp::TextoParaReal(comprimento));
+    return ZVString::DeReal(double(numero), digitos);
+}
+
+}  // namespace
+
 QString CCFioGrfWriter::ValorVariavel(const CEItemLista& item, const QString& campo, int digitos) {
     const QString valor = item.valorCampo(campo);
     // The length prints as a number; so does any field that holds the same text. A row
     // without a length prints its empty fields as they are.
     const QString comprimento = item.valorCampo("COMPRIMENTO");
     if (comprimento.isEmpty() || valor != comprimento) return valor;
-    const float numero = float(CETemplateLisp::TextoParaReal(comprimento));
-    return ZVString::DeReal(double(numero), digitos);
+    return ComprimentoImpresso(comprimento, digitos);
+}
+
+CCFioGrfWriter::Papel CCFioGrfWriter::PapelDoTag(const QString& tag) {
+    // A row block's few tags come back on every row.
+    auto achado = papeis_.constFind(tag);
+    if (achado != papeis_.constEnd()) return achado.value();
+    Papel papel = Papel::Outro;
+    if (ComecaCom(tag, "VARIAVEL", "VARIABLE"))
+        papel = Papel::Variavel;
+    else if (ComecaCom(tag, "FUNCAO", "FUNCTION"))
+        papel = Papel::Funcao;
+    else if (ComecaCom(tag, "TOTAL", "TOTAL"))
+        papel = Papel::Total;
+    papeis_.insert(tag, papel);
+    return papel;
 }
 
 void CCFioGrfWriter::InsereLinha(const CCListaPaginada::Bloco& bloco, const QString& layer,
@@ -134,24 +160,42 @@ void CCFioGrfWriter::InsereLinha(const CCListaPaginada::Bloco& bloco, const QStr
     if (ref.isNull()) return;
     std::unique_ptr<zv::CEListaAtributos> atributos;
     CICad::GetAtributos(ref, atributos, false, false);
+    static const QString kComprimento = QStringLiteral("COMPRIMENTO");
+    const CEItemLista& item = *linha.item;
+    // What ValorVariavel gives, with the length's text and its printed form found once for
+    // the row's cells.
+    const QString comprimento = item.valorCampo(kComprimento);
+    std::optional<QString> impresso;
     bool publicado = false;
     for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
         zv::CEAtributo& atributo = (*atributos)[i];
-        const QString tag = atributo.GetTag();
-        if (ComecaCom(tag, "VARIAVEL", "VARIABLE")) {
-            atributo.SetValor(ValorVariavel(*linha.item, atributo.GetValor(), digitos_));
-        } else if (ComecaCom(tag, "FUNCAO", "FUNCTION")) {
-            if (!publicado) linha.item->paraLisp();
-            publicado = true;
-            atributo.SetValor(CCListaPaginada::AvaliaFuncao(atributo.GetValor()));
-        } else if (ComecaCom(tag, "TOTAL", "TOTAL")) {
-            atributo.SetValor(linha.item->valorCampo(atributo.GetValor()));
+        switch (PapelDoTag(atributo.GetTag())) {
+            case Papel::Variavel: {
+                const QString valor = item.valorCampo(atributo.GetValor());
+                if (comprimento.isEmpty() || valor != comprimento) {
+                    atributo.SetValor(valor);
+                } else {
+                    if (!impresso) impresso = ComprimentoImpresso(comprimento, digitos_);
+                    atributo.SetValor(*impresso);
+                }
+                break;
+            }
+            case Papel::Funcao:
+                if (!publicado) item.paraLisp();
+                publicado = true;
+                atributo.SetValor(CCListaPaginada::AvaliaFuncao(atributo.GetValor()));
+                break;
+            case Papel::Total:
+                atributo.SetValor(item.valorCampo(atributo.GetValor()));
+                break;
+            case Papel::Outro:
+                break;
         }
     }
     if (publicado) CEItemLista::limparLisp();
-    if (!variasColunas_ && !linha.item->ids.empty() && !linha.item->ids.front().isNull())
+    if (!variasColunas_ && !item.ids.empty() && !item.ids.front().isNull())
         CICad::SetXData(ref, "KVR_ZV_LINK",
-                        {{1000, ZVString::DeHandle(linha.item->ids.front().handle())}});
+                        {{1000, ZVString::DeHandle(item.ids.front().handle())}});
 }
 
 void CCFioGrfWriter::EscrevePagina(const CEPaginaLista& pagina) {

@@ -5,6 +5,8 @@
 #include "CCListaPaginada.h"
 #include "module/CCDataWriter.h"
 
+#include <QHash>
+
 #include <utility>
 #include <vector>
 
@@ -32,9 +34,14 @@ protected:
     void InsereLinha(const CCListaPaginada::Bloco& bloco, const QString& layer,
                      const CELinhaLista& linha);
 
+    // What a row block's attribute does, by its tag's prefix.
+    enum class Papel { Variavel, Funcao, Total, Outro };
+    Papel PapelDoTag(const QString& tag);
+
     QString grupo_;
     bool variasColunas_ = false;
     int digitos_ = 0;
     // Header, detail, first-row detail, footer, total.
     std::vector<CCListaPaginada::Bloco> blocos_;
+    QHash<QString, Papel> papeis_;
 };

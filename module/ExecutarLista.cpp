@@ -30,12 +30,16 @@ VetorItens Ler(CCDataReader& leitor, CETemplate& modelo, const CESelecao* seleca
     VetorItens todos;
     if (!selecao) {
         Junta(todos, leitor.LerDados(DatabaseAtiva(), std::nullopt, modelo, progresso));
+        // The items are made: what the reader kept to make them goes before the writer's
+        // blocks come in.
+        leitor.LiberaLeituras();
         return todos;
     }
     for (const CEParteSelecao& parte : *selecao) {
         const std::optional<QStringList> paginas = parte.paginas;  // the reader gets a copy
         Junta(todos, leitor.LerDados(parte.database, paginas, modelo, progresso));
     }
+    leitor.LiberaLeituras();
     return todos;
 }
 

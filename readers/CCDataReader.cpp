@@ -51,6 +51,36 @@ CCDataReader::CCDataReader() : tolerancia_(CICad::GetRealLisp("*ESPESSURA_BARRAM
 
 CCDataReader::~CCDataReader() = default;
 
+namespace {
+
+// Empties a container and gives its memory back.
+template <class T>
+void Esvazia(T& conteudo) {
+    T vazio;
+    std::swap(conteudo, vazio);
+}
+
+}  // namespace
+
+void CCDataReader::LiberaLeituras() {
+    Esvazia(circuitos_);
+    Esvazia(conexoes_);
+    Esvazia(fiosPorLayer_);
+    Esvazia(indicesFios_);
+    versaoIndices_ = 0;
+    Esvazia(rotas_);
+    Esvazia(rotasPorChave_);
+    rotasLidas_ = false;
+    Esvazia(caminhos_);
+    Esvazia(entidadesLidas_);
+    Esvazia(numerosFios_);
+    Esvazia(ligacoesPorElemento_);
+    versaoLidas_ = 0;
+    Esvazia(colunasDivididas_);
+    Esvazia(basesAcessorio_);
+    Esvazia(basesColunas_);
+}
+
 // ---- connections
 
 void CCDataReader::CarregaConexoesFios() {

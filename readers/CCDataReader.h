@@ -46,6 +46,11 @@ public:
                                  const std::optional<QStringList>& paginas, CETemplate& modelo,
                                  CIProgress& progresso) = 0;
 
+    // Gives back what the reads kept to answer faster (connections, entities read, indexes,
+    // routes): once the items are made, the writer that follows needs the memory. A later
+    // read loads them again.
+    void LiberaLeituras();
+
     // ---- connections
     void CarregaConexoesFios();
     void CarregaConexoesCabos();

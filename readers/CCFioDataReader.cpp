@@ -18,7 +18,59 @@ void Define(CIProgress* progresso, int percentual) {
     if (progresso) progresso->Definir(percentual);
 }
 
+// The names an end's relation reads and writes under one suffix, made once: each stretch end
+// asks for some twenty of them. Only a field set enters the program's table of names, as
+// before, so the order of an item's fields does not change.
+struct NomesExtremidade {
+    QString conector, rel, lig;
+    std::array<QString, 3> pino, relacao, regua, numero;  // by language
+};
+
+const NomesExtremidade& Nomes(const QString& sufixo) {
+    static QHash<QString, NomesExtremidade> porSufixo;
+    auto achado = porSufixo.constFind(sufixo);
+    if (achado != porSufixo.constEnd()) return achado.value();
+    NomesExtremidade n{"CONECTOR" + sufixo, "REL" + sufixo, "LIG" + sufixo, {}, {}, {}, {}};
+    for (int i = 0; i < 3; ++i) {
+        n.pino[size_t(i)] = Tag(CampoTraduzido::Pino, i + 1) + sufixo;
+        n.relacao[size_t(i)] = Tag(CampoTraduzido::Relacao, i + 1) + sufixo;
+        n.regua[size_t(i)] = Tag(CampoTraduzido::Regua, i + 1) + sufixo;
+        n.numero[size_t(i)] = Tag(CampoTraduzido::Numero, i + 1) + sufixo;
+    }
+    return porSufixo.insert(sufixo, n).value();
+}
+
+bool MesmoPonto(const CEPonto& a, const CEPonto& b) {
+    return a.x == b.x && a.y == b.y && a.z == b.z;
+}
+
+// Wires of up to this many entries find repeated texts by comparing them all.
+constexpr int kEntradasSemIndice = 16;
+
 }  // namespace
+
+// Sets up a walk over the wires: the composition read once with its template, and no wire
+// under work; both dropped when the walk ends, so later calls read afresh.
+class CCFioDataReader::Caminhada {
+public:
+    Caminhada(CCFioDataReader& leitor, CETemplate* modelo) : leitor_(leitor) {
+        leitor_.fio_ = FioAtual();
+        leitor_.vistas_.clear();
+        leitor_.composicao_ = LeComposicao(modelo);
+        leitor_.modeloComposicao_ = modelo;
+    }
+    ~Caminhada() {
+        leitor_.fio_ = FioAtual();
+        leitor_.vistas_.clear();
+        leitor_.composicao_.reset();
+        leitor_.modeloComposicao_ = nullptr;
+    }
+    Caminhada(const Caminhada&) = delete;
+    Caminhada& operator=(const Caminhada&) = delete;
+
+private:
+    CCFioDataReader& leitor_;
+};
 
 void CCFioDataReader::LerLadoIni(CEItemLista& item, const OdDbObjectId& entidade,
                                  CETemplate& modelo) {
@@ -74,26 +126,87 @@ CEItemLista* CCFioDataReader::ItemFio(const OdDbObjectId& polilinha, CETemplate*
     return item;
 }
 
-std::optional<QString> CCFioDataReader::LigacaoProxima(const QString& elemento,
+CCFioDataReader::FioAtual& CCFioDataReader::Fio(const QString& numero) {
+    if (!fio_.valido || fio_.numero != numero) {
+        fio_ = FioAtual();
+        fio_.numero = numero;
+        fio_.valido = true;
+    }
+    return fio_;
+}
+
+int CCFioDataReader::PrimeiroLugar(const QString& numero, int indice) {
+    const QStringList* completas = ListaConexoesCompletas(numero);
+    if (!completas) return -1;
+    const int n = int(completas->size());
+    // An entry past the list's end has the empty text.
+    if (indice < 0 || indice >= n) return int(completas->indexOf(QString()));
+    FioAtual& fio = Fio(numero);
+    std::vector<int>& primeiros = fio.primeiros;
+    if (primeiros.size() != size_t(n)) {
+        primeiros.assign(size_t(n), 0);
+        if (n <= kEntradasSemIndice) {
+            for (int i = 0; i < n; ++i) {
+                int j = 0;
+                while ((*completas)[j] != (*completas)[i])
+                    ++j;
+                primeiros[size_t(i)] = j;
+            }
+        } else {
+            // A bus wire holds thousands of entries.
+            QHash<QString, int> lugares;
+            lugares.reserve(n);
+            for (int i = 0; i < n; ++i)
+                primeiros[size_t(i)] = lugares.insert((*completas)[i], i).value();
+        }
+    }
+    return primeiros[size_t(indice)];
+}
+
+std::optional<QString> CCFioDataReader::Ligacao(const QString& numero, int indice) {
+    const QStringList* elementos = ListaConexoes(numero);
+    const std::vector<CEPonto>* pontos = PontosConexao(numero);
+    if (!elementos || !pontos || indice < 0 || indice >= elementos->size() ||
+        size_t(indice) >= pontos->size())
+        return std::nullopt;
+    FioAtual& fio = Fio(numero);
+    const size_t n = size_t(elementos->size());
+    if (fio.ligacoes.size() != n) {
+        fio.ligacoes.assign(n, std::nullopt);
+        fio.ligacoesLidas.assign(n, false);
+    }
+    const size_t i = size_t(indice);
+    if (!fio.ligacoesLidas[i]) {
+        const std::unique_ptr<zv::CEAtributo> atributo =
+            AtributoConexaoProximo(CICad::IdDoHandle((*elementos)[indice]), (*pontos)[i]);
+        if (atributo) fio.ligacoes[i] = atributo->GetValor();
+        fio.ligacoesLidas[i] = true;
+    }
+    return fio.ligacoes[i];
+}
+
+std::optional<QString> CCFioDataReader::LigacaoProxima(const QString& numero,
+                                                       const QString& elemento, int indice,
                                                        const CEPonto& ponto) {
-    const PontoElemento chave{elemento, ponto.x, ponto.y, ponto.z};
-    auto achado = ligacoes_.find(chave);
-    if (achado != ligacoes_.end()) return achado->second;
+    const QStringList* elementos = ListaConexoes(numero);
+    const std::vector<CEPonto>* pontos = PontosConexao(numero);
+    if (elementos && pontos && indice >= 0 && indice < elementos->size() &&
+        size_t(indice) < pontos->size() && (*elementos)[indice] == elemento &&
+        MesmoPonto((*pontos)[size_t(indice)], ponto))
+        return Ligacao(numero, indice);
     const std::unique_ptr<zv::CEAtributo> atributo =
         AtributoConexaoProximo(CICad::IdDoHandle(elemento), ponto);
-    std::optional<QString> valor;
-    if (atributo) valor = atributo->GetValor();
-    ligacoes_.emplace(chave, valor);
-    return valor;
+    return atributo ? std::optional<QString>(atributo->GetValor()) : std::nullopt;
 }
 
 void CCFioDataReader::PreencheExtremidade(const QString& lado, CEItemLista& item,
-                                          const QStringList& elementos,
-                                          const QStringList& completas, int indice,
+                                          const QStringList& elementos, int indice,
                                           CETemplate* modelo) {
-    const QString sufixo = "_" + lado;
+    static const QString kIni = QStringLiteral("INI"), kSufixoIni = QStringLiteral("_INI"),
+                         kSufixoFim = QStringLiteral("_FIM");
+    const QString& sufixo = lado == kIni ? kSufixoIni : kSufixoFim;
     CopiaEntidade(sufixo, item, CICad::IdDoHandle(elementos.value(indice)), modelo);
-    LeSegmento(lado, item, completas.value(indice), modelo);
+    LeSegmentoNoIndice(lado, item, indice, modelo);
     CompoeExtremidade(sufixo, item, modelo, indice);
 }
 
@@ -115,6 +228,7 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
     MapeiaLayout(modelo);
     Define(progresso, 50);
 
+    const Caminhada caminhada(*this, modelo);
     const QSet<QString> escolhidas =
         paginas ? QSet<QString>(paginas->begin(), paginas->end()) : QSet<QString>();
     QSet<QString> numeros;
@@ -135,16 +249,17 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
         numeros.insert(numero);
 
         const QStringList* a = ListaConexoes(numero);
-        const QStringList* b = ListaConexoesCompletas(numero);
         const QStringList elementos = a ? *a : QStringList();
-        const QStringList completas = b ? *b : QStringList();
         Trechos trechos;
         if (!elementos.isEmpty()) {
-            const CEItemLista padrao = *item;
-            PreencheExtremidade("INI", *item, elementos, completas, 0, modelo);
+            const int n = int(elementos.size());
+            // Later stretches start from the wire's own fields; a wire of two entries has
+            // none.
+            std::optional<CEItemLista> padrao;
+            if (n > 2) padrao = *item;
+            PreencheExtremidade("INI", *item, elementos, 0, modelo);
             CEItemLista* atual = item;
             trechos[atual] = {0, -1};
-            const int n = int(elementos.size());
             for (int i = 1; i < n; ++i) {
                 const OdDbObjectId elemento = CICad::IdDoHandle(elementos[i]);
                 // An element that no longer exists leaves the stretch open.
@@ -152,12 +267,12 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
                 // A run of one equipment is one passage: the wire goes in and out of it.
                 const bool equipamento = EhEquipamento(elemento);
                 if (elementos[i] != elementos[i - 1] || !equipamento) {
-                    PreencheExtremidade("FIM", *atual, elementos, completas, i, modelo);
+                    PreencheExtremidade("FIM", *atual, elementos, i, modelo);
                     trechos[atual].fim = i;
                 }
                 if (i != n - 1 && (elementos[i] != elementos[i + 1] || !equipamento)) {
-                    auto* novo = new CEItemLista(padrao);
-                    PreencheExtremidade("INI", *novo, elementos, completas, i, modelo);
+                    auto* novo = new CEItemLista(*padrao);
+                    PreencheExtremidade("INI", *novo, elementos, i, modelo);
                     atual->ligado = novo;
                     itens->push_back(novo);
                     atual = novo;
@@ -185,6 +300,7 @@ VetorItens* CCFioDataReader::LeAnilhas(const QHash<QString, QString>& opcoes, CE
     MapeiaLayout(modelo);
     Define(progresso, 50);
 
+    const Caminhada caminhada(*this, modelo);
     const QStringList paginas = ZVString(opcoes.value("PAGINAS")).Divide(";");
     const QSet<QString> escolhidas(paginas.begin(), paginas.end());
     auto* itens = new VetorItens;
@@ -206,16 +322,14 @@ VetorItens* CCFioDataReader::LeAnilhas(const QHash<QString, QString>& opcoes, CE
         itens->push_back(item);
 
         const QStringList* a = ListaConexoes(numero);
-        const QStringList* b = ListaConexoesCompletas(numero);
         const QStringList elementos = a ? *a : QStringList();
-        const QStringList completas = b ? *b : QStringList();
         const int n = int(elementos.size());
         // A ferrule on each conductor end: a stretch between every two elements.
         CEItemLista* atual = item;
         Trechos trechos;
         for (int i = 0; n >= 2 && i + 1 < n; ++i) {
-            PreencheExtremidade("INI", *atual, elementos, completas, i, modelo);
-            PreencheExtremidade("FIM", *atual, elementos, completas, i + 1, modelo);
+            PreencheExtremidade("INI", *atual, elementos, i, modelo);
+            PreencheExtremidade("FIM", *atual, elementos, i + 1, modelo);
             trechos[atual] = {i, i + 1};
             if (i + 2 == n) break;
             CEItemLista* novo = ItemFio(fio, modelo);
@@ -252,19 +366,10 @@ void CCFioDataReader::LeSegmento(const QString& lado, CEItemLista& item, const Q
                                  CETemplate* modelo) {
     const QString campo = CampoFio(item);
     if (campo.isEmpty()) return;
-    // The point of the first entry with this full text, as PontoDaConexaoCompleta answers,
-    // from an index of the wire's entries made once.
     const QString numero = item.valorCampo(campo);
-    auto lugares = lugaresCompletos_.find(numero);
-    if (lugares == lugaresCompletos_.end()) {
-        QHash<QString, int> primeiros;
-        if (const QStringList* completas = ListaConexoesCompletas(numero))
-            for (int i = int(completas->size()) - 1; i >= 0; --i)
-                primeiros.insert((*completas)[i], i);
-        lugares = lugaresCompletos_.insert(numero, primeiros);
-    }
+    const QStringList* completas = ListaConexoesCompletas(numero);
+    const int lugar = completas ? int(completas->indexOf(completo)) : -1;
     const std::vector<CEPonto>* pontos = PontosConexao(numero);
-    const int lugar = lugares->value(completo, -1);
     const CEPonto ponto = pontos && lugar >= 0 && size_t(lugar) < pontos->size()
                               ? (*pontos)[size_t(lugar)]
                               : CEPonto{};
@@ -273,85 +378,103 @@ void CCFioDataReader::LeSegmento(const QString& lado, CEItemLista& item, const Q
     if (!fio.isNull()) CopiaEntidade("_SEG" + lado, item, fio, modelo);
 }
 
+void CCFioDataReader::LeSegmentoNoIndice(const QString& lado, CEItemLista& item, int indice,
+                                         CETemplate* modelo) {
+    const QString campo = CampoFio(item);
+    if (campo.isEmpty()) return;
+    const QString numero = item.valorCampo(campo);
+    const int lugar = PrimeiroLugar(numero, indice);
+    const std::vector<CEPonto>* pontos = PontosConexao(numero);
+    const CEPonto ponto = pontos && lugar >= 0 && size_t(lugar) < pontos->size()
+                              ? (*pontos)[size_t(lugar)]
+                              : CEPonto{};
+    const OdDbObjectId fio = FioNoPonto(item.valorCampo("LAYER_" + lado), ponto);
+    if (!fio.isNull()) CopiaEntidade("_SEG" + lado, item, fio, modelo);
+}
+
 void CCFioDataReader::CompoeExtremidade(const QString& sufixo, CEItemLista& item,
                                         CETemplate* modelo, int indice) {
     const QString campo = CampoFio(item);
     if (campo.isEmpty()) return;
-    const QString numero = item.valorCampo(campo);
-    const std::vector<CEPonto>* pontos = PontosConexao(numero);
-    const QStringList* elementos = ListaConexoes(numero);
+    const std::optional<QString> valor = Ligacao(item.valorCampo(campo), indice);
     std::unique_ptr<zv::CEAtributo> ligacao;
-    if (pontos && elementos && indice >= 0 && indice < elementos->size() &&
-        size_t(indice) < pontos->size()) {
-        const std::optional<QString> valor =
-            LigacaoProxima((*elementos)[indice], (*pontos)[size_t(indice)]);
-        if (valor)
-            ligacao = std::make_unique<zv::CEAtributo>(QString(), QString(), *valor, OdDbObjectId(),
-                                                       false);
-    }
+    if (valor)
+        ligacao =
+            std::make_unique<zv::CEAtributo>(QString(), QString(), *valor, OdDbObjectId(), false);
     ComporRelacaoFio(sufixo, item, modelo, ligacao.get());
+}
+
+CCFioDataReader::Composicao CCFioDataReader::LeComposicao(CETemplate* modelo) {
+    Composicao c;
+    Separadores(modelo, c.sep, c.sepLig);
+    // Without a template (the exports) the relation comes first.
+    c.relacaoPrimeiro = !modelo || modelo->LerTexto("*ORDEM_CONCAT_STD*") == "1";
+    return c;
 }
 
 void CCFioDataReader::ComporRelacaoFio(const QString& s, CEItemLista& item, CETemplate* modelo,
                                        const zv::CEAtributo* ligacao) {
-    QString sep, sepLig;
-    Separadores(modelo, sep, sepLig);
-    // Without a template (the exports) the relation comes first.
-    const bool relacaoPrimeiro = !modelo || modelo->LerTexto("*ORDEM_CONCAT_STD*") == "1";
+    const Composicao composicao =
+        composicao_ && modeloComposicao_ == modelo ? *composicao_ : LeComposicao(modelo);
+    const QString& sep = composicao.sep;
+    const QString& sepLig = composicao.sepLig;
+    const bool relacaoPrimeiro = composicao.relacaoPrimeiro;
     const QString lig = ligacao ? ligacao->GetValor() : QString();
-    auto campo = [&item, &s](CampoTraduzido qual, int idioma) {
-        return item.valorCampo(Tag(qual, idioma) + s);
+    const NomesExtremidade& nomes = Nomes(s);
+    auto campo = [&item](const QString& nome) {
+        const QString* valor = item.campo(nome);
+        return valor ? *valor : QString();
     };
-    auto tem = [&item, &s](CampoTraduzido qual, int idioma) {
-        return item.temCampo(Tag(qual, idioma) + s);
+    auto tem = [&item](const QString& nome) { return item.campo(nome) != nullptr; };
+    auto define = [&item](const QString& nome, const QString& valor) {
+        item.definirCampo(nome, valor);
     };
 
     // A pin: its connector and pin, in the template's order.
-    const QString conector = item.valorCampo("CONECTOR" + s);
-    for (int i = 1; i <= 3; ++i) {
-        if (conector.isEmpty() || campo(CampoTraduzido::Pino, i).isEmpty()) continue;
-        item.definirCampo("REL" + s, conector);
-        item.definirCampo("LIG" + s, campo(CampoTraduzido::Pino, i));
-        for (int j = 1; j <= 3; ++j) {
-            if (!tem(CampoTraduzido::Pino, j)) continue;
-            const QString pino = campo(CampoTraduzido::Pino, j);
-            item.definirCampo(Tag(CampoTraduzido::Relacao, j) + s,
-                              relacaoPrimeiro ? conector + sep + pino : pino + sep + conector);
+    const QString conector = campo(nomes.conector);
+    for (size_t i = 0; i < 3; ++i) {
+        if (conector.isEmpty() || campo(nomes.pino[i]).isEmpty()) continue;
+        define(nomes.rel, conector);
+        define(nomes.lig, campo(nomes.pino[i]));
+        for (size_t j = 0; j < 3; ++j) {
+            if (!tem(nomes.pino[j])) continue;
+            const QString pino = campo(nomes.pino[j]);
+            define(nomes.relacao[j],
+                   relacaoPrimeiro ? conector + sep + pino : pino + sep + conector);
         }
         return;
     }
 
-    auto ehBorne = [&](int idioma) {
-        return tem(CampoTraduzido::Regua, idioma) && tem(CampoTraduzido::Numero, idioma);
+    auto ehBorne = [&](size_t idioma) {
+        return tem(nomes.regua[idioma]) && tem(nomes.numero[idioma]);
     };
     bool borne = false;
-    for (int i = 1; i <= 3 && !borne; ++i) {
+    for (size_t i = 0; i < 3 && !borne; ++i) {
         if (!ehBorne(i)) continue;
         borne = true;
-        item.definirCampo("REL" + s,
-                          campo(CampoTraduzido::Regua, i) + sep + campo(CampoTraduzido::Numero, i));
+        define(nomes.rel, campo(nomes.regua[i]) + sep + campo(nomes.numero[i]));
     }
-    for (int i = 1; i <= 3 && !borne; ++i) {
-        if (!tem(CampoTraduzido::Relacao, i)) continue;
-        item.definirCampo("REL" + s, campo(CampoTraduzido::Relacao, i));
+    for (size_t i = 0; i < 3 && !borne; ++i) {
+        if (!tem(nomes.relacao[i])) continue;
+        define(nomes.rel, campo(nomes.relacao[i]));
         break;
     }
-    item.definirCampo("LIG" + s, lig);
+    define(nomes.lig, lig);
 
     // Each language present writes the text: the last one wins.
     QString texto;
-    for (int i = 1; i <= 3; ++i) {
+    for (size_t i = 0; i < 3; ++i) {
         if (borne) {
             if (!ehBorne(i)) continue;
-            const QString regua = campo(CampoTraduzido::Regua, i);
-            const QString numero = campo(CampoTraduzido::Numero, i);
+            const QString regua = campo(nomes.regua[i]);
+            const QString numero = campo(nomes.numero[i]);
             texto = relacaoPrimeiro ? regua + sep + numero + sepLig + lig
                                     : lig + sepLig + numero + sep + regua;
-        } else if (tem(CampoTraduzido::Relacao, i)) {
-            const QString relacao = campo(CampoTraduzido::Relacao, i);
+        } else if (tem(nomes.relacao[i])) {
+            const QString relacao = campo(nomes.relacao[i]);
             texto = relacaoPrimeiro ? relacao + sep + lig : lig + sep + relacao;
         }
     }
-    for (int i = 1; i <= 3; ++i)
-        item.definirCampo(Tag(CampoTraduzido::Relacao, i) + s, texto);
+    for (size_t i = 0; i < 3; ++i)
+        define(nomes.relacao[i], texto);
 }

@@ -6,6 +6,8 @@
 
 #include <QSet>
 
+#include <array>
+#include <optional>
 #include <unordered_map>
 
 class CCFioDataReader : public CCDataReader {
@@ -76,31 +78,65 @@ private:
     std::vector<OdDbObjectId> ListaFios(const QStringList& layers);
     // One end of a stretch from the element at `indice` of the wire's lists.
     void PreencheExtremidade(const QString& lado, CEItemLista& item, const QStringList& elementos,
-                             const QStringList& completas, int indice, CETemplate* modelo);
+                             int indice, CETemplate* modelo);
     void CarregaTransicoes();
-    // The value of the element's connection attribute nearest the point; null when it has
-    // none. Each end is asked twice (its texts and its length): answered once.
-    std::optional<QString> LigacaoProxima(const QString& elemento, const CEPonto& ponto);
+    // The first place of the full text of the entry at `indice` in the wire's list, as
+    // PontoDaConexaoCompleta finds it; -1 when it has none.
+    int PrimeiroLugar(const QString& numero, int indice);
+    // The fields of the wire polyline at the point of the entry at `indice`: what LeSegmento
+    // gives for that entry's full text.
+    void LeSegmentoNoIndice(const QString& lado, CEItemLista& item, int indice, CETemplate* modelo);
+    // The value of the connection attribute of the wire's entry at `indice` nearest the
+    // entry's point; null when the element has none. Each end is asked twice (its texts and
+    // its length): answered once.
+    std::optional<QString> Ligacao(const QString& numero, int indice);
+    // The same for an element and a point that may not be an entry of the wire's list.
+    std::optional<QString> LigacaoProxima(const QString& numero, const QString& elemento,
+                                          int indice, const CEPonto& ponto);
 
-    struct PontoElemento {
-        QString elemento;
-        double x, y, z;
-        bool operator==(const PontoElemento&) const = default;
+    // What a walk knows of the wire under work, made anew for the next wire: a wire's ends
+    // ask for the same entries, and nothing is kept for wires done.
+    struct FioAtual {
+        QString numero;
+        bool valido = false;
+        std::vector<int> primeiros;  // per entry, the first entry of the same full text
+        std::vector<std::optional<QString>> ligacoes;
+        std::vector<bool> ligacoesLidas;
     };
-    struct HashPontoElemento {
-        size_t operator()(const PontoElemento& p) const {
-            const std::hash<double> h;
-            return qHash(p.elemento) ^ (h(p.x) * 31) ^ (h(p.y) * 131) ^ (h(p.z) * 1031);
-        }
+    FioAtual& Fio(const QString& numero);
+    FioAtual fio_;
+    // The relation's separators and order, read once for a walk with its template.
+    struct Composicao {
+        QString sep, sepLig;
+        bool relacaoPrimeiro = true;
     };
-    std::unordered_map<PontoElemento, std::optional<QString>, HashPontoElemento> ligacoes_;
-    // Per wire number, the first place of each full connection text: a bus wire holds
-    // thousands of entries, and each of its ends looks its own up.
-    QHash<QString, QHash<QString, int>> lugaresCompletos_;
-    QHash<QString, QString> rotasLayoutFio_;  // wire key (and key + "$") to route handle
-    QHash<QString, QString> paineisLayout_;   // panel key to view handle
+    static Composicao LeComposicao(CETemplate* modelo);
+    std::optional<Composicao> composicao_;
+    CETemplate* modeloComposicao_ = nullptr;
+    // A walk's state, set up at its start and dropped at its end.
+    class Caminhada;
+
+    // Lengths already measured, by wire key and the two points.
+    struct Medida {
+        QString chave;
+        std::array<double, 6> pontos;
+        bool operator==(const Medida& outra) const;
+    };
+    struct HashMedida {
+        size_t operator()(const Medida& m) const;
+    };
+    std::unordered_map<Medida, QString, HashMedida> comprimentos_;
+    // An element's view in the panel layout, and the CPOINT attributes of the view (value
+    // and text), in order; a null view when it has none.
+    struct VistaLayout {
+        OdDbObjectId id;
+        std::vector<std::pair<QString, OdDbObjectId>> pontos;
+    };
+    VistaLayout LeVista(const QString& elemento);
+    std::unordered_map<QString, VistaLayout> vistas_;  // by element, for one walk
+    QHash<QString, QString> rotasLayoutFio_;           // wire key (and key + "$") to route handle
+    QHash<QString, QString> paineisLayout_;            // panel key to view handle
     QHash<QString, QString> layoutPorRelacao_;
-    QHash<QString, QString> comprimentos_;
     std::vector<std::pair<OdDbObjectId, OdDbObjectId>> transicoes_;
     bool layoutCarregado_ = false, layoutMapeado_ = false, transicoesCarregadas_ = false;
 };

@@ -5,7 +5,9 @@
 #include "CEAtributo.h"
 #include "CEListaAtributos.h"
 
+#include <bit>
 #include <cmath>
+#include <cstdint>
 #include <memory>
 #include <unordered_set>
 
@@ -36,11 +38,23 @@ bool EhContato(const QString& bloco) {
     return ComecaComAlgum(bloco, {"NA-", "NF-", "NAF-", "BT-"});
 }
 
-QString TextoPonto(const CEPonto& p) {
-    return QString::asprintf("%.17g,%.17g,%.17g", p.x, p.y, p.z);
+}  // namespace
+
+// Points are told apart by their bits, as their exact texts would be (-0 is not 0).
+bool CCFioDataReader::Medida::operator==(const Medida& outra) const {
+    for (size_t i = 0; i < pontos.size(); ++i)
+        if (std::bit_cast<std::uint64_t>(pontos[i]) !=
+            std::bit_cast<std::uint64_t>(outra.pontos[i]))
+            return false;
+    return chave == outra.chave;
 }
 
-}  // namespace
+size_t CCFioDataReader::HashMedida::operator()(const Medida& m) const {
+    size_t h = qHash(m.chave);
+    for (const double v : m.pontos)
+        h = h * 1000003u ^ std::hash<std::uint64_t>()(std::bit_cast<std::uint64_t>(v));
+    return h;
+}
 
 void CCFioDataReader::CarregaLayout() {
     if (layoutCarregado_) return;
@@ -96,38 +110,58 @@ void CCFioDataReader::MapeiaLayout(CETemplate* modelo) {
     }
 }
 
-bool CCFioDataReader::PosicaoLayout(const QString& elemento, const QString& conexao,
-                                    CEPonto& ponto) {
+CCFioDataReader::VistaLayout CCFioDataReader::LeVista(const QString& elemento) {
+    VistaLayout vista;
     OdDbObjectId id = CICad::IdDoHandle(elemento);
-    if (!CICad::EhReferencia(id)) return false;
+    if (!CICad::EhReferencia(id)) return vista;
     if (EhContato(CICad::GetNomeBloco(id))) {
         const std::unique_ptr<zv::CEAtributo> pai = CICad::GetAtributo("PARENT", id);
         const QString mestre = pai ? layoutPorRelacao_.value(pai->GetValor()) : QString();
-        if (mestre.isEmpty()) return false;
+        if (mestre.isEmpty()) return vista;
         id = CICad::IdDoHandle(mestre);
-        if (!CICad::EhReferencia(id)) return false;
+        if (!CICad::EhReferencia(id)) return vista;
     }
     const CEListaXData esquema = CICad::GetXData(id, "KVR_LAYOUT_ESQUEMA");
-    OdDbObjectId vista;
     for (size_t indice : {size_t(0), size_t(2)}) {
         if (indice >= esquema.size()) continue;
         const OdDbObjectId candidata = CICad::IdDoHandle(esquema[indice].texto);
         if (CICad::EhReferencia(candidata)) {
-            vista = candidata;
+            vista.id = candidata;
             break;
         }
     }
-    if (vista.isNull()) return false;
+    if (vista.id.isNull()) return vista;
     std::unique_ptr<zv::CEListaAtributos> atributos;
-    CICad::GetAtributos(vista, atributos, false, false);
+    CICad::GetAtributos(vista.id, atributos, false, false);
     for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
         const zv::CEAtributo& atributo = (*atributos)[i];
-        if (!atributo.GetTag().toUpper().startsWith("CPOINT")) continue;
-        if (atributo.GetValor().compare(conexao, Qt::CaseInsensitive) != 0) continue;
-        ponto = CICad::GetPosicaoTexto(atributo.GetId());
+        if (atributo.GetTag().toUpper().startsWith("CPOINT"))
+            vista.pontos.emplace_back(atributo.GetValor(), atributo.GetId());
+    }
+    return vista;
+}
+
+bool CCFioDataReader::PosicaoLayout(const QString& elemento, const QString& conexao,
+                                    CEPonto& ponto) {
+    // In a walk each element's view is found once; an element stands at the ends of many
+    // stretches.
+    VistaLayout lida;
+    const VistaLayout* vista = nullptr;
+    if (composicao_) {
+        auto achada = vistas_.find(elemento);
+        if (achada == vistas_.end()) achada = vistas_.emplace(elemento, LeVista(elemento)).first;
+        vista = &achada->second;
+    } else {
+        lida = LeVista(elemento);
+        vista = &lida;
+    }
+    if (vista->id.isNull()) return false;
+    for (const auto& [valor, texto] : vista->pontos) {
+        if (valor.compare(conexao, Qt::CaseInsensitive) != 0) continue;
+        ponto = CICad::GetPosicaoTexto(texto);
         return true;
     }
-    ponto = CICad::GetPosicao(vista);
+    ponto = CICad::GetPosicao(vista->id);
     return true;
 }
 
@@ -146,10 +180,9 @@ void CCFioDataReader::CarregaTransicoes() {
 QString CCFioDataReader::ComprimentoFio(const QString& chave, const CEPonto& inicio,
                                         const CEPonto& fim) {
     if (chave.isEmpty()) return "-";
-    const QString memoria =
-        chave + QChar(0x1F) + TextoPonto(inicio) + QChar(0x1F) + TextoPonto(fim);
-    auto achado = comprimentos_.constFind(memoria);
-    if (achado != comprimentos_.constEnd()) return achado.value();
+    Medida memoria{chave, {inicio.x, inicio.y, inicio.z, fim.x, fim.y, fim.z}};
+    auto achado = comprimentos_.find(memoria);
+    if (achado != comprimentos_.end()) return achado->second;
     CarregaLayout();
 
     struct Vertice {
@@ -185,7 +218,7 @@ QString CCFioDataReader::ComprimentoFio(const QString& chave, const CEPonto& ini
         }
     }
     const QString texto = QString::asprintf("%f", comprimento);
-    comprimentos_.insert(memoria, texto);
+    comprimentos_.emplace(std::move(memoria), texto);
     return texto;
 }
 
@@ -221,8 +254,10 @@ void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const QStringLi
         if (trecho.inicio < 0 || trecho.inicio >= n || trecho.fim >= n) continue;
         const QString& a1 = elementos[trecho.inicio];
         const QString& a2 = elementos[trecho.fim];
-        const QString r1 = LigacaoProxima(a1, pontoDe(trecho.inicio)).value_or(QString());
-        const QString r2 = LigacaoProxima(a2, pontoDe(trecho.fim)).value_or(QString());
+        const QString r1 =
+            LigacaoProxima(chave, a1, trecho.inicio, pontoDe(trecho.inicio)).value_or(QString());
+        const QString r2 =
+            LigacaoProxima(chave, a2, trecho.fim, pontoDe(trecho.fim)).value_or(QString());
         CEPonto inicio, fim;
         posicao(a1, r1, item.valorCampo("REL_INI"), inicio);
         posicao(a2, r2, item.valorCampo("REL_FIM"), fim);

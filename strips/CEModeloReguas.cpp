@@ -7,6 +7,8 @@
 #include <QMap>
 
 #include <algorithm>
+#include <cstdint>
+#include <iterator>
 #include <limits>
 #include <unordered_set>
 
@@ -34,6 +36,31 @@ QString RotuloComum(const CEBorneDwg* a, const CEBorneDwg* b) {
         if (!rotulo.isEmpty() && TemRotulo(b, rotulo)) return rotulo;
     }
     return {};
+}
+
+// The connection prefixes a field name may start with: a symbol's connection tags in the
+// three languages, then a terminal's side connections.
+constexpr const char* kPrefixos[] = {"LIGACAO_", "CONNECTION_", "CONEXION_", "LIG_"};
+constexpr int kLigacoesDoBorne = 3;
+constexpr int kSemPrefixo = -1;
+
+// Which of the prefixes a field name starts with, by the name's number; each name is looked
+// at once, as symbols and terminals hold the same few hundred names.
+int PrefixoDoNome(std::uint32_t numero) {
+    constexpr std::int8_t kNaoVisto = -2;
+    static std::vector<std::int8_t> prefixos;
+    if (numero >= prefixos.size()) prefixos.resize(size_t(numero) + 1, kNaoVisto);
+    std::int8_t& prefixo = prefixos[numero];
+    if (prefixo == kNaoVisto) {
+        prefixo = kSemPrefixo;
+        const QString& nome = CamposItem::nome(numero);
+        for (int i = 0; i < int(std::size(kPrefixos)); ++i)
+            if (nome.startsWith(QLatin1String(kPrefixos[i]))) {
+                prefixo = std::int8_t(i);
+                break;
+            }
+    }
+    return prefixo;
 }
 
 }  // namespace
@@ -129,20 +156,20 @@ std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& sim
     // The symbol's connections by suffix: LIGACAO_1, CONNECTION_2...
     QMap<QString, QString> ligacoes;
     // A suffix given in two languages keeps the first language's value.
-    for (const char* prefixo : {"LIGACAO_", "CONNECTION_", "CONEXION_"})
-        for (auto campo = simbolo.item->campos.begin(); campo != simbolo.item->campos.end();
-             ++campo)
-            if (campo.key().startsWith(QLatin1String(prefixo))) {
-                const QString sufixo = campo.key().mid(int(qstrlen(prefixo)));
-                if (!ligacoes.contains(sufixo)) ligacoes.insert(sufixo, campo.value());
+    const std::vector<CamposItem::Campo>& campos = simbolo.item->campos.todos();
+    for (int p = 0; p < kLigacoesDoBorne; ++p)
+        for (const CamposItem::Campo& campo : campos)
+            if (PrefixoDoNome(campo.nome) == p) {
+                const QString sufixo = CamposItem::nome(campo.nome).mid(int(qstrlen(kPrefixos[p])));
+                if (!ligacoes.contains(sufixo)) ligacoes.insert(sufixo, campo.valor);
             }
     // The terminals of each connection value, in the symbol's own order.
     QHash<QString, std::vector<CEBorneDwg*>> porLigacao;
     for (CEItemDwg* ligado : simbolo.ligados) {
         auto* borne = static_cast<CEBorneDwg*>(ligado);
-        for (auto campo = borne->item->campos.begin(); campo != borne->item->campos.end(); ++campo)
-            if (campo.key().startsWith(QLatin1String("LIG_"))) {
-                auto& lista = porLigacao[campo.value()];
+        for (const CamposItem::Campo& campo : borne->item->campos.todos())
+            if (PrefixoDoNome(campo.nome) == kLigacoesDoBorne) {
+                auto& lista = porLigacao[campo.valor];
                 if (lista.empty() || lista.back() != borne) lista.push_back(borne);
             }
     }

@@ -64,6 +64,24 @@ TEST_F(WireLengthTest, ARoutedWireGetsItsRouteLengthWithTheAllowances) {
     EXPECT_EQ(comprimentos().value("12"), "1150.000000");
 }
 
+TEST_F(WireLengthTest, AReaderWalkingAgainFindsTheViewsWhereTheyAreNow) {
+    fio({{20, 150, 0}, {20, 100, 0}}, "12");
+    rota({{100, 190, 0}, {100, -10, 0}, {900, -10, 0}}, "12");
+    CICad::SetRealLisp("PBLCOMPFIOPORCENTO", 0.0);
+    CICad::SetRealLisp("PBLCOMPFIOABSOLUTO", 0.0);
+    CCFioDataReader leitor;
+    le(leitor);
+    ASSERT_EQ(itens_.size(), 1u);
+    EXPECT_EQ(itens_[0]->valorCampo("COMPRIMENTO"), "1000.000000");
+    itens_.destruirItens();
+    // The coil's A2 moves down beside the route's corner: only the 800 across is left.
+    ASSERT_TRUE(vistaK1_->attribute("CPOINT2"));
+    vistaK1_->attribute("CPOINT2")->setPosition({100, -5, 0});
+    le(leitor);
+    ASSERT_EQ(itens_.size(), 1u);
+    EXPECT_EQ(itens_[0]->valorCampo("COMPRIMENTO"), "800.000000");
+}
+
 TEST_F(WireLengthTest, TheRouteIsMeasuredBetweenTheVerticesNearestTheEndsOnly) {
     fio({{20, 150, 0}, {20, 100, 0}}, "12");
     // Vertices before the first end and beyond the second do not count: 200 + 800.

@@ -116,6 +116,82 @@ TEST_F(WireReaderTest, AnElementThatNoLongerExistsLeavesTheStretchOpen) {
     EXPECT_EQ(itens_[0]->ligado, nullptr);
 }
 
+// ---- what a walk keeps
+
+TEST_F(WireReaderTest, AReaderWalkingAgainSeesTheChangedConnectionAndSeparators) {
+    borne("X1", "1", {20, 200, 0});
+    zvdb::BlockReference* k1 = componente("-K1", {{"A1", {20, 150, 0}}});
+    fio({{20, 190, 0}, {20, 150, 0}}, "12");
+    CCFioDataReader leitor;
+    le(leitor);
+    EXPECT_EQ(cadeias(), QStringList({"X1:1/>-K1:A1"}));
+    EXPECT_EQ(itens_[0]->valorCampo("LIG_FIM"), "A1");
+    itens_.destruirItens();
+
+    // The same reader, the drawing and the template changed in between.
+    ASSERT_TRUE(k1->attribute("LIGACAO1"));
+    k1->attribute("LIGACAO1")->setTextValue("A9");
+    modelo_.simbolos["*CHAR_SEP_STD_CFG*"] = ".";
+    modelo_.simbolos["*CHAR_SEP_LIG_CFG*"] = "+";
+    le(leitor);
+    EXPECT_EQ(cadeias(), QStringList({"X1.1+>-K1.A9"}));
+    EXPECT_EQ(itens_[0]->valorCampo("LIG_FIM"), "A9");
+    // Outside a walk the relation reads the template as it is.
+    modelo_.simbolos["*ORDEM_CONCAT_STD*"] = "0";
+    CEItemLista avulso;
+    avulso.definirCampo("RELACAO_FIM", "-K2");
+    leitor.ComporRelacaoFio("_FIM", avulso, &modelo_, nullptr);
+    EXPECT_EQ(avulso.valorCampo("RELACAO_FIM"), ".-K2");
+}
+
+TEST_F(WireReaderTest, AReaderThatGaveBackItsReadsReadsTheSameAgain) {
+    borne("X1", "1", {20, 200, 0});
+    componente("-K1", {{"A1", {20, 150, 0}}}, "NA-1");
+    borne("X1", "2", {20, 100, 0});
+    fio({{20, 190, 0}, {20, 150, 0}, {20, 100, 0}}, "12");
+    CCFioDataReader leitor;
+    le(leitor);
+    QStringList antes;
+    for (const CEItemLista* item : itens_)
+        antes << item->textoCampos();
+    ASSERT_EQ(antes.size(), 2);
+    itens_.destruirItens();
+    // Connections, entities read and indexes go; the next walk loads them again.
+    leitor.LiberaLeituras();
+    EXPECT_EQ(leitor.ListaConexoes("12"), nullptr);
+    le(leitor);
+    QStringList depois;
+    for (const CEItemLista* item : itens_)
+        depois << item->textoCampos();
+    EXPECT_EQ(depois, antes);
+    EXPECT_EQ(cadeias(), QStringList({"X1:1/>-K1:A1 -K1:A1>X1:2/"}));
+    EXPECT_EQ(itens_[1]->valorCampo("FIO_SEGFIM"), "12");
+}
+
+TEST_F(WireReaderTest, AWireThroughManyElementsFindsTheWireAtEachEndAndItsConnection) {
+    // Past some sixteen entries a wire's repeated texts are found through an index.
+    const int n = 24;
+    borne("X1", "1", {20, 1000, 0});
+    std::vector<zvdb::Point3> pontos{{20, 990, 0}};
+    for (int i = 0; i < n; ++i) {
+        const zvdb::Point3 p{20, 950.0 - 30.0 * i, 0};
+        componente(QString("-K%1").arg(i + 1).toStdString(),
+                   {{QString("A%1").arg(i + 1).toStdString(), p}});
+        pontos.push_back(p);
+    }
+    fio(pontos, "30");
+    CCFioDataReader leitor;
+    ASSERT_EQ(le(leitor).size(), size_t(n));
+    QStringList esperada{"X1:1/>-K1:A1"};
+    for (int i = 1; i < n; ++i)
+        esperada << QString("-K%1:A%1>-K%2:A%2").arg(i).arg(i + 1);
+    EXPECT_EQ(cadeias(), QStringList({esperada.join(" ")}));
+    for (const CEItemLista* item : itens_) {
+        EXPECT_EQ(item->valorCampo("FIO_SEGINI"), "30");
+        EXPECT_EQ(item->valorCampo("FIO_SEGFIM"), "30");
+    }
+}
+
 // ---- which wires
 
 TEST_F(WireReaderTest, AWireWhoseKeyIsNotListedIsLeftOutWithoutAMessage) {
