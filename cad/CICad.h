@@ -8,7 +8,9 @@
 #include <QString>
 #include <QStringList>
 
+#include <functional>
 #include <memory>
+#include <optional>
 #include <vector>
 
 namespace zvsdk {
@@ -27,6 +29,11 @@ struct CEItemXData {
     double x = 0.0, y = 0.0, z = 0.0;
 };
 using CEListaXData = std::vector<CEItemXData>;
+
+// The value an attribute of a reference takes as it is made, from its tag and default value
+// (both trimmed); none keeps the default.
+using CEValoresAtributos =
+    std::function<std::optional<QString>(const QString& tag, const QString& padrao)>;
 
 // A point of the drawing.
 struct CEPonto {
@@ -119,9 +126,11 @@ public:
     // redefined blocks refreshed in one walk of the drawing; one result per pair.
     static std::vector<bool> RecarregaBlocos(
         const std::vector<std::pair<QString, QString>>& blocos);
+    // A reference to the block (loaded from the file when the drawing lacks it) in model
+    // space, with its attributes; `valores`, when given, tells each attribute's value.
     static OdDbObjectId InsereBloco(const QString& arquivo, const QString& nome,
                                     const QString& layer, double x, double y, double z,
-                                    double rotacao);
+                                    double rotacao, const CEValoresAtributos& valores = {});
     static std::unique_ptr<zv::CEListaAtributos> GetDefinicoesAtributos(const QString& arquivo,
                                                                         const QString& nome);
     static OdDbObjectId GetReferenciaNoLayer(const QString& nome, const QString& layer);
@@ -166,7 +175,8 @@ public:
     // Writes the values of a list back by tag, in order of occurrence.
     static void SetAtributosLista(const OdDbObjectId& referencia,
                                   const zv::CEListaAtributos& lista);
-    static void CriarAtributos(const OdDbObjectId& definicao, const OdDbObjectId& referencia);
+    static void CriarAtributos(const OdDbObjectId& definicao, const OdDbObjectId& referencia,
+                               const CEValoresAtributos& valores = {});
     // The attribute's own value and invisibility, written to the drawing.
     static void SetValorAtributo(const OdDbObjectId& atributo, const QString& valor);
     static bool SetInvisivelAtributo(const OdDbObjectId& atributo, bool invisivel);

@@ -12,6 +12,8 @@
 
 #include <array>
 #include <exception>
+#include <optional>
+#include <string>
 #include <vector>
 
 using namespace cicad;
@@ -222,7 +224,8 @@ void CICad::SetAtributosLista(const OdDbObjectId& referencia, const zv::CEListaA
     }
 }
 
-void CICad::CriarAtributos(const OdDbObjectId& definicao, const OdDbObjectId& referencia) {
+void CICad::CriarAtributos(const OdDbObjectId& definicao, const OdDbObjectId& referencia,
+                           const CEValoresAtributos& valores) {
     try {
         auto* bloco = Como<zvdb::BlockRecord>(definicao);
         auto* ref = Como<zvdb::BlockReference>(referencia);
@@ -230,7 +233,23 @@ void CICad::CriarAtributos(const OdDbObjectId& definicao, const OdDbObjectId& re
         std::vector<const zvdb::Attribute*> definicoes;
         for (zvdb::Attribute* def : bloco->attributeDefinitions())
             if (!def->isConstant()) definicoes.push_back(def);
-        ref->addAttributesFromDefinitions(definicoes);
+        if (!valores) {
+            ref->addAttributesFromDefinitions(definicoes);
+            return;
+        }
+        // The values are asked for before the attributes are made, so that each is made with
+        // its value instead of being found and set again.
+        std::vector<std::string> textos;
+        textos.reserve(definicoes.size());
+        std::vector<std::optional<std::string_view>> dados(definicoes.size());
+        for (size_t i = 0; i < definicoes.size(); ++i) {
+            const std::optional<QString> valor =
+                valores(Q(definicoes[i]->tag()).trimmed(), Q(definicoes[i]->textValue()).trimmed());
+            if (!valor) continue;
+            textos.push_back(U8(*valor));
+            dados[i] = textos.back();
+        }
+        ref->addAttributesFromDefinitions(definicoes, dados);
     } catch (const std::exception& erro) {
         Log("CICAd::CriarAtributos: " + QString::fromUtf8(erro.what()));
     }

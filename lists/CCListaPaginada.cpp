@@ -91,27 +91,46 @@ QString CCListaPaginada::AvaliaFuncao(const QString& expressao) {
     return texto;
 }
 
+namespace {
+
+bool EhVariavel(const QString& tag) {
+    return tag.startsWith("VARIAVEL") || tag.startsWith("VARIABLE");
+}
+
+bool EhFuncao(const QString& tag) {
+    return tag.startsWith("FUNCAO") || tag.startsWith("FUNCTION");
+}
+
+}  // namespace
+
 void CCListaPaginada::InsereDetalhe(const Bloco& bloco, const QString& layer,
                                     const CELinhaLista& linha, bool variasColunas) {
     if (!bloco.existe() || !linha.item) return;
+    // A field named by the default value is the attribute's value from the start; functions
+    // are worked out in LISP once the reference is whole.
+    bool temFuncoes = false;
+    const auto valores = [&](const QString& tag, const QString& padrao) -> std::optional<QString> {
+        const QString maiuscula = tag.toUpper();
+        if (EhVariavel(maiuscula)) return linha.item->valorCampo(padrao);
+        temFuncoes = temFuncoes || EhFuncao(maiuscula);
+        return std::nullopt;
+    };
     const OdDbObjectId ref =
-        CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, linha.x, linha.y, 0, 0);
+        CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, linha.x, linha.y, 0, 0, valores);
     if (ref.isNull()) return;
-    std::unique_ptr<zv::CEListaAtributos> atributos;
-    CICad::GetAtributos(ref, atributos, false, false);
-    bool publicado = false;
-    for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
-        zv::CEAtributo& atributo = (*atributos)[i];
-        const QString tag = atributo.GetTag().toUpper();
-        if (tag.startsWith("VARIAVEL") || tag.startsWith("VARIABLE")) {
-            atributo.SetValor(linha.item->valorCampo(atributo.GetValor()));
-        } else if (tag.startsWith("FUNCAO") || tag.startsWith("FUNCTION")) {
+    if (temFuncoes) {
+        std::unique_ptr<zv::CEListaAtributos> atributos;
+        CICad::GetAtributos(ref, atributos, false, false);
+        bool publicado = false;
+        for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
+            zv::CEAtributo& atributo = (*atributos)[i];
+            if (!EhFuncao(atributo.GetTag().toUpper())) continue;
             if (!publicado) linha.item->paraLisp();
             publicado = true;
             atributo.SetValor(AvaliaFuncao(atributo.GetValor()));
         }
+        if (publicado) CEItemLista::limparLisp();
     }
-    if (publicado) CEItemLista::limparLisp();
     if (!variasColunas && !linha.item->ids.empty() && !linha.item->ids.front().isNull())
         CICad::SetXData(ref, "KVR_ZV_LINK",
                         {{1000, ZVString::DeHandle(linha.item->ids.front().handle())}});

@@ -60,17 +60,11 @@ Attribute* BlockReference::addAttributeFromDefinition(const Attribute& definitio
 }
 
 std::vector<Attribute*> BlockReference::addAttributesFromDefinitions(
-    std::span<const Attribute* const> definitions) {
-    std::vector<Attribute*> made;
-    if (definitions.empty()) return made;
-    made.reserve(definitions.size());
-    const Transform placement = transform();
-    const double heightScale = std::abs(scale().y);
-    const double degrees = rotation();
-    for (const Attribute* definition : definitions)
-        made.push_back(database().addAttributeFromDefinition(*this, *definition, placement,
-                                                             heightScale, degrees));
-    return made;
+    std::span<const Attribute* const> definitions,
+    std::span<const std::optional<std::string_view>> values) {
+    if (definitions.empty()) return {};
+    return database().addAttributesFromDefinitions(*this, definitions, values, transform(),
+                                                   std::abs(scale().y), rotation());
 }
 
 }  // namespace zvdb
