@@ -148,6 +148,8 @@ public:
     static void GetAtributosPorId(const OdDbObjectId& id,
                                   std::unique_ptr<zv::CEListaAtributos>& lista, bool comPrompts,
                                   bool usarPadroes, const QString& prefixo = QString());
+    // The ids of the reference's attributes in order.
+    static std::vector<OdDbObjectId> GetIdsAtributos(const OdDbObjectId& referencia);
     static void GetAtributosConstantes(const OdDbObjectId& referencia,
                                        std::unique_ptr<zv::CEListaAtributos>& lista);
     static std::unique_ptr<zv::CEAtributo> GetAtributo(const QString& tag,

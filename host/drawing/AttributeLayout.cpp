@@ -43,7 +43,10 @@ AttributeLayout::AttributeLayout(Database& target, const Attribute& definition)
       position_(definition.position()),
       alignment_(definition.point(11)),
       height_(definition.height()),
-      ownRotation_(definition.rotation()) {
+      ownRotation_(definition.rotation()),
+      tag_(definition.tag()),
+      defaultValue_(definition.textValue()),
+      constant_(definition.isConstant()) {
     // Whether the attribute takes a rotation depends on the reference: both ways are ready.
     plain_ = makeVariant(target, definition, false);
     rotated_ = makeVariant(target, definition, true);

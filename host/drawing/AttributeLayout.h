@@ -32,6 +32,10 @@ public:
     AttributeLayout(Database& target, const Attribute& definition);
     // Whether the definition still has the tags the layout was worked out from.
     bool matches(const Attribute& definition) const;
+    // The definition's tag, default value and whether it is constant, as they were read.
+    std::string_view tag() const { return tag_; }
+    std::string_view defaultValue() const { return defaultValue_; }
+    bool isConstant() const { return constant_; }
 
     // The part of a placement the layout needs, worked out once per reference.
     struct Placement {
@@ -62,6 +66,9 @@ private:
     Point3 alignment_;
     double height_ = 1.0;
     double ownRotation_ = 0.0;
+    std::string_view tag_;
+    std::string_view defaultValue_;
+    bool constant_ = false;
     // For references that leave the attribute unrotated, and for the others.
     Variant plain_;
     Variant rotated_;

@@ -436,14 +436,15 @@ std::vector<Attribute*> Database::addAttributesFromDefinitions(
     AttributeLayouts& layouts = attributeLayouts();
     for (std::size_t i = 0; i < definitions.size(); ++i) {
         AttributeLayout& layout = layouts.layout(*this, *definitions[i]);
-        where.handle = handleText(arena_, allocateHandle());
+        const std::uint64_t handle = allocateHandle();
+        where.handle = handleText(arena_, handle);
         const std::optional<std::string_view> value =
             i < values.size() ? values[i] : std::optional<std::string_view>();
         const bool valuePlaced = layout.compose(*this, scratch_, where, value);
         // The tags go to the arena at their exact size: an attribute's later changes are
         // mostly new values, made in place; one that gains a tag takes a list of its own then.
-        auto* attribute = static_cast<Attribute*>(
-            adopt(std::make_unique<Attribute>(*this, arena_.storeTags(scratch_))));
+        auto* attribute = static_cast<Attribute*>(adopt(std::make_unique<Attribute>(
+            *this, arena_.storeTags(scratch_), handle, reference.handle())));
         reference.addSubEntity(attribute);
         if (i == 0) {
             if (reference.integer(66) != 1) reference.setInteger(66, 1, "AcDbBlockReference");
