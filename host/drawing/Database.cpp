@@ -339,6 +339,19 @@ std::vector<DbObject*> Database::objects() const {
 // Entities ---------------------------------------------------------------------------------
 
 namespace {
+// A handle as tag text, without a string in between.
+std::string_view handleText(StringArena& arena, std::uint64_t handle) {
+    char buffer[16];
+    std::size_t at = sizeof buffer;
+    do {
+        buffer[--at] = "0123456789ABCDEF"[handle & 15];
+        handle >>= 4;
+    } while (handle != 0);
+    return arena.store({buffer + at, sizeof buffer - at});
+}
+}  // namespace
+
+namespace {
 // Room for the few tags (rotation, colour, linetype, alignment point) that callers set right
 // after making an entity, so that setting them does not double the entity's tag storage.
 constexpr std::size_t kSettersSlack = 4;
@@ -410,19 +423,6 @@ AttributeLayouts& Database::attributeLayouts() {
     return *layouts_;
 }
 
-namespace {
-// A handle as tag text, without a string in between.
-std::string_view handleText(StringArena& arena, std::uint64_t handle) {
-    char buffer[16];
-    std::size_t at = sizeof buffer;
-    do {
-        buffer[--at] = "0123456789ABCDEF"[handle & 15];
-        handle >>= 4;
-    } while (handle != 0);
-    return arena.store({buffer + at, sizeof buffer - at});
-}
-}  // namespace
-
 std::vector<Attribute*> Database::addAttributesFromDefinitions(
     BlockReference& reference, std::span<const Attribute* const> definitions,
     std::span<const std::optional<std::string_view>> values, const Transform& placement,
@@ -448,7 +448,18 @@ std::vector<Attribute*> Database::addAttributesFromDefinitions(
         reference.addSubEntity(attribute);
         if (i == 0) {
             if (reference.integer(66) != 1) reference.setInteger(66, 1, "AcDbBlockReference");
-            ensureSeqend(reference);
+            if (!reference.seqend()) {
+                // As ensureSeqend makes it, from values the drawing holds already.
+                const std::uint64_t seqend = allocateHandle();
+                const std::string_view layer = reference.layer();
+                Tag tags[6] = {Tag{0, "SEQEND"}, Tag{5, handleText(arena_, seqend)},
+                               Tag{330, where.owner}, Tag{100, "AcDbEntity"}};
+                std::size_t count = 4;
+                if (where.paperSpace) tags[count++] = Tag{67, "1"};
+                tags[count++] = Tag{8, layer.empty() ? std::string_view("0") : layer};
+                reference.setSeqend(static_cast<Entity*>(adopt(std::make_unique<Entity>(
+                    *this, arena_.storeTags({tags, count}), seqend, reference.handle()))));
+            }
         }
         if (!valuePlaced) attribute->setTextValue(*value);
         made.push_back(attribute);
