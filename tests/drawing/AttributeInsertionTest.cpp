@@ -19,6 +19,7 @@
 #include <cmath>
 #include <functional>
 #include <memory>
+#include <numbers>
 #include <optional>
 #include <set>
 #include <string>
@@ -391,6 +392,52 @@ TEST(AttributeFromDefinition, UndoTakesInsertionBackAndLaterReferencesStillMatch
     ASSERT_EQ(again->attributes().size(), 4u);
     EXPECT_EQ(again->attribute("PLAIN")->textValue(), "-K7");
     expectSameAttributes(db, *db.block("RICO"), {{5, 5, 0}, {1, 1, 1}, 0}, values);
+}
+
+TEST(AttributeFromDefinition, APlacementIsReadAsTheReferencesAccessorsReadIt) {
+    Database db;
+    const BlockRecord* block = richBlock(db);
+    // Scales and points inside an application group and in the extended data are not the
+    // reference's; a point without z, a scale that does not read, a flipped extrusion are.
+    const auto expected = [&](const BlockReference& r) {
+        const Point3 s = r.scale();
+        return Transform::fromOcs(r.extrusion()) * Transform::translation(r.position()) *
+               Transform::rotationZ(r.rotation() * std::numbers::pi / 180.0) *
+               Transform::scaling(s.x, s.y, s.z) *
+               Transform::translation(block->basePoint() * -1.0);
+    };
+    const auto same = [](const Transform& a, const Transform& b) {
+        return a.linear == b.linear && a.move == b.move;
+    };
+    BlockReference* plain = db.modelSpace()->addBlockReference(*block, {3, 4, 5}, {2, 3, 4}, 33);
+    EXPECT_TRUE(same(plain->transform(), expected(*plain)));
+    BlockReference* odd = db.modelSpace()->addBlockReference(*block, {3, 4, 5}, {1, 1, 1}, 0);
+    auto& tags = odd->editTags();
+    const auto at = std::find(tags.begin(), tags.end(), tag(100, "AcDbBlockReference"));
+    const Tag group[] = {tag(102, "{ZV_TEST"), tag(41, "9.0"), tag(10, "99.0"), tag(102, "}")};
+    tags.insert(at + 1, group, group + 4);
+    std::erase_if(tags, [](const Tag& t) { return t.code == 30 || t.code == 42; });
+    tags.push_back(tag(42, "not a number"));
+    tags.push_back(tag(50, "12.5"));
+    tags.push_back(tag(210, "0.0"));
+    tags.push_back(tag(220, "0.0"));
+    tags.push_back(tag(230, "-1.0"));
+    tags.push_back(tag(1001, "KVR_ZV"));
+    tags.push_back(tag(1041, "7.0"));
+    tags.push_back(tag(1010, "50.0"));
+    EXPECT_EQ(odd->position(), (Point3{3, 4, 0}));
+    EXPECT_EQ(odd->scale().y, 1.0);
+    EXPECT_EQ(odd->rotation(), 12.5);
+    EXPECT_TRUE(same(odd->transform(), expected(*odd)));
+    // Its attributes take the same height scale and rotation as one by one.
+    const auto definitions = variableDefinitions(*block);
+    std::vector<std::vector<std::string>> oneByOne;
+    for (const Attribute* definition : definitions)
+        oneByOne.push_back(withoutIdentity(*madeStepByStep(*odd, *definition)));
+    const auto made = odd->addAttributesFromDefinitions(definitions);
+    ASSERT_EQ(made.size(), oneByOne.size());
+    for (std::size_t i = 0; i < made.size(); ++i)
+        EXPECT_EQ(withoutIdentity(*made[i]), oneByOne[i]);
 }
 
 // Values changed where a file's tags are -------------------------------------------------
