@@ -1,6 +1,7 @@
 // Inserting block references with their attributes, as the list writers do (one reference a
 // row, its attributes made from the block's definitions, then their values set), made in one
-// pass against the step-by-step way (a bare attribute, then its properties set one by one).
+// pass against the step-by-step way (a bare attribute, then its properties set one by one),
+// and in one pass with the values given as the attributes are made.
 // Each way runs in a child process of its own, so that its processor time and the memory it
 // adds are its alone. Usage: bench_attributes [references], 100,000 by default.
 #include "drawing/Attribute.h"
@@ -15,7 +16,9 @@
 #include <cmath>
 #include <cstdio>
 #include <cstdlib>
+#include <optional>
 #include <string>
+#include <string_view>
 #include <vector>
 
 using namespace zvdb;
@@ -63,7 +66,9 @@ void stepByStep(BlockReference& reference, const Attribute& definition) {
     if (definition.has(6)) attribute->setLinetype(definition.linetype());
 }
 
-void run(bool onePass, int references) {
+enum class Way { StepByStep, OnePass, WithValues };
+
+void run(Way way, int references) {
     Database db;
     db.createLayer("LISTAS$0001$A");
     BlockRecord* row = db.createBlock("BLK_DET");
@@ -80,18 +85,27 @@ void run(bool onePass, int references) {
     for (int i = 0; i < references; ++i) {
         BlockReference* reference = db.modelSpace()->addBlockReference(
             *row, {15, 262.0 - 3.5 * (i % 70), 0}, {1, 1, 1}, 0, "LISTAS$0001$A");
-        if (onePass) {
+        const std::string value = std::to_string(i);
+        if (way == Way::WithValues) {
+            const std::vector<std::optional<std::string_view>> values(definitions.size(), value);
+            reference->addAttributesFromDefinitions(definitions, values);
+            continue;
+        }
+        if (way == Way::OnePass) {
             reference->addAttributesFromDefinitions(definitions);
         } else {
             for (const Attribute* definition : definitions)
                 stepByStep(*reference, *definition);
         }
         for (Attribute* attribute : reference->attributes())
-            attribute->setTextValue(std::to_string(i));
+            attribute->setTextValue(value);
     }
     const double cpu = cpuSeconds() - start;
-    std::printf("%-13s %9d %10zu %9.3f %9.2f %10.1f\n", onePass ? "one pass" : "step by step",
-                references, std::size_t(references) * definitions.size(), cpu,
+    const char* name = way == Way::StepByStep ? "step by step"
+                       : way == Way::OnePass  ? "one pass"
+                                              : "with values";
+    std::printf("%-13s %9d %10zu %9.3f %9.2f %10.1f\n", name, references,
+                std::size_t(references) * definitions.size(), cpu,
                 1e6 * cpu / (double(references) * double(definitions.size())),
                 double(peakKb() - before) / 1024.0);
     std::fflush(stdout);
@@ -104,10 +118,10 @@ int main(int argc, char** argv) {
     std::printf("%-13s %9s %10s %9s %9s %10s\n", "way", "refs", "attributes", "cpu s", "us/attr",
                 "added MB");
     std::fflush(stdout);
-    for (const bool onePass : {false, true}) {
+    for (const Way way : {Way::StepByStep, Way::OnePass, Way::WithValues}) {
         const pid_t child = fork();
         if (child == 0) {
-            run(onePass, references);
+            run(way, references);
             std::_Exit(0);
         }
         int status = 0;

@@ -8,7 +8,9 @@
 #include <QString>
 #include <QStringList>
 
+#include <functional>
 #include <memory>
+#include <optional>
 #include <string_view>
 #include <vector>
 
@@ -28,6 +30,11 @@ struct CEItemXData {
     double x = 0.0, y = 0.0, z = 0.0;
 };
 using CEListaXData = std::vector<CEItemXData>;
+
+// The value an attribute of a reference takes as it is made, from its tag and default value
+// (both trimmed); none keeps the default.
+using CEValoresAtributos =
+    std::function<std::optional<QString>(const QString& tag, const QString& padrao)>;
 
 // A point of the drawing.
 struct CEPonto {
@@ -120,9 +127,11 @@ public:
     // redefined blocks refreshed in one walk of the drawing; one result per pair.
     static std::vector<bool> RecarregaBlocos(
         const std::vector<std::pair<QString, QString>>& blocos);
+    // A reference to the block (loaded from the file when the drawing lacks it) in model
+    // space, with its attributes; `valores`, when given, tells each attribute's value.
     static OdDbObjectId InsereBloco(const QString& arquivo, const QString& nome,
                                     const QString& layer, double x, double y, double z,
-                                    double rotacao);
+                                    double rotacao, const CEValoresAtributos& valores = {});
     static std::unique_ptr<zv::CEListaAtributos> GetDefinicoesAtributos(const QString& arquivo,
                                                                         const QString& nome);
     static OdDbObjectId GetReferenciaNoLayer(const QString& nome, const QString& layer);
@@ -140,6 +149,8 @@ public:
     static void GetAtributosPorId(const OdDbObjectId& id,
                                   std::unique_ptr<zv::CEListaAtributos>& lista, bool comPrompts,
                                   bool usarPadroes, const QString& prefixo = QString());
+    // The ids of the reference's attributes in order.
+    static std::vector<OdDbObjectId> GetIdsAtributos(const OdDbObjectId& referencia);
     static void GetAtributosConstantes(const OdDbObjectId& referencia,
                                        std::unique_ptr<zv::CEListaAtributos>& lista);
     static std::unique_ptr<zv::CEAtributo> GetAtributo(const QString& tag,
@@ -167,7 +178,8 @@ public:
     // Writes the values of a list back by tag, in order of occurrence.
     static void SetAtributosLista(const OdDbObjectId& referencia,
                                   const zv::CEListaAtributos& lista);
-    static void CriarAtributos(const OdDbObjectId& definicao, const OdDbObjectId& referencia);
+    static void CriarAtributos(const OdDbObjectId& definicao, const OdDbObjectId& referencia,
+                               const CEValoresAtributos& valores = {});
     // The attribute's own value and invisibility, written to the drawing.
     static void SetValorAtributo(const OdDbObjectId& atributo, const QString& valor);
     static bool SetInvisivelAtributo(const OdDbObjectId& atributo, bool invisivel);

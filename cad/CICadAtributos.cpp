@@ -2,6 +2,7 @@
 #include "CICadInterno.h"
 
 #include "drawing/Attribute.h"
+#include "drawing/AttributeLayout.h"
 #include "drawing/BlockRecord.h"
 #include "drawing/BlockReference.h"
 #include "readers/CEAtributo.h"
@@ -12,6 +13,8 @@
 
 #include <array>
 #include <exception>
+#include <optional>
+#include <string>
 #include <vector>
 
 using namespace cicad;
@@ -75,6 +78,14 @@ void CICad::GetAtributos(const OdDbObjectId& referencia,
 void CICad::GetAtributosPorId(const OdDbObjectId& id, std::unique_ptr<zv::CEListaAtributos>& lista,
                               bool comPrompts, bool usarPadroes, const QString& prefixo) {
     GetAtributos(id, lista, comPrompts, usarPadroes, prefixo);
+}
+
+std::vector<OdDbObjectId> CICad::GetIdsAtributos(const OdDbObjectId& referencia) {
+    std::vector<OdDbObjectId> ids;
+    if (auto* ref = Como<zvdb::BlockReference>(referencia))
+        for (zvdb::Attribute* atributo : ref->attributes())
+            ids.push_back(Id(atributo));
+    return ids;
 }
 
 void CICad::GetAtributosConstantes(const OdDbObjectId& referencia,
@@ -222,15 +233,35 @@ void CICad::SetAtributosLista(const OdDbObjectId& referencia, const zv::CEListaA
     }
 }
 
-void CICad::CriarAtributos(const OdDbObjectId& definicao, const OdDbObjectId& referencia) {
+void CICad::CriarAtributos(const OdDbObjectId& definicao, const OdDbObjectId& referencia,
+                           const CEValoresAtributos& valores) {
     try {
         auto* bloco = Como<zvdb::BlockRecord>(definicao);
         auto* ref = Como<zvdb::BlockReference>(referencia);
         if (!bloco || !ref) return;
+        // What each definition gives is read once for the drawing, not once a reference.
+        zvdb::Database& db = ref->database();
+        zvdb::AttributeLayouts& leituras = db.attributeLayouts();
         std::vector<const zvdb::Attribute*> definicoes;
-        for (zvdb::Attribute* def : bloco->attributeDefinitions())
-            if (!def->isConstant()) definicoes.push_back(def);
-        ref->addAttributesFromDefinitions(definicoes);
+        // The values are asked for before the attributes are made, so that each is made with
+        // its value instead of being found and set again.
+        std::vector<std::string> textos;
+        std::vector<std::optional<std::string_view>> dados;
+        const std::vector<zvdb::Attribute*> todas = bloco->attributeDefinitions();
+        textos.reserve(todas.size());
+        for (zvdb::Attribute* def : todas) {
+            const zvdb::AttributeLayout& leitura = leituras.layout(db, *def);
+            if (leitura.isConstant()) continue;
+            definicoes.push_back(def);
+            if (!valores) continue;
+            std::optional<QString> valor =
+                valores(Q(leitura.tag()).trimmed(), Q(leitura.defaultValue()).trimmed());
+            dados.emplace_back();
+            if (!valor) continue;
+            textos.push_back(U8(*valor));
+            dados.back() = textos.back();
+        }
+        ref->addAttributesFromDefinitions(definicoes, dados);
     } catch (const std::exception& erro) {
         Log("CICAd::CriarAtributos: " + QString::fromUtf8(erro.what()));
     }

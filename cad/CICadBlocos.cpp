@@ -155,7 +155,8 @@ std::vector<bool> CICad::RecarregaBlocos(const std::vector<std::pair<QString, QS
 }
 
 OdDbObjectId CICad::InsereBloco(const QString& arquivo, const QString& nome, const QString& layer,
-                                double x, double y, double z, double rotacao) {
+                                double x, double y, double z, double rotacao,
+                                const CEValoresAtributos& valores) {
     zvdb::Database* db = GetDatabase();
     if (!db) return {};
     OdDbObjectId bloco;
@@ -169,7 +170,7 @@ OdDbObjectId CICad::InsereBloco(const QString& arquivo, const QString& nome, con
     const double graus = Simples(rotacao) * 180.0 / M_PI;
     zvdb::BlockReference* ref =
         modelo->addBlockReference(*definicao, ponto, {1, 1, 1}, graus, U8(layer));
-    CriarAtributos(bloco, Id(ref));
+    CriarAtributos(bloco, Id(ref), valores);
     return Id(ref);
 }
 

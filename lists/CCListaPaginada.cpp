@@ -73,14 +73,11 @@ QHash<QString, QString> CCListaPaginada::CamposPrimeiraPagina(int quantidade) {
 void CCListaPaginada::InsereCampos(const Bloco& bloco, const QString& layer,
                                    const QHash<QString, QString>& campos, bool maiusculas) {
     if (!bloco.existe()) return;
-    const OdDbObjectId ref = CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, 0, 0, 0, 0);
-    std::unique_ptr<zv::CEListaAtributos> atributos;
-    CICad::GetAtributos(ref, atributos, false, false);
-    for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
-        zv::CEAtributo& atributo = (*atributos)[i];
-        const QString chave = maiusculas ? atributo.GetValor().toUpper() : atributo.GetValor();
-        atributo.SetValor(campos.value(chave));
-    }
+    // Each attribute names by its default value the field it shows.
+    CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, 0, 0, 0, 0,
+                       [&](const QString&, const QString& padrao) -> std::optional<QString> {
+                           return campos.value(maiusculas ? padrao.toUpper() : padrao);
+                       });
 }
 
 QString CCListaPaginada::AvaliaFuncao(const QString& expressao) {
@@ -91,27 +88,45 @@ QString CCListaPaginada::AvaliaFuncao(const QString& expressao) {
     return texto;
 }
 
+namespace {
+
+// Tags in upper case.
+bool EhVariavel(const QString& tag) {
+    return tag.startsWith(QLatin1String("VARIAVEL")) || tag.startsWith(QLatin1String("VARIABLE"));
+}
+
+bool EhFuncao(const QString& tag) {
+    return tag.startsWith(QLatin1String("FUNCAO")) || tag.startsWith(QLatin1String("FUNCTION"));
+}
+
+}  // namespace
+
 void CCListaPaginada::InsereDetalhe(const Bloco& bloco, const QString& layer,
                                     const CELinhaLista& linha, bool variasColunas) {
     if (!bloco.existe() || !linha.item) return;
+    // A field named by the default value is the attribute's value from the start; functions
+    // (their place among the attributes and their text) are worked out in LISP once the
+    // reference is whole.
+    std::vector<std::pair<size_t, QString>> funcoes;
+    size_t indice = 0;
+    const auto valores = [&](const QString& tag, const QString& padrao) -> std::optional<QString> {
+        const QString maiuscula = tag.toUpper();
+        const size_t este = indice++;
+        if (EhVariavel(maiuscula)) return linha.item->valorCampo(padrao);
+        if (EhFuncao(maiuscula)) funcoes.emplace_back(este, padrao);
+        return std::nullopt;
+    };
     const OdDbObjectId ref =
-        CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, linha.x, linha.y, 0, 0);
+        CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, linha.x, linha.y, 0, 0, valores);
     if (ref.isNull()) return;
-    std::unique_ptr<zv::CEListaAtributos> atributos;
-    CICad::GetAtributos(ref, atributos, false, false);
-    bool publicado = false;
-    for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
-        zv::CEAtributo& atributo = (*atributos)[i];
-        const QString tag = atributo.GetTag().toUpper();
-        if (tag.startsWith("VARIAVEL") || tag.startsWith("VARIABLE")) {
-            atributo.SetValor(linha.item->valorCampo(atributo.GetValor()));
-        } else if (tag.startsWith("FUNCAO") || tag.startsWith("FUNCTION")) {
-            if (!publicado) linha.item->paraLisp();
-            publicado = true;
-            atributo.SetValor(AvaliaFuncao(atributo.GetValor()));
-        }
+    if (!funcoes.empty()) {
+        const std::vector<OdDbObjectId> atributos = CICad::GetIdsAtributos(ref);
+        linha.item->paraLisp();
+        for (const auto& [posicao, expressao] : funcoes)
+            if (posicao < atributos.size())
+                CICad::SetValorAtributo(atributos[posicao], AvaliaFuncao(expressao));
+        CEItemLista::limparLisp();
     }
-    if (publicado) CEItemLista::limparLisp();
     if (!variasColunas && !linha.item->ids.empty() && !linha.item->ids.front().isNull())
         CICad::SetXData(ref, "KVR_ZV_LINK",
                         {{1000, ZVString::DeHandle(linha.item->ids.front().handle())}});

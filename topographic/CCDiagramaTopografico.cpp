@@ -720,18 +720,16 @@ void CCDiagramaTopografico::Insere(const QString& chave, const QString& layer,
     CEItemLista* item = itensPorHandle_.value(chave);
     const auto candidato = candidatos_.find(chave);
     if (!item || candidato == candidatos_.end()) return;
+    // Every attribute takes the item's field of its tag (blank when the item has none).
+    const auto valores = [item](const QString& tag, const QString&) -> std::optional<QString> {
+        const QString* valor = item->campo(tag);
+        return valor ? *valor : QString();
+    };
     const OdDbObjectId ref =
         CICad::InsereBloco(Arquivo(candidato->second), NomeBloco(candidato->second), layer, ponto.x,
-                           ponto.y, 0.0, 0.0);
+                           ponto.y, 0.0, 0.0, valores);
     if (ref.isNull()) return;  // left out; the run goes on
     ++inseridos_;
-    std::unique_ptr<zv::CEListaAtributos> atributos;
-    CICad::GetAtributos(ref, atributos, false, false);
-    for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
-        const zv::CEAtributo& atributo = (*atributos)[i];
-        const QString* valor = item->campo(atributo.GetTag());
-        CICad::SetValorAtributo(atributo.GetId(), valor ? *valor : QString());
-    }
     // The block names its symbol; an accessory's block also its place and catalogue key.
     QString handle = item->valorCampo("HANDLE");
     const int corte = handle.indexOf('_');

@@ -3,6 +3,7 @@
 #include "Attribute.h"
 #include "BlockRecord.h"
 #include "Database.h"
+#include "TagList.h"
 #include "TagValues.h"
 
 #include <cmath>
@@ -20,12 +21,64 @@ void BlockReference::setScale(const Point3& scale) {
     setReal(43, scale.z, "AcDbBlockReference");
 }
 
+namespace {
+
+// What position(), scale(), rotation() and extrusion() answer, found in one walk of the tags
+// by the same rules (outside application groups, before the extended data).
+struct Placing {
+    Point3 position, scale{1, 1, 1}, extrusion{0, 0, 1};
+    double rotation = 0.0;
+};
+
+Placing readPlacing(std::span<const Tag> all) {
+    const std::size_t end = TagList::xdataStart(all);
+    std::size_t at[6] = {0, 0, 0, 0, 0, 0};  // 10, 41, 42, 43, 50, 210; 0 when absent
+    bool inGroup = false;
+    for (std::size_t i = 1; i < end; ++i) {
+        const Tag& tag = all[i];
+        if (TagList::opensGroup(tag)) {
+            inGroup = true;
+        } else if (TagList::closesGroup(tag)) {
+            inGroup = false;
+        } else if (!inGroup) {
+            const int slot = tag.code == 10    ? 0
+                             : tag.code == 41  ? 1
+                             : tag.code == 42  ? 2
+                             : tag.code == 43  ? 3
+                             : tag.code == 50  ? 4
+                             : tag.code == 210 ? 5
+                                               : -1;
+            if (slot >= 0 && at[slot] == 0) at[slot] = i;
+        }
+    }
+    const auto point = [&](std::size_t i, int code, const Point3& fallback) {
+        if (i == 0) return fallback;
+        Point3 p{TagValues::toReal(all[i].value), 0.0, 0.0};
+        std::size_t k = i + 1;
+        if (k < all.size() && all[k].code == code + 10) p.y = TagValues::toReal(all[k++].value);
+        if (k < all.size() && all[k].code == code + 20) p.z = TagValues::toReal(all[k].value);
+        return p;
+    };
+    const auto real = [&](std::size_t i, double fallback) {
+        return i == 0 ? fallback : TagValues::toReal(all[i].value, fallback);
+    };
+    Placing placing;
+    placing.position = point(at[0], 10, Point3{});
+    placing.scale = {real(at[1], 1.0), real(at[2], 1.0), real(at[3], 1.0)};
+    placing.rotation = real(at[4], 0.0);
+    placing.extrusion = point(at[5], 210, Point3{0, 0, 1});
+    return placing;
+}
+
+}  // namespace
+
 Transform BlockReference::transform() const {
     const BlockRecord* block = definition();
     const Point3 base = block ? block->basePoint() : Point3{};
-    const Point3 s = scale();
-    return Transform::fromOcs(extrusion()) * Transform::translation(position()) *
-           Transform::rotationZ(rotation() * std::numbers::pi / 180.0) *
+    const Placing p = readPlacing(tags());
+    const Point3& s = p.scale;
+    return Transform::fromOcs(p.extrusion) * Transform::translation(p.position) *
+           Transform::rotationZ(p.rotation * std::numbers::pi / 180.0) *
            Transform::scaling(s.x, s.y, s.z) * Transform::translation(base * -1.0);
 }
 
@@ -60,17 +113,12 @@ Attribute* BlockReference::addAttributeFromDefinition(const Attribute& definitio
 }
 
 std::vector<Attribute*> BlockReference::addAttributesFromDefinitions(
-    std::span<const Attribute* const> definitions) {
-    std::vector<Attribute*> made;
-    if (definitions.empty()) return made;
-    made.reserve(definitions.size());
-    const Transform placement = transform();
-    const double heightScale = std::abs(scale().y);
-    const double degrees = rotation();
-    for (const Attribute* definition : definitions)
-        made.push_back(database().addAttributeFromDefinition(*this, *definition, placement,
-                                                             heightScale, degrees));
-    return made;
+    std::span<const Attribute* const> definitions,
+    std::span<const std::optional<std::string_view>> values) {
+    if (definitions.empty()) return {};
+    const Placing p = readPlacing(tags());
+    return database().addAttributesFromDefinitions(*this, definitions, values, transform(),
+                                                   std::abs(p.scale.y), p.rotation);
 }
 
 }  // namespace zvdb

@@ -2,7 +2,9 @@
 // An INSERT: a reference to a block definition, with its attributes.
 #include "Entity.h"
 
+#include <optional>
 #include <span>
+#include <string_view>
 
 namespace zvdb {
 
@@ -35,8 +37,11 @@ public:
     // reference's transform, with the definition's default value.
     Attribute* addAttributeFromDefinition(const Attribute& definition);
     // The same for several definitions at once (the placement is worked out once), in order.
+    // `values`, when not empty, holds for each definition the text value to give instead of
+    // its default (none: the default).
     std::vector<Attribute*> addAttributesFromDefinitions(
-        std::span<const Attribute* const> definitions);
+        std::span<const Attribute* const> definitions,
+        std::span<const std::optional<std::string_view>> values = {});
 };
 
 }  // namespace zvdb

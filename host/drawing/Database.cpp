@@ -1,6 +1,7 @@
 #include "Database.h"
 
 #include "Attribute.h"
+#include "AttributeLayout.h"
 #include "BlockRecord.h"
 #include "BlockReference.h"
 #include "Dictionary.h"
@@ -66,6 +67,7 @@ void Database::swapContents(Database& other) {
     sectionOrder_.swap(other.sectionOrder_);
     warnings_.swap(other.warnings_);
     std::swap(namedObjects_, other.namedObjects_);
+    layouts_.swap(other.layouts_);
     for (const auto& object : storage_)
         object->database_ = this;
     for (const auto& object : other.storage_)
@@ -337,6 +339,19 @@ std::vector<DbObject*> Database::objects() const {
 // Entities ---------------------------------------------------------------------------------
 
 namespace {
+// A handle as tag text, without a string in between.
+std::string_view handleText(StringArena& arena, std::uint64_t handle) {
+    char buffer[16];
+    std::size_t at = sizeof buffer;
+    do {
+        buffer[--at] = "0123456789ABCDEF"[handle & 15];
+        handle >>= 4;
+    } while (handle != 0);
+    return arena.store({buffer + at, sizeof buffer - at});
+}
+}  // namespace
+
+namespace {
 // Room for the few tags (rotation, colour, linetype, alignment point) that callers set right
 // after making an entity, so that setting them does not double the entity's tag storage.
 constexpr std::size_t kSettersSlack = 4;
@@ -403,61 +418,53 @@ std::string_view Database::storeShared(std::string_view text) {
     return slot;
 }
 
-Attribute* Database::addAttributeFromDefinition(BlockReference& reference,
-                                                const Attribute& definition,
-                                                const Transform& placement, double heightScale,
-                                                double rotation) {
-    // The tags come out as making a bare attribute and setting its properties one by one
-    // would leave them, without the searches and copies of each step.
-    const bool sameDrawing = &definition.database() == this;
-    const auto keep = [&](std::string_view value) { return sameDrawing ? value : store(value); };
-    const auto real = [&](double value) { return storeShared(TagValues::fromReal(value)); };
-    std::vector<Tag>& all = scratch_;
-    all.clear();
-    const std::uint64_t handle = allocateHandle();
-    all.push_back(Tag{0, "ATTRIB"});
-    all.push_back(Tag{5, store(TagValues::fromHandle(handle))});
-    all.push_back(Tag{330, store(TagValues::fromHandle(reference.handle()))});
-    all.push_back(Tag{100, "AcDbEntity"});
-    if (reference.inPaperSpace()) all.push_back(Tag{67, "1"});
-    const std::string_view layer = definition.layer();
-    all.push_back(Tag{8, layer.empty() ? std::string_view("0") : keep(layer)});
-    all.push_back(Tag{100, "AcDbText"});
-    const auto source = definition.tags();
-    const std::size_t end = definition.xdataStart();
-    bool started = false;
-    for (std::size_t i = 1; i < end; ++i) {
-        const Tag& tag = source[i];
-        const bool textMarker = tag.code == 100 && tag.value == "AcDbText";
-        started = started || textMarker;
-        if (!started || textMarker || tag.code == 3) continue;  // the prompt stays behind
-        if (tag.code == 100 && tag.value == "AcDbAttributeDefinition")
-            all.push_back(Tag{100, "AcDbAttribute"});
-        else
-            all.push_back(Tag{tag.code, keep(tag.value)});
-    }
-    const auto setPoint = [&](int code, const Point3& p) {
-        const std::string_view values[3] = {real(p.x), real(p.y), real(p.z)};
-        TagList::setPoint(all, code, values, "AcDbText");
-    };
-    setPoint(10, placement.apply(definition.position()));
-    if (definition.has(11)) setPoint(11, placement.apply(definition.point(11)));
-    TagList::setValue(all, 40, real(definition.height() * heightScale), "AcDbText");
-    const double ownRotation = definition.rotation();
-    if (rotation != 0.0 || ownRotation != 0.0)
-        TagList::setValue(all, 50, real(ownRotation + rotation), "AcDbText");
-    TagList::setValue(all, 62, storeShared(TagValues::fromInteger(definition.color())),
-                      "AcDbEntity");
-    if (definition.has(6)) TagList::setValue(all, 6, keep(definition.linetype()), "AcDbEntity");
+AttributeLayouts& Database::attributeLayouts() {
+    if (!layouts_) layouts_ = std::make_unique<AttributeLayouts>();
+    return *layouts_;
+}
 
-    // The tags go to the arena at their exact size: an attribute's later changes are mostly
-    // new values, made in place; one that gains a tag takes a list of its own then.
-    auto* attribute =
-        static_cast<Attribute*>(adopt(std::make_unique<Attribute>(*this, arena_.storeTags(all))));
-    reference.addSubEntity(attribute);
-    if (reference.integer(66) != 1) reference.setInteger(66, 1, "AcDbBlockReference");
-    ensureSeqend(reference);
-    return attribute;
+std::vector<Attribute*> Database::addAttributesFromDefinitions(
+    BlockReference& reference, std::span<const Attribute* const> definitions,
+    std::span<const std::optional<std::string_view>> values, const Transform& placement,
+    double heightScale, double rotation) {
+    std::vector<Attribute*> made;
+    if (definitions.empty()) return made;
+    made.reserve(definitions.size());
+    AttributeLayout::Placement where{placement, heightScale,
+                                     rotation,  reference.inPaperSpace(),
+                                     {},        handleText(arena_, reference.handle())};
+    AttributeLayouts& layouts = attributeLayouts();
+    for (std::size_t i = 0; i < definitions.size(); ++i) {
+        AttributeLayout& layout = layouts.layout(*this, *definitions[i]);
+        const std::uint64_t handle = allocateHandle();
+        where.handle = handleText(arena_, handle);
+        const std::optional<std::string_view> value =
+            i < values.size() ? values[i] : std::optional<std::string_view>();
+        const bool valuePlaced = layout.compose(*this, scratch_, where, value);
+        // The tags go to the arena at their exact size: an attribute's later changes are
+        // mostly new values, made in place; one that gains a tag takes a list of its own then.
+        auto* attribute = static_cast<Attribute*>(adopt(std::make_unique<Attribute>(
+            *this, arena_.storeTags(scratch_), handle, reference.handle())));
+        reference.addSubEntity(attribute);
+        if (i == 0) {
+            if (reference.integer(66) != 1) reference.setInteger(66, 1, "AcDbBlockReference");
+            if (!reference.seqend()) {
+                // As ensureSeqend makes it, from values the drawing holds already.
+                const std::uint64_t seqend = allocateHandle();
+                const std::string_view layer = reference.layer();
+                Tag tags[6] = {Tag{0, "SEQEND"}, Tag{5, handleText(arena_, seqend)},
+                               Tag{330, where.owner}, Tag{100, "AcDbEntity"}};
+                std::size_t count = 4;
+                if (where.paperSpace) tags[count++] = Tag{67, "1"};
+                tags[count++] = Tag{8, layer.empty() ? std::string_view("0") : layer};
+                reference.setSeqend(static_cast<Entity*>(adopt(std::make_unique<Entity>(
+                    *this, arena_.storeTags({tags, count}), seqend, reference.handle()))));
+            }
+        }
+        if (!valuePlaced) attribute->setTextValue(*value);
+        made.push_back(attribute);
+    }
+    return made;
 }
 
 Entity* Database::addVertex(Polyline& polyline, const Point3& p) {

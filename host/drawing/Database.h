@@ -14,6 +14,7 @@
 
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <span>
 #include <string>
 #include <string_view>
@@ -23,6 +24,7 @@
 namespace zvdb {
 
 class Attribute;
+class AttributeLayouts;
 class BlockRecord;
 class BlockReference;
 class DbObject;
@@ -120,12 +122,17 @@ public:
     // `stored`: the body's values are already held by this database (they are not copied).
     Attribute* addAttribute(BlockReference& reference, const std::vector<Tag>& body,
                             std::string_view layer, bool stored = false);
-    // A new attribute of `reference` made from a block's definition: its properties, placed
-    // by `placement` (the reference's transform), its height scaled by `heightScale` and
-    // `rotation` degrees added to its own. Its tags are made whole before it is adopted.
-    Attribute* addAttributeFromDefinition(BlockReference& reference, const Attribute& definition,
-                                          const Transform& placement, double heightScale,
-                                          double rotation);
+    // New attributes of `reference` made from definitions of its block, in order: their
+    // properties, placed by `placement` (the reference's transform), their heights scaled by
+    // `heightScale` and `rotation` degrees added to their own. `values`, when not empty,
+    // holds for each definition the text value to give instead of its default. Their tags
+    // are made whole before they are adopted.
+    std::vector<Attribute*> addAttributesFromDefinitions(
+        BlockReference& reference, std::span<const Attribute* const> definitions,
+        std::span<const std::optional<std::string_view>> values, const Transform& placement,
+        double heightScale, double rotation);
+    // What the definitions of this drawing's blocks give their attributes, worked out once.
+    AttributeLayouts& attributeLayouts();
     Entity* addVertex(Polyline& polyline, const Point3& p);
     StringArena& arena() { return arena_; }
     std::string_view store(std::string_view text) { return arena_.store(text); }
@@ -180,6 +187,7 @@ private:
     std::vector<std::string_view> shared_;
     // Room where new objects' tags are put together before they get their own.
     std::vector<Tag> scratch_;
+    std::unique_ptr<AttributeLayouts> layouts_;
     std::uint64_t changes_ = 0;
     std::uint64_t contentId_ = 0;
 };

@@ -16,6 +16,14 @@ DbObject::DbObject(Database& database, std::span<const Tag> tags)
     cacheIdentity();
 }
 
+DbObject::DbObject(Database& database, std::span<const Tag> tags, std::uint64_t handle,
+                   std::uint64_t owner)
+    : database_(&database),
+      fileTags_(tags.data()),
+      fileCount_(static_cast<std::uint32_t>(tags.size())),
+      handle_(handle),
+      owner_(owner) {}
+
 DbObject::~DbObject() = default;
 
 std::span<const Tag> DbObject::tags() const {

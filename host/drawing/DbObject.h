@@ -21,6 +21,9 @@ class Dictionary;
 class DbObject {
 public:
     DbObject(Database& database, std::span<const Tag> tags);
+    // For tags just made, whose handle and owner are known (they must be what the tags say).
+    DbObject(Database& database, std::span<const Tag> tags, std::uint64_t handle,
+             std::uint64_t owner);
     virtual ~DbObject();
     DbObject(const DbObject&) = delete;
     DbObject& operator=(const DbObject&) = delete;

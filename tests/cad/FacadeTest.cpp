@@ -176,6 +176,57 @@ TEST_F(FacadeFixture, InsertingMakesAttributesAndKeepsSinglePrecision) {
     EXPECT_FALSE(db().block("FALTA"));
 }
 
+// Values told at insertion: each attribute is made with its value, as inserting and then
+// setting the values would leave it; none keeps the default.
+TEST_F(FacadeFixture, InsertingWithValuesMakesEachAttributeWithItsValue) {
+    const QString caminho =
+        arquivoBloco("LINHA", {"VARIAVEL_1", "FUNCAO_1", "VARIAVEL_2"}, [](zvdb::Database& bloco) {
+            for (zvdb::Attribute* def : bloco.modelSpace()->attributeDefinitions())
+                def->setTextValue(" campo " + std::string(def->tag()));
+        });
+    QStringList perguntas;
+    const CEValoresAtributos valores = [&](const QString& tag,
+                                           const QString& padrao) -> std::optional<QString> {
+        perguntas << tag + "|" + padrao;
+        if (tag.startsWith("FUNCAO")) return std::nullopt;
+        return "<" + padrao + ">";
+    };
+    const OdDbObjectId dados =
+        CICad::InsereBloco(caminho, "LINHA", "0", 10.5, -3.25, 0, 0.5, valores);
+    const OdDbObjectId depois = CICad::InsereBloco(caminho, "LINHA", "0", 10.5, -3.25, 0, 0.5);
+    ASSERT_FALSE(dados.isNull());
+    ASSERT_FALSE(depois.isNull());
+    EXPECT_EQ(perguntas, QStringList({"VARIAVEL_1|campo VARIAVEL_1", "FUNCAO_1|campo FUNCAO_1",
+                                      "VARIAVEL_2|campo VARIAVEL_2"}));
+    CICad::SetAtributo(depois, "VARIAVEL_1", "<campo VARIAVEL_1>");
+    CICad::SetAtributo(depois, "variavel_2", "<campo VARIAVEL_2>");
+    auto* a = dynamic_cast<zvdb::BlockReference*>(db().objectByHandle(dados.handle()));
+    auto* b = dynamic_cast<zvdb::BlockReference*>(db().objectByHandle(depois.handle()));
+    ASSERT_TRUE(a && b);
+    const auto atributosA = a->attributes();
+    const auto atributosB = b->attributes();
+    ASSERT_EQ(atributosA.size(), 3u);
+    ASSERT_EQ(atributosB.size(), 3u);
+    for (size_t i = 0; i < 3; ++i) {
+        std::vector<std::string> ta, tb;
+        for (const zvdb::Tag& t : atributosA[i]->tags())
+            if (t.code != 5 && t.code != 330)
+                ta.push_back(std::to_string(t.code) + " " + std::string(t.value));
+        for (const zvdb::Tag& t : atributosB[i]->tags())
+            if (t.code != 5 && t.code != 330)
+                tb.push_back(std::to_string(t.code) + " " + std::string(t.value));
+        EXPECT_EQ(ta, tb) << i;
+    }
+    EXPECT_EQ(atributosA[0]->textValue(), "<campo VARIAVEL_1>");
+    EXPECT_EQ(atributosA[1]->textValue(), " campo FUNCAO_1") << "none keeps the default";
+    // Edited afterwards like any other attribute.
+    std::unique_ptr<zv::CEListaAtributos> lista;
+    CICad::GetAtributos(dados, lista, false, false);
+    ASSERT_TRUE(lista);
+    (*lista)[1].SetValor("feito");
+    EXPECT_EQ(atributosA[1]->textValue(), "feito");
+}
+
 TEST_F(FacadeFixture, RedefiningABlockKeepsValuesAndDropsRemovedTags) {
     const QString v1 = arquivoBloco("REGUA_V1", {"REGUA", "NUMERO", "VELHO"});
     const OdDbObjectId ref = CICad::InsereBloco(v1, "BORNE_C", "0", 0, 0, 0, 0);

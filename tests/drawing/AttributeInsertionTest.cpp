@@ -11,12 +11,16 @@
 #include "drawing/StringArena.h"
 #include "drawing/TagList.h"
 #include "drawing/TagValues.h"
+#include "drawing/UndoJournal.h"
 
 #include <gtest/gtest.h>
 
 #include <algorithm>
 #include <cmath>
+#include <functional>
 #include <memory>
+#include <numbers>
+#include <optional>
 #include <set>
 #include <string>
 #include <vector>
@@ -105,9 +109,12 @@ struct Placement {
     Point3 extrusion{0, 0, 1};
 };
 
-// Two references placed alike, one given its attributes step by step and one in one pass;
-// every attribute of the two must match.
-void expectSameAttributes(Database& target, const BlockRecord& block, const Placement& p) {
+using Values = std::vector<std::optional<std::string_view>>;
+
+// Two references placed alike, one given its attributes step by step (and then the values,
+// set one by one) and one in one pass with the values; every attribute of the two must match.
+void expectSameAttributes(Database& target, const BlockRecord& block, const Placement& p,
+                          const Values& values = {}) {
     BlockRecord* owner = p.paper ? target.paperSpace() : target.modelSpace();
     ASSERT_NE(owner, nullptr);
     BlockRecord* local = target.block(block.name());
@@ -121,23 +128,37 @@ void expectSameAttributes(Database& target, const BlockRecord& block, const Plac
     std::vector<const Attribute*> definitions;
     for (Attribute* definition : block.attributeDefinitions())
         if (!definition->isConstant()) definitions.push_back(definition);
-    for (const Attribute* definition : definitions)
-        madeStepByStep(*slow, *definition);
-    const std::vector<Attribute*> made = fast->addAttributesFromDefinitions(definitions);
+    for (std::size_t i = 0; i < definitions.size(); ++i) {
+        Attribute* made = madeStepByStep(*slow, *definitions[i]);
+        if (i < values.size() && values[i]) made->setTextValue(*values[i]);
+    }
+    const std::vector<Attribute*> made = fast->addAttributesFromDefinitions(definitions, values);
     ASSERT_EQ(made.size(), definitions.size());
     ASSERT_EQ(slow->attributes().size(), made.size());
     for (std::size_t i = 0; i < made.size(); ++i) {
         EXPECT_EQ(withoutIdentity(*made[i]), withoutIdentity(*slow->attributes()[i]))
             << "attribute " << made[i]->tag();
         EXPECT_EQ(made[i]->ownerHandle(), fast->handle());
+        EXPECT_EQ(made[i]->text(330), TagValues::fromHandle(fast->handle()));
+        EXPECT_EQ(made[i]->text(5), TagValues::fromHandle(made[i]->handle()));
         EXPECT_EQ(made[i]->parent(), fast);
         EXPECT_EQ(target.objectByHandle(made[i]->handle()), made[i]);
+        if (i < values.size() && values[i]) {
+            EXPECT_EQ(made[i]->textValue(), *values[i]);
+        }
     }
     EXPECT_EQ(withoutIdentity(*fast), withoutIdentity(*slow)) << "the reference gains 66 alike";
     ASSERT_NE(fast->seqend(), nullptr);
     EXPECT_EQ(withoutIdentity(*fast->seqend()), withoutIdentity(*slow->seqend()));
     EXPECT_EQ(fast->seqend()->handle(), made.front()->handle() + 1)
         << "the SEQEND's handle follows its first attribute's, then come the others'";
+}
+
+std::vector<const Attribute*> variableDefinitions(const BlockRecord& block) {
+    std::vector<const Attribute*> definitions;
+    for (Attribute* definition : block.attributeDefinitions())
+        if (!definition->isConstant()) definitions.push_back(definition);
+    return definitions;
 }
 
 TEST(AttributeFromDefinition, MatchesTheStepByStepAttributeForEveryPlacement) {
@@ -152,9 +173,12 @@ TEST(AttributeFromDefinition, MatchesTheStepByStepAttributeForEveryPlacement) {
         {{5, 5, 0}, {1, -2, 1}, 270},                   // mirrored in y and rotated
         {{1, 2, 0}, {1, 1, 1}, 45, true},               // in paper space (67)
         {{1, 2, 0}, {1, 1, 1}, 0, false, {0, 0, -1}}};  // a flipped extrusion
+    // Values for some attributes (an empty one too), the others keeping their defaults.
+    const Values values = {"-X1", std::nullopt, "", "a value longer than the default one"};
     for (const Placement& p : placements) {
         SCOPED_TRACE(p.degrees);
         expectSameAttributes(db, *block, p);
+        expectSameAttributes(db, *block, p, values);
     }
     // Fast and slow written out: the same text apart from handles.
     EXPECT_NO_THROW(DxfLoader::load(DxfWriter::toText(db)));
@@ -256,6 +280,164 @@ TEST(AttributeFromDefinition, NoDefinitionsMakeNothingAndOneMatchesTheBatch) {
     EXPECT_EQ(one->tag(), "ALIGNED");
     EXPECT_EQ(reference->integer(66), 1);
     EXPECT_EQ(one->point(11), (Point3{4, 3, 0})) << "moved by the base point";
+}
+
+TEST(AttributeFromDefinition, AValueGoesWhereSettingItLaterWouldEvenWithoutAValueTag) {
+    Database db;
+    db.createLayer("PAGE");
+    BlockRecord* block = richBlock(db);
+    // A definition without a value of its own: the value given is added as setting it would.
+    Attribute* bare = block->addAttributeDefinition("BARE", "", "x", {1, 1, 0}, 1.0);
+    std::erase_if(bare->editTags(), [](const Tag& t) { return t.code == 1; });
+    ASSERT_FALSE(bare->has(1));
+    std::string passing = "given";
+    const Values values = {std::nullopt, std::nullopt, std::nullopt, std::nullopt, passing};
+    expectSameAttributes(db, *block, {{2, 3, 0}, {1, 1, 1}, 0}, values);
+    expectSameAttributes(db, *block, {{2, 3, 0}, {1, 1, 1}, 90, true}, values);
+    // The values are the drawing's own copies: the caller's text may go.
+    auto* reference = static_cast<BlockReference*>(db.modelSpace()->entities().back());
+    passing.assign("changed");
+    EXPECT_EQ(reference->attribute("BARE")->textValue(), "given");
+    // Fewer values than definitions: the rest keep their defaults.
+    BlockReference* few = db.modelSpace()->addBlockReference(*block, {0, 0, 0});
+    const Values one = {"only"};
+    const auto made = few->addAttributesFromDefinitions(variableDefinitions(*block), one);
+    ASSERT_EQ(made.size(), 5u);
+    EXPECT_EQ(made[0]->textValue(), "only");
+    EXPECT_EQ(made[1]->textValue(), "");
+    EXPECT_EQ(made[2]->textValue(), "s");
+    EXPECT_FALSE(made[4]->has(1));
+}
+
+TEST(AttributeFromDefinition, ADefinitionChangedBetweenReferencesIsReadAgain) {
+    Database db;
+    db.createLayer("PAGE");
+    db.createLayer("OUTRA");
+    BlockRecord* block = richBlock(db);
+    const Placement plain{{10, 20, 0}, {1, 1, 1}, 0};
+    const Placement turned{{10, 20, 0}, {1, 1, 1}, 30};
+    expectSameAttributes(db, *block, plain);
+    expectSameAttributes(db, *block, turned);
+    Attribute* first = block->attributeDefinitions()[0];
+    Attribute* styled = block->attributeDefinitions()[2];
+    // Each change below alters what the next references' attributes must carry.
+    const std::vector<std::function<void()>> changes = {
+        [&] {
+            first->setPosition({-5, 6.25, 1});
+        },
+        [&] { first->setReal(40, 7.5, "AcDbText"); },
+        [&] { first->setColor(5); },
+        [&] { first->setLinetype("HIDDEN"); },
+        [&] { first->setReal(50, 45.0, "AcDbText"); },
+        [&] { first->setTextValue("new default"); },
+        [&] { first->setLayer("OUTRA"); },
+        [&] {
+            first->setPoint(11, {1, 1, 0}, "AcDbText");
+        },
+        [&] { styled->setReal(50, 0.0, "AcDbText"); },
+        [&] { styled->removeAll(6); },
+        [&] { styled->setTag("RENAMED"); },
+        [&] { first->setInteger(70, 2, "AcDbAttributeDefinition"); },  // now constant
+    };
+    for (std::size_t i = 0; i < changes.size(); ++i) {
+        SCOPED_TRACE(i);
+        changes[i]();
+        expectSameAttributes(db, *block, plain);
+        expectSameAttributes(db, *block, turned, {"v"});
+    }
+    EXPECT_EQ(variableDefinitions(*block).front()->tag(), "ALIGNED");
+}
+
+TEST(AttributeFromDefinition, EveryPlaceGetsTheTextOfItsOwnCoordinates) {
+    // Many places, some repeated and some close together, so that texts of reals given
+    // lately are answered again and others take their place.
+    Database db;
+    db.createLayer("PAGE");
+    const BlockRecord* block = richBlock(db);
+    std::uint64_t state = 12345;
+    const auto next = [&] {
+        state = state * 6364136223846793005ull + 1442695040888963407ull;
+        return static_cast<double>(state >> 40) / 1024.0 - 8000.0;
+    };
+    for (int i = 0; i < 300; ++i) {
+        const double x = i % 3 == 0 ? 15.0 : next();
+        const double y = i % 5 == 0 ? 262.0 - 3.5 * (i % 7) : next() * 1e-7;
+        const double degrees = i % 4 == 0 ? next() : 0.0;
+        expectSameAttributes(db, *block, {{x, y, 0}, {1, 1, 1}, degrees});
+    }
+    // Zero and negative zero are told apart as their texts are.
+    expectSameAttributes(db, *block, {{0, -0.0, 0}, {-1, 1, 1}, 0});
+    expectSameAttributes(db, *block, {{-0.0, 0, 0}, {1, 1, 1}, 0});
+}
+
+TEST(AttributeFromDefinition, UndoTakesInsertionBackAndLaterReferencesStillMatch) {
+    Database db;
+    db.createLayer("PAGE");
+    richBlock(db);
+    const BlockRecord* block = db.block("RICO");
+    UndoJournal journal;
+    journal.beginGroup(db);
+    BlockReference* reference = db.modelSpace()->addBlockReference(*block, {1, 1, 0});
+    const Values values = {"-K7"};
+    reference->addAttributesFromDefinitions(variableDefinitions(*block), values);
+    const std::uint64_t handle = reference->handle();
+    journal.endGroup(db);
+    ASSERT_TRUE(journal.undo(db));
+    EXPECT_EQ(db.entityByHandle(handle), nullptr);
+    // The drawing now holds other objects: its definitions are read anew.
+    expectSameAttributes(db, *db.block("RICO"), {{4, 4, 0}, {1, 1, 1}, 15}, values);
+    ASSERT_TRUE(journal.redo(db));
+    auto* again = dynamic_cast<BlockReference*>(db.entityByHandle(handle));
+    ASSERT_NE(again, nullptr);
+    ASSERT_EQ(again->attributes().size(), 4u);
+    EXPECT_EQ(again->attribute("PLAIN")->textValue(), "-K7");
+    expectSameAttributes(db, *db.block("RICO"), {{5, 5, 0}, {1, 1, 1}, 0}, values);
+}
+
+TEST(AttributeFromDefinition, APlacementIsReadAsTheReferencesAccessorsReadIt) {
+    Database db;
+    const BlockRecord* block = richBlock(db);
+    // Scales and points inside an application group and in the extended data are not the
+    // reference's; a point without z, a scale that does not read, a flipped extrusion are.
+    const auto expected = [&](const BlockReference& r) {
+        const Point3 s = r.scale();
+        return Transform::fromOcs(r.extrusion()) * Transform::translation(r.position()) *
+               Transform::rotationZ(r.rotation() * std::numbers::pi / 180.0) *
+               Transform::scaling(s.x, s.y, s.z) *
+               Transform::translation(block->basePoint() * -1.0);
+    };
+    const auto same = [](const Transform& a, const Transform& b) {
+        return a.linear == b.linear && a.move == b.move;
+    };
+    BlockReference* plain = db.modelSpace()->addBlockReference(*block, {3, 4, 5}, {2, 3, 4}, 33);
+    EXPECT_TRUE(same(plain->transform(), expected(*plain)));
+    BlockReference* odd = db.modelSpace()->addBlockReference(*block, {3, 4, 5}, {1, 1, 1}, 0);
+    auto& tags = odd->editTags();
+    const auto at = std::find(tags.begin(), tags.end(), tag(100, "AcDbBlockReference"));
+    const Tag group[] = {tag(102, "{ZV_TEST"), tag(41, "9.0"), tag(10, "99.0"), tag(102, "}")};
+    tags.insert(at + 1, group, group + 4);
+    std::erase_if(tags, [](const Tag& t) { return t.code == 30 || t.code == 42; });
+    tags.push_back(tag(42, "not a number"));
+    tags.push_back(tag(50, "12.5"));
+    tags.push_back(tag(210, "0.0"));
+    tags.push_back(tag(220, "0.0"));
+    tags.push_back(tag(230, "-1.0"));
+    tags.push_back(tag(1001, "KVR_ZV"));
+    tags.push_back(tag(1041, "7.0"));
+    tags.push_back(tag(1010, "50.0"));
+    EXPECT_EQ(odd->position(), (Point3{3, 4, 0}));
+    EXPECT_EQ(odd->scale().y, 1.0);
+    EXPECT_EQ(odd->rotation(), 12.5);
+    EXPECT_TRUE(same(odd->transform(), expected(*odd)));
+    // Its attributes take the same height scale and rotation as one by one.
+    const auto definitions = variableDefinitions(*block);
+    std::vector<std::vector<std::string>> oneByOne;
+    for (const Attribute* definition : definitions)
+        oneByOne.push_back(withoutIdentity(*madeStepByStep(*odd, *definition)));
+    const auto made = odd->addAttributesFromDefinitions(definitions);
+    ASSERT_EQ(made.size(), oneByOne.size());
+    for (std::size_t i = 0; i < made.size(); ++i)
+        EXPECT_EQ(withoutIdentity(*made[i]), oneByOne[i]);
 }
 
 // Values changed where a file's tags are -------------------------------------------------
