@@ -735,16 +735,25 @@ void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const
         achado = entidadesLidas_.emplace(id, std::move(lida)).first;
     }
     const EntidadeLida& lida = achado->second;
-    const bool qtdPadrao = lida.qtdPadrao, rotas = lida.rotas;
-    if (sufixo.isEmpty()) {
+    const bool rotas = lida.rotas;
+    // Without a QTD of the entity's own the batch holds none, so the item's QTD under the
+    // suffix is the one it has now: the "1" joins the batch instead of being put in after.
+    const std::uint32_t qtd = NumeroCampo<"QTD">(sufixo);
+    const QString* qtdAtual = item.campos.procura(qtd);
+    const bool poeQtd = lida.qtdPadrao && (!qtdAtual || qtdAtual->isEmpty());
+    if (sufixo.isEmpty() && !poeQtd) {
         item.campos.juntarOrdenados(lida.campos);
     } else {
         std::vector<CamposItem::Campo> lote = lida.campos;
         CamposItem::renomearComSufixo(lote, sufixo);
+        if (poeQtd) {
+            const auto lugar = std::lower_bound(
+                lote.begin(), lote.end(), qtd,
+                [](const CamposItem::Campo& c, std::uint32_t n) { return c.nome < n; });
+            lote.insert(lugar, CamposItem::Campo{qtd, QStringLiteral("1")});
+        }
         item.campos.juntarOrdenados(lote);
     }
-    if (qtdPadrao && item.valorCampo("QTD" + sufixo).isEmpty())
-        item.definirCampo(NumeroCampo<"QTD">(sufixo), "1");
     if (rotas) LeRotasDoItem(item, modelo);
 }
 
