@@ -38,16 +38,22 @@ QByteArray Digest(const QString& arquivo) {
     return QCryptographicHash::hash(linhas.join('\n'), QCryptographicHash::Sha256).toHex();
 }
 
+// Generates the project in the folder; the failure, or an empty text.
+QString Prepara(zvtest::ProductFolder& pasta, const char* seed, const char* terminais,
+                bool numerosNoProjeto) {
+    QStringList gerar{"--seed", seed, "--terminals", terminais};
+    if (numerosNoProjeto)
+        gerar << "--numbers"
+              << "project";
+    return pasta.prepare(gerar);
+}
+
 class ListOutputGoldenTest : public ::testing::TestWithParam<Caso> {};
 
 TEST_P(ListOutputGoldenTest, TheTerminalListPrintsTheSameBytesAsBefore) {
     const Caso& caso = GetParam();
     zvtest::ProductFolder pasta;
-    QStringList gerar{"--seed", caso.seed, "--terminals", caso.terminais};
-    if (caso.numerosNoProjeto)
-        gerar << "--numbers"
-              << "project";
-    const QString falha = pasta.prepare(gerar);
+    const QString falha = Prepara(pasta, caso.seed, caso.terminais, caso.numerosNoProjeto);
     ASSERT_TRUE(falha.isEmpty()) << falha.toStdString();
     const zvtest::HostRun r =
         pasta.zvhost(pasta.terminalList(pasta.project(), pasta.path("l.dxf")));
@@ -91,11 +97,7 @@ class CommandOutputGoldenTest : public ::testing::TestWithParam<CasoComando> {};
 TEST_P(CommandOutputGoldenTest, TheListPrintsTheSameBytesAsBefore) {
     const CasoComando& caso = GetParam();
     zvtest::ProductFolder pasta;
-    QStringList gerar{"--seed", caso.seed, "--terminals", caso.terminais};
-    if (caso.numerosNoProjeto)
-        gerar << "--numbers"
-              << "project";
-    const QString falha = pasta.prepare(gerar);
+    const QString falha = Prepara(pasta, caso.seed, caso.terminais, caso.numerosNoProjeto);
     ASSERT_TRUE(falha.isEmpty()) << falha.toStdString();
     QStringList args = pasta.terminalList(pasta.project(), pasta.path("l.dxf"));
     args.last() = caso.comando;
