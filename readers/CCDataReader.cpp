@@ -74,8 +74,14 @@ void CCDataReader::LiberaLeituras() {
     Esvazia(caminhos_);
     Esvazia(entidadesLidas_);
     Esvazia(numerosFios_);
+    Esvazia(numerosCabos_);
     Esvazia(ligacoesPorElemento_);
+    corteDe_ = OdDbObjectId();
     versaoLidas_ = 0;
+    // Items share these texts; they keep theirs.
+    Esvazia(layers_);
+    Esvazia(gruposPaginas_);
+    Esvazia(textosTipo_);
     Esvazia(colunasDivididas_);
     Esvazia(basesAcessorio_);
     Esvazia(basesColunas_);
