@@ -8,6 +8,7 @@
 #include "drawing/BlockRecord.h"
 #include "drawing/BlockReference.h"
 #include "drawing/Database.h"
+#include "tests/drawing/StepByStepAttribute.h"
 
 #include <sys/resource.h>
 #include <sys/wait.h>
@@ -40,32 +41,6 @@ long peakKb() {
     return use.ru_maxrss;
 }
 
-// The way attributes were made before the one-pass builder, through the public setters.
-void stepByStep(BlockReference& reference, const Attribute& definition) {
-    const Transform t = reference.transform();
-    std::vector<Tag> body;
-    const auto all = definition.tags();
-    bool started = false;
-    for (std::size_t i = 1; i < definition.xdataStart(); ++i) {
-        const bool marker = all[i].code == 100 && all[i].value == "AcDbText";
-        started = started || marker;
-        if (!started || marker || all[i].code == 3) continue;
-        if (all[i].code == 100 && all[i].value == "AcDbAttributeDefinition")
-            body.push_back(Tag{100, "AcDbAttribute"});
-        else
-            body.push_back(all[i]);
-    }
-    Attribute* attribute =
-        reference.database().addAttribute(reference, body, definition.layer(), true);
-    attribute->setPosition(t.apply(definition.position()));
-    if (definition.has(11)) attribute->setPoint(11, t.apply(definition.point(11)), "AcDbText");
-    attribute->setReal(40, definition.height() * std::abs(reference.scale().y), "AcDbText");
-    if (reference.rotation() != 0.0 || definition.rotation() != 0.0)
-        attribute->setReal(50, definition.rotation() + reference.rotation(), "AcDbText");
-    attribute->setColor(definition.color());
-    if (definition.has(6)) attribute->setLinetype(definition.linetype());
-}
-
 enum class Way { StepByStep, OnePass, WithValues };
 
 void run(Way way, int references) {
@@ -95,7 +70,7 @@ void run(Way way, int references) {
             reference->addAttributesFromDefinitions(definitions);
         } else {
             for (const Attribute* definition : definitions)
-                stepByStep(*reference, *definition);
+                madeStepByStep(*reference, *definition, true);
         }
         for (Attribute* attribute : reference->attributes())
             attribute->setTextValue(value);

@@ -14,8 +14,8 @@
 #include "drawing/LayerRecord.h"
 #include "lisp/Interpreter.h"
 #include "product/ProductLisp.h"
-#include "readers/CCDataReader.h"
 #include "sample/ProjectGenerator.h"
+#include "tests/readers/LeitorBase.h"
 
 #include <QTextStream>
 
@@ -99,17 +99,6 @@ bool wireListCalls(int segments, double segmentsPerTerminal) {
     return later * 5 < first;
 }
 
-// A reader that only loads the connections.
-class ConnectionsOnly : public CCDataReader {
-public:
-    void LerLadoIni(CEItemLista&, const OdDbObjectId&, CETemplate&) override {}
-    void LerLadoFim(CEItemLista&, const OdDbObjectId&, CETemplate&) override {}
-    VetorItens* LerDados(zvdb::Database*, const std::optional<QStringList>&, CETemplate&,
-                         CIProgress&) override {
-        return nullptr;
-    }
-};
-
 double cpuSeconds(std::clock_t start) {
     return double(std::clock() - start) / CLOCKS_PER_SEC;
 }
@@ -139,7 +128,7 @@ void readerStart(int terminals) {
         document->database()->modelSpace()->addPoint({1, 1, 0});
         start = std::clock();
         {
-            ConnectionsOnly only;
+            LeitorBase only;
             only.CarregaConexoesFios();
             only.CarregaConexoesCabos();
         }

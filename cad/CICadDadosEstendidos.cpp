@@ -108,8 +108,7 @@ bool CICad::TemXData(const OdDbObjectId& id, const QString& aplicacao) {
 }
 
 CEListaXData CICad::GetXData(const OdDbObjectId& id, const QString& aplicacao) {
-    zvdb::DbObject* objeto = Objeto(id);
-    return objeto ? ConverteXData(objeto->xdataItems(U8(aplicacao))) : CEListaXData();
+    return GetXData(id, U8(aplicacao).c_str());
 }
 
 CEListaXData CICad::GetXData(const OdDbObjectId& id, const char* aplicacao) {
