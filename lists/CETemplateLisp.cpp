@@ -3,7 +3,11 @@
 #include "cad/CICad.h"
 #include "readers/CEItemLista.h"
 
-#include <QRegularExpression>
+#include <QVarLengthArray>
+
+#include <algorithm>
+#include <charconv>
+#include <limits>
 
 bool CETemplateLisp::Carregar() {
     zvsdk::ResultBuffer* resultado = CICad::zvInvokeLista("ZVCarregaTemplate", {Caminho()});
@@ -60,9 +64,75 @@ bool CETemplateLisp::FiltraItem(const CEItemLista& item) {
 }
 
 double CETemplateLisp::TextoParaReal(const QString& texto) {
+    // The leading number is picked out by hand and read in ASCII: the sums of a list call
+    // this once per field of every item, so it must not cost a pattern match or a new text.
     // Whatever the locale, the decimal mark of a template is the point.
-    static const QRegularExpression numero(
-        QStringLiteral("^[+-]?(\\d+\\.?\\d*|\\.\\d+)([eE][+-]?\\d+)?"));
-    const QRegularExpressionMatch m = numero.match(texto.trimmed());
-    return m.hasMatch() ? m.captured(0).toDouble() : 0.0;
+    const QChar* p = texto.constData();
+    const QChar* const fim = p + texto.size();
+    while (p != fim && p->isSpace())
+        ++p;
+    auto digito = [&](const QChar* c) {
+        return c != fim && c->unicode() >= '0' && c->unicode() <= '9';
+    };
+    const QChar* const inicio = p;
+    bool negativo = false;
+    if (p != fim && (p->unicode() == '+' || p->unicode() == '-')) {
+        negativo = p->unicode() == '-';
+        ++p;
+    }
+    // Where the mantissa's first significant digit stands against the point, to tell a
+    // number too large from one too small when it does not fit a double.
+    long ordem = 0;
+    bool significativo = false;
+    int digitos = 0;
+    for (; digito(p); ++p, ++digitos) {
+        if (p->unicode() != '0') significativo = true;
+        if (significativo) ++ordem;
+    }
+    if (p != fim && p->unicode() == '.') {
+        const QChar* depois = p + 1;
+        int fracao = 0;
+        for (; digito(depois); ++depois, ++fracao) {
+            if (significativo) continue;
+            if (depois->unicode() != '0')
+                significativo = true;
+            else
+                --ordem;
+        }
+        if (digitos + fracao == 0) return 0.0;
+        digitos += fracao;
+        p = depois;
+    }
+    if (digitos == 0) return 0.0;
+    if (p != fim && (p->unicode() == 'e' || p->unicode() == 'E')) {
+        const QChar* e = p + 1;
+        bool expoenteNegativo = false;
+        if (e != fim && (e->unicode() == '+' || e->unicode() == '-')) {
+            expoenteNegativo = e->unicode() == '-';
+            ++e;
+        }
+        if (digito(e)) {
+            long expoente = 0;
+            for (; digito(e); ++e)
+                expoente = std::min(expoente * 10 + (e->unicode() - '0'), 100000000L);
+            ordem += expoenteNegativo ? -expoente : expoente;
+            p = e;
+        }
+    }
+    // The matched text is plain ASCII; from_chars takes no leading '+'.
+    const QChar* numero = inicio;
+    if (numero->unicode() == '+') ++numero;
+    QVarLengthArray<char, 64> ascii(int(p - numero));
+    for (int i = 0; i < ascii.size(); ++i)
+        ascii[i] = char(numero[i].unicode());
+    double valor = 0.0;
+    const auto r = std::from_chars(ascii.data(), ascii.data() + ascii.size(), valor);
+    if (r.ec == std::errc::result_out_of_range) {
+        // Too large is an infinity of the number's sign; too small is zero.
+        if (ordem > 0)
+            return negativo ? -std::numeric_limits<double>::infinity()
+                            : std::numeric_limits<double>::infinity();
+        return 0.0;
+    }
+    return r.ec == std::errc() ? valor : 0.0;
 }
