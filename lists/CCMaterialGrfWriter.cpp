@@ -70,15 +70,21 @@ CCMaterialGrfWriter::itemDet CCMaterialGrfWriter::LeEspecificacao(const QString&
 }
 
 void CCMaterialGrfWriter::SomaGrupos(VetorItens& itens, int digitos) {
+    // By name number: this reads and writes three fields of every member of every group.
+    const std::uint32_t campoQtd = NumeroCampo<"QTD">();
+    const std::uint32_t campoComprimento = NumeroCampo<"COMPRIMENTO">();
+    const std::uint32_t campoLength = NumeroCampo<"LENGTH">();
+    auto real = [](const QString* texto) {
+        return texto ? double(float(CETemplateLisp::TextoParaReal(*texto))) : 0.0;
+    };
     std::unordered_set<const CEItemLista*> feitos;
     for (CEItemLista* item : itens) {
         if (!item || feitos.count(item)) continue;
         double qtd = 0, comprimento = 0;
         for (CEItemLista* m = item; m && !feitos.count(m); m = m->ligado) {
-            const QString q = m->valorCampo("QTD");
-            qtd += q.isEmpty() ? 1.0 : double(float(CETemplateLisp::TextoParaReal(q)));
-            comprimento +=
-                double(float(CETemplateLisp::TextoParaReal(m->valorCampo("COMPRIMENTO"))));
+            const QString* q = m->campos.procura(campoQtd);
+            qtd += !q || q->isEmpty() ? 1.0 : real(q);
+            comprimento += real(m->campos.procura(campoComprimento));
             feitos.insert(m);
         }
         const bool inteiro = std::isfinite(qtd) && qtd == std::trunc(qtd) && std::abs(qtd) < 2e9;
@@ -87,9 +93,9 @@ void CCMaterialGrfWriter::SomaGrupos(VetorItens& itens, int digitos) {
             inteiro ? QString::number(int(qtd)) : ZVString::DeReal(qtd, digitos);
         const QString textoComprimento = ZVString::DeReal(comprimento, digitos);
         for (CEItemLista* m = item; m; m = m->ligado) {
-            m->definirCampo("QTD", textoQtd);
-            m->definirCampo("COMPRIMENTO", textoComprimento);
-            m->definirCampo("LENGTH", textoComprimento);
+            m->definirCampo(campoQtd, textoQtd);
+            m->definirCampo(campoComprimento, textoComprimento);
+            m->definirCampo(campoLength, textoComprimento);
             if (m->ligado == item) break;
         }
     }

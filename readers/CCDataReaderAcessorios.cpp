@@ -33,14 +33,27 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
                                            CETemplate* modelo, QStringList caminho,
                                            const QString& normaDono) {
     Q_UNUSED(atributos);
+    // Names as texts made once: this runs for every member of every listed material.
+    static const QString kAplicacao = QStringLiteral("ZV_VINC_ADITIVO");
+    static const QString kRecursivo = QStringLiteral("PBLACERECUR");
+    static const QString kRelacao = QStringLiteral("PBLACERELACAO");
+    static const QString kAtributos = QStringLiteral("PBLADDATRIBACE");
+    const std::uint32_t campoChave = NumeroCampo<"ZV_KEY">();
+    const std::uint32_t campoQtd = NumeroCampo<"QTD">();
+    const std::uint32_t campoLista = NumeroCampo<"ZV_LISTA">();
+    auto estaListado = [campoLista](const CEItemLista& item) {
+        const QString* lista = item.campos.procura(campoLista);
+        return lista && *lista == QLatin1String("S");
+    };
     const OdDbObjectId primeiro = dono.ids.empty() ? OdDbObjectId() : dono.ids.front();
     QString norma = normaDono;
     if (!primeiro.isNull()) {
         QString chave, normaEntidade;
-        if (ChaveENorma(primeiro, chave, normaEntidade)) dono.definirCampo("ZV_KEY", chave);
+        if (ChaveENorma(primeiro, chave, normaEntidade)) dono.definirCampo(campoChave, chave);
         if (norma.isEmpty()) norma = normaEntidade;
     }
-    const QString chaveDono = dono.valorCampo("ZV_KEY");
+    const QString* campoDono = dono.campos.procura(campoChave);
+    const QString chaveDono = campoDono ? *campoDono : QString();
     caminho << chaveDono;
 
     QStringList contados, zerados;
@@ -49,7 +62,7 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
         Conta(partes.value(0), ZVString(partes.value(1)).ParaInteiro(), contados, zerados);
     }
     if (!primeiro.isNull()) {
-        CICad::RegistraApp("ZV_VINC_ADITIVO", primeiro.database());
+        CICad::RegistraApp(kAplicacao, primeiro.database());
         // Pairs of strings, quantity first; a string without its partner is left out.
         QStringList textos;
         for (const CEItemXData& item : CICad::GetXData(primeiro, "ZV_VINC_ADITIVO"))
@@ -59,11 +72,16 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
     }
 
     // The fields every unit of an accessory key starts with, made once per key and standard
-    // and shared by the units' copies until one of them changes.
-    auto base = [&](const QString& chave) -> const CEItemLista& {
+    // and shared by the units' copies until one of them changes; with the user columns.
+    struct Base {
+        const CEItemLista* item;
+        const CEItemLista* colunas;
+    };
+    auto base = [&](const QString& chave) -> Base {
         const QString nome = chave + QChar(0x1F) + norma;
         auto it = basesAcessorio_.constFind(nome);
-        if (it != basesAcessorio_.constEnd()) return it.value();
+        if (it != basesAcessorio_.constEnd())
+            return {&it.value(), &basesColunas_.constFind(nome).value()};
         CEItemLista item;
         item.definirCampo("ZV_LISTA_TIPO", "ACE");
         item.definirCampo("ZV_LISTA", catalogo_.ListaComp(chave, norma));
@@ -73,20 +91,17 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
         item.definirCampo("TP_DESCRI", descricao);
         CEItemLista colunas;
         LeColunasUsuario(QString(), colunas, catalogo_.ColunasComp(chave));
-        basesAcessorio_.insert(nome, item);
-        basesColunas_.insert(nome, colunas);
-        return basesAcessorio_[nome];
+        const auto novo = basesAcessorio_.insert(nome, item);
+        return {&novo.value(), &basesColunas_.insert(nome, colunas).value()};
     };
-    auto colunas = [&](const QString& chave) -> const CEItemLista& {
-        base(chave);
-        return basesColunas_[chave + QChar(0x1F) + norma];
-    };
-    auto novoItem = [&](const QString& chave) { return new CEItemLista(base(chave)); };
 
     VetorItens resultado;
-    const bool recursivo = modelo && modelo->LerLogico("PBLACERECUR");
-    const bool relacao = modelo && modelo->LerLogico("PBLACERELACAO");
-    const bool atributosDono = !modelo && CICad::GetBoolLisp("PBLADDATRIBACE");
+    if (contados.isEmpty() && zerados.isEmpty()) return resultado;
+    const bool recursivo = modelo && modelo->LerLogico(kRecursivo);
+    const bool relacao = modelo && modelo->LerLogico(kRelacao);
+    const bool atributosDono = !modelo && CICad::GetBoolLisp(kAtributos);
+    const QString* qtdDono = dono.campos.procura(campoQtd);
+    const QString qtd = qtdDono && !qtdDono->isEmpty() ? *qtdDono : QStringLiteral("1");
     for (const QString& chave : contados) {
         auto* item = new CEItemLista;
         if (atributosDono && !primeiro.isNull()) {
@@ -103,14 +118,14 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
                     if (dono.obterCampo(nome, valor)) item->definirCampo(nome, valor);
                 }
         }
+        const Base b = base(chave);
         if (item->campos.isEmpty())
-            item->campos = base(chave).campos;
+            item->campos = b.item->campos;
         else
-            item->copiarCampos(base(chave));
-        const QString qtd = dono.valorCampo("QTD");
-        item->definirCampo("QTD", qtd.isEmpty() ? QStringLiteral("1") : qtd);
-        item->copiarCampos(colunas(chave));
-        const bool listado = item->valorCampo("ZV_LISTA") == "S";
+            item->copiarCampos(*b.item);
+        item->definirCampo(campoQtd, qtd);
+        item->copiarCampos(*b.colunas);
+        const bool listado = estaListado(*item);
         if (listado && modelo && !modelo->FiltraItem(*item)) {
             delete item;
             continue;
@@ -126,10 +141,11 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
     }
     for (const QString& chave : zerados) {
         if (contados.contains(chave)) continue;
-        CEItemLista* item = novoItem(chave);
-        item->definirCampo("QTD", "0");
-        item->copiarCampos(colunas(chave));
-        if (item->valorCampo("ZV_LISTA") == "S" && (!modelo || modelo->FiltraItem(*item)))
+        const Base b = base(chave);
+        auto* item = new CEItemLista(*b.item);
+        item->definirCampo(campoQtd, QStringLiteral("0"));
+        item->copiarCampos(*b.colunas);
+        if (estaListado(*item) && (!modelo || modelo->FiltraItem(*item)))
             resultado.push_back(item);
         else
             delete item;

@@ -4,6 +4,8 @@
 #include "lists/CETemplate.h"
 #include "module/CIProgress.h"
 
+#include <array>
+#include <cstdint>
 #include <unordered_map>
 
 namespace {
@@ -30,30 +32,43 @@ private:
 };
 
 bool Listado(const CEItemLista& item, CETemplate& modelo) {
-    return item.valorCampo("ZV_LISTA") == "S" && modelo.FiltraItem(item);
+    const QString* lista = item.campos.procura(NumeroCampo<"ZV_LISTA">());
+    return lista && *lista == QLatin1String("S") && modelo.FiltraItem(item);
 }
 
-// A wire's name; FIO, the name the project format writes, after the three others.
+// The fields that name a wire, in the order they are looked at; FIO, the name the project
+// format writes, after the three others. Made once: every wire and segment asks.
+const std::array<QString, 4>& CamposNomeFio() {
+    static const std::array<QString, 4> campos = {QStringLiteral("CABO"), QStringLiteral("WIRE"),
+                                                  QStringLiteral("ALAMBRE"), QStringLiteral("FIO")};
+    return campos;
+}
+
+// A wire's name.
 QString NomeDoFio(const CEItemLista& item) {
-    for (const char* campo : {"CABO", "WIRE", "ALAMBRE", "FIO"}) {
-        const QString valor = item.valorCampo(campo).trimmed();
-        if (!valor.isEmpty()) return valor;
-    }
+    for (const QString& campo : CamposNomeFio())
+        if (const QString* valor = item.campo(campo)) {
+            const QString nome = valor->trimmed();
+            if (!nome.isEmpty()) return nome;
+        }
     return {};
 }
 
-// The same name from the wire's extended data, without building its item.
+// The same name from the wire's extended data, without building its item. A field given
+// twice counts with its last value.
 QString NomeNoXData(const OdDbObjectId& fio) {
-    QHash<QString, QString> campos;
+    const std::array<QString, 4>& nomes = CamposNomeFio();
+    std::array<QString, 4> valores;
     const CEListaXData dados = CICad::GetXData(fio, "KVR_ZV_WIRE");
     for (size_t i = 2; i < dados.size(); ++i) {
         QString nome, valor;
-        if (ZVString(dados[i].texto).DivideEmDois(CCDataReader::kSeparador, nome, valor))
-            campos.insert(nome, valor);
+        if (!ZVString(dados[i].texto).DivideEmDois(CCDataReader::kSeparador, nome, valor)) continue;
+        for (size_t k = 0; k < nomes.size(); ++k)
+            if (nome == nomes[k]) valores[k] = valor;
     }
-    for (const char* campo : {"CABO", "WIRE", "ALAMBRE", "FIO"}) {
-        const QString valor = campos.value(campo).trimmed();
-        if (!valor.isEmpty()) return valor;
+    for (const QString& valor : valores) {
+        const QString nome = valor.trimmed();
+        if (!nome.isEmpty()) return nome;
     }
     return {};
 }
@@ -161,8 +176,8 @@ void CCMaterialDataReader::LeBlocos(zvdb::Database* database,
                 entidade = CICad::GetSimboloMestre(database, ref);
                 if (entidade.isNull()) continue;
             }
-            const QString handle = ZVString::DeHandle(entidade.handle());
-            if (vistos_.contains(handle)) continue;
+            const std::uint64_t handle = entidade.handle();
+            if (vistos_.count(handle)) continue;
             if (CICad::EhReferencia(entidade) && CICad::GetDono(entidade) != modelSpace) continue;
             if (layers && !layers->contains(CICad::GetLayerEntidade(ref))) continue;
             CEItemLista* item = CriaItemBloco(entidade, modelo);
@@ -185,8 +200,8 @@ void CCMaterialDataReader::LeBlocos(zvdb::Database* database,
 
 void CCMaterialDataReader::LeVirtuais(zvdb::Database* database, CETemplate& modelo) {
     for (const auto& [nome, id] : CICad::GetEntradasDicionario({"ESQ_VIRTUAL_ZV"}, database)) {
-        const QString handle = ZVString::DeHandle(id.handle());
-        if (vistos_.contains(handle)) continue;
+        const std::uint64_t handle = id.handle();
+        if (vistos_.count(handle)) continue;
         CEItemLista* item = CriaItemVirtual(id);
         if (!item) continue;
         if (!Listado(*item, modelo)) {
@@ -259,26 +274,29 @@ void CCMaterialDataReader::LeFios(zvdb::Database* database,
     std::vector<std::unique_ptr<CEItemLista>> itens;
     for (const OdDbObjectId& fio : fios)
         itens.emplace_back(CriaItemFio(fio, modelo));
+    static const QString kIni = QStringLiteral("_INI"), kFim = QStringLiteral("_FIM");
+    const std::uint32_t campoLista = NumeroCampo<"WIRE_LISTA">();
     QSet<QString> nomes;
     for (std::unique_ptr<CEItemLista>& item : itens) {
         if (!item) continue;
+        const QString* lista = item->campos.procura(campoLista);
+        const bool listado = lista && *lista == QLatin1String("S");
+        if (!listado || !modelo.FiltraItem(*item)) continue;
         const QString nome = NomeDoFio(*item);
-        if (item->valorCampo("WIRE_LISTA") != "S" || !modelo.FiltraItem(*item) || nome.isEmpty() ||
-            nomes.contains(nome))
-            continue;
+        if (nome.isEmpty() || nomes.contains(nome)) continue;
         nomes.insert(nome);
         const std::vector<OdDbObjectId>& partes = segmentos[nome];
         if (partes.empty()) continue;
         const CEItemLista reserva = *item;
         CEItemLista* atual = item.get();
-        CopiaEntidade("_INI", *atual, partes.front(), &modelo);
+        CopiaEntidade(kIni, *atual, partes.front(), &modelo);
         for (size_t s = 1; s < partes.size(); ++s) {
-            CopiaEntidade("_FIM", *atual, partes[s], &modelo);
+            CopiaEntidade(kFim, *atual, partes[s], &modelo);
             if (s + 1 == partes.size()) break;
             auto* seguinte = new CEItemLista;
             seguinte->campos = reserva.campos;
             seguinte->ids = reserva.ids;
-            CopiaEntidade("_INI", *seguinte, partes[s], &modelo);
+            CopiaEntidade(kIni, *seguinte, partes[s], &modelo);
             atual->ligado = seguinte;
             atual = seguinte;
         }

@@ -6,6 +6,9 @@
 
 #include <QSet>
 
+#include <cstdint>
+#include <unordered_set>
+
 class CCMaterialDataReader : public CCDataReader {
 public:
     // Nothing on sides: a material has no connections of its own.
@@ -43,7 +46,8 @@ protected:
 
     Simbolos simbolos_;
     VetorItens resultado_;
-    QSet<QString> vistos_;
+    // Handles of the symbols listed already.
+    std::unordered_set<std::uint64_t> vistos_;
     QSet<QString> relacoes_;
     QSet<QString> conectores_;
 };

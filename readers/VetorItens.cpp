@@ -1,6 +1,9 @@
 #include "VetorItens.h"
 
+#include <QHash>
+
 #include <algorithm>
+#include <cstdint>
 #include <unordered_set>
 
 void VetorItens::juntarSemRepetir(const VetorItens& origem) {
@@ -55,25 +58,53 @@ int VetorItens::compararItens(const CEItemLista* a, const CEItemLista* b,
 
 void VetorItens::ordenar(const QStringList& campos) {
     if (campos.isEmpty() || size() < 2) return;
-    // The keys are worked out once per item, not once per comparison.
     const size_t k = size_t(campos.size());
-    std::vector<Chave> chaves(size() * k);
-    for (size_t i = 0; i < size(); ++i)
-        for (size_t c = 0; c < k; ++c) {
+    const size_t n = size();
+    // Each item's place among the distinct texts of each field, worked out once per text:
+    // a comparison is then a few integer compares, however long the texts and however many
+    // items tie on the first fields. Two places compare as their texts do, so the sort below
+    // makes the very same moves as one comparing the texts.
+    std::vector<std::uint32_t> postos(n * k);
+    QHash<QString, std::uint32_t> indice;
+    std::vector<Chave> distintas;
+    std::vector<std::uint32_t> ordemDistintas, lugar;
+    for (size_t c = 0; c < k; ++c) {
+        indice.clear();
+        distintas.clear();
+        for (size_t i = 0; i < n; ++i) {
             QString valor = Campo((*this)[i], campos[int(c)]);
-            chaves[i * k + c] = {ZVString::FormaNatural(valor), std::move(valor)};
+            auto it = indice.constFind(valor);
+            if (it == indice.constEnd()) {
+                it = indice.insert(valor, std::uint32_t(distintas.size()));
+                distintas.push_back({ZVString::FormaNatural(valor), std::move(valor)});
+            }
+            postos[i * k + c] = it.value();
         }
-    std::vector<size_t> ordem(size());
-    for (size_t i = 0; i < ordem.size(); ++i)
+        ordemDistintas.resize(distintas.size());
+        for (size_t d = 0; d < ordemDistintas.size(); ++d)
+            ordemDistintas[d] = std::uint32_t(d);
+        std::sort(ordemDistintas.begin(), ordemDistintas.end(),
+                  [&](std::uint32_t a, std::uint32_t b) {
+                      return CompararChaves(distintas[a], distintas[b]) < 0;
+                  });
+        lugar.resize(distintas.size());
+        for (size_t d = 0; d < ordemDistintas.size(); ++d)
+            lugar[ordemDistintas[d]] = std::uint32_t(d);
+        for (size_t i = 0; i < n; ++i)
+            postos[i * k + c] = lugar[postos[i * k + c]];
+    }
+    std::vector<size_t> ordem(n);
+    for (size_t i = 0; i < n; ++i)
         ordem[i] = i;
     std::sort(ordem.begin(), ordem.end(), [&](size_t a, size_t b) {
+        const std::uint32_t* pa = &postos[a * k];
+        const std::uint32_t* pb = &postos[b * k];
         for (size_t c = 0; c < k; ++c)
-            if (const int r = CompararChaves(chaves[a * k + c], chaves[b * k + c]); r != 0)
-                return r < 0;
+            if (pa[c] != pb[c]) return pa[c] < pb[c];
         return false;
     });
-    std::vector<CEItemLista*> ordenado(size());
-    for (size_t i = 0; i < ordem.size(); ++i)
+    std::vector<CEItemLista*> ordenado(n);
+    for (size_t i = 0; i < n; ++i)
         ordenado[i] = (*this)[ordem[i]];
     std::copy(ordenado.begin(), ordenado.end(), begin());
 }

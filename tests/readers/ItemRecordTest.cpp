@@ -10,6 +10,7 @@
 #include <QSet>
 
 #include <algorithm>
+#include <cstdint>
 #include <memory>
 #include <vector>
 
@@ -281,6 +282,45 @@ TEST(OrderingTest, CaseAndCodeUnitsDecideBeforeAnythingElse) {
                  itens.novo({{"T", QString::fromUtf8("Á").toUtf8().constData()}})};
     v.ordenar({"T"});
     EXPECT_EQ(Valores(v, "T"), QStringList({"B", "a", "b", QString::fromUtf8("Á")}));
+}
+
+TEST(OrderingTest, TiedItemsEndUpWhereAnItemByItemComparisonSortPutsThem) {
+    // The order of items whose keys tie is part of the lists' output: it must be the order
+    // a sort comparing the items field by field gives, ties included. Enough items that the
+    // sort partitions instead of inserting, with few distinct texts so that most tie.
+    Itens itens;
+    VetorItens v;
+    const char* grupos[] = {"X2", "X10", "x2", "", "01", "1", "B"};
+    const char* numeros[] = {"3", "03", "10", "2", "A1", "A01"};
+    std::uint32_t semente = 7;
+    auto sorteio = [&semente](std::uint32_t limite) {
+        semente = semente * 1103515245u + 12345u;
+        return (semente >> 16) % limite;
+    };
+    for (int i = 0; i < 400; ++i) {
+        CEItemLista* item = itens.novo({{"ID", ""}});
+        item->definirCampoInteiro("ID", i);
+        if (sorteio(9) != 0) item->definirCampo("G", grupos[sorteio(7)]);
+        item->definirCampo("N", numeros[sorteio(6)]);
+        v.push_back(item);
+    }
+    const QStringList campos = {"G", "N"};
+    VetorItens esperado = v;
+    std::sort(esperado.begin(), esperado.end(), [&](const CEItemLista* a, const CEItemLista* b) {
+        return VetorItens::compararItens(a, b, campos) < 0;
+    });
+    v.ordenar(campos);
+    EXPECT_EQ(Valores(v, "ID"), Valores(esperado, "ID"));
+    // Many items tie, and some of the tied ones leave their first order: the sort is not
+    // stable, so the comparison above did test the order of ties.
+    int empates = 0, trocados = 0;
+    for (size_t i = 0; i + 1 < v.size(); ++i)
+        if (VetorItens::compararItens(v[i], v[i + 1], campos) == 0) {
+            ++empates;
+            if (v[i]->valorCampo("ID").toInt() > v[i + 1]->valorCampo("ID").toInt()) ++trocados;
+        }
+    EXPECT_GT(empates, 300);
+    EXPECT_GT(trocados, 0);
 }
 
 TEST(VectorTest, MergeKeepsPointersOnceInOrder) {
