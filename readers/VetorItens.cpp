@@ -7,6 +7,8 @@
 #include <unordered_set>
 
 void VetorItens::juntarSemRepetir(const VetorItens& origem) {
+    // Most accessories have none of their own: no set of what is here for nothing.
+    if (origem.empty()) return;
     std::unordered_set<const CEItemLista*> presentes(begin(), end());
     for (CEItemLista* item : origem)
         if (presentes.insert(item).second) push_back(item);
