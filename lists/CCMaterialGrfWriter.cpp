@@ -8,6 +8,7 @@
 #include "readers/VetorItens.h"
 #include "readers/ZVString.h"
 
+#include <algorithm>
 #include <cmath>
 #include <unordered_set>
 
@@ -92,10 +93,15 @@ void CCMaterialGrfWriter::SomaGrupos(VetorItens& itens, int digitos) {
         const QString textoQtd =
             inteiro ? QString::number(int(qtd)) : ZVString::DeReal(qtd, digitos);
         const QString textoComprimento = ZVString::DeReal(comprimento, digitos);
+        // The three fields in one merge: an item's array grows once, if at all.
+        std::vector<CamposItem::Campo> lote = {{campoQtd, textoQtd},
+                                               {campoComprimento, textoComprimento},
+                                               {campoLength, textoComprimento}};
+        std::sort(
+            lote.begin(), lote.end(),
+            [](const CamposItem::Campo& x, const CamposItem::Campo& y) { return x.nome < y.nome; });
         for (CEItemLista* m = item; m; m = m->ligado) {
-            m->definirCampo(campoQtd, textoQtd);
-            m->definirCampo(campoComprimento, textoComprimento);
-            m->definirCampo(campoLength, textoComprimento);
+            m->campos.juntarOrdenados(lote);
             if (m->ligado == item) break;
         }
     }
