@@ -10,7 +10,8 @@
 
 #include <algorithm>
 #include <cmath>
-#include <unordered_set>
+#include <cstdint>
+#include <vector>
 
 namespace {
 
@@ -41,6 +42,44 @@ QString Avalia(const QString& expressao) {
     CICad::SetNilLisp("INVOKELISP_LISTAS_TMP");
     return CCListaPaginada::AvaliaFuncao(expressao);
 }
+
+// The items a walk over chains has met: open addressing in one array, since a large list
+// holds hundreds of thousands and a node per item costs more than the sums themselves.
+class ItensVistos {
+public:
+    explicit ItensVistos(size_t quantos) {
+        size_t capacidade = 16;
+        while (capacidade < 2 * quantos)
+            capacidade *= 2;
+        tabela_.assign(capacidade, nullptr);
+    }
+    bool contem(const CEItemLista* item) const { return tabela_[lugar(item)] == item; }
+    void insere(const CEItemLista* item) {
+        const size_t i = lugar(item);
+        if (tabela_[i] == item) return;
+        tabela_[i] = item;
+        if (2 * ++quantos_ > tabela_.size()) cresce();
+    }
+
+private:
+    // The item's slot, or the empty one where it would go.
+    size_t lugar(const CEItemLista* item) const {
+        const size_t mascara = tabela_.size() - 1;
+        size_t i = (std::uintptr_t(item) >> 4) * 0x9E3779B97F4A7C15ull >> 20 & mascara;
+        while (tabela_[i] && tabela_[i] != item)
+            i = (i + 1) & mascara;
+        return i;
+    }
+    void cresce() {
+        std::vector<const CEItemLista*> antiga(tabela_.size() * 2, nullptr);
+        antiga.swap(tabela_);
+        for (const CEItemLista* item : antiga)
+            if (item) tabela_[lugar(item)] = item;
+    }
+
+    std::vector<const CEItemLista*> tabela_;
+    size_t quantos_ = 0;
+};
 
 // The running grid, in single precision as the drawing keeps it.
 struct Grade {
@@ -78,15 +117,15 @@ void CCMaterialGrfWriter::SomaGrupos(VetorItens& itens, int digitos) {
     auto real = [](const QString* texto) {
         return texto ? double(float(CETemplateLisp::TextoParaReal(*texto))) : 0.0;
     };
-    std::unordered_set<const CEItemLista*> feitos;
+    ItensVistos feitos(itens.size());
     for (CEItemLista* item : itens) {
-        if (!item || feitos.count(item)) continue;
+        if (!item || feitos.contem(item)) continue;
         double qtd = 0, comprimento = 0;
-        for (CEItemLista* m = item; m && !feitos.count(m); m = m->ligado) {
+        for (CEItemLista* m = item; m && !feitos.contem(m); m = m->ligado) {
             const QString* q = m->campos.procura(campoQtd);
             qtd += !q || q->isEmpty() ? 1.0 : real(q);
             comprimento += real(m->campos.procura(campoComprimento));
-            feitos.insert(m);
+            feitos.insere(m);
         }
         const bool inteiro = std::isfinite(qtd) && qtd == std::trunc(qtd) && std::abs(qtd) < 2e9;
         // One text per group, shared by its members.

@@ -13,6 +13,9 @@
 #include <QTemporaryDir>
 #include <QTextStream>
 
+#include <memory>
+#include <vector>
+
 namespace {
 
 using Writer = CCMaterialGrfWriter;
@@ -207,6 +210,33 @@ TEST_F(MaterialLayoutTest, GroupSumsAreSetOnEveryMemberAndTotalsGetAPage) {
     EXPECT_EQ(paginas[1].linhas.at(0).item->valorCampo("QTD"), "9");
     delete a2;
     delete b2;
+}
+
+TEST_F(MaterialLayoutTest, GroupSumsCountEachMemberOnceHoweverLongTheChains) {
+    // One head leads a long chain (far more members than entries in the vector); a second
+    // head's chain runs into the first one's: the shared members count in the first group.
+    std::vector<std::unique_ptr<CEItemLista>> membros;
+    CEItemLista* a = Item("1", "a");
+    CEItemLista* fim = a;
+    for (int i = 0; i < 999; ++i) {
+        membros.push_back(std::make_unique<CEItemLista>());
+        membros.back()->definirCampo("QTD", "2");
+        membros.back()->definirCampo("COMPRIMENTO", "0.5");
+        fim->ligado = membros.back().get();
+        fim = fim->ligado;
+    }
+    CEItemLista* b = Item("2", "b");
+    membros.push_back(std::make_unique<CEItemLista>());
+    b->ligado = membros.back().get();
+    b->ligado->ligado = a->ligado;
+    Writer::SomaGrupos(itens, 1);
+    // 1 for the head without a QTD, 2 for each of the 999.
+    EXPECT_EQ(a->valorCampo("QTD"), "1999");
+    EXPECT_EQ(a->valorCampo("COMPRIMENTO"), "499.5");
+    EXPECT_EQ(a->valorCampo("LENGTH"), "499.5");
+    // The second group stops where the first one's members begin.
+    EXPECT_EQ(b->valorCampo("QTD"), "2");
+    EXPECT_EQ(b->valorCampo("SEQUENCIA"), "2");
 }
 
 TEST_F(MaterialLayoutTest, ATemplateFunctionRunsOncePerItemAndAnErrorPrintsNothing) {
