@@ -67,6 +67,7 @@ void CCDataReader::LiberaLeituras() {
     Esvazia(conexoes_);
     Esvazia(fiosPorLayer_);
     Esvazia(indicesFios_);
+    Esvazia(primeirosVertices_);
     versaoIndices_ = 0;
     Esvazia(rotas_);
     Esvazia(rotasPorChave_);
@@ -202,6 +203,7 @@ const CCDataReader::FiosDoLayer& CCDataReader::IndiceFios(const QString& layer) 
     const std::uint64_t versao = CICad::VersaoDesenho();
     if (versao != versaoIndices_) {
         indicesFios_.clear();
+        primeirosVertices_.clear();
         versaoIndices_ = versao;
     }
     std::unique_ptr<FiosDoLayer>& indice = indicesFios_[layer];
@@ -221,6 +223,7 @@ const CCDataReader::FiosDoLayer& CCDataReader::IndiceFios(const QString& layer) 
         const OdDbObjectId fio = CICad::IdDoHandle(handle);
         if (!CICad::EhPolilinha(fio) || CICad::GetLayerEntidade(fio) != layer) continue;
         std::vector<CEPonto> vertices = CICad::GetVertices(fio);
+        if (!vertices.empty()) primeirosVertices_.emplace(fio, vertices.front());
         if (vertices.size() < 2) continue;
         f.fios.push_back(fio);
         f.vertices.push_back(std::move(vertices));
@@ -570,9 +573,15 @@ QString CCDataReader::Posicao(const OdDbObjectId& entidade) const {
     if (partes.first.isEmpty()) return "??";
     CEPonto p;
     if (CICad::EhPolilinha(entidade)) {
-        const std::vector<CEPonto> vertices = CICad::GetVertices(entidade);
-        if (vertices.empty()) return "??";
-        p = vertices.front();
+        // the wires' indexes read it already, unless the drawing changed since
+        auto lido = primeirosVertices_.find(entidade);
+        if (lido != primeirosVertices_.end() && versaoIndices_ == CICad::VersaoDesenho()) {
+            p = lido->second;
+        } else {
+            const std::vector<CEPonto> vertices = CICad::GetVertices(entidade);
+            if (vertices.empty()) return "??";
+            p = vertices.front();
+        }
     } else if (CICad::EhReferencia(entidade)) {
         p = CICad::GetPosicao(entidade);
     } else {

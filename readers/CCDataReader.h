@@ -167,6 +167,8 @@ private:
     QHash<QString, QStringList> fiosPorLayer_;
     std::unordered_map<QString, std::unique_ptr<FiosDoLayer>> indicesFios_;
     std::uint64_t versaoIndices_ = 0;  // the drawing's version the indexes were read at
+    // The first vertex of each wire the indexes read, for the wire's position.
+    std::unordered_map<OdDbObjectId, CEPonto> primeirosVertices_;
     // Route records in store order, read on the first lookup; routes by wire key.
     struct Rota {
         QString chave, dados;

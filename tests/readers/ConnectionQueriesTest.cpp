@@ -174,6 +174,24 @@ TEST_F(ConnectionQueriesTest, AWireVertexMovedInLispIsSeenByTheNextQuestion) {
     EXPECT_TRUE(r->FioNoPonto(layer, {50, 100, 0}).isNull());
 }
 
+// A wire's position comes from its first vertex, also after the wire moved.
+TEST_F(ConnectionQueriesTest, AWirePositionFollowsItsFirstVertex) {
+    ASSERT_TRUE(documento_->lisp()->lispEvaluate(
+        "(defun BuscarCoordenadas (e g p x y) (strcat g \"/\" p \":\" (rtos x 2 1) \";\" "
+        "(rtos y 2 1)))"));
+    const zvdb::Polyline* w = fio({{10, 100, 0}, {100, 100, 0}}, "1");
+    auto r = leitor(0.5);
+    EXPECT_EQ(r->Posicao(id(w)), "ESQ/0001:10.0;100.0");
+    // once the wires of its page are indexed too
+    EXPECT_EQ(r->FioNoPonto(QString::fromStdString(kPagina), {50, 100, 0}), id(w));
+    EXPECT_EQ(r->Posicao(id(w)), "ESQ/0001:10.0;100.0");
+    ASSERT_TRUE(documento_->lisp()->lispEvaluate("(entmod (list (cons -1 (handent \"" + handle(w) +
+                                                 "\")) '(10 20.0 300.0)))"));
+    EXPECT_EQ(r->Posicao(id(w)), "ESQ/0001:20.0;300.0");
+    EXPECT_EQ(r->FioNoPonto(QString::fromStdString(kPagina), {60, 200, 0}), id(w));
+    EXPECT_EQ(r->Posicao(id(w)), "ESQ/0001:20.0;300.0");
+}
+
 // ---- neighbours along a wire
 
 class NeighbourTest : public ConnectionQueriesTest {
