@@ -67,6 +67,7 @@ void CCDataReader::LiberaLeituras() {
     Esvazia(conexoes_);
     Esvazia(fiosPorLayer_);
     Esvazia(indicesFios_);
+    Esvazia(primeirosVertices_);
     versaoIndices_ = 0;
     Esvazia(rotas_);
     Esvazia(rotasPorChave_);
@@ -83,6 +84,10 @@ void CCDataReader::LiberaLeituras() {
     Esvazia(gruposPaginas_);
     Esvazia(textosTipo_);
     Esvazia(colunasDivididas_);
+    Esvazia(catalogoComp_);
+    Esvazia(constantes_);
+    atributosDe_ = OdDbObjectId();
+    atributosLidos_.reset();
     Esvazia(basesAcessorio_);
     Esvazia(basesColunas_);
 }
@@ -109,7 +114,7 @@ void CCDataReader::CarregaConexoes(const QString& funcao, bool detalhes) {
         Conexoes conexoes;
         if (!detalhes) conexoes.completas = conexoes_.value(fio).completas;
         if (no->rbnext && no->rbnext->restype == zvsdk::RTLE) {
-            conexoes_.insert(fio, conexoes);
+            conexoes_[fio] = std::move(conexoes);
             no = no->rbnext;
             continue;
         }
@@ -131,7 +136,7 @@ void CCDataReader::CarregaConexoes(const QString& funcao, bool detalhes) {
                 ++coordenada;
             }
         }
-        conexoes_.insert(fio, conexoes);
+        conexoes_[fio] = std::move(conexoes);
     }
     CICad::LiberaLista(resposta);
 }
@@ -198,6 +203,7 @@ const CCDataReader::FiosDoLayer& CCDataReader::IndiceFios(const QString& layer) 
     const std::uint64_t versao = CICad::VersaoDesenho();
     if (versao != versaoIndices_) {
         indicesFios_.clear();
+        primeirosVertices_.clear();
         versaoIndices_ = versao;
     }
     std::unique_ptr<FiosDoLayer>& indice = indicesFios_[layer];
@@ -217,6 +223,7 @@ const CCDataReader::FiosDoLayer& CCDataReader::IndiceFios(const QString& layer) 
         const OdDbObjectId fio = CICad::IdDoHandle(handle);
         if (!CICad::EhPolilinha(fio) || CICad::GetLayerEntidade(fio) != layer) continue;
         std::vector<CEPonto> vertices = CICad::GetVertices(fio);
+        if (!vertices.empty()) primeirosVertices_.emplace(fio, vertices.front());
         if (vertices.size() < 2) continue;
         f.fios.push_back(fio);
         f.vertices.push_back(std::move(vertices));
@@ -442,7 +449,12 @@ std::unique_ptr<zv::CEAtributo> CCDataReader::AtributoConexaoProximo(const OdDbO
     if (achado == ligacoesPorElemento_.end()) {
         std::vector<LigacaoGuardada> ligacoes;
         std::unique_ptr<zv::CEListaAtributos> atributos;
-        CICad::GetAtributos(elemento, atributos, false, false);
+        if (atributosDe_ == elemento && atributosLidos_ &&
+            atributosVersao_ == CICad::VersaoDesenho(elemento.database()))
+            atributos = std::move(atributosLidos_);
+        else
+            CICad::GetAtributos(elemento, atributos, false, false);
+        atributosDe_ = OdDbObjectId();
         for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
             const zv::CEAtributo& atributo = (*atributos)[i];
             const QString tag = atributo.GetTag().toUpper();
@@ -512,11 +524,12 @@ void CCDataReader::LeColunasUsuario(const QString& sufixo, CEItemLista& item,
         auto it = colunasDivididas_.constFind(coluna);
         if (it == colunasDivididas_.constEnd()) {
             QString nome, valor;
-            if (!ZVString(coluna).DivideEmDois(kSeparador, nome, valor)) nome.clear();
-            it = colunasDivididas_.insert(coluna, {nome, valor});
+            const bool divide = ZVString(coluna).DivideEmDois(kSeparador, nome, valor);
+            it = colunasDivididas_.insert(
+                coluna, {divide && !nome.isEmpty() ? CamposItem::numero(nome) : kSemColuna, valor});
         }
-        if (!it->first.isEmpty())
-            item.definirCampo(sufixo.isEmpty() ? it->first : it->first + sufixo, it->second);
+        if (it->first != kSemColuna)
+            item.definirCampo(CamposItem::numeroComSufixo(it->first, sufixo), it->second);
     }
 }
 
@@ -560,9 +573,15 @@ QString CCDataReader::Posicao(const OdDbObjectId& entidade) const {
     if (partes.first.isEmpty()) return "??";
     CEPonto p;
     if (CICad::EhPolilinha(entidade)) {
-        const std::vector<CEPonto> vertices = CICad::GetVertices(entidade);
-        if (vertices.empty()) return "??";
-        p = vertices.front();
+        // the wires' indexes read it already, unless the drawing changed since
+        auto lido = primeirosVertices_.find(entidade);
+        if (lido != primeirosVertices_.end() && versaoIndices_ == CICad::VersaoDesenho()) {
+            p = lido->second;
+        } else {
+            const std::vector<CEPonto> vertices = CICad::GetVertices(entidade);
+            if (vertices.empty()) return "??";
+            p = vertices.front();
+        }
     } else if (CICad::EhReferencia(entidade)) {
         p = CICad::GetPosicao(entidade);
     } else {
@@ -632,34 +651,68 @@ void CCDataReader::LeBloco(const QString& s, CEItemLista& item, const OdDbObject
     Q_UNUSED(modelo);
     QString chave, norma;
     ChaveENorma(referencia, chave, norma);
-    LeColunasUsuario(s, item, catalogo_.ColunasComp(chave));
+    const CatalogoComp& catalogo = DadosCatalogoComp(chave, norma);
+    LeColunasUsuario(s, item, catalogo.colunas);
     std::unique_ptr<zv::CEListaAtributos> atributos;
     CICad::GetAtributos(referencia, atributos, false, false);
     for (int i = 0; atributos && i < atributos->Quantidade(); ++i)
         item.definirCampo((*atributos)[i].GetTag() + s, (*atributos)[i].GetValor());
-    CICad::GetAtributosConstantes(referencia, atributos);
-    for (int i = 0; atributos && i < atributos->Quantidade(); ++i)
-        item.definirCampo((*atributos)[i].GetTag() + s, (*atributos)[i].GetValor());
-    if (CICad::GetNomeBloco(referencia).startsWith("PIN-")) {
+    atributosLidos_ = std::move(atributos);
+    atributosDe_ = referencia;
+    atributosVersao_ = CICad::VersaoDesenho(referencia.database());
+    const QString bloco = CICad::GetNomeBloco(referencia);
+    for (const auto& [nome, valor] : ConstantesDoBloco(referencia, bloco).campos)
+        item.definirCampo(CamposItem::numeroComSufixo(nome, s), valor);
+    if (bloco.startsWith("PIN-")) {
         const CEListaXData pino = CICad::GetXData(referencia, "ZV_PINO");
         if (!pino.empty() && EhTexto(pino[0]))
             item.definirCampo(NumeroCampo<"CONECTOR">(s), pino[0].texto);
     }
     item.definirCampo(NumeroCampo<"HANDLE">(s), ZVString::DeHandle(referencia.handle()));
     LeCircuitoLocal(s, item, referencia);
-    item.definirCampo(NumeroCampo<"ZV_LISTA">(s), catalogo_.ListaComp(chave, norma));
+    item.definirCampo(NumeroCampo<"ZV_LISTA">(s), catalogo.lista);
     item.definirCampo(NumeroCampo<"ZV_KEY">(s), chave);
-    const QString descricao = catalogo_.DescricaoComp(chave);
-    item.definirCampo(NumeroCampo<"DESCRICAO">(s), descricao);
-    item.definirCampo(NumeroCampo<"TP_DESCRI">(s), descricao);
+    item.definirCampo(NumeroCampo<"DESCRICAO">(s), catalogo.descricao);
+    item.definirCampo(NumeroCampo<"TP_DESCRI">(s), catalogo.descricao);
     item.definirCampo(NumeroCampo<"POSICAO">(s), Posicao(referencia));
     LeLayer(s, item, LayerDe(referencia));
-    item.definirCampo(NumeroCampo<"COMPONENTTYPE">(s), TextoTipo(catalogo_.TipoComp(chave)));
+    item.definirCampo(NumeroCampo<"COMPONENTTYPE">(s), catalogo.tipo);
     const std::uint32_t qtd = NumeroCampo<"QTD">(s);
     if (const QString* valor = item.campos.procura(qtd); !valor || valor->isEmpty())
         item.definirCampo(qtd, QStringLiteral("1"));
-    item.definirCampo(NumeroCampo<"SAP_MATERIAL">(s), catalogo_.MaterialSap(chave));
+    item.definirCampo(NumeroCampo<"SAP_MATERIAL">(s), catalogo.material);
     LeLayout(s, item, referencia);
+}
+
+const CCDataReader::CatalogoComp& CCDataReader::DadosCatalogoComp(const QString& chave,
+                                                                  const QString& norma) {
+    auto achado = catalogoComp_.find({chave, norma});
+    if (achado != catalogoComp_.end()) return achado->second;
+    CatalogoComp dados;
+    dados.colunas = catalogo_.ColunasComp(chave);
+    dados.lista = catalogo_.ListaComp(chave, norma);
+    dados.descricao = catalogo_.DescricaoComp(chave);
+    dados.tipo = TextoTipo(catalogo_.TipoComp(chave));
+    dados.material = catalogo_.MaterialSap(chave);
+    return catalogoComp_.emplace(std::pair(chave, norma), std::move(dados)).first->second;
+}
+
+const CCDataReader::ConstantesBloco& CCDataReader::ConstantesDoBloco(const OdDbObjectId& referencia,
+                                                                     const QString& bloco) {
+    const std::uint64_t versao = CICad::VersaoDesenho(referencia.database());
+    ConstantesBloco& constantes = constantes_[bloco];
+    if (constantes.desenho == referencia.database() && constantes.versao == versao &&
+        constantes.desenho)
+        return constantes;
+    constantes.desenho = referencia.database();
+    constantes.versao = versao;
+    constantes.campos.clear();
+    std::unique_ptr<zv::CEListaAtributos> atributos;
+    CICad::GetAtributosConstantes(referencia, atributos);
+    for (int i = 0; atributos && i < atributos->Quantidade(); ++i)
+        constantes.campos.emplace_back(CamposItem::numero((*atributos)[i].GetTag()),
+                                       (*atributos)[i].GetValor());
+    return constantes;
 }
 
 void CCDataReader::LeFio(const QString& s, CEItemLista& item, const OdDbObjectId& polilinha,

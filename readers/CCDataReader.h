@@ -167,6 +167,8 @@ private:
     QHash<QString, QStringList> fiosPorLayer_;
     std::unordered_map<QString, std::unique_ptr<FiosDoLayer>> indicesFios_;
     std::uint64_t versaoIndices_ = 0;  // the drawing's version the indexes were read at
+    // The first vertex of each wire the indexes read, for the wire's position.
+    std::unordered_map<OdDbObjectId, CEPonto> primeirosVertices_;
     // Route records in store order, read on the first lookup; routes by wire key.
     struct Rota {
         QString chave, dados;
@@ -209,8 +211,37 @@ private:
     // Empties the caches of entities when the drawing changed since they were read.
     void ConfereVersao() const;
     const NumeroFio& NumeroDoFioGuardado(const OdDbObjectId& entidade) const;
-    // Catalogue column texts split into name and value (an empty name: not a column).
-    QHash<QString, std::pair<QString, QString>> colunasDivididas_;
+    // Catalogue column texts split into the number of the name and the value; a text that
+    // is no column has kSemColuna.
+    static constexpr std::uint32_t kSemColuna = ~std::uint32_t(0);
+    QHash<QString, std::pair<std::uint32_t, QString>> colunasDivididas_;
+    // What the catalogue says of a symbol's key and standard: every symbol of a key asks
+    // the same, so one look-up serves them all.
+    struct CatalogoComp {
+        QStringList colunas;
+        QString lista, descricao, tipo, material;
+    };
+    struct HashPar {
+        size_t operator()(const std::pair<QString, QString>& p) const {
+            return qHash(p.first, qHash(p.second));
+        }
+    };
+    std::unordered_map<std::pair<QString, QString>, CatalogoComp, HashPar> catalogoComp_;
+    const CatalogoComp& DadosCatalogoComp(const QString& chave, const QString& norma);
+    // The constant attributes of a block definition by the block's name, as name numbers and
+    // values; read again when the drawing changed.
+    struct ConstantesBloco {
+        const void* desenho = nullptr;
+        std::uint64_t versao = 0;
+        std::vector<std::pair<std::uint32_t, QString>> campos;
+    };
+    QHash<QString, ConstantesBloco> constantes_;
+    const ConstantesBloco& ConstantesDoBloco(const OdDbObjectId& referencia, const QString& bloco);
+    // The attributes of the last symbol LeBloco read: its neighbour's connection attributes
+    // are asked right after.
+    mutable OdDbObjectId atributosDe_;
+    mutable std::uint64_t atributosVersao_ = 0;
+    mutable std::unique_ptr<zv::CEListaAtributos> atributosLidos_;
     // Per layer name, its group and page (empty unless the name has three parts); per catalogue
     // type, its text: items repeat a few of each.
     mutable QHash<QString, std::pair<QString, QString>> gruposPaginas_;

@@ -28,10 +28,36 @@ QStringList ZVString::Divide(const QString& separadores) const {
 }
 
 bool ZVString::DivideEmDois(const QString& separadores, QString& primeiro, QString& segundo) const {
-    const QStringList tokens = Divide(separadores);
-    if (tokens.size() != 1 && tokens.size() != 2) return false;
-    primeiro = tokens[0];
-    segundo = tokens.size() == 2 ? tokens[1] : QString();
+    // Every key and extended-data field of a list passes here: the token bounds are found
+    // without a list, and a text without separators is shared, not copied.
+    const QChar* texto = constData();
+    const QChar* sep = separadores.constData();
+    const int n = size(), m = separadores.size();
+    const auto separa = [sep, m](QChar c) {
+        for (int k = 0; k < m; ++k)
+            if (sep[k] == c) return true;
+        return false;
+    };
+    int inicio[2] = {0, 0}, fim[2] = {0, 0};
+    int tokens = 0, aberto = -1;
+    for (int i = 0; i <= n; ++i) {
+        const bool corta = i == n || separa(texto[i]);
+        if (corta && aberto >= 0) {
+            if (tokens == 2) return false;
+            inicio[tokens] = aberto;
+            fim[tokens++] = i;
+            aberto = -1;
+        } else if (!corta && aberto < 0) {
+            aberto = i;
+        }
+    }
+    if (tokens == 0) return false;
+    // both made before either output is set: an output may be this text itself
+    QString um = inicio[0] == 0 && fim[0] == n ? static_cast<const QString&>(*this)
+                                               : QString(texto + inicio[0], fim[0] - inicio[0]);
+    QString dois = tokens == 2 ? QString(texto + inicio[1], fim[1] - inicio[1]) : QString();
+    primeiro = std::move(um);
+    segundo = std::move(dois);
     return true;
 }
 
@@ -59,6 +85,28 @@ ZVString ZVString::DeHandle(std::uint64_t handle) {
 }
 
 std::uint64_t ZVString::ParaHandle() const {
+    // A drawing's handles are plain hexadecimal digits: read them here; anything else
+    // (blanks, a sign, a prefix, too many digits) goes the long way.
+    const int n = size();
+    if (n > 0 && n <= 15) {
+        std::uint64_t valor = 0;
+        const QChar* c = constData();
+        int i = 0;
+        for (; i < n; ++i) {
+            const char16_t u = c[i].unicode();
+            int digito;
+            if (u >= '0' && u <= '9')
+                digito = u - '0';
+            else if (u >= 'A' && u <= 'F')
+                digito = u - 'A' + 10;
+            else if (u >= 'a' && u <= 'f')
+                digito = u - 'a' + 10;
+            else
+                break;
+            valor = valor << 4 | std::uint64_t(digito);
+        }
+        if (i == n) return valor;
+    }
     bool ok = false;
     const qulonglong handle = toULongLong(&ok, 16);
     return ok ? handle : 0;

@@ -4,6 +4,7 @@
 #include "QtPrinters.h"
 #include "cad/CICad.h"
 #include "cad/FacadeFixture.h"
+#include "drawing/Attribute.h"
 #include "drawing/Dictionary.h"
 #include "drawing/Polyline.h"
 #include "drawing/XRecord.h"
@@ -171,6 +172,24 @@ TEST_F(ConnectionQueriesTest, AWireVertexMovedInLispIsSeenByTheNextQuestion) {
     ASSERT_EQ(w->vertices().front().y, 300.0);
     EXPECT_EQ(r->FioNoPonto(layer, {50, 200, 0}), id(w));
     EXPECT_TRUE(r->FioNoPonto(layer, {50, 100, 0}).isNull());
+}
+
+// A wire's position comes from its first vertex, also after the wire moved.
+TEST_F(ConnectionQueriesTest, AWirePositionFollowsItsFirstVertex) {
+    ASSERT_TRUE(documento_->lisp()->lispEvaluate(
+        "(defun BuscarCoordenadas (e g p x y) (strcat g \"/\" p \":\" (rtos x 2 1) \";\" "
+        "(rtos y 2 1)))"));
+    const zvdb::Polyline* w = fio({{10, 100, 0}, {100, 100, 0}}, "1");
+    auto r = leitor(0.5);
+    EXPECT_EQ(r->Posicao(id(w)), "ESQ/0001:10.0;100.0");
+    // once the wires of its page are indexed too
+    EXPECT_EQ(r->FioNoPonto(QString::fromStdString(kPagina), {50, 100, 0}), id(w));
+    EXPECT_EQ(r->Posicao(id(w)), "ESQ/0001:10.0;100.0");
+    ASSERT_TRUE(documento_->lisp()->lispEvaluate("(entmod (list (cons -1 (handent \"" + handle(w) +
+                                                 "\")) '(10 20.0 300.0)))"));
+    EXPECT_EQ(r->Posicao(id(w)), "ESQ/0001:20.0;300.0");
+    EXPECT_EQ(r->FioNoPonto(QString::fromStdString(kPagina), {60, 200, 0}), id(w));
+    EXPECT_EQ(r->Posicao(id(w)), "ESQ/0001:20.0;300.0");
 }
 
 // ---- neighbours along a wire
@@ -375,6 +394,47 @@ TEST_F(ConnectionQueriesTest, KeptNumbersAndFieldsFollowAChangeOfTheDrawing) {
     CEItemLista segundo;
     r->CopiaEntidade("_FIM", segundo, id(k), nullptr);
     EXPECT_EQ(segundo.valorCampo("TAG_FIM"), "K2");
+}
+
+// A block's constant attributes are kept per block, and a symbol's attributes for the
+// connection question that follows its reading: both follow a change of the drawing.
+TEST_F(ConnectionQueriesTest, KeptConstantsAndAttributesFollowAChangeOfTheDrawing) {
+    zvdb::BlockRecord& definicao = bloco("NA-C");
+    zvdb::Attribute* fabricante =
+        definicao.addAttributeDefinition("FAB", "Maker", "X1", {0, 0, 0}, 2.5);
+    fabricante->setInteger(70, 2, "AcDbAttributeDefinition");
+    zvdb::BlockReference* k = simbolo("NA-C", {50, 50, 0});
+    k->addAttribute("LIGACAO1", "A1", {50, 50, 0}, 2.5);
+    zvdb::BlockReference* q = simbolo("NA-C", {80, 50, 0});
+    q->addAttribute("LIGACAO1", "B1", {80, 50, 0}, 2.5);
+    auto r = leitor();
+    auto ligacao = [&](const zvdb::BlockReference* ref) {
+        const std::unique_ptr<zv::CEAtributo> a = r->AtributoConexaoProximo(id(ref), {0, 0, 0});
+        return a ? a->GetValor() : QString("none");
+    };
+    CEItemLista primeiro;
+    r->LeBloco("_INI", primeiro, id(k), nullptr);
+    EXPECT_EQ(primeiro.valorCampo("FAB_INI"), "X1");
+    EXPECT_EQ(primeiro.valorCampo("LIGACAO1_INI"), "A1");
+    EXPECT_EQ(ligacao(k), "A1");
+
+    // Read, then edited before its connections are asked for.
+    CEItemLista segundo;
+    r->LeBloco("_FIM", segundo, id(q), nullptr);
+    EXPECT_EQ(segundo.valorCampo("FAB_FIM"), "X1");
+    q->attribute("LIGACAO1")->setTextValue("B2");
+    EXPECT_EQ(ligacao(q), "B2");
+
+    // The definition's constant changed: the next symbol of the block shows the new value.
+    fabricante->setTextValue("X2");
+    CEItemLista terceiro;
+    r->LeBloco("", terceiro, id(k), nullptr);
+    EXPECT_EQ(terceiro.valorCampo("FAB"), "X2");
+    // No longer constant: the block gives no FAB at all.
+    fabricante->setInteger(70, 0, "AcDbAttributeDefinition");
+    CEItemLista quarto;
+    r->LeBloco("", quarto, id(q), nullptr);
+    EXPECT_FALSE(quarto.campos.contains("FAB"));
 }
 
 // A copy gives the item what reading the entity under the suffix gives it: the same fields,

@@ -59,6 +59,30 @@ TEST(ZVStringTest, SplitInTwoAndThreeLeaveOutputsAloneOnTheWrongCount) {
     EXPECT_EQ(QStringList({a, b, c}), QStringList({"x", "y", "z"}));
 }
 
+TEST(ZVStringTest, SplitInTwoDropsEmptyTokensAndAcceptsItselfAsOutput) {
+    QString a = "old-a", b = "old-b";
+    EXPECT_TRUE(ZVString("\f\fKEY\f\fSTD\f").DivideEmDois("\f", a, b));
+    EXPECT_EQ(a, "KEY");
+    EXPECT_EQ(b, "STD");
+    EXPECT_TRUE(ZVString("A;B").DivideEmDois("$;", a, b));
+    EXPECT_EQ(QStringList({a, b}), QStringList({"A", "B"}));
+    a = "old-a", b = "old-b";
+    EXPECT_FALSE(ZVString("").DivideEmDois("\f", a, b));
+    EXPECT_FALSE(ZVString("\f\f").DivideEmDois("\f", a, b));
+    EXPECT_FALSE(ZVString("a$b;c").DivideEmDois("$;", a, b));
+    EXPECT_EQ(QStringList({a, b}), QStringList({"old-a", "old-b"}));
+    // the text split into its own first part and another
+    ZVString texto("NOME\fVALOR");
+    QString valor;
+    EXPECT_TRUE(texto.DivideEmDois("\f", texto, valor));
+    EXPECT_EQ(texto, "NOME");
+    EXPECT_EQ(valor, "VALOR");
+    ZVString so("SO");
+    EXPECT_TRUE(so.DivideEmDois("\f", a, so));
+    EXPECT_EQ(a, "SO");
+    EXPECT_EQ(so, "");
+}
+
 TEST(ZVStringTest, PrefixNumbersAndHandles) {
     EXPECT_TRUE(ZVString("BORNE_X").ComecaCom("BORNE"));
     EXPECT_FALSE(ZVString("BOR").ComecaCom("BORNE"));
@@ -69,6 +93,12 @@ TEST(ZVStringTest, PrefixNumbersAndHandles) {
     EXPECT_EQ(ZVString::DeHandle(0x2AF), "2AF");
     EXPECT_EQ(ZVString("2af").ParaHandle(), 0x2AFu);
     EXPECT_EQ(ZVString("xyz").ParaHandle(), 0u);
+    EXPECT_EQ(ZVString("").ParaHandle(), 0u);
+    EXPECT_EQ(ZVString("12G").ParaHandle(), 0u);
+    EXPECT_EQ(ZVString("2AF#X1#BORNE").ParaHandle(), 0u);
+    EXPECT_EQ(ZVString("fFfFfFfFfFfFfFf").ParaHandle(), 0xFFFFFFFFFFFFFFFu);
+    EXPECT_EQ(ZVString("FFFFFFFFFFFFFFFF").ParaHandle(), 0xFFFFFFFFFFFFFFFFu);
+    EXPECT_EQ(ZVString(" 2AF ").ParaHandle(), 0x2AFu);
 }
 
 TEST(ZVStringTest, NaturalFormPadsShortDigitRunsOnly) {
