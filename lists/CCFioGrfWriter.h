@@ -44,4 +44,6 @@ protected:
     // Header, detail, first-row detail, footer, total.
     std::vector<CCListaPaginada::Bloco> blocos_;
     QHash<QString, Papel> papeis_;
+    // Per row block of the run, by name: whether it has function cells.
+    QHash<QString, bool> comFuncao_;
 };
