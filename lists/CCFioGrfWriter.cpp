@@ -71,12 +71,17 @@ std::vector<CEPaginaLista> CCFioGrfWriter::Diagrama(VetorItens& itens, CETemplat
     const bool comBranco = QuebraComBranco(modelo);
 
     std::vector<double> somas(size_t(totais.size()), 0.0);
+    // Rows repeat a few texts (a length, a quantity): each is read as a number once.
+    QHash<QString, double> numeros;
     for (int i = 0; i < n; ++i) {
         CEItemLista& item = *presentes[size_t(i)];
         for (int t = 0; t < totais.size(); ++t) {
             QString valor;
-            if (item.obterCampo(totais[t], valor))
-                somas[size_t(t)] += CETemplateLisp::TextoParaReal(valor);
+            if (!item.obterCampo(totais[t], valor)) continue;
+            auto numero = numeros.constFind(valor);
+            if (numero == numeros.constEnd())
+                numero = numeros.insert(valor, CETemplateLisp::TextoParaReal(valor));
+            somas[size_t(t)] += numero.value();
         }
         grade.Coloca(paginas.back(), &item);
         if (i + 1 < n) {
@@ -167,7 +172,7 @@ void CCFioGrfWriter::InsereLinha(const CCListaPaginada::Bloco& bloco, const QStr
             case Papel::Variavel: {
                 QString texto = item.valorCampo(padrao);
                 if (comprimento.isEmpty() || texto != comprimento) return texto;
-                if (!impresso) impresso = ComprimentoImpresso(comprimento, digitos_);
+                if (!impresso) impresso = Impresso(comprimento);
                 return *impresso;
             }
             case Papel::Total:
@@ -216,6 +221,13 @@ void CCFioGrfWriter::InsereLinha(const CCListaPaginada::Bloco& bloco, const QStr
                         {{1000, ZVString::DeHandle(item.ids.front().handle())}});
 }
 
+const QString& CCFioGrfWriter::Impresso(const QString& comprimento) {
+    auto achado = impressos_.constFind(comprimento);
+    if (achado == impressos_.constEnd())
+        achado = impressos_.insert(comprimento, ComprimentoImpresso(comprimento, digitos_));
+    return achado.value();
+}
+
 void CCFioGrfWriter::EscrevePagina(const CEPaginaLista& pagina) {
     // The first-row block is imported for the template's sake, never placed.
     for (const CELinhaLista& linha : pagina.linhas)
@@ -224,6 +236,7 @@ void CCFioGrfWriter::EscrevePagina(const CEPaginaLista& pagina) {
 
 void CCFioGrfWriter::EscreverItens(VetorItens& itens, CETemplate& modelo) {
     comFuncao_.clear();
+    impressos_.clear();
     grupo_ = modelo.LerTexto("FUNCAO_LSTGRW");
     variasColunas_ = modelo.LerLogico("*COLUNA_SN*");
     digitos_ = CICad::GetIntLisp("PBLINTFIODGTSAFTERDOT", 0);

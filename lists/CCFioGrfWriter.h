@@ -46,4 +46,7 @@ protected:
     QHash<QString, Papel> papeis_;
     // Per row block of the run, by name: whether it has function cells.
     QHash<QString, bool> comFuncao_;
+    // A length's printed form with the run's digits; rows repeat a few lengths.
+    const QString& Impresso(const QString& comprimento);
+    QHash<QString, QString> impressos_;
 };

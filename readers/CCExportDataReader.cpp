@@ -48,8 +48,8 @@ const NomesRelacao& Nomes(const QString& sufixo) {
 }
 
 bool EhBorne(const QString& nomeBloco) {
-    const QString nome = nomeBloco.toUpper();
-    return nome.startsWith("BORNE") || nome.startsWith("BOR-");
+    return nomeBloco.startsWith(QLatin1String("BORNE"), Qt::CaseInsensitive) ||
+           nomeBloco.startsWith(QLatin1String("BOR-"), Qt::CaseInsensitive);
 }
 
 // The exports read without a template: the readers they borrow ask it for separators,
@@ -173,17 +173,19 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
     LePinos(database, modelo);
     ladosAdiados_ = false;
     std::vector<CEItemLista*> bornes;
+    static const QString kTipo = QStringLiteral("ZV_LISTA_TIPO"), kBorne = QStringLiteral("BORNE"),
+                         kComp = QStringLiteral("COMP"), kHandle = QStringLiteral("HANDLE");
     for (CEItemLista* item : resultado_) {
         if (!item) continue;
-        if (item->valorCampo("ZV_LISTA_TIPO").isEmpty()) {
+        if (item->valorCampo(kTipo).isEmpty()) {
             const bool borne = !item->ids.empty() && CICad::EhReferencia(item->ids.front()) &&
                                EhBorne(CICad::GetNomeBloco(item->ids.front()));
-            item->definirCampo("ZV_LISTA_TIPO", borne ? "BORNE" : "COMP");
+            item->definirCampo(kTipo, borne ? kBorne : kComp);
             if (borne) bornes.push_back(item);
         }
-        if (item->valorCampo("ZV_LISTA_TIPO") == "COMP") {
+        if (item->valorCampo(kTipo) == kComp) {
             const QString relacao = Primeiro(*item, Nomes(QString()).relacoes);
-            const QString handle = item->valorCampo("HANDLE");
+            const QString handle = item->valorCampo(kHandle);
             if (!relacao.isEmpty() && !handle.isEmpty() && !relacoesComponentes_.contains(relacao))
                 relacoesComponentes_.insert(relacao, handle);
         }
@@ -262,7 +264,6 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
     const QString segundo =
         inicio == invertido ? QStringLiteral("_SEGFIM") : QStringLiteral("_SEGINI");
     const QString proprio = ZVString::DeHandle(entidade.handle());
-    const QString layer = CICad::GetLayerEntidade(entidade);
     const bool doBorne = !item.ids.empty() && item.ids.front() == entidade;
 
     CEPonto ponto, outro;
@@ -320,7 +321,7 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
     if (lado) {
         CCBorneDataReader::LeFiosLado(*this, item, entidade, *lado, inicio, modelo);
     } else {
-        const OdDbObjectId fioOutro = FioNoPonto(layer, outro);
+        const OdDbObjectId fioOutro = FioNoPonto(CICad::GetLayerEntidade(entidade), outro);
         if (!fioOutro.isNull())
             CopiaAtributos(segundo, item, ZVString::DeHandle(fioOutro.handle()));
     }
@@ -333,10 +334,10 @@ void CCExportDataReader::CopiaAtributos(const QString& sufixo, CEItemLista& item
     QString alvo = handle;
     const OdDbObjectId id = CICad::IdDoHandle(handle);
     if (id.isNull()) return;
-    const QString nome = CICad::GetNomeBloco(id).toUpper();
+    const QString nome = CICad::GetNomeBloco(id);
     // A contact or a terminal speaks for its component, when the reader listed it.
     for (const char* prefixo : {"NA-", "NF-", "BT-", "NAF-", "BOR-"}) {
-        if (!nome.startsWith(prefixo)) continue;
+        if (!nome.startsWith(QLatin1String(prefixo), Qt::CaseInsensitive)) continue;
         for (int idioma = 1; idioma <= 3; ++idioma) {
             const std::unique_ptr<zv::CEAtributo> relacao =
                 CICad::GetAtributo(CICad::TagTraduzida(CampoTraduzido::Relacao, idioma), id);
@@ -347,7 +348,7 @@ void CCExportDataReader::CopiaAtributos(const QString& sufixo, CEItemLista& item
         }
         break;
     }
-    const OdDbObjectId final = CICad::IdDoHandle(alvo);
+    const OdDbObjectId final = alvo == handle ? id : CICad::IdDoHandle(alvo);
     if (!final.isNull()) CopiaEntidade(sufixo, item, final, nullptr);
 }
 

@@ -131,4 +131,30 @@ TEST_F(WireRowsTest, EveryCellIsFilledFromItsRowAndABlockThatGainsAFunctionRunsI
                                      "VARIAVEL_1=3 FUNCAO_1=F3 VARIAVEL_2="}));
 }
 
+TEST_F(WireRowsTest, RowsOfOneLengthPrintItAlikeAndTheNextListTakesTheDigitsSetSince) {
+    const CEItemLista* primeiro = Fio("1", "12.5");
+    Fio("2", "12.5");
+    Fio("3", "7.25");
+    CICad::SetIntLisp("PBLINTFIODGTSAFTERDOT", 0);
+    const QString sem = CCFioGrfWriter::ValorVariavel(*primeiro, "COMPRIMENTO", 0);
+    const QString com = CCFioGrfWriter::ValorVariavel(*primeiro, "COMPRIMENTO", 3);
+    const QString outro = CCFioGrfWriter::ValorVariavel(*itens_[2], "COMPRIMENTO", 3);
+    ASSERT_NE(sem, com);
+    CCFioGrfWriter escritor;
+    escritor.EscreverItens(itens_, modelo_);
+    QStringList linhas = Linhas();
+    ASSERT_EQ(linhas.size(), 3);
+    EXPECT_TRUE(linhas[0].contains(" VARIAVEL_2=" + sem + " ")) << linhas[0].toStdString();
+    EXPECT_TRUE(linhas[1].contains(" VARIAVEL_2=" + sem + " ")) << linhas[1].toStdString();
+
+    CICad::SetIntLisp("PBLINTFIODGTSAFTERDOT", 3);
+    ui_->setAnswer("question:89", "yes");
+    escritor.EscreverItens(itens_, modelo_);
+    linhas = Linhas();
+    ASSERT_EQ(linhas.size(), 3);
+    EXPECT_EQ(linhas, QStringList({"VARIAVEL_1=1 VARIAVEL_2=" + com + " ROTULO=fixo",
+                                   "VARIAVEL_1=2 VARIAVEL_2=" + com + " ROTULO=fixo",
+                                   "VARIAVEL_1=3 VARIAVEL_2=" + outro + " ROTULO=fixo"}));
+}
+
 }  // namespace
