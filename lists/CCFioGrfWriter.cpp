@@ -71,12 +71,17 @@ std::vector<CEPaginaLista> CCFioGrfWriter::Diagrama(VetorItens& itens, CETemplat
     const bool comBranco = QuebraComBranco(modelo);
 
     std::vector<double> somas(size_t(totais.size()), 0.0);
+    // Rows repeat a few texts (a length, a quantity): each is read as a number once.
+    QHash<QString, double> numeros;
     for (int i = 0; i < n; ++i) {
         CEItemLista& item = *presentes[size_t(i)];
         for (int t = 0; t < totais.size(); ++t) {
             QString valor;
-            if (item.obterCampo(totais[t], valor))
-                somas[size_t(t)] += CETemplateLisp::TextoParaReal(valor);
+            if (!item.obterCampo(totais[t], valor)) continue;
+            auto numero = numeros.constFind(valor);
+            if (numero == numeros.constEnd())
+                numero = numeros.insert(valor, CETemplateLisp::TextoParaReal(valor));
+            somas[size_t(t)] += numero.value();
         }
         grade.Coloca(paginas.back(), &item);
         if (i + 1 < n) {
@@ -155,47 +160,72 @@ CCFioGrfWriter::Papel CCFioGrfWriter::PapelDoTag(const QString& tag) {
 void CCFioGrfWriter::InsereLinha(const CCListaPaginada::Bloco& bloco, const QString& layer,
                                  const CELinhaLista& linha) {
     if (!bloco.existe() || !linha.item) return;
-    const OdDbObjectId ref =
-        CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, linha.x, linha.y, 0, 0);
-    if (ref.isNull()) return;
-    std::unique_ptr<zv::CEListaAtributos> atributos;
-    CICad::GetAtributos(ref, atributos, false, false);
     static const QString kComprimento = QStringLiteral("COMPRIMENTO");
     const CEItemLista& item = *linha.item;
     // What ValorVariavel gives, with the length's text and its printed form found once for
     // the row's cells.
     const QString comprimento = item.valorCampo(kComprimento);
     std::optional<QString> impresso;
-    bool publicado = false;
-    for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
-        zv::CEAtributo& atributo = (*atributos)[i];
-        switch (PapelDoTag(atributo.GetTag())) {
+    // A cell's value from its role and its default text; none leaves the cell as it is.
+    const auto valor = [&](Papel papel, const QString& padrao) -> std::optional<QString> {
+        switch (papel) {
             case Papel::Variavel: {
-                const QString valor = item.valorCampo(atributo.GetValor());
-                if (comprimento.isEmpty() || valor != comprimento) {
-                    atributo.SetValor(valor);
-                } else {
-                    if (!impresso) impresso = ComprimentoImpresso(comprimento, digitos_);
-                    atributo.SetValor(*impresso);
-                }
-                break;
+                QString texto = item.valorCampo(padrao);
+                if (comprimento.isEmpty() || texto != comprimento) return texto;
+                if (!impresso) impresso = Impresso(comprimento);
+                return *impresso;
             }
-            case Papel::Funcao:
-                if (!publicado) item.paraLisp();
-                publicado = true;
-                atributo.SetValor(CCListaPaginada::AvaliaFuncao(atributo.GetValor()));
-                break;
             case Papel::Total:
-                atributo.SetValor(item.valorCampo(atributo.GetValor()));
-                break;
+                return item.valorCampo(padrao);
+            case Papel::Funcao:
             case Papel::Outro:
                 break;
         }
+        return std::nullopt;
+    };
+    OdDbObjectId ref;
+    const auto conhecido = comFuncao_.constFind(bloco.nome);
+    if (conhecido != comFuncao_.constEnd() && !conhecido.value()) {
+        // A block without functions gets its cells' values as its attributes are made,
+        // instead of being read back and written again.
+        ref = CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, linha.x, linha.y, 0, 0,
+                                 [&](const QString& tag, const QString& padrao) {
+                                     return valor(PapelDoTag(tag), padrao);
+                                 });
+        if (ref.isNull()) return;
+    } else {
+        // Functions run with the row's attributes in the drawing, each in its turn, so a
+        // block that has them is filled after it is placed; the first row of a block tells
+        // which kind it is.
+        ref = CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, linha.x, linha.y, 0, 0);
+        if (ref.isNull()) return;
+        std::unique_ptr<zv::CEListaAtributos> atributos;
+        CICad::GetAtributos(ref, atributos, false, false);
+        bool publicado = false;
+        for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
+            zv::CEAtributo& atributo = (*atributos)[i];
+            const Papel papel = PapelDoTag(atributo.GetTag());
+            if (papel == Papel::Funcao) {
+                if (!publicado) item.paraLisp();
+                publicado = true;
+                atributo.SetValor(CCListaPaginada::AvaliaFuncao(atributo.GetValor()));
+            } else if (const std::optional<QString> texto = valor(papel, atributo.GetValor())) {
+                atributo.SetValor(*texto);
+            }
+        }
+        if (publicado) CEItemLista::limparLisp();
+        if (atributos) comFuncao_.insert(bloco.nome, publicado);
     }
-    if (publicado) CEItemLista::limparLisp();
     if (!variasColunas_ && !item.ids.empty() && !item.ids.front().isNull())
         CICad::SetXData(ref, "KVR_ZV_LINK",
                         {{1000, ZVString::DeHandle(item.ids.front().handle())}});
+}
+
+const QString& CCFioGrfWriter::Impresso(const QString& comprimento) {
+    auto achado = impressos_.constFind(comprimento);
+    if (achado == impressos_.constEnd())
+        achado = impressos_.insert(comprimento, ComprimentoImpresso(comprimento, digitos_));
+    return achado.value();
 }
 
 void CCFioGrfWriter::EscrevePagina(const CEPaginaLista& pagina) {
@@ -205,6 +235,8 @@ void CCFioGrfWriter::EscrevePagina(const CEPaginaLista& pagina) {
 }
 
 void CCFioGrfWriter::EscreverItens(VetorItens& itens, CETemplate& modelo) {
+    comFuncao_.clear();
+    impressos_.clear();
     grupo_ = modelo.LerTexto("FUNCAO_LSTGRW");
     variasColunas_ = modelo.LerLogico("*COLUNA_SN*");
     digitos_ = CICad::GetIntLisp("PBLINTFIODGTSAFTERDOT", 0);

@@ -19,17 +19,37 @@ constexpr const char* kRelacoes[3] = {"RELACAO", "TAG", "ETIQUETA"};
 constexpr const char* kReguas[3] = {"REGUA", "STRIP", "REGLETA"};
 constexpr const char* kNumeros[3] = {"NUMERO", "NUMBER", "NUMERO"};
 
-QString Primeiro(const CEItemLista& item, const char* const (&nomes)[3], const QString& sufixo) {
-    for (const char* nome : nomes) {
-        const QString valor = item.valorCampo(nome + sufixo);
-        if (!valor.isEmpty()) return valor;
+QString Primeiro(const CEItemLista& item, const std::array<QString, 3>& nomes) {
+    for (const QString& nome : nomes) {
+        const QString* valor = item.campo(nome);
+        if (valor && !valor->isEmpty()) return *valor;
     }
     return {};
 }
 
+// The names an end's relation reads and writes under one suffix, made once: every terminal
+// side and wire end composes one.
+struct NomesRelacao {
+    QString rel, lig, handle;
+    std::array<QString, 3> relacoes, reguas, numeros;
+};
+
+const NomesRelacao& Nomes(const QString& sufixo) {
+    static QHash<QString, NomesRelacao> porSufixo;
+    auto achado = porSufixo.constFind(sufixo);
+    if (achado != porSufixo.constEnd()) return achado.value();
+    NomesRelacao n{"REL" + sufixo, "LIG" + sufixo, "HANDLE" + sufixo, {}, {}, {}};
+    for (size_t i = 0; i < 3; ++i) {
+        n.relacoes[i] = kRelacoes[i] + sufixo;
+        n.reguas[i] = kReguas[i] + sufixo;
+        n.numeros[i] = kNumeros[i] + sufixo;
+    }
+    return porSufixo.insert(sufixo, n).value();
+}
+
 bool EhBorne(const QString& nomeBloco) {
-    const QString nome = nomeBloco.toUpper();
-    return nome.startsWith("BORNE") || nome.startsWith("BOR-");
+    return nomeBloco.startsWith(QLatin1String("BORNE"), Qt::CaseInsensitive) ||
+           nomeBloco.startsWith(QLatin1String("BOR-"), Qt::CaseInsensitive);
 }
 
 // The exports read without a template: the readers they borrow ask it for separators,
@@ -72,6 +92,20 @@ VetorItens* CCExportDataReader::Le(zvdb::Database* database, CETemplate* modelo,
     Q_UNUSED(flag);
     Q_UNUSED(paginas);
     if (!database) return nullptr;
+    // The composition kept for the read is dropped when it ends, so later calls read afresh.
+    struct Leitura {
+        CCExportDataReader& leitor;
+        explicit Leitura(CCExportDataReader& l) : leitor(l) { Limpa(); }
+        ~Leitura() { Limpa(); }
+        void Limpa() {
+            leitor.lendo_ = false;
+            leitor.composicao_.reset();
+            leitor.modeloComposicao_ = nullptr;
+        }
+        Leitura(const Leitura&) = delete;
+        Leitura& operator=(const Leitura&) = delete;
+    } leitura(*this);
+    lendo_ = true;
     ModeloExportacao padrao;
     CETemplate& usado = modelo ? *modelo : padrao;
     auto* itens = new VetorItens;
@@ -139,17 +173,19 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
     LePinos(database, modelo);
     ladosAdiados_ = false;
     std::vector<CEItemLista*> bornes;
+    static const QString kTipo = QStringLiteral("ZV_LISTA_TIPO"), kBorne = QStringLiteral("BORNE"),
+                         kComp = QStringLiteral("COMP"), kHandle = QStringLiteral("HANDLE");
     for (CEItemLista* item : resultado_) {
         if (!item) continue;
-        if (item->valorCampo("ZV_LISTA_TIPO").isEmpty()) {
+        if (item->valorCampo(kTipo).isEmpty()) {
             const bool borne = !item->ids.empty() && CICad::EhReferencia(item->ids.front()) &&
                                EhBorne(CICad::GetNomeBloco(item->ids.front()));
-            item->definirCampo("ZV_LISTA_TIPO", borne ? "BORNE" : "COMP");
+            item->definirCampo(kTipo, borne ? kBorne : kComp);
             if (borne) bornes.push_back(item);
         }
-        if (item->valorCampo("ZV_LISTA_TIPO") == "COMP") {
-            const QString relacao = Primeiro(*item, kRelacoes, QString());
-            const QString handle = item->valorCampo("HANDLE");
+        if (item->valorCampo(kTipo) == kComp) {
+            const QString relacao = Primeiro(*item, Nomes(QString()).relacoes);
+            const QString handle = item->valorCampo(kHandle);
             if (!relacao.isEmpty() && !handle.isEmpty() && !relacoesComponentes_.contains(relacao))
                 relacoesComponentes_.insert(relacao, handle);
         }
@@ -228,7 +264,6 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
     const QString segundo =
         inicio == invertido ? QStringLiteral("_SEGFIM") : QStringLiteral("_SEGINI");
     const QString proprio = ZVString::DeHandle(entidade.handle());
-    const QString layer = CICad::GetLayerEntidade(entidade);
     const bool doBorne = !item.ids.empty() && item.ids.front() == entidade;
 
     CEPonto ponto, outro;
@@ -277,8 +312,8 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
         if (atributo) ligacao = atributo->GetValor();
         // The relation the wire reader composed for this end is no field of the object:
         // a terminal, which has no relation, is told by its strip and number instead.
-        for (const char* nome : kRelacoes)
-            item.definirCampo(nome + sufixo, QString());
+        for (const QString& nome : Nomes(sufixo).relacoes)
+            item.definirCampo(nome, QString());
         CopiaAtributos(sufixo, item, conectado);
     }
     // The wire at the terminal's other point; a terminal's side reads the wires of both its
@@ -286,7 +321,7 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
     if (lado) {
         CCBorneDataReader::LeFiosLado(*this, item, entidade, *lado, inicio, modelo);
     } else {
-        const OdDbObjectId fioOutro = FioNoPonto(layer, outro);
+        const OdDbObjectId fioOutro = FioNoPonto(CICad::GetLayerEntidade(entidade), outro);
         if (!fioOutro.isNull())
             CopiaAtributos(segundo, item, ZVString::DeHandle(fioOutro.handle()));
     }
@@ -299,10 +334,10 @@ void CCExportDataReader::CopiaAtributos(const QString& sufixo, CEItemLista& item
     QString alvo = handle;
     const OdDbObjectId id = CICad::IdDoHandle(handle);
     if (id.isNull()) return;
-    const QString nome = CICad::GetNomeBloco(id).toUpper();
+    const QString nome = CICad::GetNomeBloco(id);
     // A contact or a terminal speaks for its component, when the reader listed it.
     for (const char* prefixo : {"NA-", "NF-", "BT-", "NAF-", "BOR-"}) {
-        if (!nome.startsWith(prefixo)) continue;
+        if (!nome.startsWith(QLatin1String(prefixo), Qt::CaseInsensitive)) continue;
         for (int idioma = 1; idioma <= 3; ++idioma) {
             const std::unique_ptr<zv::CEAtributo> relacao =
                 CICad::GetAtributo(CICad::TagTraduzida(CampoTraduzido::Relacao, idioma), id);
@@ -313,34 +348,45 @@ void CCExportDataReader::CopiaAtributos(const QString& sufixo, CEItemLista& item
         }
         break;
     }
-    const OdDbObjectId final = CICad::IdDoHandle(alvo);
+    const OdDbObjectId final = alvo == handle ? id : CICad::IdDoHandle(alvo);
     if (!final.isNull()) CopiaEntidade(sufixo, item, final, nullptr);
+}
+
+CCExportDataReader::Composicao CCExportDataReader::LeComposicao(CETemplate* modelo) {
+    Composicao c;
+    if (modelo) {
+        c.sep = modelo->LerTexto("*CHAR_SEP_STD_CFG*");
+        c.relacaoPrimeiro = modelo->LerTexto("*ORDEM_CONCAT_STD*") == "1";
+    } else {
+        c.sep = CICad::GetStringLisp("*EXPORT_CHAR_SEP*");
+        c.relacaoPrimeiro = CICad::GetStringLisp("*EXPORT_ORDEM_REL*") == "1";
+    }
+    return c;
 }
 
 void CCExportDataReader::CompoeRelacao(const QString& sufixo, CEItemLista& item, CETemplate* modelo,
                                        const QString& ligacao, const QString& handle) {
-    const QString r = Primeiro(item, kRelacoes, sufixo);
-    const QString a = Primeiro(item, kReguas, sufixo);
-    const QString n = Primeiro(item, kNumeros, sufixo);
+    const NomesRelacao& nomes = Nomes(sufixo);
+    const QString r = Primeiro(item, nomes.relacoes);
+    const QString a = Primeiro(item, nomes.reguas);
+    const QString n = Primeiro(item, nomes.numeros);
     const QString& g = ligacao;
-    QString sep, ordem;
-    if (modelo) {
-        sep = modelo->LerTexto("*CHAR_SEP_STD_CFG*");
-        ordem = modelo->LerTexto("*ORDEM_CONCAT_STD*");
-    } else {
-        sep = CICad::GetStringLisp("*EXPORT_CHAR_SEP*");
-        ordem = CICad::GetStringLisp("*EXPORT_ORDEM_REL*");
+    // Within a read the separator and order are read once for its template.
+    if (lendo_ && (!composicao_ || modeloComposicao_ != modelo)) {
+        composicao_ = LeComposicao(modelo);
+        modeloComposicao_ = modelo;
     }
-    const bool relacaoPrimeiro = ordem == "1";
-    item.definirCampo("REL" + sufixo, !r.isEmpty() ? r : a + sep + n);
-    item.definirCampo("LIG" + sufixo, g);
-    if (!handle.isEmpty()) item.definirCampo("HANDLE" + sufixo, handle);
-    for (const char* campo : kRelacoes) {
-        if (!g.isEmpty())
-            item.definirCampo(campo + sufixo, relacaoPrimeiro ? r + sep + g : g + sep + r);
+    const Composicao composicao = lendo_ ? *composicao_ : LeComposicao(modelo);
+    const QString& sep = composicao.sep;
+    const bool relacaoPrimeiro = composicao.relacaoPrimeiro;
+    item.definirCampo(nomes.rel, !r.isEmpty() ? r : a + sep + n);
+    item.definirCampo(nomes.lig, g);
+    if (!handle.isEmpty()) item.definirCampo(nomes.handle, handle);
+    for (const QString& campo : nomes.relacoes) {
+        if (!g.isEmpty()) item.definirCampo(campo, relacaoPrimeiro ? r + sep + g : g + sep + r);
         // A terminal has no relation of its own: strip and number stand for it.
         if (!a.isEmpty() && !n.isEmpty() && r.isEmpty())
-            item.definirCampo(campo + sufixo, relacaoPrimeiro ? a + sep + n : n + sep + a);
+            item.definirCampo(campo, relacaoPrimeiro ? a + sep + n : n + sep + a);
     }
 }
 

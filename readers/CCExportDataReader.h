@@ -63,4 +63,14 @@ private:
     // every component is known.
     bool ladosAdiados_ = false;
     QString PaginasOpcao() const;
+    // The relation's separator and order, of the template or of the export settings.
+    struct Composicao {
+        QString sep;
+        bool relacaoPrimeiro = false;
+    };
+    static Composicao LeComposicao(CETemplate* modelo);
+    // While a read runs, the composition of the template last asked for: every end asks.
+    bool lendo_ = false;
+    std::optional<Composicao> composicao_;
+    CETemplate* modeloComposicao_ = nullptr;
 };

@@ -206,8 +206,13 @@ void CCFioDataReader::PreencheExtremidade(const QString& lado, CEItemLista& item
                          kSufixoFim = QStringLiteral("_FIM");
     const QString& sufixo = lado == kIni ? kSufixoIni : kSufixoFim;
     CopiaEntidade(sufixo, item, CICad::IdDoHandle(elementos.value(indice)), modelo);
-    LeSegmentoNoIndice(lado, item, indice, modelo);
-    CompoeExtremidade(sufixo, item, modelo, indice);
+    // The wire's number, asked by both parts below: an element's fields copied under the
+    // suffix never hold a field of the wire without one.
+    const QString campo = CampoFio(item);
+    if (campo.isEmpty()) return;
+    const QString numero = item.valorCampo(campo);
+    LeSegmentoNoIndice(lado, item, numero, indice, modelo);
+    CompoeExtremidade(sufixo, item, modelo, numero, indice);
 }
 
 VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, CETemplate* modelo,
@@ -378,25 +383,30 @@ void CCFioDataReader::LeSegmento(const QString& lado, CEItemLista& item, const Q
     if (!fio.isNull()) CopiaEntidade("_SEG" + lado, item, fio, modelo);
 }
 
-void CCFioDataReader::LeSegmentoNoIndice(const QString& lado, CEItemLista& item, int indice,
-                                         CETemplate* modelo) {
-    const QString campo = CampoFio(item);
-    if (campo.isEmpty()) return;
-    const QString numero = item.valorCampo(campo);
+void CCFioDataReader::LeSegmentoNoIndice(const QString& lado, CEItemLista& item,
+                                         const QString& numero, int indice, CETemplate* modelo) {
+    static const QString kIni = QStringLiteral("INI"), kLayerIni = QStringLiteral("LAYER_INI"),
+                         kLayerFim = QStringLiteral("LAYER_FIM"),
+                         kSegIni = QStringLiteral("_SEGINI"), kSegFim = QStringLiteral("_SEGFIM");
+    const bool ini = lado == kIni;
     const int lugar = PrimeiroLugar(numero, indice);
     const std::vector<CEPonto>* pontos = PontosConexao(numero);
     const CEPonto ponto = pontos && lugar >= 0 && size_t(lugar) < pontos->size()
                               ? (*pontos)[size_t(lugar)]
                               : CEPonto{};
-    const OdDbObjectId fio = FioNoPonto(item.valorCampo("LAYER_" + lado), ponto);
-    if (!fio.isNull()) CopiaEntidade("_SEG" + lado, item, fio, modelo);
+    const OdDbObjectId fio = FioNoPonto(item.valorCampo(ini ? kLayerIni : kLayerFim), ponto);
+    if (!fio.isNull()) CopiaEntidade(ini ? kSegIni : kSegFim, item, fio, modelo);
 }
 
 void CCFioDataReader::CompoeExtremidade(const QString& sufixo, CEItemLista& item,
                                         CETemplate* modelo, int indice) {
     const QString campo = CampoFio(item);
-    if (campo.isEmpty()) return;
-    const std::optional<QString> valor = Ligacao(item.valorCampo(campo), indice);
+    if (!campo.isEmpty()) CompoeExtremidade(sufixo, item, modelo, item.valorCampo(campo), indice);
+}
+
+void CCFioDataReader::CompoeExtremidade(const QString& sufixo, CEItemLista& item,
+                                        CETemplate* modelo, const QString& numero, int indice) {
+    const std::optional<QString> valor = Ligacao(numero, indice);
     std::unique_ptr<zv::CEAtributo> ligacao;
     if (valor)
         ligacao =

@@ -35,6 +35,9 @@ public:
     // The relation texts of the end at `indice` of the wire's connection list.
     void CompoeExtremidade(const QString& sufixo, CEItemLista& item, CETemplate* modelo,
                            int indice);
+    // The same for the wire of that number.
+    void CompoeExtremidade(const QString& sufixo, CEItemLista& item, CETemplate* modelo,
+                           const QString& numero, int indice);
     // REL, LIG and the three relation fields of one end: a pin, a terminal or any other
     // element, in this order of tests.
     void ComporRelacaoFio(const QString& sufixo, CEItemLista& item, CETemplate* modelo,
@@ -85,7 +88,8 @@ private:
     int PrimeiroLugar(const QString& numero, int indice);
     // The fields of the wire polyline at the point of the entry at `indice`: what LeSegmento
     // gives for that entry's full text.
-    void LeSegmentoNoIndice(const QString& lado, CEItemLista& item, int indice, CETemplate* modelo);
+    void LeSegmentoNoIndice(const QString& lado, CEItemLista& item, const QString& numero,
+                            int indice, CETemplate* modelo);
     // The value of the connection attribute of the wire's entry at `indice` nearest the
     // entry's point; null when the element has none. Each end is asked twice (its texts and
     // its length): answered once.
@@ -115,7 +119,6 @@ private:
     CETemplate* modeloComposicao_ = nullptr;
     // A walk's state, set up at its start and dropped at its end.
     class Caminhada;
-
     // Lengths already measured, by wire key and the two points.
     struct Medida {
         QString chave;

@@ -258,13 +258,17 @@ void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const QStringLi
             LigacaoProxima(chave, a1, trecho.inicio, pontoDe(trecho.inicio)).value_or(QString());
         const QString r2 =
             LigacaoProxima(chave, a2, trecho.fim, pontoDe(trecho.fim)).value_or(QString());
+        static const QString kRelIni = QStringLiteral("REL_INI"),
+                             kRelFim = QStringLiteral("REL_FIM"),
+                             kLength = QStringLiteral("LENGTH"),
+                             kComprimento = QStringLiteral("COMPRIMENTO");
         CEPonto inicio, fim;
-        posicao(a1, r1, item.valorCampo("REL_INI"), inicio);
-        posicao(a2, r2, item.valorCampo("REL_FIM"), fim);
+        posicao(a1, r1, item.valorCampo(kRelIni), inicio);
+        posicao(a2, r2, item.valorCampo(kRelFim), fim);
         if (!item.temCampo(campo)) continue;
         const QString comprimento = ComprimentoFio(chave, inicio, fim);
-        item.definirCampo("LENGTH", comprimento);
-        item.definirCampo("COMPRIMENTO", comprimento);
+        item.definirCampo(kLength, comprimento);
+        item.definirCampo(kComprimento, comprimento);
     }
 }
 

@@ -52,25 +52,52 @@ OdDbObjectId CCBorneDwgWriter::Insere(const Bloco& bloco, const QString& layer, 
     return CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, x, y, 0, 0);
 }
 
-void CCBorneDwgWriter::Preenche(const OdDbObjectId& referencia, const CEItemLista& item) {
-    if (referencia.isNull()) return;
+namespace {
+
+// The value of an attribute that is no function: a VARIAVEL names the field in its default
+// text, any other tag is the field's own name.
+QString ValorCampo(const CEItemLista& item, const QString& tag, const QString& padrao) {
+    return item.valorCampo(ComecaCom(tag, "VARIAVEL", "VARIABLE") ? padrao : tag);
+}
+
+bool EhFuncao(const QString& tag) {
+    return ComecaCom(tag, "FUNCAO", "FUNCTION");
+}
+
+}  // namespace
+
+OdDbObjectId CCBorneDwgWriter::InserePreenchido(const Bloco& bloco, const QString& layer, double x,
+                                                double y, const CEItemLista& item) {
+    if (!bloco.existe()) return {};
+    const auto conhecido = comFuncao_.constFind(bloco.nome);
+    if (conhecido != comFuncao_.constEnd() && !conhecido.value())
+        // A block without functions gets the item's values as its attributes are made,
+        // instead of being read back and written again.
+        return CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, x, y, 0, 0,
+                                  [&item](const QString& tag, const QString& padrao) {
+                                      return std::optional<QString>(ValorCampo(item, tag, padrao));
+                                  });
+    // Functions run with the block's attributes in the drawing, each in its turn, so a block
+    // that has them is filled after it is placed; its first insertion tells which kind it is.
+    const OdDbObjectId referencia = Insere(bloco, layer, x, y);
+    if (referencia.isNull()) return referencia;
     std::unique_ptr<zv::CEListaAtributos> atributos;
     CICad::GetAtributos(referencia, atributos, false, false);
     bool publicado = false;
     for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
         zv::CEAtributo& atributo = (*atributos)[i];
         const QString tag = atributo.GetTag();
-        if (ComecaCom(tag, "FUNCAO", "FUNCTION")) {
+        if (EhFuncao(tag)) {
             if (!publicado) item.paraLisp();
             publicado = true;
             atributo.SetValor(CCListaPaginada::AvaliaFuncao(atributo.GetValor()));
-        } else if (ComecaCom(tag, "VARIAVEL", "VARIABLE")) {
-            atributo.SetValor(item.valorCampo(atributo.GetValor()));
         } else {
-            atributo.SetValor(item.valorCampo(tag));
+            atributo.SetValor(ValorCampo(item, tag, atributo.GetValor()));
         }
     }
     if (publicado) CEItemLista::limparLisp();
+    if (atributos) comFuncao_.insert(bloco.nome, publicado);
+    return referencia;
 }
 
 void CCBorneDwgWriter::DesenhaRegua(const CEReguaDwg& regua, const QString& layer) {
@@ -87,7 +114,7 @@ void CCBorneDwgWriter::DesenhaRegua(const CEReguaDwg& regua, const QString& laye
         const double k = detalhe.quantidade;
         CEItemLista campos;
         campos.campos = detalhe.campos;
-        Preenche(Insere(detalhe_, layer, c + k * passo_ * 0.5 - passo_ * 0.5, regua.y), campos);
+        InserePreenchido(detalhe_, layer, c + k * passo_ * 0.5 - passo_ * 0.5, regua.y, campos);
         contagem += detalhe.quantidade;
         if (contagem < limite) Insere(traco_, layer, c + k * passo_ - passo_ * 0.5, regua.y);
         c += k * passo_;
@@ -95,7 +122,7 @@ void CCBorneDwgWriter::DesenhaRegua(const CEReguaDwg& regua, const QString& laye
 
     double x = regua.x;
     for (const CEBorneDwg* borne : regua.bornes) {
-        Preenche(Insere(borne_, layer, x, regua.y), *borne->item);
+        InserePreenchido(borne_, layer, x, regua.y, *borne->item);
         for (size_t i = 0; i < borne->trilhas.size(); ++i) {
             const std::int32_t estado = borne->trilhas[i];
             if (estado > 0 && estado < 5)
@@ -107,10 +134,9 @@ void CCBorneDwgWriter::DesenhaRegua(const CEReguaDwg& regua, const QString& laye
     x = regua.x;
     for (const CESimboloDwg* simbolo : regua.Simbolos()) {
         if (simbolo) {
-            const OdDbObjectId ref =
-                Insere(BlocoSimbolo(*simbolo->item), layer, x, regua.y - entreBornes_);
+            const OdDbObjectId ref = InserePreenchido(BlocoSimbolo(*simbolo->item), layer, x,
+                                                      regua.y - entreBornes_, *simbolo->item);
             if (!ref.isNull()) {
-                Preenche(ref, *simbolo->item);
                 CICad::SetXData(
                     ref, "KVR_ZV_REPRESENTACAO",
                     {{1000, representacao_}, {1000, simbolo->item->valorCampo("HANDLE")}});
@@ -124,13 +150,14 @@ void CCBorneDwgWriter::DesenhaSemBorne(const std::vector<CESimboloDwg*>& simbolo
                                        const QString& layer) {
     double x = 100;
     for (const CESimboloDwg* simbolo : simbolos) {
-        Preenche(Insere(BlocoSimbolo(*simbolo->item), layer, x, 100), *simbolo->item);
+        InserePreenchido(BlocoSimbolo(*simbolo->item), layer, x, 100, *simbolo->item);
         x += passoSemBorne_;
     }
 }
 
 void CCBorneDwgWriter::Escreve(VetorItens& itens, CETemplate& modelo) {
     modelo_ = CEModeloReguas();
+    comFuncao_.clear();
     const CEModeloReguas::Parametros parametros = CEModeloReguas::Parametros::DoModelo(modelo);
     modelo_.Constroi(itens);
     modelo_.CalculaTrilhas();

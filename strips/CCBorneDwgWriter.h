@@ -41,13 +41,19 @@ private:
     OdDbObjectId Insere(const Bloco& bloco, const QString& layer, double x, double y);
     void DesenhaRegua(const CEReguaDwg& regua, const QString& layer);
     void DesenhaSemBorne(const std::vector<CESimboloDwg*>& simbolos, const QString& layer);
-    static void Preenche(const OdDbObjectId& referencia, const CEItemLista& item);
+    // The block placed with its attributes filled from the item: functions evaluated with
+    // the item's fields, VARIAVEL cells from the field their text names, any other from the
+    // field of the tag's name. Null when the block has no file.
+    OdDbObjectId InserePreenchido(const Bloco& bloco, const QString& layer, double x, double y,
+                                  const CEItemLista& item);
 
     QString prefixo_;
     QString pastaRede_;
     CEModeloReguas modelo_;
     CECacheCatalogo catalogo_;
     QHash<QString, Bloco> blocosSimbolo_;
+    // Per block of the run, by name: whether it has function attributes.
+    QHash<QString, bool> comFuncao_;
 
     // The template's values of the run.
     QString norma_, representacao_;

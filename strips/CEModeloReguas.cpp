@@ -96,20 +96,23 @@ void CEModeloReguas::Monta(const VetorItens& itens, const Parametros& p) {
 }
 
 void CEModeloReguas::Constroi(const VetorItens& itens) {
+    static const QString kTipo = QStringLiteral("ZV_LISTA_TIPO"), kComp = QStringLiteral("COMP"),
+                         kBorne = QStringLiteral("BORNE"), kHandle = QStringLiteral("HANDLE");
     VetorItens componentes, terminais;
     for (CEItemLista* item : itens) {
         if (!item) continue;
-        const QString tipo = item->valorCampo("ZV_LISTA_TIPO");
-        if (tipo == "COMP")
+        const QString* tipo = item->campo(kTipo);
+        if (!tipo) continue;
+        if (*tipo == kComp)
             componentes.push_back(item);
-        else if (tipo == "BORNE")
+        else if (*tipo == kBorne)
             terminais.push_back(item);
     }
     componentes.ordenar({"RELACAO", "TAG", "ETIQUETA"});
     for (CEItemLista* item : componentes) {
         simbolos.push_back(std::make_unique<CESimboloDwg>(item));
         // The first symbol of a handle keeps it.
-        const QString handle = item->valorCampo("HANDLE");
+        const QString handle = item->valorCampo(kHandle);
         if (!simbolosPorHandle.contains(handle))
             simbolosPorHandle.insert(handle, simbolos.back().get());
     }
@@ -128,8 +131,10 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
         }
         regua->bornes.push_back(borne.get());
         borne->regua = regua;
-        for (const auto& [rel, handle] :
-             {std::pair{"REL_INI", "HANDLE_INI"}, std::pair{"REL_FIM", "HANDLE_FIM"}}) {
+        static const std::pair<QString, QString> kLados[] = {
+            {QStringLiteral("REL_INI"), QStringLiteral("HANDLE_INI")},
+            {QStringLiteral("REL_FIM"), QStringLiteral("HANDLE_FIM")}};
+        for (const auto& [rel, handle] : kLados) {
             if (item->valorCampo(rel).isEmpty()) continue;
             if (CESimboloDwg* simbolo = simbolosPorHandle.value(item->valorCampo(handle))) {
                 borne->ligados.push_back(simbolo);

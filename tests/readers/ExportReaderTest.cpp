@@ -183,6 +183,35 @@ TEST_F(ExportReaderTest, AWireNotInvertedHasTheTerminalsEndUnderFim) {
     EXPECT_EQ(fio1->valorCampo("HANDLE_INI"), handle(x1_));
 }
 
+TEST_F(ExportReaderTest, AReaderReadingAgainComposesWithTheSettingsOfTheNewRead) {
+    x1_ = borne("X1", "1", {20, 200, 0});
+    x2_ = borne("X1", "2", {60, 200, 0});
+    k1_ = componente("-K1", {{"A1", {20, 100, 0}}, {"A2", {60, 100, 0}}});
+    fio({{20, 190, 0}, {20, 100, 0}}, "1");
+    fio({{60, 190, 0}, {60, 100, 0}}, "2");
+    ASSERT_TRUE(lisp("(setq EXPORTA 2)"));
+    CCExportDataReader leitor;
+    // Both wires' terminal ends, as "wire=relation".
+    const auto relacoes = [&] {
+        std::unique_ptr<VetorItens> itens(leitor.Le(&db(), nullptr, true, std::nullopt));
+        QStringList texto;
+        for (const CEItemLista* item : *itens)
+            texto << item->valorCampo("FIO") + "=" + item->valorCampo("RELACAO_FIM");
+        texto.sort();
+        itens->destruirItens();
+        return texto;
+    };
+    EXPECT_EQ(relacoes(), QStringList({"1=-K1:A1", "2=-K1:A2"}));
+    ASSERT_TRUE(lisp("(setq *EXPORT_CHAR_SEP* \"/\" *EXPORT_ORDEM_REL* \"2\")"));
+    EXPECT_EQ(relacoes(), QStringList({"1=A1/-K1", "2=A2/-K1"}));
+    // Outside a read an end is composed with the settings as they are then.
+    ASSERT_TRUE(lisp("(setq *EXPORT_CHAR_SEP* \"-\")"));
+    CEItemLista item;
+    item.definirCampo("RELACAO_X", "-K5");
+    leitor.CompoeRelacao("_X", item, nullptr, "7", "");
+    EXPECT_EQ(item.valorCampo("RELACAO_X"), "7--K5");
+}
+
 TEST_F(ExportReaderTest, AWireBetweenComponentsIsLeftAsTheWireReaderMadeIt) {
     componente("-K1", {{"A1", {20, 200, 0}}});
     componente("-K2", {{"A1", {20, 100, 0}}});

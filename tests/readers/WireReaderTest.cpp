@@ -168,6 +168,76 @@ TEST_F(WireReaderTest, AReaderThatGaveBackItsReadsReadsTheSameAgain) {
     EXPECT_EQ(itens_[1]->valorCampo("FIO_SEGFIM"), "12");
 }
 
+TEST_F(WireReaderTest, AnElementEndingSeveralWiresGivesEachWhatACopyOfItGives) {
+    // -K1 ends two wires and has no QTD; -K2 ends two and has a QTD of its own.
+    zvdb::BlockReference* k1 = componente("-K1", {{"A1", {20, 150, 0}}, {"A2", {60, 150, 0}}});
+    const zvdb::BlockReference* k2 = simbolo("BOBINA", {170, 150, 0},
+                                             {{"RELACAO", "-K2", {170, 170, 0}},
+                                              {"QTD", "3", {170, 165, 0}},
+                                              {"LIGACAO1", "B1", {140, 150, 0}},
+                                              {"LIGACAO2", "B2", {180, 150, 0}}});
+    const std::vector<std::pair<double, const char*>> fios{
+        {20, "1"}, {60, "2"}, {140, "3"}, {180, "4"}};
+    for (const auto& [x, numero] : fios) {
+        borne("X1", numero, {x, 200, 0});
+        fio({{x, 190, 0}, {x, 150, 0}}, numero);
+    }
+    // What the element's copy under the end's suffix holds, but the relation texts that
+    // the end composes from it.
+    const auto copiados = [this](const zvdb::BlockReference* elemento) {
+        CCFioDataReader outro;
+        CEItemLista copia;
+        outro.CopiaEntidade("_FIM", copia, id(elemento), &modelo_);
+        const QStringList compostos{"REL_FIM", "LIG_FIM", "RELACAO_FIM", "TAG_FIM", "ETIQUETA_FIM"};
+        QStringList campos;
+        for (auto c = copia.campos.begin(); c != copia.campos.end(); ++c)
+            if (!compostos.contains(c.key())) campos << c.key() + "=" + c.value();
+        return campos;
+    };
+    const auto doItem = [](const CEItemLista& item, const QStringList& esperados) {
+        QStringList campos;
+        for (const QString& esperado : esperados) {
+            const QString nome = esperado.section('=', 0, 0);
+            campos << nome + "=" + item.valorCampo(nome);
+        }
+        return campos;
+    };
+    CCFioDataReader leitor;
+    ASSERT_EQ(le(leitor).size(), 4u);
+    QStringList deK1 = copiados(k1);
+    const QStringList deK2 = copiados(k2);
+    ASSERT_TRUE(deK1.contains("HANDLE_FIM=" + handle(k1)));
+    ASSERT_TRUE(deK1.contains("LIGACAO2_FIM=A2"));
+    for (const CEItemLista* item : itens_) {
+        const bool primeiro = item->valorCampo("HANDLE_FIM") == handle(k1);
+        ASSERT_TRUE(primeiro || item->valorCampo("HANDLE_FIM") == handle(k2));
+        const QStringList& esperados = primeiro ? deK1 : deK2;
+        EXPECT_EQ(doItem(*item, esperados), esperados) << item->valorCampo("FIO").toStdString();
+        // A copy puts a QTD of "1" where the element has none.
+        EXPECT_EQ(item->valorCampo("QTD_FIM"), primeiro ? "1" : "3");
+        EXPECT_EQ(item->valorCampo("REL_FIM"), primeiro ? "-K1" : "-K2");
+    }
+    itens_.destruirItens();
+
+    // The same reader after the element changed: the ends see the new fields.
+    k1->attribute("RELACAO")->setTextValue("-K7");
+    k1->attribute("LIGACAO2")->setTextValue("A8");
+    deK1 = copiados(k1);
+    ASSERT_TRUE(deK1.contains("LIGACAO2_FIM=A8"));
+    ASSERT_EQ(le(leitor).size(), 4u);
+    int vistos = 0;
+    for (const CEItemLista* item : itens_) {
+        if (item->valorCampo("HANDLE_FIM") != handle(k1)) continue;
+        ++vistos;
+        EXPECT_EQ(doItem(*item, deK1), deK1) << item->valorCampo("FIO").toStdString();
+        EXPECT_EQ(item->valorCampo("REL_FIM"), "-K7");
+        const QString ligacao = item->valorCampo("FIO") == "1" ? "A1" : "A8";
+        EXPECT_EQ(item->valorCampo("LIG_FIM"), ligacao);
+        EXPECT_EQ(item->valorCampo("RELACAO_FIM"), "-K7:" + ligacao);
+    }
+    EXPECT_EQ(vistos, 2);
+}
+
 TEST_F(WireReaderTest, AWireThroughManyElementsFindsTheWireAtEachEndAndItsConnection) {
     // Past some sixteen entries a wire's repeated texts are found through an index.
     const int n = 24;

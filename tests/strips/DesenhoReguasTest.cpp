@@ -341,6 +341,33 @@ TEST_F(DesenhoReguasTest, ADrawingAgainAsksWhetherTheOldPagesGo) {
     EXPECT_EQ(Layers(todas).size(), 1);
 }
 
+TEST_F(DesenhoReguasTest, EveryTerminalIsFilledFromItsItemAndABlockThatGainsAFunctionRunsIt) {
+    auto x1 = itens_.Regua("X1", 3);
+    for (size_t i = 0; i < x1.size(); ++i)
+        x1[i]->definirCampo("ZV_KEY", QString::number(2001 + int(i)));
+    const auto celulas = [](const std::vector<Insercao>& todas, const char* segunda) {
+        QStringList texto;
+        for (const Insercao& i : todas)
+            if (i.nome == "REGUA_BORNE")
+                texto << i.atributos["VARIAVEL_NUMERO"].toString() + "/" +
+                             i.atributos[segunda].toString();
+        return texto;
+    };
+    CCBorneDwgWriter escritor;
+    escritor.EscreverItens(itens_.itens, modelo_);
+    // A VARIAVEL cell names its field; any other tag is the field's own name.
+    EXPECT_EQ(celulas(Salvo(), "ZV_KEY"), QStringList({"1/2001", "2/2002", "3/2003"}));
+
+    // The drawing's terminal block gains a function between two drawings of one writer.
+    zvdb::BlockRecord* bloco = documento_->database()->block("REGUA_BORNE");
+    ASSERT_NE(bloco, nullptr);
+    bloco->addAttributeDefinition("FUNCAO_N", "FUNCAO_N",
+                                  "(strcat \"N\" (cdr (assoc \"NUMERO\" reg)))", {0, -12, 0}, 1.0);
+    ui_->setAnswer("question:89", "yes");
+    escritor.EscreverItens(itens_.itens, modelo_);
+    EXPECT_EQ(celulas(Salvo(), "FUNCAO_N"), QStringList({"1/N1", "2/N2", "3/N3"}));
+}
+
 TEST_F(DesenhoReguasTest, AnEmptyBlockValueIsNotDrawnAndTheRestIs) {
     modelo_.simbolos["*BLOCO_DETALHE_GRX*"] = "";
     modelo_.simbolos["*BLOCO_TRACO_GRX*"] = "";
