@@ -11,8 +11,21 @@ std::string_view recordName(const DbObject& record) {
 }
 }  // namespace
 
+std::size_t SymbolTable::NameHash::operator()(std::string_view name) const {
+    std::size_t hash = 14695981039346656037ull;
+    for (const char c : name) {
+        hash ^= static_cast<unsigned char>(c >= 'a' && c <= 'z' ? c - 32 : c);
+        hash *= 1099511628211ull;
+    }
+    return hash;
+}
+
+bool SymbolTable::SameName::operator()(std::string_view a, std::string_view b) const {
+    return TagValues::sameName(a, b);
+}
+
 DbObject* SymbolTable::find(std::string_view name) const {
-    const auto it = byName_.find(TagValues::upperName(name));
+    const auto it = byName_.find(name);
     if (it == byName_.end() || it->second->isErased()) return nullptr;
     return it->second;
 }

@@ -1,6 +1,7 @@
 #pragma once
 // One table of the TABLES section (LAYER, LTYPE, BLOCK_RECORD...): its head object and its
 // records in order, found by name without regard to case.
+#include <cstddef>
 #include <string>
 #include <string_view>
 #include <unordered_map>
@@ -29,10 +30,21 @@ public:
     void setWritten(bool written) { written_ = written; }
 
 private:
+    // Names are kept in capitals and asked for in any case, without making a capital copy of
+    // the name asked for.
+    struct NameHash {
+        using is_transparent = void;
+        std::size_t operator()(std::string_view name) const;
+    };
+    struct SameName {
+        using is_transparent = void;
+        bool operator()(std::string_view a, std::string_view b) const;
+    };
+
     std::string name_;
     DbObject* head_;
     std::vector<DbObject*> records_;
-    std::unordered_map<std::string, DbObject*> byName_;
+    std::unordered_map<std::string, DbObject*, NameHash, SameName> byName_;
     bool written_ = true;
 };
 
