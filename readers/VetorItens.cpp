@@ -1,5 +1,7 @@
 #include "VetorItens.h"
 
+#include <QHash>
+
 #include <algorithm>
 #include <unordered_set>
 
@@ -55,21 +57,42 @@ int VetorItens::compararItens(const CEItemLista* a, const CEItemLista* b,
 
 void VetorItens::ordenar(const QStringList& campos) {
     if (campos.isEmpty() || size() < 2) return;
-    // The keys are worked out once per item, not once per comparison.
+    // Each field's texts become ranks: the distinct texts are put in order once (a text's
+    // natural form is worked out once however many items share it), so that comparing two
+    // items compares numbers. Equal ranks are equal keys, so every comparison answers as
+    // comparing the keys would, and the order comes out the same.
     const size_t k = size_t(campos.size());
-    std::vector<Chave> chaves(size() * k);
-    for (size_t i = 0; i < size(); ++i)
-        for (size_t c = 0; c < k; ++c) {
+    std::vector<unsigned> postos(size() * k);
+    for (size_t c = 0; c < k; ++c) {
+        QHash<QString, unsigned> distintos;
+        std::vector<Chave> chaves;
+        for (size_t i = 0; i < size(); ++i) {
             QString valor = Campo((*this)[i], campos[int(c)]);
-            chaves[i * k + c] = {ZVString::FormaNatural(valor), std::move(valor)};
+            auto achado = distintos.constFind(valor);
+            if (achado == distintos.constEnd()) {
+                achado = distintos.insert(valor, unsigned(chaves.size()));
+                chaves.push_back({ZVString::FormaNatural(valor), std::move(valor)});
+            }
+            postos[i * k + c] = achado.value();
         }
+        std::vector<unsigned> ordemChaves(chaves.size());
+        for (unsigned j = 0; j < ordemChaves.size(); ++j)
+            ordemChaves[j] = j;
+        std::sort(ordemChaves.begin(), ordemChaves.end(),
+                  [&](unsigned a, unsigned b) { return CompararChaves(chaves[a], chaves[b]) < 0; });
+        std::vector<unsigned> posto(chaves.size());
+        for (unsigned j = 0; j < ordemChaves.size(); ++j)
+            posto[ordemChaves[j]] = j;
+        for (size_t i = 0; i < size(); ++i)
+            postos[i * k + c] = posto[postos[i * k + c]];
+    }
     std::vector<size_t> ordem(size());
     for (size_t i = 0; i < ordem.size(); ++i)
         ordem[i] = i;
     std::sort(ordem.begin(), ordem.end(), [&](size_t a, size_t b) {
         for (size_t c = 0; c < k; ++c)
-            if (const int r = CompararChaves(chaves[a * k + c], chaves[b * k + c]); r != 0)
-                return r < 0;
+            if (postos[a * k + c] != postos[b * k + c])
+                return postos[a * k + c] < postos[b * k + c];
         return false;
     });
     std::vector<CEItemLista*> ordenado(size());

@@ -283,6 +283,46 @@ TEST(OrderingTest, CaseAndCodeUnitsDecideBeforeAnythingElse) {
     EXPECT_EQ(Valores(v, "T"), QStringList({"B", "a", "b", QString::fromUtf8("Á")}));
 }
 
+// Many items with ties on every field, items alike in all of them, absent fields and
+// leading zeros: the order is exactly the one that sorting by the items' comparison gives
+// (the same pointers in the same places, alike items included).
+TEST(OrderingTest, ManyItemsComeOutAsSortingByTheirComparisonPutsThem) {
+    Itens itens;
+    const char* const paginas[] = {"1", "01", "2", "10", "A", ""};
+    const char* const reguas[] = {"X1", "X2", "X10", "x1", "-X1"};
+    const char* const numeros[] = {"1", "2", "3", "03", "10", "PE", "100000000000"};
+    VetorItens v;
+    unsigned semente = 7;
+    const auto sorteio = [&semente](unsigned n) {
+        semente = semente * 1103515245u + 12345u;
+        return (semente >> 16) % n;
+    };
+    for (int i = 0; i < 3000; ++i) {
+        const char* pagina = paginas[sorteio(6)];
+        const char* regua = reguas[sorteio(5)];
+        const char* numero = numeros[sorteio(7)];
+        if (sorteio(10) == 0)
+            v.push_back(itens.novo({{"PAGINA", pagina}, {"NUMERO", numero}}));
+        else
+            v.push_back(itens.novo({{"PAGINA", pagina}, {"REGUA", regua}, {"NUMERO", numero}}));
+    }
+    const QStringList campos{"PAGINA", "REGUA", "NUMERO"};
+    std::vector<size_t> ordem(v.size());
+    for (size_t i = 0; i < ordem.size(); ++i)
+        ordem[i] = i;
+    std::sort(ordem.begin(), ordem.end(), [&](size_t a, size_t b) {
+        return VetorItens::compararItens(v[a], v[b], campos) < 0;
+    });
+    VetorItens esperado;
+    for (size_t i : ordem)
+        esperado.push_back(v[i]);
+    v.ordenar(campos);
+    ASSERT_EQ(v.size(), esperado.size());
+    EXPECT_TRUE(v == esperado);
+    for (size_t i = 1; i < v.size(); ++i)
+        ASSERT_LE(VetorItens::compararItens(v[i - 1], v[i], campos), 0) << i;
+}
+
 TEST(VectorTest, MergeKeepsPointersOnceInOrder) {
     Itens itens;
     CEItemLista* a = itens.novo({{"N", "a"}});
