@@ -11,21 +11,15 @@ std::string_view recordName(const DbObject& record) {
 }
 }  // namespace
 
-std::size_t SymbolTable::NameHash::operator()(std::string_view name) const {
-    std::size_t hash = 14695981039346656037ull;
-    for (const char c : name) {
-        hash ^= static_cast<unsigned char>(c >= 'a' && c <= 'z' ? c - 32 : c);
-        hash *= 1099511628211ull;
-    }
-    return hash;
-}
-
-bool SymbolTable::SameName::operator()(std::string_view a, std::string_view b) const {
-    return TagValues::sameName(a, b);
-}
-
 DbObject* SymbolTable::find(std::string_view name) const {
-    const auto it = byName_.find(name);
+    char capitals[128] = {};
+    if (name.size() > sizeof capitals) {
+        const auto it = byName_.find(TagValues::upperName(name));
+        return it == byName_.end() || it->second->isErased() ? nullptr : it->second;
+    }
+    for (std::size_t i = 0; i < name.size(); ++i)
+        capitals[i] = name[i] >= 'a' && name[i] <= 'z' ? static_cast<char>(name[i] - 32) : name[i];
+    const auto it = byName_.find(std::string_view(capitals, name.size()));
     if (it == byName_.end() || it->second->isErased()) return nullptr;
     return it->second;
 }

@@ -2,6 +2,7 @@
 // One table of the TABLES section (LAYER, LTYPE, BLOCK_RECORD...): its head object and its
 // records in order, found by name without regard to case.
 #include <cstddef>
+#include <functional>
 #include <string>
 #include <string_view>
 #include <unordered_map>
@@ -30,21 +31,19 @@ public:
     void setWritten(bool written) { written_ = written; }
 
 private:
-    // Names are kept in capitals and asked for in any case, without making a capital copy of
-    // the name asked for.
+    // Names are kept in capitals; a name asked for is put in capitals on the stack, not in a
+    // string of its own, and looked up as it is.
     struct NameHash {
         using is_transparent = void;
-        std::size_t operator()(std::string_view name) const;
-    };
-    struct SameName {
-        using is_transparent = void;
-        bool operator()(std::string_view a, std::string_view b) const;
+        std::size_t operator()(std::string_view name) const {
+            return std::hash<std::string_view>{}(name);
+        }
     };
 
     std::string name_;
     DbObject* head_;
     std::vector<DbObject*> records_;
-    std::unordered_map<std::string, DbObject*, NameHash, SameName> byName_;
+    std::unordered_map<std::string, DbObject*, NameHash, std::equal_to<>> byName_;
     bool written_ = true;
 };
 
