@@ -233,35 +233,37 @@ void CICad::SetAtributosLista(const OdDbObjectId& referencia, const zv::CEListaA
     }
 }
 
+void cicad::PreparaAtributos(zvdb::Database& db, const zvdb::BlockRecord& bloco,
+                             const CEValoresAtributos& valores, AtributosNovos& novos) {
+    // What each definition gives is read once for the drawing, not once a reference.
+    zvdb::AttributeLayouts& leituras = db.attributeLayouts();
+    // The values are asked for before the attributes are made, so that each is made with
+    // its value instead of being found and set again.
+    const std::vector<zvdb::Attribute*> todas = bloco.attributeDefinitions();
+    novos.textos.reserve(todas.size());  // `dados` holds views of them
+    for (zvdb::Attribute* def : todas) {
+        const zvdb::AttributeLayout& leitura = leituras.layout(db, *def);
+        if (leitura.isConstant()) continue;
+        novos.definicoes.push_back(def);
+        if (!valores) continue;
+        std::optional<QString> valor =
+            valores(Q(leitura.tag()).trimmed(), Q(leitura.defaultValue()).trimmed());
+        novos.dados.emplace_back();
+        if (!valor) continue;
+        novos.textos.push_back(U8(*valor));
+        novos.dados.back() = novos.textos.back();
+    }
+}
+
 void CICad::CriarAtributos(const OdDbObjectId& definicao, const OdDbObjectId& referencia,
                            const CEValoresAtributos& valores) {
     try {
         auto* bloco = Como<zvdb::BlockRecord>(definicao);
         auto* ref = Como<zvdb::BlockReference>(referencia);
         if (!bloco || !ref) return;
-        // What each definition gives is read once for the drawing, not once a reference.
-        zvdb::Database& db = ref->database();
-        zvdb::AttributeLayouts& leituras = db.attributeLayouts();
-        std::vector<const zvdb::Attribute*> definicoes;
-        // The values are asked for before the attributes are made, so that each is made with
-        // its value instead of being found and set again.
-        std::vector<std::string> textos;
-        std::vector<std::optional<std::string_view>> dados;
-        const std::vector<zvdb::Attribute*> todas = bloco->attributeDefinitions();
-        textos.reserve(todas.size());
-        for (zvdb::Attribute* def : todas) {
-            const zvdb::AttributeLayout& leitura = leituras.layout(db, *def);
-            if (leitura.isConstant()) continue;
-            definicoes.push_back(def);
-            if (!valores) continue;
-            std::optional<QString> valor =
-                valores(Q(leitura.tag()).trimmed(), Q(leitura.defaultValue()).trimmed());
-            dados.emplace_back();
-            if (!valor) continue;
-            textos.push_back(U8(*valor));
-            dados.back() = textos.back();
-        }
-        ref->addAttributesFromDefinitions(definicoes, dados);
+        AtributosNovos novos;
+        PreparaAtributos(ref->database(), *bloco, valores, novos);
+        ref->addAttributesFromDefinitions(novos.definicoes, novos.dados);
     } catch (const std::exception& erro) {
         Log("CICAd::CriarAtributos: " + QString::fromUtf8(erro.what()));
     }

@@ -170,7 +170,15 @@ OdDbObjectId CICad::InsereBloco(const QString& arquivo, const QString& nome, con
     const double graus = Simples(rotacao) * 180.0 / M_PI;
     zvdb::BlockReference* ref =
         modelo->addBlockReference(*definicao, ponto, {1, 1, 1}, graus, U8(layer));
-    CriarAtributos(bloco, Id(ref), valores);
+    // Its attributes placed from the values just given, not from its tags read back.
+    try {
+        AtributosNovos novos;
+        PreparaAtributos(*db, *definicao, valores, novos);
+        ref->addAttributesFromDefinitions(*definicao, ponto, {1, 1, 1}, graus, novos.definicoes,
+                                          novos.dados);
+    } catch (const std::exception& erro) {
+        Log("CICAd::CriarAtributos: " + QString::fromUtf8(erro.what()));
+    }
     return Id(ref);
 }
 

@@ -10,8 +10,15 @@
 #include <QString>
 
 #include <exception>
+#include <optional>
 #include <string>
 #include <string_view>
+#include <vector>
+
+namespace zvdb {
+class Attribute;
+class BlockRecord;
+}  // namespace zvdb
 
 namespace cicad {
 
@@ -45,6 +52,16 @@ inline zvdb::LayerRecord* Layer(const QString& nome, zvdb::Database* database) {
     zvdb::Database* db = Db(database);
     return db && !nome.isEmpty() ? db->layer(U8(nome)) : nullptr;
 }
+
+// What a new reference of a block takes: the block's definitions that are not constant and,
+// when values are asked for, the value of each (none: its default).
+struct AtributosNovos {
+    std::vector<const zvdb::Attribute*> definicoes;
+    std::vector<std::optional<std::string_view>> dados;
+    std::vector<std::string> textos;  // what `dados` points into
+};
+void PreparaAtributos(zvdb::Database& db, const zvdb::BlockRecord& bloco,
+                      const CEValoresAtributos& valores, AtributosNovos& novos);
 
 // The project-settings operations log what goes wrong and answer nothing.
 template <class F>

@@ -349,6 +349,9 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     DescartaDesenhados(candidatos);
     const bool algumDesenhado = candidatos.size() < antes;
     candidatos_ = std::move(candidatos);
+    comAcessorios_.clear();
+    for (const auto& [chave, candidato] : candidatos_)
+        if (chave.contains('_')) comAcessorios_.insert(chave.section('_', -1));
 
     // Terminals apart when asked; a handle that is no object joins neither list.
     std::vector<QString> comuns, bornes;
@@ -599,6 +602,9 @@ VetorItens CCDiagramaTopografico::LeItens(const std::vector<QString>& chaves, CE
         } else {
             item.reset(CriaItemEntidade(candidato.simbolo, modelo));
             if (item && item->valorCampo("ZV_LISTA") != "S") item.reset();
+            // Its accessories come next and take their owner's fields from this same read.
+            if (comAcessorios_.contains(chave))
+                donos_.insert(chave, item ? std::make_shared<const CEItemLista>(*item) : nullptr);
         }
         if (!item) continue;
         item->definirCampo("HANDLE", chave);
@@ -625,25 +631,31 @@ CEItemLista* CCDiagramaTopografico::LeItemAcessorio(const QString& chave,
     auto item = std::make_unique<CEItemLista>();
     item->ids = origem.ids;
     // It sits with its owner: the owner's tag, strip, number and page, in every language.
-    for (CampoTraduzido campo :
-         {CampoTraduzido::Relacao, CampoTraduzido::Regua, CampoTraduzido::Numero})
-        for (int idioma = 1; idioma <= 3; ++idioma) {
-            const QString nome = CICad::TagTraduzida(campo, idioma);
-            if (const QString* valor = origem.campo(nome)) item->definirCampo(nome, *valor);
-        }
-    for (const char* nome : {"PAGINA", "GRUPO", "LAYER", "POSICAO"})
+    // The names are made once: a project has thousands of accessories.
+    static const QStringList kDoDono = [] {
+        QStringList nomes;
+        for (CampoTraduzido campo :
+             {CampoTraduzido::Relacao, CampoTraduzido::Regua, CampoTraduzido::Numero})
+            for (int idioma = 1; idioma <= 3; ++idioma)
+                nomes << CICad::TagTraduzida(campo, idioma);
+        return nomes + QStringList{"PAGINA", "GRUPO", "LAYER", "POSICAO"};
+    }();
+    for (const QString& nome : kDoDono)
         if (const QString* valor = origem.campo(nome)) item->definirCampo(nome, *valor);
     // Everything else is the accessory's own.
-    item->definirCampo("ZV_LISTA_TIPO", "ACE");
-    item->definirCampo("ZV_LISTA", Catalogo().ListaComp(candidato.chave, candidato.norma));
-    item->definirCampo("ZV_KEY", candidato.chave);
+    static const QString kTipo("ZV_LISTA_TIPO"), kLista("ZV_LISTA"), kChave("ZV_KEY"),
+        kDescricao("DESCRICAO"), kTpDescri("TP_DESCRI"), kQtd("QTD"), kAce("ACE"), kUm("1");
+    item->definirCampo(kTipo, kAce);
+    item->definirCampo(kLista, Catalogo().ListaComp(candidato.chave, candidato.norma));
+    item->definirCampo(kChave, candidato.chave);
     const QString descricao = Catalogo().DescricaoComp(candidato.chave);
-    item->definirCampo("DESCRICAO", descricao);
-    item->definirCampo("TP_DESCRI", descricao);
-    const QString qtd = origem.valorCampo("QTD");
-    item->definirCampo("QTD", qtd.isEmpty() ? QStringLiteral("1") : qtd);
+    item->definirCampo(kDescricao, descricao);
+    item->definirCampo(kTpDescri, descricao);
+    const QString* qtd = origem.campo(kQtd);
+    item->definirCampo(kQtd, qtd && !qtd->isEmpty() ? *qtd : kUm);
     LeColunasUsuario(QString(), *item, Catalogo().ColunasComp(candidato.chave));
-    if (item->valorCampo("ZV_LISTA") != "S") return nullptr;
+    const QString* listado = item->campo(kLista);
+    if (!listado || *listado != QLatin1String("S")) return nullptr;
     return item.release();
 }
 

@@ -8,6 +8,7 @@
 #include "readers/CCExportDataReader.h"
 
 #include <QHash>
+#include <QSet>
 #include <QString>
 #include <QStringList>
 
@@ -130,6 +131,8 @@ private:
     QHash<QString, CEItemLista*> itensPorHandle_;
     // The owners of accessories, read once each; null for one that gives no listed item.
     QHash<QString, std::shared_ptr<const CEItemLista>> donos_;
+    // The symbols that have accessories among the candidates.
+    QSet<QString> comAcessorios_;
     CIProgress* progresso_ = nullptr;
     int inseridos_ = 0;
     int paginasCriadas_ = 0;

@@ -72,14 +72,19 @@ Placing readPlacing(std::span<const Tag> all) {
 
 }  // namespace
 
+Transform BlockReference::transformOf(const Point3& base, const Point3& position,
+                                      const Point3& scale, double rotationDegrees,
+                                      const Point3& extrusion) {
+    return Transform::fromOcs(extrusion) * Transform::translation(position) *
+           Transform::rotationZ(rotationDegrees * std::numbers::pi / 180.0) *
+           Transform::scaling(scale.x, scale.y, scale.z) * Transform::translation(base * -1.0);
+}
+
 Transform BlockReference::transform() const {
     const BlockRecord* block = definition();
     const Point3 base = block ? block->basePoint() : Point3{};
     const Placing p = readPlacing(tags());
-    const Point3& s = p.scale;
-    return Transform::fromOcs(p.extrusion) * Transform::translation(p.position) *
-           Transform::rotationZ(p.rotation * std::numbers::pi / 180.0) *
-           Transform::scaling(s.x, s.y, s.z) * Transform::translation(base * -1.0);
+    return transformOf(base, p.position, p.scale, p.rotation, p.extrusion);
 }
 
 std::vector<Attribute*> BlockReference::attributes() const {
@@ -119,6 +124,19 @@ std::vector<Attribute*> BlockReference::addAttributesFromDefinitions(
     const Placing p = readPlacing(tags());
     return database().addAttributesFromDefinitions(*this, definitions, values, transform(),
                                                    std::abs(p.scale.y), p.rotation);
+}
+
+std::vector<Attribute*> BlockReference::addAttributesFromDefinitions(
+    const BlockRecord& block, const Point3& position, const Point3& scale, double rotationDegrees,
+    std::span<const Attribute* const> definitions,
+    std::span<const std::optional<std::string_view>> values) {
+    if (definitions.empty()) return {};
+    // What reading the tags back gives: a rotation left unwritten (-0 too) reads as 0, and
+    // written reals read back exactly.
+    const double rotation = rotationDegrees != 0.0 ? rotationDegrees : 0.0;
+    return database().addAttributesFromDefinitions(
+        *this, definitions, values, transformOf(block.basePoint(), position, scale, rotation),
+        std::abs(scale.y), rotation);
 }
 
 }  // namespace zvdb

@@ -26,6 +26,9 @@ public:
     Point3 extrusion() const { return point(210, Point3{0, 0, 1}); }
     // From the block definition's coordinates to the coordinates of the reference's owner.
     Transform transform() const;
+    // The same for a reference placed by these values, `base` being its block's base point.
+    static Transform transformOf(const Point3& base, const Point3& position, const Point3& scale,
+                                 double rotationDegrees, const Point3& extrusion = {0, 0, 1});
 
     // Attributes in order, erased ones left out.
     std::vector<Attribute*> attributes() const;
@@ -42,6 +45,13 @@ public:
     std::vector<Attribute*> addAttributesFromDefinitions(
         std::span<const Attribute* const> definitions,
         std::span<const std::optional<std::string_view>> values = {});
+    // The same for a reference just made by BlockRecord::addBlockReference with `block` and
+    // these values: the placement is worked out from them instead of read back from the
+    // tags, and the block is not looked up by name.
+    std::vector<Attribute*> addAttributesFromDefinitions(
+        const BlockRecord& block, const Point3& position, const Point3& scale,
+        double rotationDegrees, std::span<const Attribute* const> definitions,
+        std::span<const std::optional<std::string_view>> values);
 };
 
 }  // namespace zvdb

@@ -102,8 +102,9 @@ SymbolTable* Database::addTable(std::string_view name, DbObject* head) {
 }
 
 SymbolTable* Database::table(std::string_view name) const {
+    // Asked for at every name look-up: the length tells most tables apart before the text.
     for (const auto& t : tables_)
-        if (TagValues::sameName(t->name(), name)) return t.get();
+        if (t->name().size() == name.size() && TagValues::sameName(t->name(), name)) return t.get();
     return nullptr;
 }
 

@@ -12,7 +12,14 @@ std::string_view recordName(const DbObject& record) {
 }  // namespace
 
 DbObject* SymbolTable::find(std::string_view name) const {
-    const auto it = byName_.find(TagValues::upperName(name));
+    char capitals[128] = {};
+    if (name.size() > sizeof capitals) {
+        const auto it = byName_.find(TagValues::upperName(name));
+        return it == byName_.end() || it->second->isErased() ? nullptr : it->second;
+    }
+    for (std::size_t i = 0; i < name.size(); ++i)
+        capitals[i] = name[i] >= 'a' && name[i] <= 'z' ? static_cast<char>(name[i] - 32) : name[i];
+    const auto it = byName_.find(std::string_view(capitals, name.size()));
     if (it == byName_.end() || it->second->isErased()) return nullptr;
     return it->second;
 }

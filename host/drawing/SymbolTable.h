@@ -1,6 +1,8 @@
 #pragma once
 // One table of the TABLES section (LAYER, LTYPE, BLOCK_RECORD...): its head object and its
 // records in order, found by name without regard to case.
+#include <cstddef>
+#include <functional>
 #include <string>
 #include <string_view>
 #include <unordered_map>
@@ -29,10 +31,19 @@ public:
     void setWritten(bool written) { written_ = written; }
 
 private:
+    // Names are kept in capitals; a name asked for is put in capitals on the stack, not in a
+    // string of its own, and looked up as it is.
+    struct NameHash {
+        using is_transparent = void;
+        std::size_t operator()(std::string_view name) const {
+            return std::hash<std::string_view>{}(name);
+        }
+    };
+
     std::string name_;
     DbObject* head_;
     std::vector<DbObject*> records_;
-    std::unordered_map<std::string, DbObject*> byName_;
+    std::unordered_map<std::string, DbObject*, NameHash, std::equal_to<>> byName_;
     bool written_ = true;
 };
 

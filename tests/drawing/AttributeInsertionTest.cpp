@@ -412,6 +412,76 @@ TEST(AttributeFromDefinition, APlacementIsReadAsTheReferencesAccessorsReadIt) {
         EXPECT_EQ(withoutIdentity(*made[i]), oneByOne[i]);
 }
 
+TEST(AttributeFromDefinition, AReferenceJustMadeNeedsNoReadingBackForTheSameAttributes) {
+    Database db;
+    db.createLayer("PAGE");
+    const BlockRecord* block = richBlock(db);
+    const auto definitions = variableDefinitions(*block);
+    const Values values = {"-K1", std::nullopt, "a value", ""};
+    // Reals whose text is long, a rotation of -0 (not written, so read back as 0), scales
+    // that are written and one that is not, paper space.
+    const Placement placements[] = {{{0.1, 1.0 / 3.0, 0}, {1, 1, 1}, 0},
+                                    {{1e-7, -2.5e6, 0}, {1, 1, 1}, -0.0},
+                                    {{12.5, -7.25, 0}, {1, 1, 1}, 180.0 / 7.0},
+                                    {{-4, 9, 1.5}, {-1, 0.3, 1}, 0},
+                                    {{5, 5, 0}, {2, -2, 1}, 270},
+                                    {{1, 2, 0}, {1, 1, 1}, 45, true}};
+    for (const Placement& p : placements) {
+        SCOPED_TRACE(p.degrees);
+        BlockRecord* owner = p.paper ? db.paperSpace() : db.modelSpace();
+        BlockReference* read = owner->addBlockReference(*block, p.at, p.scale, p.degrees, "PAGE");
+        BlockReference* given = owner->addBlockReference(*block, p.at, p.scale, p.degrees, "PAGE");
+        const auto slow = read->addAttributesFromDefinitions(definitions, values);
+        const auto fast = given->addAttributesFromDefinitions(*block, p.at, p.scale, p.degrees,
+                                                              definitions, values);
+        ASSERT_EQ(fast.size(), definitions.size());
+        ASSERT_EQ(slow.size(), fast.size());
+        for (std::size_t i = 0; i < fast.size(); ++i) {
+            EXPECT_EQ(withoutIdentity(*fast[i]), withoutIdentity(*slow[i]))
+                << "attribute " << fast[i]->tag();
+            EXPECT_EQ(fast[i]->parent(), given);
+            // And both as the step-by-step way makes them.
+            Attribute* reference = madeStepByStep(*read, *definitions[i]);
+            if (i < values.size() && values[i]) reference->setTextValue(*values[i]);
+            EXPECT_EQ(withoutIdentity(*fast[i]), withoutIdentity(*reference));
+        }
+        EXPECT_EQ(withoutIdentity(*given->seqend()), withoutIdentity(*read->seqend()));
+    }
+    // A block whose base point is not the origin moves the attributes by it.
+    BlockRecord* moved = db.createBlock("DESLOCADO", {10, -20, 0});
+    moved->addAttributeDefinition("TAG", "", "v", {1, 1, 0}, 2.0);
+    BlockReference* ref = db.modelSpace()->addBlockReference(*moved, {0, 0, 0}, {1, 1, 1}, 90);
+    const auto made = ref->addAttributesFromDefinitions(*moved, {0, 0, 0}, {1, 1, 1}, 90,
+                                                        variableDefinitions(*moved), {});
+    ASSERT_EQ(made.size(), 1u);
+    const Point3 at = made[0]->position();
+    EXPECT_NEAR(at.x, -21.0, 1e-9);
+    EXPECT_NEAR(at.y, -9.0, 1e-9);
+    EXPECT_EQ(made[0]->textValue(), "v");
+}
+
+// Names of a table found in any case -------------------------------------------------------
+
+TEST(TableNames, ABlockOrLayerIsFoundByItsNameInAnyCaseAndErasedOnesAreNot) {
+    Database db;
+    BlockRecord* shortName = db.createBlock("Ab1");
+    BlockRecord* longName = db.createBlock("A_Block_Name_Longer_Than_Sixteen_Chars");
+    db.createLayer("Página$0001$a");
+    EXPECT_EQ(db.block("AB1"), shortName);
+    EXPECT_EQ(db.block("ab1"), shortName);
+    EXPECT_EQ(db.block("a_block_name_longer_than_sixteen_chars"), longName);
+    EXPECT_EQ(db.block("A_BLOCK_NAME_LONGER_THAN_SIXTEEN_CHARX"), nullptr);
+    EXPECT_EQ(db.block("Ab"), nullptr);
+    EXPECT_NE(db.layer("PáGINA$0001$A"), nullptr) << "capitals of ASCII letters only";
+    EXPECT_EQ(db.layer("PÁGINA$0001$A"), nullptr);
+    EXPECT_NE(db.block("*model_space"), nullptr);
+    shortName->erase();
+    EXPECT_EQ(db.block("ab1"), nullptr);
+    BlockRecord* again = db.createBlock("AB1");
+    EXPECT_NE(again, shortName);
+    EXPECT_EQ(db.block("aB1"), again) << "an erased name is free again";
+}
+
 // Values changed where a file's tags are -------------------------------------------------
 
 constexpr std::string_view kTwoTexts =
