@@ -15,6 +15,8 @@
 #include <exception>
 #include <optional>
 #include <string>
+#include <string_view>
+#include <unordered_map>
 #include <vector>
 
 using namespace cicad;
@@ -41,6 +43,22 @@ std::unique_ptr<zv::CEAtributo> AtributoVirtual(const QStringList& campos) {
                                             OdDbObjectId(), invisivel);
 }
 
+struct HashTag {
+    using is_transparent = void;
+    size_t operator()(std::string_view t) const { return std::hash<std::string_view>{}(t); }
+};
+
+// The symbols of a drawing repeat a few tag names: each is made a text once, and the
+// attributes share it.
+QString TextoDaTag(std::string_view tag) {
+    static std::unordered_map<std::string, QString, HashTag, std::equal_to<>> tags;
+    auto it = tags.find(tag);
+    if (it != tags.end()) return it->second;
+    // a drawing that makes up names keeps this bounded
+    if (tags.size() >= 4096) tags.clear();
+    return tags.emplace(std::string(tag), Q(tag)).first->second;
+}
+
 }  // namespace
 
 // ---- attributes
@@ -55,7 +73,7 @@ void CICad::GetAtributos(const OdDbObjectId& referencia,
     const OdDbObjectId bloco = comPrompts || usarPadroes ? Id(ref->definition()) : OdDbObjectId();
     lista = std::make_unique<zv::CEListaAtributos>();
     for (zvdb::Attribute* atributo : ref->attributes()) {
-        QString tag = Q(atributo->tag());
+        QString tag = TextoDaTag(atributo->tag());
         if (!prefixo.isEmpty() && !tag.startsWith(prefixo)) continue;
         QString prompt;
         if (comPrompts) {
