@@ -2,59 +2,62 @@
 
 #include <cstdio>
 
-QStringList ZVString::Divide(const QString& separadores) const {
-    // Called for every layer name, key and extended-data text a reader meets: plain loops
-    // over the characters, no per-character calls.
-    const QChar* texto = constData();
+namespace {
+
+// Calls `token(inicio, fim)` for each run of characters between separators, in order, until
+// it answers false. Called for every layer name, key and extended-data text a reader meets:
+// plain loops over the characters, no per-character calls.
+template <class F>
+bool PercorreTokens(const QString& texto, const QString& separadores, F token) {
+    const QChar* c = texto.constData();
     const QChar* sep = separadores.constData();
-    const int n = size(), m = separadores.size();
-    const auto separa = [sep, m](QChar c) {
+    const int n = texto.size(), m = separadores.size();
+    const auto separa = [sep, m](QChar x) {
         for (int k = 0; k < m; ++k)
-            if (sep[k] == c) return true;
+            if (sep[k] == x) return true;
         return false;
     };
-    QStringList tokens;
     int inicio = -1;
     for (int i = 0; i <= n; ++i) {
-        const bool corta = i == n || separa(texto[i]);
+        const bool corta = i == n || separa(c[i]);
         if (corta && inicio >= 0) {
-            tokens << QString(texto + inicio, i - inicio);
+            if (!token(inicio, i)) return false;
             inicio = -1;
         } else if (!corta && inicio < 0) {
             inicio = i;
         }
     }
+    return true;
+}
+
+}  // namespace
+
+QStringList ZVString::Divide(const QString& separadores) const {
+    QStringList tokens;
+    PercorreTokens(*this, separadores, [&](int inicio, int fim) {
+        tokens << QString(constData() + inicio, fim - inicio);
+        return true;
+    });
     return tokens;
 }
 
 bool ZVString::DivideEmDois(const QString& separadores, QString& primeiro, QString& segundo) const {
     // Every key and extended-data field of a list passes here: the token bounds are found
     // without a list, and a text without separators is shared, not copied.
-    const QChar* texto = constData();
-    const QChar* sep = separadores.constData();
-    const int n = size(), m = separadores.size();
-    const auto separa = [sep, m](QChar c) {
-        for (int k = 0; k < m; ++k)
-            if (sep[k] == c) return true;
-        return false;
-    };
     int inicio[2] = {0, 0}, fim[2] = {0, 0};
-    int tokens = 0, aberto = -1;
-    for (int i = 0; i <= n; ++i) {
-        const bool corta = i == n || separa(texto[i]);
-        if (corta && aberto >= 0) {
-            if (tokens == 2) return false;
-            inicio[tokens] = aberto;
-            fim[tokens++] = i;
-            aberto = -1;
-        } else if (!corta && aberto < 0) {
-            aberto = i;
-        }
-    }
-    if (tokens == 0) return false;
+    int tokens = 0;
+    const bool ate2 = PercorreTokens(*this, separadores, [&](int i, int f) {
+        if (tokens == 2) return false;
+        inicio[tokens] = i;
+        fim[tokens++] = f;
+        return true;
+    });
+    if (!ate2 || tokens == 0) return false;
+    const QChar* texto = constData();
     // both made before either output is set: an output may be this text itself
-    QString um = inicio[0] == 0 && fim[0] == n ? static_cast<const QString&>(*this)
-                                               : QString(texto + inicio[0], fim[0] - inicio[0]);
+    QString um = inicio[0] == 0 && fim[0] == size()
+                     ? static_cast<const QString&>(*this)
+                     : QString(texto + inicio[0], fim[0] - inicio[0]);
     QString dois = tokens == 2 ? QString(texto + inicio[1], fim[1] - inicio[1]) : QString();
     primeiro = std::move(um);
     segundo = std::move(dois);
