@@ -69,21 +69,6 @@ QString CriaPagina(const QString& grupo) {
     return CICad::GetLayerCorrente();
 }
 
-// What an accessory takes from its owner besides its quantity: the owner's tag, strip,
-// number and page, in every language. Made once: a project has thousands of accessories.
-const QStringList& CamposDoDono() {
-    static const QStringList nomes = [] {
-        QStringList feitos;
-        for (CampoTraduzido campo :
-             {CampoTraduzido::Relacao, CampoTraduzido::Regua, CampoTraduzido::Numero})
-            for (int idioma = 1; idioma <= 3; ++idioma)
-                feitos << CICad::TagTraduzida(campo, idioma);
-        return feitos + QStringList{"PAGINA", "GRUPO", "LAYER", "POSICAO"};
-    }();
-    return nomes;
-}
-const char* const kCampoQtd = "QTD";
-
 // The strip of a terminal, in the first language that names one.
 QString ReguaDe(const CEItemLista& item) {
     for (const char* campo : {"REGUA", "STRIP", "REGLETA"})
@@ -400,7 +385,6 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     };
     porSimbolo(comuns);
     porSimbolo(bornes);
-    enxugar_ = LeCamposUsados();
     VetorItens itensComuns = LeItens(comuns, modelo);
     VetorItens itensBornes = LeItens(bornes, modelo);
     progresso.Definir(40);
@@ -619,13 +603,10 @@ VetorItens CCDiagramaTopografico::LeItens(const std::vector<QString>& chaves, CE
             item.reset(CriaItemEntidade(candidato.simbolo, modelo));
             if (item && item->valorCampo("ZV_LISTA") != "S") item.reset();
             // Its accessories come next and take their owner's fields from this same read.
-            if (comAcessorios_.contains(chave)) {
-                if (item) Enxuga(*item);
+            if (comAcessorios_.contains(chave))
                 donos_.insert(chave, item ? std::make_shared<const CEItemLista>(*item) : nullptr);
-            }
         }
         if (!item) continue;
-        Enxuga(*item);
         item->definirCampo("HANDLE", chave);
         item->definirCampo(kCampoSequencia, QString::number(itens.size()));
         itensPorHandle_.insert(chave, item.get());
@@ -640,9 +621,8 @@ CEItemLista* CCDiagramaTopografico::LeItemAcessorio(const QString& chave,
     const QString simbolo = chave.section('_', -1);
     auto dono = donos_.constFind(simbolo);
     if (dono == donos_.constEnd()) {
-        std::shared_ptr<CEItemLista> lido(CriaItemEntidade(candidato.simbolo, modelo));
+        std::shared_ptr<const CEItemLista> lido(CriaItemEntidade(candidato.simbolo, modelo));
         if (lido && lido->valorCampo("ZV_LISTA") != "S") lido.reset();
-        if (lido) Enxuga(*lido);
         dono = donos_.insert(simbolo, lido);
     }
     // The accessory of a symbol that is not on the lists is not in the panel either.
@@ -651,11 +631,20 @@ CEItemLista* CCDiagramaTopografico::LeItemAcessorio(const QString& chave,
     auto item = std::make_unique<CEItemLista>();
     item->ids = origem.ids;
     // It sits with its owner: the owner's tag, strip, number and page, in every language.
-    for (const QString& nome : CamposDoDono())
+    // The names are made once: a project has thousands of accessories.
+    static const QStringList kDoDono = [] {
+        QStringList nomes;
+        for (CampoTraduzido campo :
+             {CampoTraduzido::Relacao, CampoTraduzido::Regua, CampoTraduzido::Numero})
+            for (int idioma = 1; idioma <= 3; ++idioma)
+                nomes << CICad::TagTraduzida(campo, idioma);
+        return nomes + QStringList{"PAGINA", "GRUPO", "LAYER", "POSICAO"};
+    }();
+    for (const QString& nome : kDoDono)
         if (const QString* valor = origem.campo(nome)) item->definirCampo(nome, *valor);
     // Everything else is the accessory's own.
     static const QString kTipo("ZV_LISTA_TIPO"), kLista("ZV_LISTA"), kChave("ZV_KEY"),
-        kDescricao("DESCRICAO"), kTpDescri("TP_DESCRI"), kQtd(kCampoQtd), kAce("ACE"), kUm("1");
+        kDescricao("DESCRICAO"), kTpDescri("TP_DESCRI"), kQtd("QTD"), kAce("ACE"), kUm("1");
     item->definirCampo(kTipo, kAce);
     item->definirCampo(kLista, Catalogo().ListaComp(candidato.chave, candidato.norma));
     item->definirCampo(kChave, candidato.chave);
@@ -668,51 +657,6 @@ CEItemLista* CCDiagramaTopografico::LeItemAcessorio(const QString& chave,
     const QString* listado = item->campo(kLista);
     if (!listado || *listado != QLatin1String("S")) return nullptr;
     return item.release();
-}
-
-bool CCDiagramaTopografico::LeCamposUsados() {
-    camposUsados_.clear();
-    usoCampo_.clear();
-    const Parametros& p = parametros_;
-    camposUsados_ << "HANDLE" << kCampoSequencia << "ZV_LISTA" << kCampoQtd;
-    for (const char* regua : {"REGUA", "STRIP", "REGLETA"})
-        camposUsados_ << regua;
-    for (const QString& nome : CamposDoDono())
-        camposUsados_ << nome;
-    for (const QString& campo : p.ordenacao)
-        camposUsados_ << campo;
-    if (!p.borneDist.isEmpty()) camposUsados_ << p.borneDist;
-    // Each attribute of an inserted block takes the field of its tag, as asked (trimmed).
-    QSet<QString> blocos;
-    for (const auto& [chave, candidato] : candidatos_) {
-        const QString nome = NomeBloco(candidato);
-        if (blocos.contains(nome)) continue;
-        blocos.insert(nome);
-        OdDbObjectId bloco;
-        if (!CICad::GetBlocoId(nome, bloco)) return false;  // to be loaded at insertion
-        const auto definicoes = CICad::GetDefinicoesAtributos(Arquivo(candidato), nome);
-        if (!definicoes) return false;
-        for (int i = 0; i < definicoes->Quantidade(); ++i)
-            camposUsados_ << (*definicoes)[i].GetTag() << (*definicoes)[i].GetTag().trimmed();
-    }
-    return true;
-}
-
-void CCDiagramaTopografico::Enxuga(CEItemLista& item) {
-    if (!enxugar_) return;
-    std::vector<CamposItem::Campo> mantidos;
-    const std::vector<CamposItem::Campo>& todos = item.campos.todos();
-    mantidos.reserve(todos.size());
-    for (const CamposItem::Campo& campo : todos) {
-        if (campo.nome >= usoCampo_.size()) usoCampo_.resize(size_t(campo.nome) + 1, -1);
-        signed char& uso = usoCampo_[campo.nome];
-        if (uso < 0) uso = camposUsados_.contains(CamposItem::nome(campo.nome)) ? 1 : 0;
-        if (uso) mantidos.push_back(campo);
-    }
-    if (mantidos.size() == todos.size()) return;
-    item.campos.clear();
-    item.campos.juntarOrdenados(mantidos);
-    item.campos.compactar();
 }
 
 void CCDiagramaTopografico::LePassos(const VetorItens& bornes) {

@@ -112,12 +112,6 @@ private:
     // Is an accessory's block of this representation, for this place in the symbol's list,
     // still in the drawing?
     bool AcessorioDesenhado(const QString& chave, const Candidato& candidato) const;
-    // The names of the fields that the run reads from its items once they are read: their
-    // blocks' attribute tags, the sort keys, the strip, and what an accessory takes from its
-    // owner. False when a block's attributes can't be known (the items stay whole).
-    bool LeCamposUsados();
-    // Drops the item's other fields: a run keeps tens of thousands of items until its end.
-    void Enxuga(CEItemLista& item);
     void LePassos(const VetorItens& bornes);
     void LeExtensoes();
     // Makes the pages of one pass and inserts its blocks.
@@ -139,10 +133,6 @@ private:
     QHash<QString, std::shared_ptr<const CEItemLista>> donos_;
     // The symbols that have accessories among the candidates.
     QSet<QString> comAcessorios_;
-    QSet<QString> camposUsados_;
-    bool enxugar_ = false;
-    // By field number: unknown (-1), dropped (0) or kept (1).
-    std::vector<signed char> usoCampo_;
     CIProgress* progresso_ = nullptr;
     int inseridos_ = 0;
     int paginasCriadas_ = 0;
