@@ -251,6 +251,26 @@ void CICad::SetAtributosLista(const OdDbObjectId& referencia, const zv::CEListaA
     }
 }
 
+namespace {
+
+// A definition's tag and default value as the values are asked for with them (trimmed), made
+// once per layout instead of once per reference.
+struct TextosDefinicao {
+    std::uint64_t serie = 0;
+    QString tag, padrao;
+};
+
+const TextosDefinicao& Textos(const zvdb::AttributeLayout& leitura) {
+    static std::unordered_map<const zvdb::AttributeLayout*, TextosDefinicao> porLeitura;
+    TextosDefinicao& textos = porLeitura[&leitura];
+    if (textos.serie != leitura.serial())
+        textos = {leitura.serial(), Q(leitura.tag()).trimmed(),
+                  Q(leitura.defaultValue()).trimmed()};
+    return textos;
+}
+
+}  // namespace
+
 void cicad::PreparaAtributos(zvdb::Database& db, const zvdb::BlockRecord& bloco,
                              const CEValoresAtributos& valores, AtributosNovos& novos) {
     // What each definition gives is read once for the drawing, not once a reference.
@@ -264,8 +284,8 @@ void cicad::PreparaAtributos(zvdb::Database& db, const zvdb::BlockRecord& bloco,
         if (leitura.isConstant()) continue;
         novos.definicoes.push_back(def);
         if (!valores) continue;
-        std::optional<QString> valor =
-            valores(Q(leitura.tag()).trimmed(), Q(leitura.defaultValue()).trimmed());
+        const TextosDefinicao& textos = Textos(leitura);
+        std::optional<QString> valor = valores(textos.tag, textos.padrao);
         novos.dados.emplace_back();
         if (!valor) continue;
         novos.textos.push_back(U8(*valor));

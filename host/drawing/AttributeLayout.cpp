@@ -5,6 +5,7 @@
 #include "TagList.h"
 #include "TagValues.h"
 
+#include <atomic>
 #include <bit>
 
 namespace zvdb {
@@ -36,6 +37,11 @@ bool sameTags(std::span<const Tag> a, std::span<const Tag> b) {
     return true;
 }
 
+std::uint64_t nextSerial() {
+    static std::atomic<std::uint64_t> serial{0};
+    return serial.fetch_add(1, std::memory_order_relaxed) + 1;
+}
+
 }  // namespace
 
 AttributeLayout::AttributeLayout(Database& target, const Attribute& definition)
@@ -46,7 +52,8 @@ AttributeLayout::AttributeLayout(Database& target, const Attribute& definition)
       ownRotation_(definition.rotation()),
       tag_(definition.tag()),
       defaultValue_(definition.textValue()),
-      constant_(definition.isConstant()) {
+      constant_(definition.isConstant()),
+      serial_(nextSerial()) {
     // Whether the attribute takes a rotation depends on the reference: both ways are ready.
     plain_ = makeVariant(target, definition, false);
     rotated_ = makeVariant(target, definition, true);

@@ -36,6 +36,9 @@ public:
     std::string_view tag() const { return tag_; }
     std::string_view defaultValue() const { return defaultValue_; }
     bool isConstant() const { return constant_; }
+    // A number that no other layout of the program has had: what callers keep about a
+    // layout stays good while the layout they find under its definition has the same.
+    std::uint64_t serial() const { return serial_; }
 
     // The part of a placement the layout needs, worked out once per reference.
     struct Placement {
@@ -69,6 +72,7 @@ private:
     std::string_view tag_;
     std::string_view defaultValue_;
     bool constant_ = false;
+    std::uint64_t serial_;
     // For references that leave the attribute unrotated, and for the others.
     Variant plain_;
     Variant rotated_;

@@ -312,6 +312,14 @@ std::span<const Tag> DbObject::xdataItems(std::string_view application) const {
     return {};
 }
 
+namespace {
+// Room for `more` tags at the exact size: an object gains extended data once or twice, and
+// a list doubled for it would keep its spare room for the rest of the run.
+void fitFor(std::vector<Tag>& all, std::size_t more) {
+    if (all.size() + more > all.capacity()) all.reserve(all.size() + more);
+}
+}  // namespace
+
 void DbObject::setXData(std::string_view application, std::span<const Tag> items) {
     database_->registerApplication(application);
     const std::size_t start = xdataStart();
@@ -333,12 +341,14 @@ void DbObject::setXData(std::string_view application, std::span<const Tag> items
         group.push_back(Tag{item.code, store(item.value)});
     all.erase(all.begin() + static_cast<std::ptrdiff_t>(begin),
               all.begin() + static_cast<std::ptrdiff_t>(end));
+    fitFor(all, group.size());
     all.insert(all.begin() + static_cast<std::ptrdiff_t>(begin), group.begin(), group.end());
 }
 
 void DbObject::addXData(std::string_view application, std::span<const Tag> items) {
     database_->registerApplication(application);
     auto& all = editTags();
+    fitFor(all, items.size() + 1);
     all.push_back(Tag{1001, store(application)});
     for (const Tag& item : items)
         all.push_back(Tag{item.code, store(item.value)});

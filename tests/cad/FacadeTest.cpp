@@ -227,6 +227,54 @@ TEST_F(FacadeFixture, InsertingWithValuesMakesEachAttributeWithItsValue) {
     EXPECT_EQ(atributosA[1]->textValue(), "feito");
 }
 
+// The tag and default asked about are those of the definition as it stands at each
+// insertion: a definition edited, or a block redefined from its file, between two rows.
+TEST_F(FacadeFixture, ValuesAreAskedWithTheDefinitionsCurrentTagAndDefault) {
+    const QString caminho = arquivoBloco("ROW", {"CAMPO_A", "CAMPO_B"}, [](zvdb::Database& b) {
+        for (zvdb::Attribute* def : b.modelSpace()->attributeDefinitions())
+            def->setTextValue("  def " + std::string(def->tag()) + " ");
+    });
+    QStringList perguntas;
+    const CEValoresAtributos valores = [&](const QString& tag,
+                                           const QString& padrao) -> std::optional<QString> {
+        perguntas << tag + "|" + padrao;
+        return tag + "=" + padrao;
+    };
+    const auto valoresDe = [&](const OdDbObjectId& id) {
+        QStringList textos;
+        auto* ref = dynamic_cast<zvdb::BlockReference*>(db().objectByHandle(id.handle()));
+        for (zvdb::Attribute* atributo : ref ? ref->attributes() : std::vector<zvdb::Attribute*>())
+            textos << QString::fromStdString(std::string(atributo->textValue()));
+        return textos;
+    };
+    const OdDbObjectId primeira = CICad::InsereBloco(caminho, "ROW", "0", 0, 0, 0, 0, valores);
+    const OdDbObjectId segunda = CICad::InsereBloco(caminho, "ROW", "0", 0, -5, 0, 0, valores);
+    EXPECT_EQ(perguntas, QStringList({"CAMPO_A|def CAMPO_A", "CAMPO_B|def CAMPO_B",
+                                      "CAMPO_A|def CAMPO_A", "CAMPO_B|def CAMPO_B"}));
+    EXPECT_EQ(valoresDe(segunda), QStringList({"CAMPO_A=def CAMPO_A", "CAMPO_B=def CAMPO_B"}));
+    // The second definition takes a new default and a new tag.
+    zvdb::BlockRecord* bloco = db().block("ROW");
+    ASSERT_TRUE(bloco);
+    zvdb::Attribute* segundaDefinicao = bloco->attributeDefinitions().at(1);
+    segundaDefinicao->setTextValue(" novo ");
+    segundaDefinicao->setText(2, "CAMPO_C");
+    perguntas.clear();
+    const OdDbObjectId terceira = CICad::InsereBloco(caminho, "ROW", "0", 0, -10, 0, 0, valores);
+    EXPECT_EQ(perguntas, QStringList({"CAMPO_A|def CAMPO_A", "CAMPO_C|novo"}));
+    EXPECT_EQ(valoresDe(terceira), QStringList({"CAMPO_A=def CAMPO_A", "CAMPO_C=novo"}));
+    // Redefined from a file whose first definition has another default.
+    const QString outro = arquivoBloco("ROW2", {"CAMPO_A"}, [](zvdb::Database& b) {
+        b.modelSpace()->attributeDefinitions().front()->setTextValue("outro");
+    });
+    ASSERT_TRUE(CICad::RecarregaBloco(outro, "ROW"));
+    perguntas.clear();
+    const OdDbObjectId quarta = CICad::InsereBloco(caminho, "ROW", "0", 0, -15, 0, 0, valores);
+    EXPECT_EQ(perguntas, QStringList({"CAMPO_A|outro"}));
+    EXPECT_EQ(valoresDe(quarta), QStringList({"CAMPO_A=outro"}));
+    EXPECT_EQ(valoresDe(primeira), QStringList({"CAMPO_A=def CAMPO_A"}))
+        << "a reference made before keeps the value of the tag still defined";
+}
+
 TEST_F(FacadeFixture, RedefiningABlockKeepsValuesAndDropsRemovedTags) {
     const QString v1 = arquivoBloco("REGUA_V1", {"REGUA", "NUMERO", "VELHO"});
     const OdDbObjectId ref = CICad::InsereBloco(v1, "BORNE_C", "0", 0, 0, 0, 0);

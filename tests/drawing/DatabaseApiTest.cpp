@@ -196,6 +196,34 @@ TEST_F(DatabaseApi, ExtendedDataKeepsApplicationsAndRepeatedGroups) {
     EXPECT_TRUE(seen["appids"].toArray().contains("ZV_OTHER"));
 }
 
+// Extended data given to a new reference or to an object read from a file takes the room
+// it needs and no more: a list run gives it to tens of thousands of objects.
+TEST_F(DatabaseApi, ExtendedDataLeavesNoSpareRoomBehind) {
+    BlockRecord* block = db.createBlock("ROW");
+    BlockReference* made = db.modelSpace()->addBlockReference(*block, {1, 2, 0});
+    const Tag link[] = {tag(1000, "REP"), tag(1000, "1F"), tag(1000, "*0"), tag(1000, "KEY")};
+    made->setXData("KVR_ZV_LINK", link);
+    EXPECT_EQ(made->editTags().capacity(), made->tags().size());
+    ASSERT_EQ(made->xdata("KVR_ZV_LINK").size(), 4u);
+    EXPECT_EQ(made->xdata("KVR_ZV_LINK")[3].value, "KEY");
+
+    auto again = reloaded(db);
+    Entity* read = again->entityByHandle(made->handle());
+    ASSERT_NE(read, nullptr);
+    const std::size_t before = read->tags().size();
+    const Tag pair[] = {tag(1000, "REP"), tag(1000, "2A")};
+    read->setXData("KVR_ZV_OTHER", pair);
+    EXPECT_EQ(read->tags().size(), before + 3);
+    EXPECT_EQ(read->editTags().capacity(), read->tags().size());
+    // Replaced by a longer group, it grows to that size.
+    const Tag longer[] = {tag(1000, "REP"), tag(1000, "2A"), tag(1000, "REP2"), tag(1000, "3B")};
+    read->setXData("KVR_ZV_OTHER", longer);
+    EXPECT_EQ(read->tags().size(), before + 5);
+    EXPECT_EQ(read->editTags().capacity(), read->tags().size());
+    EXPECT_EQ(read->xdata("KVR_ZV_LINK").size(), 4u);
+    EXPECT_EQ(read->xdata("KVR_ZV_OTHER")[3].value, "3B");
+}
+
 TEST_F(DatabaseApi, DictionariesAndXrecordsByPath) {
     const std::vector<std::string> none = {"ZV_DATA_MGR", "CELayoutRotasFios"};
     EXPECT_EQ(db.dictionaryAt(none, false), nullptr);
