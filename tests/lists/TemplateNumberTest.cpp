@@ -45,9 +45,9 @@ TEST(TemplateNumberTest, BlanksBeforeTheNumberAreSkippedUnicodeOnesToo) {
 }
 
 TEST(TemplateNumberTest, TextThatIsNoNumberIsZero) {
-    for (const QString& texto : {QString(), QString(""), QString("   "), QString("abc"),
-                                 QString("-"), QString("+"), QString("."), QString(".e1"),
-                                 QString("+-1"), QString("e5")}) {
+    for (const QString& texto :
+         {QString(), QString(""), QString("   "), QString("abc"), QString("-"), QString("+"),
+          QString("."), QString(".e1"), QString("+-1"), QString("e5")}) {
         const double valor = Real(texto);
         EXPECT_EQ(valor, 0.0) << texto.toStdString();
         EXPECT_FALSE(std::signbit(valor)) << texto.toStdString();
