@@ -262,6 +262,8 @@ struct TextosDefinicao {
 
 const TextosDefinicao& Textos(const zvdb::AttributeLayout& leitura) {
     static std::unordered_map<const zvdb::AttributeLayout*, TextosDefinicao> porLeitura;
+    // layouts of drawings closed since stay behind: drawings that come and go keep this bounded
+    if (porLeitura.size() >= 4096 && !porLeitura.count(&leitura)) porLeitura.clear();
     TextosDefinicao& textos = porLeitura[&leitura];
     if (textos.serie != leitura.serial())
         textos = {leitura.serial(), Q(leitura.tag()).trimmed(),
