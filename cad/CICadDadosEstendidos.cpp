@@ -71,20 +71,35 @@ CEListaXData ConverteXData(std::span<const zvdb::Tag> itens) {
     return lista;
 }
 
-std::vector<zvdb::Tag> TagsXData(zvdb::Database& db, const CEListaXData& itens) {
+// The items as tags over texts of their own: the drawing stores each value when the tags
+// are set, so they are not put in its storage here too.
+struct TagsXData {
+    std::vector<std::string> textos;
     std::vector<zvdb::Tag> tags;
-    auto num = [&db](double v) { return db.store(QByteArray::number(v, 'g', 17).toStdString()); };
-    for (const CEItemXData& item : itens) {
-        if (item.codigo >= 1010 && item.codigo <= 1013) {
-            tags.push_back({std::int16_t(item.codigo), num(item.x)});
-            tags.push_back({std::int16_t(item.codigo + 10), num(item.y)});
-            tags.push_back({std::int16_t(item.codigo + 20), num(item.z)});
-        } else {
-            tags.push_back({std::int16_t(item.codigo), db.store(U8(item.texto))});
+
+    explicit TagsXData(const CEListaXData& itens) {
+        std::size_t n = 0;
+        for (const CEItemXData& item : itens)
+            n += item.codigo >= 1010 && item.codigo <= 1013 ? 3 : 1;
+        textos.reserve(n);  // no reallocation: the tags hold views of the texts
+        tags.reserve(n);
+        for (const CEItemXData& item : itens) {
+            if (item.codigo >= 1010 && item.codigo <= 1013) {
+                poe(item.codigo, QByteArray::number(item.x, 'g', 17).toStdString());
+                poe(item.codigo + 10, QByteArray::number(item.y, 'g', 17).toStdString());
+                poe(item.codigo + 20, QByteArray::number(item.z, 'g', 17).toStdString());
+            } else {
+                poe(item.codigo, U8(item.texto));
+            }
         }
     }
-    return tags;
-}
+
+private:
+    void poe(int codigo, std::string texto) {
+        textos.push_back(std::move(texto));
+        tags.push_back({std::int16_t(codigo), textos.back()});
+    }
+};
 
 // The handle in an extended-data item (text or handle group).
 OdDbObjectId IdDoItem(zvdb::Database& db, const CEListaXData& itens, size_t indice) {
@@ -135,8 +150,7 @@ bool CICad::TextoXData(const OdDbObjectId& id, const char* aplicacao, QString& t
 void CICad::SetXData(const OdDbObjectId& id, const QString& aplicacao, const CEListaXData& itens) {
     zvdb::DbObject* objeto = Objeto(id);
     if (!objeto) return;
-    const std::vector<zvdb::Tag> tags = TagsXData(objeto->database(), itens);
-    objeto->setXData(U8(aplicacao), tags);
+    objeto->setXData(U8(aplicacao), TagsXData(itens).tags);
 }
 
 OdDbObjectId CICad::IdDoHandle(const QString& handle, zvdb::Database* database) {
@@ -255,7 +269,7 @@ CEListaXData CICad::GetPaineisDefinidos() {
 void CICad::SetPaineisDefinidos(const CEListaXData& paineis) {
     Protegido("CICad::SetPaineisDefinidos", [&] {
         if (zvdb::Entity* ponto = PontoConfiguracao("KVR_ZV_PAINEL", true))
-            ponto->setXData("KVR_ZV_PAINEL", TagsXData(ponto->database(), paineis));
+            ponto->setXData("KVR_ZV_PAINEL", TagsXData(paineis).tags);
         return 0;
     });
 }

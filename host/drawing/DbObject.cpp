@@ -336,7 +336,8 @@ void DbObject::setXData(std::string_view application, std::span<const Tag> items
     }
     std::vector<Tag> group;
     group.reserve(items.size() + 1);
-    group.push_back(Tag{1001, store(application)});
+    // the same few application names on many objects: one copy each
+    group.push_back(Tag{1001, database_->storeShared(application)});
     for (const Tag& item : items)
         group.push_back(Tag{item.code, store(item.value)});
     all.erase(all.begin() + static_cast<std::ptrdiff_t>(begin),
@@ -349,7 +350,7 @@ void DbObject::addXData(std::string_view application, std::span<const Tag> items
     database_->registerApplication(application);
     auto& all = editTags();
     fitFor(all, items.size() + 1);
-    all.push_back(Tag{1001, store(application)});
+    all.push_back(Tag{1001, database_->storeShared(application)});
     for (const Tag& item : items)
         all.push_back(Tag{item.code, store(item.value)});
 }

@@ -79,6 +79,31 @@ TEST_F(PaginasTest, BaseNamesAndLayerOperations) {
     EXPECT_EQ(descongelados(), QStringList({"0", "NOVO"}));
 }
 
+TEST_F(FacadeFixture, ExtendedDataIsStoredOnceWhetherSetOrReplaced) {
+    // Blocks are tied to their symbols by extended data by the tens of thousands: each value
+    // must be kept once, not once for the call and again by the drawing.
+    zvdb::Entity* ponto = db().modelSpace()->addPoint({0, 0, 0});
+    const OdDbObjectId id(&db(), ponto->handle());
+    CICad::SetXData(id, "KVR_ZV_REPRESENTACAO", {{1000, "a"}, {1010, "", 1.5, 2.5, 0}});
+    CEListaXData lidos = CICad::GetXData(id, "KVR_ZV_REPRESENTACAO");
+    ASSERT_EQ(lidos.size(), 2u);
+    EXPECT_EQ(lidos[1].codigo, 1010);
+    EXPECT_DOUBLE_EQ(lidos[1].x, 1.5);
+    EXPECT_DOUBLE_EQ(lidos[1].y, 2.5);
+    // A text longer than the storage's blocks always gets room of its own: what it costs shows.
+    const QString longo(100000, QChar('x'));
+    for (int vez = 0; vez < 2; ++vez) {
+        const std::size_t antes = db().storageBytes();
+        CICad::SetXData(id, "KVR_ZV_REPRESENTACAO", {{1000, longo}});
+        const std::size_t custo = db().storageBytes() - antes;
+        EXPECT_GE(custo, std::size_t(100000)) << vez;
+        EXPECT_LT(custo, std::size_t(150000)) << vez;
+    }
+    lidos = CICad::GetXData(id, "KVR_ZV_REPRESENTACAO");
+    ASSERT_EQ(lidos.size(), 1u);
+    EXPECT_EQ(lidos[0].texto, longo);
+}
+
 TEST_F(FacadeFixture, BlockFilesWithTwoLayersOrNestedReferencesAreRefused) {
     const QString duasCamadas = arquivoBloco("DUAS", {"TAG"}, [](zvdb::Database& b) {
         b.createLayer("OUTRA");
