@@ -149,7 +149,7 @@ CCFioGrfWriter::Papel CCFioGrfWriter::PapelDoTag(const QString& tag) {
     Papel papel = Papel::Outro;
     if (ComecaCom(tag, "VARIAVEL", "VARIABLE"))
         papel = Papel::Variavel;
-    else if (ComecaCom(tag, "FUNCAO", "FUNCTION"))
+    else if (CCListaPaginada::EhFuncao(tag))
         papel = Papel::Funcao;
     else if (ComecaCom(tag, "TOTAL", "TOTAL"))
         papel = Papel::Total;
@@ -183,39 +183,10 @@ void CCFioGrfWriter::InsereLinha(const CCListaPaginada::Bloco& bloco, const QStr
         }
         return std::nullopt;
     };
-    OdDbObjectId ref;
-    const auto conhecido = comFuncao_.constFind(bloco.nome);
-    if (conhecido != comFuncao_.constEnd() && !conhecido.value()) {
-        // A block without functions gets its cells' values as its attributes are made,
-        // instead of being read back and written again.
-        ref = CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, linha.x, linha.y, 0, 0,
-                                 [&](const QString& tag, const QString& padrao) {
-                                     return valor(PapelDoTag(tag), padrao);
-                                 });
-        if (ref.isNull()) return;
-    } else {
-        // Functions run with the row's attributes in the drawing, each in its turn, so a
-        // block that has them is filled after it is placed; the first row of a block tells
-        // which kind it is.
-        ref = CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, linha.x, linha.y, 0, 0);
-        if (ref.isNull()) return;
-        std::unique_ptr<zv::CEListaAtributos> atributos;
-        CICad::GetAtributos(ref, atributos, false, false);
-        bool publicado = false;
-        for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
-            zv::CEAtributo& atributo = (*atributos)[i];
-            const Papel papel = PapelDoTag(atributo.GetTag());
-            if (papel == Papel::Funcao) {
-                if (!publicado) item.paraLisp();
-                publicado = true;
-                atributo.SetValor(CCListaPaginada::AvaliaFuncao(atributo.GetValor()));
-            } else if (const std::optional<QString> texto = valor(papel, atributo.GetValor())) {
-                atributo.SetValor(*texto);
-            }
-        }
-        if (publicado) CEItemLista::limparLisp();
-        if (atributos) comFuncao_.insert(bloco.nome, publicado);
-    }
+    const OdDbObjectId ref = preenchidos_.Insere(
+        bloco.arquivo, bloco.nome, layer, linha.x, linha.y, item,
+        [&](const QString& tag, const QString& padrao) { return valor(PapelDoTag(tag), padrao); });
+    if (ref.isNull()) return;
     if (!variasColunas_ && !item.ids.empty() && !item.ids.front().isNull())
         CICad::SetXData(ref, "KVR_ZV_LINK",
                         {{1000, ZVString::DeHandle(item.ids.front().handle())}});
@@ -235,7 +206,7 @@ void CCFioGrfWriter::EscrevePagina(const CEPaginaLista& pagina) {
 }
 
 void CCFioGrfWriter::EscreverItens(VetorItens& itens, CETemplate& modelo) {
-    comFuncao_.clear();
+    preenchidos_.Reinicia();
     impressos_.clear();
     grupo_ = modelo.LerTexto("FUNCAO_LSTGRW");
     variasColunas_ = modelo.LerLogico("*COLUNA_SN*");

@@ -44,8 +44,8 @@ protected:
     // Header, detail, first-row detail, footer, total.
     std::vector<CCListaPaginada::Bloco> blocos_;
     QHash<QString, Papel> papeis_;
-    // Per row block of the run, by name: whether it has function cells.
-    QHash<QString, bool> comFuncao_;
+    // The run's row blocks, filled from their items.
+    CCListaPaginada::BlocosPreenchidos preenchidos_;
     // A length's printed form with the run's digits; rows repeat a few lengths.
     const QString& Impresso(const QString& comprimento);
     QHash<QString, QString> impressos_;

@@ -95,10 +95,6 @@ bool EhVariavel(const QString& tag) {
     return tag.startsWith(QLatin1String("VARIAVEL")) || tag.startsWith(QLatin1String("VARIABLE"));
 }
 
-bool EhFuncao(const QString& tag) {
-    return tag.startsWith(QLatin1String("FUNCAO")) || tag.startsWith(QLatin1String("FUNCTION"));
-}
-
 }  // namespace
 
 void CCListaPaginada::InsereDetalhe(const Bloco& bloco, const QString& layer,
@@ -152,6 +148,40 @@ void CCListaPaginada::Grade::Coloca(CEPaginaLista& pagina, CEItemLista* item,
         {item, double(CICad::Simples(x)), double(CICad::Simples(y)), {}, {}, std::move(proprio)});
     ++contagem;
     y = float(CICad::Simples(y - h));
+}
+
+bool CCListaPaginada::EhFuncao(const QString& tag) {
+    return tag.startsWith(QLatin1String("FUNCAO"), Qt::CaseInsensitive) ||
+           tag.startsWith(QLatin1String("FUNCTION"), Qt::CaseInsensitive);
+}
+
+OdDbObjectId CCListaPaginada::BlocosPreenchidos::Insere(const QString& arquivo, const QString& nome,
+                                                        const QString& layer, double x, double y,
+                                                        const CEItemLista& item,
+                                                        const Valor& valor) {
+    if (arquivo.isEmpty()) return {};
+    const auto conhecido = comFuncao_.constFind(nome);
+    if (conhecido != comFuncao_.constEnd() && !conhecido.value())
+        return CICad::InsereBloco(arquivo, nome, layer, x, y, 0, 0, valor);
+    const OdDbObjectId referencia = CICad::InsereBloco(arquivo, nome, layer, x, y, 0, 0);
+    if (referencia.isNull()) return referencia;
+    std::unique_ptr<zv::CEListaAtributos> atributos;
+    CICad::GetAtributos(referencia, atributos, false, false);
+    bool publicado = false;
+    for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
+        zv::CEAtributo& atributo = (*atributos)[i];
+        const QString tag = atributo.GetTag();
+        if (EhFuncao(tag)) {
+            if (!publicado) item.paraLisp();
+            publicado = true;
+            atributo.SetValor(AvaliaFuncao(atributo.GetValor()));
+        } else if (const std::optional<QString> texto = valor(tag, atributo.GetValor())) {
+            atributo.SetValor(*texto);
+        }
+    }
+    if (publicado) CEItemLista::limparLisp();
+    if (atributos) comFuncao_.insert(nome, publicado);
+    return referencia;
 }
 
 void CCListaPaginada::Grade::Reinicia() {

@@ -3,9 +3,14 @@
 // pages in the project, and fill header, footer and detail rows from page fields and items.
 #include "CEPaginaLista.h"
 
+#include "cad/OdDbObjectId.h"
+
+#include <QHash>
 #include <QStringList>
 
+#include <functional>
 #include <memory>
+#include <optional>
 #include <vector>
 
 class CETemplate;
@@ -43,6 +48,29 @@ public:
                               bool variasColunas);
     // The value of a FUNCAO expression for the published item; empty unless a string.
     static QString AvaliaFuncao(const QString& expressao);
+
+    // Whether a block's attribute tag names a function cell (FUNCAO, FUNCTION, any case).
+    static bool EhFuncao(const QString& tag);
+
+    // Blocks placed and filled from an item, for one writer run. Each cell that is no function
+    // takes what the writer's `valor` gives for its tag and default text (none leaves it as it
+    // is); function cells are worked out with the item published, once the block is in the
+    // drawing and each in its turn. The first insertion of a block tells whether it has
+    // function cells: a block without gets its values as its attributes are made, instead of
+    // being read back and written again.
+    class BlocosPreenchidos {
+    public:
+        using Valor =
+            std::function<std::optional<QString>(const QString& tag, const QString& padrao)>;
+        // The block of that name from that file; null when there is no file or it was not
+        // placed.
+        OdDbObjectId Insere(const QString& arquivo, const QString& nome, const QString& layer,
+                            double x, double y, const CEItemLista& item, const Valor& valor);
+        void Reinicia() { comFuncao_.clear(); }
+
+    private:
+        QHash<QString, bool> comFuncao_;
+    };
 
     // The running grid of a list's rows, in single precision as the drawing keeps it.
     struct Grade {

@@ -52,52 +52,14 @@ OdDbObjectId CCBorneDwgWriter::Insere(const Bloco& bloco, const QString& layer, 
     return CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, x, y, 0, 0);
 }
 
-namespace {
-
-// The value of an attribute that is no function: a VARIAVEL names the field in its default
-// text, any other tag is the field's own name.
-QString ValorCampo(const CEItemLista& item, const QString& tag, const QString& padrao) {
-    return item.valorCampo(ComecaCom(tag, "VARIAVEL", "VARIABLE") ? padrao : tag);
-}
-
-bool EhFuncao(const QString& tag) {
-    return ComecaCom(tag, "FUNCAO", "FUNCTION");
-}
-
-}  // namespace
-
 OdDbObjectId CCBorneDwgWriter::InserePreenchido(const Bloco& bloco, const QString& layer, double x,
                                                 double y, const CEItemLista& item) {
-    if (!bloco.existe()) return {};
-    const auto conhecido = comFuncao_.constFind(bloco.nome);
-    if (conhecido != comFuncao_.constEnd() && !conhecido.value())
-        // A block without functions gets the item's values as its attributes are made,
-        // instead of being read back and written again.
-        return CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, x, y, 0, 0,
-                                  [&item](const QString& tag, const QString& padrao) {
-                                      return std::optional<QString>(ValorCampo(item, tag, padrao));
-                                  });
-    // Functions run with the block's attributes in the drawing, each in its turn, so a block
-    // that has them is filled after it is placed; its first insertion tells which kind it is.
-    const OdDbObjectId referencia = Insere(bloco, layer, x, y);
-    if (referencia.isNull()) return referencia;
-    std::unique_ptr<zv::CEListaAtributos> atributos;
-    CICad::GetAtributos(referencia, atributos, false, false);
-    bool publicado = false;
-    for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
-        zv::CEAtributo& atributo = (*atributos)[i];
-        const QString tag = atributo.GetTag();
-        if (EhFuncao(tag)) {
-            if (!publicado) item.paraLisp();
-            publicado = true;
-            atributo.SetValor(CCListaPaginada::AvaliaFuncao(atributo.GetValor()));
-        } else {
-            atributo.SetValor(ValorCampo(item, tag, atributo.GetValor()));
-        }
-    }
-    if (publicado) CEItemLista::limparLisp();
-    if (atributos) comFuncao_.insert(bloco.nome, publicado);
-    return referencia;
+    // A VARIAVEL cell names the field in its default text; any other is the field of its tag.
+    return preenchidos_.Insere(bloco.arquivo, bloco.nome, layer, x, y, item,
+                               [&item](const QString& tag, const QString& padrao) {
+                                   return std::optional<QString>(item.valorCampo(
+                                       ComecaCom(tag, "VARIAVEL", "VARIABLE") ? padrao : tag));
+                               });
 }
 
 void CCBorneDwgWriter::DesenhaRegua(const CEReguaDwg& regua, const QString& layer) {
@@ -157,7 +119,7 @@ void CCBorneDwgWriter::DesenhaSemBorne(const std::vector<CESimboloDwg*>& simbolo
 
 void CCBorneDwgWriter::Escreve(VetorItens& itens, CETemplate& modelo) {
     modelo_ = CEModeloReguas();
-    comFuncao_.clear();
+    preenchidos_.Reinicia();
     const CEModeloReguas::Parametros parametros = CEModeloReguas::Parametros::DoModelo(modelo);
     modelo_.Constroi(itens);
     modelo_.CalculaTrilhas();

@@ -5,6 +5,7 @@
 // (ZV_LISTA_TIPO "COMP") and terminals ("BORNE").
 #include "CEModeloReguas.h"
 #include "catalogue/CECacheCatalogo.h"
+#include "lists/CCListaPaginada.h"
 #include "module/CCDataWriter.h"
 
 #include <QString>
@@ -52,8 +53,8 @@ private:
     CEModeloReguas modelo_;
     CECacheCatalogo catalogo_;
     QHash<QString, Bloco> blocosSimbolo_;
-    // Per block of the run, by name: whether it has function attributes.
-    QHash<QString, bool> comFuncao_;
+    // The run's blocks, filled from their items.
+    CCListaPaginada::BlocosPreenchidos preenchidos_;
 
     // The template's values of the run.
     QString norma_, representacao_;
