@@ -126,6 +126,8 @@ private:
     void LeExtensoes();
     // Makes the pages of one pass and inserts its blocks.
     void Desenha(const std::vector<Pagina>& paginas, const QHash<QString, CEPonto>& posicoes);
+    // Leaves the items of the pages only the fields their blocks' attributes take.
+    void Enxuga(const std::vector<Pagina>& paginas);
     void Insere(const QString& chave, const QString& layer, const CEPonto& ponto);
     // `lugar` is an accessory's place ("*0", "#1"), empty for the symbol's own block.
     void LigaSimbolo(const OdDbObjectId& simbolo, const QString& lugar, const QString& bloco);
