@@ -811,13 +811,15 @@ void CCDiagramaTopografico::Enxuga(const std::vector<Pagina>& paginas) {
                     tags.push_back(CamposItem::numero(tag.trimmed()));
                 }
             }
-    std::sort(tags.begin(), tags.end());
-    tags.erase(std::unique(tags.begin(), tags.end()), tags.end());
+    // By name number: a few hundred names in the whole program.
+    std::vector<char> pega(*std::max_element(tags.begin(), tags.end()) + 1, 0);
+    for (const std::uint32_t tag : tags)
+        pega[tag] = 1;
     std::vector<CamposItem::Campo> ficam;
     for (CEItemLista* item : itens) {
         ficam.clear();
         for (const CamposItem::Campo& campo : item->campos.todos())
-            if (std::binary_search(tags.begin(), tags.end(), campo.nome)) ficam.push_back(campo);
+            if (campo.nome < pega.size() && pega[campo.nome]) ficam.push_back(campo);
         if (ficam.size() == size_t(item->campos.size())) continue;
         CamposItem enxutos;
         enxutos.juntarOrdenados(ficam);
