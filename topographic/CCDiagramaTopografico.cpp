@@ -539,21 +539,35 @@ void CCDiagramaTopografico::AdicionaAcessorios(Candidatos& candidatos) {
 }
 
 void CCDiagramaTopografico::ProcuraBlocos(Candidatos& candidatos) {
-    // The catalogue cache answers each key and standard once; the names of a block are made
-    // once and shared by every candidate of it.
+    // Each key and standard is asked once; the names of a block are made once and shared by
+    // every candidate of it.
+    struct Bloco {
+        QString bloco, nome, arquivo;
+    };
+    QHash<std::pair<QString, QString>, Bloco> porChave;
     QHash<std::pair<QString, QString>, std::pair<QString, QString>> nomes;
     for (auto& [chave, candidato] : candidatos) {
-        candidato.bloco = Catalogo().BlocoRepresentacao(candidato.chave, candidato.norma,
+        const std::pair<QString, QString> chaveNorma{candidato.chave, candidato.norma};
+        auto achado = porChave.constFind(chaveNorma);
+        if (achado == porChave.constEnd()) {
+            Bloco bloco;
+            bloco.bloco = Catalogo().BlocoRepresentacao(candidato.chave, candidato.norma,
                                                         parametros_.representacao);
-        if (candidato.bloco.isEmpty()) continue;
-        const std::pair<QString, QString> bloco{candidato.bloco, candidato.norma};
-        auto achado = nomes.constFind(bloco);
-        if (achado == nomes.constEnd())
-            achado = nomes.insert(bloco, {candidato.bloco + "_" + candidato.norma,
-                                          diretorio_ + "DADOS\\" + candidato.norma + "\\BLOCOS\\" +
-                                              candidato.bloco + ".dwg"});
-        candidato.nome = achado->first;
-        candidato.arquivo = achado->second;
+            if (!bloco.bloco.isEmpty()) {
+                const std::pair<QString, QString> blocoNorma{bloco.bloco, candidato.norma};
+                auto nome = nomes.constFind(blocoNorma);
+                if (nome == nomes.constEnd())
+                    nome = nomes.insert(blocoNorma, {bloco.bloco + "_" + candidato.norma,
+                                                     diretorio_ + "DADOS\\" + candidato.norma +
+                                                         "\\BLOCOS\\" + bloco.bloco + ".dwg"});
+                bloco.nome = nome->first;
+                bloco.arquivo = nome->second;
+            }
+            achado = porChave.insert(chaveNorma, bloco);
+        }
+        candidato.bloco = achado->bloco;
+        candidato.nome = achado->nome;
+        candidato.arquivo = achado->arquivo;
     }
 }
 
