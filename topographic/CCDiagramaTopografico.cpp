@@ -19,6 +19,7 @@
 #include <algorithm>
 #include <cmath>
 #include <cstdint>
+#include <iterator>
 #include <memory>
 
 namespace {
@@ -396,22 +397,24 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     // Each symbol followed by its accessories, so that an accessory that sorts like its
     // symbol stands right after it. The symbol's handle is cut out once per key.
     const auto porSimbolo = [](std::vector<const Entrada*>& entradas) {
+        // The candidates come in key order, so the symbols are in order already and so are
+        // the accessories of one symbol: only the accessories are sorted, by their symbol's
+        // handle, and each group joins the symbols behind its own.
         struct Ordem {
             QString simbolo;
-            bool acessorio;
             const Entrada* entrada;
         };
-        std::vector<Ordem> ordem;
-        ordem.reserve(entradas.size());
+        std::vector<Ordem> simbolos, acessorios;
         for (const Entrada* entrada : entradas) {
             const int corte = entrada->first.lastIndexOf('_');
-            ordem.push_back({entrada->first.mid(corte + 1), corte >= 0, entrada});
+            (corte < 0 ? simbolos : acessorios).push_back({entrada->first.mid(corte + 1), entrada});
         }
-        std::sort(ordem.begin(), ordem.end(), [](const Ordem& a, const Ordem& b) {
-            if (a.simbolo != b.simbolo) return a.simbolo < b.simbolo;
-            if (a.acessorio != b.acessorio) return b.acessorio;
-            return a.entrada->first < b.entrada->first;
-        });
+        const auto porHandle = [](const Ordem& a, const Ordem& b) { return a.simbolo < b.simbolo; };
+        std::stable_sort(acessorios.begin(), acessorios.end(), porHandle);
+        std::vector<Ordem> ordem;
+        ordem.reserve(entradas.size());
+        std::merge(simbolos.begin(), simbolos.end(), acessorios.begin(), acessorios.end(),
+                   std::back_inserter(ordem), porHandle);
         for (size_t i = 0; i < ordem.size(); ++i)
             entradas[i] = ordem[i].entrada;
     };
