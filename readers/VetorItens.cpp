@@ -1,4 +1,5 @@
 #include "VetorItens.h"
+#include "VetorItensEstavel.h"
 
 #include <QHash>
 
@@ -58,10 +59,13 @@ int VetorItens::compararItens(const CEItemLista* a, const CEItemLista* b,
     return 0;
 }
 
-void VetorItens::ordenar(const QStringList& campos) {
-    if (campos.isEmpty() || size() < 2) return;
+namespace {
+
+// Ties keep their first order when `estavel`; else they fall where the sort leaves them.
+void OrdenaItens(VetorItens& itens, const QStringList& campos, bool estavel) {
+    if (campos.isEmpty() || itens.size() < 2) return;
     const size_t k = size_t(campos.size());
-    const size_t n = size();
+    const size_t n = itens.size();
     // Each item's place among the distinct texts of each field, worked out once per text:
     // a comparison is then a few integer compares, however long the texts and however many
     // items tie on the first fields. Two places compare as their texts do, so the sort below
@@ -74,7 +78,7 @@ void VetorItens::ordenar(const QStringList& campos) {
         indice.clear();
         distintas.clear();
         for (size_t i = 0; i < n; ++i) {
-            QString valor = Campo((*this)[i], campos[int(c)]);
+            QString valor = Campo(itens[i], campos[int(c)]);
             auto it = indice.constFind(valor);
             if (it == indice.constEnd()) {
                 it = indice.insert(valor, std::uint32_t(distintas.size()));
@@ -103,12 +107,22 @@ void VetorItens::ordenar(const QStringList& campos) {
         const std::uint32_t* pb = &postos[b * k];
         for (size_t c = 0; c < k; ++c)
             if (pa[c] != pb[c]) return pa[c] < pb[c];
-        return false;
+        return estavel && a < b;
     });
     std::vector<CEItemLista*> ordenado(n);
     for (size_t i = 0; i < n; ++i)
-        ordenado[i] = (*this)[ordem[i]];
-    std::copy(ordenado.begin(), ordenado.end(), begin());
+        ordenado[i] = itens[ordem[i]];
+    std::copy(ordenado.begin(), ordenado.end(), itens.begin());
+}
+
+}  // namespace
+
+void VetorItens::ordenar(const QStringList& campos) {
+    OrdenaItens(*this, campos, false);
+}
+
+void OrdenaItensEstavel(VetorItens& itens, const QStringList& campos) {
+    OrdenaItens(itens, campos, true);
 }
 
 void VetorItens::inverter() {

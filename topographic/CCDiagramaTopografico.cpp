@@ -8,6 +8,8 @@
 #include "module/ZVResultado.h"
 #include "readers/CEAtributo.h"
 #include "readers/CEListaAtributos.h"
+#include "readers/CamposItem.h"
+#include "readers/VetorItensEstavel.h"
 #include "readers/ZVString.h"
 #include "settings/CIMensagens.h"
 
@@ -16,6 +18,8 @@
 
 #include <algorithm>
 #include <cmath>
+#include <cstdint>
+#include <iterator>
 #include <memory>
 
 namespace {
@@ -37,8 +41,11 @@ const char* const kAppRepresentacaoEsq = "KVR_ZV_REPRESENTACAO_ESQ";
 const char* const kAppRepresentacaoAce = "KVR_ZV_REPRESENTACAO_ACE";
 const char* const kAppRepresentacaoAceEsq = "KVR_ZV_REPRESENTACAO_ACE_ESQ";
 const char* const kPassoPadrao = "15";
-// The item's place as read, the last key of the sort.
+// The item's place as read, which the sort keeps among items that sort alike.
 const char* const kCampoSequencia = "ZV_TOPO_SEQUENCIA";
+
+// Every item carries its candidate's key under this name.
+const QString kHandle = QStringLiteral("HANDLE");
 
 // The catalogue type of terminal blocks.
 const char* const kTipoBorne = "5";
@@ -82,6 +89,28 @@ std::vector<std::pair<QString, QString>> Pares(const CEListaXData& cadeia) {
     for (size_t i = 0; i + 1 < cadeia.size(); i += 2)
         pares.emplace_back(cadeia[i].texto, cadeia[i + 1].texto);
     return pares;
+}
+
+// Keeps the entries for which `fica` says so, asked in order, the kept ones in order.
+template <class Entradas, class Fica>
+void Filtra(Entradas& entradas, Fica fica) {
+    auto destino = entradas.begin();
+    for (auto it = entradas.begin(); it != entradas.end(); ++it)
+        if (fica(*it)) {
+            if (destino != it) *destino = std::move(*it);
+            ++destino;
+        }
+    entradas.erase(destino, entradas.end());
+}
+
+// In key order; of entries with one key the first gathered stays.
+template <class Entradas>
+void OrdenaPorChave(Entradas& entradas) {
+    const auto porChave = [](const auto& a, const auto& b) { return a.first < b.first; };
+    std::stable_sort(entradas.begin(), entradas.end(), porChave);
+    entradas.erase(std::unique(entradas.begin(), entradas.end(),
+                               [](const auto& a, const auto& b) { return a.first == b.first; }),
+                   entradas.end());
 }
 
 CEItemXData Texto(const QString& texto) {
@@ -354,39 +383,49 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
         if (chave.contains('_')) comAcessorios_.insert(chave.section('_', -1));
 
     // Terminals apart when asked; a handle that is no object joins neither list.
-    std::vector<QString> comuns, bornes;
-    for (const auto& [chave, candidato] : candidatos_) {
+    std::vector<const Entrada*> comuns, bornes;
+    for (const Entrada& entrada : candidatos_) {
+        const Candidato& candidato = entrada.second;
         if (p.borne) {
             if (candidato.simbolo.isNull()) continue;
             (Catalogo().TipoComp(candidato.chave).trimmed() == kTipoBorne ? bornes : comuns)
-                .push_back(chave);
+                .push_back(&entrada);
         } else {
-            comuns.push_back(chave);
+            comuns.push_back(&entrada);
         }
     }
     // Each symbol followed by its accessories, so that an accessory that sorts like its
     // symbol stands right after it. The symbol's handle is cut out once per key.
-    const auto porSimbolo = [](std::vector<QString>& chaves) {
-        std::vector<std::pair<QString, size_t>> ordem;
-        ordem.reserve(chaves.size());
-        for (size_t i = 0; i < chaves.size(); ++i)
-            ordem.emplace_back(chaves[i].section('_', -1), i);
-        std::sort(ordem.begin(), ordem.end(), [&](const auto& a, const auto& b) {
-            if (a.first != b.first) return a.first < b.first;
-            const QString &ca = chaves[a.second], &cb = chaves[b.second];
-            const bool aa = ca.contains('_'), ab = cb.contains('_');
-            return aa != ab ? ab : ca < cb;
-        });
-        std::vector<QString> ordenadas;
-        ordenadas.reserve(chaves.size());
-        for (const auto& [simbolo, i] : ordem)
-            ordenadas.push_back(std::move(chaves[i]));
-        chaves = std::move(ordenadas);
+    const auto porSimbolo = [](std::vector<const Entrada*>& entradas) {
+        // The candidates come in key order, so the symbols are in order already and so are
+        // the accessories of one symbol: only the accessories are sorted, by their symbol's
+        // handle, and each group joins the symbols behind its own.
+        struct Ordem {
+            QString simbolo;
+            const Entrada* entrada;
+        };
+        std::vector<Ordem> simbolos, acessorios;
+        for (const Entrada* entrada : entradas) {
+            const int corte = entrada->first.lastIndexOf('_');
+            (corte < 0 ? simbolos : acessorios).push_back({entrada->first.mid(corte + 1), entrada});
+        }
+        const auto porHandle = [](const Ordem& a, const Ordem& b) { return a.simbolo < b.simbolo; };
+        std::stable_sort(acessorios.begin(), acessorios.end(), porHandle);
+        std::vector<Ordem> ordem;
+        ordem.reserve(entradas.size());
+        std::merge(simbolos.begin(), simbolos.end(), acessorios.begin(), acessorios.end(),
+                   std::back_inserter(ordem), porHandle);
+        for (size_t i = 0; i < ordem.size(); ++i)
+            entradas[i] = ordem[i].entrada;
     };
     porSimbolo(comuns);
     porSimbolo(bornes);
     VetorItens itensComuns = LeItens(comuns, modelo);
     VetorItens itensBornes = LeItens(bornes, modelo);
+    // Everything is read: what the reading kept goes before the drawing grows.
+    LiberaLeituras();
+    donos_.clear();
+    comAcessorios_.clear();
     progresso.Definir(40);
     struct Destroi {
         VetorItens& a;
@@ -409,10 +448,8 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     }
     LePassos(itensBornes);
     // Items that sort alike keep the order above.
-    const QStringList ordenacao =
-        p.ordenacao.isEmpty() ? QStringList() : p.ordenacao + QStringList{kCampoSequencia};
-    itensComuns.ordenar(ordenacao);
-    itensBornes.ordenar(ordenacao);
+    OrdenaItensEstavel(itensComuns, p.ordenacao);
+    OrdenaItensEstavel(itensBornes, p.ordenacao);
     LeExtensoes();
     progresso.Definir(50);
 
@@ -425,7 +462,7 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
         std::vector<QString> chaves;
         chaves.reserve(itensComuns.size());
         for (const CEItemLista* item : itensComuns)
-            chaves.push_back(item->valorCampo("HANDLE"));
+            chaves.push_back(item->valorCampo(kHandle));
         const auto linhas =
             LinhasBlocos(chaves, extensoes_, retangulo.largura, p.margem, p.colunas);
         const auto paginas = Paginas(linhas, extensoes_, retangulo.altura, p.margem, p.linhas);
@@ -436,7 +473,7 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
         std::vector<Borne> lista;
         lista.reserve(itensBornes.size());
         for (const CEItemLista* item : itensBornes) {
-            const QString chave = item->valorCampo("HANDLE");
+            const QString chave = item->valorCampo(kHandle);
             lista.push_back({chave, passos_.value(chave), ReguaDe(*item)});
         }
         const auto linhas = LinhasBornes(lista, retangulo.largura, p.margem);
@@ -468,9 +505,11 @@ void CCDiagramaTopografico::ColetaCandidatos(Candidatos& candidatos) {
         const CEListaXData dados = CICad::GetXData(id, kAppSimbolo);
         if (dados.empty() || dados.front().codigo != 1000) continue;
         const QStringList partes = dados.front().texto.split(CCDataReader::kSeparador);
-        candidatos.emplace(ZVString::DeHandle(id.handle()),
-                           Candidato{partes.value(0), partes.value(1), QString(), id});
+        candidatos.emplace_back(
+            ZVString::DeHandle(id.handle()),
+            Candidato{partes.value(0), partes.value(1), QString(), id, QString(), QString()});
     }
+    OrdenaPorChave(candidatos);
 }
 
 void CCDiagramaTopografico::AdicionaAcessorios(Candidatos& candidatos) {
@@ -480,44 +519,67 @@ void CCDiagramaTopografico::AdicionaAcessorios(Candidatos& candidatos) {
         for (int i = 0; i < acessorios.size(); ++i) {
             const QString acessorio = acessorios[i].section('#', 0, 0);
             if (!acessorio.isEmpty())
-                novos.push_back({"*" + QString::number(i) + "_" + chave,
-                                 {acessorio, simbolo.norma, QString(), simbolo.simbolo}});
+                novos.push_back(
+                    {"*" + QString::number(i) + "_" + chave,
+                     {acessorio, simbolo.norma, QString(), simbolo.simbolo, QString(), QString()}});
         }
         const CEListaXData aditivos = CICad::GetXData(simbolo.simbolo, "ZV_VINC_ADITIVO");
         int indice = 0;
         for (size_t i = 0; i + 1 < aditivos.size(); i += 2) {
             const int quantidade = ZVString(aditivos[i].texto).ParaInteiro();
             for (int n = 0; n < quantidade && n < 1000; ++n)
-                novos.push_back(
-                    {"#" + QString::number(indice++) + "_" + chave,
-                     {aditivos[i + 1].texto, simbolo.norma, QString(), simbolo.simbolo}});
+                novos.push_back({"#" + QString::number(indice++) + "_" + chave,
+                                 {aditivos[i + 1].texto, simbolo.norma, QString(), simbolo.simbolo,
+                                  QString(), QString()}});
         }
     }
-    for (auto& [chave, candidato] : novos)
-        candidatos.emplace(chave, std::move(candidato));
+    // A symbol's key never has a "_": the new keys join without meeting the old ones.
+    OrdenaPorChave(novos);
+    const auto meio = candidatos.insert(candidatos.end(), std::make_move_iterator(novos.begin()),
+                                        std::make_move_iterator(novos.end()));
+    std::inplace_merge(candidatos.begin(), meio, candidatos.end(),
+                       [](const Entrada& a, const Entrada& b) { return a.first < b.first; });
 }
 
 void CCDiagramaTopografico::ProcuraBlocos(Candidatos& candidatos) {
-    // The catalogue cache answers each key and standard once.
-    for (auto& [chave, candidato] : candidatos)
-        candidato.bloco = Catalogo().BlocoRepresentacao(candidato.chave, candidato.norma,
+    // Each key and standard is asked once; the names of a block are made once and shared by
+    // every candidate of it.
+    struct Bloco {
+        QString bloco, nome, arquivo;
+    };
+    QHash<std::pair<QString, QString>, Bloco> porChave;
+    QHash<std::pair<QString, QString>, std::pair<QString, QString>> nomes;
+    for (auto& [chave, candidato] : candidatos) {
+        const std::pair<QString, QString> chaveNorma{candidato.chave, candidato.norma};
+        auto achado = porChave.constFind(chaveNorma);
+        if (achado == porChave.constEnd()) {
+            Bloco bloco;
+            bloco.bloco = Catalogo().BlocoRepresentacao(candidato.chave, candidato.norma,
                                                         parametros_.representacao);
-}
-
-QString CCDiagramaTopografico::Arquivo(const Candidato& candidato) const {
-    return diretorio_ + "DADOS\\" + candidato.norma + "\\BLOCOS\\" + candidato.bloco + ".dwg";
-}
-
-QString CCDiagramaTopografico::NomeBloco(const Candidato& candidato) {
-    return candidato.bloco + "_" + candidato.norma;
+            if (!bloco.bloco.isEmpty()) {
+                const std::pair<QString, QString> blocoNorma{bloco.bloco, candidato.norma};
+                auto nome = nomes.constFind(blocoNorma);
+                if (nome == nomes.constEnd())
+                    nome = nomes.insert(blocoNorma, {bloco.bloco + "_" + candidato.norma,
+                                                     diretorio_ + "DADOS\\" + candidato.norma +
+                                                         "\\BLOCOS\\" + bloco.bloco + ".dwg"});
+                bloco.nome = nome->first;
+                bloco.arquivo = nome->second;
+            }
+            achado = porChave.insert(chaveNorma, bloco);
+        }
+        candidato.bloco = achado->bloco;
+        candidato.nome = achado->nome;
+        candidato.arquivo = achado->arquivo;
+    }
 }
 
 void CCDiagramaTopografico::MantemComArquivo(Candidatos& candidatos) {
     QHash<QString, bool> legiveis;
-    for (auto it = candidatos.begin(); it != candidatos.end();) {
-        bool fica = !it->second.bloco.isEmpty();
+    Filtra(candidatos, [&](const Entrada& entrada) {
+        bool fica = !entrada.second.bloco.isEmpty();
         if (fica) {
-            const QString arquivo = Arquivo(it->second);
+            const QString& arquivo = entrada.second.arquivo;
             auto achado = legiveis.constFind(arquivo);
             if (achado == legiveis.constEnd()) {
                 QFile f(CICad::ResolveArquivo(arquivo));
@@ -527,8 +589,8 @@ void CCDiagramaTopografico::MantemComArquivo(Candidatos& candidatos) {
             }
             fica = achado.value();
         }
-        it = fica ? std::next(it) : candidatos.erase(it);
-    }
+        return fica;
+    });
 }
 
 void CCDiagramaTopografico::RenovaBlocos(Candidatos& candidatos) {
@@ -538,10 +600,10 @@ void CCDiagramaTopografico::RenovaBlocos(Candidatos& candidatos) {
     std::vector<std::pair<QString, QString>> blocos;
     QHash<QString, int> indices;
     for (const auto& [chave, candidato] : candidatos) {
-        const QString nome = NomeBloco(candidato);
+        const QString& nome = candidato.nome;
         if (indices.contains(nome)) continue;
         indices.insert(nome, int(blocos.size()));
-        blocos.emplace_back(Arquivo(candidato), nome);
+        blocos.emplace_back(candidato.arquivo, nome);
     }
     const std::vector<bool> recarregados = CICad::RecarregaBlocos(blocos);
     QSet<QString> prontos;
@@ -550,23 +612,19 @@ void CCDiagramaTopografico::RenovaBlocos(Candidatos& candidatos) {
         if (recarregados[i] || CICad::GetBlocoId(blocos[i].second, id))
             prontos.insert(blocos[i].second);
     }
-    for (auto it = candidatos.begin(); it != candidatos.end();)
-        it = prontos.contains(NomeBloco(it->second)) ? std::next(it) : candidatos.erase(it);
+    Filtra(candidatos,
+           [&](const Entrada& entrada) { return prontos.contains(entrada.second.nome); });
 }
 
 void CCDiagramaTopografico::DescartaDesenhados(Candidatos& candidatos) {
     const QString& representacao = parametros_.representacao;
-    for (auto it = candidatos.begin(); it != candidatos.end();) {
-        bool desenhado = false;
-        if (it->first.contains('_')) {
-            desenhado = AcessorioDesenhado(it->first, it->second);
-        } else {
-            for (const auto& [rep, handle] :
-                 Pares(CICad::GetXData(it->second.simbolo, kAppRepresentacaoEsq)))
-                if (rep == representacao && !CICad::IdDoHandle(handle).isNull()) desenhado = true;
-        }
-        it = desenhado ? candidatos.erase(it) : std::next(it);
-    }
+    Filtra(candidatos, [&](const Entrada& entrada) {
+        if (entrada.first.contains('_')) return !AcessorioDesenhado(entrada.first, entrada.second);
+        for (const auto& [rep, handle] :
+             Pares(CICad::GetXData(entrada.second.simbolo, kAppRepresentacaoEsq)))
+            if (rep == representacao && !CICad::IdDoHandle(handle).isNull()) return false;
+        return true;
+    });
 }
 
 bool CCDiagramaTopografico::AcessorioDesenhado(const QString& chave,
@@ -588,10 +646,12 @@ bool CCDiagramaTopografico::AcessorioDesenhado(const QString& chave,
     return false;
 }
 
-VetorItens CCDiagramaTopografico::LeItens(const std::vector<QString>& chaves, CETemplate& modelo) {
+VetorItens CCDiagramaTopografico::LeItens(const std::vector<const Entrada*>& entradas,
+                                          CETemplate& modelo) {
     VetorItens itens;
-    for (const QString& chave : chaves) {
-        const Candidato& candidato = candidatos_.at(chave);
+    for (const Entrada* entrada : entradas) {
+        const QString& chave = entrada->first;
+        const Candidato& candidato = entrada->second;
         if (candidato.simbolo.isNull()) continue;
         std::unique_ptr<CEItemLista> item;
         if (chave.contains('_')) {
@@ -607,9 +667,9 @@ VetorItens CCDiagramaTopografico::LeItens(const std::vector<QString>& chaves, CE
                 donos_.insert(chave, item ? std::make_shared<const CEItemLista>(*item) : nullptr);
         }
         if (!item) continue;
-        item->definirCampo("HANDLE", chave);
+        item->definirCampo(kHandle, chave);
         item->definirCampo(kCampoSequencia, QString::number(itens.size()));
-        itensPorHandle_.insert(chave, item.get());
+        itensPorHandle_.insert(chave, {item.get(), &candidato});
         itens.push_back(item.release());
     }
     return itens;
@@ -631,30 +691,42 @@ CEItemLista* CCDiagramaTopografico::LeItemAcessorio(const QString& chave,
     auto item = std::make_unique<CEItemLista>();
     item->ids = origem.ids;
     // It sits with its owner: the owner's tag, strip, number and page, in every language.
-    // The names are made once: a project has thousands of accessories.
-    static const QStringList kDoDono = [] {
+    // The names are looked up once: a project has thousands of accessories.
+    static const std::vector<std::uint32_t> kDoDono = [] {
         QStringList nomes;
         for (CampoTraduzido campo :
              {CampoTraduzido::Relacao, CampoTraduzido::Regua, CampoTraduzido::Numero})
             for (int idioma = 1; idioma <= 3; ++idioma)
                 nomes << CICad::TagTraduzida(campo, idioma);
-        return nomes + QStringList{"PAGINA", "GRUPO", "LAYER", "POSICAO"};
+        nomes << "PAGINA"
+              << "GRUPO"
+              << "LAYER"
+              << "POSICAO";
+        std::vector<std::uint32_t> numeros;
+        for (const QString& nome : nomes)
+            numeros.push_back(CamposItem::numero(nome));
+        return numeros;
     }();
-    for (const QString& nome : kDoDono)
-        if (const QString* valor = origem.campo(nome)) item->definirCampo(nome, *valor);
+    for (const std::uint32_t nome : kDoDono)
+        if (const QString* valor = origem.campos.procura(nome)) item->definirCampo(nome, *valor);
     // Everything else is the accessory's own.
-    static const QString kTipo("ZV_LISTA_TIPO"), kLista("ZV_LISTA"), kChave("ZV_KEY"),
-        kDescricao("DESCRICAO"), kTpDescri("TP_DESCRI"), kQtd("QTD"), kAce("ACE"), kUm("1");
+    static const std::uint32_t kTipo = CamposItem::numero("ZV_LISTA_TIPO"),
+                               kLista = CamposItem::numero("ZV_LISTA"),
+                               kChave = CamposItem::numero("ZV_KEY"),
+                               kDescricao = CamposItem::numero("DESCRICAO"),
+                               kTpDescri = CamposItem::numero("TP_DESCRI"),
+                               kQtd = CamposItem::numero("QTD");
+    static const QString kAce("ACE"), kUm("1");
     item->definirCampo(kTipo, kAce);
     item->definirCampo(kLista, Catalogo().ListaComp(candidato.chave, candidato.norma));
     item->definirCampo(kChave, candidato.chave);
     const QString descricao = Catalogo().DescricaoComp(candidato.chave);
     item->definirCampo(kDescricao, descricao);
     item->definirCampo(kTpDescri, descricao);
-    const QString* qtd = origem.campo(kQtd);
+    const QString* qtd = origem.campos.procura(kQtd);
     item->definirCampo(kQtd, qtd && !qtd->isEmpty() ? *qtd : kUm);
     LeColunasUsuario(QString(), *item, Catalogo().ColunasComp(candidato.chave));
-    const QString* listado = item->campo(kLista);
+    const QString* listado = item->campos.procura(kLista);
     if (!listado || *listado != QLatin1String("S")) return nullptr;
     return item.release();
 }
@@ -664,13 +736,14 @@ void CCDiagramaTopografico::LePassos(const VetorItens& bornes) {
     QHash<QString, QString> porBloco;
     const QString& tag = parametros_.borneDist;
     for (CEItemLista* item : bornes) {
-        const QString chave = item->valorCampo("HANDLE");
-        const Candidato& candidato = candidatos_.at(chave);
-        const QString nome = NomeBloco(candidato);
+        const QString chave = item->valorCampo(kHandle);
+        const Candidato* candidato = itensPorHandle_.value(chave).candidato;
+        if (!candidato) continue;
+        const QString& nome = candidato->nome;
         auto achado = porBloco.constFind(nome);
         if (achado == porBloco.constEnd()) {
             QString passo;
-            const auto definicoes = CICad::GetDefinicoesAtributos(Arquivo(candidato), nome);
+            const auto definicoes = CICad::GetDefinicoesAtributos(candidato->arquivo, nome);
             for (int i = 0; definicoes && !tag.isEmpty() && i < definicoes->Quantidade(); ++i)
                 if ((*definicoes)[i].GetTag() == tag) {
                     passo = (*definicoes)[i].GetValor();
@@ -688,7 +761,7 @@ void CCDiagramaTopografico::LeExtensoes() {
     QHash<QString, Extensao> porBloco;
     for (auto it = itensPorHandle_.constBegin(); it != itensPorHandle_.constEnd(); ++it) {
         const QString& chave = it.key();
-        const QString nome = NomeBloco(candidatos_.at(chave));
+        const QString& nome = it->candidato->nome;
         auto achado = porBloco.constFind(nome);
         if (achado == porBloco.constEnd()) {
             Extensao extensao;
@@ -712,6 +785,7 @@ void CCDiagramaTopografico::Desenha(const std::vector<Pagina>& paginas,
     for (size_t i = 0; i < paginas.size(); ++i)
         layers << CriaPagina(parametros_.grupo);
     paginasCriadas_ += int(paginas.size());
+    Enxuga(paginas);
     // A terminal that starts a strip stands twice in its row: it goes in once, at its
     // last entry, where its point was left.
     QHash<QString, int> restantes;
@@ -727,23 +801,66 @@ void CCDiagramaTopografico::Desenha(const std::vector<Pagina>& paginas,
     }
 }
 
+void CCDiagramaTopografico::Enxuga(const std::vector<Pagina>& paginas) {
+    // The blocks' attributes are all the items give from here on: their other fields go
+    // before the blocks go in, and the drawing grows into their room.
+    std::vector<CEItemLista*> itens;
+    std::vector<std::uint32_t> tags{CamposItem::numero(kHandle)};
+    QSet<QString> blocos;
+    for (const Pagina& pagina : paginas)
+        for (const Linha& linha : pagina)
+            for (const QString& chave : linha) {
+                const Lido lido = itensPorHandle_.value(chave);
+                if (!lido.item || !lido.candidato) continue;
+                itens.push_back(lido.item);
+                const QString& nome = lido.candidato->nome;
+                if (blocos.contains(nome)) continue;
+                blocos.insert(nome);
+                // A block that isn't there would be loaded here, before its turn: the items
+                // stay whole instead.
+                OdDbObjectId id;
+                if (!CICad::GetBlocoId(nome, id)) return;
+                const auto definicoes =
+                    CICad::GetDefinicoesAtributos(lido.candidato->arquivo, nome);
+                for (int i = 0; definicoes && i < definicoes->Quantidade(); ++i) {
+                    const QString tag = (*definicoes)[i].GetTag();
+                    tags.push_back(CamposItem::numero(tag));
+                    tags.push_back(CamposItem::numero(tag.trimmed()));
+                }
+            }
+    // By name number: a few hundred names in the whole program.
+    std::vector<char> pega(*std::max_element(tags.begin(), tags.end()) + 1, 0);
+    for (const std::uint32_t tag : tags)
+        pega[tag] = 1;
+    std::vector<CamposItem::Campo> ficam;
+    for (CEItemLista* item : itens) {
+        ficam.clear();
+        for (const CamposItem::Campo& campo : item->campos.todos())
+            if (campo.nome < pega.size() && pega[campo.nome]) ficam.push_back(campo);
+        if (ficam.size() == size_t(item->campos.size())) continue;
+        CamposItem enxutos;
+        enxutos.juntarOrdenados(ficam);
+        item->campos = std::move(enxutos);
+    }
+}
+
 void CCDiagramaTopografico::Insere(const QString& chave, const QString& layer,
                                    const CEPonto& ponto) {
-    CEItemLista* item = itensPorHandle_.value(chave);
-    const auto candidato = candidatos_.find(chave);
-    if (!item || candidato == candidatos_.end()) return;
+    const Lido lido = itensPorHandle_.value(chave);
+    CEItemLista* item = lido.item;
+    const Candidato* candidato = lido.candidato;
+    if (!item || !candidato) return;
     // Every attribute takes the item's field of its tag (blank when the item has none).
     const auto valores = [item](const QString& tag, const QString&) -> std::optional<QString> {
         const QString* valor = item->campo(tag);
         return valor ? *valor : QString();
     };
-    const OdDbObjectId ref =
-        CICad::InsereBloco(Arquivo(candidato->second), NomeBloco(candidato->second), layer, ponto.x,
-                           ponto.y, 0.0, 0.0, valores);
+    const OdDbObjectId ref = CICad::InsereBloco(candidato->arquivo, candidato->nome, layer, ponto.x,
+                                                ponto.y, 0.0, 0.0, valores);
     if (ref.isNull()) return;  // left out; the run goes on
     ++inseridos_;
     // The block names its symbol; an accessory's block also its place and catalogue key.
-    QString handle = item->valorCampo("HANDLE");
+    QString handle = item->valorCampo(kHandle);
     const int corte = handle.indexOf('_');
     const bool acessorio = corte >= 0;
     CEListaXData link{Texto(parametros_.representacao)};
@@ -752,17 +869,19 @@ void CCDiagramaTopografico::Insere(const QString& chave, const QString& layer,
     link.push_back(Texto(handle));
     if (acessorio) {
         link.push_back(Texto(prefixo));
-        link.push_back(Texto(candidato->second.chave));
+        link.push_back(Texto(candidato->chave));
     }
-    CICad::SetXData(ref, acessorio ? kAppRepresentacaoAce : kAppRepresentacao, link);
-    LigaSimbolo(candidato->second.simbolo, prefixo, ZVString::DeHandle(ref.handle()));
+    static const QString kRepresentacao(kAppRepresentacao), kAce(kAppRepresentacaoAce);
+    CICad::SetXData(ref, acessorio ? kAce : kRepresentacao, link);
+    LigaSimbolo(candidato->simbolo, prefixo, ZVString::DeHandle(ref.handle()));
 }
 
 void CCDiagramaTopografico::LigaSimbolo(const OdDbObjectId& simbolo, const QString& lugar,
                                         const QString& bloco) {
     if (simbolo.isNull()) return;  // the block stays unlinked; the next run adds it again
     const bool acessorio = !lugar.isEmpty();
-    const QString aplicacao = acessorio ? kAppRepresentacaoAceEsq : kAppRepresentacaoEsq;
+    static const QString kEsq(kAppRepresentacaoEsq), kAceEsq(kAppRepresentacaoAceEsq);
+    const QString& aplicacao = acessorio ? kAceEsq : kEsq;
     // At most one block per representation, and for accessories one per place in the
     // symbol's list: a stale pair, or the old block of the same one, goes.
     CEListaXData cadeia;

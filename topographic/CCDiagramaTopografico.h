@@ -93,9 +93,18 @@ private:
     struct Candidato {
         QString chave, norma, bloco;
         OdDbObjectId simbolo;  // the symbol itself, or the one whose accessory it is
+        // The drawing's block name and the block's file, made once per block and shared by
+        // its candidates.
+        QString nome, arquivo;
     };
-    // Candidates by key, in key order.
-    using Candidatos = std::map<QString, Candidato>;
+    // Candidates with their keys, in key order once gathered, each key once.
+    using Entrada = std::pair<QString, Candidato>;
+    using Candidatos = std::vector<Entrada>;
+    // An item read for the layout, with the candidate it was read for.
+    struct Lido {
+        CEItemLista* item = nullptr;
+        const Candidato* candidato = nullptr;
+    };
 
     void ColetaCandidatos(Candidatos& candidatos);
     void AdicionaAcessorios(Candidatos& candidatos);
@@ -103,8 +112,9 @@ private:
     void MantemComArquivo(Candidatos& candidatos);
     void RenovaBlocos(Candidatos& candidatos);
     void DescartaDesenhados(Candidatos& candidatos);
-    // The items of the keys, in key order; those that give none or are not listed fall out.
-    VetorItens LeItens(const std::vector<QString>& chaves, CETemplate& modelo);
+    // The items of the candidates, in their order; those that give none or are not listed
+    // fall out.
+    VetorItens LeItens(const std::vector<const Entrada*>& entradas, CETemplate& modelo);
     // An accessory's item: its own catalogue fields under its owner's relation, strip,
     // number and page; none when the owner or the accessory is not listed.
     CEItemLista* LeItemAcessorio(const QString& chave, const Candidato& candidato,
@@ -116,19 +126,18 @@ private:
     void LeExtensoes();
     // Makes the pages of one pass and inserts its blocks.
     void Desenha(const std::vector<Pagina>& paginas, const QHash<QString, CEPonto>& posicoes);
+    // Leaves the items of the pages only the fields their blocks' attributes take.
+    void Enxuga(const std::vector<Pagina>& paginas);
     void Insere(const QString& chave, const QString& layer, const CEPonto& ponto);
     // `lugar` is an accessory's place ("*0", "#1"), empty for the symbol's own block.
     void LigaSimbolo(const OdDbObjectId& simbolo, const QString& lugar, const QString& bloco);
-
-    QString Arquivo(const Candidato& candidato) const;
-    static QString NomeBloco(const Candidato& candidato);
 
     Parametros parametros_;
     QString diretorio_;
     Candidatos candidatos_;
     Extensoes extensoes_;
     QHash<QString, double> passos_;
-    QHash<QString, CEItemLista*> itensPorHandle_;
+    QHash<QString, Lido> itensPorHandle_;
     // The owners of accessories, read once each; null for one that gives no listed item.
     QHash<QString, std::shared_ptr<const CEItemLista>> donos_;
     // The symbols that have accessories among the candidates.

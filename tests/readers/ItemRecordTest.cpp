@@ -1,6 +1,7 @@
 // Item records, their fields, the natural ordering and the vector operations.
 #include "readers/CEItemLista.h"
 #include "readers/VetorItens.h"
+#include "readers/VetorItensEstavel.h"
 #include "readers/ZVString.h"
 
 #include "QtPrinters.h"
@@ -351,6 +352,31 @@ TEST(OrderingTest, TiedItemsEndUpWhereAnItemByItemComparisonSortPutsThem) {
         }
     EXPECT_GT(empates, 300);
     EXPECT_GT(trocados, 0);
+}
+
+TEST(OrderingTest, AStableSortKeepsTiedItemsInTheirFirstOrder) {
+    // Enough items that an unstable sort would move ties (the test above shows it does).
+    Itens itens;
+    VetorItens v;
+    const char* grupos[] = {"X2", "X10", "", "1", "01"};
+    std::uint32_t semente = 11;
+    for (int i = 0; i < 400; ++i) {
+        semente = semente * 1103515245u + 12345u;
+        CEItemLista* item = itens.novo({{"ID", ""}});
+        item->definirCampoInteiro("ID", i);
+        item->definirCampo("G", grupos[(semente >> 16) % 5]);
+        v.push_back(item);
+    }
+    VetorItens esperado = v;
+    std::stable_sort(esperado.begin(), esperado.end(),
+                     [](const CEItemLista* a, const CEItemLista* b) {
+                         return VetorItens::compararItens(a, b, {"G"}) < 0;
+                     });
+    OrdenaItensEstavel(v, {"G"});
+    EXPECT_EQ(Valores(v, "ID"), Valores(esperado, "ID"));
+    // Sorting again changes nothing.
+    OrdenaItensEstavel(v, {"G"});
+    EXPECT_EQ(Valores(v, "ID"), Valores(esperado, "ID"));
 }
 
 TEST(VectorTest, MergeKeepsPointersOnceInOrder) {
