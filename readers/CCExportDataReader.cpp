@@ -183,7 +183,11 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
             const bool borne = !item->ids.empty() && CICad::EhReferencia(item->ids.front()) &&
                                EhBorne(CICad::GetNomeBloco(item->ids.front()));
             item->definirCampo(kTipo, borne ? kBorne : kComp);
-            if (borne) bornes.push_back(item);
+            // A component is complete with its kind: the room the kind's field grew goes.
+            if (borne)
+                bornes.push_back(item);
+            else
+                PartilhaNomes(*item);
         }
         if (item->valorCampo(kTipo) == kComp) {
             const QString relacao = Primeiro(*item, Nomes(QString()).relacoes);
@@ -197,6 +201,8 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
     for (CEItemLista* borne : bornes) {
         AoLigarInicio(*borne, borne->ids.front(), &modelo);
         AoLigarFim(*borne, borne->ids.front(), &modelo);
+        // The sides were the terminal's last fields: the room their growth left goes.
+        PartilhaNomes(*borne);
     }
 }
 

@@ -385,6 +385,24 @@ TEST_F(ExportTerminalSidesTest, ATerminalCarriesTheElementsAndWiresAtItsTwoPoint
     EXPECT_FALSE(tres->temCampo("REL_FIM"));
 }
 
+TEST_F(ExportTerminalSidesTest, ComponentsAndTerminalsKeepNoSpareRoomOnceRead) {
+    x1_ = borne("X1", "1", {20, 200, 0});
+    x2_ = borne("X1", "2", {60, 200, 0});
+    k1_ = componente("-K1", {{"A1", {20, 100, 0}}});
+    fio({{20, 190, 0}, {20, 100, 0}}, "1");
+    fio({{20, 200, 0}, {20, 220, 0}, {60, 220, 0}, {60, 200, 0}}, "5");
+    le(3);
+    ASSERT_TRUE(borneLido("1") && borneLido("2"));
+    // A large project holds hundreds of thousands of these: their arrays are as long as
+    // their fields, not as long as their growth made them.
+    for (const CEItemLista* item : lidos_) {
+        EXPECT_GT(item->campos.size(), 0);
+        EXPECT_EQ(item->campos.todos().capacity(), item->campos.todos().size())
+            << item->valorCampo("ZV_LISTA_TIPO").toStdString();
+    }
+    EXPECT_TRUE(borneLido("1")->temCampo("FIO_SEGFIM"));
+}
+
 TEST_F(ExportTerminalSidesTest, AnInvertedTerminalSwapsItsSides) {
     x1_ = borne("X1", "1", {20, 200, 0});
     x1_->addAttribute("INVERTIDO", "s", {24, 191, 0}, 1.0);
