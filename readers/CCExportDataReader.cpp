@@ -12,6 +12,7 @@
 #include <array>
 #include <cmath>
 #include <memory>
+#include <utility>
 
 namespace {
 
@@ -171,6 +172,7 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
     LeBlocos(database, std::nullopt, modelo, progresso);
     LeVirtuais(database, modelo);
     LePinos(database, modelo);
+    LiberaReferencias();
     ladosAdiados_ = false;
     std::vector<CEItemLista*> bornes;
     static const QString kTipo = QStringLiteral("ZV_LISTA_TIPO"), kBorne = QStringLiteral("BORNE"),
@@ -181,7 +183,11 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
             const bool borne = !item->ids.empty() && CICad::EhReferencia(item->ids.front()) &&
                                EhBorne(CICad::GetNomeBloco(item->ids.front()));
             item->definirCampo(kTipo, borne ? kBorne : kComp);
-            if (borne) bornes.push_back(item);
+            // A component is complete with its kind: the room the kind's field grew goes.
+            if (borne)
+                bornes.push_back(item);
+            else
+                PartilhaNomes(*item);
         }
         if (item->valorCampo(kTipo) == kComp) {
             const QString relacao = Primeiro(*item, Nomes(QString()).relacoes);
@@ -195,6 +201,8 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
     for (CEItemLista* borne : bornes) {
         AoLigarInicio(*borne, borne->ids.front(), &modelo);
         AoLigarFim(*borne, borne->ids.front(), &modelo);
+        // The sides were the terminal's last fields: the room their growth left goes.
+        PartilhaNomes(*borne);
     }
 }
 
@@ -256,6 +264,9 @@ QString CCExportDataReader::VizinhoPorLigacao(const QString& fio, const QString&
 // the second, and the relation of the end composed.
 void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade,
                                  CETemplate* modelo, bool inicio) {
+    // What the first side of a terminal left for its second side counts for the very next
+    // call only.
+    const FiosLidos fiosLidos = std::exchange(fiosLidos_, FiosLidos{});
     if (entidade.isNull() || !CICad::EhReferencia(entidade)) return;
     if (!EhBorne(CICad::GetNomeBloco(entidade))) return;
     // An inverted wire keeps its ends; any other wire has them the other way round.
@@ -307,19 +318,25 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
     if (doBorne && objeto.isNull()) return;
     QString ligacao;
     if (!objeto.isNull()) {
-        const std::unique_ptr<zv::CEAtributo> atributo =
-            AtributoConexaoProximo(objeto, PontoDaConexao(fio, conectado));
-        if (atributo) ligacao = atributo->GetValor();
         // The relation the wire reader composed for this end is no field of the object:
         // a terminal, which has no relation, is told by its strip and number instead.
         for (const QString& nome : Nomes(sufixo).relacoes)
             item.definirCampo(nome, QString());
         CopiaAtributos(sufixo, item, conectado);
+        // After the copy: an element it read for the first time lends its attributes to
+        // the connection's question.
+        const std::unique_ptr<zv::CEAtributo> atributo =
+            AtributoConexaoProximo(objeto, PontoDaConexao(fio, conectado));
+        if (atributo) ligacao = atributo->GetValor();
     }
     // The wire at the terminal's other point; a terminal's side reads the wires of both its
     // points, as the terminal list does, the other one under the second suffix.
     if (lado) {
-        CCBorneDataReader::LeFiosLado(*this, item, entidade, *lado, inicio, modelo);
+        // Both sides read the same two wires under the same suffixes: when the first side
+        // read them, the second finds them on the item.
+        const bool lidos = !inicio && fiosLidos.item == &item && fiosLidos.borne == entidade;
+        if (!lidos) CCBorneDataReader::LeFiosLado(*this, item, entidade, *lado, inicio, modelo);
+        if (inicio && EhFioNumerado(lado->fio)) fiosLidos_ = FiosLidos{&item, entidade};
     } else {
         const OdDbObjectId fioOutro = FioNoPonto(CICad::GetLayerEntidade(entidade), outro);
         if (!fioOutro.isNull())

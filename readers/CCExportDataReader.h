@@ -62,6 +62,12 @@ private:
     // While components are read the sides wait: a contact names its component only once
     // every component is known.
     bool ladosAdiados_ = false;
+    // The terminal whose first side has just read the wires of both its points.
+    struct FiosLidos {
+        const CEItemLista* item = nullptr;
+        OdDbObjectId borne;
+    };
+    FiosLidos fiosLidos_;
     QString PaginasOpcao() const;
     // The relation's separator and order, of the template or of the export settings.
     struct Composicao {

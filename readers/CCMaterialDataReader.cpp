@@ -123,6 +123,7 @@ VetorItens* CCMaterialDataReader::LerDados(zvdb::Database* database,
     resultado_.ordenar(modelo.LerListaTexto("*LISTA_DE_SORT*"));
     if (modelo.LerTexto("*ORDEM_CRESCENTE*") != "C") resultado_.inverter();
     if (simbolos_.vinculos == 1) IntercalaAcessorios(modelo);
+    LiberaReferencias();
     progresso.Definir(100);
     auto* itens = new VetorItens(std::move(resultado_));
     resultado_.clear();
@@ -152,11 +153,27 @@ void CCMaterialDataReader::AdicionaAcessorios(CEItemLista& item, CETemplate& mod
         Guarda(acessorio);
 }
 
+const QHash<QString, std::vector<OdDbObjectId>>& CCMaterialDataReader::ReferenciasPorBloco(
+    zvdb::Database* database) {
+    const std::uint64_t versao = CICad::VersaoDesenho(database);
+    if (!referencias_.lidas || referencias_.desenho != database || referencias_.versao != versao) {
+        referencias_.porBloco = CICad::GetReferenciasPorBloco(database);
+        referencias_.desenho = database;
+        referencias_.versao = versao;
+        referencias_.lidas = true;
+    }
+    return referencias_.porBloco;
+}
+
+void CCMaterialDataReader::LiberaReferencias() {
+    referencias_ = Referencias{};
+}
+
 void CCMaterialDataReader::LeBlocos(zvdb::Database* database,
                                     const std::optional<QStringList>& paginas, CETemplate& modelo,
                                     CIProgress& progresso) {
     const auto blocos = CICad::GetBlocos(database);
-    const auto referencias = CICad::GetReferenciasPorBloco(database);
+    const auto& referencias = ReferenciasPorBloco(database);
     const OdDbObjectId modelSpace = CICad::GetModelSpace(database);
     std::optional<QSet<QString>> layers;
     if (simbolos_.selecaoPaginas && paginas)
@@ -218,7 +235,7 @@ void CCMaterialDataReader::LeVirtuais(zvdb::Database* database, CETemplate& mode
 }
 
 void CCMaterialDataReader::LePinos(zvdb::Database* database, CETemplate& modelo) {
-    const auto referencias = CICad::GetReferenciasPorBloco(database);
+    const auto& referencias = ReferenciasPorBloco(database);
     const OdDbObjectId modelSpace = CICad::GetModelSpace(database);
     for (const auto& [nomeBloco, id] : CICad::GetBlocos(database)) {
         const QString nome = nomeBloco.toUpper();

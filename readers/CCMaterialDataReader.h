@@ -4,10 +4,12 @@
 // under one head, then sorted.
 #include "CCDataReader.h"
 
+#include <QHash>
 #include <QSet>
 
 #include <cstdint>
 #include <unordered_set>
+#include <vector>
 
 class CCMaterialDataReader : public CCDataReader {
 public:
@@ -40,6 +42,12 @@ protected:
     // Behind each item, its chain's accessories, grouped, in reverse order.
     void IntercalaAcessorios(CETemplate& modelo);
 
+    // Every block reference of the drawing by block name: the symbols' walk and the pins'
+    // walk of a read share one gathering, made again when the drawing changed.
+    const QHash<QString, std::vector<OdDbObjectId>>& ReferenciasPorBloco(zvdb::Database* database);
+    // The gathering is given back when a read ends.
+    void LiberaReferencias();
+
     // A listed item: a bus bar whose RELACAO was seen already is dropped; true if kept.
     bool Adiciona(CEItemLista* item, bool barramento);
     void Guarda(CEItemLista* item);
@@ -50,4 +58,13 @@ protected:
     std::unordered_set<std::uint64_t> vistos_;
     QSet<QString> relacoes_;
     QSet<QString> conectores_;
+
+private:
+    struct Referencias {
+        zvdb::Database* desenho = nullptr;
+        std::uint64_t versao = 0;
+        bool lidas = false;
+        QHash<QString, std::vector<OdDbObjectId>> porBloco;
+    };
+    Referencias referencias_;
 };

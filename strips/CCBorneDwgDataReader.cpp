@@ -6,36 +6,71 @@
 
 #include <QSet>
 
+#include <array>
 #include <memory>
 #include <unordered_set>
 
 namespace {
 
 QString Chave(const QString& regua, const QString& numero) {
-    return regua + QLatin1Char('\n') + numero;
+    QString chave;
+    chave.reserve(regua.size() + numero.size() + 1);
+    chave += regua;
+    chave += QLatin1Char('\n');
+    chave += numero;
+    return chave;
+}
+
+// The strip and number fields of the three languages, made once: every terminal asks.
+struct CamposRegua {
+    std::array<QString, 3> reguas, numeros;
+};
+
+const CamposRegua& Campos() {
+    static const CamposRegua campos = [] {
+        CamposRegua c;
+        for (size_t i = 0; i < 3; ++i) {
+            c.reguas[i] = QString::fromLatin1(CCBorneDataReader::kCamposRegua[i]);
+            c.numeros[i] = QString::fromLatin1(CCBorneDataReader::kCamposNumero[i]);
+        }
+        return c;
+    }();
+    return campos;
+}
+
+// The item's value without a copy; empty when the item has none.
+const QString& Valor(const CEItemLista& item, const QString& campo) {
+    static const QString kVazio;
+    const QString* valor = item.campo(campo);
+    return valor ? *valor : kVazio;
 }
 
 }  // namespace
 
 QSet<QString> CCBorneDwgDataReader::ChavesBornes(const VetorItens& bornes) {
+    const CamposRegua& campos = Campos();
     QSet<QString> chaves;
+    chaves.reserve(int(bornes.size()));
     for (const CEItemLista* borne : bornes)
-        for (int i = 0; i < 3; ++i) {
-            const QString regua = borne->valorCampo(CCBorneDataReader::kCamposRegua[i]);
-            const QString numero = borne->valorCampo(CCBorneDataReader::kCamposNumero[i]);
+        for (size_t i = 0; i < 3; ++i) {
+            const QString& regua = Valor(*borne, campos.reguas[i]);
+            const QString& numero = Valor(*borne, campos.numeros[i]);
             if (!regua.isEmpty() && !numero.isEmpty()) chaves.insert(Chave(regua, numero));
         }
     return chaves;
 }
 
 bool CCBorneDwgDataReader::Ligado(const CEItemLista& borne, const QSet<QString>& bornes) {
-    if (!borne.valorCampo("RELACAO_INI").isEmpty() || !borne.valorCampo("RELACAO_FIM").isEmpty())
-        return true;
-    const QString jumper = borne.valorCampo("JUMPER");
+    static const QString kRelacaoIni = QStringLiteral("RELACAO_INI"),
+                         kRelacaoFim = QStringLiteral("RELACAO_FIM"),
+                         kJumper = QStringLiteral("JUMPER");
+    if (!Valor(borne, kRelacaoIni).isEmpty() || !Valor(borne, kRelacaoFim).isEmpty()) return true;
+    const QString& jumper = Valor(borne, kJumper);
     if (jumper.isEmpty()) return false;
     const QStringList numeros = jumper.split(',', Qt::SkipEmptyParts);
-    for (int i = 0; i < 3; ++i) {
-        const QString regua = borne.valorCampo(CCBorneDataReader::kCamposRegua[i]);
+    const CamposRegua& campos = Campos();
+    for (size_t i = 0; i < 3; ++i) {
+        const QString& regua = Valor(borne, campos.reguas[i]);
         if (regua.isEmpty()) continue;
         for (const QString& numero : numeros)
             if (bornes.contains(Chave(regua, numero.trimmed()))) return true;
@@ -55,7 +90,8 @@ VetorItens* CCBorneDwgDataReader::LerDados(zvdb::Database* database,
 
     VetorItens componentes, bornes;
     for (CEItemLista* item : *lidos) {
-        const QString tipo = item->valorCampo("ZV_LISTA_TIPO");
+        static const QString kTipo = QStringLiteral("ZV_LISTA_TIPO");
+        const QString& tipo = Valor(*item, kTipo);
         if (tipo == "COMP") componentes.push_back(item);
         if (tipo == "BORNE") bornes.push_back(item);
     }

@@ -7,6 +7,7 @@
 #include <QMap>
 
 #include <algorithm>
+#include <array>
 #include <cstdint>
 #include <iterator>
 #include <limits>
@@ -153,30 +154,37 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
         borne->proximo = busca(borne->item->proximo);
         borne->anterior = busca(borne->item->anterior);
     }
+    // A terminal wired to two symbols is looked at by both: its connection values are
+    // gathered once for the build.
+    LigacoesDosBornes valores;
     for (const auto& regua : reguas)
-        OrdenaPorSimbolos(*regua);
+        OrdenaPorSimbolos(*regua, valores);
 }
 
-std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& simbolo) const {
-    // The symbol's connections by suffix: LIGACAO_1, CONNECTION_2...
-    QMap<QString, QString> ligacoes;
+std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& simbolo,
+                                                         LigacoesDosBornes& valores) const {
+    // The symbol's connections by suffix: LIGACAO_1, CONNECTION_2... One pass over its
+    // fields sorts them by language.
+    std::array<std::vector<const CamposItem::Campo*>, kLigacoesDoBorne> porIdioma;
+    for (const CamposItem::Campo& campo : simbolo.item->campos.todos()) {
+        const int p = PrefixoDoNome(campo.nome);
+        if (p >= 0 && p < kLigacoesDoBorne) porIdioma[size_t(p)].push_back(&campo);
+    }
     // A suffix given in two languages keeps the first language's value.
-    const std::vector<CamposItem::Campo>& campos = simbolo.item->campos.todos();
+    QMap<QString, QString> ligacoes;
     for (int p = 0; p < kLigacoesDoBorne; ++p)
-        for (const CamposItem::Campo& campo : campos)
-            if (PrefixoDoNome(campo.nome) == p) {
-                const QString sufixo = CamposItem::nome(campo.nome).mid(int(qstrlen(kPrefixos[p])));
-                if (!ligacoes.contains(sufixo)) ligacoes.insert(sufixo, campo.valor);
-            }
+        for (const CamposItem::Campo* campo : porIdioma[size_t(p)]) {
+            const QString sufixo = CamposItem::nome(campo->nome).mid(int(qstrlen(kPrefixos[p])));
+            if (!ligacoes.contains(sufixo)) ligacoes.insert(sufixo, campo->valor);
+        }
     // The terminals of each connection value, in the symbol's own order.
     QHash<QString, std::vector<CEBorneDwg*>> porLigacao;
     for (CEItemDwg* ligado : simbolo.ligados) {
         auto* borne = static_cast<CEBorneDwg*>(ligado);
-        for (const CamposItem::Campo& campo : borne->item->campos.todos())
-            if (PrefixoDoNome(campo.nome) == kLigacoesDoBorne) {
-                auto& lista = porLigacao[campo.valor];
-                if (lista.empty() || lista.back() != borne) lista.push_back(borne);
-            }
+        for (const QString& valor : ValoresDeLigacao(*borne, valores)) {
+            auto& lista = porLigacao[valor];
+            if (lista.empty() || lista.back() != borne) lista.push_back(borne);
+        }
     }
     std::vector<CEBorneDwg*> ordem;
     std::unordered_set<const CEBorneDwg*> tomados;
@@ -192,7 +200,16 @@ std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& sim
     return ordem;
 }
 
-void CEModeloReguas::OrdenaPorSimbolos(CEReguaDwg& regua) {
+const std::vector<QString>& CEModeloReguas::ValoresDeLigacao(const CEBorneDwg& borne,
+                                                             LigacoesDosBornes& valores) {
+    auto [it, novo] = valores.try_emplace(&borne);
+    if (novo)
+        for (const CamposItem::Campo& campo : borne.item->campos.todos())
+            if (PrefixoDoNome(campo.nome) == kLigacoesDoBorne) it->second.push_back(campo.valor);
+    return it->second;
+}
+
+void CEModeloReguas::OrdenaPorSimbolos(CEReguaDwg& regua, LigacoesDosBornes& valores) {
     std::vector<CEBorneDwg*> ordem;
     ordem.reserve(regua.bornes.size());
     std::unordered_set<const CEBorneDwg*> colocados;
@@ -201,7 +218,7 @@ void CEModeloReguas::OrdenaPorSimbolos(CEReguaDwg& regua) {
         for (CEItemDwg* ligado : borne->ligados) {
             auto* simbolo = static_cast<CESimboloDwg*>(ligado);
             if (!tratados.insert(simbolo).second) continue;
-            for (CEBorneDwg* irmao : BornesDoSimbolo(*simbolo))
+            for (CEBorneDwg* irmao : BornesDoSimbolo(*simbolo, valores))
                 if (irmao->regua == &regua && colocados.insert(irmao).second)
                     ordem.push_back(irmao);
         }

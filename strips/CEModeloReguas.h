@@ -12,6 +12,7 @@
 #include <QStringList>
 
 #include <memory>
+#include <unordered_map>
 #include <vector>
 
 class CETemplate;
@@ -56,9 +57,14 @@ public:
     std::vector<std::unique_ptr<CEReguaDwg>> reguas;
 
 private:
-    void OrdenaPorSimbolos(CEReguaDwg& regua);
+    // Per terminal, the values of its side connections (LIG_...) in field order.
+    using LigacoesDosBornes = std::unordered_map<const CEBorneDwg*, std::vector<QString>>;
+    void OrdenaPorSimbolos(CEReguaDwg& regua, LigacoesDosBornes& valores);
     // The symbol's terminals in the order of its connections; those that match none drop.
-    std::vector<CEBorneDwg*> BornesDoSimbolo(const CESimboloDwg& simbolo) const;
+    std::vector<CEBorneDwg*> BornesDoSimbolo(const CESimboloDwg& simbolo,
+                                             LigacoesDosBornes& valores) const;
+    static const std::vector<QString>& ValoresDeLigacao(const CEBorneDwg& borne,
+                                                        LigacoesDosBornes& valores);
     // Where the next piece of a strip begins (the terminal count when no cut is due), and
     // whether the strip ends its page there.
     size_t Corte(const CEReguaDwg& regua, int limite, const QStringList& chaves,

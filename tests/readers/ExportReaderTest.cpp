@@ -385,6 +385,24 @@ TEST_F(ExportTerminalSidesTest, ATerminalCarriesTheElementsAndWiresAtItsTwoPoint
     EXPECT_FALSE(tres->temCampo("REL_FIM"));
 }
 
+TEST_F(ExportTerminalSidesTest, ComponentsAndTerminalsKeepNoSpareRoomOnceRead) {
+    x1_ = borne("X1", "1", {20, 200, 0});
+    x2_ = borne("X1", "2", {60, 200, 0});
+    k1_ = componente("-K1", {{"A1", {20, 100, 0}}});
+    fio({{20, 190, 0}, {20, 100, 0}}, "1");
+    fio({{20, 200, 0}, {20, 220, 0}, {60, 220, 0}, {60, 200, 0}}, "5");
+    le(3);
+    ASSERT_TRUE(borneLido("1") && borneLido("2"));
+    // A large project holds hundreds of thousands of these: their arrays are as long as
+    // their fields, not as long as their growth made them.
+    for (const CEItemLista* item : lidos_) {
+        EXPECT_GT(item->campos.size(), 0);
+        EXPECT_EQ(item->campos.todos().capacity(), item->campos.todos().size())
+            << item->valorCampo("ZV_LISTA_TIPO").toStdString();
+    }
+    EXPECT_TRUE(borneLido("1")->temCampo("FIO_SEGFIM"));
+}
+
 TEST_F(ExportTerminalSidesTest, AnInvertedTerminalSwapsItsSides) {
     x1_ = borne("X1", "1", {20, 200, 0});
     x1_->addAttribute("INVERTIDO", "s", {24, 191, 0}, 1.0);
@@ -416,6 +434,40 @@ TEST_F(ExportTerminalSidesTest, TheSidesAreThoseTheTerminalListReads) {
         const CEItemLista* exportado = borneLido(daLista->valorCampo("NUMERO"));
         ASSERT_TRUE(exportado);
         EXPECT_FALSE(lados(*exportado).isEmpty());
+        EXPECT_EQ(lados(*exportado), lados(*daLista));
+    }
+    lidos->destruirItens();
+}
+
+TEST_F(ExportTerminalSidesTest, EachSideAloneOrBothTogetherReadTheWiresOfBothPoints) {
+    // X1:1 is wired at its insertion point only, X1:2 at its cut point only, X1:3 at both.
+    x1_ = borne("X1", "1", {20, 200, 0});
+    x2_ = borne("X1", "2", {60, 200, 0});
+    borne("X1", "3", {100, 200, 0});
+    k1_ = componente(
+        "-K1",
+        {{"A1", {20, 300, 0}}, {"A2", {60, 100, 0}}, {"A3", {100, 100, 0}}, {"A4", {100, 300, 0}}});
+    fio({{20, 200, 0}, {20, 300, 0}}, "1");
+    fio({{60, 190, 0}, {60, 100, 0}}, "2");
+    fio({{100, 190, 0}, {100, 100, 0}}, "3");
+    fio({{100, 200, 0}, {100, 300, 0}}, "4");
+    le(3);
+    const CEItemLista* um = borneLido("1");
+    const CEItemLista* dois = borneLido("2");
+    const CEItemLista* tres = borneLido("3");
+    ASSERT_TRUE(um && dois && tres);
+    EXPECT_EQ(um->valorCampo("FIO_SEGFIM"), "1");
+    EXPECT_EQ(dois->valorCampo("FIO_SEGINI"), "2");
+    EXPECT_EQ(tres->valorCampo("FIO_SEGINI"), "3");
+    EXPECT_EQ(tres->valorCampo("FIO_SEGFIM"), "4");
+    CCBorneDataReader lista;
+    CIProgress progresso;
+    std::unique_ptr<VetorItens> lidos(lista.LerDados(&db(), std::nullopt, modelo_, progresso));
+    ASSERT_TRUE(lidos);
+    ASSERT_EQ(lidos->size(), 3u);
+    for (const CEItemLista* daLista : *lidos) {
+        const CEItemLista* exportado = borneLido(daLista->valorCampo("NUMERO"));
+        ASSERT_TRUE(exportado);
         EXPECT_EQ(lados(*exportado), lados(*daLista));
     }
     lidos->destruirItens();

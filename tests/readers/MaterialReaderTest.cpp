@@ -187,6 +187,41 @@ TEST_F(MaterialReaderTest, ADrawingReadBesideTheActiveOneGivesItsOwnSymbols) {
     delete itens->at(0);
 }
 
+// A material reader that shows the block references it gathered.
+class LeitorReferencias : public CCMaterialDataReader {
+public:
+    size_t Quantas(zvdb::Database* database, const QString& bloco) {
+        const auto& referencias = ReferenciasPorBloco(database);
+        const auto it = referencias.constFind(bloco);
+        return it == referencias.constEnd() ? 0 : it->size();
+    }
+};
+
+TEST_F(MaterialReaderTest, TheReferencesGatheredOnceFollowAChangeOfTheDrawing) {
+    Simbolo("K", "SO", "ESQ$0001$A", {}, 0);
+    LeitorReferencias leitor;
+    EXPECT_EQ(leitor.Quantas(&db(), "K"), 1u);
+    Simbolo("K", "SO", "ESQ$0002$A", {}, 10);
+    EXPECT_EQ(leitor.Quantas(&db(), "K"), 2u);
+    // The same reader reads again after a symbol came in: it counts the new one too.
+    CIProgress progresso;
+    const auto membros = [&] {
+        std::unique_ptr<VetorItens> itens(leitor.LerDados(&db(), std::nullopt, modelo, progresso));
+        int n = 0;
+        for (CEItemLista* item : *itens)
+            for (CEItemLista* m = item; m;) {
+                CEItemLista* seguinte = m->ligado;
+                ++n;
+                delete m;
+                m = seguinte;
+            }
+        return n;
+    };
+    EXPECT_EQ(membros(), 2);
+    Simbolo("K", "SO", "ESQ$0003$A", {}, 20);
+    EXPECT_EQ(membros(), 3);
+}
+
 TEST_F(MaterialReaderTest, GroupingAHundredThousandItemsStaysNearLinear) {
     VetorItens itens;
     for (int i = 0; i < 100000; ++i) {

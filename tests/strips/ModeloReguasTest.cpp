@@ -151,6 +151,27 @@ TEST_F(ModeloReguasTest, ConnectionsOfOtherLanguagesCountAndTheFirstLanguageWins
     EXPECT_EQ(Reguas(Modelo()), QStringList({"X1: 3 2 1"}));
 }
 
+TEST_F(ModeloReguasTest, ATerminalOfTwoSymbolsIsPlacedByTheFirstAndTiesKeepTheStripOrder) {
+    CEItemLista* k1 = itens_.Simbolo("A1", "K1", {"11", "12"});
+    CEItemLista* k2 = itens_.Simbolo("A2", "K2", {"21", "22"});
+    auto x1 = itens_.Regua("X1", 4);
+    ItensRegua::Liga(x1[0], "INI", k2, "22");
+    ItensRegua::Liga(x1[1], "INI", k1, "12");
+    ItensRegua::Liga(x1[1], "FIM", k2, "21");
+    // 3 and 4 are both at K1's 11: the first of the strip takes it, the other keeps its turn.
+    ItensRegua::Liga(x1[2], "INI", k1, "11");
+    ItensRegua::Liga(x1[3], "INI", k1, "11");
+    // At 1, K2 places 2 (21) before 1 (22); at 2, K1 finds 3 (11) free and 2 placed.
+    EXPECT_EQ(Reguas(Modelo()), QStringList({"X1: 2 1 3 4"}));
+    // The same items changed and laid out again: the new connections count.
+    x1[3]->definirCampo("LIG_INI", "12");
+    x1[1]->definirCampo("LIG_INI", "11");
+    x1[2]->definirCampo("LIG_INI", "99");
+    CEModeloReguas outro;
+    outro.Constroi(itens_.itens);
+    EXPECT_EQ(Reguas(outro), QStringList({"X1: 2 1 4 3"}));
+}
+
 // ---- jumper tracks
 
 TEST_F(ModeloReguasTest, AChainBeginsPassesGoesThroughAndEnds) {
