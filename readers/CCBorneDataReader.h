@@ -7,6 +7,8 @@
 
 class CCBorneDataReader : public CCDataReader {
 public:
+    // A terminal's sides need the wires' elements and points, never their whole texts.
+    CCBorneDataReader() { GuardaCompletas = false; }
     void LerLadoIni(CEItemLista& item, const OdDbObjectId& borne, CETemplate& modelo) override;
     void LerLadoFim(CEItemLista& item, const OdDbObjectId& borne, CETemplate& modelo) override;
     // Reads every page of the database; the page list is not used.

@@ -127,7 +127,7 @@ void CCDataReader::CarregaConexoes(const QString& funcao, bool detalhes) {
                 conexoes.elementos
                     << (detalhes ? no->rstring.left(no->rstring.indexOf('#')) : no->rstring);
                 conexoes.handles.push_back(ZVString(conexoes.elementos.back()).ParaHandle());
-                if (detalhes) conexoes.completas << no->rstring;
+                if (detalhes && GuardaCompletas) conexoes.completas << no->rstring;
                 conexoes.pontos.push_back({});
                 coordenada = 0;
             } else if (no->restype == zvsdk::RTREAL && !conexoes.pontos.empty() && coordenada < 3) {

@@ -128,6 +128,9 @@ protected:
     // The symbols an item is made of are kept for CopiaEntidade: set by the readers that
     // read them again as neighbours of other symbols (the export reader's sides).
     bool GuardaSimbolos = false;
+    // The whole texts of the wires' entries ("HANDLE#CONNECTION#BLOCK") are kept for the
+    // readers that ask for them; one that never does leaves them to the answer.
+    bool GuardaCompletas = true;
     CECacheCatalogo& Catalogo() { return catalogo_; }
     // An item kept for the list shares its field names with the items kept before it.
     void PartilhaNomes(CEItemLista& item) { item.partilharNomes(); }
