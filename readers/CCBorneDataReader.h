@@ -60,6 +60,15 @@ private:
     bool Aceita(CEItemLista* item, CETemplate& modelo, VetorItens& itens);
     void RegistraNumero(const CEItemLista& item);
 
+    // How a side's relation is joined: the template's separator and order, read once a run.
+    struct Concatenacao {
+        const CETemplate* modelo = nullptr;
+        QString separador;
+        bool relacaoPrimeiro = false;
+    };
+    Concatenacao concatenacao_;
+    const Concatenacao& ConcatenacaoDo(CETemplate& modelo);
+
     bool avisouLista_ = false;
     bool duplicado_ = false;
     QHash<QString, QString> jumperPorNumero_;

@@ -406,7 +406,11 @@ bool CCDataReader::EhFioNumerado(const OdDbObjectId& entidade) const {
 
 QString CCDataReader::VizinhoNaConexao(const OdDbObjectId& entidade, const CEPonto& ponto,
                                        bool anterior) {
-    const OdDbObjectId fio = FioNoPonto(LayerDe(entidade), ponto);
+    return VizinhoNoFio(FioNoPonto(LayerDe(entidade), ponto), entidade, ponto, anterior);
+}
+
+QString CCDataReader::VizinhoNoFio(const OdDbObjectId& fio, const OdDbObjectId& entidade,
+                                   const CEPonto& ponto, bool anterior) const {
     if (fio.isNull()) return {};
     auto c = conexoes_.constFind(NumeroDoFio(fio));
     if (c == conexoes_.constEnd()) return {};

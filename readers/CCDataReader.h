@@ -65,6 +65,9 @@ public:
     bool EhFioNumerado(const OdDbObjectId& entidade) const;
     // The handle of the element next to the entity along the wire through the point.
     QString VizinhoNaConexao(const OdDbObjectId& entidade, const CEPonto& ponto, bool anterior);
+    // The same along `fio`, the wire already found at the point (null: none).
+    QString VizinhoNoFio(const OdDbObjectId& fio, const OdDbObjectId& entidade,
+                         const CEPonto& ponto, bool anterior) const;
     CEPonto PontoDeCorte(const OdDbObjectId& referencia) const;
     std::unique_ptr<zv::CEAtributo> AtributoConexaoProximo(const OdDbObjectId& elemento,
                                                            const CEPonto& ponto) const;

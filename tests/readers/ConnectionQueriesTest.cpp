@@ -306,6 +306,39 @@ TEST_F(NeighbourTest, ANeighbourThatDoesNotOpenLeavesTheSideBlank) {
     EXPECT_FALSE(item.valorCampo("LAYER_SEGFIM").isEmpty());
 }
 
+// The neighbour's relation and connection, joined the way each template says; a terminal
+// whose INVERTIDO reads "S" in any case has its sides' suffixes swapped.
+TEST_F(NeighbourTest, ASideJoinsRelationAndConnectionAsItsTemplateSays) {
+    k->addAttribute("RELACAO", "-K1", {20, 205, 0}, 2.5);
+    k->addAttribute("LIGACAO", "A1", {20, 190, 0}, 2.5);
+    CCBorneDataReader terminais;
+    terminais.CarregaConexoesFios();
+    TemplateDouble antes, depois;
+    antes.simbolos["*CHAR_SEP_STD_CFG*"] = ":";
+    antes.simbolos["*ORDEM_CONCAT_STD*"] = "1";
+    depois.simbolos["*CHAR_SEP_STD_CFG*"] = ".";
+    depois.simbolos["*ORDEM_CONCAT_STD*"] = "0";
+    CEItemLista primeiro, segundo;
+    terminais.LerLadoIni(primeiro, id(t), antes);
+    terminais.LerLadoIni(segundo, id(t), depois);
+    EXPECT_EQ(primeiro.valorCampo("RELACAO_FIM"), "-K1:A1");
+    EXPECT_EQ(segundo.valorCampo("TAG_FIM"), "A1.-K1");
+    for (const char* invertido : {"S", "s"}) {
+        CEItemLista item;
+        item.definirCampo("INVERTIDO", invertido);
+        terminais.LerLadoIni(item, id(t), antes);
+        EXPECT_EQ(item.valorCampo("RELACAO_INI"), "-K1:A1") << invertido;
+        EXPECT_FALSE(item.temCampo("RELACAO_FIM")) << invertido;
+    }
+    for (const char* reto : {"SS", "N", " S", ""}) {
+        CEItemLista item;
+        item.definirCampo("INVERTIDO", reto);
+        terminais.LerLadoIni(item, id(t), antes);
+        EXPECT_EQ(item.valorCampo("ETIQUETA_FIM"), "-K1:A1") << reto;
+        EXPECT_FALSE(item.temCampo("RELACAO_INI")) << reto;
+    }
+}
+
 // ---- wire numbers, cut points and connection attributes
 
 TEST_F(ConnectionQueriesTest, AWireNumberComesFromItsNamedFieldInAnyLanguage) {
