@@ -441,10 +441,7 @@ CEPonto CCDataReader::PontoDeCorte(const OdDbObjectId& referencia) const {
 }
 
 CEPonto CCDataReader::LePontoDeCorte(const OdDbObjectId& referencia) const {
-    const CEListaXData corte = CICad::GetXData(referencia, "KVR_ZV_PTS_CORTE");
-    std::vector<CEPonto> pontos;
-    for (const CEItemXData& item : corte)
-        if (item.codigo >= 1010 && item.codigo <= 1013) pontos.push_back({item.x, item.y, item.z});
+    const std::vector<CEPonto> pontos = CICad::PontosXData(referencia, "KVR_ZV_PTS_CORTE");
     if (pontos.size() >= 2)
         return CICad::PontosIguais(pontos[1], CICad::GetPosicao(referencia)) ? pontos[0]
                                                                              : pontos[1];
