@@ -228,9 +228,12 @@ const CCDataReader::FiosDoLayer& CCDataReader::IndiceFios(const QString& layer) 
         it = fiosPorLayer_.insert(layer, handles);
     }
     FiosDoLayer& f = *indice;
+    // The layer's name as the drawing holds it: each wire's is compared without a copy.
+    const QByteArray nomeLayer = layer.toUtf8();
+    const std::string_view nome(nomeLayer.constData(), std::size_t(nomeLayer.size()));
     for (const QString& handle : *it) {
         const OdDbObjectId fio = CICad::IdDoHandle(handle);
-        if (!CICad::EhPolilinha(fio) || CICad::GetLayerEntidade(fio) != layer) continue;
+        if (!CICad::EhPolilinha(fio) || CICad::NomeLayerUtf8(fio) != nome) continue;
         std::vector<CEPonto> vertices = CICad::GetVertices(fio);
         if (!vertices.empty()) primeirosVertices_.emplace(fio, vertices.front());
         if (vertices.size() < 2) continue;

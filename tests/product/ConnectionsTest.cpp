@@ -108,6 +108,17 @@ TEST_F(ConnectionsTest, WireListsByPage) {
               "(\"" + hex(two) + "\" \"" + hex(three) + "\")");
 }
 
+TEST_F(ConnectionsTest, WireHandlesAreUpperCaseHexadecimalTexts) {
+    // Wires until one's handle has a letter among its digits.
+    std::string texts = "(";
+    for (int i = 0; texts.find_first_of("ABCDEF") == std::string::npos; ++i) {
+        ASSERT_LT(i, 300);
+        auto* one = wire("ESQ$0003$A", {{10.0 * i, 10, 0}, {10.0 * i + 5, 10, 0}}, "5");
+        texts += (texts.size() > 1 ? " \"" : "\"") + hex(one) + "\"";
+    }
+    EXPECT_EQ(show("(getFiosPorLayer \"ESQ$0003$A\")"), texts + ")");
+}
+
 TEST_F(ConnectionsTest, WireListTakesEachWiresFirstPolylineOnThePagesAndFollowsEdits) {
     auto* late = wire("ESQ$0002$A", {{10, 10, 0}, {20, 10, 0}}, "401");  // drawn first, page 2
     auto* early = wire("ESQ$0001$A", {{10, 10, 0}, {20, 10, 0}}, "401");

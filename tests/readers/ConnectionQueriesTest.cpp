@@ -160,6 +160,22 @@ TEST_F(ConnectionQueriesTest, ALayersWiresAreAskedForOncePerReader) {
     EXPECT_EQ(leitor()->FioNoPonto(layer, {50, 200, 0}), id(depois));
 }
 
+// A redefined getFiosPorLayer may answer wires of any layer: only the asked layer's count.
+TEST_F(ConnectionQueriesTest, OnlyTheWiresOfTheAskedLayerAreTakenFromTheAnswer) {
+    const std::string acentuado = "ESQ$0003$\xC3\x89";  // É
+    db().createLayer(acentuado);
+    const zvdb::Polyline* aqui = fio({{0, 100, 0}, {100, 100, 0}}, "1", acentuado);
+    const zvdb::Polyline* outro = fio({{0, 200, 0}, {100, 200, 0}}, "2", "ESQ$0002$A");
+    const zvdb::Polyline* prefixo = fio({{0, 300, 0}, {100, 300, 0}}, "3", "ESQ$0003$");
+    CICad::AvaliaLisp(QString("(defun getFiosPorLayer (l) (list \"%1\" \"%2\" \"%3\"))")
+                          .arg(handle(outro), handle(aqui), handle(prefixo)));
+    auto r = leitor(0.5);
+    const QString layer = QString::fromUtf8(acentuado.c_str());
+    EXPECT_EQ(r->FioNoPonto(layer, {50, 100, 0}), id(aqui));
+    EXPECT_TRUE(r->FioNoPonto(layer, {50, 200, 0}).isNull());
+    EXPECT_TRUE(r->FioNoPonto(layer, {50, 300, 0}).isNull());
+}
+
 TEST_F(ConnectionQueriesTest, AWireVertexMovedInLispIsSeenByTheNextQuestion) {
     const zvdb::Polyline* w = fio({{0, 100, 0}, {100, 100, 0}}, "1");
     auto r = leitor(0.5);
