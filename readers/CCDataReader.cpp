@@ -121,7 +121,11 @@ void CCDataReader::CarregaConexoes(const QString& funcao, bool detalhes) {
         if (no->restype == zvsdk::RTLB || no->restype == zvsdk::RTLE) continue;
         const QString fio = no->restype == zvsdk::RTSTR ? no->rstring : QString();
         Conexoes conexoes;
-        if (!detalhes) conexoes.completas = conexoes_.value(fio).completas;
+        if (!detalhes) {
+            // a wire of the same number keeps its whole texts; nothing else of it is copied
+            auto antes = conexoes_.constFind(fio);
+            if (antes != conexoes_.constEnd()) conexoes.completas = antes->completas;
+        }
         if (no->rbnext && no->rbnext->restype == zvsdk::RTLE) {
             conexoes_[fio] = std::move(conexoes);
             no = no->rbnext;

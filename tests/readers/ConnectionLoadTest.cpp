@@ -65,6 +65,17 @@ TEST_F(ConnectionLoadTest, TheTerminalReaderKeepsHandlesAndPointsButNotTheWholeT
     EXPECT_EQ(*base.ListaConexoesCompletas("7"), QStringList({"1A#13#NA-1", "2B#4#X"}));
 }
 
+TEST_F(ConnectionLoadTest, ACableOfAWiresNumberTakesItsEntriesButKeepsTheWiresWholeTexts) {
+    CICad::AvaliaLisp("(defun getConexoesTodosFios () '((\"7\" (\"1A#13#NA-1\" 1.0 2.0 3.0))))");
+    CICad::AvaliaLisp("(defun getConexoesTodosCabos () '((\"7\" (\"3C\" 4.0 5.0 6.0))))");
+    LeitorBase leitor;
+    leitor.CarregaConexoesFios();
+    leitor.CarregaConexoesCabos();
+    EXPECT_EQ(*leitor.ListaConexoes("7"), QStringList({"3C"}));
+    EXPECT_EQ(*leitor.ListaConexoesCompletas("7"), QStringList({"1A#13#NA-1"}));
+    EXPECT_EQ(leitor.PontoDaConexao("7", "3C").z, 6.0);
+}
+
 #if defined(__GLIBC__)
 TEST_F(ConnectionLoadTest, WhatTheReadsHeldGoesBackToTheSystemWhenTheyAreFreed) {
     // 30,000 wires of two entries each: some megabytes of small texts and lists.
