@@ -475,8 +475,9 @@ std::unique_ptr<zv::CEAtributo> CCDataReader::AtributoConexaoProximo(const OdDbO
         for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
             const zv::CEAtributo& atributo = (*atributos)[i];
             const QString tag = atributo.GetTag().toUpper();
-            if (std::any_of(std::begin(kPalavrasConexao), std::end(kPalavrasConexao),
-                            [&tag](const char* palavra) { return tag.startsWith(palavra); }))
+            if (std::any_of(
+                    std::begin(kPalavrasConexao), std::end(kPalavrasConexao),
+                    [&tag](const char* palavra) { return tag.startsWith(QLatin1String(palavra)); }))
                 ligacoes.push_back({CICad::GetPosicaoTexto(atributo.GetId()), atributo});
         }
         achado = ligacoesPorElemento_.emplace(elemento, std::move(ligacoes)).first;
