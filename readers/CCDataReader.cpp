@@ -9,10 +9,6 @@
 #include <algorithm>
 #include <cmath>
 
-#if defined(__GLIBC__)
-#include <malloc.h>
-#endif
-
 using zvsdk::ResultBuffer;
 
 const QChar CCDataReader::kSeparador = QChar(0x0C);
@@ -94,11 +90,6 @@ void CCDataReader::LiberaLeituras() {
     atributosLidos_.reset();
     Esvazia(basesAcessorio_);
     Esvazia(basesColunas_);
-#if defined(__GLIBC__)
-    // What the reads held lies among the items in the heap, in holes too small for the
-    // writer's blocks, which would come on top of them: the holes' pages go back.
-    malloc_trim(0);
-#endif
 }
 
 // ---- connections

@@ -5,23 +5,7 @@
 #include "readers/CCBorneDataReader.h"
 #include "readers/LeitorBase.h"
 
-#include <unistd.h>
-
-#include <cstdio>
-#include <memory>
-#include <vector>
-
 namespace {
-
-// Pages of the process in memory now.
-long PaginasResidentes() {
-    long total = 0, residentes = 0;
-    FILE* f = std::fopen("/proc/self/statm", "r");
-    if (!f) return -1;
-    const int lidos = std::fscanf(f, "%ld %ld", &total, &residentes);
-    std::fclose(f);
-    return lidos == 2 ? residentes : -1;
-}
 
 class ConnectionLoadTest : public FacadeFixture {};
 
@@ -75,29 +59,5 @@ TEST_F(ConnectionLoadTest, ACableOfAWiresNumberTakesItsEntriesButKeepsTheWiresWh
     EXPECT_EQ(*leitor.ListaConexoesCompletas("7"), QStringList({"1A#13#NA-1"}));
     EXPECT_EQ(leitor.PontoDaConexao("7", "3C").z, 6.0);
 }
-
-#if defined(__GLIBC__)
-TEST_F(ConnectionLoadTest, WhatTheReadsHeldGoesBackToTheSystemWhenTheyAreFreed) {
-    // 30,000 wires of two entries each: some megabytes of small texts and lists.
-    CICad::AvaliaLisp(
-        "(defun getConexoesTodosFios (/ r i) (setq i 0)"
-        " (repeat 30000 (setq r (cons (list (itoa i) (list \"1A#1#X\" 1.0 2.0 3.0)"
-        " (list \"2B#2#Y\" 4.0 5.0 6.0)) r)) (setq i (1+ i))) r)");
-    auto leitor = std::make_unique<LeitorBase>();
-    leitor->CarregaConexoesFios();
-    ASSERT_TRUE(leitor->ListaConexoes("29999"));
-    // What a list keeps after the reading comes after the reads in the heap.
-    std::vector<std::unique_ptr<char[]>> itens;
-    for (int i = 0; i < 20000; ++i)
-        itens.push_back(std::make_unique<char[]>(100));
-    const long antes = PaginasResidentes();
-    ASSERT_GT(antes, 0);
-    leitor->LiberaLeituras();
-    const long depois = PaginasResidentes();
-    const long megabyte = 1024 * 1024 / sysconf(_SC_PAGESIZE);
-    EXPECT_LT(depois, antes - 2 * megabyte) << antes << " pages before, " << depois << " after";
-    EXPECT_FALSE(leitor->ListaConexoes("29999"));
-}
-#endif
 
 }  // namespace
