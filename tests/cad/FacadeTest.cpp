@@ -129,6 +129,12 @@ TEST_F(FacadeFixture, ThePointsOfExtendedDataAreThoseOfTheWholeList) {
     CICad::SetXData(id, "KVR_ZV_PTS_CORTE", {{1010, "", 7, 8, 0}});
     EXPECT_EQ(pontos(), QStringList({"7,8,0"}));
     EXPECT_EQ(pontos(), daLista());
+    // Texts that are no plain numbers read as the whole list reads them.
+    const zvdb::Tag estranhos[] = {{1010, " 1.5"}, {1020, "+2"},  {1030, "1e3"},
+                                   {1011, "abc"},  {1021, "0.1"}, {1031, "1e999"}};
+    ponto->setXData("KVR_ZV_PTS_CORTE", estranhos);
+    EXPECT_EQ(pontos(), daLista());
+    EXPECT_EQ(pontos().value(0), "1.5,2,1000");
     EXPECT_TRUE(CICad::PontosXData(id, "KVR_ZV_OUTRA").empty());
     EXPECT_TRUE(CICad::PontosXData(OdDbObjectId(), "KVR_ZV_PTS_CORTE").empty());
 }
