@@ -237,6 +237,8 @@ public:
     // The items behind the application's name; empty when the object has none.
     static CEListaXData GetXData(const OdDbObjectId& id, const QString& aplicacao);
     static CEListaXData GetXData(const OdDbObjectId& id, const char* aplicacao);
+    // The points (codes 1010 to 1013) of those items, in order, as GetXData reads them.
+    static std::vector<CEPonto> PontosXData(const OdDbObjectId& id, const char* aplicacao);
     // Whether the object has items under the application; `texto` takes the first text item,
     // if there is one (`temTexto`).
     static bool TextoXData(const OdDbObjectId& id, const char* aplicacao, QString& texto,

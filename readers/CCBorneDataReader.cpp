@@ -66,8 +66,11 @@ void CCBorneDataReader::LerLadoFim(CEItemLista& item, const OdDbObjectId& borne,
 
 namespace {
 
+// Asked at every side of every terminal: the field by its number, and no upper-case copy
+// of a text that cannot read "S".
 bool Invertido(const CEItemLista& borne) {
-    return borne.valorCampo("INVERTIDO").toUpper() == "S";
+    const QString* valor = borne.campos.procura(NumeroCampo<"INVERTIDO">());
+    return valor && valor->size() == 1 && valor->toUpper() == QLatin1String("S");
 }
 
 }  // namespace
@@ -89,12 +92,15 @@ CCBorneDataReader::LadoBorne CCBorneDataReader::AchaLado(CCDataReader& leitor,
     const CEPonto q = leitor.PontoDeCorte(borne);
     lado.ponto = insercao ? p : q;
     lado.outro = insercao ? q : p;
-    lado.vizinho = leitor.VizinhoNaConexao(borne, lado.ponto, !insercao);
-    if (lado.vizinho.isEmpty()) lado.vizinho = leitor.VizinhoNaConexao(borne, lado.ponto, insercao);
+    // The wire at the point is found once for both directions and the element's point.
+    const OdDbObjectId fio = leitor.FioNoPonto(leitor.LayerDe(borne), lado.ponto);
+    lado.vizinho = leitor.VizinhoNoFio(fio, borne, lado.ponto, !insercao);
+    if (lado.vizinho.isEmpty())
+        lado.vizinho = leitor.VizinhoNoFio(fio, borne, lado.ponto, insercao);
     if (lado.vizinho.isEmpty()) return lado;
     // A stale handle in the connection answer: the element is null, the side stays blank.
     lado.elemento = CICad::IdDoHandle(lado.vizinho, borne.database());
-    lado.fio = leitor.FioNoPonto(leitor.LayerDe(borne), lado.ponto);
+    lado.fio = fio;
     lado.pontoElemento = leitor.PontoDaConexao(leitor.NumeroDoFio(lado.fio), lado.vizinho);
     return lado;
 }
@@ -118,9 +124,9 @@ void CCBorneDataReader::LeFiosLado(CCDataReader& leitor, CEItemLista& item,
                                    const OdDbObjectId& borne, const LadoBorne& lado, bool insercao,
                                    CETemplate* modelo) {
     if (!leitor.EhFioNumerado(lado.fio)) return;
-    const QString& layer = leitor.LayerDe(borne);
-    const OdDbObjectId fioAqui = leitor.FioNoPonto(layer, lado.ponto);
-    const OdDbObjectId fioOutro = leitor.FioNoPonto(layer, lado.outro);
+    // AchaLado found the wire at the side's point already.
+    const OdDbObjectId& fioAqui = lado.fio;
+    const OdDbObjectId fioOutro = leitor.FioNoPonto(leitor.LayerDe(borne), lado.outro);
     // The cut point's wire is read first on the insertion side, last on the cut side.
     const OdDbObjectId& fioP = insercao ? fioAqui : fioOutro;
     const OdDbObjectId& fioQ = insercao ? fioOutro : fioAqui;
@@ -143,8 +149,9 @@ void CCBorneDataReader::CompoeRelacaoBorne(const QString& sufixo, CEItemLista& i
     const QString num = Primeiro<"NUMERO", "NUMBER", "NUMERO">(item, sufixo);
     const std::unique_ptr<zv::CEAtributo> ligacao = AtributoConexaoProximo(elemento, ponto);
     const QString lig = ligacao ? ligacao->GetValor() : QString();
-    const QString sep = modelo.LerTexto("*CHAR_SEP_STD_CFG*");
-    const bool relacaoPrimeiro = modelo.LerTexto("*ORDEM_CONCAT_STD*") == "1";
+    const Concatenacao& concatenacao = ConcatenacaoDo(modelo);
+    const QString& sep = concatenacao.separador;
+    const bool relacaoPrimeiro = concatenacao.relacaoPrimeiro;
     auto define = [&](const QString& texto) {
         item.definirCampo(NumeroCampo<"RELACAO">(sufixo), texto);
         item.definirCampo(NumeroCampo<"TAG">(sufixo), texto);
@@ -154,6 +161,15 @@ void CCBorneDataReader::CompoeRelacaoBorne(const QString& sufixo, CEItemLista& i
     // A terminal as neighbour has no relation of its own: strip and number stand for it.
     if (!regua.isEmpty() && !num.isEmpty() && rel.isEmpty())
         define(relacaoPrimeiro ? regua + sep + num : num + sep + regua);
+}
+
+const CCBorneDataReader::Concatenacao& CCBorneDataReader::ConcatenacaoDo(CETemplate& modelo) {
+    if (concatenacao_.modelo != &modelo) {
+        concatenacao_.modelo = &modelo;
+        concatenacao_.separador = modelo.LerTexto("*CHAR_SEP_STD_CFG*");
+        concatenacao_.relacaoPrimeiro = modelo.LerTexto("*ORDEM_CONCAT_STD*") == "1";
+    }
+    return concatenacao_;
 }
 
 // ---- reading
@@ -190,6 +206,7 @@ VetorItens* CCBorneDataReader::LerDados(zvdb::Database* database,
                                         const std::optional<QStringList>& paginas,
                                         CETemplate& modelo, CIProgress& progresso) {
     Q_UNUSED(paginas);
+    concatenacao_ = {};  // the template's texts are read again for each run
     CarregaConexoesFios();
     progresso.Definir(10);
     CarregaConexoesCabos();

@@ -7,6 +7,8 @@
 
 class CCBorneDataReader : public CCDataReader {
 public:
+    // A terminal's sides need the wires' elements and points, never their whole texts.
+    CCBorneDataReader() { GuardaCompletas = false; }
     void LerLadoIni(CEItemLista& item, const OdDbObjectId& borne, CETemplate& modelo) override;
     void LerLadoFim(CEItemLista& item, const OdDbObjectId& borne, CETemplate& modelo) override;
     // Reads every page of the database; the page list is not used.
@@ -57,6 +59,15 @@ private:
     // Takes a terminal's item or drops it; false when it was dropped.
     bool Aceita(CEItemLista* item, CETemplate& modelo, VetorItens& itens);
     void RegistraNumero(const CEItemLista& item);
+
+    // How a side's relation is joined: the template's separator and order, read once a run.
+    struct Concatenacao {
+        const CETemplate* modelo = nullptr;
+        QString separador;
+        bool relacaoPrimeiro = false;
+    };
+    Concatenacao concatenacao_;
+    const Concatenacao& ConcatenacaoDo(CETemplate& modelo);
 
     bool avisouLista_ = false;
     bool duplicado_ = false;

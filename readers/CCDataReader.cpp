@@ -112,7 +112,11 @@ void CCDataReader::CarregaConexoes(const QString& funcao, bool detalhes) {
         if (no->restype == zvsdk::RTLB || no->restype == zvsdk::RTLE) continue;
         const QString fio = no->restype == zvsdk::RTSTR ? no->rstring : QString();
         Conexoes conexoes;
-        if (!detalhes) conexoes.completas = conexoes_.value(fio).completas;
+        if (!detalhes) {
+            // a wire of the same number keeps its whole texts; nothing else of it is copied
+            auto antes = conexoes_.constFind(fio);
+            if (antes != conexoes_.constEnd()) conexoes.completas = antes->completas;
+        }
         if (no->rbnext && no->rbnext->restype == zvsdk::RTLE) {
             conexoes_[fio] = std::move(conexoes);
             no = no->rbnext;
@@ -127,7 +131,7 @@ void CCDataReader::CarregaConexoes(const QString& funcao, bool detalhes) {
                 conexoes.elementos
                     << (detalhes ? no->rstring.left(no->rstring.indexOf('#')) : no->rstring);
                 conexoes.handles.push_back(ZVString(conexoes.elementos.back()).ParaHandle());
-                if (detalhes) conexoes.completas << no->rstring;
+                if (detalhes && GuardaCompletas) conexoes.completas << no->rstring;
                 conexoes.pontos.push_back({});
                 coordenada = 0;
             } else if (no->restype == zvsdk::RTREAL && !conexoes.pontos.empty() && coordenada < 3) {
@@ -219,9 +223,12 @@ const CCDataReader::FiosDoLayer& CCDataReader::IndiceFios(const QString& layer) 
         it = fiosPorLayer_.insert(layer, handles);
     }
     FiosDoLayer& f = *indice;
+    // The layer's name as the drawing holds it: each wire's is compared without a copy.
+    const QByteArray nomeLayer = layer.toUtf8();
+    const std::string_view nome(nomeLayer.constData(), std::size_t(nomeLayer.size()));
     for (const QString& handle : *it) {
         const OdDbObjectId fio = CICad::IdDoHandle(handle);
-        if (!CICad::EhPolilinha(fio) || CICad::GetLayerEntidade(fio) != layer) continue;
+        if (!CICad::EhPolilinha(fio) || CICad::NomeLayerUtf8(fio) != nome) continue;
         std::vector<CEPonto> vertices = CICad::GetVertices(fio);
         if (!vertices.empty()) primeirosVertices_.emplace(fio, vertices.front());
         if (vertices.size() < 2) continue;
@@ -397,7 +404,11 @@ bool CCDataReader::EhFioNumerado(const OdDbObjectId& entidade) const {
 
 QString CCDataReader::VizinhoNaConexao(const OdDbObjectId& entidade, const CEPonto& ponto,
                                        bool anterior) {
-    const OdDbObjectId fio = FioNoPonto(LayerDe(entidade), ponto);
+    return VizinhoNoFio(FioNoPonto(LayerDe(entidade), ponto), entidade, ponto, anterior);
+}
+
+QString CCDataReader::VizinhoNoFio(const OdDbObjectId& fio, const OdDbObjectId& entidade,
+                                   const CEPonto& ponto, bool anterior) const {
     if (fio.isNull()) return {};
     auto c = conexoes_.constFind(NumeroDoFio(fio));
     if (c == conexoes_.constEnd()) return {};
@@ -428,10 +439,7 @@ CEPonto CCDataReader::PontoDeCorte(const OdDbObjectId& referencia) const {
 }
 
 CEPonto CCDataReader::LePontoDeCorte(const OdDbObjectId& referencia) const {
-    const CEListaXData corte = CICad::GetXData(referencia, "KVR_ZV_PTS_CORTE");
-    std::vector<CEPonto> pontos;
-    for (const CEItemXData& item : corte)
-        if (item.codigo >= 1010 && item.codigo <= 1013) pontos.push_back({item.x, item.y, item.z});
+    const std::vector<CEPonto> pontos = CICad::PontosXData(referencia, "KVR_ZV_PTS_CORTE");
     if (pontos.size() >= 2)
         return CICad::PontosIguais(pontos[1], CICad::GetPosicao(referencia)) ? pontos[0]
                                                                              : pontos[1];
@@ -458,8 +466,9 @@ std::unique_ptr<zv::CEAtributo> CCDataReader::AtributoConexaoProximo(const OdDbO
         for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
             const zv::CEAtributo& atributo = (*atributos)[i];
             const QString tag = atributo.GetTag().toUpper();
-            if (std::any_of(std::begin(kPalavrasConexao), std::end(kPalavrasConexao),
-                            [&tag](const char* palavra) { return tag.startsWith(palavra); }))
+            if (std::any_of(
+                    std::begin(kPalavrasConexao), std::end(kPalavrasConexao),
+                    [&tag](const char* palavra) { return tag.startsWith(QLatin1String(palavra)); }))
                 ligacoes.push_back({CICad::GetPosicaoTexto(atributo.GetId()), atributo});
         }
         achado = ligacoesPorElemento_.emplace(elemento, std::move(ligacoes)).first;

@@ -65,6 +65,9 @@ public:
     bool EhFioNumerado(const OdDbObjectId& entidade) const;
     // The handle of the element next to the entity along the wire through the point.
     QString VizinhoNaConexao(const OdDbObjectId& entidade, const CEPonto& ponto, bool anterior);
+    // The same along `fio`, the wire already found at the point (null: none).
+    QString VizinhoNoFio(const OdDbObjectId& fio, const OdDbObjectId& entidade,
+                         const CEPonto& ponto, bool anterior) const;
     CEPonto PontoDeCorte(const OdDbObjectId& referencia) const;
     std::unique_ptr<zv::CEAtributo> AtributoConexaoProximo(const OdDbObjectId& elemento,
                                                            const CEPonto& ponto) const;
@@ -128,6 +131,9 @@ protected:
     // The symbols an item is made of are kept for CopiaEntidade: set by the readers that
     // read them again as neighbours of other symbols (the export reader's sides).
     bool GuardaSimbolos = false;
+    // The whole texts of the wires' entries ("HANDLE#CONNECTION#BLOCK") are kept for the
+    // readers that ask for them; one that never does leaves them to the answer.
+    bool GuardaCompletas = true;
     CECacheCatalogo& Catalogo() { return catalogo_; }
     // An item kept for the list shares its field names with the items kept before it.
     void PartilhaNomes(CEItemLista& item) { item.partilharNomes(); }

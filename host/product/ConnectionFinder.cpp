@@ -63,11 +63,12 @@ std::span<const zvdb::Tag> appItems(const zvdb::DbObject& object, std::string_vi
     return {};
 }
 
-std::string wireNumberOf(std::span<const zvdb::Tag> items) {
+// A view into the drawing's storage.
+std::string_view wireNumberOf(std::span<const zvdb::Tag> items) {
     for (std::size_t i = 2; i < items.size(); ++i) {
         const std::string_view value =
             fieldValue(items[i].value, {"CABO", "FIO", "WIRE", "ALAMBRE"});
-        if (!value.empty()) return std::string(value);
+        if (!value.empty()) return value;
     }
     return {};
 }
@@ -307,18 +308,21 @@ std::vector<zvdb::Polyline*> ConnectionFinder::polylinesInPageOrder(zvdb::Databa
 }
 
 std::string ConnectionFinder::wireNumber(const zvdb::Polyline& polyline) {
-    return wireNumberOf(Roles(polyline).items(polyline, Roles::Wire));
+    return std::string(wireNumberOf(Roles(polyline).items(polyline, Roles::Wire)));
 }
 
 std::vector<WireConnections> ConnectionFinder::wires() const {
     std::vector<WireConnections> result;
-    std::unordered_map<std::string, std::size_t> byNumber;
+    // Numbers as views into the drawing: a polyline of a wire met before makes no text.
+    std::unordered_map<std::string_view, std::size_t> byNumber;
+    byNumber.reserve(wireLines_.size());
     Scratch scratch;
     for (const Line& line : wireLines_) {
-        std::string number = wireNumberOf(Roles(*line.polyline).items(*line.polyline, Roles::Wire));
+        const std::string_view number =
+            wireNumberOf(Roles(*line.polyline).items(*line.polyline, Roles::Wire));
         if (number.empty()) continue;  // an unnumbered wire joins nothing
-        auto [it, added] = byNumber.emplace(std::move(number), result.size());
-        if (added) result.push_back({it->first, {}, {}});
+        auto [it, added] = byNumber.emplace(number, result.size());
+        if (added) result.push_back({std::string(number), {}, {}});
         WireConnections& wire = result[it->second];
         wire.polylines.push_back(line.handle);
         for (const zvdb::Point3& vertex : line.polyline->vertices())
@@ -344,11 +348,16 @@ std::vector<WireConnections> ConnectionFinder::cables() const {
     };
     std::vector<WireConnections> result;
     std::unordered_map<std::string, std::size_t> byNumber;
+    byNumber.reserve(leadLines_.size());
     for (const Line& lead : leadLines_) {
         std::string number = cableNumber(*lead.polyline);
         if (number.empty()) continue;
-        auto [it, added] = byNumber.emplace(std::move(number), result.size());
-        if (added) result.push_back({it->first, {}, {}});
+        // a cable's next lead finds its number without a node made and dropped
+        auto it = byNumber.find(number);
+        if (it == byNumber.end()) {
+            it = byNumber.emplace(std::move(number), result.size()).first;
+            result.push_back({it->first, {}, {}});
+        }
         WireConnections& cable = result[it->second];
         cable.polylines.push_back(lead.handle);
         ends(lead, true, cable.touches);

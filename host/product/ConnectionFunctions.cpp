@@ -13,6 +13,7 @@
 
 #include <QStringList>
 
+#include <charconv>
 #include <memory>
 #include <unordered_set>
 
@@ -30,8 +31,18 @@ zvdb::Database& databaseOf(Interpreter& lisp, const ProductContext& context) {
     return *database;
 }
 
-std::string handleText(std::uint64_t handle) {
-    return QString::number(handle, 16).toUpper().toStdString();
+// A page's wires are asked for page after page: the handles' texts are made straight from
+// their numbers.
+Value handleTexts(const std::vector<std::uint64_t>& handles) {
+    zvlisp::ListBuilder list;
+    char buffer[24];
+    for (std::uint64_t handle : handles) {
+        const auto end = std::to_chars(buffer, buffer + sizeof buffer, handle, 16).ptr;
+        for (char* c = buffer; c != end; ++c)
+            if (*c >= 'a' && *c <= 'f') *c = static_cast<char>(*c - 'a' + 'A');
+        list.add(Value::string(QString::fromLatin1(buffer, static_cast<int>(end - buffer))));
+    }
+    return list.take();
 }
 
 QString qText(const std::string& text) {
@@ -102,10 +113,7 @@ void installConnectionFunctions(Interpreter& lisp, const ProductContext& context
         "getFiosPorLayer",
         [context, index = std::make_shared<WireLayerIndex>()](Interpreter& in, Args a) {
             zvdb::Database& database = databaseOf(in, context);
-            std::vector<std::string> handles;
-            for (std::uint64_t handle : index->polylinesOn(database, stdText(in, a[0])))
-                handles.push_back(handleText(handle));
-            return lispTexts(handles);
+            return handleTexts(index->polylinesOn(database, stdText(in, a[0])));
         },
         1, 1);
     // The wire reader, the ferrule reader and the material list ask in turn: one index.
@@ -119,10 +127,7 @@ void installConnectionFunctions(Interpreter& lisp, const ProductContext& context
     });
     lisp.define("getListaFiosProj", [context, wires](Interpreter& in, Args a) {
         zvdb::Database& database = databaseOf(in, context);
-        std::vector<std::string> handles;
-        for (std::uint64_t handle : wires->firstPolylines(database, layerNames(a, 1)))
-            handles.push_back(handleText(handle));
-        return lispTexts(handles);
+        return handleTexts(wires->firstPolylines(database, layerNames(a, 1)));
     });
 }
 

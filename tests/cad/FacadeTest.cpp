@@ -104,6 +104,41 @@ TEST_F(FacadeFixture, ExtendedDataIsStoredOnceWhetherSetOrReplaced) {
     EXPECT_EQ(lidos[0].texto, longo);
 }
 
+TEST_F(FacadeFixture, ThePointsOfExtendedDataAreThoseOfTheWholeList) {
+    zvdb::Entity* ponto = db().modelSpace()->addPoint({0, 0, 0});
+    const OdDbObjectId id(&db(), ponto->handle());
+    EXPECT_TRUE(CICad::PontosXData(id, "KVR_ZV_PTS_CORTE").empty());
+    CICad::SetXData(id, "KVR_ZV_PTS_CORTE",
+                    {{1000, "a"}, {1010, "", 1.5, 2.5, 3.5}, {1070, "4"}, {1011, "", -1, 0.25, 9}});
+    auto pontos = [&] {
+        QStringList textos;
+        for (const CEPonto& p : CICad::PontosXData(id, "KVR_ZV_PTS_CORTE"))
+            textos << QString("%1,%2,%3").arg(p.x).arg(p.y).arg(p.z);
+        return textos;
+    };
+    auto daLista = [&] {
+        QStringList textos;
+        for (const CEItemXData& item : CICad::GetXData(id, "KVR_ZV_PTS_CORTE"))
+            if (item.codigo >= 1010 && item.codigo <= 1013)
+                textos << QString("%1,%2,%3").arg(item.x).arg(item.y).arg(item.z);
+        return textos;
+    };
+    EXPECT_EQ(pontos(), QStringList({"1.5,2.5,3.5", "-1,0.25,9"}));
+    EXPECT_EQ(pontos(), daLista());
+    // A change of the items is read at the next question.
+    CICad::SetXData(id, "KVR_ZV_PTS_CORTE", {{1010, "", 7, 8, 0}});
+    EXPECT_EQ(pontos(), QStringList({"7,8,0"}));
+    EXPECT_EQ(pontos(), daLista());
+    // Texts that are no plain numbers read as the whole list reads them.
+    const zvdb::Tag estranhos[] = {{1010, " 1.5"}, {1020, "+2"},  {1030, "1e3"},
+                                   {1011, "abc"},  {1021, "0.1"}, {1031, "1e999"}};
+    ponto->setXData("KVR_ZV_PTS_CORTE", estranhos);
+    EXPECT_EQ(pontos(), daLista());
+    EXPECT_EQ(pontos().value(0), "1.5,2,1000");
+    EXPECT_TRUE(CICad::PontosXData(id, "KVR_ZV_OUTRA").empty());
+    EXPECT_TRUE(CICad::PontosXData(OdDbObjectId(), "KVR_ZV_PTS_CORTE").empty());
+}
+
 TEST_F(FacadeFixture, BlockFilesWithTwoLayersOrNestedReferencesAreRefused) {
     const QString duasCamadas = arquivoBloco("DUAS", {"TAG"}, [](zvdb::Database& b) {
         b.createLayer("OUTRA");

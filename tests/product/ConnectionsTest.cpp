@@ -89,6 +89,29 @@ TEST_F(ConnectionsTest, CableLeadWithBlindConnectionOnTheNextPage) {
     EXPECT_EQ(show("(getFiosPorLayer \"ESQ$0001$A\")"), "(\"" + hex(lead) + "\")");
 }
 
+TEST_F(ConnectionsTest, LeadsOfOneCableAndPolylinesOfOneWireMakeOneEntryEach) {
+    auto* a = terminal("ESQ$0001$A", {100, 100, 0}, "X3", "1");
+    auto* b = terminal("ESQ$0001$A", {200, 100, 0}, "X3", "2");
+    const std::string path[] = {"ZV_CABOS"};
+    auto* cable = database->dictionaryAt(path, true)->getOrCreateXRecord("W2");
+    cable->setData(zvsample::XDataItems().add(1, "W2").tags());
+    cable->setXData("KVR_ZV_CABO", zvsample::XDataItems().text("20002\f1").tags());
+    cable->setXData("KVR_ZV_ATT_VIRTUAL", zvsample::XDataItems().text("CABO\fW2\fN").tags());
+    for (double x : {100.0, 200.0}) {
+        auto* lead = database->modelSpace()->addLwPolyline({{x, 90, 0}, {x + 20, 50, 0}}, false,
+                                                           "ESQ$0001$A");
+        lead->setXData("KVR_ZV_CABO",
+                       zvsample::XDataItems().text("20002\f1").handle(cable->handle()).tags());
+    }
+    EXPECT_EQ(show("(length (getConexoesTodosCabos))"), "1");
+    EXPECT_EQ(show("(cdr (car (getConexoesTodosCabos)))"),
+              "((\"" + hex(a) + "\" 100.0 90.0 0.0) (\"" + hex(b) + "\" 200.0 90.0 0.0))");
+    wire("ESQ$0001$A", {{100, 190, 0}, {100, 150, 0}}, "301");
+    wire("ESQ$0002$A", {{100, 190, 0}, {100, 150, 0}}, "302");
+    wire("ESQ$0001$A", {{300, 190, 0}, {300, 150, 0}}, "301");
+    EXPECT_EQ(show("(mapcar 'car (getConexoesTodosFios))"), "(\"301\" \"302\")");
+}
+
 TEST_F(ConnectionsTest, WireListsByPage) {
     terminal("ESQ$0001$A", {100, 200, 0}, "X1", "1");
     auto* one = wire("ESQ$0001$A", {{100, 190, 0}, {100, 150, 0}}, "201");
@@ -106,6 +129,17 @@ TEST_F(ConnectionsTest, WireListsByPage) {
     oneOnTwo->erase();
     EXPECT_EQ(show("(getFiosPorLayer \"ESQ$0002$A\")"),
               "(\"" + hex(two) + "\" \"" + hex(three) + "\")");
+}
+
+TEST_F(ConnectionsTest, WireHandlesAreUpperCaseHexadecimalTexts) {
+    // Wires until one's handle has a letter among its digits.
+    std::string texts = "(";
+    for (int i = 0; texts.find_first_of("ABCDEF") == std::string::npos; ++i) {
+        ASSERT_LT(i, 300);
+        auto* one = wire("ESQ$0003$A", {{10.0 * i, 10, 0}, {10.0 * i + 5, 10, 0}}, "5");
+        texts += (texts.size() > 1 ? " \"" : "\"") + hex(one) + "\"";
+    }
+    EXPECT_EQ(show("(getFiosPorLayer \"ESQ$0003$A\")"), texts + ")");
 }
 
 TEST_F(ConnectionsTest, WireListTakesEachWiresFirstPolylineOnThePagesAndFollowsEdits) {

@@ -160,6 +160,22 @@ TEST_F(ConnectionQueriesTest, ALayersWiresAreAskedForOncePerReader) {
     EXPECT_EQ(leitor()->FioNoPonto(layer, {50, 200, 0}), id(depois));
 }
 
+// A redefined getFiosPorLayer may answer wires of any layer: only the asked layer's count.
+TEST_F(ConnectionQueriesTest, OnlyTheWiresOfTheAskedLayerAreTakenFromTheAnswer) {
+    const std::string acentuado = "ESQ$0003$\xC3\x89";  // É
+    db().createLayer(acentuado);
+    const zvdb::Polyline* aqui = fio({{0, 100, 0}, {100, 100, 0}}, "1", acentuado);
+    const zvdb::Polyline* outro = fio({{0, 200, 0}, {100, 200, 0}}, "2", "ESQ$0002$A");
+    const zvdb::Polyline* prefixo = fio({{0, 300, 0}, {100, 300, 0}}, "3", "ESQ$0003$");
+    CICad::AvaliaLisp(QString("(defun getFiosPorLayer (l) (list \"%1\" \"%2\" \"%3\"))")
+                          .arg(handle(outro), handle(aqui), handle(prefixo)));
+    auto r = leitor(0.5);
+    const QString layer = QString::fromUtf8(acentuado.c_str());
+    EXPECT_EQ(r->FioNoPonto(layer, {50, 100, 0}), id(aqui));
+    EXPECT_TRUE(r->FioNoPonto(layer, {50, 200, 0}).isNull());
+    EXPECT_TRUE(r->FioNoPonto(layer, {50, 300, 0}).isNull());
+}
+
 TEST_F(ConnectionQueriesTest, AWireVertexMovedInLispIsSeenByTheNextQuestion) {
     const zvdb::Polyline* w = fio({{0, 100, 0}, {100, 100, 0}}, "1");
     auto r = leitor(0.5);
@@ -304,6 +320,39 @@ TEST_F(NeighbourTest, ANeighbourThatDoesNotOpenLeavesTheSideBlank) {
     for (const QString& campo : item.textoCampos().split(' ', Qt::SkipEmptyParts))
         EXPECT_FALSE(campo.endsWith("_FIM")) << campo.toStdString();
     EXPECT_FALSE(item.valorCampo("LAYER_SEGFIM").isEmpty());
+}
+
+// The neighbour's relation and connection, joined the way each template says; a terminal
+// whose INVERTIDO reads "S" in any case has its sides' suffixes swapped.
+TEST_F(NeighbourTest, ASideJoinsRelationAndConnectionAsItsTemplateSays) {
+    k->addAttribute("RELACAO", "-K1", {20, 205, 0}, 2.5);
+    k->addAttribute("LIGACAO", "A1", {20, 190, 0}, 2.5);
+    CCBorneDataReader terminais;
+    terminais.CarregaConexoesFios();
+    TemplateDouble antes, depois;
+    antes.simbolos["*CHAR_SEP_STD_CFG*"] = ":";
+    antes.simbolos["*ORDEM_CONCAT_STD*"] = "1";
+    depois.simbolos["*CHAR_SEP_STD_CFG*"] = ".";
+    depois.simbolos["*ORDEM_CONCAT_STD*"] = "0";
+    CEItemLista primeiro, segundo;
+    terminais.LerLadoIni(primeiro, id(t), antes);
+    terminais.LerLadoIni(segundo, id(t), depois);
+    EXPECT_EQ(primeiro.valorCampo("RELACAO_FIM"), "-K1:A1");
+    EXPECT_EQ(segundo.valorCampo("TAG_FIM"), "A1.-K1");
+    for (const char* invertido : {"S", "s"}) {
+        CEItemLista item;
+        item.definirCampo("INVERTIDO", invertido);
+        terminais.LerLadoIni(item, id(t), antes);
+        EXPECT_EQ(item.valorCampo("RELACAO_INI"), "-K1:A1") << invertido;
+        EXPECT_FALSE(item.temCampo("RELACAO_FIM")) << invertido;
+    }
+    for (const char* reto : {"SS", "N", " S", ""}) {
+        CEItemLista item;
+        item.definirCampo("INVERTIDO", reto);
+        terminais.LerLadoIni(item, id(t), antes);
+        EXPECT_EQ(item.valorCampo("ETIQUETA_FIM"), "-K1:A1") << reto;
+        EXPECT_FALSE(item.temCampo("RELACAO_INI")) << reto;
+    }
 }
 
 // ---- wire numbers, cut points and connection attributes
