@@ -17,7 +17,8 @@ namespace {
 
 // A project symbol's key lives in the first of these applications that the entity carries.
 const char* const kAplicacoesChave[] = {"KVR_ZV", "KVR_ZV_WIRE", "KVR_ZV_CABO"};
-const char* const kPalavrasConexao[] = {"LIGACAO", "CONNECTION", "CONEXION"};
+const QLatin1String kPalavrasConexao[] = {QLatin1String("LIGACAO"), QLatin1String("CONNECTION"),
+                                          QLatin1String("CONEXION")};
 constexpr double kToleranciaElemento = 3.0;
 constexpr double kForaDoSegmento = 666.0;
 
@@ -74,6 +75,7 @@ void CCDataReader::LiberaLeituras() {
     rotasLidas_ = false;
     Esvazia(caminhos_);
     Esvazia(entidadesLidas_);
+    Esvazia(formas_);
     Esvazia(numerosFios_);
     Esvazia(numerosCabos_);
     Esvazia(ligacoesPorElemento_);
@@ -459,7 +461,7 @@ std::unique_ptr<zv::CEAtributo> CCDataReader::AtributoConexaoProximo(const OdDbO
             const zv::CEAtributo& atributo = (*atributos)[i];
             const QString tag = atributo.GetTag().toUpper();
             if (std::any_of(std::begin(kPalavrasConexao), std::end(kPalavrasConexao),
-                            [&tag](const char* palavra) { return tag.startsWith(palavra); }))
+                            [&tag](QLatin1String palavra) { return tag.startsWith(palavra); }))
                 ligacoes.push_back({CICad::GetPosicaoTexto(atributo.GetId()), atributo});
         }
         achado = ligacoesPorElemento_.emplace(elemento, std::move(ligacoes)).first;
@@ -769,6 +771,32 @@ void CCDataReader::LeEntidade(const QString& sufixo, CEItemLista& item, const Od
         LeFio(sufixo, item, id, modelo);
 }
 
+size_t CCDataReader::HashNomes::operator()(const std::vector<std::uint32_t>& nomes) const {
+    size_t h = nomes.size();
+    for (const std::uint32_t nome : nomes)
+        h = h * 1000003u ^ nome;
+    return h;
+}
+
+const CCDataReader::FormaCampos::ComSufixo& CCDataReader::FormaCampos::Com(const QString& sufixo) {
+    for (const ComSufixo& feito : sufixos)
+        if (feito.sufixo == sufixo) return feito;
+    // The names under the suffix enter the name table in the order of the plain names, as
+    // when each copy renamed its own fields.
+    ComSufixo novo{sufixo, {}, {}};
+    std::vector<std::pair<std::uint32_t, std::uint32_t>> pares;
+    pares.reserve(nomes.size());
+    for (size_t i = 0; i < nomes.size(); ++i)
+        pares.emplace_back(CamposItem::numeroComSufixo(nomes[i], sufixo), std::uint32_t(i));
+    std::sort(pares.begin(), pares.end());
+    for (const auto& [nome, lugar] : pares) {
+        novo.nomes.push_back(nome);
+        novo.lugares.push_back(lugar);
+    }
+    sufixos.push_back(std::move(novo));
+    return sufixos.back();
+}
+
 void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
                                  CETemplate* modelo) {
     ConfereVersao();
@@ -790,28 +818,47 @@ void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const
         const bool marcada = lido.valorCampo(kQtd) == kMarca;
         if (marcada) lido.campos.remove(kQtd);
         lida.qtdPadrao = marcada && completa;
-        lida.campos = lido.campos.todos();
+        const std::vector<CamposItem::Campo>& campos = lido.campos.todos();
+        std::vector<std::uint32_t> nomes;
+        nomes.reserve(campos.size());
+        lida.valores.reserve(campos.size());
+        for (const CamposItem::Campo& campo : campos) {
+            nomes.push_back(campo.nome);
+            lida.valores.push_back(campo.valor);
+        }
+        std::unique_ptr<FormaCampos>& forma = formas_[nomes];
+        if (!forma) forma = std::make_unique<FormaCampos>(FormaCampos{std::move(nomes), {}});
+        lida.forma = forma.get();
         achado = entidadesLidas_.emplace(id, std::move(lida)).first;
     }
     const EntidadeLida& lida = achado->second;
     const bool rotas = lida.rotas;
-    // Without a QTD of the entity's own the batch holds none, so the item's QTD under the
-    // suffix is the one it has now: the "1" joins the batch instead of being put in after.
     const std::uint32_t qtd = NumeroCampo<"QTD">(sufixo);
     const QString* qtdAtual = item.campos.procura(qtd);
     const bool poeQtd = lida.qtdPadrao && (!qtdAtual || qtdAtual->isEmpty());
-    if (sufixo.isEmpty() && !poeQtd) {
-        item.campos.juntarOrdenados(lida.campos);
+    const std::vector<QString>& valores = lida.valores;
+    const FormaCampos::ComSufixo* com = sufixo.isEmpty() ? nullptr : &lida.forma->Com(sufixo);
+    const std::vector<std::uint32_t>& nomes = com ? com->nomes : lida.forma->nomes;
+    const auto valor = [com, &valores](size_t j) -> const QString& {
+        return valores[com ? com->lugares[j] : j];
+    };
+    if (!poeQtd) {
+        item.campos.juntarOrdenados(
+            nomes.size(), [&nomes](size_t j) { return nomes[j]; }, valor);
     } else {
-        std::vector<CamposItem::Campo> lote = lida.campos;
-        CamposItem::renomearComSufixo(lote, sufixo);
-        if (poeQtd) {
-            const auto lugar = std::lower_bound(
-                lote.begin(), lote.end(), qtd,
-                [](const CamposItem::Campo& c, std::uint32_t n) { return c.nome < n; });
-            lote.insert(lugar, CamposItem::Campo{qtd, QStringLiteral("1")});
-        }
-        item.campos.juntarOrdenados(lote);
+        // Without a QTD of the entity's own the batch holds none: the "1" joins it in its
+        // place, so the item's fields move once.
+        static const QString kUm = QStringLiteral("1");
+        const size_t lugar =
+            size_t(std::lower_bound(nomes.begin(), nomes.end(), qtd) - nomes.begin());
+        item.campos.juntarOrdenados(
+            nomes.size() + 1,
+            [&nomes, lugar, qtd](size_t j) {
+                return j < lugar ? nomes[j] : j == lugar ? qtd : nomes[j - 1];
+            },
+            [&valor, lugar](size_t j) -> const QString& {
+                return j < lugar ? valor(j) : j == lugar ? kUm : valor(j - 1);
+            });
     }
     if (rotas) LeRotasDoItem(item, modelo);
 }

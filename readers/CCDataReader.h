@@ -177,11 +177,30 @@ private:
     QHash<QString, std::vector<std::size_t>> rotasPorChave_;  // record places by wire key
     bool rotasLidas_ = false;
     QHash<QString, QHash<QString, QString>> caminhos_;
-    // The fields of entities read for CopiaEntidade. `qtdPadrao`: the entity gave no QTD,
-    // so the copy puts "1" only where the item has none, as a reading would; `rotas`: a
-    // complete wire, after which a reading looks up the routes of the item's wire.
+    // The names of an entity's fields, shared by the entities that have the same ones (the
+    // symbols of one kind), and the same names under each suffix asked for: renamed and put
+    // in order once, not at each copy.
+    struct FormaCampos {
+        std::vector<std::uint32_t> nomes;  // ascending
+        struct ComSufixo {
+            QString sufixo;
+            std::vector<std::uint32_t> nomes;    // ascending
+            std::vector<std::uint32_t> lugares;  // where each one's value stands
+        };
+        std::vector<ComSufixo> sufixos;
+        const ComSufixo& Com(const QString& sufixo);
+    };
+    struct HashNomes {
+        size_t operator()(const std::vector<std::uint32_t>& nomes) const;
+    };
+    std::unordered_map<std::vector<std::uint32_t>, std::unique_ptr<FormaCampos>, HashNomes> formas_;
+    // The fields of entities read for CopiaEntidade: their names' shape and the values in
+    // its order. `qtdPadrao`: the entity gave no QTD, so the copy puts "1" only where the
+    // item has none, as a reading would; `rotas`: a complete wire, after which a reading
+    // looks up the routes of the item's wire.
     struct EntidadeLida {
-        std::vector<CamposItem::Campo> campos;
+        FormaCampos* forma = nullptr;
+        std::vector<QString> valores;
         bool qtdPadrao = false;
         bool rotas = false;
     };
