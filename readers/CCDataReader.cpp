@@ -778,12 +778,12 @@ size_t CCDataReader::HashNomes::operator()(const std::vector<std::uint32_t>& nom
     return h;
 }
 
-const CCDataReader::FormaCampos::ComSufixo& CCDataReader::FormaCampos::Com(const QString& sufixo) {
-    for (const ComSufixo& feito : sufixos)
+CCDataReader::FormaCampos::ComSufixo& CCDataReader::FormaCampos::Com(const QString& sufixo) {
+    for (ComSufixo& feito : sufixos)
         if (feito.sufixo == sufixo) return feito;
     // The names under the suffix enter the name table in the order of the plain names, as
     // when each copy renamed its own fields.
-    ComSufixo novo{sufixo, {}, {}};
+    ComSufixo novo{sufixo, {}, {}, {}, {}};
     std::vector<std::pair<std::uint32_t, std::uint32_t>> pares;
     pares.reserve(nomes.size());
     for (size_t i = 0; i < nomes.size(); ++i)
@@ -826,6 +826,7 @@ void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const
             nomes.push_back(campo.nome);
             lida.valores.push_back(campo.valor);
         }
+        if (lida.qtdPadrao) lida.valores.push_back(QStringLiteral("1"));
         std::unique_ptr<FormaCampos>& forma = formas_[nomes];
         if (!forma) forma = std::make_unique<FormaCampos>(FormaCampos{std::move(nomes), {}});
         lida.forma = forma.get();
@@ -836,30 +837,25 @@ void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const
     const std::uint32_t qtd = NumeroCampo<"QTD">(sufixo);
     const QString* qtdAtual = item.campos.procura(qtd);
     const bool poeQtd = lida.qtdPadrao && (!qtdAtual || qtdAtual->isEmpty());
-    const std::vector<QString>& valores = lida.valores;
-    const FormaCampos::ComSufixo* com = sufixo.isEmpty() ? nullptr : &lida.forma->Com(sufixo);
-    const std::vector<std::uint32_t>& nomes = com ? com->nomes : lida.forma->nomes;
-    const auto valor = [com, &valores](size_t j) -> const QString& {
-        return valores[com ? com->lugares[j] : j];
-    };
-    if (!poeQtd) {
-        item.campos.juntarOrdenados(
-            nomes.size(), [&nomes](size_t j) { return nomes[j]; }, valor);
-    } else {
-        // Without a QTD of the entity's own the batch holds none: the "1" joins it in its
-        // place, so the item's fields move once.
-        static const QString kUm = QStringLiteral("1");
-        const size_t lugar =
-            size_t(std::lower_bound(nomes.begin(), nomes.end(), qtd) - nomes.begin());
-        item.campos.juntarOrdenados(
-            nomes.size() + 1,
-            [&nomes, lugar, qtd](size_t j) {
-                return j < lugar ? nomes[j] : j == lugar ? qtd : nomes[j - 1];
-            },
-            [&valor, lugar](size_t j) -> const QString& {
-                return j < lugar ? valor(j) : j == lugar ? kUm : valor(j - 1);
-            });
+    FormaCampos::ComSufixo& com = lida.forma->Com(sufixo);
+    if (poeQtd && com.nomesQtd.empty()) {
+        // The batch holds no QTD: the "1" joins it in its place, so the item's fields move
+        // once.
+        const auto lugar = std::lower_bound(com.nomes.begin(), com.nomes.end(), qtd);
+        com.nomesQtd.assign(com.nomes.begin(), lugar);
+        com.nomesQtd.push_back(qtd);
+        com.nomesQtd.insert(com.nomesQtd.end(), lugar, com.nomes.end());
+        const auto n = lugar - com.nomes.begin();
+        com.lugaresQtd.assign(com.lugares.begin(), com.lugares.begin() + n);
+        com.lugaresQtd.push_back(std::uint32_t(com.nomes.size()));
+        com.lugaresQtd.insert(com.lugaresQtd.end(), com.lugares.begin() + n, com.lugares.end());
     }
+    const std::vector<std::uint32_t>& nomes = poeQtd ? com.nomesQtd : com.nomes;
+    const std::vector<std::uint32_t>& lugares = poeQtd ? com.lugaresQtd : com.lugares;
+    const std::vector<QString>& valores = lida.valores;
+    item.campos.juntarOrdenados(
+        nomes.size(), [&nomes](size_t j) { return nomes[j]; },
+        [&lugares, &valores](size_t j) -> const QString& { return valores[lugares[j]]; });
     if (rotas) LeRotasDoItem(item, modelo);
 }
 

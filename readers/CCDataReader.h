@@ -184,11 +184,12 @@ private:
         std::vector<std::uint32_t> nomes;  // ascending
         struct ComSufixo {
             QString sufixo;
-            std::vector<std::uint32_t> nomes;    // ascending
-            std::vector<std::uint32_t> lugares;  // where each one's value stands
+            // Ascending, with where each one's value stands; the same with the entity's QTD
+            // of "1" (its value after the others), made when first asked.
+            std::vector<std::uint32_t> nomes, lugares, nomesQtd, lugaresQtd;
         };
         std::vector<ComSufixo> sufixos;
-        const ComSufixo& Com(const QString& sufixo);
+        ComSufixo& Com(const QString& sufixo);
     };
     struct HashNomes {
         size_t operator()(const std::vector<std::uint32_t>& nomes) const;
@@ -200,7 +201,7 @@ private:
     // looks up the routes of the item's wire.
     struct EntidadeLida {
         FormaCampos* forma = nullptr;
-        std::vector<QString> valores;
+        std::vector<QString> valores;  // and "1" after them when qtdPadrao
         bool qtdPadrao = false;
         bool rotas = false;
     };

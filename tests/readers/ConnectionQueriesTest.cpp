@@ -483,10 +483,13 @@ TEST_F(ConnectionQueriesTest, CopiesOfSymbolsWithTheSameFieldsKeepTheirOwnValues
     }
     simbolos[2]->addAttribute("EXTRA", "E", {110, 60, 0}, 2.5);
     auto r = leitor();
-    auto confere = [&](const QString& sufixo, const zvdb::BlockReference* k) {
+    auto confere = [&](const QString& sufixo, const zvdb::BlockReference* k,
+                       const QString& qtd = QString()) {
         CEItemLista lido, copiado;
-        lido.definirCampo("FIO", "1");
-        copiado.definirCampo("FIO", "1");
+        for (CEItemLista* item : {&lido, &copiado}) {
+            item->definirCampo("FIO", "1");
+            if (!qtd.isNull()) item->definirCampo("QTD" + sufixo, qtd);
+        }
         r->LeEntidade(sufixo, lido, id(k), nullptr);
         r->CopiaEntidade(sufixo, copiado, id(k), nullptr);
         EXPECT_EQ(copiado.campos.keys(), lido.campos.keys()) << sufixo.toStdString();
@@ -494,8 +497,13 @@ TEST_F(ConnectionQueriesTest, CopiesOfSymbolsWithTheSameFieldsKeepTheirOwnValues
         return copiado;
     };
     for (const QString& sufixo : {QString("_INI"), QString("_FIM"), QString()})
-        for (const zvdb::BlockReference* k : simbolos)
-            confere(sufixo, k);
+        for (const zvdb::BlockReference* k : simbolos) {
+            EXPECT_EQ(confere(sufixo, k).valorCampo("QTD" + sufixo), "1");
+            // The "1" only where the item has no QTD under the suffix, whatever copy came
+            // before.
+            EXPECT_EQ(confere(sufixo, k, "7").valorCampo("QTD" + sufixo), "7");
+            EXPECT_EQ(confere(sufixo, k, "").valorCampo("QTD" + sufixo), "1");
+        }
     EXPECT_EQ(confere("_FIM", simbolos[1]).valorCampo("TAG_FIM"), "K1");
     EXPECT_EQ(confere("_INI", simbolos[2]).valorCampo("EXTRA_INI"), "E");
     EXPECT_FALSE(confere("_INI", simbolos[0]).campos.contains("EXTRA_INI"));
