@@ -107,10 +107,17 @@ void CamposItem::juntarOrdenados(std::size_t n, Nome nome, Valor valor) {
             campos_.push_back(Campo{nome(j), valor(j)});
         return;
     }
+    if (n == 0) return;
     // Both are sorted: one merge in place from the back, the batch winning on equal names,
-    // after counting the names both hold.
+    // after counting the names both hold from the batch's first name on (the fields before
+    // it stay where they are).
+    const std::uint32_t primeiro = nome(0);
     std::size_t repetidos = 0;
-    for (std::size_t a = 0, b = 0; a < campos_.size() && b < n;) {
+    std::size_t a = std::size_t(
+        std::lower_bound(campos_.begin(), campos_.end(), primeiro,
+                         [](const Campo& c, std::uint32_t numero) { return c.nome < numero; }) -
+        campos_.begin());
+    for (std::size_t b = 0; a < campos_.size() && b < n;) {
         const std::uint32_t na = campos_[a].nome, nb = nome(b);
         if (na < nb)
             ++a;
