@@ -269,6 +269,10 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
     const QSet<QString> escolhidas =
         paginas ? QSet<QString>(paginas->begin(), paginas->end()) : QSet<QString>();
     QSet<QString> numeros;
+    // The most fields a stretch of the wire before had: the next ones are given that room
+    // at once instead of growing at each end they copy (memory taken and left behind at
+    // each step is what costs at scale). The spare room goes back once the walk is done.
+    int lugares = 0;
     for (const OdDbObjectId& fio : fios) {
         if (!CICad::EhPolilinha(fio)) continue;
         if (paginas && !escolhidas.contains(CICad::GetLayerEntidade(fio))) continue;
@@ -294,6 +298,7 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
             // none.
             std::optional<CEItemLista> padrao;
             if (n > 2) padrao = *item;
+            item->campos.reservar(size_t(lugares));
             PreencheExtremidade("INI", *item, elementos, 0, modelo);
             CEItemLista* atual = item;
             trechos[atual] = {0, -1};
@@ -309,6 +314,7 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
                 }
                 if (i != n - 1 && (elementos[i] != elementos[i + 1] || !equipamento)) {
                     auto* novo = new CEItemLista(*padrao);
+                    novo->campos.reservar(size_t(lugares));
                     PreencheExtremidade("INI", *novo, elementos, i, modelo);
                     atual->ligado = novo;
                     itens->push_back(novo);
@@ -318,6 +324,9 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
             }
         }
         CalculaComprimentos(item, elementos, &trechos);
+        lugares = 0;
+        for (const auto& trecho : trechos)
+            lugares = std::max(lugares, trecho.first->campos.size());
         // The first stretch stands behind the later ones; the writer sorts.
         itens->push_back(item);
     }

@@ -68,6 +68,8 @@ public:
     const QString* procura(std::uint32_t numero) const;
     // The fields in name-number order.
     const std::vector<Campo>& todos() const { return campos_; }
+    // Room for `n` fields: an item filled in a few merges moves its fields once.
+    void reservar(std::size_t n) { campos_.reserve(n); }
     // Gives back the spare room of the array once the item is complete.
     void compactar() { campos_.shrink_to_fit(); }
 
