@@ -17,7 +17,8 @@ namespace {
 
 // A project symbol's key lives in the first of these applications that the entity carries.
 const char* const kAplicacoesChave[] = {"KVR_ZV", "KVR_ZV_WIRE", "KVR_ZV_CABO"};
-const char* const kPalavrasConexao[] = {"LIGACAO", "CONNECTION", "CONEXION"};
+const QLatin1String kPalavrasConexao[] = {QLatin1String("LIGACAO"), QLatin1String("CONNECTION"),
+                                          QLatin1String("CONEXION")};
 constexpr double kToleranciaElemento = 3.0;
 constexpr double kForaDoSegmento = 666.0;
 
@@ -74,6 +75,7 @@ void CCDataReader::LiberaLeituras() {
     rotasLidas_ = false;
     Esvazia(caminhos_);
     Esvazia(entidadesLidas_);
+    Esvazia(formas_);
     Esvazia(numerosFios_);
     Esvazia(numerosCabos_);
     Esvazia(ligacoesPorElemento_);
@@ -466,9 +468,8 @@ std::unique_ptr<zv::CEAtributo> CCDataReader::AtributoConexaoProximo(const OdDbO
         for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
             const zv::CEAtributo& atributo = (*atributos)[i];
             const QString tag = atributo.GetTag().toUpper();
-            if (std::any_of(
-                    std::begin(kPalavrasConexao), std::end(kPalavrasConexao),
-                    [&tag](const char* palavra) { return tag.startsWith(QLatin1String(palavra)); }))
+            if (std::any_of(std::begin(kPalavrasConexao), std::end(kPalavrasConexao),
+                            [&tag](QLatin1String palavra) { return tag.startsWith(palavra); }))
                 ligacoes.push_back({CICad::GetPosicaoTexto(atributo.GetId()), atributo});
         }
         achado = ligacoesPorElemento_.emplace(elemento, std::move(ligacoes)).first;
@@ -778,6 +779,32 @@ void CCDataReader::LeEntidade(const QString& sufixo, CEItemLista& item, const Od
         LeFio(sufixo, item, id, modelo);
 }
 
+size_t CCDataReader::HashNomes::operator()(const std::vector<std::uint32_t>& nomes) const {
+    size_t h = nomes.size();
+    for (const std::uint32_t nome : nomes)
+        h = h * 1000003u ^ nome;
+    return h;
+}
+
+CCDataReader::FormaCampos::ComSufixo& CCDataReader::FormaCampos::Com(const QString& sufixo) {
+    for (ComSufixo& feito : sufixos)
+        if (feito.sufixo == sufixo) return feito;
+    // The names under the suffix enter the name table in the order of the plain names, as
+    // when each copy renamed its own fields.
+    ComSufixo novo{sufixo, {}, {}, {}, {}};
+    std::vector<std::pair<std::uint32_t, std::uint32_t>> pares;
+    pares.reserve(nomes.size());
+    for (size_t i = 0; i < nomes.size(); ++i)
+        pares.emplace_back(CamposItem::numeroComSufixo(nomes[i], sufixo), std::uint32_t(i));
+    std::sort(pares.begin(), pares.end());
+    for (const auto& [nome, lugar] : pares) {
+        novo.nomes.push_back(nome);
+        novo.lugares.push_back(lugar);
+    }
+    sufixos.push_back(std::move(novo));
+    return sufixos.back();
+}
+
 void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
                                  CETemplate* modelo) {
     ConfereVersao();
@@ -799,29 +826,44 @@ void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const
         const bool marcada = lido.valorCampo(kQtd) == kMarca;
         if (marcada) lido.campos.remove(kQtd);
         lida.qtdPadrao = marcada && completa;
-        lida.campos = lido.campos.todos();
+        const std::vector<CamposItem::Campo>& campos = lido.campos.todos();
+        std::vector<std::uint32_t> nomes;
+        nomes.reserve(campos.size());
+        lida.valores.reserve(campos.size());
+        for (const CamposItem::Campo& campo : campos) {
+            nomes.push_back(campo.nome);
+            lida.valores.push_back(campo.valor);
+        }
+        if (lida.qtdPadrao) lida.valores.push_back(QStringLiteral("1"));
+        std::unique_ptr<FormaCampos>& forma = formas_[nomes];
+        if (!forma) forma = std::make_unique<FormaCampos>(FormaCampos{std::move(nomes), {}});
+        lida.forma = forma.get();
         achado = entidadesLidas_.emplace(id, std::move(lida)).first;
     }
     const EntidadeLida& lida = achado->second;
     const bool rotas = lida.rotas;
-    // Without a QTD of the entity's own the batch holds none, so the item's QTD under the
-    // suffix is the one it has now: the "1" joins the batch instead of being put in after.
     const std::uint32_t qtd = NumeroCampo<"QTD">(sufixo);
     const QString* qtdAtual = item.campos.procura(qtd);
     const bool poeQtd = lida.qtdPadrao && (!qtdAtual || qtdAtual->isEmpty());
-    if (sufixo.isEmpty() && !poeQtd) {
-        item.campos.juntarOrdenados(lida.campos);
-    } else {
-        std::vector<CamposItem::Campo> lote = lida.campos;
-        CamposItem::renomearComSufixo(lote, sufixo);
-        if (poeQtd) {
-            const auto lugar = std::lower_bound(
-                lote.begin(), lote.end(), qtd,
-                [](const CamposItem::Campo& c, std::uint32_t n) { return c.nome < n; });
-            lote.insert(lugar, CamposItem::Campo{qtd, QStringLiteral("1")});
-        }
-        item.campos.juntarOrdenados(lote);
+    FormaCampos::ComSufixo& com = lida.forma->Com(sufixo);
+    if (poeQtd && com.nomesQtd.empty()) {
+        // The batch holds no QTD: the "1" joins it in its place, so the item's fields move
+        // once.
+        const auto lugar = std::lower_bound(com.nomes.begin(), com.nomes.end(), qtd);
+        com.nomesQtd.assign(com.nomes.begin(), lugar);
+        com.nomesQtd.push_back(qtd);
+        com.nomesQtd.insert(com.nomesQtd.end(), lugar, com.nomes.end());
+        const auto n = lugar - com.nomes.begin();
+        com.lugaresQtd.assign(com.lugares.begin(), com.lugares.begin() + n);
+        com.lugaresQtd.push_back(std::uint32_t(com.nomes.size()));
+        com.lugaresQtd.insert(com.lugaresQtd.end(), com.lugares.begin() + n, com.lugares.end());
     }
+    const std::vector<std::uint32_t>& nomes = poeQtd ? com.nomesQtd : com.nomes;
+    const std::vector<std::uint32_t>& lugares = poeQtd ? com.lugaresQtd : com.lugares;
+    const std::vector<QString>& valores = lida.valores;
+    item.campos.juntarOrdenados(
+        nomes.size(), [&nomes](size_t j) { return nomes[j]; },
+        [&lugares, &valores](size_t j) -> const QString& { return valores[lugares[j]]; });
     if (rotas) LeRotasDoItem(item, modelo);
 }
 

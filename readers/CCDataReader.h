@@ -183,11 +183,31 @@ private:
     QHash<QString, std::vector<std::size_t>> rotasPorChave_;  // record places by wire key
     bool rotasLidas_ = false;
     QHash<QString, QHash<QString, QString>> caminhos_;
-    // The fields of entities read for CopiaEntidade. `qtdPadrao`: the entity gave no QTD,
-    // so the copy puts "1" only where the item has none, as a reading would; `rotas`: a
-    // complete wire, after which a reading looks up the routes of the item's wire.
+    // The names of an entity's fields, shared by the entities that have the same ones (the
+    // symbols of one kind), and the same names under each suffix asked for: renamed and put
+    // in order once, not at each copy.
+    struct FormaCampos {
+        std::vector<std::uint32_t> nomes;  // ascending
+        struct ComSufixo {
+            QString sufixo;
+            // Ascending, with where each one's value stands; the same with the entity's QTD
+            // of "1" (its value after the others), made when first asked.
+            std::vector<std::uint32_t> nomes, lugares, nomesQtd, lugaresQtd;
+        };
+        std::vector<ComSufixo> sufixos;
+        ComSufixo& Com(const QString& sufixo);
+    };
+    struct HashNomes {
+        size_t operator()(const std::vector<std::uint32_t>& nomes) const;
+    };
+    std::unordered_map<std::vector<std::uint32_t>, std::unique_ptr<FormaCampos>, HashNomes> formas_;
+    // The fields of entities read for CopiaEntidade: their names' shape and the values in
+    // its order. `qtdPadrao`: the entity gave no QTD, so the copy puts "1" only where the
+    // item has none, as a reading would; `rotas`: a complete wire, after which a reading
+    // looks up the routes of the item's wire.
     struct EntidadeLida {
-        std::vector<CamposItem::Campo> campos;
+        FormaCampos* forma = nullptr;
+        std::vector<QString> valores;  // and "1" after them when qtdPadrao
         bool qtdPadrao = false;
         bool rotas = false;
     };

@@ -18,24 +18,56 @@ void Define(CIProgress* progresso, int percentual) {
     if (progresso) progresso->Definir(percentual);
 }
 
-// The names an end's relation reads and writes under one suffix, made once: each stretch end
-// asks for some twenty of them. Only a field set enters the program's table of names, as
-// before, so the order of an item's fields does not change.
+// A field name an end's relation reads and writes, by its number: found once, or known
+// absent while the name table does not grow. Only a field set enters the table, as before,
+// so the order of an item's fields does not change.
+class NomeCampo {
+public:
+    NomeCampo() = default;
+    explicit NomeCampo(QString texto) : texto_(std::move(texto)) {}
+    const QString* Em(const CEItemLista& item) const {
+        if (numero_ == CamposItem::kSemNome) {
+            const std::size_t nomes = CamposItem::quantidadeNomes();
+            if (nomes == conferido_) return nullptr;
+            numero_ = CamposItem::numeroSeHouver(texto_);
+            conferido_ = nomes;
+            if (numero_ == CamposItem::kSemNome) return nullptr;
+        }
+        return item.campos.procura(numero_);
+    }
+    void Define(CEItemLista& item, const QString& valor) const {
+        if (numero_ == CamposItem::kSemNome) numero_ = CamposItem::numero(texto_);
+        item.definirCampo(numero_, valor);
+    }
+
+private:
+    QString texto_;
+    mutable std::uint32_t numero_ = CamposItem::kSemNome;
+    mutable std::size_t conferido_ = ~std::size_t(0);
+};
+
+// The names of an end under one suffix, made once: each stretch end asks for some twenty.
 struct NomesExtremidade {
-    QString conector, rel, lig;
-    std::array<QString, 3> pino, relacao, regua, numero;  // by language
+    NomeCampo conector, rel, lig;
+    std::array<NomeCampo, 3> pino, relacao, regua, numero;  // by language
 };
 
 const NomesExtremidade& Nomes(const QString& sufixo) {
     static QHash<QString, NomesExtremidade> porSufixo;
     auto achado = porSufixo.constFind(sufixo);
     if (achado != porSufixo.constEnd()) return achado.value();
-    NomesExtremidade n{"CONECTOR" + sufixo, "REL" + sufixo, "LIG" + sufixo, {}, {}, {}, {}};
+    NomesExtremidade n{NomeCampo("CONECTOR" + sufixo),
+                       NomeCampo("REL" + sufixo),
+                       NomeCampo("LIG" + sufixo),
+                       {},
+                       {},
+                       {},
+                       {}};
     for (int i = 0; i < 3; ++i) {
-        n.pino[size_t(i)] = Tag(CampoTraduzido::Pino, i + 1) + sufixo;
-        n.relacao[size_t(i)] = Tag(CampoTraduzido::Relacao, i + 1) + sufixo;
-        n.regua[size_t(i)] = Tag(CampoTraduzido::Regua, i + 1) + sufixo;
-        n.numero[size_t(i)] = Tag(CampoTraduzido::Numero, i + 1) + sufixo;
+        n.pino[size_t(i)] = NomeCampo(Tag(CampoTraduzido::Pino, i + 1) + sufixo);
+        n.relacao[size_t(i)] = NomeCampo(Tag(CampoTraduzido::Relacao, i + 1) + sufixo);
+        n.regua[size_t(i)] = NomeCampo(Tag(CampoTraduzido::Regua, i + 1) + sufixo);
+        n.numero[size_t(i)] = NomeCampo(Tag(CampoTraduzido::Numero, i + 1) + sufixo);
     }
     return porSufixo.insert(sufixo, n).value();
 }
@@ -237,6 +269,10 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
     const QSet<QString> escolhidas =
         paginas ? QSet<QString>(paginas->begin(), paginas->end()) : QSet<QString>();
     QSet<QString> numeros;
+    // The most fields a stretch of the wire before had: the next ones are given that room
+    // at once instead of growing at each end they copy (memory taken and left behind at
+    // each step is what costs at scale). The spare room goes back once the walk is done.
+    int lugares = 0;
     for (const OdDbObjectId& fio : fios) {
         if (!CICad::EhPolilinha(fio)) continue;
         if (paginas && !escolhidas.contains(CICad::GetLayerEntidade(fio))) continue;
@@ -262,6 +298,7 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
             // none.
             std::optional<CEItemLista> padrao;
             if (n > 2) padrao = *item;
+            item->campos.reservar(size_t(lugares));
             PreencheExtremidade("INI", *item, elementos, 0, modelo);
             CEItemLista* atual = item;
             trechos[atual] = {0, -1};
@@ -277,6 +314,7 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
                 }
                 if (i != n - 1 && (elementos[i] != elementos[i + 1] || !equipamento)) {
                     auto* novo = new CEItemLista(*padrao);
+                    novo->campos.reservar(size_t(lugares));
                     PreencheExtremidade("INI", *novo, elementos, i, modelo);
                     atual->ligado = novo;
                     itens->push_back(novo);
@@ -286,6 +324,9 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
             }
         }
         CalculaComprimentos(item, elementos, &trechos);
+        lugares = 0;
+        for (const auto& trecho : trechos)
+            lugares = std::max(lugares, trecho.first->campos.size());
         // The first stretch stands behind the later ones; the writer sorts.
         itens->push_back(item);
     }
@@ -431,13 +472,13 @@ void CCFioDataReader::ComporRelacaoFio(const QString& s, CEItemLista& item, CETe
     const bool relacaoPrimeiro = composicao.relacaoPrimeiro;
     const QString lig = ligacao ? ligacao->GetValor() : QString();
     const NomesExtremidade& nomes = Nomes(s);
-    auto campo = [&item](const QString& nome) {
-        const QString* valor = item.campo(nome);
+    auto campo = [&item](const NomeCampo& nome) {
+        const QString* valor = nome.Em(item);
         return valor ? *valor : QString();
     };
-    auto tem = [&item](const QString& nome) { return item.campo(nome) != nullptr; };
-    auto define = [&item](const QString& nome, const QString& valor) {
-        item.definirCampo(nome, valor);
+    auto tem = [&item](const NomeCampo& nome) { return nome.Em(item) != nullptr; };
+    auto define = [&item](const NomeCampo& nome, const QString& valor) {
+        nome.Define(item, valor);
     };
 
     // A pin: its connector and pin, in the template's order.

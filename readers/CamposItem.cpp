@@ -4,11 +4,10 @@
 
 #include <algorithm>
 #include <deque>
-#include <limits>
 
 namespace {
 
-constexpr std::uint32_t kSemNumero = std::numeric_limits<std::uint32_t>::max();
+constexpr std::uint32_t kSemNumero = CamposItem::kSemNome;
 
 // Names are never removed: a run of lists meets a few hundred. The lists run on one thread.
 struct TabelaNomes {
@@ -41,6 +40,14 @@ std::uint32_t CamposItem::numero(const QString& nome) {
     return novo;
 }
 
+std::uint32_t CamposItem::numeroSeHouver(const QString& nome) {
+    return Tabela().procura(nome);
+}
+
+std::size_t CamposItem::quantidadeNomes() {
+    return Tabela().textos.size();
+}
+
 // The number of the name with the suffix, from the suffix's array, made when first asked.
 // CamposItem::numero may grow the name table but not this array.
 std::uint32_t CamposItem::numeroNoSufixo(std::vector<std::uint32_t>& numeros, std::uint32_t numero,
@@ -52,15 +59,6 @@ std::uint32_t CamposItem::numeroNoSufixo(std::vector<std::uint32_t>& numeros, st
 
 std::uint32_t CamposItem::numeroComSufixo(std::uint32_t numero, const QString& sufixo) {
     return sufixo.isEmpty() ? numero : numeroNoSufixo(Tabela().comSufixo[sufixo], numero, sufixo);
-}
-
-void CamposItem::renomearComSufixo(std::vector<Campo>& lote, const QString& sufixo) {
-    if (sufixo.isEmpty()) return;
-    std::vector<std::uint32_t>& numeros = Tabela().comSufixo[sufixo];
-    for (Campo& campo : lote)
-        campo.nome = numeroNoSufixo(numeros, campo.nome, sufixo);
-    std::sort(lote.begin(), lote.end(),
-              [](const Campo& a, const Campo& b) { return a.nome < b.nome; });
 }
 
 const QString* CamposItem::procura(std::uint32_t numero) const {
@@ -140,27 +138,7 @@ void CamposItem::juntarOrdenados(const std::vector<Campo>& lote) {
         campos_ = lote;
         return;
     }
-    // Both arrays are sorted: one merge in place from the back, the batch winning on equal
-    // names, after counting the names both hold.
-    std::size_t repetidos = 0;
-    for (auto a = campos_.cbegin(), b = lote.cbegin(); a != campos_.cend() && b != lote.cend();) {
-        if (a->nome < b->nome)
-            ++a;
-        else if (b->nome < a->nome)
-            ++b;
-        else
-            ++repetidos, ++a, ++b;
-    }
-    std::ptrdiff_t i = std::ptrdiff_t(campos_.size()) - 1;
-    std::ptrdiff_t j = std::ptrdiff_t(lote.size()) - 1;
-    campos_.resize(campos_.size() + lote.size() - repetidos);
-    std::ptrdiff_t k = std::ptrdiff_t(campos_.size()) - 1;
-    while (j >= 0) {
-        if (i >= 0 && campos_[size_t(i)].nome > lote[size_t(j)].nome) {
-            campos_[size_t(k--)] = std::move(campos_[size_t(i--)]);
-        } else {
-            if (i >= 0 && campos_[size_t(i)].nome == lote[size_t(j)].nome) --i;
-            campos_[size_t(k--)] = lote[size_t(j--)];
-        }
-    }
+    juntarOrdenados(
+        lote.size(), [&lote](std::size_t j) { return lote[j].nome; },
+        [&lote](std::size_t j) -> const QString& { return lote[j].valor; });
 }

@@ -60,10 +60,16 @@ public:
     void juntar(const CamposItem& origem);
     // The fields of `lote`, sorted by name number without repeats, replacing what was there.
     void juntarOrdenados(const std::vector<Campo>& lote);
+    // The same for a batch of `n` fields given by the name and the value of the j-th: a
+    // batch kept apart (names in one place, values in another) is merged without a copy.
+    template <class Nome, class Valor>
+    void juntarOrdenados(std::size_t n, Nome nome, Valor valor);
     // The value under a name number, or null; valid until the next change of the fields.
     const QString* procura(std::uint32_t numero) const;
     // The fields in name-number order.
     const std::vector<Campo>& todos() const { return campos_; }
+    // Room for `n` fields: an item filled in a few merges moves its fields once.
+    void reservar(std::size_t n) { campos_.reserve(n); }
     // Gives back the spare room of the array once the item is complete.
     void compactar() { campos_.shrink_to_fit(); }
 
@@ -78,11 +84,14 @@ public:
     static const QString& nome(std::uint32_t numero);
     // The number of a name, added when new.
     static std::uint32_t numero(const QString& nome);
+    // The number of a name the table holds, or kSemNome; nothing is added.
+    static constexpr std::uint32_t kSemNome = ~std::uint32_t(0);
+    static std::uint32_t numeroSeHouver(const QString& nome);
+    // How many names the table holds: a name absent stays so while this stays the same.
+    static std::size_t quantidadeNomes();
     // The number of the name followed by the suffix: readers copy the fields of one entity
     // under a few suffixes into many items, and the joined names are made once.
     static std::uint32_t numeroComSufixo(std::uint32_t numero, const QString& sufixo);
-    // Each field of the batch renamed to its name with the suffix, then sorted by number.
-    static void renomearComSufixo(std::vector<Campo>& lote, const QString& sufixo);
 
 private:
     std::vector<Campo>::const_iterator lugar(std::uint32_t numero) const;
@@ -91,6 +100,50 @@ private:
 
     std::vector<Campo> campos_;
 };
+
+template <class Nome, class Valor>
+void CamposItem::juntarOrdenados(std::size_t n, Nome nome, Valor valor) {
+    if (campos_.empty()) {
+        campos_.reserve(n);
+        for (std::size_t j = 0; j < n; ++j)
+            campos_.push_back(Campo{nome(j), valor(j)});
+        return;
+    }
+    if (n == 0) return;
+    // Both are sorted: one merge in place from the back, the batch winning on equal names,
+    // after counting the names both hold from the batch's first name on (the fields before
+    // it stay where they are).
+    const std::uint32_t primeiro = nome(0);
+    std::size_t repetidos = 0;
+    std::size_t a = std::size_t(
+        std::lower_bound(campos_.begin(), campos_.end(), primeiro,
+                         [](const Campo& c, std::uint32_t numero) { return c.nome < numero; }) -
+        campos_.begin());
+    for (std::size_t b = 0; a < campos_.size() && b < n;) {
+        const std::uint32_t na = campos_[a].nome, nb = nome(b);
+        if (na < nb)
+            ++a;
+        else if (nb < na)
+            ++b;
+        else
+            ++repetidos, ++a, ++b;
+    }
+    std::ptrdiff_t i = std::ptrdiff_t(campos_.size()) - 1;
+    std::ptrdiff_t j = std::ptrdiff_t(n) - 1;
+    campos_.resize(campos_.size() + n - repetidos);
+    std::ptrdiff_t k = std::ptrdiff_t(campos_.size()) - 1;
+    while (j >= 0) {
+        const std::uint32_t nj = nome(std::size_t(j));
+        if (i >= 0 && campos_[std::size_t(i)].nome > nj) {
+            campos_[std::size_t(k--)] = std::move(campos_[std::size_t(i--)]);
+        } else {
+            if (i >= 0 && campos_[std::size_t(i)].nome == nj) --i;
+            Campo& destino = campos_[std::size_t(k--)];
+            destino.nome = nj;
+            destino.valor = valor(std::size_t(j--));
+        }
+    }
+}
 
 // A field name written in the code, as a template argument: NumeroCampo<"LAYER">(sufixo) is
 // the number of "LAYER" plus the suffix, with the name looked up once for the program and the

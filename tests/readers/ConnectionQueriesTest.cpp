@@ -519,6 +519,52 @@ TEST_F(ConnectionQueriesTest, ACopyOfAnEntityEqualsReadingItUnderTheSuffix) {
     EXPECT_EQ(item.valorCampo("TAG"), "K1");
 }
 
+// Symbols with the same fields share the work of renaming them, never their values: each
+// copy under each suffix equals reading that symbol under it, also after one of them gained
+// a field or changed a value.
+TEST_F(ConnectionQueriesTest, CopiesOfSymbolsWithTheSameFieldsKeepTheirOwnValues) {
+    std::vector<zvdb::BlockReference*> simbolos;
+    for (int i = 0; i < 3; ++i) {
+        zvdb::BlockReference* k = simbolo("NA-1", {50.0 + 30 * i, 50, 0});
+        k->addAttribute("TAG", std::string("K") + char('0' + i), {50.0 + 30 * i, 50, 0}, 2.5);
+        k->addAttribute("LIGACAO1", std::string("A") + char('0' + i), {50.0 + 30 * i, 55, 0}, 2.5);
+        simbolos.push_back(k);
+    }
+    simbolos[2]->addAttribute("EXTRA", "E", {110, 60, 0}, 2.5);
+    auto r = leitor();
+    auto confere = [&](const QString& sufixo, const zvdb::BlockReference* k,
+                       const QString& qtd = QString()) {
+        CEItemLista lido, copiado;
+        for (CEItemLista* item : {&lido, &copiado}) {
+            item->definirCampo("FIO", "1");
+            if (!qtd.isNull()) item->definirCampo("QTD" + sufixo, qtd);
+        }
+        r->LeEntidade(sufixo, lido, id(k), nullptr);
+        r->CopiaEntidade(sufixo, copiado, id(k), nullptr);
+        EXPECT_EQ(copiado.campos.keys(), lido.campos.keys()) << sufixo.toStdString();
+        EXPECT_EQ(copiado.campos.values(), lido.campos.values()) << sufixo.toStdString();
+        return copiado;
+    };
+    for (const QString& sufixo : {QString("_INI"), QString("_FIM"), QString()})
+        for (const zvdb::BlockReference* k : simbolos) {
+            EXPECT_EQ(confere(sufixo, k).valorCampo("QTD" + sufixo), "1");
+            // The "1" only where the item has no QTD under the suffix, whatever copy came
+            // before.
+            EXPECT_EQ(confere(sufixo, k, "7").valorCampo("QTD" + sufixo), "7");
+            EXPECT_EQ(confere(sufixo, k, "").valorCampo("QTD" + sufixo), "1");
+        }
+    EXPECT_EQ(confere("_FIM", simbolos[1]).valorCampo("TAG_FIM"), "K1");
+    EXPECT_EQ(confere("_INI", simbolos[2]).valorCampo("EXTRA_INI"), "E");
+    EXPECT_FALSE(confere("_INI", simbolos[0]).campos.contains("EXTRA_INI"));
+
+    simbolos[0]->addAttribute("EXTRA", "F", {50, 60, 0}, 2.5);
+    simbolos[1]->attribute("TAG")->setTextValue("K9");
+    EXPECT_EQ(confere("_INI", simbolos[0]).valorCampo("EXTRA_INI"), "F");
+    EXPECT_EQ(confere("_FIM", simbolos[1]).valorCampo("TAG_FIM"), "K9");
+    EXPECT_EQ(confere("_FIM", simbolos[2]).valorCampo("TAG_FIM"), "K2");
+    EXPECT_FALSE(confere("", simbolos[1]).campos.contains("EXTRA"));
+}
+
 // A cable core's number is its record's CABO attribute and the core; cores of one cable share
 // the record, and a new cable number is seen once the drawing changed.
 TEST_F(ConnectionQueriesTest, CoresOfACableTakeItsNumberAndFollowItsChange) {

@@ -219,6 +219,43 @@ TEST(ItemRecordTest, FieldsInAnyOrderAreFoundOverwrittenMergedAndRemoved) {
     EXPECT_EQ(destino.campo("F3"), nullptr);
 }
 
+// A batch kept as names in one place and values in another merges as a batch of fields does:
+// from the middle of the item's names, past its last one, or not at all when empty.
+TEST(ItemRecordTest, ABatchOfNamesAndValuesKeptApartMergesInPlace) {
+    std::vector<std::uint32_t> nomes;
+    for (const char* nome : {"VISTA_1", "VISTA_2", "VISTA_3", "VISTA_4", "VISTA_5", "VISTA_6"})
+        nomes.push_back(CamposItem::numero(nome));
+    const QStringList valores{"v1", "v2", "v3", "v4", "v5", "v6"};
+    CEItemLista item;
+    for (const std::size_t i : {0, 1, 3})
+        item.definirCampo(nomes[i], "antes");
+    auto junta = [&](std::vector<std::size_t> lugares) {
+        std::sort(lugares.begin(), lugares.end(),
+                  [&](std::size_t x, std::size_t y) { return nomes[x] < nomes[y]; });
+        item.campos.juntarOrdenados(
+            lugares.size(), [&](std::size_t j) { return nomes[lugares[j]]; },
+            [&](std::size_t j) -> const QString& { return valores[int(lugares[j])]; });
+    };
+    auto texto = [&] {
+        QStringList vistos;
+        for (auto it = item.campos.constBegin(); it != item.campos.constEnd(); ++it)
+            vistos << it.key() + "=" + it.value();
+        vistos.sort();
+        return vistos.join(' ');
+    };
+    junta({1, 2});
+    EXPECT_EQ(texto(), "VISTA_1=antes VISTA_2=v2 VISTA_3=v3 VISTA_4=antes");
+    junta({});
+    EXPECT_EQ(texto(), "VISTA_1=antes VISTA_2=v2 VISTA_3=v3 VISTA_4=antes");
+    junta({3, 4, 5});
+    EXPECT_EQ(texto(), "VISTA_1=antes VISTA_2=v2 VISTA_3=v3 VISTA_4=v4 VISTA_5=v5 VISTA_6=v6");
+    junta({0});
+    EXPECT_EQ(item.valorCampo("VISTA_1"), "v1");
+    EXPECT_EQ(item.campos.size(), 6);
+    for (std::size_t i = 1; i < item.campos.todos().size(); ++i)
+        EXPECT_LT(item.campos.todos()[i - 1].nome, item.campos.todos()[i].nome);
+}
+
 // A batch merged into an item: new names go in their place, equal names take the batch's
 // value, the item's other fields stay; names with a suffix are the joined names.
 TEST(ItemRecordTest, ASortedBatchMergesIntoTheFieldsInPlace) {

@@ -447,6 +447,29 @@ TEST_F(EndTextTest, APinIsItsConnectorAndPinAndComesBeforeEverythingElse) {
     EXPECT_EQ(compoe(solto, "A1", &modelo_), "A1:-K1|A1:-K1|A1:-K1|-K1|A1");
 }
 
+// The names an end reads are found by number once they exist: a name that no item had when
+// an end first asked for it is seen as soon as some item gets it.
+TEST_F(EndTextTest, ANameUnknownAtTheFirstEndIsSeenOnceAnItemHasIt) {
+    CCFioDataReader leitor;
+    const auto atributo =
+        std::make_unique<zv::CEAtributo>("LIGACAO1", "", "A", OdDbObjectId(), false);
+    // A suffix no other test uses: its names are new to the program.
+    const QString s = "_PONTA_NOVA";
+    CEItemLista vazio;
+    leitor.ComporRelacaoFio(s, vazio, &modelo_, atributo.get());
+    EXPECT_EQ(vazio.valorCampo("REL" + s), "");
+    EXPECT_EQ(vazio.valorCampo("LIG" + s), "A");
+    CEItemLista borne = campos({{"REGUA" + s, "X1"}, {"NUMERO" + s, "7"}});
+    leitor.ComporRelacaoFio(s, borne, &modelo_, atributo.get());
+    EXPECT_EQ(borne.valorCampo("REL" + s), "X1:7");
+    EXPECT_EQ(borne.valorCampo("RELACAO" + s), "X1:7/A");
+    CEItemLista pino = campos({{"CONECTOR" + s, "-X5"}, {"ID_PINO" + s, "3"}});
+    leitor.ComporRelacaoFio(s, pino, &modelo_, atributo.get());
+    EXPECT_EQ(pino.valorCampo("REL" + s), "-X5");
+    EXPECT_EQ(pino.valorCampo("LIG" + s), "3");
+    EXPECT_EQ(pino.valorCampo("RELACAO" + s), "-X5:3");
+}
+
 TEST_F(EndTextTest, APinBlockOnAWireGivesItsConnectorFromTheDrawing) {
     zvdb::BlockReference* pino =
         simbolo("PIN-1", {20, 150, 0}, {{"ID_PINO", "3", {25, 145, 0}}}, "9011");
