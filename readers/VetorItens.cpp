@@ -1,5 +1,4 @@
 #include "VetorItens.h"
-#include "VetorItensEstavel.h"
 
 #include <QHash>
 
@@ -121,8 +120,8 @@ void VetorItens::ordenar(const QStringList& campos) {
     OrdenaItens(*this, campos, false);
 }
 
-void OrdenaItensEstavel(VetorItens& itens, const QStringList& campos) {
-    OrdenaItens(itens, campos, true);
+void VetorItens::ordenarEstavel(const QStringList& campos) {
+    OrdenaItens(*this, campos, true);
 }
 
 void VetorItens::inverter() {

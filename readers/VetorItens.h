@@ -20,6 +20,8 @@ public:
     void removerEm(size_t indice);
     // Sorts by the fields' natural forms, then by their raw texts. Not stable.
     void ordenar(const QStringList& campos);
+    // The same sort, stable: items whose fields tie keep the order they had.
+    void ordenarEstavel(const QStringList& campos);
     void inverter();
     // The items whose every key has its value; shared with this vector, not copied.
     VetorItens filtrar(const std::vector<std::pair<QString, QString>>& pares) const;

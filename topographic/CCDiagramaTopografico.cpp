@@ -9,7 +9,6 @@
 #include "readers/CEAtributo.h"
 #include "readers/CEListaAtributos.h"
 #include "readers/CamposItem.h"
-#include "readers/VetorItensEstavel.h"
 #include "readers/ZVString.h"
 #include "settings/CIMensagens.h"
 
@@ -448,8 +447,8 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     }
     LePassos(itensBornes);
     // Items that sort alike keep the order above.
-    OrdenaItensEstavel(itensComuns, p.ordenacao);
-    OrdenaItensEstavel(itensBornes, p.ordenacao);
+    itensComuns.ordenarEstavel(p.ordenacao);
+    itensBornes.ordenarEstavel(p.ordenacao);
     LeExtensoes();
     progresso.Definir(50);
 

@@ -21,6 +21,7 @@ protected:
         qputenv("ZV_DATA_DIR", pasta_.path().toUtf8());
         qputenv("TMPDIR", pasta_.path().toUtf8());
         auto ui = std::make_unique<zvhost::ConsoleUserInterface>(out_, err_, false);
+        ui_ = ui.get();
         app_ = std::make_unique<zvhost::Application>(std::move(ui), out_);
         app_->setExecutableFolder(QString(ZV_BIN_DIR));
         documento_ = app_->openDocument(pasta_.filePath("projeto.dxf"));
@@ -61,5 +62,6 @@ protected:
     QString saida_, erros_;
     QTextStream out_{&saida_}, err_{&erros_};
     std::unique_ptr<zvhost::Application> app_;
+    zvhost::ConsoleUserInterface* ui_ = nullptr;  // for scripted answers
     zvhost::HostDocument* documento_ = nullptr;
 };

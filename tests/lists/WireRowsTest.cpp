@@ -3,15 +3,8 @@
 // two lists of one writer filled as it is then.
 #include "QtPrinters.h"
 #include "TemplateDouble.h"
-#include "app/Application.h"
-#include "app/ConsoleUserInterface.h"
-#include "app/HostDocument.h"
 #include "cad/CICad.h"
-#include "drawing/Attribute.h"
-#include "drawing/BlockRecord.h"
-#include "drawing/BlockReference.h"
-#include "drawing/Database.h"
-#include "drawing/DxfWriter.h"
+#include "cad/FacadeFixture.h"
 #include "lists/CCFioGrfWriter.h"
 #include "readers/VetorItens.h"
 #include "settings/CIMensagens.h"
@@ -20,23 +13,15 @@
 
 #include <QDir>
 #include <QFileInfo>
-#include <QTemporaryDir>
 
 #include <memory>
 
 namespace {
 
-class WireRowsTest : public ::testing::Test {
+class WireRowsTest : public FacadeFixture {
 protected:
     void SetUp() override {
-        ASSERT_TRUE(pasta_.isValid());
-        ASSERT_TRUE(trabalho_.isValid());
-        qputenv("TMPDIR", trabalho_.path().toUtf8());
-        auto ui = std::make_unique<zvhost::ConsoleUserInterface>(out_, err_, false);
-        ui_ = ui.get();
-        app_ = std::make_unique<zvhost::Application>(std::move(ui), out_);
-        app_->setExecutableFolder(ZV_BIN_DIR);
-        documento_ = app_->openDocument(trabalho_.filePath("projeto.dxf"));
+        FacadeFixture::SetUp();
         ASSERT_NE(documento_, nullptr);
         CICad::SetStringLisp("*DIRETORIO_REDE*", pasta_.path() + "/");
         modelo_.simbolos = {{"*X_INIC_LISTA*", 10.0},
@@ -93,12 +78,6 @@ protected:
         return linhas;
     }
 
-    QTemporaryDir pasta_, trabalho_;
-    QString saida_, erros_;
-    QTextStream out_{&saida_}, err_{&erros_};
-    std::unique_ptr<zvhost::Application> app_;
-    zvhost::ConsoleUserInterface* ui_ = nullptr;
-    zvhost::HostDocument* documento_ = nullptr;
     TemplateDouble modelo_;
     std::vector<std::unique_ptr<CEItemLista>> donos_;
     VetorItens itens_;

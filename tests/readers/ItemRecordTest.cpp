@@ -1,7 +1,6 @@
 // Item records, their fields, the natural ordering and the vector operations.
 #include "readers/CEItemLista.h"
 #include "readers/VetorItens.h"
-#include "readers/VetorItensEstavel.h"
 #include "readers/ZVString.h"
 
 #include "QtPrinters.h"
@@ -409,10 +408,10 @@ TEST(OrderingTest, AStableSortKeepsTiedItemsInTheirFirstOrder) {
                      [](const CEItemLista* a, const CEItemLista* b) {
                          return VetorItens::compararItens(a, b, {"G"}) < 0;
                      });
-    OrdenaItensEstavel(v, {"G"});
+    v.ordenarEstavel({"G"});
     EXPECT_EQ(Valores(v, "ID"), Valores(esperado, "ID"));
     // Sorting again changes nothing.
-    OrdenaItensEstavel(v, {"G"});
+    v.ordenarEstavel({"G"});
     EXPECT_EQ(Valores(v, "ID"), Valores(esperado, "ID"));
 }
 
