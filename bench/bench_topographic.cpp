@@ -3,6 +3,8 @@
 // the sizes given), with the demo catalogue, product data and diagram template. Each run is
 // a child process; its processor time comes from the children's resource usage. Huge pages
 // stay off unless ZV_HUGE_PAGES is set. Goal: the diagram within 3 times open-and-save.
+// The pair (open-and-save, then the diagram) runs `--runs` times (3 unless given), and each
+// side's fastest run is kept: load from elsewhere on a shared machine only ever adds time.
 #include <QCoreApplication>
 #include <QDir>
 #include <QElapsedTimer>
@@ -13,6 +15,7 @@
 #include <sys/resource.h>
 
 #include <cstdio>
+#include <vector>
 
 namespace {
 
@@ -50,11 +53,31 @@ Medida Roda(const QStringList& args, const QProcessEnvironment& env, const QStri
     return m;
 }
 
+// The fastest of the runs, or the first that failed.
+Medida Melhor(const std::vector<Medida>& runs) {
+    Medida m;
+    for (const Medida& r : runs) {
+        if (!r.ok) return r;
+        if (!m.ok || r.wall < m.wall) m = r;
+    }
+    return m;
+}
+
 }  // namespace
 
 int main(int argc, char** argv) {
     QCoreApplication app(argc, argv);
     QStringList tamanhos = app.arguments().mid(1);
+    int vezes = 3;
+    const int opcao = int(tamanhos.indexOf("--runs"));
+    if (opcao >= 0) {
+        vezes = opcao + 1 < tamanhos.size() ? tamanhos[opcao + 1].toInt() : 0;
+        if (vezes < 1) {
+            std::fprintf(stderr, "usage: bench_topographic [--runs N] [SIZE...]\n");
+            return 2;
+        }
+        tamanhos.erase(tamanhos.begin() + opcao, tamanhos.begin() + opcao + 2);
+    }
     if (tamanhos.isEmpty()) tamanhos = QStringList{"20000"};
     QTemporaryDir pasta;
     const QString dados = pasta.filePath("data"), produto = pasta.filePath("product") + "/";
@@ -90,13 +113,18 @@ int main(int argc, char** argv) {
                  .ok)
             return 1;
         const QString saida = pasta.filePath("out.dxf");
-        // Back to back, so that both see the same load on the machine.
-        const Medida base = Roda({"--quiet", projeto, "-o", saida}, env, pasta.path());
-        const Medida diagrama =
-            Roda({"--quiet", "--load", produto + "config/zvconfig.lsp", "--answer",
-                  "template=" + produto + "templates/topografico.dtp", projeto, "-o", saida,
-                  "diagramaTopografico"},
-                 env, pasta.path());
+        std::vector<Medida> bases, diagramas;
+        for (int vez = 0; vez < vezes; ++vez) {
+            // Back to back, so that both see the same load on the machine.
+            bases.push_back(Roda({"--quiet", projeto, "-o", saida}, env, pasta.path()));
+            diagramas.push_back(
+                Roda({"--quiet", "--load", produto + "config/zvconfig.lsp", "--answer",
+                      "template=" + produto + "templates/topografico.dtp", projeto, "-o", saida,
+                      "diagramaTopografico"},
+                     env, pasta.path()));
+            if (!bases.back().ok || !diagramas.back().ok) return 1;
+        }
+        const Medida base = Melhor(bases), diagrama = Melhor(diagramas);
         // The result is larger than the project: opening and saving it, for scale.
         const QString copia = pasta.filePath("copy.dxf");
         const Medida resultado = Roda({"--quiet", saida, "-o", copia}, env, pasta.path());
