@@ -176,6 +176,43 @@ TEST_F(ConnectionsTest, WireListTakesEachWiresFirstPolylineOnThePagesAndFollowsE
     EXPECT_EQ(show("(length (getListaFios \"ESQ$0001$A\"))"), "1");
 }
 
+TEST_F(ConnectionsTest, ConnectionAttributesAreReadAsTheDrawingReadsThem) {
+    auto* element = contact("ESQ$0001$A", {150, 200, 0});
+    const std::string h = hex(element);
+    wire("ESQ$0001$A", {{150, 200, 0}, {150, 190, 0}}, "601");
+    auto entries = [this] { return show("(cdr (car (getConexoesTodosFios)))"); };
+    EXPECT_EQ(entries(),
+              "((\"" + h + "#13#NA-1\" 150.0 200.0 0.0) (\"" + h + "#14#NA-1\" 150.0 190.0 0.0))");
+    // An application group before the attribute's own tags holds codes of its own: they
+    // are not the attribute's tag, value or position.
+    std::vector<zvdb::Attribute*> attributes = element->attributes();
+    ASSERT_EQ(attributes.size(), 2u);
+    {
+        auto& tags = attributes[0]->editTags();
+        const std::vector<zvdb::Tag> group = {{102, database->store("{ACAD_REACTORS")},
+                                              {2, database->store("OUTRO")},
+                                              {1, database->store("99")},
+                                              {10, database->store("150.0")},
+                                              {20, database->store("190.0")},
+                                              {102, database->store("}")}};
+        tags.insert(tags.begin() + 2, group.begin(), group.end());
+    }
+    EXPECT_EQ(attributes[0]->tag(), "LIGACAO1");
+    EXPECT_EQ(entries(),
+              "((\"" + h + "#13#NA-1\" 150.0 200.0 0.0) (\"" + h + "#14#NA-1\" 150.0 190.0 0.0))");
+    // a new value, a new position, a tag that is no connection, an erased attribute
+    attributes[0]->setTextValue("A1");
+    EXPECT_EQ(entries(),
+              "((\"" + h + "#A1#NA-1\" 150.0 200.0 0.0) (\"" + h + "#14#NA-1\" 150.0 190.0 0.0))");
+    attributes[1]->setPosition({150, 195, 0});
+    EXPECT_EQ(entries(),
+              "((\"" + h + "#A1#NA-1\" 150.0 200.0 0.0) (\"" + h + "##NA-1\" 150.0 190.0 0.0))");
+    attributes[0]->setTag("BORNE");
+    attributes[1]->erase();
+    EXPECT_EQ(entries(),
+              "((\"" + h + "##NA-1\" 150.0 200.0 0.0) (\"" + h + "##NA-1\" 150.0 190.0 0.0))");
+}
+
 TEST_F(ConnectionsTest, ProjectCheckFindsDuplicateTerminalsAndOpenWires) {
     terminal("ESQ$0001$A", {100, 200, 0}, "X1", "1");
     terminal("ESQ$0001$A", {200, 200, 0}, "X1", "2");
