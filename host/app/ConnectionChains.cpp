@@ -6,6 +6,7 @@
 #include "product/ProductContext.h"
 
 #include <string>
+#include <string_view>
 
 namespace zvhost {
 
@@ -14,8 +15,12 @@ using zvsdk::ResultBuffer;
 
 namespace {
 
-QString qText(const std::string& text) {
-    return QString::fromUtf8(text.data(), static_cast<int>(text.size()));
+// Handles and most names are ASCII, which Latin-1 reads alike without the UTF-8 decoder.
+QString qText(std::string_view text) {
+    const auto size = static_cast<int>(text.size());
+    for (char c : text)
+        if (static_cast<unsigned char>(c) >= 0x80) return QString::fromUtf8(text.data(), size);
+    return QString::fromLatin1(text.data(), size);
 }
 
 // A chain under construction; what is built so far goes if the building stops half-way.

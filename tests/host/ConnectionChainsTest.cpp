@@ -86,6 +86,29 @@ TEST_F(ConnectionChainsTest, TheChainsAreTheNodesOfTheLispAnswers) {
         "5019\n");
 }
 
+TEST(ConnectionChainTexts, NamesOutsideAsciiAreReadAsUtf8) {
+    const std::string number =
+        "F\xC3\x87"
+        "1";                                         // FÇ1
+    const std::string block = "A\xC3\x87\xC3\x83O";  // AÇÃO
+    const std::string connection =
+        "\xC2\xB5"
+        "2";  // µ2
+    zvproduct::WireConnections wire{number, {}, {}};
+    wire.touches.push_back({0x1F, connection, block, {1, 2, 3}});
+    wire.touches.push_back({0x20, {}, "BORNE", {4, 5, 6}});
+    Chain chain(zvhost::ConnectionChains::toChain({wire}, true));
+    EXPECT_EQ(chain.text(), "5016\n5016\n5005 " + number + "\n5016\n5005 1F#" + connection + "#" +
+                                block + "\n5001 1.000000\n5001 2.000000\n5001 3.000000\n5017\n" +
+                                "5016\n5005 20##BORNE\n5001 4.000000\n5001 5.000000\n" +
+                                "5001 6.000000\n5017\n5017\n5017\n");
+    EXPECT_EQ(chain.head->rbnext->rbnext->rstring, QString::fromUtf8("F\xC3\x87"
+                                                                     "1"));
+    EXPECT_EQ(chain.head->rbnext->rbnext->rstring.size(), 3);
+    Chain cables(zvhost::ConnectionChains::toChain({wire}, false));
+    EXPECT_EQ(cables.head->rbnext->rbnext->rbnext->rbnext->rstring, "1F");
+}
+
 TEST_F(ConnectionChainsTest, AUsersDefunOfTheFunctionTakesOver) {
     lisp().interpreter().evalText(
         "(defun getConexoesTodosFios () '((\"X\" (\"1A#2#B\" 1.5 2.0 3.0))))");
