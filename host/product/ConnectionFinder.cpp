@@ -188,7 +188,45 @@ struct FirstTags {
 struct ConnectionFinder::Scratch {
     std::vector<const Spot*> near;
     std::vector<std::uint32_t> seen;
+    std::vector<zvdb::Point3> vertices;
 };
+
+namespace {
+
+// The vertices of a polyline as Polyline::vertices gives them, into `out`: a lightweight
+// polyline's in one walk of its tags (its elevation, the first 38 outside application
+// groups, is the z of all), without a vector made per polyline.
+void readVertices(const zvdb::Polyline& polyline, std::vector<zvdb::Point3>& out) {
+    out.clear();
+    if (!polyline.isLightweight()) {
+        out = polyline.vertices();
+        return;
+    }
+    const auto all = polyline.tags();
+    const std::size_t end = zvdb::TagList::xdataStart(all);
+    int elevation = -1;
+    bool inGroup = false;
+    for (std::size_t i = 1; i < end; ++i) {
+        const zvdb::Tag& tag = all[i];
+        if (tag.code == 10) {
+            out.push_back({zvdb::TagValues::toReal(tag.value), 0.0, 0.0});
+        } else if (tag.code == 20) {
+            if (!out.empty()) out.back().y = zvdb::TagValues::toReal(tag.value);
+        } else if (zvdb::TagList::opensGroup(tag)) {
+            inGroup = true;
+        } else if (zvdb::TagList::closesGroup(tag)) {
+            inGroup = false;
+        } else if (tag.code == 38 && !inGroup && elevation < 0) {
+            elevation = static_cast<int>(i);
+        }
+    }
+    if (elevation < 0) return;
+    const double z = zvdb::TagValues::toReal(all[static_cast<std::size_t>(elevation)].value);
+    for (zvdb::Point3& p : out)
+        p.z = z;
+}
+
+}  // namespace
 
 ConnectionFinder::ConnectionFinder(zvdb::Database& database, double tolerance)
     : database_(database),
@@ -452,7 +490,8 @@ std::vector<WireConnections> ConnectionFinder::wires() const {
         if (added) result.push_back({std::string(number), {}, {}});
         WireConnections& wire = result[it->second];
         wire.polylines.push_back(line.handle);
-        for (const zvdb::Point3& vertex : line.polyline->vertices())
+        readVertices(*line.polyline, scratch.vertices);
+        for (const zvdb::Point3& vertex : scratch.vertices)
             touchesAt(line.layer, vertex, tolerance_, wire.touches, scratch);
     }
     return result;
@@ -467,7 +506,8 @@ std::vector<WireConnections> ConnectionFinder::cables() const {
     }
     Scratch scratch;
     auto ends = [&](const Line& line, bool firstToo, std::vector<Touch>& out) {
-        const auto vertices = line.polyline->vertices();
+        readVertices(*line.polyline, scratch.vertices);
+        const auto& vertices = scratch.vertices;
         if (vertices.empty()) return;
         if (firstToo) touchesAt(line.layer, vertices.front(), kLeadTolerance, out, scratch);
         if (vertices.size() > 1)

@@ -213,6 +213,25 @@ TEST_F(ConnectionsTest, ConnectionAttributesAreReadAsTheDrawingReadsThem) {
               "((\"" + h + "##NA-1\" 150.0 200.0 0.0) (\"" + h + "##NA-1\" 150.0 190.0 0.0))");
 }
 
+TEST_F(ConnectionsTest, AWiresElevationIsTheZOfItsVertices) {
+    auto* high = terminal("ESQ$0001$A", {100, 200, 5}, "X1", "1");
+    terminal("ESQ$0001$A", {200, 200, 0}, "X1", "2");
+    auto* line = wire("ESQ$0001$A", {{100, 200, 0}, {200, 200, 0}}, "701");
+    line->setReal(38, 5.0, "AcDbPolyline");
+    // a group of another application names a 38 of its own before the polyline's
+    auto& tags = line->editTags();
+    const std::vector<zvdb::Tag> group = {{102, database->store("{ACAD_REACTORS")},
+                                          {38, database->store("7.5")},
+                                          {102, database->store("}")}};
+    tags.insert(tags.begin() + 2, group.begin(), group.end());
+    ASSERT_EQ(line->vertices().front().z, 5.0);
+    EXPECT_EQ(show("(cdr (car (getConexoesTodosFios)))"),
+              "((\"" + hex(high) + "##BORNE_1\" 100.0 200.0 5.0))");
+    line->setReal(38, 0.0, "AcDbPolyline");
+    EXPECT_EQ(show("(length (cdr (car (getConexoesTodosFios))))"), "1");
+    EXPECT_EQ(show("(cadr (car (cdr (car (getConexoesTodosFios)))))"), "200.0");
+}
+
 TEST_F(ConnectionsTest, ProjectCheckFindsDuplicateTerminalsAndOpenWires) {
     terminal("ESQ$0001$A", {100, 200, 0}, "X1", "1");
     terminal("ESQ$0001$A", {200, 200, 0}, "X1", "2");
