@@ -14,6 +14,7 @@
 #include <climits>
 #include <cmath>
 #include <span>
+#include <typeinfo>
 
 namespace zvproduct {
 
@@ -139,34 +140,46 @@ struct Roles {
 
 // The first tags of codes 1, 2, 8 and 10 of an object, outside application groups and
 // before the extended data, as DbObject::text and point find them, in one walk instead
-// of one walk each.
+// of one walk each; the walk stops when the codes `wanted` are found.
 struct FirstTags {
+    enum Code : unsigned { Value = 1, Name = 2, Layer = 4, Point = 8 };
     std::span<const zvdb::Tag> all;
     int value = -1, name = -1, layer = -1, point = -1;
 
-    explicit FirstTags(std::span<const zvdb::Tag> tags) : all(tags) {
+    FirstTags(std::span<const zvdb::Tag> tags, unsigned wanted) : all(tags) {
         const std::size_t end = zvdb::TagList::xdataStart(all);
         bool inGroup = false;
+        unsigned found = 0;
         for (std::size_t i = 1; i < end; ++i) {
             const zvdb::Tag& tag = all[i];
-            if (zvdb::TagList::opensGroup(tag)) {
-                inGroup = true;
-                continue;
-            }
-            if (zvdb::TagList::closesGroup(tag)) {
-                inGroup = false;
+            if (tag.code == 102) {
+                if (zvdb::TagList::opensGroup(tag)) inGroup = true;
+                if (zvdb::TagList::closesGroup(tag)) inGroup = false;
                 continue;
             }
             if (inGroup) continue;
-            int* slot = tag.code == 1    ? &value
-                        : tag.code == 2  ? &name
-                        : tag.code == 8  ? &layer
-                        : tag.code == 10 ? &point
-                                         : nullptr;
-            if (!slot || *slot >= 0) continue;
+            int* slot;
+            unsigned code;
+            switch (tag.code) {
+                case 1:
+                    slot = &value, code = Value;
+                    break;
+                case 2:
+                    slot = &name, code = Name;
+                    break;
+                case 8:
+                    slot = &layer, code = Layer;
+                    break;
+                case 10:
+                    slot = &point, code = Point;
+                    break;
+                default:
+                    continue;
+            }
+            if (*slot >= 0) continue;
             *slot = static_cast<int>(i);
-            // an attribute's tag comes last of the four, the others before
-            if (value >= 0 && name >= 0 && layer >= 0 && point >= 0) break;
+            found |= code;
+            if ((found & wanted) == wanted) break;
         }
     }
     std::string_view text(int at, std::string_view fallback = {}) const {
@@ -290,14 +303,16 @@ void ConnectionFinder::readModelSpace() {
 // its cut point; the two latter take the name of a connection attribute standing on them.
 void ConnectionFinder::indexSymbol(const zvdb::BlockReference& reference, std::size_t cutBegin,
                                    std::size_t cutEnd) {
-    const FirstTags own(reference.tags());
+    const FirstTags own(reference.tags(), FirstTags::Name | FirstTags::Layer | FirstTags::Point);
     const std::int32_t layer = layerId(own.text(own.layer, "0"));
     const auto symbol = static_cast<std::uint32_t>(symbols_.size());
     symbols_.push_back({reference.handle(), own.text(own.name)});
     const std::size_t firstSpot = spots_.size();
     for (zvdb::Entity* sub : reference.subEntities()) {
-        if (sub->isErased() || !dynamic_cast<zvdb::Attribute*>(sub)) continue;
-        const FirstTags attribute(sub->tags());
+        // no kind of attribute derives from Attribute: its type tells it at once
+        if (sub->isErased() || typeid(*sub) != typeid(zvdb::Attribute)) continue;
+        const FirstTags attribute(sub->tags(),
+                                  FirstTags::Value | FirstTags::Name | FirstTags::Point);
         if (isConnectionTag(attribute.text(attribute.name)))
             addSpot(symbol, layer, attribute.position(), attribute.text(attribute.value));
     }
