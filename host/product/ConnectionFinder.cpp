@@ -426,11 +426,23 @@ void ConnectionFinder::touchesAt(std::int32_t layer, const zvdb::Point3& p, doub
                                  std::vector<Touch>& out, Scratch& scratch) const {
     auto& near = scratch.near;
     near.clear();
-    const auto cx = static_cast<long long>(std::floor(p.x / cell_));
-    const auto cy = static_cast<long long>(std::floor(p.y / cell_));
-    for (long long dx = -1; dx <= 1; ++dx)
-        for (long long dy = -1; dy <= 1; ++dy) {
-            const CellRun* cell = run(layer, cellKey(cx + dx, cy + dy));
+    // nothing is within a distance of a point that is not finite
+    if (!std::isfinite(p.x) || !std::isfinite(p.y)) return;
+    // The radius is at most a cell: the spots lie in the vertex's cell and its neighbours,
+    // and only in those that the radius reaches (with a margin far above any rounding),
+    // which are visited in the same order.
+    auto cells = [&](double v, long long& from, long long& to) {
+        const auto at = static_cast<long long>(std::floor(v / cell_));
+        const double margin = radius + 1e-6 * (radius + std::abs(v));
+        from = std::max(at - 1, static_cast<long long>(std::floor((v - margin) / cell_)));
+        to = std::min(at + 1, static_cast<long long>(std::floor((v + margin) / cell_)));
+    };
+    long long x0, x1, y0, y1;
+    cells(p.x, x0, x1);
+    cells(p.y, y0, y1);
+    for (long long cx = x0; cx <= x1; ++cx)
+        for (long long cy = y0; cy <= y1; ++cy) {
+            const CellRun* cell = run(layer, cellKey(cx, cy));
             if (!cell) continue;
             for (std::uint32_t i = cell->begin; i < cell->end; ++i)
                 if (distance(spots_[i].point, p) <= radius) near.push_back(&spots_[i]);

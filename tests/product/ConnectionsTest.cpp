@@ -232,6 +232,19 @@ TEST_F(ConnectionsTest, AWiresElevationIsTheZOfItsVertices) {
     EXPECT_EQ(show("(cadr (car (cdr (car (getConexoesTodosFios)))))"), "200.0");
 }
 
+TEST_F(ConnectionsTest, TouchesAcrossTheIndexsCellsAndAtTheToleranceItself) {
+    // the index's cells are one unit wide: each vertex here is in another cell than its
+    // terminal, the last one exactly the tolerance away from it
+    auto* a = terminal("ESQ$0001$A", {99.95, 200, 0}, "X1", "1");
+    auto* b = terminal("ESQ$0001$A", {0.04, 300, 0}, "X1", "2");
+    auto* c = terminal("ESQ$0001$A", {200, 400, 0}, "X1", "3");
+    terminal("ESQ$0001$A", {300.12, 500, 0}, "X1", "4");  // beyond the tolerance
+    wire("ESQ$0001$A", {{100.04, 200, 0}, {-0.05, 300, 0}, {199.9, 400, 0}, {300, 500, 0}}, "801");
+    EXPECT_EQ(
+        show("(mapcar 'car (cdr (car (getConexoesTodosFios))))"),
+        "(\"" + hex(a) + "##BORNE_1\" \"" + hex(b) + "##BORNE_1\" \"" + hex(c) + "##BORNE_1\")");
+}
+
 TEST_F(ConnectionsTest, ProjectCheckFindsDuplicateTerminalsAndOpenWires) {
     terminal("ESQ$0001$A", {100, 200, 0}, "X1", "1");
     terminal("ESQ$0001$A", {200, 200, 0}, "X1", "2");
