@@ -116,6 +116,13 @@ void ConnectionChains::install(DocumentLisp& lisp, const zvproduct::ProductConte
     };
     add("getConexoesTodosFios", ConnectionAnswers::Kind::Wires, true);
     add("getConexoesTodosCabos", ConnectionAnswers::Kind::Cables, false);
+    // A reader asks for the cables right after the wires or not at all: a call of anything
+    // else lets the kept index go, so that it does not weigh on the rest of the run.
+    lisp.addInvokeListener([answers](const QString& function) {
+        if (answers->keepsIndex() && function != QLatin1String("getConexoesTodosFios") &&
+            function != QLatin1String("getConexoesTodosCabos"))
+            answers->release();
+    });
 }
 
 }  // namespace zvhost

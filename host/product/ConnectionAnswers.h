@@ -4,7 +4,8 @@
 // two in a row, or for the wires alone: so its call works out the kind asked for and keeps
 // the index for the next call. The kept index serves only while the drawing (its change
 // count, see DrawingStamp) and the tolerance are the same, and the next call drops it in
-// any case: nothing big stays behind between commands.
+// any case: nothing big stays behind between commands. A host that sees the caller go on
+// to other things (see ConnectionChains) lets it go at once.
 #include "ConnectionFinder.h"
 #include "DrawingStamp.h"
 
@@ -40,6 +41,8 @@ public:
     static double tolerance(zvlisp::Interpreter& lisp);
     // Whether an index is kept for the next call.
     bool keepsIndex() const { return kept_ != nullptr; }
+    // Lets go of a kept index: the caller has gone on to other things.
+    void release() { kept_.reset(); }
 
 private:
     DrawingStamp stamp_;

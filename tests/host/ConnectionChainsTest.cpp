@@ -4,8 +4,12 @@
 #include "LispHostFixture.h"
 
 #include "app/ConnectionChains.h"
+#include "app/DocumentLisp.h"
 #include "app/LispChains.h"
 #include "drawing/Database.h"
+#include "product/ConnectionAnswers.h"
+#include "product/ProductContext.h"
+#include "product/ProductLisp.h"
 #include "sample/ProjectGenerator.h"
 #include "sdk/ResultBuffer.h"
 
@@ -117,6 +121,38 @@ TEST_F(ConnectionChainsTest, AUsersDefunOfTheFunctionTakesOver) {
               "5001 3.000000\n5017\n5017\n5017\n");
     // the other function is still the product's
     EXPECT_EQ(invoked("getConexoesTodosCabos"), throughLisp("getConexoesTodosCabos"));
+}
+
+TEST(ConnectionChainIndex, KeptForTheCablesRightAfterTheWiresAndLetGoAtAnyOtherCall) {
+    zvsample::ProjectGenerator generator({5, 60, 4});
+    std::unique_ptr<zvdb::Database> drawing = generator.generate();
+    zvhost::DocumentLisp lisp([](const QString&) {});
+    auto answers = std::make_shared<zvproduct::ConnectionAnswers>();
+    zvproduct::ProductContext context;
+    context.database = [&drawing] { return drawing.get(); };
+    context.connections = answers;
+    zvproduct::installProductFunctions(lisp.interpreter(), context);
+    zvhost::ConnectionChains::install(lisp, context);
+    auto invoke = [&lisp](const char* function, const char* argument = nullptr) {
+        Chain call(zvsdk::newString(function));
+        if (argument) call.head->rbnext = zvsdk::newString(argument);
+        return Chain(lisp.lispInvoke(call.head)).text();
+    };
+    const std::string wires = invoke("getConexoesTodosFios");
+    EXPECT_TRUE(answers->keepsIndex());
+    const std::string cables = invoke("getConexoesTodosCabos");
+    EXPECT_FALSE(answers->keepsIndex());
+    EXPECT_GT(std::count(cables.begin(), cables.end(), '\n'), 10);
+    // the wires alone, then the reader goes on with other questions
+    EXPECT_EQ(invoke("getConexoesTodosFios"), wires);
+    EXPECT_TRUE(answers->keepsIndex());
+    invoke("getFiosPorLayer", "ESQ$0001$A");
+    EXPECT_FALSE(answers->keepsIndex());
+    // the cables asked later are worked out again, alike, and the index kept for the wires
+    EXPECT_EQ(invoke("getConexoesTodosCabos"), cables);
+    EXPECT_TRUE(answers->keepsIndex());
+    EXPECT_EQ(invoke("getConexoesTodosFios"), wires);
+    EXPECT_FALSE(answers->keepsIndex());
 }
 
 TEST(ResultBufferBlocks, BlocksGoWithTheirLastNodeInAnyOrderAndFromAnyThread) {
