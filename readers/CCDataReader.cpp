@@ -110,6 +110,13 @@ void CCDataReader::CarregaConexoesCabos() {
 void CCDataReader::CarregaConexoes(const QString& funcao, bool detalhes) {
     ResultBuffer* resposta = CICad::zvInvokeLista(funcao);
     const ResultBuffer* no = resposta && resposta->restype != zvsdk::RTNIL ? resposta : nullptr;
+    // the wires (the lists one level down) counted first: the map grows once
+    int fios = 0, nivel = 0;
+    for (const ResultBuffer* p = no; p; p = p->rbnext) {
+        if (p->restype == zvsdk::RTLB && nivel++ == 1) ++fios;
+        if (p->restype == zvsdk::RTLE) --nivel;
+    }
+    conexoes_.reserve(conexoes_.size() + fios);
     for (; no; no = no ? no->rbnext : nullptr) {
         if (no->restype == zvsdk::RTLB || no->restype == zvsdk::RTLE) continue;
         const QString fio = no->restype == zvsdk::RTSTR ? no->rstring : QString();
@@ -124,6 +131,18 @@ void CCDataReader::CarregaConexoes(const QString& funcao, bool detalhes) {
             no = no->rbnext;
             continue;
         }
+        // the wire's entries counted first: its lists are made at their size at once
+        int entradas = 0;
+        for (const ResultBuffer* adiante = no->rbnext; adiante; adiante = adiante->rbnext) {
+            if (adiante->restype == zvsdk::RTLE && adiante->rbnext &&
+                adiante->rbnext->restype == zvsdk::RTLE)
+                break;
+            entradas += adiante->restype == zvsdk::RTSTR;
+        }
+        conexoes.elementos.reserve(entradas);
+        conexoes.handles.reserve(static_cast<std::size_t>(entradas));
+        conexoes.pontos.reserve(static_cast<std::size_t>(entradas));
+        if (detalhes && GuardaCompletas) conexoes.completas.reserve(entradas);
         int coordenada = 0;
         for (no = no->rbnext; no; no = no->rbnext) {
             if (no->restype == zvsdk::RTLE && no->rbnext && no->rbnext->restype == zvsdk::RTLE)

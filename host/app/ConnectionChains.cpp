@@ -5,7 +5,9 @@
 #include "product/ConnectionAnswers.h"
 #include "product/ProductContext.h"
 
+#include <charconv>
 #include <string>
+#include <string_view>
 
 namespace zvhost {
 
@@ -14,8 +16,45 @@ using zvsdk::ResultBuffer;
 
 namespace {
 
-QString qText(const std::string& text) {
-    return QString::fromUtf8(text.data(), static_cast<int>(text.size()));
+bool isAscii(std::string_view text) {
+    for (char c : text)
+        if (static_cast<unsigned char>(c) >= 0x80) return false;
+    return true;
+}
+
+// Handles and most names are ASCII, which Latin-1 reads alike without the UTF-8 decoder.
+QString qText(std::string_view text) {
+    const auto size = static_cast<int>(text.size());
+    if (!isAscii(text)) return QString::fromUtf8(text.data(), size);
+    return QString::fromLatin1(text.data(), size);
+}
+
+// An entry's text written straight into its QString when it is all ASCII, as it nearly
+// always is; `scratch` holds it on the way through the UTF-8 decoder otherwise.
+QString entryText(const zvproduct::Touch& touch, bool details, std::string& scratch) {
+    if (details && !(isAscii(touch.connection) && isAscii(touch.block))) {
+        scratch.clear();
+        ConnectionAnswers::appendEntryText(touch, details, scratch);
+        return QString::fromUtf8(scratch.data(), static_cast<int>(scratch.size()));
+    }
+    char digits[24];
+    const auto end = std::to_chars(digits, digits + sizeof digits, touch.symbol, 16).ptr;
+    const auto count = static_cast<std::size_t>(end - digits);
+    const std::size_t size =
+        count + (details ? 2 + touch.connection.size() + touch.block.size() : 0);
+    QString text(static_cast<int>(size), Qt::Uninitialized);
+    QChar* out = text.data();
+    for (std::size_t i = 0; i < count; ++i)
+        *out++ =
+            QLatin1Char(digits[i] >= 'a' ? static_cast<char>(digits[i] - 'a' + 'A') : digits[i]);
+    if (!details) return text;
+    *out++ = QLatin1Char('#');
+    for (char c : touch.connection)
+        *out++ = QLatin1Char(c);
+    *out++ = QLatin1Char('#');
+    for (char c : touch.block)
+        *out++ = QLatin1Char(c);
+    return text;
 }
 
 // A chain under construction; what is built so far goes if the building stops half-way.
@@ -50,10 +89,8 @@ ResultBuffer* ConnectionChains::toChain(const std::vector<zvproduct::WireConnect
         chain.push(zvsdk::newNode(zvsdk::RTLB));
         chain.push(zvsdk::newString(qText(wire.number)));
         for (const zvproduct::Touch& touch : wire.touches) {
-            text.clear();
-            ConnectionAnswers::appendEntryText(touch, details, text);
             chain.push(zvsdk::newNode(zvsdk::RTLB));
-            chain.push(zvsdk::newString(qText(text)));
+            chain.push(zvsdk::newString(entryText(touch, details, text)));
             chain.push(zvsdk::newReal(touch.point.x));
             chain.push(zvsdk::newReal(touch.point.y));
             chain.push(zvsdk::newReal(touch.point.z));
@@ -79,6 +116,13 @@ void ConnectionChains::install(DocumentLisp& lisp, const zvproduct::ProductConte
     };
     add("getConexoesTodosFios", ConnectionAnswers::Kind::Wires, true);
     add("getConexoesTodosCabos", ConnectionAnswers::Kind::Cables, false);
+    // A reader asks for the cables right after the wires or not at all: a call of anything
+    // else lets the kept index go, so that it does not weigh on the rest of the run.
+    lisp.addInvokeListener([answers](const QString& function) {
+        if (answers->keepsIndex() && function != QLatin1String("getConexoesTodosFios") &&
+            function != QLatin1String("getConexoesTodosCabos"))
+            answers->release();
+    });
 }
 
 }  // namespace zvhost

@@ -104,6 +104,8 @@ void DocumentLisp::forgetPairs() {
 
 zvsdk::ResultBuffer* DocumentLisp::lispInvoke(const zvsdk::ResultBuffer* call) {
     if (!call || call->restype != zvsdk::RTSTR || interruptRequested()) return nullptr;
+    for (const InvokeListener& listener : invokeListeners_)
+        listener(call->rstring);
     zvsdk::ResultBuffer* chain = nullptr;
     if (answerAsChain(call, &chain)) return chain;
     // A function nobody defined answers nothing, quietly: the module asks for optional
@@ -131,6 +133,10 @@ zvsdk::ResultBuffer* DocumentLisp::lispInvoke(const zvsdk::ResultBuffer* call) {
 void DocumentLisp::addChainAnswer(const QString& function, ChainAnswer answer) {
     zvlisp::Symbol* symbol = lisp_.intern(function);
     chainAnswers_.insert(function, {symbol, symbol->value, std::move(answer), {}});
+}
+
+void DocumentLisp::addInvokeListener(InvokeListener listener) {
+    invokeListeners_.push_back(std::move(listener));
 }
 
 void DocumentLisp::addChainCall(const QString& function, ChainCall call) {

@@ -9,6 +9,7 @@
 #include <QHash>
 
 #include <functional>
+#include <vector>
 
 namespace zvhost {
 
@@ -47,6 +48,9 @@ public:
     using ChainCall = std::function<bool(zvlisp::Interpreter&, const zvsdk::ResultBuffer* args,
                                          zvsdk::ResultBuffer**)>;
     void addChainCall(const QString& function, ChainCall call);
+    // Told the name of every function the module calls, before the call.
+    using InvokeListener = std::function<void(const QString& function)>;
+    void addInvokeListener(InvokeListener listener);
 
 private:
     struct ChainSource {
@@ -70,6 +74,7 @@ private:
     zvlisp::Value pairs_;
     QHash<QString, zvlisp::Value> readTexts_;
     QHash<QString, ChainSource> chainAnswers_;
+    std::vector<InvokeListener> invokeListeners_;
 };
 
 }  // namespace zvhost

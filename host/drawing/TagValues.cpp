@@ -22,11 +22,42 @@ char upper(char c) {
     return c >= 'a' && c <= 'z' ? static_cast<char>(c - 32) : c;
 }
 
+// Most reals of a drawing are short decimals ("100.0", "-12.5"). With at most 15 digits
+// the digits make an exact integer and the power of ten is exact too, so one division,
+// which IEEE arithmetic rounds correctly, gives the nearest double: from_chars' answer.
+// Anything else (exponents, more digits, other text) is left to from_chars.
+bool shortDecimal(std::string_view text, double& value) {
+    static constexpr double kPowers[] = {1e0, 1e1, 1e2,  1e3,  1e4,  1e5,  1e6,  1e7,
+                                         1e8, 1e9, 1e10, 1e11, 1e12, 1e13, 1e14, 1e15};
+    std::size_t i = 0;
+    const bool negative = !text.empty() && text[0] == '-';
+    if (negative) ++i;
+    std::uint64_t digits = 0;
+    int count = 0, fraction = 0;
+    const std::size_t start = i;
+    for (; i < text.size() && text[i] >= '0' && text[i] <= '9'; ++i, ++count)
+        digits = digits * 10 + static_cast<std::uint64_t>(text[i] - '0');
+    if (i == start || count > 15) return false;
+    if (i < text.size() && text[i] == '.') {
+        const std::size_t point = ++i;
+        for (; i < text.size() && text[i] >= '0' && text[i] <= '9'; ++i, ++count, ++fraction) {
+            if (count == 15) return false;
+            digits = digits * 10 + static_cast<std::uint64_t>(text[i] - '0');
+        }
+        if (i == point) return false;
+    }
+    if (i != text.size()) return false;
+    const double magnitude = static_cast<double>(digits) / kPowers[fraction];
+    value = negative ? -magnitude : magnitude;
+    return true;
+}
+
 }  // namespace
 
 double TagValues::toReal(std::string_view text, double fallback) {
     text = trimmed(text);
     double value = fallback;
+    if (shortDecimal(text, value)) return value;
     const auto result = std::from_chars(text.data(), text.data() + text.size(), value);
     return result.ec == std::errc() ? value : fallback;
 }

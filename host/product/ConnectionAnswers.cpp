@@ -10,19 +10,19 @@ namespace zvproduct {
 
 std::vector<WireConnections> ConnectionAnswers::answer(zvdb::Database& database, double tolerance,
                                                        Kind kind, bool keepOther) {
-    std::optional<std::vector<WireConnections>> kept = std::move(kept_);
-    kept_.reset();
-    if (kept && keptKind_ == kind && stamp_ == DrawingStamp::of(database) &&
-        tolerance_ == tolerance)
-        return std::move(*kept);
-    kept.reset();
-    const ConnectionFinder finder(database, tolerance);
-    std::vector<WireConnections> asked = kind == Kind::Wires ? finder.wires() : finder.cables();
-    if (!keepOther) return asked;
-    kept_ = kind == Kind::Wires ? finder.cables() : finder.wires();
-    keptKind_ = kind == Kind::Wires ? Kind::Cables : Kind::Wires;
-    stamp_ = DrawingStamp::of(database);
-    tolerance_ = tolerance;
+    std::unique_ptr<ConnectionFinder> finder = std::move(kept_);
+    // A kept index serves one call: the second of a pair.
+    const bool fresh = !finder || stamp_ != DrawingStamp::of(database) || tolerance_ != tolerance;
+    if (fresh) {
+        finder.reset();  // before the new one is built: one index at a time
+        finder = std::make_unique<ConnectionFinder>(database, tolerance);
+    }
+    std::vector<WireConnections> asked = kind == Kind::Wires ? finder->wires() : finder->cables();
+    if (fresh && keepOther) {
+        kept_ = std::move(finder);
+        stamp_ = DrawingStamp::of(database);
+        tolerance_ = tolerance;
+    }
     return asked;
 }
 

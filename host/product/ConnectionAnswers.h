@@ -1,13 +1,15 @@
 #pragma once
 // The answers of getConexoesTodosFios and getConexoesTodosCabos for one document. Both come
 // from one index of the drawing (ConnectionFinder), and a reader of the module asks for the
-// two in a row: so its call works out both kinds and keeps the one not asked for the next
-// call. The kept answer serves only while the drawing and the tolerance are the same, and
-// the next call drops it in any case: nothing big stays behind between commands.
+// two in a row, or for the wires alone: so its call works out the kind asked for and keeps
+// the index for the next call. The kept index serves only while the drawing (its change
+// count, see DrawingStamp) and the tolerance are the same, and the next call drops it in
+// any case: nothing big stays behind between commands. A host that sees the caller go on
+// to other things (see ConnectionChains) lets it go at once.
 #include "ConnectionFinder.h"
 #include "DrawingStamp.h"
 
-#include <optional>
+#include <memory>
 #include <string>
 #include <vector>
 
@@ -23,7 +25,7 @@ class ConnectionAnswers {
 public:
     enum class Kind { Wires, Cables };
 
-    // `keepOther` works out the other kind too and keeps it for the next call.
+    // `keepOther` keeps the index for a call of the other kind.
     std::vector<WireConnections> answer(zvdb::Database& database, double tolerance, Kind kind,
                                         bool keepOther = true);
     // The same for a call on the context's drawing, at the tolerance that
@@ -37,12 +39,15 @@ public:
     static void appendEntryText(const Touch& touch, bool details, std::string& out);
     // What the tolerance of a LISP call is.
     static double tolerance(zvlisp::Interpreter& lisp);
+    // Whether an index is kept for the next call.
+    bool keepsIndex() const { return kept_ != nullptr; }
+    // Lets go of a kept index: the caller has gone on to other things.
+    void release() { kept_.reset(); }
 
 private:
     DrawingStamp stamp_;
     double tolerance_ = 0;
-    Kind keptKind_ = Kind::Wires;
-    std::optional<std::vector<WireConnections>> kept_;
+    std::unique_ptr<ConnectionFinder> kept_;
 };
 
 }  // namespace zvproduct

@@ -7,12 +7,14 @@
 #include "drawing/BlockReference.h"
 #include "drawing/Database.h"
 #include "drawing/Polyline.h"
+#include "drawing/TagList.h"
 #include "drawing/TagValues.h"
 
 #include <algorithm>
 #include <climits>
 #include <cmath>
 #include <span>
+#include <typeinfo>
 
 namespace zvproduct {
 
@@ -73,6 +75,18 @@ std::string_view wireNumberOf(std::span<const zvdb::Tag> items) {
     return {};
 }
 
+char upper(char c) {
+    return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c;
+}
+
+// `name` is `upperName` ignoring case; `upperName` is upper case.
+bool sameUpper(std::string_view name, std::string_view upperName) {
+    if (name.size() != upperName.size()) return false;
+    for (std::size_t i = 0; i < name.size(); ++i)
+        if (upper(name[i]) != upperName[i]) return false;
+    return true;
+}
+
 // The applications that decide what a model-space entity is to the connection rule, with
 // the items of the first group of each: one walk over the entity's extended data.
 struct Roles {
@@ -81,28 +95,40 @@ struct Roles {
     std::size_t end[Count] = {};
     bool has[Count] = {};
 
+    // Every entity of model space passes here with all its applications: the names are
+    // told apart by their length first.
+    static int appOf(std::string_view name) {
+        if (name.size() < 6 || !sameUpper(name.substr(0, 6), "KVR_ZV")) return -1;
+        const std::string_view rest = name.substr(6);
+        switch (name.size()) {
+            case 6:
+                return Symbol;
+            case 11:
+                return sameUpper(rest, "_WIRE") ? Wire : sameUpper(rest, "_CABO") ? Cable : -1;
+            case 13:
+                return sameUpper(rest, "_EQUIPO") ? Equipment : -1;
+            case 16:
+                return sameUpper(rest, "_PTS_CORTE") ? CutPoints : -1;
+            case 18:
+                return sameUpper(rest, "_CONEX_BLIND") ? Blind : -1;
+            default:
+                return -1;
+        }
+    }
+
     explicit Roles(const zvdb::DbObject& object) {
-        static constexpr std::string_view kNames[Count] = {
-            "KVR_ZV",      "KVR_ZV_EQUIPO", "KVR_ZV_PTS_CORTE",
-            "KVR_ZV_WIRE", "KVR_ZV_CABO",   "KVR_ZV_CONEX_BLIND"};
         const auto all = object.tags();
         int open = -1;
-        for (std::size_t i = object.xdataStart(); i < all.size(); ++i) {
+        for (std::size_t i = zvdb::TagList::xdataStart(all); i < all.size(); ++i) {
             if (all[i].code != 1001) continue;
             if (open >= 0) end[open] = i;
             open = -1;
-            const std::string_view name = all[i].value;
-            if (name.size() < 6 || !zvdb::TagValues::sameName(name.substr(0, 6), "KVR_ZV"))
-                continue;
-            for (int app = 0; app < Count; ++app)
-                if (zvdb::TagValues::sameName(name, kNames[app])) {
-                    if (!has[app]) {
-                        has[app] = true;
-                        begin[app] = i + 1;
-                        open = app;
-                    }
-                    break;
-                }
+            const int app = appOf(all[i].value);
+            if (app >= 0 && !has[app]) {
+                has[app] = true;
+                begin[app] = i + 1;
+                open = app;
+            }
         }
         if (open >= 0) end[open] = all.size();
     }
@@ -112,13 +138,108 @@ struct Roles {
     }
 };
 
+// The first tags of codes 1, 2, 8 and 10 of an object, outside application groups and
+// before the extended data, as DbObject::text and point find them, in one walk instead
+// of one walk each; the walk stops when the codes `wanted` are found.
+struct FirstTags {
+    enum Code : unsigned { Value = 1, Name = 2, Layer = 4, Point = 8 };
+    std::span<const zvdb::Tag> all;
+    int value = -1, name = -1, layer = -1, point = -1;
+
+    FirstTags(std::span<const zvdb::Tag> tags, unsigned wanted) : all(tags) {
+        const std::size_t end = zvdb::TagList::xdataStart(all);
+        bool inGroup = false;
+        unsigned found = 0;
+        for (std::size_t i = 1; i < end; ++i) {
+            const zvdb::Tag& tag = all[i];
+            if (tag.code == 102) {
+                if (zvdb::TagList::opensGroup(tag)) inGroup = true;
+                if (zvdb::TagList::closesGroup(tag)) inGroup = false;
+                continue;
+            }
+            if (inGroup) continue;
+            int* slot;
+            unsigned code;
+            switch (tag.code) {
+                case 1:
+                    slot = &value, code = Value;
+                    break;
+                case 2:
+                    slot = &name, code = Name;
+                    break;
+                case 8:
+                    slot = &layer, code = Layer;
+                    break;
+                case 10:
+                    slot = &point, code = Point;
+                    break;
+                default:
+                    continue;
+            }
+            if (*slot >= 0) continue;
+            *slot = static_cast<int>(i);
+            found |= code;
+            if ((found & wanted) == wanted) break;
+        }
+    }
+    std::string_view text(int at, std::string_view fallback = {}) const {
+        return at < 0 ? fallback : all[static_cast<std::size_t>(at)].value;
+    }
+    zvdb::Point3 position() const {
+        if (point < 0) return {};
+        auto k = static_cast<std::size_t>(point);
+        zvdb::Point3 p{zvdb::TagValues::toReal(all[k++].value), 0.0, 0.0};
+        if (k < all.size() && all[k].code == 20) p.y = zvdb::TagValues::toReal(all[k++].value);
+        if (k < all.size() && all[k].code == 30) p.z = zvdb::TagValues::toReal(all[k].value);
+        return p;
+    }
+};
+
 }  // namespace
 
 // What one vertex query needs, kept between queries so that they allocate nothing.
 struct ConnectionFinder::Scratch {
     std::vector<const Spot*> near;
     std::vector<std::uint32_t> seen;
+    std::vector<zvdb::Point3> vertices;
 };
+
+namespace {
+
+// The vertices of a polyline as Polyline::vertices gives them, into `out`: a lightweight
+// polyline's in one walk of its tags (its elevation, the first 38 outside application
+// groups, is the z of all), without a vector made per polyline.
+void readVertices(const zvdb::Polyline& polyline, std::vector<zvdb::Point3>& out) {
+    out.clear();
+    if (!polyline.isLightweight()) {
+        out = polyline.vertices();
+        return;
+    }
+    const auto all = polyline.tags();
+    const std::size_t end = zvdb::TagList::xdataStart(all);
+    int elevation = -1;
+    bool inGroup = false;
+    for (std::size_t i = 1; i < end; ++i) {
+        const zvdb::Tag& tag = all[i];
+        if (tag.code == 10) {
+            out.push_back({zvdb::TagValues::toReal(tag.value), 0.0, 0.0});
+        } else if (tag.code == 20) {
+            if (!out.empty()) out.back().y = zvdb::TagValues::toReal(tag.value);
+        } else if (zvdb::TagList::opensGroup(tag)) {
+            inGroup = true;
+        } else if (zvdb::TagList::closesGroup(tag)) {
+            inGroup = false;
+        } else if (tag.code == 38 && !inGroup && elevation < 0) {
+            elevation = static_cast<int>(i);
+        }
+    }
+    if (elevation < 0) return;
+    const double z = zvdb::TagValues::toReal(all[static_cast<std::size_t>(elevation)].value);
+    for (zvdb::Point3& p : out)
+        p.z = z;
+}
+
+}  // namespace
 
 ConnectionFinder::ConnectionFinder(zvdb::Database& database, double tolerance)
     : database_(database),
@@ -130,7 +251,10 @@ ConnectionFinder::ConnectionFinder(zvdb::Database& database, double tolerance)
 }
 
 std::int32_t ConnectionFinder::layerId(std::string_view layer) {
-    return layers_.emplace(layer, static_cast<std::int32_t>(layers_.size())).first->second;
+    if (lastLayerId_ >= 0 && layer == lastLayer_) return lastLayerId_;
+    lastLayer_ = layer;
+    lastLayerId_ = layers_.emplace(layer, static_cast<std::int32_t>(layers_.size())).first->second;
+    return lastLayerId_;
 }
 
 std::uint64_t ConnectionFinder::cellKey(long long x, long long y) const {
@@ -156,7 +280,7 @@ void ConnectionFinder::readModelSpace() {
                               ? dynamic_cast<zvdb::BlockReference*>(entity)
                               : nullptr;
         if (reference) {
-            indexSymbol(*reference, layerId(entity->layer()), roles.begin[Roles::CutPoints],
+            indexSymbol(*reference, roles.begin[Roles::CutPoints],
                         roles.has[Roles::CutPoints] ? roles.end[Roles::CutPoints] : 0);
             continue;
         }
@@ -164,8 +288,12 @@ void ConnectionFinder::readModelSpace() {
             continue;
         auto* polyline = dynamic_cast<zvdb::Polyline*>(entity);
         if (!polyline) continue;
-        const Line line{polyline, polyline->handle(), 0, layerId(polyline->layer())};
-        if (roles.has[Roles::Wire]) wireLines_.push_back(line);
+        Line line{polyline, polyline->handle(), 0, layerId(polyline->layer()), {}};
+        if (roles.has[Roles::Wire]) {
+            line.number = wireNumberOf(roles.items(*polyline, Roles::Wire));
+            wireLines_.push_back(line);
+            line.number = {};
+        }
         if (roles.has[Roles::Cable]) leadLines_.push_back(line);
         if (roles.has[Roles::Blind]) blindLines_.push_back(line);
     }
@@ -173,19 +301,23 @@ void ConnectionFinder::readModelSpace() {
 
 // A project symbol gives its connection attributes' text positions, its insertion point and
 // its cut point; the two latter take the name of a connection attribute standing on them.
-void ConnectionFinder::indexSymbol(const zvdb::BlockReference& reference, std::int32_t layer,
-                                   std::size_t cutBegin, std::size_t cutEnd) {
+void ConnectionFinder::indexSymbol(const zvdb::BlockReference& reference, std::size_t cutBegin,
+                                   std::size_t cutEnd) {
+    const FirstTags own(reference.tags(), FirstTags::Name | FirstTags::Layer | FirstTags::Point);
+    const std::int32_t layer = layerId(own.text(own.layer, "0"));
     const auto symbol = static_cast<std::uint32_t>(symbols_.size());
-    symbols_.push_back({reference.handle(), reference.blockName()});
+    symbols_.push_back({reference.handle(), own.text(own.name)});
     const std::size_t firstSpot = spots_.size();
     for (zvdb::Entity* sub : reference.subEntities()) {
-        if (sub->isErased()) continue;
-        auto* attribute = dynamic_cast<zvdb::Attribute*>(sub);
-        if (attribute && isConnectionTag(attribute->tag()))
-            addSpot(symbol, layer, attribute->position(), attribute->text(1));
+        // no kind of attribute derives from Attribute: its type tells it at once
+        if (sub->isErased() || typeid(*sub) != typeid(zvdb::Attribute)) continue;
+        const FirstTags attribute(sub->tags(),
+                                  FirstTags::Value | FirstTags::Name | FirstTags::Point);
+        if (isConnectionTag(attribute.text(attribute.name)))
+            addSpot(symbol, layer, attribute.position(), attribute.text(attribute.value));
     }
     const std::size_t named = spots_.size();
-    zvdb::Point3 ends[2] = {reference.position(), {}};
+    zvdb::Point3 ends[2] = {own.position(), {}};
     int endCount = 1;
     // the cut point: the second point of KVR_ZV_PTS_CORTE
     const auto all = reference.tags();
@@ -206,20 +338,63 @@ void ConnectionFinder::indexSymbol(const zvdb::BlockReference& reference, std::i
     }
 }
 
-// One sort puts each page's spots together, cell by cell: a page's wires then look at a
-// small table of their own.
+std::size_t ConnectionFinder::slotOf(std::int32_t layer, std::uint64_t cell) {
+    std::uint64_t h = cell ^ (static_cast<std::uint64_t>(static_cast<std::uint32_t>(layer)) *
+                              0x9E3779B97F4A7C15ull);
+    h ^= h >> 29;
+    h *= 0xBF58476D1CE4E5B9ull;
+    h ^= h >> 32;
+    return static_cast<std::size_t>(h);
+}
+
+const ConnectionFinder::CellRun* ConnectionFinder::run(std::int32_t layer,
+                                                       std::uint64_t cell) const {
+    if (grid_.empty()) return nullptr;
+    const std::size_t mask = grid_.size() - 1;
+    for (std::size_t slot = slotOf(layer, cell) & mask;; slot = (slot + 1) & mask) {
+        const CellRun& run = grid_[slot];
+        if (run.end == 0) return nullptr;
+        if (run.cell == cell && run.layer == layer) return &run;
+    }
+}
+
+// One sort puts each page's spots together, cell by cell (the order they came in kept
+// within a cell): a vertex then finds its cells' spots in a run each.
 void ConnectionFinder::buildGrid() {
-    std::stable_sort(spots_.begin(), spots_.end(), [](const Spot& a, const Spot& b) {
-        return a.layer != b.layer ? a.layer < b.layer : a.cell < b.cell;
+    struct Key {
+        std::int32_t layer;
+        std::uint32_t index;
+        std::uint64_t cell;
+    };
+    std::vector<Key> keys(spots_.size());
+    for (std::uint32_t i = 0; i < spots_.size(); ++i)
+        keys[i] = {spots_[i].layer, i, spots_[i].cell};
+    std::sort(keys.begin(), keys.end(), [](const Key& a, const Key& b) {
+        if (a.layer != b.layer) return a.layer < b.layer;
+        return a.cell != b.cell ? a.cell < b.cell : a.index < b.index;
     });
-    grid_.assign(layers_.size(), {});
+    std::vector<Spot> sorted;
+    sorted.reserve(spots_.size());
+    std::size_t cells = 0;
+    for (std::size_t i = 0; i < keys.size(); ++i) {
+        sorted.push_back(spots_[keys[i].index]);
+        cells += i == 0 || keys[i].layer != keys[i - 1].layer || keys[i].cell != keys[i - 1].cell;
+    }
+    spots_ = std::move(sorted);
+    std::size_t size = 16;
+    while (size < cells * 2)
+        size *= 2;
+    grid_.assign(cells ? size : 0, CellRun{0, 0, 0, 0});
+    const std::size_t mask = size - 1;
     for (std::uint32_t i = 0; i < spots_.size();) {
         std::uint32_t end = i + 1;
         while (end < spots_.size() && spots_[end].layer == spots_[i].layer &&
                spots_[end].cell == spots_[i].cell)
             ++end;
-        grid_[static_cast<std::size_t>(spots_[i].layer)].emplace(spots_[i].cell,
-                                                                 std::make_pair(i, end));
+        std::size_t slot = slotOf(spots_[i].layer, spots_[i].cell) & mask;
+        while (grid_[slot].end != 0)
+            slot = (slot + 1) & mask;
+        grid_[slot] = {spots_[i].cell, spots_[i].layer, i, end};
         i = end;
     }
 }
@@ -249,26 +424,44 @@ void ConnectionFinder::sortLines() {
 // One touch per symbol near the vertex, at the symbol's nearest point, nearest first.
 void ConnectionFinder::touchesAt(std::int32_t layer, const zvdb::Point3& p, double radius,
                                  std::vector<Touch>& out, Scratch& scratch) const {
-    if (layer < 0 || static_cast<std::size_t>(layer) >= grid_.size()) return;
-    const CellRuns& cells = grid_[static_cast<std::size_t>(layer)];
-    if (cells.empty()) return;
     auto& near = scratch.near;
     near.clear();
-    const auto cx = static_cast<long long>(std::floor(p.x / cell_));
-    const auto cy = static_cast<long long>(std::floor(p.y / cell_));
-    for (long long dx = -1; dx <= 1; ++dx)
-        for (long long dy = -1; dy <= 1; ++dy) {
-            auto cell = cells.find(cellKey(cx + dx, cy + dy));
-            if (cell == cells.end()) continue;
-            for (std::uint32_t i = cell->second.first; i < cell->second.second; ++i)
+    // nothing is within a distance of a point that is not finite
+    if (!std::isfinite(p.x) || !std::isfinite(p.y)) return;
+    // The radius is at most a cell: the spots lie in the vertex's cell and its neighbours,
+    // and only in those that the radius reaches (with a margin far above any rounding),
+    // which are visited in the same order.
+    auto cells = [&](double v, long long& from, long long& to) {
+        const auto at = static_cast<long long>(std::floor(v / cell_));
+        const double margin = radius + 1e-6 * (radius + std::abs(v));
+        from = std::max(at - 1, static_cast<long long>(std::floor((v - margin) / cell_)));
+        to = std::min(at + 1, static_cast<long long>(std::floor((v + margin) / cell_)));
+    };
+    long long x0, x1, y0, y1;
+    cells(p.x, x0, x1);
+    cells(p.y, y0, y1);
+    for (long long cx = x0; cx <= x1; ++cx)
+        for (long long cy = y0; cy <= y1; ++cy) {
+            const CellRun* cell = run(layer, cellKey(cx, cy));
+            if (!cell) continue;
+            for (std::uint32_t i = cell->begin; i < cell->end; ++i)
                 if (distance(spots_[i].point, p) <= radius) near.push_back(&spots_[i]);
         }
     if (near.empty()) return;
-    std::stable_sort(near.begin(), near.end(), [&](const Spot* a, const Spot* b) {
+    // Equals stay in the order they were found. A vertex touches a few spots: they are
+    // sorted in place, without the merge sort's buffer.
+    auto before = [&](const Spot* a, const Spot* b) {
         const double da = distance(a->point, p), db = distance(b->point, p);
         if (da != db) return da < db;
         return symbols_[a->symbol].handle < symbols_[b->symbol].handle;
-    });
+    };
+    if (near.size() > 16) {
+        std::stable_sort(near.begin(), near.end(), before);
+    } else {
+        for (std::size_t i = 1; i < near.size(); ++i)
+            for (std::size_t k = i; k > 0 && before(near[k], near[k - 1]); --k)
+                std::swap(near[k], near[k - 1]);
+    }
     auto& seen = scratch.seen;
     seen.clear();
     for (const Spot* spot : near) {
@@ -318,14 +511,14 @@ std::vector<WireConnections> ConnectionFinder::wires() const {
     byNumber.reserve(wireLines_.size());
     Scratch scratch;
     for (const Line& line : wireLines_) {
-        const std::string_view number =
-            wireNumberOf(Roles(*line.polyline).items(*line.polyline, Roles::Wire));
+        const std::string_view number = line.number;
         if (number.empty()) continue;  // an unnumbered wire joins nothing
         auto [it, added] = byNumber.emplace(number, result.size());
         if (added) result.push_back({std::string(number), {}, {}});
         WireConnections& wire = result[it->second];
         wire.polylines.push_back(line.handle);
-        for (const zvdb::Point3& vertex : line.polyline->vertices())
+        readVertices(*line.polyline, scratch.vertices);
+        for (const zvdb::Point3& vertex : scratch.vertices)
             touchesAt(line.layer, vertex, tolerance_, wire.touches, scratch);
     }
     return result;
@@ -340,7 +533,8 @@ std::vector<WireConnections> ConnectionFinder::cables() const {
     }
     Scratch scratch;
     auto ends = [&](const Line& line, bool firstToo, std::vector<Touch>& out) {
-        const auto vertices = line.polyline->vertices();
+        readVertices(*line.polyline, scratch.vertices);
+        const auto& vertices = scratch.vertices;
         if (vertices.empty()) return;
         if (firstToo) touchesAt(line.layer, vertices.front(), kLeadTolerance, out, scratch);
         if (vertices.size() > 1)

@@ -74,17 +74,25 @@ private:
         std::uint64_t handle;
         std::int32_t rank;  // registry page order; off the pages last
         std::int32_t layer;
+        std::string_view number;  // a wire's number, read with its roles; empty otherwise
     };
-    // Spots sorted by layer and cell; per layer, a cell's run in that order.
-    using CellRuns = std::unordered_map<std::uint64_t, std::pair<std::uint32_t, std::uint32_t>>;
+    // The run of the spots of one layer's cell in spots_ (sorted by layer and cell), in an
+    // open-addressed table: a vertex asks nine cells, most of them empty.
+    struct CellRun {
+        std::uint64_t cell;
+        std::int32_t layer;
+        std::uint32_t begin, end;  // end 0: a free slot
+    };
     struct Scratch;
 
     void readModelSpace();
-    void indexSymbol(const zvdb::BlockReference& reference, std::int32_t layer,
-                     std::size_t cutBegin, std::size_t cutEnd);
+    void indexSymbol(const zvdb::BlockReference& reference, std::size_t cutBegin,
+                     std::size_t cutEnd);
     void addSpot(std::uint32_t symbol, std::int32_t layer, const zvdb::Point3& p,
                  std::string_view connection);
     std::uint64_t cellKey(long long x, long long y) const;
+    static std::size_t slotOf(std::int32_t layer, std::uint64_t cell);
+    const CellRun* run(std::int32_t layer, std::uint64_t cell) const;
     void buildGrid();
     void sortLines();
     void touchesAt(std::int32_t layer, const zvdb::Point3& p, double radius,
@@ -95,9 +103,11 @@ private:
     double tolerance_;
     double cell_;
     std::unordered_map<std::string_view, std::int32_t> layers_;  // views into the drawing
+    std::string_view lastLayer_;  // entities come page by page: the last layer asked
+    std::int32_t lastLayerId_ = -1;
     std::vector<Symbol> symbols_;
     std::vector<Spot> spots_;
-    std::vector<CellRuns> grid_;  // by layer id
+    std::vector<CellRun> grid_;  // a power of two long
     std::vector<Line> wireLines_, leadLines_, blindLines_;
 };
 

@@ -4,8 +4,12 @@
 #include "LispHostFixture.h"
 
 #include "app/ConnectionChains.h"
+#include "app/DocumentLisp.h"
 #include "app/LispChains.h"
 #include "drawing/Database.h"
+#include "product/ConnectionAnswers.h"
+#include "product/ProductContext.h"
+#include "product/ProductLisp.h"
 #include "sample/ProjectGenerator.h"
 #include "sdk/ResultBuffer.h"
 
@@ -86,6 +90,29 @@ TEST_F(ConnectionChainsTest, TheChainsAreTheNodesOfTheLispAnswers) {
         "5019\n");
 }
 
+TEST(ConnectionChainTexts, NamesOutsideAsciiAreReadAsUtf8) {
+    const std::string number =
+        "F\xC3\x87"
+        "1";                                         // FÇ1
+    const std::string block = "A\xC3\x87\xC3\x83O";  // AÇÃO
+    const std::string connection =
+        "\xC2\xB5"
+        "2";  // µ2
+    zvproduct::WireConnections wire{number, {}, {}};
+    wire.touches.push_back({0x1F, connection, block, {1, 2, 3}});
+    wire.touches.push_back({0x20, {}, "BORNE", {4, 5, 6}});
+    Chain chain(zvhost::ConnectionChains::toChain({wire}, true));
+    EXPECT_EQ(chain.text(), "5016\n5016\n5005 " + number + "\n5016\n5005 1F#" + connection + "#" +
+                                block + "\n5001 1.000000\n5001 2.000000\n5001 3.000000\n5017\n" +
+                                "5016\n5005 20##BORNE\n5001 4.000000\n5001 5.000000\n" +
+                                "5001 6.000000\n5017\n5017\n5017\n");
+    EXPECT_EQ(chain.head->rbnext->rbnext->rstring, QString::fromUtf8("F\xC3\x87"
+                                                                     "1"));
+    EXPECT_EQ(chain.head->rbnext->rbnext->rstring.size(), 3);
+    Chain cables(zvhost::ConnectionChains::toChain({wire}, false));
+    EXPECT_EQ(cables.head->rbnext->rbnext->rbnext->rbnext->rstring, "1F");
+}
+
 TEST_F(ConnectionChainsTest, AUsersDefunOfTheFunctionTakesOver) {
     lisp().interpreter().evalText(
         "(defun getConexoesTodosFios () '((\"X\" (\"1A#2#B\" 1.5 2.0 3.0))))");
@@ -94,6 +121,38 @@ TEST_F(ConnectionChainsTest, AUsersDefunOfTheFunctionTakesOver) {
               "5001 3.000000\n5017\n5017\n5017\n");
     // the other function is still the product's
     EXPECT_EQ(invoked("getConexoesTodosCabos"), throughLisp("getConexoesTodosCabos"));
+}
+
+TEST(ConnectionChainIndex, KeptForTheCablesRightAfterTheWiresAndLetGoAtAnyOtherCall) {
+    zvsample::ProjectGenerator generator({5, 60, 4});
+    std::unique_ptr<zvdb::Database> drawing = generator.generate();
+    zvhost::DocumentLisp lisp([](const QString&) {});
+    auto answers = std::make_shared<zvproduct::ConnectionAnswers>();
+    zvproduct::ProductContext context;
+    context.database = [&drawing] { return drawing.get(); };
+    context.connections = answers;
+    zvproduct::installProductFunctions(lisp.interpreter(), context);
+    zvhost::ConnectionChains::install(lisp, context);
+    auto invoke = [&lisp](const char* function, const char* argument = nullptr) {
+        Chain call(zvsdk::newString(function));
+        if (argument) call.head->rbnext = zvsdk::newString(argument);
+        return Chain(lisp.lispInvoke(call.head)).text();
+    };
+    const std::string wires = invoke("getConexoesTodosFios");
+    EXPECT_TRUE(answers->keepsIndex());
+    const std::string cables = invoke("getConexoesTodosCabos");
+    EXPECT_FALSE(answers->keepsIndex());
+    EXPECT_GT(std::count(cables.begin(), cables.end(), '\n'), 10);
+    // the wires alone, then the reader goes on with other questions
+    EXPECT_EQ(invoke("getConexoesTodosFios"), wires);
+    EXPECT_TRUE(answers->keepsIndex());
+    invoke("getFiosPorLayer", "ESQ$0001$A");
+    EXPECT_FALSE(answers->keepsIndex());
+    // the cables asked later are worked out again, alike, and the index kept for the wires
+    EXPECT_EQ(invoke("getConexoesTodosCabos"), cables);
+    EXPECT_TRUE(answers->keepsIndex());
+    EXPECT_EQ(invoke("getConexoesTodosFios"), wires);
+    EXPECT_FALSE(answers->keepsIndex());
 }
 
 TEST(ResultBufferBlocks, BlocksGoWithTheirLastNodeInAnyOrderAndFromAnyThread) {

@@ -106,6 +106,31 @@ TEST_F(ConnectionAnswersTest, AnAnswerServedFromTheFirstCallIsTheOneWorkedOutAlo
     EXPECT_EQ(show("(length (cdr (car (getConexoesTodosCabos))))"), "2");
 }
 
+TEST_F(ConnectionAnswersTest, TheIndexIsKeptForOneMoreCallOfTheSameDrawing) {
+    using Kind = ConnectionAnswers::Kind;
+    const std::string wiresAlone = summary(ConnectionFinder(*database, 0.1).wires());
+    const std::string cablesAlone = summary(ConnectionFinder(*database, 0.1).cables());
+    EXPECT_FALSE(answers.keepsIndex());
+    answers.answer(*database, 0.1, Kind::Wires);
+    EXPECT_TRUE(answers.keepsIndex());
+    // the second call of a pair takes it and keeps nothing
+    EXPECT_EQ(summary(answers.answer(*database, 0.1, Kind::Cables)), cablesAlone);
+    EXPECT_FALSE(answers.keepsIndex());
+    // a call that keeps nothing leaves nothing, and drops what was kept
+    answers.answer(*database, 0.1, Kind::Wires);
+    EXPECT_EQ(summary(answers.answer(*database, 0.1, Kind::Wires, false)), wiresAlone);
+    EXPECT_FALSE(answers.keepsIndex());
+    // a kept index of a changed drawing is not used: the new one is kept in its place
+    answers.answer(*database, 0.1, Kind::Cables);
+    far->setPosition({300, 90, 0});
+    const std::string moved = summary(answers.answer(*database, 0.1, Kind::Wires));
+    EXPECT_NE(moved, wiresAlone);
+    EXPECT_EQ(moved, summary(ConnectionFinder(*database, 0.1).wires()));
+    EXPECT_TRUE(answers.keepsIndex());
+    EXPECT_EQ(summary(answers.answer(*database, 0.1, Kind::Cables)),
+              summary(ConnectionFinder(*database, 0.1).cables()));
+}
+
 TEST_F(ConnectionAnswersTest, TwoDrawingsAndAnUndoSwapDoNotShareAnswers) {
     zvsample::ProjectGenerator generator({7, 60, 4});
     std::unique_ptr<zvdb::Database> other = generator.generate();

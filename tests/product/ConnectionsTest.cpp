@@ -176,6 +176,75 @@ TEST_F(ConnectionsTest, WireListTakesEachWiresFirstPolylineOnThePagesAndFollowsE
     EXPECT_EQ(show("(length (getListaFios \"ESQ$0001$A\"))"), "1");
 }
 
+TEST_F(ConnectionsTest, ConnectionAttributesAreReadAsTheDrawingReadsThem) {
+    auto* element = contact("ESQ$0001$A", {150, 200, 0});
+    const std::string h = hex(element);
+    wire("ESQ$0001$A", {{150, 200, 0}, {150, 190, 0}}, "601");
+    auto entries = [this] { return show("(cdr (car (getConexoesTodosFios)))"); };
+    EXPECT_EQ(entries(),
+              "((\"" + h + "#13#NA-1\" 150.0 200.0 0.0) (\"" + h + "#14#NA-1\" 150.0 190.0 0.0))");
+    // An application group before the attribute's own tags holds codes of its own: they
+    // are not the attribute's tag, value or position.
+    std::vector<zvdb::Attribute*> attributes = element->attributes();
+    ASSERT_EQ(attributes.size(), 2u);
+    {
+        auto& tags = attributes[0]->editTags();
+        const std::vector<zvdb::Tag> group = {{102, database->store("{ACAD_REACTORS")},
+                                              {2, database->store("OUTRO")},
+                                              {1, database->store("99")},
+                                              {10, database->store("150.0")},
+                                              {20, database->store("190.0")},
+                                              {102, database->store("}")}};
+        tags.insert(tags.begin() + 2, group.begin(), group.end());
+    }
+    EXPECT_EQ(attributes[0]->tag(), "LIGACAO1");
+    EXPECT_EQ(entries(),
+              "((\"" + h + "#13#NA-1\" 150.0 200.0 0.0) (\"" + h + "#14#NA-1\" 150.0 190.0 0.0))");
+    // a new value, a new position, a tag that is no connection, an erased attribute
+    attributes[0]->setTextValue("A1");
+    EXPECT_EQ(entries(),
+              "((\"" + h + "#A1#NA-1\" 150.0 200.0 0.0) (\"" + h + "#14#NA-1\" 150.0 190.0 0.0))");
+    attributes[1]->setPosition({150, 195, 0});
+    EXPECT_EQ(entries(),
+              "((\"" + h + "#A1#NA-1\" 150.0 200.0 0.0) (\"" + h + "##NA-1\" 150.0 190.0 0.0))");
+    attributes[0]->setTag("BORNE");
+    attributes[1]->erase();
+    EXPECT_EQ(entries(),
+              "((\"" + h + "##NA-1\" 150.0 200.0 0.0) (\"" + h + "##NA-1\" 150.0 190.0 0.0))");
+}
+
+TEST_F(ConnectionsTest, AWiresElevationIsTheZOfItsVertices) {
+    auto* high = terminal("ESQ$0001$A", {100, 200, 5}, "X1", "1");
+    terminal("ESQ$0001$A", {200, 200, 0}, "X1", "2");
+    auto* line = wire("ESQ$0001$A", {{100, 200, 0}, {200, 200, 0}}, "701");
+    line->setReal(38, 5.0, "AcDbPolyline");
+    // a group of another application names a 38 of its own before the polyline's
+    auto& tags = line->editTags();
+    const std::vector<zvdb::Tag> group = {{102, database->store("{ACAD_REACTORS")},
+                                          {38, database->store("7.5")},
+                                          {102, database->store("}")}};
+    tags.insert(tags.begin() + 2, group.begin(), group.end());
+    ASSERT_EQ(line->vertices().front().z, 5.0);
+    EXPECT_EQ(show("(cdr (car (getConexoesTodosFios)))"),
+              "((\"" + hex(high) + "##BORNE_1\" 100.0 200.0 5.0))");
+    line->setReal(38, 0.0, "AcDbPolyline");
+    EXPECT_EQ(show("(length (cdr (car (getConexoesTodosFios))))"), "1");
+    EXPECT_EQ(show("(cadr (car (cdr (car (getConexoesTodosFios)))))"), "200.0");
+}
+
+TEST_F(ConnectionsTest, TouchesAcrossTheIndexsCellsAndAtTheToleranceItself) {
+    // the index's cells are one unit wide: each vertex here is in another cell than its
+    // terminal, the last one exactly the tolerance away from it
+    auto* a = terminal("ESQ$0001$A", {99.95, 200, 0}, "X1", "1");
+    auto* b = terminal("ESQ$0001$A", {0.04, 300, 0}, "X1", "2");
+    auto* c = terminal("ESQ$0001$A", {200, 400, 0}, "X1", "3");
+    terminal("ESQ$0001$A", {300.12, 500, 0}, "X1", "4");  // beyond the tolerance
+    wire("ESQ$0001$A", {{100.04, 200, 0}, {-0.05, 300, 0}, {199.9, 400, 0}, {300, 500, 0}}, "801");
+    EXPECT_EQ(
+        show("(mapcar 'car (cdr (car (getConexoesTodosFios))))"),
+        "(\"" + hex(a) + "##BORNE_1\" \"" + hex(b) + "##BORNE_1\" \"" + hex(c) + "##BORNE_1\")");
+}
+
 TEST_F(ConnectionsTest, ProjectCheckFindsDuplicateTerminalsAndOpenWires) {
     terminal("ESQ$0001$A", {100, 200, 0}, "X1", "1");
     terminal("ESQ$0001$A", {200, 200, 0}, "X1", "2");
