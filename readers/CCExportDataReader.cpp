@@ -203,25 +203,29 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
     LiberaReferencias();
     ladosAdiados_ = false;
     std::vector<CEItemLista*> bornes;
-    static const QString kTipo = QStringLiteral("ZV_LISTA_TIPO"), kBorne = QStringLiteral("BORNE"),
-                         kComp = QStringLiteral("COMP"), kHandle = QStringLiteral("HANDLE");
+    static const QString kBorne = QStringLiteral("BORNE"), kComp = QStringLiteral("COMP");
+    const std::uint32_t tipoCampo = NumeroCampo<"ZV_LISTA_TIPO">();
+    const std::uint32_t handleCampo = NumeroCampo<"HANDLE">();
     for (CEItemLista* item : resultado_) {
         if (!item) continue;
-        if (item->valorCampo(kTipo).isEmpty()) {
+        const QString* tipo = item->campos.procura(tipoCampo);
+        if (!tipo || tipo->isEmpty()) {
             const bool borne = !item->ids.empty() && CICad::EhReferencia(item->ids.front()) &&
                                EhBorne(CICad::GetNomeBloco(item->ids.front()));
-            item->definirCampo(kTipo, borne ? kBorne : kComp);
+            item->definirCampo(tipoCampo, borne ? kBorne : kComp);
             // A component is complete with its kind: the room the kind's field grew goes.
             if (borne)
                 bornes.push_back(item);
             else
                 PartilhaNomes(*item);
+            tipo = item->campos.procura(tipoCampo);
         }
-        if (item->valorCampo(kTipo) == kComp) {
+        if (*tipo == kComp) {
             const QString relacao = Primeiro(*item, Nomes(QString()).relacoes);
-            const QString handle = item->valorCampo(kHandle);
-            if (!relacao.isEmpty() && !handle.isEmpty() && !relacoesComponentes_.contains(relacao))
-                relacoesComponentes_.insert(relacao, handle);
+            const QString* handle = item->campos.procura(handleCampo);
+            if (!relacao.isEmpty() && handle && !handle->isEmpty() &&
+                !relacoesComponentes_.contains(relacao))
+                relacoesComponentes_.insert(relacao, *handle);
         }
         itens.push_back(item);
     }
