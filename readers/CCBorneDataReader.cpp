@@ -324,13 +324,33 @@ void CCBorneDataReader::PreencheFaltantes(VetorItens& itens) {
 
 namespace {
 
+// The strip and number names of the three languages as texts, made once: every terminal of
+// a jumper look-up asks for them.
+struct NomesBorne {
+    QString reguas[3], numeros[3];
+    QString jumper = QStringLiteral("JUMPER");
+    NomesBorne() {
+        for (int i = 0; i < 3; ++i) {
+            reguas[i] = QString::fromLatin1(kReguas[i]);
+            numeros[i] = QString::fromLatin1(kNumeros[i]);
+        }
+    }
+};
+
+const NomesBorne& Nomes() {
+    static const NomesBorne nomes;
+    return nomes;
+}
+
 // The first item of each strip and number, per language, for the jumper look-ups.
 class IndiceBornes {
 public:
     explicit IndiceBornes(const VetorItens& itens) {
+        for (int i = 0; i < 3; ++i)
+            indice_[i].reserve(itens.size());
         for (CEItemLista* item : itens)
             for (int i = 0; item && i < 3; ++i)
-                indice_[i].insert({Chave(*item, i, item->valorCampo(kNumeros[i])), item});
+                indice_[i].insert({Chave(*item, i, item->valorCampo(Nomes().numeros[i])), item});
     }
     CEItemLista* Busca(const CEItemLista& de, int idioma, const QString& numero) const {
         auto it = indice_[idioma].find(Chave(de, idioma, numero));
@@ -339,7 +359,7 @@ public:
 
 private:
     static QString Chave(const CEItemLista& item, int idioma, const QString& numero) {
-        return item.valorCampo(kReguas[idioma]) + QChar(0x1F) + numero;
+        return item.valorCampo(Nomes().reguas[idioma]) + QChar(0x1F) + numero;
     }
     std::unordered_map<QString, CEItemLista*> indice_[3];
 };
@@ -356,7 +376,7 @@ VetorItens ColetaJumper(CEItemLista* inicio, const IndiceBornes& indice,
         std::vector<CEItemLista*> achados;
         // Empty tokens are dropped: one would match any terminal whose strip and number
         // read empty in some language, i.e. every terminal tagged in another one.
-        for (const QString& token : ZVString(item->valorCampo("JUMPER")).Divide(",")) {
+        for (const QString& token : ZVString(item->valorCampo(Nomes().jumper)).Divide(",")) {
             for (int i = 0; i < 3; ++i) {
                 CEItemLista* achado = indice.Busca(*item, i, token);
                 if (!achado) continue;
@@ -387,11 +407,15 @@ void CCBorneDataReader::LigaJumpers(VetorItens& itens) {
     const IndiceBornes indice(itens);
     std::unordered_set<CEItemLista*> visitados;
     for (CEItemLista* item : itens) {
-        if (!item || item->valorCampo("JUMPER").trimmed().isEmpty()) continue;
+        if (!item) continue;
+        const QString* jumper = item->campo(Nomes().jumper);
+        if (!jumper || jumper->trimmed().isEmpty()) continue;
         if (!visitados.insert(item).second) continue;
         VetorItens cadeia = ColetaJumper(item, indice, visitados);
         EstendeCadeia(cadeia);
-        cadeia.ordenar({"REGUA", "STRIP", "REGLETA", "NUMERO", "NUMBER", "NUMERO"});
+        static const QStringList kOrdem = {"REGUA",  "STRIP",  "REGLETA",
+                                           "NUMERO", "NUMBER", "NUMERO"};
+        cadeia.ordenar(kOrdem);
         for (size_t i = 0; i + 1 < cadeia.size(); ++i) {
             cadeia[i]->proximo = cadeia[i + 1];
             cadeia[i + 1]->anterior = cadeia[i];

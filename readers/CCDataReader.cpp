@@ -810,12 +810,14 @@ CCDataReader::FormaCampos::ComSufixo& CCDataReader::FormaCampos::Com(const QStri
         if (feito.sufixo == sufixo) return feito;
     // The names under the suffix enter the name table in the order of the plain names, as
     // when each copy renamed its own fields.
-    ComSufixo novo{sufixo, {}, {}, {}, {}};
+    ComSufixo novo{sufixo, NumeroCampo<"QTD">(sufixo), {}, {}, {}, {}};
     std::vector<std::pair<std::uint32_t, std::uint32_t>> pares;
     pares.reserve(nomes.size());
     for (size_t i = 0; i < nomes.size(); ++i)
         pares.emplace_back(CamposItem::numeroComSufixo(nomes[i], sufixo), std::uint32_t(i));
     std::sort(pares.begin(), pares.end());
+    novo.nomes.reserve(pares.size());
+    novo.lugares.reserve(pares.size());
     for (const auto& [nome, lugar] : pares) {
         novo.nomes.push_back(nome);
         novo.lugares.push_back(lugar);
@@ -824,47 +826,56 @@ CCDataReader::FormaCampos::ComSufixo& CCDataReader::FormaCampos::Com(const QStri
     return sufixos.back();
 }
 
+CCDataReader::EntidadeLida CCDataReader::LeEntidadeGuardada(const OdDbObjectId& id,
+                                                            CETemplate* modelo) {
+    // A QTD of the entity's own replaces this mark; without one the mark stays.
+    static const QString kMarca = QStringLiteral("\x01");
+    const std::uint32_t qtd = NumeroCampo<"QTD">();
+    CEItemLista lido;
+    EntidadeLida lida;
+    bool completa = false;
+    if (CICad::EhReferencia(id)) {
+        lido.definirCampo(qtd, kMarca);
+        LeBloco(QString(), lido, id, modelo);
+        completa = true;
+    } else if (CICad::EhPolilinha(id)) {
+        lido.definirCampo(qtd, kMarca);
+        completa = lida.rotas = LeCamposFio(QString(), lido, id);
+    }
+    // The reading is made apart: its values move into the kept form, none is copied.
+    std::vector<CamposItem::Campo> campos = lido.campos.retirar();
+    bool marcada = false;
+    std::vector<std::uint32_t> nomes;
+    nomes.reserve(campos.size());
+    lida.valores.reserve(campos.size() + 1);
+    for (CamposItem::Campo& campo : campos) {
+        if (campo.nome == qtd && campo.valor == kMarca) {
+            marcada = true;
+            continue;
+        }
+        nomes.push_back(campo.nome);
+        lida.valores.push_back(std::move(campo.valor));
+    }
+    lida.qtdPadrao = marcada && completa;
+    if (lida.qtdPadrao) lida.valores.push_back(QStringLiteral("1"));
+    std::unique_ptr<FormaCampos>& forma = formas_[nomes];
+    if (!forma) forma = std::make_unique<FormaCampos>(FormaCampos{std::move(nomes), {}});
+    lida.forma = forma.get();
+    return lida;
+}
+
 void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
                                  CETemplate* modelo) {
     ConfereVersao();
     auto achado = entidadesLidas_.find(id);
-    if (achado == entidadesLidas_.end()) {
-        // A QTD of the entity's own replaces this mark; without one the mark stays.
-        static const QString kQtd = QStringLiteral("QTD"), kMarca = QStringLiteral("\x01");
-        CEItemLista lido;
-        EntidadeLida lida;
-        bool completa = false;
-        if (CICad::EhReferencia(id)) {
-            lido.definirCampo(kQtd, kMarca);
-            LeBloco(QString(), lido, id, modelo);
-            completa = true;
-        } else if (CICad::EhPolilinha(id)) {
-            lido.definirCampo(kQtd, kMarca);
-            completa = lida.rotas = LeCamposFio(QString(), lido, id);
-        }
-        const bool marcada = lido.valorCampo(kQtd) == kMarca;
-        if (marcada) lido.campos.remove(kQtd);
-        lida.qtdPadrao = marcada && completa;
-        const std::vector<CamposItem::Campo>& campos = lido.campos.todos();
-        std::vector<std::uint32_t> nomes;
-        nomes.reserve(campos.size());
-        lida.valores.reserve(campos.size());
-        for (const CamposItem::Campo& campo : campos) {
-            nomes.push_back(campo.nome);
-            lida.valores.push_back(campo.valor);
-        }
-        if (lida.qtdPadrao) lida.valores.push_back(QStringLiteral("1"));
-        std::unique_ptr<FormaCampos>& forma = formas_[nomes];
-        if (!forma) forma = std::make_unique<FormaCampos>(FormaCampos{std::move(nomes), {}});
-        lida.forma = forma.get();
-        achado = entidadesLidas_.emplace(id, std::move(lida)).first;
-    }
+    if (achado == entidadesLidas_.end())
+        achado = entidadesLidas_.emplace(id, LeEntidadeGuardada(id, modelo)).first;
     const EntidadeLida& lida = achado->second;
     const bool rotas = lida.rotas;
-    const std::uint32_t qtd = NumeroCampo<"QTD">(sufixo);
+    FormaCampos::ComSufixo& com = lida.forma->Com(sufixo);
+    const std::uint32_t qtd = com.qtd;
     const QString* qtdAtual = item.campos.procura(qtd);
     const bool poeQtd = lida.qtdPadrao && (!qtdAtual || qtdAtual->isEmpty());
-    FormaCampos::ComSufixo& com = lida.forma->Com(sufixo);
     if (poeQtd && com.nomesQtd.empty()) {
         // The batch holds no QTD: the "1" joins it in its place, so the item's fields move
         // once.

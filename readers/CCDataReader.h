@@ -190,6 +190,7 @@ private:
         std::vector<std::uint32_t> nomes;  // ascending
         struct ComSufixo {
             QString sufixo;
+            std::uint32_t qtd;  // QTD under the suffix
             // Ascending, with where each one's value stands; the same with the entity's QTD
             // of "1" (its value after the others), made when first asked.
             std::vector<std::uint32_t> nomes, lugares, nomesQtd, lugaresQtd;
@@ -212,6 +213,8 @@ private:
         bool rotas = false;
     };
     mutable std::unordered_map<OdDbObjectId, EntidadeLida> entidadesLidas_;
+    // The entity read apart into the form CopiaEntidade keeps.
+    EntidadeLida LeEntidadeGuardada(const OdDbObjectId& id, CETemplate* modelo);
     // Per wire polyline: its number as NumeroDoFio gives it, and whether its own field holds
     // one; every terminal side and neighbour asks for the wires at its points.
     struct NumeroFio {

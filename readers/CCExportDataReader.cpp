@@ -20,9 +20,32 @@ constexpr const char* kRelacoes[3] = {"RELACAO", "TAG", "ETIQUETA"};
 constexpr const char* kReguas[3] = {"REGUA", "STRIP", "REGLETA"};
 constexpr const char* kNumeros[3] = {"NUMERO", "NUMBER", "NUMERO"};
 
-QString Primeiro(const CEItemLista& item, const std::array<QString, 3>& nomes) {
-    for (const QString& nome : nomes) {
-        const QString* valor = item.campo(nome);
+// A field name and its number. The number is taken when an item first gets the field, as
+// naming the field there would; a question about a name no item has yet numbers nothing.
+class NomeCampo {
+public:
+    NomeCampo() = default;
+    explicit NomeCampo(const QString& texto) : texto_(texto) {}
+    std::uint32_t ParaDefinir() {
+        if (numero_ == CamposItem::kSemNome) numero_ = CamposItem::numero(texto_);
+        return numero_;
+    }
+    // kSemNome while no item has the field.
+    std::uint32_t ParaBuscar() {
+        if (numero_ == CamposItem::kSemNome) numero_ = CamposItem::numeroSeHouver(texto_);
+        return numero_;
+    }
+
+private:
+    QString texto_;
+    std::uint32_t numero_ = CamposItem::kSemNome;
+};
+
+QString Primeiro(const CEItemLista& item, std::array<NomeCampo, 3>& nomes) {
+    for (NomeCampo& nome : nomes) {
+        const std::uint32_t numero = nome.ParaBuscar();
+        if (numero == CamposItem::kSemNome) continue;
+        const QString* valor = item.campos.procura(numero);
         if (valor && !valor->isEmpty()) return *valor;
     }
     return {};
@@ -31,19 +54,24 @@ QString Primeiro(const CEItemLista& item, const std::array<QString, 3>& nomes) {
 // The names an end's relation reads and writes under one suffix, made once: every terminal
 // side and wire end composes one.
 struct NomesRelacao {
-    QString rel, lig, handle;
-    std::array<QString, 3> relacoes, reguas, numeros;
+    NomeCampo rel, lig, handle;
+    std::array<NomeCampo, 3> relacoes, reguas, numeros;
 };
 
-const NomesRelacao& Nomes(const QString& sufixo) {
+NomesRelacao& Nomes(const QString& sufixo) {
     static QHash<QString, NomesRelacao> porSufixo;
-    auto achado = porSufixo.constFind(sufixo);
-    if (achado != porSufixo.constEnd()) return achado.value();
-    NomesRelacao n{"REL" + sufixo, "LIG" + sufixo, "HANDLE" + sufixo, {}, {}, {}};
+    auto achado = porSufixo.find(sufixo);
+    if (achado != porSufixo.end()) return achado.value();
+    NomesRelacao n{NomeCampo("REL" + sufixo),
+                   NomeCampo("LIG" + sufixo),
+                   NomeCampo("HANDLE" + sufixo),
+                   {},
+                   {},
+                   {}};
     for (size_t i = 0; i < 3; ++i) {
-        n.relacoes[i] = kRelacoes[i] + sufixo;
-        n.reguas[i] = kReguas[i] + sufixo;
-        n.numeros[i] = kNumeros[i] + sufixo;
+        n.relacoes[i] = NomeCampo(kRelacoes[i] + sufixo);
+        n.reguas[i] = NomeCampo(kReguas[i] + sufixo);
+        n.numeros[i] = NomeCampo(kNumeros[i] + sufixo);
     }
     return porSufixo.insert(sufixo, n).value();
 }
@@ -175,25 +203,29 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
     LiberaReferencias();
     ladosAdiados_ = false;
     std::vector<CEItemLista*> bornes;
-    static const QString kTipo = QStringLiteral("ZV_LISTA_TIPO"), kBorne = QStringLiteral("BORNE"),
-                         kComp = QStringLiteral("COMP"), kHandle = QStringLiteral("HANDLE");
+    static const QString kBorne = QStringLiteral("BORNE"), kComp = QStringLiteral("COMP");
+    const std::uint32_t tipoCampo = NumeroCampo<"ZV_LISTA_TIPO">();
+    const std::uint32_t handleCampo = NumeroCampo<"HANDLE">();
     for (CEItemLista* item : resultado_) {
         if (!item) continue;
-        if (item->valorCampo(kTipo).isEmpty()) {
+        const QString* tipo = item->campos.procura(tipoCampo);
+        if (!tipo || tipo->isEmpty()) {
             const bool borne = !item->ids.empty() && CICad::EhReferencia(item->ids.front()) &&
                                EhBorne(CICad::GetNomeBloco(item->ids.front()));
-            item->definirCampo(kTipo, borne ? kBorne : kComp);
+            item->definirCampo(tipoCampo, borne ? kBorne : kComp);
             // A component is complete with its kind: the room the kind's field grew goes.
             if (borne)
                 bornes.push_back(item);
             else
                 PartilhaNomes(*item);
+            tipo = item->campos.procura(tipoCampo);
         }
-        if (item->valorCampo(kTipo) == kComp) {
+        if (*tipo == kComp) {
             const QString relacao = Primeiro(*item, Nomes(QString()).relacoes);
-            const QString handle = item->valorCampo(kHandle);
-            if (!relacao.isEmpty() && !handle.isEmpty() && !relacoesComponentes_.contains(relacao))
-                relacoesComponentes_.insert(relacao, handle);
+            const QString* handle = item->campos.procura(handleCampo);
+            if (!relacao.isEmpty() && handle && !handle->isEmpty() &&
+                !relacoesComponentes_.contains(relacao))
+                relacoesComponentes_.insert(relacao, *handle);
         }
         itens.push_back(item);
     }
@@ -270,10 +302,13 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
     if (entidade.isNull() || !CICad::EhReferencia(entidade)) return;
     if (!EhBorne(CICad::GetNomeBloco(entidade))) return;
     // An inverted wire keeps its ends; any other wire has them the other way round.
-    const bool invertido = item.valorCampo("INVERTIDO").toUpper() == "S";
-    const QString sufixo = inicio == invertido ? QStringLiteral("_INI") : QStringLiteral("_FIM");
-    const QString segundo =
-        inicio == invertido ? QStringLiteral("_SEGFIM") : QStringLiteral("_SEGINI");
+    const QString* marca = item.campos.procura(NumeroCampo<"INVERTIDO">());
+    const bool invertido = marca && marca->toUpper() == QLatin1String("S");
+    static const QString kIni = QStringLiteral("_INI"), kFim = QStringLiteral("_FIM"),
+                         kSegIni = QStringLiteral("_SEGINI"), kSegFim = QStringLiteral("_SEGFIM"),
+                         kEquipo = QStringLiteral("KVR_ZV_EQUIPO");
+    const QString& sufixo = inicio == invertido ? kIni : kFim;
+    const QString& segundo = inicio == invertido ? kSegFim : kSegIni;
     const QString proprio = ZVString::DeHandle(entidade.handle());
     const bool doBorne = !item.ids.empty() && item.ids.front() == entidade;
 
@@ -306,7 +341,7 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
     }
     // An equipment's points may lie closer together than a wire's catch: its connection
     // name tells which of its entries on the wire this end is.
-    if (CICad::TemXData(entidade, "KVR_ZV_EQUIPO")) {
+    if (CICad::TemXData(entidade, kEquipo)) {
         const std::unique_ptr<zv::CEAtributo> propria = AtributoConexaoProximo(entidade, ponto);
         if (propria && !propria->GetValor().isEmpty()) {
             const QString achado =
@@ -320,8 +355,8 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
     if (!objeto.isNull()) {
         // The relation the wire reader composed for this end is no field of the object:
         // a terminal, which has no relation, is told by its strip and number instead.
-        for (const QString& nome : Nomes(sufixo).relacoes)
-            item.definirCampo(nome, QString());
+        for (NomeCampo& nome : Nomes(sufixo).relacoes)
+            item.definirCampo(nome.ParaDefinir(), QString());
         CopiaAtributos(sufixo, item, conectado);
         // After the copy: an element it read for the first time lends its attributes to
         // the connection's question.
@@ -353,8 +388,11 @@ void CCExportDataReader::CopiaAtributos(const QString& sufixo, CEItemLista& item
     if (id.isNull()) return;
     const QString nome = CICad::GetNomeBloco(id);
     // A contact or a terminal speaks for its component, when the reader listed it.
-    for (const char* prefixo : {"NA-", "NF-", "BT-", "NAF-", "BOR-"}) {
-        if (!nome.startsWith(QLatin1String(prefixo), Qt::CaseInsensitive)) continue;
+    static constexpr QLatin1String kContatos[] = {QLatin1String("NA-"), QLatin1String("NF-"),
+                                                  QLatin1String("BT-"), QLatin1String("NAF-"),
+                                                  QLatin1String("BOR-")};
+    for (const QLatin1String prefixo : kContatos) {
+        if (!nome.startsWith(prefixo, Qt::CaseInsensitive)) continue;
         for (int idioma = 1; idioma <= 3; ++idioma) {
             const std::unique_ptr<zv::CEAtributo> relacao =
                 CICad::GetAtributo(CICad::TagTraduzida(CampoTraduzido::Relacao, idioma), id);
@@ -383,7 +421,7 @@ CCExportDataReader::Composicao CCExportDataReader::LeComposicao(CETemplate* mode
 
 void CCExportDataReader::CompoeRelacao(const QString& sufixo, CEItemLista& item, CETemplate* modelo,
                                        const QString& ligacao, const QString& handle) {
-    const NomesRelacao& nomes = Nomes(sufixo);
+    NomesRelacao& nomes = Nomes(sufixo);
     const QString r = Primeiro(item, nomes.relacoes);
     const QString a = Primeiro(item, nomes.reguas);
     const QString n = Primeiro(item, nomes.numeros);
@@ -396,14 +434,18 @@ void CCExportDataReader::CompoeRelacao(const QString& sufixo, CEItemLista& item,
     const Composicao composicao = lendo_ ? *composicao_ : LeComposicao(modelo);
     const QString& sep = composicao.sep;
     const bool relacaoPrimeiro = composicao.relacaoPrimeiro;
-    item.definirCampo(nomes.rel, !r.isEmpty() ? r : a + sep + n);
-    item.definirCampo(nomes.lig, g);
-    if (!handle.isEmpty()) item.definirCampo(nomes.handle, handle);
-    for (const QString& campo : nomes.relacoes) {
-        if (!g.isEmpty()) item.definirCampo(campo, relacaoPrimeiro ? r + sep + g : g + sep + r);
+    item.definirCampo(nomes.rel.ParaDefinir(), !r.isEmpty() ? r : a + sep + n);
+    item.definirCampo(nomes.lig.ParaDefinir(), g);
+    if (!handle.isEmpty()) item.definirCampo(nomes.handle.ParaDefinir(), handle);
+    // The texts are made once for the three names.
+    std::optional<QString> comLigacao, comRegua;
+    if (!g.isEmpty()) comLigacao = relacaoPrimeiro ? r + sep + g : g + sep + r;
+    if (!a.isEmpty() && !n.isEmpty() && r.isEmpty())
+        comRegua = relacaoPrimeiro ? a + sep + n : n + sep + a;
+    for (NomeCampo& campo : nomes.relacoes) {
+        if (comLigacao) item.definirCampo(campo.ParaDefinir(), *comLigacao);
         // A terminal has no relation of its own: strip and number stand for it.
-        if (!a.isEmpty() && !n.isEmpty() && r.isEmpty())
-            item.definirCampo(campo, relacaoPrimeiro ? a + sep + n : n + sep + a);
+        if (comRegua) item.definirCampo(campo.ParaDefinir(), *comRegua);
     }
 }
 

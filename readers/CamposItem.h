@@ -9,6 +9,7 @@
 #include <algorithm>
 #include <cstddef>
 #include <cstdint>
+#include <utility>
 #include <vector>
 
 class CamposItem {
@@ -56,6 +57,9 @@ public:
     void insert(std::uint32_t numero, const QString& valor);
     int remove(const QString& chave);
     void clear() { campos_.clear(); }
+    // Hands the fields over and leaves none: a reading made apart gives its values up
+    // without a copy.
+    std::vector<Campo> retirar() { return std::exchange(campos_, {}); }
     // Each field of `origem` under the same name, replacing what was there.
     void juntar(const CamposItem& origem);
     // The fields of `lote`, sorted by name number without repeats, replacing what was there.

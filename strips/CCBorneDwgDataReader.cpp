@@ -89,17 +89,22 @@ VetorItens* CCBorneDwgDataReader::LerDados(zvdb::Database* database,
     progresso.Definir(80);
 
     VetorItens componentes, bornes;
+    static const QString kComp = QStringLiteral("COMP"), kBorne = QStringLiteral("BORNE");
+    const std::uint32_t tipoCampo = NumeroCampo<"ZV_LISTA_TIPO">();
     for (CEItemLista* item : *lidos) {
-        static const QString kTipo = QStringLiteral("ZV_LISTA_TIPO");
-        const QString& tipo = Valor(*item, kTipo);
-        if (tipo == "COMP") componentes.push_back(item);
-        if (tipo == "BORNE") bornes.push_back(item);
+        const QString* tipo = item->campos.procura(tipoCampo);
+        if (!tipo) continue;
+        if (*tipo == kComp) componentes.push_back(item);
+        if (*tipo == kBorne) bornes.push_back(item);
     }
     if (!modelo.LerTexto("*FILTRO_TEMPLATE*").isEmpty()) {
         VetorItens ficam;
-        for (CEItemLista* item : componentes)
-            if (modelo.FiltraItem(*item) && item->valorCampo("ZV_LISTA") != "N")
-                ficam.push_back(item);
+        const std::uint32_t listaCampo = NumeroCampo<"ZV_LISTA">();
+        for (CEItemLista* item : componentes) {
+            if (!modelo.FiltraItem(*item)) continue;
+            const QString* lista = item->campos.procura(listaCampo);
+            if (!lista || *lista != QLatin1String("N")) ficam.push_back(item);
+        }
         componentes = std::move(ficam);
     }
     // A cancelled strip picker draws no terminal.

@@ -9,6 +9,7 @@
 #include "settings/CIMensagens.h"
 
 #include <limits>
+#include <utility>
 
 namespace {
 
@@ -62,7 +63,7 @@ OdDbObjectId CCBorneDwgWriter::InserePreenchido(const Bloco& bloco, const QStrin
                                });
 }
 
-void CCBorneDwgWriter::DesenhaRegua(const CEReguaDwg& regua, const QString& layer) {
+void CCBorneDwgWriter::DesenhaRegua(CEReguaDwg& regua, const QString& layer) {
     const OdDbObjectId cabecalho = Insere(regua_, layer, regua.x, regua.y);
     if (!cabecalho.isNull())
         for (const char* tag : {"REGUA", "STRIP", "REGLETA"})
@@ -72,11 +73,14 @@ void CCBorneDwgWriter::DesenhaRegua(const CEReguaDwg& regua, const QString& laye
     const int limite = bornesPorRegua_ > 0 ? bornesPorRegua_ : std::numeric_limits<int>::max();
     double c = regua.x;
     int contagem = 0;
-    for (const CEDetalheReguaDwg& detalhe : regua.detalhes) {
+    for (CEDetalheReguaDwg& detalhe : regua.detalhes) {
         const double k = detalhe.quantidade;
+        // The run's fields lend themselves to an item of no entity while its block goes in,
+        // and go back to the run.
         CEItemLista campos;
-        campos.campos = detalhe.campos;
+        std::swap(campos.campos, detalhe.campos);
         InserePreenchido(detalhe_, layer, c + k * passo_ * 0.5 - passo_ * 0.5, regua.y, campos);
+        std::swap(campos.campos, detalhe.campos);
         contagem += detalhe.quantidade;
         if (contagem < limite) Insere(traco_, layer, c + k * passo_ - passo_ * 0.5, regua.y);
         c += k * passo_;
@@ -172,6 +176,6 @@ void CCBorneDwgWriter::Escreve(VetorItens& itens, CETemplate& modelo) {
     for (const auto& pagina : modelo_.paginas)
         pagina->nome = paginas[p++].nome;
     for (const auto& pagina : modelo_.paginas)
-        for (const CEReguaDwg* regua : pagina->reguas)
+        for (CEReguaDwg* regua : pagina->reguas)
             DesenhaRegua(*regua, pagina->nome);
 }

@@ -40,7 +40,7 @@ private:
     struct Config;
     Bloco BlocoSimbolo(const CEItemLista& item);
     OdDbObjectId Insere(const Bloco& bloco, const QString& layer, double x, double y);
-    void DesenhaRegua(const CEReguaDwg& regua, const QString& layer);
+    void DesenhaRegua(CEReguaDwg& regua, const QString& layer);
     void DesenhaSemBorne(const std::vector<CESimboloDwg*>& simbolos, const QString& layer);
     // The block placed with its attributes filled from the item: functions evaluated with
     // the item's fields, VARIAVEL cells from the field their text names, any other from the

@@ -157,6 +157,8 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
     // A terminal wired to two symbols is looked at by both: its connection values are
     // gathered once for the build.
     LigacoesDosBornes valores;
+    for (std::uint32_t nome = 0; nome < CamposItem::quantidadeNomes(); ++nome)
+        if (PrefixoDoNome(nome) == kLigacoesDoBorne) valores.nomes.push_back(nome);
     for (const auto& regua : reguas)
         OrdenaPorSimbolos(*regua, valores);
 }
@@ -202,10 +204,19 @@ std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& sim
 
 const std::vector<QString>& CEModeloReguas::ValoresDeLigacao(const CEBorneDwg& borne,
                                                              LigacoesDosBornes& valores) {
-    auto [it, novo] = valores.try_emplace(&borne);
-    if (novo)
-        for (const CamposItem::Campo& campo : borne.item->campos.todos())
-            if (PrefixoDoNome(campo.nome) == kLigacoesDoBorne) it->second.push_back(campo.valor);
+    auto [it, novo] = valores.valores.try_emplace(&borne);
+    if (!novo) return it->second;
+    // A terminal holds many fields and few side connections: each of those names is looked
+    // for from where the one before stood.
+    const std::vector<CamposItem::Campo>& campos = borne.item->campos.todos();
+    auto lugar = campos.begin();
+    for (const std::uint32_t nome : valores.nomes) {
+        lugar = std::lower_bound(
+            lugar, campos.end(), nome,
+            [](const CamposItem::Campo& c, std::uint32_t n) { return c.nome < n; });
+        if (lugar == campos.end()) break;
+        if (lugar->nome == nome) it->second.push_back(lugar->valor);
+    }
     return it->second;
 }
 

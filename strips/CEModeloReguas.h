@@ -11,6 +11,7 @@
 #include <QHash>
 #include <QStringList>
 
+#include <cstdint>
 #include <memory>
 #include <unordered_map>
 #include <vector>
@@ -57,8 +58,12 @@ public:
     std::vector<std::unique_ptr<CEReguaDwg>> reguas;
 
 private:
-    // Per terminal, the values of its side connections (LIG_...) in field order.
-    using LigacoesDosBornes = std::unordered_map<const CEBorneDwg*, std::vector<QString>>;
+    // Per terminal, the values of its side connections (LIG_...) in field order; `nomes`, the
+    // numbers of the names that are side connections, ascending.
+    struct LigacoesDosBornes {
+        std::vector<std::uint32_t> nomes;
+        std::unordered_map<const CEBorneDwg*, std::vector<QString>> valores;
+    };
     void OrdenaPorSimbolos(CEReguaDwg& regua, LigacoesDosBornes& valores);
     // The symbol's terminals in the order of its connections; those that match none drop.
     std::vector<CEBorneDwg*> BornesDoSimbolo(const CESimboloDwg& simbolo,

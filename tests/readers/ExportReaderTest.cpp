@@ -301,6 +301,27 @@ TEST_F(ExportRelationTest, AStripWithoutNumberAndNothingElseLeavesTheRelationFie
     EXPECT_EQ(item.valorCampo("TAG_I"), "-A1");
 }
 
+// The relation's names under a suffix no item has had yet are not numbered by looking for
+// them; once an item has them, they are found.
+TEST_F(ExportRelationTest, NamesNoItemHasYetAreFoundOnceAnItemHasThem) {
+    const QString sufixo = "_NOVO_Q7";
+    leitor.CompoeRelacao(sufixo, item, nullptr, "", "");
+    EXPECT_EQ(CamposItem::numeroSeHouver("STRIP" + sufixo), CamposItem::kSemNome);
+    EXPECT_EQ(CamposItem::numeroSeHouver("TAG" + sufixo), CamposItem::kSemNome);
+    EXPECT_EQ(item.valorCampo("REL" + sufixo), ":");
+    CEItemLista outro;
+    outro.definirCampo("STRIP" + sufixo, "X2");
+    outro.definirCampo("NUMBER" + sufixo, "3");
+    leitor.CompoeRelacao(sufixo, outro, nullptr, "", "");
+    EXPECT_EQ(outro.valorCampo("REL" + sufixo), "X2:3");
+    EXPECT_EQ(outro.valorCampo("TAG" + sufixo), "X2:3");
+    CEItemLista terceiro;
+    terceiro.definirCampo("ETIQUETA" + sufixo, "-K9");
+    leitor.CompoeRelacao(sufixo, terceiro, nullptr, "A1", "");
+    EXPECT_EQ(terceiro.valorCampo("RELACAO" + sufixo), "-K9:A1");
+    EXPECT_EQ(terceiro.valorCampo("REL" + sufixo), "-K9");
+}
+
 TEST_F(ExportRelationTest, ATemplateGivesTheSeparatorAndOrder) {
     modelo_.simbolos["*CHAR_SEP_STD_CFG*"] = "-";
     modelo_.simbolos["*ORDEM_CONCAT_STD*"] = "0";

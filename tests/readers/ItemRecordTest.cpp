@@ -298,6 +298,29 @@ TEST(ItemRecordTest, ASortedBatchMergesIntoTheFieldsInPlace) {
     EXPECT_EQ(CamposItem::numeroComSufixo(a, ""), a);
 }
 
+// Fields handed over leave the item empty and keep their order and their very texts.
+TEST(ItemRecordTest, FieldsHandedOverLeaveNoneBehind) {
+    CEItemLista item;
+    item.definirCampo("ENTREGA_B", "2");
+    item.definirCampo("ENTREGA_A", "1");
+    const QString* antes = item.campo("ENTREGA_B");
+    const QChar* texto = antes->constData();
+    const std::vector<CamposItem::Campo> campos = item.campos.retirar();
+    EXPECT_TRUE(item.campos.isEmpty());
+    EXPECT_FALSE(item.temCampo("ENTREGA_A"));
+    ASSERT_EQ(campos.size(), 2u);
+    EXPECT_LT(campos[0].nome, campos[1].nome);
+    EXPECT_EQ(CamposItem::nome(campos[0].nome), "ENTREGA_B");
+    EXPECT_EQ(campos[0].valor, "2");
+    EXPECT_EQ(campos[1].valor, "1");
+    // Moved, not copied: the value is the same text in memory.
+    EXPECT_EQ(campos[0].valor.constData(), texto);
+    // The item takes new fields afterwards as a new one would.
+    item.definirCampo("ENTREGA_A", "3");
+    EXPECT_EQ(item.campos.size(), 1);
+    EXPECT_EQ(item.valorCampo("ENTREGA_A"), "3");
+}
+
 // Asking for a name no item ever had does not add it to the program's name table.
 TEST(ItemRecordTest, LookingUpAnUnknownNameLeavesTheNameTableAlone) {
     CEItemLista item;

@@ -219,6 +219,25 @@ TEST_F(DesenhoReguasTest, TerminalsDetailsSeparatorsAndTracksStandWhereTheLayout
     }
 }
 
+// A run's fields fill its detail block, and the laid-out model keeps them after drawing.
+TEST_F(DesenhoReguasTest, ARunKeepsItsFieldsAfterItsDetailIsDrawn) {
+    auto x1 = itens_.Regua("X1", 3);
+    const char* lados[] = {"K1", "K2", "K2"};
+    for (size_t i = 0; i < x1.size(); ++i)
+        x1[i]->definirCampo("RELACAO_INI", lados[i]);
+    CCBorneDwgWriter escritor;
+    escritor.EscreverItens(itens_.itens, modelo_);
+    const auto& detalhes = escritor.Modelo().reguas.at(0)->detalhes;
+    ASSERT_EQ(detalhes.size(), 2u);
+    EXPECT_EQ(detalhes[0].campos.value("RELACAO_INI"), "K1");
+    EXPECT_EQ(detalhes[1].campos.value("RELACAO_INI"), "K2");
+    EXPECT_EQ(detalhes[1].campos.size(), x1[2]->campos.size());
+    QStringList relacoes;
+    for (const Insercao& i : Salvo())
+        if (i.nome == "REGUA_DET") relacoes << i.atributos["VARIAVEL_REL"].toString();
+    EXPECT_EQ(relacoes, QStringList({"K1", "K2"}));
+}
+
 TEST_F(DesenhoReguasTest, AFullStripHasNoSeparatorBehindItsLastRunAndPagesHoldTwoStrips) {
     modelo_.simbolos["*ZV_CHAVE_QUEBRA_PAGINA*"] = QStringList();
     itens_.Regua("X1", 10);

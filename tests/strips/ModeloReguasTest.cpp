@@ -172,6 +172,24 @@ TEST_F(ModeloReguasTest, ATerminalOfTwoSymbolsIsPlacedByTheFirstAndTiesKeepTheSt
     EXPECT_EQ(Reguas(outro), QStringList({"X1: 2 1 4 3"}));
 }
 
+// A terminal's side connections are found among many other fields, under names made
+// before and after the others, and a side connection named only now counts too.
+TEST_F(ModeloReguasTest, SideConnectionsAreFoundAmongManyFieldsWhateverTheirNames) {
+    CEItemLista* k1 = itens_.Simbolo("A1", "K1", {"11", "12", "13"});
+    auto x1 = itens_.Regua("X1", 3);
+    for (CEItemLista* borne : x1)
+        for (int i = 0; i < 40; ++i)
+            borne->definirCampo(QString("CAMPO_%1_INI").arg(i), QString::number(i));
+    ItensRegua::Liga(x1[0], "INI", k1, "99");
+    ItensRegua::Liga(x1[1], "INI", k1, "98");
+    ItensRegua::Liga(x1[2], "INI", k1, "97");
+    // 3 by a side of its other end, 1 by a name no item had before this test.
+    x1[2]->definirCampo("LIG_FIM", "11");
+    x1[0]->definirCampo("LIG_LADO_NOVO_Q8", "12");
+    x1[1]->definirCampo("LIG_FIM", "13");
+    EXPECT_EQ(Reguas(Modelo()), QStringList({"X1: 3 1 2"}));
+}
+
 // ---- jumper tracks
 
 TEST_F(ModeloReguasTest, AChainBeginsPassesGoesThroughAndEnds) {
