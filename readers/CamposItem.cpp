@@ -11,7 +11,8 @@ constexpr std::uint32_t kSemNumero = CamposItem::kSemNome;
 
 // Names are never removed: a run of lists meets a few hundred. The lists run on one thread.
 struct TabelaNomes {
-    std::deque<QString> textos;  // stable addresses: iterators hand out references
+    std::deque<QString> textos;             // stable addresses: iterators hand out references
+    std::vector<const QString*> enderecos;  // of the texts, by number
     QHash<QString, std::uint32_t> numeros;
     // By suffix: the number of each name with the suffix, kSemNumero until first asked.
     QHash<QString, std::vector<std::uint32_t>> comSufixo;
@@ -30,12 +31,17 @@ const QString& CamposItem::nome(std::uint32_t numero) {
     return Tabela().textos[numero];
 }
 
+const QString* const* CamposItem::nomes() {
+    return Tabela().enderecos.data();
+}
+
 std::uint32_t CamposItem::numero(const QString& nome) {
     TabelaNomes& tabela = Tabela();
     auto it = tabela.numeros.constFind(nome);
     if (it != tabela.numeros.constEnd()) return it.value();
     const auto novo = std::uint32_t(tabela.textos.size());
     tabela.textos.push_back(nome);
+    tabela.enderecos.push_back(&tabela.textos.back());
     tabela.numeros.insert(nome, novo);
     return novo;
 }
