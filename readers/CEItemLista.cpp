@@ -37,7 +37,8 @@ const QString& NomeReg() {
 void CEItemLista::paraLisp() const {
     // The texts are not copied: the host builds `reg` straight from them. Items are
     // published one at a time, into the same list of pairs.
-    thread_local std::vector<zvsdk::StringPair> pares;
+    thread_local std::vector<zvsdk::StringPair> lista;
+    std::vector<zvsdk::StringPair>& pares = lista;  // the thread's list, looked up once
     pares.clear();
     const QString* const* nomes = CamposItem::nomes();
     for (const CamposItem::Campo& campo : campos.todos())
