@@ -36,9 +36,8 @@ const QString& NomeReg() {
 
 void CEItemLista::paraLisp() const {
     // The texts are not copied: the host builds `reg` straight from them. Items are
-    // published one at a time, into the same list of pairs.
-    thread_local std::vector<zvsdk::StringPair> lista;
-    std::vector<zvsdk::StringPair>& pares = lista;  // the thread's list, looked up once
+    // published one at a time, from the command thread, into the same list of pairs.
+    static std::vector<zvsdk::StringPair> pares;
     pares.clear();
     const QString* const* nomes = CamposItem::nomes();
     for (const CamposItem::Campo& campo : campos.todos())
