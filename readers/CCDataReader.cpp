@@ -566,8 +566,8 @@ QString CCDataReader::TextoTipo(const QString& tipo) {
 
 QString CCDataReader::Posicao(const OdDbObjectId& entidade) const {
     // Parts are never empty: a page's layer has a group exactly when it has three.
-    const std::pair<QString, QString>& partes = GrupoPagina(LayerDe(entidade));
-    if (partes.first.isEmpty()) return "??";
+    const LayerLido& layer = LayerDoNome(CICad::NomeLayerUtf8(entidade));
+    if (layer.grupo.isEmpty()) return "??";
     CEPonto p;
     if (CICad::EhPolilinha(entidade)) {
         // the wires' indexes read it already, unless the drawing changed since
@@ -584,7 +584,7 @@ QString CCDataReader::Posicao(const OdDbObjectId& entidade) const {
     } else {
         return "??";
     }
-    return PosicaoNoPonto(entidade, partes.first, partes.second, p);
+    return PosicaoNoPonto(entidade, layer.grupo, layer.pagina, p);
 }
 
 void CCDataReader::LeCircuitoLocal(const QString& sufixo, CEItemLista& item,
@@ -636,7 +636,10 @@ bool CCDataReader::LeCamposFio(const QString& s, CEItemLista& item, const OdDbOb
     item.definirCampo(NumeroCampo<"DESCRICAO">(s), descricao);
     item.definirCampo(NumeroCampo<"TP_DESCRI">(s), descricao);
     item.definirCampo(NumeroCampo<"POSICAO">(s), Posicao(polilinha));
-    LeLayer(s, item, LayerDe(polilinha));
+    const LayerLido& layer = LayerDoNome(CICad::NomeLayerUtf8(polilinha));
+    item.definirCampo(NumeroCampo<"LAYER">(s), layer.nome);
+    item.definirCampo(NumeroCampo<"GRUPO">(s), layer.grupo);
+    item.definirCampo(NumeroCampo<"PAGINA">(s), layer.pagina);
     const std::uint32_t qtd = NumeroCampo<"QTD">(s);
     if (const QString* valor = item.campos.procura(qtd); !valor || valor->isEmpty())
         item.definirCampo(qtd, QStringLiteral("1"));
