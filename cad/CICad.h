@@ -41,6 +41,27 @@ struct CEPonto {
     double x = 0.0, y = 0.0, z = 0.0;
 };
 
+// What the readers take of a symbol, gathered in one visit of the entity. The texts are
+// the drawing's own (UTF-8), valid until the drawing changes.
+struct CESimboloLido {
+    struct Atributo {
+        std::string_view tag, valor;  // as the drawing holds them, blanks and all
+        OdDbObjectId id;
+    };
+    bool referencia = false;          // a block reference: attributes, block and position
+    std::vector<Atributo> atributos;  // in the drawing's order
+    std::string_view bloco, layer;
+    CEPonto posicao;
+    // The first of KVR_ZV, KVR_ZV_WIRE and KVR_ZV_CABO with items (`temChave`), and its
+    // first text item (`temTextoChave`): the key text.
+    bool temChave = false, temTextoChave = false;
+    std::string_view textoChave;
+    bool temLayout = false;  // items of KVR_LAYOUT_ESQUEMA
+    // The local circuit, as GetCircuitoLocal answers it.
+    bool temCircuito = false;
+    int circuito = 1;
+};
+
 // The rows of the three-language tag table.
 enum class CampoTraduzido {
     Relacao = 1,
@@ -243,6 +264,14 @@ public:
     // if there is one (`temTexto`).
     static bool TextoXData(const OdDbObjectId& id, const char* aplicacao, QString& texto,
                            bool& temTexto);
+    // A symbol's attributes, names, position, key text and local circuit in one visit;
+    // false (and `lido` emptied) for what is no entity.
+    static bool LeituraSimbolo(const OdDbObjectId& entidade, CESimboloLido& lido);
+    // The key text alone, as LeituraSimbolo reads it: false when none of the key applications
+    // has items.
+    static bool TextoChave(const OdDbObjectId& entidade, std::string_view& texto, bool& temTexto);
+    // Whether the attribute is invisible.
+    static bool AtributoInvisivel(const OdDbObjectId& atributo);
     static void SetXData(const OdDbObjectId& id, const QString& aplicacao,
                          const CEListaXData& itens);
     static OdDbObjectId GetSimboloMestre(zvdb::Database* database, const OdDbObjectId& entidade);

@@ -15,8 +15,6 @@ const QChar CCDataReader::kSeparador = QChar(0x0C);
 
 namespace {
 
-// A project symbol's key lives in the first of these applications that the entity carries.
-const char* const kAplicacoesChave[] = {"KVR_ZV", "KVR_ZV_WIRE", "KVR_ZV_CABO"};
 const QLatin1String kPalavrasConexao[] = {QLatin1String("LIGACAO"), QLatin1String("CONNECTION"),
                                           QLatin1String("CONEXION")};
 constexpr double kToleranciaElemento = 3.0;
@@ -89,7 +87,12 @@ void CCDataReader::LiberaLeituras() {
     Esvazia(catalogoComp_);
     Esvazia(constantes_);
     atributosDe_ = OdDbObjectId();
-    atributosLidos_.reset();
+    Esvazia(ligacoesLidas_);
+    Esvazia(chaves_);
+    Esvazia(tags_);
+    Esvazia(valores_);
+    Esvazia(lote_);
+    Esvazia(ordemLote_);
     Esvazia(basesAcessorio_);
     Esvazia(basesColunas_);
 }
@@ -477,20 +480,24 @@ std::unique_ptr<zv::CEAtributo> CCDataReader::AtributoConexaoProximo(const OdDbO
     auto achado = ligacoesPorElemento_.find(elemento);
     if (achado == ligacoesPorElemento_.end()) {
         std::vector<LigacaoGuardada> ligacoes;
-        std::unique_ptr<zv::CEListaAtributos> atributos;
-        if (atributosDe_ == elemento && atributosLidos_ &&
-            atributosVersao_ == CICad::VersaoDesenho(elemento.database()))
-            atributos = std::move(atributosLidos_);
-        else
+        if (atributosDe_ == elemento &&
+            atributosVersao_ == CICad::VersaoDesenho(elemento.database())) {
+            for (const LigacaoLida& lida : ligacoesLidas_)
+                ligacoes.push_back({CICad::GetPosicaoTexto(lida.id),
+                                    zv::CEAtributo(lida.tag, QString(), lida.valor, lida.id,
+                                                   CICad::AtributoInvisivel(lida.id))});
+        } else {
+            std::unique_ptr<zv::CEListaAtributos> atributos;
             CICad::GetAtributos(elemento, atributos, false, false);
-        atributosDe_ = OdDbObjectId();
-        for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
-            const zv::CEAtributo& atributo = (*atributos)[i];
-            const QString tag = atributo.GetTag().toUpper();
-            if (std::any_of(std::begin(kPalavrasConexao), std::end(kPalavrasConexao),
-                            [&tag](QLatin1String palavra) { return tag.startsWith(palavra); }))
-                ligacoes.push_back({CICad::GetPosicaoTexto(atributo.GetId()), atributo});
+            for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
+                const zv::CEAtributo& atributo = (*atributos)[i];
+                const QString tag = atributo.GetTag().toUpper();
+                if (std::any_of(std::begin(kPalavrasConexao), std::end(kPalavrasConexao),
+                                [&tag](QLatin1String palavra) { return tag.startsWith(palavra); }))
+                    ligacoes.push_back({CICad::GetPosicaoTexto(atributo.GetId()), atributo});
+            }
         }
+        atributosDe_ = OdDbObjectId();
         achado = ligacoesPorElemento_.emplace(elemento, std::move(ligacoes)).first;
     }
     const LigacaoGuardada* melhor = nullptr;
@@ -521,19 +528,6 @@ bool CCDataReader::EhEquipamento(const OdDbObjectId& id) const {
 }
 
 // ---- items from entities
-
-bool CCDataReader::ChaveENorma(const OdDbObjectId& entidade, QString& chave, QString& norma) const {
-    for (const char* aplicacao : kAplicacoesChave) {
-        QString texto;
-        bool temTexto = false;
-        if (!CICad::TextoXData(entidade, aplicacao, texto, temTexto)) continue;
-        if (!temTexto) return true;
-        chave.clear(), norma.clear();
-        ZVString(texto).DivideEmDois(kSeparador, chave, norma);
-        return true;
-    }
-    return false;
-}
 
 QString CCDataReader::ChaveDaEntidade(const OdDbObjectId& entidade) const {
     QString chave, norma;
@@ -579,13 +573,6 @@ const std::pair<QString, QString>& CCDataReader::GrupoPagina(const QString& laye
     return *it;
 }
 
-const QString& CCDataReader::LayerDe(const OdDbObjectId& entidade) const {
-    const std::string_view nome = CICad::NomeLayerUtf8(entidade);
-    auto it = layers_.find(nome);
-    if (it == layers_.end()) it = layers_.emplace(nome, CICad::GetLayerEntidade(entidade)).first;
-    return it->second;
-}
-
 QString CCDataReader::TextoTipo(const QString& tipo) {
     auto it = textosTipo_.constFind(tipo);
     if (it != textosTipo_.constEnd()) return *it;
@@ -598,8 +585,8 @@ QString CCDataReader::TextoTipo(const QString& tipo) {
 
 QString CCDataReader::Posicao(const OdDbObjectId& entidade) const {
     // Parts are never empty: a page's layer has a group exactly when it has three.
-    const std::pair<QString, QString>& partes = GrupoPagina(LayerDe(entidade));
-    if (partes.first.isEmpty()) return "??";
+    const LayerLido& layer = LayerDoNome(CICad::NomeLayerUtf8(entidade));
+    if (layer.grupo.isEmpty()) return "??";
     CEPonto p;
     if (CICad::EhPolilinha(entidade)) {
         // the wires' indexes read it already, unless the drawing changed since
@@ -616,132 +603,18 @@ QString CCDataReader::Posicao(const OdDbObjectId& entidade) const {
     } else {
         return "??";
     }
-    static const QString funcao("BuscarCoordenadas");
-    ResultBuffer* chamada = zvsdk::newString(funcao);
-    ResultBuffer* cauda = chamada->rbnext = zvsdk::newEntity(entidade.entityName());
-    cauda = cauda->rbnext = zvsdk::newString(partes.first);
-    cauda = cauda->rbnext = zvsdk::newString(partes.second);
-    cauda = cauda->rbnext = zvsdk::newReal(p.x);
-    cauda->rbnext = zvsdk::newReal(p.y);
-    ResultBuffer* resposta = CICad::InvokeChain(chamada);
-    zvsdk::releaseChain(chamada);
-    const QString texto =
-        resposta && resposta->restype == zvsdk::RTSTR ? resposta->rstring : QStringLiteral("??");
-    CICad::LiberaLista(resposta);
-    return texto;
+    return PosicaoNoPonto(entidade, layer.grupo, layer.pagina, p);
 }
 
 void CCDataReader::LeCircuitoLocal(const QString& sufixo, CEItemLista& item,
                                    const OdDbObjectId& entidade) {
-    Circuito circuito;
     int numero = 1;
-    if (CICad::GetCircuitoLocal(entidade, numero)) {
-        auto it = circuitos_.constFind(numero);
-        if (it == circuitos_.constEnd()) {
-            Circuito novo;
-            QString terceiro;
-            novo.ok = CICad::GetCircuitoLocalInfo(numero, novo.circuito, novo.painel, terceiro);
-            if (!novo.ok) novo.circuito.clear(), novo.painel.clear();
-            it = circuitos_.insert(numero, novo);
-        }
-        circuito = it.value();
-    }
+    const bool tem = CICad::GetCircuitoLocal(entidade, numero);
+    const Circuito& circuito = CircuitoDe(tem, numero);
     // PAINEL and LOCAL hold the same value: templates use either name.
     item.definirCampo(NumeroCampo<"PAINEL">(sufixo), circuito.painel);
     item.definirCampo(NumeroCampo<"LOCAL">(sufixo), circuito.painel);
     item.definirCampo(NumeroCampo<"CIRCUITO">(sufixo), circuito.circuito);
-}
-
-void CCDataReader::LeLayout(const QString& sufixo, CEItemLista& item,
-                            const OdDbObjectId& entidade) {
-    const CEListaXData layout = CICad::GetXData(entidade, "KVR_LAYOUT_ESQUEMA");
-    for (size_t indice : {size_t(0), size_t(2)}) {
-        if (indice >= layout.size()) continue;
-        const OdDbObjectId ref = CICad::IdDoHandle(layout[indice].texto, entidade.database());
-        if (!CICad::EhReferencia(ref)) continue;
-        const CEPonto p = CICad::GetPosicao(ref);
-        item.definirCampo(NumeroCampo<"LAYOUTPOSITIONX">(sufixo),
-                          QString::number(qint64(std::trunc(p.x))));
-        item.definirCampo(NumeroCampo<"LAYOUTPOSITIONY">(sufixo),
-                          QString::number(qint64(std::trunc(p.y))));
-        break;
-    }
-    QString orientacao = "0";
-    if (!layout.empty() && EhTexto(layout[0])) {
-        const OdDbObjectId ref = CICad::IdDoHandle(layout[0].texto, entidade.database());
-        if (CICad::EhReferencia(ref))
-            orientacao = ZVString::DeReal(CICad::GetRotacao(ref) * 180.0 / M_PI);
-    }
-    item.definirCampo(NumeroCampo<"ORIENTACAO">(sufixo), orientacao);
-}
-
-void CCDataReader::LeBloco(const QString& s, CEItemLista& item, const OdDbObjectId& referencia,
-                           CETemplate* modelo) {
-    Q_UNUSED(modelo);
-    QString chave, norma;
-    ChaveENorma(referencia, chave, norma);
-    const CatalogoComp& catalogo = DadosCatalogoComp(chave, norma);
-    LeColunasUsuario(s, item, catalogo.colunas);
-    std::unique_ptr<zv::CEListaAtributos> atributos;
-    CICad::GetAtributos(referencia, atributos, false, false);
-    for (int i = 0; atributos && i < atributos->Quantidade(); ++i)
-        item.definirCampo((*atributos)[i].GetTag() + s, (*atributos)[i].GetValor());
-    atributosLidos_ = std::move(atributos);
-    atributosDe_ = referencia;
-    atributosVersao_ = CICad::VersaoDesenho(referencia.database());
-    const QString bloco = CICad::GetNomeBloco(referencia);
-    for (const auto& [nome, valor] : ConstantesDoBloco(referencia, bloco).campos)
-        item.definirCampo(CamposItem::numeroComSufixo(nome, s), valor);
-    if (bloco.startsWith("PIN-")) {
-        const CEListaXData pino = CICad::GetXData(referencia, "ZV_PINO");
-        if (!pino.empty() && EhTexto(pino[0]))
-            item.definirCampo(NumeroCampo<"CONECTOR">(s), pino[0].texto);
-    }
-    item.definirCampo(NumeroCampo<"HANDLE">(s), ZVString::DeHandle(referencia.handle()));
-    LeCircuitoLocal(s, item, referencia);
-    item.definirCampo(NumeroCampo<"ZV_LISTA">(s), catalogo.lista);
-    item.definirCampo(NumeroCampo<"ZV_KEY">(s), chave);
-    item.definirCampo(NumeroCampo<"DESCRICAO">(s), catalogo.descricao);
-    item.definirCampo(NumeroCampo<"TP_DESCRI">(s), catalogo.descricao);
-    item.definirCampo(NumeroCampo<"POSICAO">(s), Posicao(referencia));
-    LeLayer(s, item, LayerDe(referencia));
-    item.definirCampo(NumeroCampo<"COMPONENTTYPE">(s), catalogo.tipo);
-    const std::uint32_t qtd = NumeroCampo<"QTD">(s);
-    if (const QString* valor = item.campos.procura(qtd); !valor || valor->isEmpty())
-        item.definirCampo(qtd, QStringLiteral("1"));
-    item.definirCampo(NumeroCampo<"SAP_MATERIAL">(s), catalogo.material);
-    LeLayout(s, item, referencia);
-}
-
-const CCDataReader::CatalogoComp& CCDataReader::DadosCatalogoComp(const QString& chave,
-                                                                  const QString& norma) {
-    auto achado = catalogoComp_.find({chave, norma});
-    if (achado != catalogoComp_.end()) return achado->second;
-    CatalogoComp dados;
-    dados.colunas = catalogo_.ColunasComp(chave);
-    dados.lista = catalogo_.ListaComp(chave, norma);
-    dados.descricao = catalogo_.DescricaoComp(chave);
-    dados.tipo = TextoTipo(catalogo_.TipoComp(chave));
-    dados.material = catalogo_.MaterialSap(chave);
-    return catalogoComp_.emplace(std::pair(chave, norma), std::move(dados)).first->second;
-}
-
-const CCDataReader::ConstantesBloco& CCDataReader::ConstantesDoBloco(const OdDbObjectId& referencia,
-                                                                     const QString& bloco) {
-    const std::uint64_t versao = CICad::VersaoDesenho(referencia.database());
-    ConstantesBloco& constantes = constantes_[bloco];
-    if (constantes.desenho == referencia.database() && constantes.versao == versao &&
-        constantes.desenho)
-        return constantes;
-    constantes.desenho = referencia.database();
-    constantes.versao = versao;
-    constantes.campos.clear();
-    std::unique_ptr<zv::CEListaAtributos> atributos;
-    CICad::GetAtributosConstantes(referencia, atributos);
-    for (int i = 0; atributos && i < atributos->Quantidade(); ++i)
-        constantes.campos.emplace_back(CamposItem::numero((*atributos)[i].GetTag()),
-                                       (*atributos)[i].GetValor());
-    return constantes;
 }
 
 void CCDataReader::LeFio(const QString& s, CEItemLista& item, const OdDbObjectId& polilinha,
@@ -782,7 +655,10 @@ bool CCDataReader::LeCamposFio(const QString& s, CEItemLista& item, const OdDbOb
     item.definirCampo(NumeroCampo<"DESCRICAO">(s), descricao);
     item.definirCampo(NumeroCampo<"TP_DESCRI">(s), descricao);
     item.definirCampo(NumeroCampo<"POSICAO">(s), Posicao(polilinha));
-    LeLayer(s, item, LayerDe(polilinha));
+    const LayerLido& layer = LayerDoNome(CICad::NomeLayerUtf8(polilinha));
+    item.definirCampo(NumeroCampo<"LAYER">(s), layer.nome);
+    item.definirCampo(NumeroCampo<"GRUPO">(s), layer.grupo);
+    item.definirCampo(NumeroCampo<"PAGINA">(s), layer.pagina);
     const std::uint32_t qtd = NumeroCampo<"QTD">(s);
     if (const QString* valor = item.campos.procura(qtd); !valor || valor->isEmpty())
         item.definirCampo(qtd, QStringLiteral("1"));

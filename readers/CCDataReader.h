@@ -159,7 +159,6 @@ private:
     bool LeCamposFio(const QString& s, CEItemLista& item, const OdDbObjectId& polilinha);
     // The routes of the wire number the item holds without a suffix.
     void LeRotasDoItem(const CEItemLista& item, CETemplate* modelo);
-    void LeLayout(const QString& sufixo, CEItemLista& item, const OdDbObjectId& entidade);
     // The key text's two parts; false when no key application is there.
     bool ChaveENorma(const OdDbObjectId& entidade, QString& chave, QString& norma) const;
 
@@ -169,6 +168,8 @@ private:
         QString circuito, painel;
     };
     QHash<int, Circuito> circuitos_;
+    // The circuit of a number as GetCircuitoLocal found it (`tem`); empty texts without one.
+    const Circuito& CircuitoDe(bool tem, int numero);
     QHash<QString, Conexoes> conexoes_;
     QHash<QString, QStringList> fiosPorLayer_;
     std::unordered_map<QString, std::unique_ptr<FiosDoLayer>> indicesFios_;
@@ -248,6 +249,8 @@ private:
     // the same, so one look-up serves them all.
     struct CatalogoComp {
         QStringList colunas;
+        // The columns split into name numbers and values, in the columns' order.
+        std::vector<std::pair<std::uint32_t, QString>> campos;
         QString lista, descricao, tipo, material;
     };
     struct HashPar {
@@ -257,6 +260,12 @@ private:
     };
     std::unordered_map<std::pair<QString, QString>, CatalogoComp, HashPar> catalogoComp_;
     const CatalogoComp& DadosCatalogoComp(const QString& chave, const QString& norma);
+    struct HashTexto {
+        using is_transparent = void;
+        size_t operator()(std::string_view t) const { return std::hash<std::string_view>{}(t); }
+    };
+    template <class Valor>
+    using PorTexto = std::unordered_map<std::string, Valor, HashTexto, std::equal_to<>>;
     // The constant attributes of a block definition by the block's name, as name numbers and
     // values; read again when the drawing changed.
     struct ConstantesBloco {
@@ -264,24 +273,68 @@ private:
         std::uint64_t versao = 0;
         std::vector<std::pair<std::uint32_t, QString>> campos;
     };
-    QHash<QString, ConstantesBloco> constantes_;
-    const ConstantesBloco& ConstantesDoBloco(const OdDbObjectId& referencia, const QString& bloco);
-    // The attributes of the last symbol LeBloco read: its neighbour's connection attributes
-    // are asked right after.
+    PorTexto<ConstantesBloco> constantes_;
+    const ConstantesBloco& ConstantesDoBloco(const OdDbObjectId& referencia,
+                                             std::string_view bloco);
+    // The connection attributes of the last symbol LeBloco read: its neighbour's connection
+    // attributes are asked right after.
+    struct LigacaoLida {
+        QString tag, valor;
+        OdDbObjectId id;
+    };
     mutable OdDbObjectId atributosDe_;
     mutable std::uint64_t atributosVersao_ = 0;
-    mutable std::unique_ptr<zv::CEListaAtributos> atributosLidos_;
+    mutable std::vector<LigacaoLida> ligacoesLidas_;
     // Per layer name, its group and page (empty unless the name has three parts); per catalogue
     // type, its text: items repeat a few of each.
     mutable QHash<QString, std::pair<QString, QString>> gruposPaginas_;
     // The group and page of a page's layer (GROUP$PAGE$SHEET); both empty for other layers.
     const std::pair<QString, QString>& GrupoPagina(const QString& layer) const;
     QHash<QString, QString> textosTipo_;
-    struct HashTexto {
-        using is_transparent = void;
-        size_t operator()(std::string_view t) const { return std::hash<std::string_view>{}(t); }
+    // A layer's name with its group and page, by the name as the drawing holds it.
+    struct LayerLido {
+        QString nome, grupo, pagina;
     };
-    mutable std::unordered_map<std::string, QString, HashTexto, std::equal_to<>> layers_;
+    mutable PorTexto<LayerLido> layers_;
+    const LayerLido& LayerDoNome(std::string_view nome) const;
+    // The position text at a point of the entity's page.
+    QString PosicaoNoPonto(const OdDbObjectId& entidade, const QString& grupo,
+                           const QString& pagina, const CEPonto& p) const;
+    // The call of the position function, made once and filled again for each question.
+    struct LiberaChamada {
+        void operator()(zvsdk::ResultBuffer* chamada) const { zvsdk::releaseChain(chamada); }
+    };
+    mutable std::unique_ptr<zvsdk::ResultBuffer, LiberaChamada> chamadaPosicao_;
+
+    // ---- the reading of a symbol
+    // The key text's two parts, by the text as the drawing holds it, with what the catalogue
+    // says of them once asked.
+    struct ChaveLida {
+        QString chave, norma;
+        mutable const CatalogoComp* catalogo = nullptr;
+    };
+    mutable PorTexto<ChaveLida> chaves_;
+    const ChaveLida semChave_;  // of an entity without a key text
+    const ChaveLida& ChaveDoTexto(std::string_view texto) const;
+    // An attribute tag as the drawing holds it: its field's number without suffix (kSemNome
+    // until first written so), its trimmed text and whether it is a connection's.
+    struct TagLida {
+        std::uint32_t numero;
+        bool ligacao;
+        QString texto;
+    };
+    PorTexto<TagLida> tags_;
+    TagLida& TagDoTexto(std::string_view tag);
+    // Attribute values, trimmed, by their text in the drawing: symbols repeat theirs, and
+    // their items share one text.
+    PorTexto<QString> valores_;
+    const QString& ValorDoTexto(std::string_view valor);
+    // The last symbol read, and the fields of one reading before they join the item (in
+    // order of writing: a later one of the same name wins).
+    CESimboloLido simbolo_;
+    std::vector<CamposItem::Campo> lote_;
+    std::vector<std::uint64_t> ordemLote_;
+    void JuntaLote(CEItemLista& item);
     // The drawing and its version where KVR_ZV_WIRE was last registered.
     const void* appFioEm_ = nullptr;
     std::uint64_t appFioVersao_ = 0;

@@ -35,11 +35,13 @@ const QString& NomeReg() {
 }  // namespace
 
 void CEItemLista::paraLisp() const {
-    // The texts are not copied: the host builds `reg` straight from them.
-    std::vector<zvsdk::StringPair> pares;
-    pares.reserve(size_t(campos.size()));
-    for (auto it = campos.constBegin(); it != campos.constEnd(); ++it)
-        pares.push_back({&it.key(), &it.value()});
+    // The texts are not copied: the host builds `reg` straight from them. Items are
+    // published one at a time, from the command thread, into the same list of pairs.
+    static std::vector<zvsdk::StringPair> pares;
+    pares.clear();
+    const QString* const* nomes = CamposItem::nomes();
+    for (const CamposItem::Campo& campo : campos.todos())
+        pares.push_back({nomes[campo.nome], &campo.valor});
     CICad::SetParesLisp(NomeReg(), pares);
     if (ids.empty()) return;
     static const QString nomeEname("ename");

@@ -3,6 +3,7 @@
 #include <QHash>
 
 #include <algorithm>
+#include <array>
 #include <deque>
 
 namespace {
@@ -11,12 +12,49 @@ constexpr std::uint32_t kSemNumero = CamposItem::kSemNome;
 
 // Names are never removed: a run of lists meets a few hundred. The lists run on one thread.
 struct TabelaNomes {
-    std::deque<QString> textos;  // stable addresses: iterators hand out references
+    std::deque<QString> textos;             // stable addresses: iterators hand out references
+    std::vector<const QString*> enderecos;  // of the texts, by number
     QHash<QString, std::uint32_t> numeros;
     // By suffix: the number of each name with the suffix, kSemNumero until first asked.
     QHash<QString, std::vector<std::uint32_t>> comSufixo;
+    // The suffixes asked for lately, by where their text lies, as `achados` below; the
+    // arrays stay where they are in the hash, which never loses an entry.
+    struct SufixoAchado {
+        QString sufixo;
+        std::vector<std::uint32_t>* numeros = nullptr;
+    };
+    std::array<SufixoAchado, 16> sufixos;
 
-    std::uint32_t procura(const QString& nome) const { return numeros.value(nome, kSemNumero); }
+    std::vector<std::uint32_t>& numerosCom(const QString& sufixo) {
+        SufixoAchado& achado =
+            sufixos[(reinterpret_cast<std::uintptr_t>(sufixo.constData()) >> 4) % 16];
+        if (achado.numeros && achado.sufixo.constData() == sufixo.constData() &&
+            achado.sufixo.size() == sufixo.size())
+            return *achado.numeros;
+        std::vector<std::uint32_t>& numeros = comSufixo[sufixo];
+        achado = {sufixo, &numeros};
+        return numeros;
+    }
+
+    // Names found lately, by where their text lies: callers ask by the same few texts again
+    // and again (a column's name for every row). The entry holds the text, so its storage is
+    // not freed and written with another name while the entry points to it.
+    struct Achado {
+        QString nome;
+        std::uint32_t numero = kSemNumero;
+    };
+    std::array<Achado, 64> achados;
+
+    std::uint32_t procura(const QString& nome) {
+        Achado& achado = achados[(reinterpret_cast<std::uintptr_t>(nome.constData()) >> 4) % 64];
+        if (achado.numero != kSemNumero && achado.nome.constData() == nome.constData() &&
+            achado.nome.size() == nome.size())
+            return achado.numero;
+        // Only names the table holds are kept: an absent one may be added later.
+        const std::uint32_t numero = numeros.value(nome, kSemNumero);
+        if (numero != kSemNumero) achado = {nome, numero};
+        return numero;
+    }
 };
 
 TabelaNomes& Tabela() {
@@ -30,12 +68,16 @@ const QString& CamposItem::nome(std::uint32_t numero) {
     return Tabela().textos[numero];
 }
 
+const QString* const* CamposItem::nomes() {
+    return Tabela().enderecos.data();
+}
+
 std::uint32_t CamposItem::numero(const QString& nome) {
     TabelaNomes& tabela = Tabela();
-    auto it = tabela.numeros.constFind(nome);
-    if (it != tabela.numeros.constEnd()) return it.value();
+    if (const std::uint32_t achado = tabela.procura(nome); achado != kSemNumero) return achado;
     const auto novo = std::uint32_t(tabela.textos.size());
     tabela.textos.push_back(nome);
+    tabela.enderecos.push_back(&tabela.textos.back());
     tabela.numeros.insert(nome, novo);
     return novo;
 }
@@ -58,7 +100,7 @@ std::uint32_t CamposItem::numeroNoSufixo(std::vector<std::uint32_t>& numeros, st
 }
 
 std::uint32_t CamposItem::numeroComSufixo(std::uint32_t numero, const QString& sufixo) {
-    return sufixo.isEmpty() ? numero : numeroNoSufixo(Tabela().comSufixo[sufixo], numero, sufixo);
+    return sufixo.isEmpty() ? numero : numeroNoSufixo(Tabela().numerosCom(sufixo), numero, sufixo);
 }
 
 const QString* CamposItem::procura(std::uint32_t numero) const {

@@ -86,6 +86,8 @@ public:
 
     // The program-wide name table. A name's text, by its number.
     static const QString& nome(std::uint32_t numero);
+    // All the names' texts, indexed by number: valid until a name is added.
+    static const QString* const* nomes();
     // The number of a name, added when new.
     static std::uint32_t numero(const QString& nome);
     // The number of a name the table holds, or kSemNome; nothing is added.

@@ -84,7 +84,15 @@ ZVString ZVString::DeReal(double valor, int precisao) {
 }
 
 ZVString ZVString::DeHandle(std::uint64_t handle) {
-    return ZVString(QString::number(qulonglong(handle), 16).toUpper());
+    // Every item has the text of its handle: written here, upper-case hexadecimal digits
+    // without leading zeros.
+    QChar digitos[16];
+    int n = 0;
+    do {
+        digitos[15 - n++] = QLatin1Char("0123456789ABCDEF"[handle & 15]);
+        handle >>= 4;
+    } while (handle);
+    return ZVString(QString(digitos + 16 - n, n));
 }
 
 std::uint64_t ZVString::ParaHandle() const {

@@ -138,3 +138,40 @@ TEST_F(LispPublishingTest, AFailingFilterIsReportedAndLeavesTheLastAnswer) {
     EXPECT_FALSE(modelo.FiltraItem(x1));
     EXPECT_TRUE(saida().contains("; error: malformed list on input"));
 }
+
+// The filter sees the item's own fields, whatever the items before it held: a filter on a
+// field, on an accessory's fields, on a field the item lacks; and names new to the program
+// between two items.
+TEST_F(LispPublishingTest, TheFilterSeesEachItemsOwnFieldsByName) {
+    CETemplateLisp modelo(arquivo("lista.grt"));
+    CEItemLista componente = item("X1", 3, "c");
+    componente.definirCampo("ZV_KEY", "A1");
+    CEItemLista acessorio;
+    acessorio.definirCampo("ZV_LISTA_TIPO", "ACE");
+    acessorio.definirCampo("ZV_KEY", "B3");
+    acessorio.definirCampo("QTD", "2");
+    CICad::SetStringLisp("*FILTRO_TEMPLATE*", "(= (cdr (assoc \"ZV_KEY\" reg)) \"A1\")");
+    EXPECT_TRUE(modelo.FiltraItem(componente));
+    EXPECT_FALSE(modelo.FiltraItem(acessorio));
+    CICad::SetStringLisp("*FILTRO_TEMPLATE*",
+                         "(and (= (cdr (assoc \"ZV_LISTA_TIPO\" reg)) \"ACE\") "
+                         "(> (atoi (cdr (assoc \"QTD\" reg))) 1))");
+    EXPECT_FALSE(modelo.FiltraItem(componente));
+    EXPECT_TRUE(modelo.FiltraItem(acessorio));
+    // a field the item lacks is no pair of `reg`, also after an item that had it
+    CICad::SetStringLisp("*FILTRO_TEMPLATE*", "(null (assoc \"REGUA\" reg))");
+    EXPECT_FALSE(modelo.FiltraItem(componente));
+    EXPECT_TRUE(modelo.FiltraItem(acessorio));
+    EXPECT_FALSE(modelo.FiltraItem(componente));
+    // Many names new to the program between two items: the newest item's names are its own.
+    CICad::SetStringLisp("*FILTRO_TEMPLATE*", "(progn (setq visto (vl-prin1-to-string reg)) T)");
+    EXPECT_TRUE(modelo.FiltraItem(componente));
+    const QString marca = QString::number(quintptr(this), 16);
+    CEItemLista novo;
+    for (int i = 0; i < 2000; ++i)
+        novo.definirCampo("NOVO_" + marca + "_" + QString::number(i), QString::number(i));
+    EXPECT_TRUE(modelo.FiltraItem(novo));
+    EXPECT_EQ(CICad::GetStringLisp("visto"), comoLista(novo));
+    EXPECT_TRUE(modelo.FiltraItem(componente));
+    EXPECT_EQ(CICad::GetStringLisp("visto"), comoLista(componente));
+}

@@ -91,6 +91,10 @@ TEST(ZVStringTest, PrefixNumbersAndHandles) {
     EXPECT_EQ(ZVString::DeReal(2.456, 2), "2.46");
     EXPECT_EQ(ZVString::DeReal(7.0, 0), "7");
     EXPECT_EQ(ZVString::DeHandle(0x2AF), "2AF");
+    EXPECT_EQ(ZVString::DeHandle(0), "0");
+    EXPECT_EQ(ZVString::DeHandle(0x10), "10");
+    EXPECT_EQ(ZVString::DeHandle(0xFFFFFFFFFFFFFFFFu), "FFFFFFFFFFFFFFFF");
+    EXPECT_EQ(ZVString::DeHandle(0xABCDEF0123456789u), "ABCDEF0123456789");
     EXPECT_EQ(ZVString("2af").ParaHandle(), 0x2AFu);
     EXPECT_EQ(ZVString("xyz").ParaHandle(), 0u);
     EXPECT_EQ(ZVString("").ParaHandle(), 0u);
@@ -483,3 +487,44 @@ TEST(VectorTest, FilterSharesItemsAndKeepsOrder) {
 }
 
 }  // namespace
+
+// Names and suffixes are found by the texts asked with, whatever became of texts asked with
+// before: a text changed after a look-up, a text freed and another made in its place.
+TEST(ItemRecordTest, NamesAndSuffixesAreFoundByTheTextsAskedWithNow) {
+    CEItemLista item;
+    item.definirCampo("PRIMEIRO_LOOKUP", "1");
+    item.definirCampo("SEGUNDO_LOOKUP", "2");
+    QString nome = QStringLiteral("PRIMEIRO_LOOKUP");
+    nome.detach();
+    EXPECT_EQ(item.valorCampo(nome), "1");
+    nome.replace(0, 8, "SEGUNDO_");  // same length, written in place when not shared
+    nome.chop(0);
+    ASSERT_EQ(nome, "SEGUNDO__LOOKUP");
+    EXPECT_FALSE(item.temCampo(nome));
+    nome = QStringLiteral("SEGUNDO_LOOKUP");
+    EXPECT_EQ(item.valorCampo(nome), "2");
+    // Texts made and freed one after another, each asked once.
+    for (int i = 0; i < 200; ++i) {
+        QString texto = QString(i % 2 ? "PRIMEIRO" : "SEGUNDO") + "_LOOKUP";
+        EXPECT_EQ(item.valorCampo(texto), i % 2 ? "1" : "2") << i;
+        QString ausente = "AUSENTE_LOOKUP_" + QString::number(i);
+        EXPECT_FALSE(item.temCampo(ausente));
+    }
+    // A suffix changed after it was used names other fields.
+    const std::uint32_t base = CamposItem::numero(QStringLiteral("BASE_LOOKUP"));
+    QString sufixo = QStringLiteral("_AA");
+    sufixo.detach();
+    EXPECT_EQ(CamposItem::nome(CamposItem::numeroComSufixo(base, sufixo)), "BASE_LOOKUP_AA");
+    sufixo[1] = QLatin1Char('B');
+    EXPECT_EQ(CamposItem::nome(CamposItem::numeroComSufixo(base, sufixo)), "BASE_LOOKUP_BA");
+    for (int i = 0; i < 100; ++i) {
+        const QString outro = "_" + QString::number(i);
+        EXPECT_EQ(CamposItem::nome(CamposItem::numeroComSufixo(base, outro)),
+                  "BASE_LOOKUP" + outro);
+    }
+    // A name absent when first asked is found once some item has it.
+    const QString tardio = QStringLiteral("TARDIO_LOOKUP");
+    EXPECT_FALSE(item.temCampo(tardio));
+    item.definirCampo(tardio, "3");
+    EXPECT_EQ(item.valorCampo(tardio), "3");
+}

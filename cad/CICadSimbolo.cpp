@@ -1,0 +1,107 @@
+#include "CICad.h"
+#include "CICadInterno.h"
+
+#include "drawing/Attribute.h"
+#include "drawing/BlockReference.h"
+#include "drawing/Entity.h"
+#include "drawing/TagValues.h"
+
+#include <array>
+#include <span>
+#include <string_view>
+
+using namespace cicad;
+
+namespace {
+
+// The applications a symbol's reading looks at, found in one walk of its extended data.
+enum Aplicacao { kZv, kZvWire, kZvCabo, kLayout, kCircuito, kAplicacoes };
+constexpr std::array<std::string_view, kAplicacoes> kNomes = {
+    "KVR_ZV", "KVR_ZV_WIRE", "KVR_ZV_CABO", "KVR_LAYOUT_ESQUEMA", "KVR_ZV_CIRCLOC"};
+
+// The items of the first group of each application, as DbObject::xdataItems gives them.
+std::array<std::span<const zvdb::Tag>, kAplicacoes> Grupos(const zvdb::DbObject& objeto) {
+    std::array<std::span<const zvdb::Tag>, kAplicacoes> grupos{};
+    std::array<bool, kAplicacoes> achado{};
+    const std::span<const zvdb::Tag> todos = objeto.tags();
+    for (std::size_t i = objeto.xdataStart(); i < todos.size(); ++i) {
+        if (todos[i].code != 1001) continue;
+        for (int a = 0; a < kAplicacoes; ++a) {
+            if (achado[a] || !zvdb::TagValues::sameName(todos[i].value, kNomes[a])) continue;
+            std::size_t fim = i + 1;
+            while (fim < todos.size() && todos[fim].code != 1001)
+                ++fim;
+            grupos[a] = todos.subspan(i + 1, fim - i - 1);
+            achado[a] = true;
+            break;
+        }
+    }
+    return grupos;
+}
+
+// The first of the key applications that has items, and its first text item.
+bool Chave(const std::array<std::span<const zvdb::Tag>, kAplicacoes>& grupos,
+           std::string_view& texto, bool& temTexto) {
+    temTexto = false;
+    for (const int a : {kZv, kZvWire, kZvCabo}) {
+        if (grupos[a].empty()) continue;
+        for (const zvdb::Tag& item : grupos[a])
+            if (item.code == 1000) {
+                texto = item.value;
+                temTexto = true;
+                break;
+            }
+        return true;
+    }
+    return false;
+}
+
+}  // namespace
+
+bool CICad::TextoChave(const OdDbObjectId& entidade, std::string_view& texto, bool& temTexto) {
+    temTexto = false;
+    zvdb::DbObject* objeto = Objeto(entidade);
+    return objeto && Chave(Grupos(*objeto), texto, temTexto);
+}
+
+bool CICad::AtributoInvisivel(const OdDbObjectId& atributo) {
+    auto* a = Como<zvdb::Attribute>(atributo);
+    return a && a->isInvisible();
+}
+
+bool CICad::LeituraSimbolo(const OdDbObjectId& entidade, CESimboloLido& lido) {
+    lido.referencia = false;
+    lido.atributos.clear();
+    lido.bloco = lido.layer = lido.textoChave = {};
+    lido.posicao = {};
+    lido.temChave = lido.temTextoChave = lido.temLayout = lido.temCircuito = false;
+    lido.circuito = 1;
+    zvdb::DbObject* objeto = Objeto(entidade);
+    if (!objeto) return false;
+    const auto grupos = Grupos(*objeto);
+    lido.temChave = Chave(grupos, lido.textoChave, lido.temTextoChave);
+    lido.temLayout = !grupos[kLayout].empty();
+    if (!grupos[kZv].empty()) {
+        // A symbol with its own key data is its own master: its circuit is on it.
+        const std::span<const zvdb::Tag> circuito = grupos[kCircuito];
+        lido.temCircuito = true;
+        lido.circuito = circuito.empty() ? 1 : Q(circuito.front().value).toInt();
+    } else {
+        lido.temCircuito = GetCircuitoLocal(entidade, lido.circuito);
+    }
+    auto* entidadeDesenho = dynamic_cast<zvdb::Entity*>(objeto);
+    if (!entidadeDesenho) return true;
+    lido.layer = entidadeDesenho->layer();
+    auto* ref = dynamic_cast<zvdb::BlockReference*>(entidadeDesenho);
+    if (!ref) return true;
+    lido.referencia = true;
+    lido.bloco = ref->blockName();
+    const zvdb::Point3 p = ref->position();
+    lido.posicao = {p.x, p.y, p.z};
+    for (zvdb::Entity* sub : ref->subEntities()) {
+        if (sub->isErased()) continue;
+        if (auto* atributo = dynamic_cast<zvdb::Attribute*>(sub))
+            lido.atributos.push_back({atributo->tag(), atributo->textValue(), Id(atributo)});
+    }
+    return true;
+}

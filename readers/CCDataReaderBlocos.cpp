@@ -1,0 +1,277 @@
+// The reading of a symbol: its attributes, key, catalogue data, circuit, position, layer and
+// layout, gathered in one visit of the drawing and joined to the item in one merge.
+#include "CCDataReader.h"
+
+#include "CEAtributo.h"
+#include "CEListaAtributos.h"
+
+#include <algorithm>
+#include <cmath>
+
+namespace {
+
+// Memories of texts seen in the drawing start over past this size: a drawing that makes up
+// texts keeps them bounded.
+constexpr std::size_t kMaxTextos = std::size_t(1) << 16;
+
+const QLatin1String kPalavrasConexao[] = {QLatin1String("LIGACAO"), QLatin1String("CONNECTION"),
+                                          QLatin1String("CONEXION")};
+
+QString Texto(std::string_view texto) {
+    return QString::fromUtf8(texto.data(), int(texto.size()));
+}
+
+template <class Mapa>
+void Limita(Mapa& mapa) {
+    if (mapa.size() >= kMaxTextos) mapa.clear();
+}
+
+}  // namespace
+
+const CCDataReader::ChaveLida& CCDataReader::ChaveDoTexto(std::string_view texto) const {
+    auto it = chaves_.find(texto);
+    if (it != chaves_.end()) return it->second;
+    // The catalogue data the entries point to stays while they do.
+    Limita(chaves_);
+    ChaveLida lida;
+    ZVString(Texto(texto)).DivideEmDois(kSeparador, lida.chave, lida.norma);
+    return chaves_.emplace(std::string(texto), std::move(lida)).first->second;
+}
+
+bool CCDataReader::ChaveENorma(const OdDbObjectId& entidade, QString& chave, QString& norma) const {
+    std::string_view texto;
+    bool temTexto = false;
+    if (!CICad::TextoChave(entidade, texto, temTexto)) return false;
+    if (!temTexto) return true;
+    const ChaveLida& lida = ChaveDoTexto(texto);
+    chave = lida.chave;
+    norma = lida.norma;
+    return true;
+}
+
+CCDataReader::TagLida& CCDataReader::TagDoTexto(std::string_view tag) {
+    auto it = tags_.find(tag);
+    if (it != tags_.end()) return it->second;
+    Limita(tags_);
+    const QString texto = Texto(tag).trimmed();
+    const QString maiusculas = texto.toUpper();
+    const bool ligacao = std::any_of(
+        std::begin(kPalavrasConexao), std::end(kPalavrasConexao),
+        [&maiusculas](QLatin1String palavra) { return maiusculas.startsWith(palavra); });
+    return tags_.emplace(std::string(tag), TagLida{CamposItem::kSemNome, ligacao, texto})
+        .first->second;
+}
+
+const QString& CCDataReader::ValorDoTexto(std::string_view valor) {
+    auto it = valores_.find(valor);
+    if (it != valores_.end()) return it->second;
+    Limita(valores_);
+    return valores_.emplace(std::string(valor), Texto(valor).trimmed()).first->second;
+}
+
+const CCDataReader::LayerLido& CCDataReader::LayerDoNome(std::string_view nome) const {
+    auto it = layers_.find(nome);
+    if (it != layers_.end()) return it->second;
+    LayerLido lido;
+    lido.nome = Texto(nome);
+    const std::pair<QString, QString>& partes = GrupoPagina(lido.nome);
+    lido.grupo = partes.first;
+    lido.pagina = partes.second;
+    return layers_.emplace(std::string(nome), std::move(lido)).first->second;
+}
+
+const QString& CCDataReader::LayerDe(const OdDbObjectId& entidade) const {
+    return LayerDoNome(CICad::NomeLayerUtf8(entidade)).nome;
+}
+
+QString CCDataReader::PosicaoNoPonto(const OdDbObjectId& entidade, const QString& grupo,
+                                     const QString& pagina, const CEPonto& p) const {
+    using zvsdk::ResultBuffer;
+    if (!chamadaPosicao_) {
+        ResultBuffer* chamada = zvsdk::newString(QStringLiteral("BuscarCoordenadas"));
+        ResultBuffer* cauda = chamada->rbnext = zvsdk::newEntity({});
+        cauda = cauda->rbnext = zvsdk::newString(QString());
+        cauda = cauda->rbnext = zvsdk::newString(QString());
+        cauda = cauda->rbnext = zvsdk::newReal(0.0);
+        cauda->rbnext = zvsdk::newReal(0.0);
+        chamadaPosicao_.reset(chamada);
+    }
+    ResultBuffer* no = chamadaPosicao_->rbnext;
+    no->rlname = entidade.entityName();
+    (no = no->rbnext)->rstring = grupo;
+    (no = no->rbnext)->rstring = pagina;
+    (no = no->rbnext)->rreal = p.x;
+    no->rbnext->rreal = p.y;
+    ResultBuffer* resposta = CICad::InvokeChain(chamadaPosicao_.get());
+    const QString texto =
+        resposta && resposta->restype == zvsdk::RTSTR ? resposta->rstring : QStringLiteral("??");
+    CICad::LiberaLista(resposta);
+    return texto;
+}
+
+const CCDataReader::Circuito& CCDataReader::CircuitoDe(bool tem, int numero) {
+    static const Circuito kNenhum;
+    if (!tem) return kNenhum;
+    auto it = circuitos_.constFind(numero);
+    if (it == circuitos_.constEnd()) {
+        Circuito novo;
+        QString terceiro;
+        novo.ok = CICad::GetCircuitoLocalInfo(numero, novo.circuito, novo.painel, terceiro);
+        if (!novo.ok) novo.circuito.clear(), novo.painel.clear();
+        it = circuitos_.insert(numero, novo);
+    }
+    return it.value();
+}
+
+const CCDataReader::CatalogoComp& CCDataReader::DadosCatalogoComp(const QString& chave,
+                                                                  const QString& norma) {
+    auto achado = catalogoComp_.find({chave, norma});
+    if (achado != catalogoComp_.end()) return achado->second;
+    CatalogoComp dados;
+    dados.colunas = catalogo_.ColunasComp(chave);
+    // Each column text is split once for the run, whoever meets it first.
+    for (const QString& coluna : dados.colunas) {
+        auto it = colunasDivididas_.constFind(coluna);
+        if (it == colunasDivididas_.constEnd()) {
+            QString nome, valor;
+            const bool divide = ZVString(coluna).DivideEmDois(kSeparador, nome, valor);
+            it = colunasDivididas_.insert(
+                coluna, {divide && !nome.isEmpty() ? CamposItem::numero(nome) : kSemColuna, valor});
+        }
+        if (it->first != kSemColuna) dados.campos.push_back(*it);
+    }
+    dados.lista = catalogo_.ListaComp(chave, norma);
+    dados.descricao = catalogo_.DescricaoComp(chave);
+    dados.tipo = TextoTipo(catalogo_.TipoComp(chave));
+    dados.material = catalogo_.MaterialSap(chave);
+    return catalogoComp_.emplace(std::pair(chave, norma), std::move(dados)).first->second;
+}
+
+const CCDataReader::ConstantesBloco& CCDataReader::ConstantesDoBloco(const OdDbObjectId& referencia,
+                                                                     std::string_view bloco) {
+    const std::uint64_t versao = CICad::VersaoDesenho(referencia.database());
+    auto it = constantes_.find(bloco);
+    if (it == constantes_.end())
+        it = constantes_.emplace(std::string(bloco), ConstantesBloco{}).first;
+    ConstantesBloco& constantes = it->second;
+    if (constantes.desenho == referencia.database() && constantes.versao == versao &&
+        constantes.desenho)
+        return constantes;
+    constantes.desenho = referencia.database();
+    constantes.versao = versao;
+    constantes.campos.clear();
+    std::unique_ptr<zv::CEListaAtributos> atributos;
+    CICad::GetAtributosConstantes(referencia, atributos);
+    for (int i = 0; atributos && i < atributos->Quantidade(); ++i)
+        constantes.campos.emplace_back(CamposItem::numero((*atributos)[i].GetTag()),
+                                       (*atributos)[i].GetValor());
+    return constantes;
+}
+
+void CCDataReader::JuntaLote(CEItemLista& item) {
+    // By name, and of one name the last written: sorted by name and place, the last of each
+    // run of a name is kept.
+    ordemLote_.clear();
+    for (std::size_t i = 0; i < lote_.size(); ++i)
+        ordemLote_.push_back(std::uint64_t(lote_[i].nome) << 32 | i);
+    std::sort(ordemLote_.begin(), ordemLote_.end());
+    std::size_t n = 0;
+    for (std::size_t i = 0; i < ordemLote_.size(); ++i)
+        if (i + 1 == ordemLote_.size() || (ordemLote_[i + 1] >> 32) != (ordemLote_[i] >> 32))
+            ordemLote_[n++] = ordemLote_[i];
+    item.campos.juntarOrdenados(
+        n, [this](std::size_t j) { return std::uint32_t(ordemLote_[j] >> 32); },
+        [this](std::size_t j) -> QString&& {
+            return std::move(lote_[std::uint32_t(ordemLote_[j])].valor);
+        });
+    lote_.clear();
+}
+
+void CCDataReader::LeBloco(const QString& s, CEItemLista& item, const OdDbObjectId& referencia,
+                           CETemplate* modelo) {
+    Q_UNUSED(modelo);
+    // The names are numbered in the order the fields are written, as when each was set on
+    // the item: the order of the fields in LISP depends on it.
+    CICad::LeituraSimbolo(referencia, simbolo_);
+    const CESimboloLido& lido = simbolo_;
+    const ChaveLida& chave = lido.temTextoChave ? ChaveDoTexto(lido.textoChave) : semChave_;
+    const CatalogoComp& catalogo =
+        chave.catalogo ? *chave.catalogo : DadosCatalogoComp(chave.chave, chave.norma);
+    chave.catalogo = &catalogo;
+    lote_.clear();
+    auto poe = [this](std::uint32_t nome, const QString& valor) { lote_.push_back({nome, valor}); };
+    for (const auto& [nome, valor] : catalogo.campos)
+        poe(CamposItem::numeroComSufixo(nome, s), valor);
+
+    ligacoesLidas_.clear();
+    for (const CESimboloLido::Atributo& atributo : lido.atributos) {
+        TagLida& tag = TagDoTexto(atributo.tag);
+        const QString& valor = ValorDoTexto(atributo.valor);
+        // A name is numbered when first written: under a suffix the whole name only, since
+        // the bare tag may be the field of no item.
+        if (s.isEmpty() && tag.numero == CamposItem::kSemNome)
+            tag.numero = CamposItem::numero(tag.texto);
+        poe(s.isEmpty() ? tag.numero : CamposItem::numero(tag.texto + s), valor);
+        if (tag.ligacao) ligacoesLidas_.push_back({tag.texto, valor, atributo.id});
+    }
+    atributosDe_ = referencia;
+    atributosVersao_ = CICad::VersaoDesenho(referencia.database());
+    if (lido.referencia) {
+        for (const auto& [nome, valor] : ConstantesDoBloco(referencia, lido.bloco).campos)
+            poe(CamposItem::numeroComSufixo(nome, s), valor);
+        if (lido.bloco.starts_with("PIN-")) {
+            const CEListaXData pino = CICad::GetXData(referencia, "ZV_PINO");
+            if (!pino.empty() && pino[0].codigo == 1000)
+                poe(NumeroCampo<"CONECTOR">(s), pino[0].texto);
+        }
+    }
+    poe(NumeroCampo<"HANDLE">(s), ZVString::DeHandle(referencia.handle()));
+    // PAINEL and LOCAL hold the same value: templates use either name.
+    const Circuito& circuito = CircuitoDe(lido.temCircuito, lido.circuito);
+    poe(NumeroCampo<"PAINEL">(s), circuito.painel);
+    poe(NumeroCampo<"LOCAL">(s), circuito.painel);
+    poe(NumeroCampo<"CIRCUITO">(s), circuito.circuito);
+    poe(NumeroCampo<"ZV_LISTA">(s), catalogo.lista);
+    poe(NumeroCampo<"ZV_KEY">(s), chave.chave);
+    poe(NumeroCampo<"DESCRICAO">(s), catalogo.descricao);
+    poe(NumeroCampo<"TP_DESCRI">(s), catalogo.descricao);
+    const LayerLido& layer = LayerDoNome(lido.layer);
+    // A reference's position is its insertion point; anything else is asked the long way.
+    const QString posicao = !lido.referencia        ? Posicao(referencia)
+                            : layer.grupo.isEmpty() ? QStringLiteral("??")
+                                                    : PosicaoNoPonto(referencia, layer.grupo,
+                                                                     layer.pagina, lido.posicao);
+    poe(NumeroCampo<"POSICAO">(s), posicao);
+    poe(NumeroCampo<"LAYER">(s), layer.nome);
+    poe(NumeroCampo<"GRUPO">(s), layer.grupo);
+    poe(NumeroCampo<"PAGINA">(s), layer.pagina);
+    poe(NumeroCampo<"COMPONENTTYPE">(s), catalogo.tipo);
+    // QTD as the item has it so far: the last written here, or the item's own.
+    const std::uint32_t qtd = NumeroCampo<"QTD">(s);
+    const QString* valorQtd = nullptr;
+    for (auto it = lote_.rbegin(); it != lote_.rend() && !valorQtd; ++it)
+        if (it->nome == qtd) valorQtd = &it->valor;
+    if (!valorQtd) valorQtd = item.campos.procura(qtd);
+    if (!valorQtd || valorQtd->isEmpty()) poe(qtd, QStringLiteral("1"));
+    poe(NumeroCampo<"SAP_MATERIAL">(s), catalogo.material);
+    QString orientacao = QStringLiteral("0");
+    if (lido.temLayout) {
+        const CEListaXData layout = CICad::GetXData(referencia, "KVR_LAYOUT_ESQUEMA");
+        for (size_t indice : {size_t(0), size_t(2)}) {
+            if (indice >= layout.size()) continue;
+            const OdDbObjectId ref = CICad::IdDoHandle(layout[indice].texto, referencia.database());
+            if (!CICad::EhReferencia(ref)) continue;
+            const CEPonto p = CICad::GetPosicao(ref);
+            poe(NumeroCampo<"LAYOUTPOSITIONX">(s), QString::number(qint64(std::trunc(p.x))));
+            poe(NumeroCampo<"LAYOUTPOSITIONY">(s), QString::number(qint64(std::trunc(p.y))));
+            break;
+        }
+        if (!layout.empty() && layout[0].codigo == 1000) {
+            const OdDbObjectId ref = CICad::IdDoHandle(layout[0].texto, referencia.database());
+            if (CICad::EhReferencia(ref))
+                orientacao = ZVString::DeReal(CICad::GetRotacao(ref) * 180.0 / M_PI);
+        }
+    }
+    poe(NumeroCampo<"ORIENTACAO">(s), orientacao);
+    JuntaLote(item);
+}

@@ -1,0 +1,206 @@
+// The reading of a symbol into an item's fields: attributes, constants, key, catalogue data,
+// circuit, position and layer, and what the reader keeps of them for the run following a
+// change of the drawing, of the symbol's key or of the catalogue.
+#include "ReaderFixture.h"
+#include "readers/CEAtributo.h"
+#include "readers/LeitorBase.h"
+#include "readers/ZVString.h"
+#include "sample/XDataItems.h"
+
+#include <memory>
+
+namespace {
+
+class BlockReadingTest : public ReaderFixture {
+protected:
+    void SetUp() override {
+        ReaderFixture::SetUp();
+        // The position shows the point it was asked at.
+        ASSERT_TRUE(
+            lisp("(defun BuscarCoordenadas (e g p x y) (strcat g \"/\" p \":\" "
+                 "(rtos x 2 1) \";\" (rtos y 2 1)))"));
+    }
+    bool lisp(const QString& texto) { return CICad::AvaliaLisp(texto); }
+    QString handle(const OdDbObjectId& id) { return ZVString::DeHandle(id.handle()); }
+    zvdb::BlockReference* ref(const OdDbObjectId& id) {
+        return dynamic_cast<zvdb::BlockReference*>(db().objectByHandle(id.handle()));
+    }
+    CEItemLista Le(CCDataReader& leitor, const OdDbObjectId& id, const QString& sufixo = {}) {
+        CEItemLista item;
+        leitor.LeBloco(sufixo, item, id, nullptr);
+        return item;
+    }
+};
+
+}  // namespace
+
+TEST_F(BlockReadingTest, ASymbolGivesItsAttributesKeyCatalogueDataPlaceAndLayer) {
+    const OdDbObjectId k = Simbolo("NA-1", "A1", "ESQ$0001$A",
+                                   {{" REGUA ", " X1 "}, {"NUMERO", "5"}, {"QTD", "3"}}, 40);
+    zvdb::BlockRecord* definicao = db().block("NA-1");
+    definicao->addAttributeDefinition("NUMERO", "n", "C9", {0, 0, 0}, 2.5)
+        ->setInteger(70, 2, "AcDbAttributeDefinition");
+    LeitorBase leitor;
+    const CEItemLista item = Le(leitor, k);
+    // tags and values trimmed; a constant of the block wins over the attribute of its tag
+    EXPECT_EQ(item.valorCampo("REGUA"), "X1");
+    EXPECT_EQ(item.valorCampo("NUMERO"), "C9");
+    EXPECT_EQ(item.valorCampo("QTD"), "3");
+    EXPECT_EQ(item.valorCampo("HANDLE"), handle(k));
+    EXPECT_EQ(item.valorCampo("ZV_KEY"), "A1");
+    EXPECT_EQ(item.valorCampo("ZV_LISTA"), "S");
+    EXPECT_EQ(item.valorCampo("DESCRICAO"), "Owner");
+    EXPECT_EQ(item.valorCampo("TP_DESCRI"), "Owner");
+    EXPECT_EQ(item.valorCampo("POSICAO"), "ESQ/0001:40.0;0.0");
+    EXPECT_EQ(item.valorCampo("LAYER"), "ESQ$0001$A");
+    EXPECT_EQ(item.valorCampo("GRUPO"), "ESQ");
+    EXPECT_EQ(item.valorCampo("PAGINA"), "0001");
+    EXPECT_EQ(item.valorCampo("ORIENTACAO"), "0");
+    EXPECT_TRUE(item.temCampo("PAINEL"));
+    EXPECT_TRUE(item.temCampo("SAP_MATERIAL"));
+    EXPECT_FALSE(item.temCampo("LAYOUTPOSITIONX"));
+    // Under a suffix: the same fields, renamed, and a QTD the item had stays unless empty.
+    CEItemLista lado;
+    lado.definirCampo("QTD_INI", "7");
+    leitor.LeBloco("_INI", lado, k, nullptr);
+    EXPECT_EQ(lado.valorCampo("REGUA_INI"), "X1");
+    EXPECT_EQ(lado.valorCampo("QTD_INI"), "3");
+    EXPECT_FALSE(lado.temCampo("REGUA"));
+    const OdDbObjectId sem = Simbolo("NA-1", "B3", "OUTRO", {{"QTD", ""}});
+    CEItemLista semQtd;
+    leitor.LeBloco("_FIM", semQtd, sem, nullptr);
+    EXPECT_EQ(semQtd.valorCampo("QTD_FIM"), "1");
+    EXPECT_EQ(semQtd.valorCampo("POSICAO_FIM"), "??");  // no page: no position asked
+    EXPECT_EQ(semQtd.valorCampo("GRUPO_FIM"), "");
+    EXPECT_EQ(semQtd.valorCampo("DESCRICAO_FIM"), "Three of them");
+}
+
+TEST_F(BlockReadingTest, AttributesChangedInLispAreReadAgain) {
+    const OdDbObjectId k =
+        Simbolo("NA-1", "A1", "ESQ$0001$A", {{"REGUA", "X1"}, {"LIGACAO1", "A1"}});
+    const OdDbObjectId q =
+        Simbolo("NA-1", "A1", "ESQ$0001$A", {{"REGUA", "X1"}, {"LIGACAO1", "A1"}});
+    LeitorBase leitor;
+    EXPECT_EQ(Le(leitor, k).valorCampo("REGUA"), "X1");
+    // the first attribute of k gets a new value through LISP; q keeps the old one
+    ASSERT_TRUE(lisp("(setq ea (entget (entnext (handent \"" + handle(k) +
+                     "\")))) (entmod (subst (cons 1 \" X7 \") (assoc 1 ea) ea))"));
+    EXPECT_EQ(Le(leitor, k).valorCampo("REGUA"), "X7");
+    EXPECT_EQ(Le(leitor, q).valorCampo("REGUA"), "X1");
+    // a tag renamed becomes another field
+    ASSERT_TRUE(lisp("(setq ea (entget (entnext (handent \"" + handle(q) +
+                     "\")))) (entmod (subst (cons 2 \"BORNE\") (assoc 2 ea) ea))"));
+    const CEItemLista renomeado = Le(leitor, q);
+    EXPECT_FALSE(renomeado.temCampo("REGUA"));
+    EXPECT_EQ(renomeado.valorCampo("BORNE"), "X1");
+    // The connection attribute of the symbol just read, changed before it is asked for.
+    Le(leitor, k);
+    ref(k)->attribute("LIGACAO1")->setTextValue("B2");
+    const std::unique_ptr<zv::CEAtributo> ligacao = leitor.AtributoConexaoProximo(k, {0, 0, 0});
+    ASSERT_TRUE(ligacao);
+    EXPECT_EQ(ligacao->GetValor(), "B2");
+}
+
+TEST_F(BlockReadingTest, TheConnectionAttributesOfTheSymbolJustReadAreCopiedWhole) {
+    const OdDbObjectId k = Simbolo("NA-1", "A1", "ESQ$0001$A",
+                                   {{"REGUA", "X1"}, {" ligacao1 ", " A1 "}, {"CONEXION2", "A2"}});
+    ref(k)->attribute("CONEXION2")->setInteger(70, 1, "AcDbAttribute");
+    LeitorBase leitor;
+    Le(leitor, k);
+    // attributes placed at y -2, -4 and -6
+    const std::unique_ptr<zv::CEAtributo> primeira = leitor.AtributoConexaoProximo(k, {0, -4, 0});
+    ASSERT_TRUE(primeira);
+    EXPECT_EQ(primeira->GetTag(), "ligacao1");
+    EXPECT_EQ(primeira->GetValor(), "A1");
+    EXPECT_FALSE(primeira->IsInvisivel());
+    const std::unique_ptr<zv::CEAtributo> segunda = leitor.AtributoConexaoProximo(k, {0, -7, 0});
+    ASSERT_TRUE(segunda);
+    EXPECT_EQ(segunda->GetTag(), "CONEXION2");
+    EXPECT_TRUE(segunda->IsInvisivel());
+    EXPECT_FALSE(segunda->GetId().isNull());
+    EXPECT_EQ(segunda->GetId(), OdDbObjectId(&db(), ref(k)->attribute("CONEXION2")->handle()));
+}
+
+TEST_F(BlockReadingTest, AMovedSymbolIsAskedItsPositionAtItsNewPoint) {
+    const OdDbObjectId k = Simbolo("NA-1", "A1", "ESQ$0001$A", {}, 10);
+    LeitorBase leitor;
+    EXPECT_EQ(Le(leitor, k).valorCampo("POSICAO"), "ESQ/0001:10.0;0.0");
+    ASSERT_TRUE(lisp("(setq e (entget (handent \"" + handle(k) +
+                     "\"))) (entmod (subst '(10 25.0 30.0 0.0) (assoc 10 e) e))"));
+    EXPECT_EQ(Le(leitor, k).valorCampo("POSICAO"), "ESQ/0001:25.0;30.0");
+    // moved to another page
+    db().createLayer("ESQ$0002$A");
+    ASSERT_TRUE(lisp("(setq e (entget (handent \"" + handle(k) +
+                     "\"))) (entmod (subst '(8 . \"ESQ$0002$A\") (assoc 8 e) e))"));
+    const CEItemLista item = Le(leitor, k);
+    EXPECT_EQ(item.valorCampo("POSICAO"), "ESQ/0002:25.0;30.0");
+    EXPECT_EQ(item.valorCampo("PAGINA"), "0002");
+}
+
+TEST_F(BlockReadingTest, ANewKeyOnTheSymbolBringsItsOwnCatalogueData) {
+    const OdDbObjectId k = Simbolo("NA-1", "A1", "ESQ$0001$A");
+    LeitorBase leitor;
+    EXPECT_EQ(Le(leitor, k).valorCampo("DESCRICAO"), "Owner");
+    CICad::SetXData(k, "KVR_ZV", {{1000, QString("NL") + QChar(0x0C) + "1"}});
+    const CEItemLista item = Le(leitor, k);
+    EXPECT_EQ(item.valorCampo("ZV_KEY"), "NL");
+    EXPECT_EQ(item.valorCampo("DESCRICAO"), "Not listed");
+    EXPECT_EQ(item.valorCampo("ZV_LISTA"), "N");
+    EXPECT_EQ(leitor.ChaveDaEntidade(k), "NL");
+    EXPECT_EQ(leitor.NormaDaEntidade(k), "1");
+    // the same key under another standard is another catalogue question
+    CICad::SetXData(k, "KVR_ZV", {{1000, QString("NL") + QChar(0x0C) + "2"}});
+    EXPECT_EQ(Le(leitor, k).valorCampo("ZV_LISTA"), "");
+    // no key text: no key, the component's message for no description
+    CICad::SetXData(k, "KVR_ZV", {{1070, "3"}});
+    const CEItemLista semChave = Le(leitor, k);
+    EXPECT_EQ(semChave.valorCampo("ZV_KEY"), "");
+    EXPECT_EQ(leitor.ChaveDaEntidade(k), "");
+}
+
+TEST_F(BlockReadingTest, ACatalogueChangedBetweenRunsIsSeenByTheNextReader) {
+    const OdDbObjectId k = Simbolo("NA-1", "SO", "ESQ$0001$A");
+    {
+        LeitorBase leitor;
+        EXPECT_EQ(Le(leitor, k).valorCampo("DESCRICAO"), "Symbol own");
+    }
+    ASSERT_TRUE(CEConexaoCatalogo::ObterCatalogo()->Executar(
+        "update BDMENUS set MENU_DESCR = 'Renamed' where MENU_KEY = 'SO'"));
+    ASSERT_TRUE(CEConexaoCatalogo::ObterCatalogo()->Executar(
+        "update BDZV set ZV_LISTA = 'n' where ZV_KEY = 'SO'"));
+    LeitorBase leitor;
+    const CEItemLista item = Le(leitor, k);
+    EXPECT_EQ(item.valorCampo("DESCRICAO"), "Renamed");
+    EXPECT_EQ(item.valorCampo("ZV_LISTA"), "N");
+}
+
+TEST_F(BlockReadingTest, AfterTheReadsAreGivenBackTheSameFieldsAreReadAgain) {
+    const OdDbObjectId k = Simbolo("NA-1", "A1", "ESQ$0001$A", {{"REGUA", "X1"}});
+    LeitorBase leitor;
+    const CEItemLista antes = Le(leitor, k);
+    leitor.LiberaLeituras();
+    const CEItemLista depois = Le(leitor, k);
+    EXPECT_EQ(depois.campos.keys(), antes.campos.keys());
+    EXPECT_EQ(depois.campos.values(), antes.campos.values());
+    EXPECT_EQ(depois.valorCampo("DESCRICAO"), "Owner");
+}
+
+// Fields get their names' numbers in the order they are written: LISP sees an item's fields
+// in that order.
+TEST_F(BlockReadingTest, NewFieldNamesAreNumberedInTheOrderOfWriting) {
+    const QString marca = QString::number(quintptr(this), 16).toUpper();
+    const QString a = "ZZ_" + marca + "_A", b = "AA_" + marca + "_B";
+    const OdDbObjectId k = Simbolo("NA-1", "A1", "ESQ$0001$A", {{a, "1"}, {b, "2"}});
+    ASSERT_EQ(CamposItem::numeroSeHouver(a), CamposItem::kSemNome);
+    LeitorBase leitor;
+    const CEItemLista item = Le(leitor, k);
+    EXPECT_LT(CamposItem::numeroSeHouver(a), CamposItem::numeroSeHouver(b));
+    EXPECT_LT(item.campos.keys().indexOf(a), item.campos.keys().indexOf(b));
+    // Under a suffix only the whole names are made.
+    const QString c = "CC_" + marca;
+    const OdDbObjectId q = Simbolo("NA-1", "A1", "ESQ$0001$A", {{c, "3"}});
+    CEItemLista lado;
+    leitor.LeBloco("_FIM", lado, q, nullptr);
+    EXPECT_EQ(lado.valorCampo(c + "_FIM"), "3");
+    EXPECT_EQ(CamposItem::numeroSeHouver(c), CamposItem::kSemNome);
+}
