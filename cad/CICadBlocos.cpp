@@ -3,6 +3,7 @@
 #include "app/DrawingFiles.h"
 
 #include "drawing/Attribute.h"
+#include "drawing/AttributeLayout.h"
 #include "drawing/BlockRecord.h"
 #include "drawing/BlockReference.h"
 #include "drawing/DeepCloner.h"
@@ -15,9 +16,13 @@
 #include <QRandomGenerator>
 
 #include <cmath>
+#include <cstdint>
 #include <exception>
+#include <optional>
 #include <string>
+#include <string_view>
 #include <unordered_map>
+#include <vector>
 
 using namespace cicad;
 
@@ -72,6 +77,23 @@ zvdb::BlockRecord* InsereComoBloco(zvdb::Database& db, const zvdb::Database& lad
             entidade->moveBy(zvdb::Point3{} - origem);
     bloco->setBasePoint({});
     return bloco;
+}
+
+// A definition's tag and default value as the values are asked for with them (trimmed), made
+// once per layout instead of once per reference.
+struct TextosDefinicao {
+    QString tag, padrao;
+};
+
+const TextosDefinicao& Textos(const zvdb::AttributeLayout& leitura) {
+    // By the layout's serial, which no other layout shares: drawings that come and go leave
+    // theirs behind, so the table starts again when it grows large.
+    static std::unordered_map<std::uint64_t, TextosDefinicao> porLeitura;
+    const auto conhecido = porLeitura.find(leitura.serial());
+    if (conhecido != porLeitura.end()) return conhecido->second;
+    if (porLeitura.size() >= 4096) porLeitura.clear();
+    return porLeitura[leitura.serial()] = {Q(leitura.tag()).trimmed(),
+                                           Q(leitura.defaultValue()).trimmed()};
 }
 
 }  // namespace
@@ -170,12 +192,25 @@ OdDbObjectId CICad::InsereBloco(const QString& arquivo, const QString& nome, con
     const double graus = Simples(rotacao) * 180.0 / M_PI;
     zvdb::BlockReference* ref =
         modelo->addBlockReference(*definicao, ponto, {1, 1, 1}, graus, U8(layer));
-    // Its attributes placed from the values just given, not from its tags read back.
+    // Its attributes placed from the values just given, not from its tags read back, each
+    // made with its value instead of being found and set again.
     try {
-        AtributosNovos novos;
-        PreparaAtributos(*db, *definicao, valores, novos);
-        ref->addAttributesFromDefinitions(*definicao, ponto, {1, 1, 1}, graus, novos.definicoes,
-                                          novos.dados);
+        const auto leituras = db->attributeLayouts().variableLayouts(*db, *definicao);
+        std::vector<std::optional<std::string_view>> dados;
+        std::vector<std::string> textos;  // what `dados` points into
+        if (valores) {
+            dados.reserve(leituras.size());
+            textos.reserve(leituras.size());
+            for (const zvdb::AttributeLayout* leitura : leituras) {
+                const TextosDefinicao& textosDef = Textos(*leitura);
+                const std::optional<QString> valor = valores(textosDef.tag, textosDef.padrao);
+                dados.emplace_back();
+                if (!valor) continue;
+                textos.push_back(U8(*valor));
+                dados.back() = textos.back();
+            }
+        }
+        ref->addAttributesFromLayouts(*definicao, ponto, {1, 1, 1}, graus, leituras, dados);
     } catch (const std::exception& erro) {
         Log("CICAd::CriarAtributos: " + QString::fromUtf8(erro.what()));
     }

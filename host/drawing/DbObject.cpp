@@ -24,15 +24,46 @@ DbObject::DbObject(Database& database, std::span<const Tag> tags, std::uint64_t 
       handle_(handle),
       owner_(owner) {}
 
+DbObject::DbObject(Database& database, const TagPattern::Values& values, std::uint64_t handle,
+                   std::uint64_t owner)
+    : database_(&database),
+      pattern_(&values),
+      owned_(true),
+      patterned_(true),
+      handle_(handle),
+      owner_(owner) {}
+
 DbObject::~DbObject() = default;
 
 std::span<const Tag> DbObject::tags() const {
-    if (owned_) return own_;
+    if (owned_) {
+        // Asking for the tags is no change: a patterned object only puts together what its
+        // pattern and values say, once.
+        if (patterned_) [[unlikely]]
+            const_cast<DbObject*>(this)->expand();
+        return own_;
+    }
     return {fileTags_, fileCount_};
 }
 
-std::vector<Tag>& DbObject::editTags() {
+void DbObject::expand() {
+    if (!patterned_) return;
+    own_ = pattern_->pattern->expand(pattern_->values(), handle_, owner_, database_->arena());
+    patterned_ = false;
+    pattern_ = nullptr;
+}
+
+void DbObject::noteEdit() {
     database_->noteChange();
+    if (watched_) {
+        watched_ = false;
+        database_->forgetLayout(*this);
+    }
+}
+
+std::vector<Tag>& DbObject::editTags() {
+    noteEdit();
+    expand();
     if (!owned_) {
         own_.assign(fileTags_, fileTags_ + fileCount_);
         owned_ = true;
@@ -43,7 +74,8 @@ std::vector<Tag>& DbObject::editTags() {
 }
 
 void DbObject::takeTags(std::vector<Tag> tags) {
-    database_->noteChange();
+    noteEdit();
+    patterned_ = false;
     own_ = std::move(tags);
     owned_ = true;
     fileTags_ = nullptr;
@@ -56,6 +88,7 @@ std::string_view DbObject::store(std::string_view text) const {
 }
 
 std::string_view DbObject::type() const {
+    if (patterned_) return pattern_->pattern->type();
     const auto all = tags();
     return all.empty() ? std::string_view() : all[0].value;
 }
@@ -202,7 +235,8 @@ std::size_t DbObject::subclassEnd(std::string_view subclass) const {
 }
 
 Tag& DbObject::tagForValue(std::size_t index) {
-    database_->noteChange();
+    noteEdit();
+    expand();
     // The tags outside own_ are this object's alone (its range of the file's tag list or of
     // the arena), so a value changes there without a copy of the list.
     return owned_ ? own_[index] : const_cast<Tag*>(fileTags_)[index];
