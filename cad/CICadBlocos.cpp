@@ -190,14 +190,15 @@ OdDbObjectId CICad::InsereBloco(const QString& arquivo, const QString& nome, con
     // Insertion points and rotations go through single precision on purpose.
     const zvdb::Point3 ponto{Simples(x), Simples(y), Simples(z)};
     const double graus = Simples(rotacao) * 180.0 / M_PI;
-    zvdb::BlockReference* ref =
-        modelo->addBlockReference(*definicao, ponto, {1, 1, 1}, graus, U8(layer));
-    // Its attributes placed from the values just given, not from its tags read back, each
-    // made with its value instead of being found and set again.
+    // The block's variable definitions and the values given for them come first: the
+    // reference is then made marked for its attributes, and each attribute with its value,
+    // placed from the values just given, instead of being found and set again.
+    std::vector<zvdb::AttributeLayout*> leituras;
+    std::vector<std::optional<std::string_view>> dados;
+    std::vector<std::string> textos;  // what `dados` points into
     try {
-        const auto leituras = db->attributeLayouts().variableLayouts(*db, *definicao);
-        std::vector<std::optional<std::string_view>> dados;
-        std::vector<std::string> textos;  // what `dados` points into
+        const auto variaveis = db->attributeLayouts().variableLayouts(*db, *definicao);
+        leituras.assign(variaveis.begin(), variaveis.end());
         if (valores) {
             dados.reserve(leituras.size());
             textos.reserve(leituras.size());
@@ -210,6 +211,14 @@ OdDbObjectId CICad::InsereBloco(const QString& arquivo, const QString& nome, con
                 dados.back() = textos.back();
             }
         }
+    } catch (const std::exception& erro) {
+        Log("CICAd::CriarAtributos: " + QString::fromUtf8(erro.what()));
+        leituras.clear();
+        dados.clear();
+    }
+    zvdb::BlockReference* ref = db->addBlockReference(*modelo, *definicao, ponto, {1, 1, 1}, graus,
+                                                      U8(layer), !leituras.empty());
+    try {
         ref->addAttributesFromLayouts(*definicao, ponto, {1, 1, 1}, graus, leituras, dados);
     } catch (const std::exception& erro) {
         Log("CICAd::CriarAtributos: " + QString::fromUtf8(erro.what()));

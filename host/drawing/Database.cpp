@@ -383,7 +383,8 @@ Entity* Database::addEntity(BlockRecord& block, std::string_view type, const std
 
 BlockReference* Database::addBlockReference(BlockRecord& owner, const BlockRecord& block,
                                             const Point3& position, const Point3& scale,
-                                            double rotationDegrees, std::string_view layer) {
+                                            double rotationDegrees, std::string_view layer,
+                                            bool attributesFollow) {
     // The tags that making an INSERT through its builder gives, put straight in place: the
     // coordinates' texts are shared with the attributes placed by them.
     AttributeLayouts& reals = attributeLayouts();
@@ -393,6 +394,7 @@ BlockReference* Database::addBlockReference(BlockRecord& owner, const BlockRecor
                               (scale.y != 1.0 ? 1 : 0) + (scale.z != 1.0 ? 1 : 0) +
                               (rotationDegrees != 0.0 ? 1 : 0);
     std::vector<Tag> tags;
+    // The mark that attributes follow takes its room from what the setters get, as before.
     tags.reserve(count + kSettersSlack);
     tags.push_back(Tag{0, "INSERT"});
     tags.push_back(Tag{5, handleText(arena_, handle)});
@@ -410,6 +412,7 @@ BlockReference* Database::addBlockReference(BlockRecord& owner, const BlockRecor
     if (scale.y != 1.0) tags.push_back(Tag{42, reals.real(*this, scale.y)});
     if (scale.z != 1.0) tags.push_back(Tag{43, reals.real(*this, scale.z)});
     if (rotationDegrees != 0.0) tags.push_back(Tag{50, reals.real(*this, rotationDegrees)});
+    if (attributesFollow) tags.push_back(Tag{66, "1"});
     auto reference =
         std::make_unique<BlockReference>(*this, std::span<const Tag>(), handle, owner.handle());
     reference->own_ = std::move(tags);

@@ -119,10 +119,12 @@ public:
     // Building blocks for the typed classes -----------------------------------------------
     // A new entity at the end of `block`: `body` holds the tags after the entity's common
     // ones (its subclass marker first).
-    // A reference to `block` at the end of `owner`, without attributes.
+    // A reference to `block` at the end of `owner`, without attributes; `attributesFollow`
+    // marks it (66) as the first attribute added would.
     BlockReference* addBlockReference(BlockRecord& owner, const BlockRecord& block,
                                       const Point3& position, const Point3& scale,
-                                      double rotationDegrees, std::string_view layer);
+                                      double rotationDegrees, std::string_view layer,
+                                      bool attributesFollow = false);
     Entity* addEntity(BlockRecord& block, std::string_view type, const std::vector<Tag>& body,
                       std::string_view layer);
     // `stored`: the body's values are already held by this database (they are not copied).

@@ -266,3 +266,25 @@ TEST(TagPatterns, HolesAndIdentityAreFilledInOrder) {
     EXPECT_THROW(TagPattern(std::vector<Tag>{Tag{0, "X"}, Tag{1001, "APP"}}), std::logic_error);
     EXPECT_THROW(TagPattern::hole(TagPattern::kMaxHoles), std::logic_error);
 }
+
+TEST(PatternedObjects, AReferenceMadeForItsAttributesIsMarkedAsTheFirstAttributeWouldMarkIt) {
+    Database db;
+    BlockRecord* block = sampleBlock(db);
+    for (const bool paper : {false, true})
+        for (const double degrees : {0.0, 12.5}) {
+            BlockRecord* owner = paper ? db.paperSpace() : db.modelSpace();
+            const Point3 at{4, -2, 0}, scale{1, 3, 1};
+            const auto layouts = db.attributeLayouts().variableLayouts(db, *block);
+            BlockReference* later = owner->addBlockReference(*block, at, scale, degrees, "PAGE");
+            later->addAttributesFromLayouts(*block, at, scale, degrees, layouts, {});
+            BlockReference* marked =
+                db.addBlockReference(*owner, *block, at, scale, degrees, "PAGE", true);
+            EXPECT_EQ(marked->integer(66), 1);
+            marked->addAttributesFromLayouts(*block, at, scale, degrees, layouts, {});
+            std::vector<std::string> expected = lines(*later);
+            expected[1] = "5 " + TagValues::fromHandle(marked->handle());
+            EXPECT_EQ(lines(*marked), expected);
+            EXPECT_EQ(marked->attributes().size(), 4u);
+            EXPECT_EQ(marked->tags().back(), (Tag{66, "1"})) << "at the end of its subclass";
+        }
+}
