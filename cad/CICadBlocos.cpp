@@ -194,10 +194,11 @@ OdDbObjectId CICad::InsereBloco(const QString& arquivo, const QString& nome, con
     // reference is then made marked for its attributes, and each attribute with its value,
     // placed from the values just given, instead of being found and set again.
     std::vector<zvdb::AttributeLayout*> leituras;
+    zvdb::Point3 base;
     std::vector<std::optional<std::string_view>> dados;
     std::vector<std::string> textos;  // what `dados` points into
     try {
-        const auto variaveis = db->attributeLayouts().variableLayouts(*db, *definicao);
+        const auto variaveis = db->attributeLayouts().variableLayouts(*db, *definicao, &base);
         leituras.assign(variaveis.begin(), variaveis.end());
         if (valores) {
             dados.reserve(leituras.size());
@@ -219,7 +220,7 @@ OdDbObjectId CICad::InsereBloco(const QString& arquivo, const QString& nome, con
     zvdb::BlockReference* ref = db->addBlockReference(*modelo, *definicao, ponto, {1, 1, 1}, graus,
                                                       U8(layer), !leituras.empty());
     try {
-        ref->addAttributesFromLayouts(*definicao, ponto, {1, 1, 1}, graus, leituras, dados);
+        ref->addAttributesFromLayouts(base, ponto, {1, 1, 1}, graus, leituras, dados);
     } catch (const std::exception& erro) {
         Log("CICAd::CriarAtributos: " + QString::fromUtf8(erro.what()));
     }

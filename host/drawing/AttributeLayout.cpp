@@ -3,6 +3,7 @@
 #include "Attribute.h"
 #include "BlockRecord.h"
 #include "Database.h"
+#include "Entity.h"
 #include "TagList.h"
 #include "TagValues.h"
 
@@ -208,23 +209,27 @@ AttributeLayout& AttributeLayouts::layout(Database& target, const Attribute& def
     return *known;
 }
 
-void AttributeLayouts::forget(const DbObject& definition) {
-    const auto known = byDefinition_.find(&definition);
+void AttributeLayouts::forget(const DbObject& object) {
+    plans_.clear();
+    const auto known = byDefinition_.find(&object);
     if (known == byDefinition_.end()) return;
     retired_.push_back(std::move(known->second));
     byDefinition_.erase(known);
-    plans_.clear();
 }
 
 std::span<AttributeLayout* const> AttributeLayouts::variableLayouts(Database& target,
-                                                                    const BlockRecord& block) {
+                                                                    const BlockRecord& block,
+                                                                    Point3* basePoint) {
     if (&block.database() != &target)
         throw std::invalid_argument("the block of a new reference is one of its own drawing");
     BlockPlan& plan = plans_[&block];
     bool current = plan.entities != 0 && plan.entities == block.entitiesMade();
     for (std::size_t i = 0; current && i < plan.definitions.size(); ++i)
         current = !plan.definitions[i]->isErased();
-    if (current) return plan.variable;
+    if (current) {
+        if (basePoint) *basePoint = plan.basePoint;
+        return plan.variable;
+    }
     plan.definitions.clear();
     plan.variable.clear();
     for (Attribute* definition : block.attributeDefinitions()) {
@@ -233,6 +238,10 @@ std::span<AttributeLayout* const> AttributeLayouts::variableLayouts(Database& ta
         if (!made.isConstant()) plan.variable.push_back(&made);
     }
     plan.entities = block.entitiesMade();
+    // The base point is read from the block's BLOCK entity, watched as the definitions are.
+    plan.basePoint = block.basePoint();
+    if (const Entity* begin = block.blockBegin()) begin->watchForLayouts();
+    if (basePoint) *basePoint = plan.basePoint;
     return plan.variable;
 }
 

@@ -96,12 +96,15 @@ public:
     // The layout of `definition`, made or remade when needed. Definitions of another drawing
     // get a layout of their own each time (their objects may go away meanwhile).
     AttributeLayout& layout(Database& target, const Attribute& definition);
-    // The definition's tags changed: its layout is made again when next asked for.
-    void forget(const DbObject& definition);
+    // A definition's tags changed (its layout is made again when next asked for), or a
+    // block's base point.
+    void forget(const DbObject& object);
     // The layouts of the block's definitions that are not constant, in order: what a new
     // reference of the block takes. Worked out once while the block has the same entities
-    // and its definitions the same tags. The block is one of `target`.
-    std::span<AttributeLayout* const> variableLayouts(Database& target, const BlockRecord& block);
+    // and its definitions the same tags. The block is one of `target`; `basePoint`, when
+    // given, takes its base point.
+    std::span<AttributeLayout* const> variableLayouts(Database& target, const BlockRecord& block,
+                                                      Point3* basePoint = nullptr);
     // A real as tag text, answered from the values given lately when it is one of them.
     std::string_view real(Database& target, double value);
     // The SEQEND that closes a reference's attributes: its layer is the one hole.
@@ -115,6 +118,7 @@ private:
     std::unique_ptr<TagPattern> seqends_[2];
     struct BlockPlan {
         std::size_t entities = 0;
+        Point3 basePoint;
         std::vector<const Attribute*> definitions;  // every definition, constant ones too
         std::vector<AttributeLayout*> variable;
     };

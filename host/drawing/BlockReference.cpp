@@ -140,14 +140,14 @@ std::vector<Attribute*> BlockReference::addAttributesFromDefinitions(
 }
 
 std::vector<Attribute*> BlockReference::addAttributesFromLayouts(
-    const BlockRecord& block, const Point3& position, const Point3& scale, double rotationDegrees,
+    const Point3& basePoint, const Point3& position, const Point3& scale, double rotationDegrees,
     std::span<AttributeLayout* const> layouts,
     std::span<const std::optional<std::string_view>> values) {
     if (layouts.empty()) return {};
     const double rotation = rotationDegrees != 0.0 ? rotationDegrees : 0.0;
-    return database().addAttributesFromLayouts(
-        *this, layouts, values, transformOf(block.basePoint(), position, scale, rotation),
-        std::abs(scale.y), rotation);
+    return database().addAttributesFromLayouts(*this, layouts, values,
+                                               transformOf(basePoint, position, scale, rotation),
+                                               std::abs(scale.y), rotation);
 }
 
 }  // namespace zvdb

@@ -532,6 +532,9 @@ std::vector<Attribute*> Database::addAttributesFromLayouts(
     std::vector<Attribute*> made;
     if (layouts.empty()) return made;
     made.reserve(layouts.size());
+    // The reference's list of attributes at its size at once.
+    std::vector<Entity*>& subs = reference.children().subs;
+    subs.reserve(subs.size() + layouts.size());
     AttributeLayout::Placement where{placement, heightScale, rotation, reference.inPaperSpace(),
                                      {},        {}};
     for (std::size_t i = 0; i < layouts.size(); ++i) {

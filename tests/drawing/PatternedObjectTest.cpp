@@ -67,9 +67,10 @@ Made insert(Database& db, BlockRecord& block, const Point3& at, const Point3& sc
             bool paper, const std::vector<std::optional<std::string_view>>& values) {
     BlockRecord* owner = paper ? db.paperSpace() : db.modelSpace();
     BlockReference* reference = owner->addBlockReference(block, at, scale, degrees, "PAGE");
-    const auto layouts = db.attributeLayouts().variableLayouts(db, block);
+    Point3 base;
+    const auto layouts = db.attributeLayouts().variableLayouts(db, block, &base);
     return {reference,
-            reference->addAttributesFromLayouts(block, at, scale, degrees, layouts, values)};
+            reference->addAttributesFromLayouts(base, at, scale, degrees, layouts, values)};
 }
 
 void fill(Database& db, BlockRecord& block) {
@@ -276,15 +277,29 @@ TEST(PatternedObjects, AReferenceMadeForItsAttributesIsMarkedAsTheFirstAttribute
             const Point3 at{4, -2, 0}, scale{1, 3, 1};
             const auto layouts = db.attributeLayouts().variableLayouts(db, *block);
             BlockReference* later = owner->addBlockReference(*block, at, scale, degrees, "PAGE");
-            later->addAttributesFromLayouts(*block, at, scale, degrees, layouts, {});
+            later->addAttributesFromLayouts(block->basePoint(), at, scale, degrees, layouts, {});
             BlockReference* marked =
                 db.addBlockReference(*owner, *block, at, scale, degrees, "PAGE", true);
             EXPECT_EQ(marked->integer(66), 1);
-            marked->addAttributesFromLayouts(*block, at, scale, degrees, layouts, {});
+            marked->addAttributesFromLayouts(block->basePoint(), at, scale, degrees, layouts, {});
             std::vector<std::string> expected = lines(*later);
             expected[1] = "5 " + TagValues::fromHandle(marked->handle());
             EXPECT_EQ(lines(*marked), expected);
             EXPECT_EQ(marked->attributes().size(), 4u);
             EXPECT_EQ(marked->tags().back(), (Tag{66, "1"})) << "at the end of its subclass";
         }
+}
+
+TEST(PatternedObjects, ABlockWhoseBasePointMovesPlacesLaterAttributesByTheNewOne) {
+    Database db;
+    BlockRecord* block = sampleBlock(db);
+    const Made before = insert(db, *block, {10, 0, 0}, {1, 1, 1}, 0, false, {});
+    block->setBasePoint({-3, 7, 0});
+    const Made after = insert(db, *block, {10, 0, 0}, {1, 1, 1}, 0, false, {});
+    BlockReference* slow = db.modelSpace()->addBlockReference(*block, {10, 0, 0});
+    const Attribute* first = block->attributeDefinitions()[0];
+    const Attribute* expected = madeStepByStep(*slow, *first);
+    EXPECT_EQ(after.attributes[0]->position(), expected->position());
+    EXPECT_EQ(after.attributes[0]->position(), (Point3{14, -4, 0}));
+    EXPECT_EQ(before.attributes[0]->position(), (Point3{10, 1, 0})) << "made by the old one";
 }
