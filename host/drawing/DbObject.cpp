@@ -62,9 +62,15 @@ void DbObject::noteEdit() {
 }
 
 std::vector<Tag>& DbObject::editTags() {
+    return editTags(0);
+}
+
+std::vector<Tag>& DbObject::editTags(std::size_t more) {
     noteEdit();
     expand();
     if (!owned_) {
+        // Copied once at the size the change needs, not copied and then grown.
+        own_.reserve(fileCount_ + more);
         own_.assign(fileTags_, fileTags_ + fileCount_);
         owned_ = true;
         fileTags_ = nullptr;
@@ -356,18 +362,20 @@ void fitFor(std::vector<Tag>& all, std::size_t more) {
 
 void DbObject::setXData(std::string_view application, std::span<const Tag> items) {
     database_->registerApplication(application);
-    const std::size_t start = xdataStart();
-    auto& all = editTags();
-    std::size_t begin = all.size(), end = all.size();
-    for (std::size_t i = start; i < all.size(); ++i) {
-        if (all[i].code == 1001 && TagValues::sameName(all[i].value, application)) {
+    const auto current = tags();
+    std::size_t begin = current.size(), end = current.size();
+    for (std::size_t i = xdataStart(); i < current.size(); ++i) {
+        if (current[i].code == 1001 && TagValues::sameName(current[i].value, application)) {
             begin = i;
             end = i + 1;
-            while (end < all.size() && all[end].code != 1001)
+            while (end < current.size() && current[end].code != 1001)
                 ++end;
             break;
         }
     }
+    // A file object's tags are copied once, at the size they will have.
+    const std::size_t after = current.size() - (end - begin) + items.size() + 1;
+    auto& all = editTags(after > current.size() ? after - current.size() : 0);
     std::vector<Tag> group;
     group.reserve(items.size() + 1);
     // the same few application names on many objects: one copy each
@@ -382,7 +390,7 @@ void DbObject::setXData(std::string_view application, std::span<const Tag> items
 
 void DbObject::addXData(std::string_view application, std::span<const Tag> items) {
     database_->registerApplication(application);
-    auto& all = editTags();
+    auto& all = editTags(items.size() + 1);
     fitFor(all, items.size() + 1);
     all.push_back(Tag{1001, database_->storeShared(application)});
     for (const Tag& item : items)

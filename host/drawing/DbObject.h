@@ -127,6 +127,8 @@ protected:
     std::size_t appGroupEnd(std::string_view group) const;  // index of its "102 }" or 0
 
 private:
+    // As editTags, with room for `more` tags when the tags are copied.
+    std::vector<Tag>& editTags(std::size_t more);
     void setTagValue(int code, std::string_view value, std::string_view subclass);
     // The tag at `index`, to take a new value where it is.
     Tag& tagForValue(std::size_t index);

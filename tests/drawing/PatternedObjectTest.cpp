@@ -303,3 +303,32 @@ TEST(PatternedObjects, ABlockWhoseBasePointMovesPlacesLaterAttributesByTheNewOne
     EXPECT_EQ(after.attributes[0]->position(), (Point3{14, -4, 0}));
     EXPECT_EQ(before.attributes[0]->position(), (Point3{10, 1, 0})) << "made by the old one";
 }
+
+TEST(ExtendedDataOnFileObjects, AGroupReplacedInPlaceTakesItsRoomOnceAndItsOwnItems) {
+    Database made;
+    BlockRecord* block = made.createBlock("SIMBOLO");
+    BlockReference* symbol = made.modelSpace()->addBlockReference(*block, {1, 2, 0});
+    const Tag first[] = {Tag{1000, "A1"}, Tag{1000, "A2"}};
+    const Tag second[] = {Tag{1000, "B1"}};
+    symbol->setXData("ZV_A", first);
+    symbol->setXData("ZV_B", second);
+    auto loaded = DxfLoader::load(DxfWriter::toText(made));
+    DbObject* read = loaded->objectByHandle(symbol->handle());
+    ASSERT_NE(read, nullptr);
+    const std::size_t before = read->tags().size();
+
+    const Tag longer[] = {Tag{1000, "C1"}, Tag{1070, "7"}, Tag{1000, "C3"}, Tag{1000, "C4"}};
+    read->setXData("ZV_A", longer);
+    EXPECT_EQ(read->tags().size(), before + 2);
+    EXPECT_EQ(read->editTags().capacity(), read->tags().size()) << "copied at its new size";
+    EXPECT_EQ(read->xdataApplications(), (std::vector<std::string_view>{"ZV_A", "ZV_B"}));
+    ASSERT_EQ(read->xdata("ZV_A").size(), 4u);
+    EXPECT_EQ(read->xdata("ZV_A")[1], (Tag{1070, "7"}));
+
+    // Its own items given back, shorter: no stale view of the list it changes.
+    read->setXData("ZV_B", read->xdataItems("ZV_A").first(2));
+    EXPECT_EQ(read->xdata("ZV_B"), (std::vector<Tag>{Tag{1000, "C1"}, Tag{1070, "7"}}));
+    EXPECT_EQ(read->xdata("ZV_A").size(), 4u);
+    auto again = DxfLoader::load(DxfWriter::toText(*loaded));
+    EXPECT_EQ(again->objectByHandle(symbol->handle())->xdata("ZV_B").size(), 2u);
+}
