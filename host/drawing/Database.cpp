@@ -68,6 +68,7 @@ void Database::swapContents(Database& other) {
     warnings_.swap(other.warnings_);
     std::swap(namedObjects_, other.namedObjects_);
     layouts_.swap(other.layouts_);
+    std::swap(lastApplication_, other.lastApplication_);
     for (const auto& object : storage_)
         object->database_ = this;
     for (const auto& object : other.storage_)
@@ -254,8 +255,18 @@ bool Database::isApplicationRegistered(std::string_view application) const {
 }
 
 bool Database::registerApplication(std::string_view application) {
-    if (application.empty() || isApplicationRegistered(application)) return false;
-    return createTableRecord("APPID", application, "AcDbRegAppTableRecord") != nullptr;
+    if (application.empty()) return false;
+    // Objects given extended data name the same application one after another.
+    if (lastApplication_ && !lastApplication_->isErased() &&
+        TagValues::sameName(lastApplication_->text(2), application))
+        return false;
+    SymbolTable* appids = table("APPID");
+    if (DbObject* known = appids ? appids->find(application) : nullptr) {
+        lastApplication_ = known;
+        return false;
+    }
+    lastApplication_ = createTableRecord("APPID", application, "AcDbRegAppTableRecord");
+    return lastApplication_ != nullptr;
 }
 
 // System variables -------------------------------------------------------------------------

@@ -205,6 +205,8 @@ private:
     // Room where new objects' tags are put together before they get their own.
     std::vector<Tag> scratch_;
     std::unique_ptr<AttributeLayouts> layouts_;
+    // The APPID record registerApplication found or made last.
+    DbObject* lastApplication_ = nullptr;
     std::uint64_t changes_ = 0;
     std::uint64_t contentId_ = 0;
 };

@@ -332,3 +332,21 @@ TEST(ExtendedDataOnFileObjects, AGroupReplacedInPlaceTakesItsRoomOnceAndItsOwnIt
     auto again = DxfLoader::load(DxfWriter::toText(*loaded));
     EXPECT_EQ(again->objectByHandle(symbol->handle())->xdata("ZV_B").size(), 2u);
 }
+
+TEST(ExtendedDataOnFileObjects, AnApplicationIsRegisteredOnceAndAgainAfterItsRecordGoes) {
+    Database db;
+    EXPECT_TRUE(db.registerApplication("ZV_APP"));
+    EXPECT_FALSE(db.registerApplication("zv_app")) << "names are compared without case";
+    EXPECT_TRUE(db.registerApplication("ZV_OTHER"));
+    EXPECT_FALSE(db.registerApplication("ZV_APP"));
+    db.table("APPID")->find("ZV_APP")->erase();
+    db.table("APPID")->reindex();
+    EXPECT_FALSE(db.isApplicationRegistered("ZV_APP"));
+    EXPECT_TRUE(db.registerApplication("ZV_APP"));
+    EXPECT_TRUE(db.isApplicationRegistered("ZV_APP"));
+    // A drawing that takes another's content answers from its own table.
+    Database other;
+    db.swapContents(other);
+    EXPECT_TRUE(db.registerApplication("ZV_APP"));
+    EXPECT_FALSE(other.registerApplication("ZV_OTHER"));
+}
