@@ -3,6 +3,7 @@
 #include "app/DrawingFiles.h"
 
 #include "drawing/Attribute.h"
+#include "drawing/AttributeLayout.h"
 #include "drawing/BlockRecord.h"
 #include "drawing/BlockReference.h"
 #include "drawing/DeepCloner.h"
@@ -15,9 +16,13 @@
 #include <QRandomGenerator>
 
 #include <cmath>
+#include <cstdint>
 #include <exception>
+#include <optional>
 #include <string>
+#include <string_view>
 #include <unordered_map>
+#include <vector>
 
 using namespace cicad;
 
@@ -72,6 +77,23 @@ zvdb::BlockRecord* InsereComoBloco(zvdb::Database& db, const zvdb::Database& lad
             entidade->moveBy(zvdb::Point3{} - origem);
     bloco->setBasePoint({});
     return bloco;
+}
+
+// A definition's tag and default value as the values are asked for with them (trimmed), made
+// once per layout instead of once per reference.
+struct TextosDefinicao {
+    QString tag, padrao;
+};
+
+const TextosDefinicao& Textos(const zvdb::AttributeLayout& leitura) {
+    // By the layout's serial, which no other layout shares: drawings that come and go leave
+    // theirs behind, so the table starts again when it grows large.
+    static std::unordered_map<std::uint64_t, TextosDefinicao> porLeitura;
+    const auto conhecido = porLeitura.find(leitura.serial());
+    if (conhecido != porLeitura.end()) return conhecido->second;
+    if (porLeitura.size() >= 4096) porLeitura.clear();
+    return porLeitura[leitura.serial()] = {Q(leitura.tag()).trimmed(),
+                                           Q(leitura.defaultValue()).trimmed()};
 }
 
 }  // namespace
@@ -168,14 +190,37 @@ OdDbObjectId CICad::InsereBloco(const QString& arquivo, const QString& nome, con
     // Insertion points and rotations go through single precision on purpose.
     const zvdb::Point3 ponto{Simples(x), Simples(y), Simples(z)};
     const double graus = Simples(rotacao) * 180.0 / M_PI;
-    zvdb::BlockReference* ref =
-        modelo->addBlockReference(*definicao, ponto, {1, 1, 1}, graus, U8(layer));
-    // Its attributes placed from the values just given, not from its tags read back.
+    // The block's variable definitions and the values given for them come first: the
+    // reference is then made marked for its attributes, and each attribute with its value,
+    // placed from the values just given, instead of being found and set again.
+    std::vector<zvdb::AttributeLayout*> leituras;
+    zvdb::Point3 base;
+    std::vector<std::optional<std::string_view>> dados;
+    std::vector<std::string> textos;  // what `dados` points into
     try {
-        AtributosNovos novos;
-        PreparaAtributos(*db, *definicao, valores, novos);
-        ref->addAttributesFromDefinitions(*definicao, ponto, {1, 1, 1}, graus, novos.definicoes,
-                                          novos.dados);
+        const auto variaveis = db->attributeLayouts().variableLayouts(*db, *definicao, &base);
+        leituras.assign(variaveis.begin(), variaveis.end());
+        if (valores) {
+            dados.reserve(leituras.size());
+            textos.reserve(leituras.size());
+            for (const zvdb::AttributeLayout* leitura : leituras) {
+                const TextosDefinicao& textosDef = Textos(*leitura);
+                const std::optional<QString> valor = valores(textosDef.tag, textosDef.padrao);
+                dados.emplace_back();
+                if (!valor) continue;
+                textos.push_back(U8(*valor));
+                dados.back() = textos.back();
+            }
+        }
+    } catch (const std::exception& erro) {
+        Log("CICAd::CriarAtributos: " + QString::fromUtf8(erro.what()));
+        leituras.clear();
+        dados.clear();
+    }
+    zvdb::BlockReference* ref = db->addBlockReference(*modelo, *definicao, ponto, {1, 1, 1}, graus,
+                                                      U8(layer), !leituras.empty());
+    try {
+        ref->addAttributesFromLayouts(base, ponto, {1, 1, 1}, graus, leituras, dados);
     } catch (const std::exception& erro) {
         Log("CICAd::CriarAtributos: " + QString::fromUtf8(erro.what()));
     }

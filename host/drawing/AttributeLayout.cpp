@@ -1,12 +1,15 @@
 #include "AttributeLayout.h"
 
 #include "Attribute.h"
+#include "BlockRecord.h"
 #include "Database.h"
+#include "Entity.h"
 #include "TagList.h"
 #include "TagValues.h"
 
 #include <atomic>
 #include <bit>
+#include <stdexcept>
 
 namespace zvdb {
 
@@ -27,16 +30,6 @@ int slotOf(std::string_view value) {
     return static_cast<int>(value.data() - kSlotText);
 }
 
-bool sameTags(std::span<const Tag> a, std::span<const Tag> b) {
-    if (a.size() != b.size()) return false;
-    // Stored values are never written over: the same text in the same place is the same value.
-    for (std::size_t i = 0; i < a.size(); ++i)
-        if (a[i].code != b[i].code || a[i].value.data() != b[i].value.data() ||
-            a[i].value.size() != b[i].value.size())
-            return false;
-    return true;
-}
-
 std::uint64_t nextSerial() {
     static std::atomic<std::uint64_t> serial{0};
     return serial.fetch_add(1, std::memory_order_relaxed) + 1;
@@ -45,8 +38,7 @@ std::uint64_t nextSerial() {
 }  // namespace
 
 AttributeLayout::AttributeLayout(Database& target, const Attribute& definition)
-    : source_(definition.tags().begin(), definition.tags().end()),
-      position_(definition.position()),
+    : position_(definition.position()),
       alignment_(definition.point(11)),
       height_(definition.height()),
       ownRotation_(definition.rotation()),
@@ -57,10 +49,30 @@ AttributeLayout::AttributeLayout(Database& target, const Attribute& definition)
     // Whether the attribute takes a rotation depends on the reference: both ways are ready.
     plain_ = makeVariant(target, definition, false);
     rotated_ = makeVariant(target, definition, true);
+    // Values of a definition of another drawing may go with it: its attributes get whole tags.
+    if (&definition.database() == &target) {
+        makePatterns(plain_);
+        makePatterns(rotated_);
+    }
 }
 
-bool AttributeLayout::matches(const Attribute& definition) const {
-    return sameTags(definition.tags(), source_);
+void AttributeLayout::makePatterns(Variant& variant) {
+    // The handle and owner come from the object; each slot and the value get a hole.
+    std::vector<Tag> tags = variant.tags;
+    tags[1].value = TagPattern::handleHole();
+    tags[2].value = TagPattern::ownerHole();
+    variant.holes.fill(kNoHole);
+    std::size_t next = 0;
+    for (std::size_t slot = 0; slot <= SlotCount; ++slot) {
+        const std::size_t at = slot < SlotCount ? variant.slots[slot] : variant.value;
+        if (at == kNone) continue;
+        variant.holes[slot] = static_cast<std::uint8_t>(next);
+        tags[at].value = TagPattern::hole(next++);
+    }
+    variant.patterns[0] = std::make_unique<TagPattern>(tags);
+    // The paper space flag goes right after the entity's subclass marker.
+    tags.insert(tags.begin() + 4, Tag{67, "1"});
+    variant.patterns[1] = std::make_unique<TagPattern>(tags);
 }
 
 AttributeLayout::Variant AttributeLayout::makeVariant(Database& target, const Attribute& definition,
@@ -153,15 +165,96 @@ bool AttributeLayout::compose(Database& target, std::vector<Tag>& out, const Pla
     return true;
 }
 
+TagPattern::Values* AttributeLayout::composeValues(
+    Database& target, const Placement& placement,
+    const std::optional<std::string_view>& value) const {
+    const bool rotated = placement.rotation != 0.0 || ownRotation_ != 0.0;
+    const Variant& variant = rotated ? rotated_ : plain_;
+    const TagPattern* pattern = variant.patterns[placement.paperSpace ? 1 : 0].get();
+    if (!pattern || (value && variant.value == kNone)) return nullptr;
+    TagPattern::Values* made = pattern->make(target.arena());
+    std::string_view* holes = made->values();
+    AttributeLayouts& reals = target.attributeLayouts();
+    const auto put = [&](int slot, double number) {
+        const std::uint8_t hole = variant.holes[static_cast<std::size_t>(slot)];
+        if (hole != kNoHole) holes[hole] = reals.real(target, number);
+    };
+    const Point3 p = placement.transform.apply(position_);
+    put(X, p.x);
+    put(Y, p.y);
+    put(Z, p.z);
+    if (variant.holes[AlignX] != kNoHole) {
+        const Point3 a = placement.transform.apply(alignment_);
+        put(AlignX, a.x);
+        put(AlignY, a.y);
+        put(AlignZ, a.z);
+    }
+    put(Height, height_ * placement.heightScale);
+    if (rotated) put(Rotation, ownRotation_ + placement.rotation);
+    if (const std::uint8_t hole = variant.holes[SlotCount]; hole != kNoHole)
+        holes[hole] = value ? target.store(*value) : variant.tags[variant.value].value;
+    return made;
+}
+
 AttributeLayout& AttributeLayouts::layout(Database& target, const Attribute& definition) {
     if (&definition.database() != &target) {
         foreign_ = std::make_unique<AttributeLayout>(target, definition);
         return *foreign_;
     }
     std::unique_ptr<AttributeLayout>& known = byDefinition_[&definition];
-    if (!known || !known->matches(definition))
+    if (!known) {
         known = std::make_unique<AttributeLayout>(target, definition);
+        definition.watchForLayouts();
+    }
     return *known;
+}
+
+void AttributeLayouts::forget(const DbObject& object) {
+    plans_.clear();
+    const auto known = byDefinition_.find(&object);
+    if (known == byDefinition_.end()) return;
+    retired_.push_back(std::move(known->second));
+    byDefinition_.erase(known);
+}
+
+std::span<AttributeLayout* const> AttributeLayouts::variableLayouts(Database& target,
+                                                                    const BlockRecord& block,
+                                                                    Point3* basePoint) {
+    if (&block.database() != &target)
+        throw std::invalid_argument("the block of a new reference is one of its own drawing");
+    BlockPlan& plan = plans_[&block];
+    bool current = plan.entities != 0 && plan.entities == block.entitiesMade();
+    for (std::size_t i = 0; current && i < plan.definitions.size(); ++i)
+        current = !plan.definitions[i]->isErased();
+    if (current) {
+        if (basePoint) *basePoint = plan.basePoint;
+        return plan.variable;
+    }
+    plan.definitions.clear();
+    plan.variable.clear();
+    for (Attribute* definition : block.attributeDefinitions()) {
+        AttributeLayout& made = layout(target, *definition);
+        plan.definitions.push_back(definition);
+        if (!made.isConstant()) plan.variable.push_back(&made);
+    }
+    plan.entities = block.entitiesMade();
+    // The base point is read from the block's BLOCK entity, watched as the definitions are.
+    plan.basePoint = block.basePoint();
+    if (const Entity* begin = block.blockBegin()) begin->watchForLayouts();
+    if (basePoint) *basePoint = plan.basePoint;
+    return plan.variable;
+}
+
+const TagPattern& AttributeLayouts::seqendPattern(bool paperSpace) {
+    std::unique_ptr<TagPattern>& made = seqends_[paperSpace ? 1 : 0];
+    if (!made) {
+        std::vector<Tag> tags = {Tag{0, "SEQEND"}, Tag{5, TagPattern::handleHole()},
+                                 Tag{330, TagPattern::ownerHole()}, Tag{100, "AcDbEntity"}};
+        if (paperSpace) tags.push_back(Tag{67, "1"});
+        tags.push_back(Tag{8, TagPattern::hole(0)});
+        made = std::make_unique<TagPattern>(tags);
+    }
+    return *made;
 }
 
 std::string_view AttributeLayouts::real(Database& target, double value) {

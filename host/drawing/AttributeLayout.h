@@ -2,16 +2,18 @@
 // What making attributes from a block's definitions needs, worked out once per definition
 // instead of once per reference: the new attribute's tags with every value that does not
 // depend on the reference already in place, and where the values that do (handle, owner,
-// position, alignment point, height, rotation, text value) go. A layout is used only while
-// its definition still has the tags it was worked out from.
+// position, alignment point, height, rotation, text value) go. A layout is given up as soon
+// as its definition's tags change.
 #include "Geometry.h"
 #include "Tag.h"
+#include "TagPattern.h"
 
 #include <array>
 #include <cstddef>
 #include <cstdint>
 #include <memory>
 #include <optional>
+#include <span>
 #include <string_view>
 #include <unordered_map>
 #include <vector>
@@ -19,7 +21,9 @@
 namespace zvdb {
 
 class Attribute;
+class BlockRecord;
 class Database;
+class DbObject;
 
 class AttributeLayout {
 public:
@@ -30,8 +34,6 @@ public:
     // `target` is the drawing the attributes go to; values of a definition of another
     // drawing are copied into it.
     AttributeLayout(Database& target, const Attribute& definition);
-    // Whether the definition still has the tags the layout was worked out from.
-    bool matches(const Attribute& definition) const;
     // The definition's tag, default value and whether it is constant, as they were read.
     std::string_view tag() const { return tag_; }
     std::string_view defaultValue() const { return defaultValue_; }
@@ -55,16 +57,26 @@ public:
     // go to (the caller sets it afterwards).
     bool compose(Database& target, std::vector<Tag>& out, const Placement& placement,
                  const std::optional<std::string_view>& value);
+    // The same as a pattern shared by the definition's attributes and the new attribute's
+    // own values (the handle and owner come from the object); null when the layout has no
+    // patterns (a definition of another drawing) or a value has no tag to go to.
+    TagPattern::Values* composeValues(Database& target, const Placement& placement,
+                                      const std::optional<std::string_view>& value) const;
 
 private:
     struct Variant {
         std::vector<Tag> tags;  // without the paper space flag
         std::array<std::size_t, SlotCount> slots{};
         std::size_t value = kNone;
+        // The same tags as patterns, without and with the paper space flag, and the hole
+        // each slot (then the value) fills; kNoHole where it has none.
+        std::unique_ptr<TagPattern> patterns[2];
+        std::array<std::uint8_t, SlotCount + 1> holes{};
     };
+    static constexpr std::uint8_t kNoHole = 0xFF;
     Variant makeVariant(Database& target, const Attribute& definition, bool rotated) const;
+    static void makePatterns(Variant& variant);
 
-    std::vector<Tag> source_;  // the definition's tags when the layout was made
     Point3 position_;
     Point3 alignment_;
     double height_ = 1.0;
@@ -84,12 +96,33 @@ public:
     // The layout of `definition`, made or remade when needed. Definitions of another drawing
     // get a layout of their own each time (their objects may go away meanwhile).
     AttributeLayout& layout(Database& target, const Attribute& definition);
+    // A definition's tags changed (its layout is made again when next asked for), or a
+    // block's base point.
+    void forget(const DbObject& object);
+    // The layouts of the block's definitions that are not constant, in order: what a new
+    // reference of the block takes. Worked out once while the block has the same entities
+    // and its definitions the same tags. The block is one of `target`; `basePoint`, when
+    // given, takes its base point.
+    std::span<AttributeLayout* const> variableLayouts(Database& target, const BlockRecord& block,
+                                                      Point3* basePoint = nullptr);
     // A real as tag text, answered from the values given lately when it is one of them.
     std::string_view real(Database& target, double value);
+    // The SEQEND that closes a reference's attributes: its layer is the one hole.
+    const TagPattern& seqendPattern(bool paperSpace);
 
 private:
-    std::unordered_map<const Attribute*, std::unique_ptr<AttributeLayout>> byDefinition_;
+    std::unordered_map<const DbObject*, std::unique_ptr<AttributeLayout>> byDefinition_;
+    // Layouts given up: attributes made from their patterns still point to them.
+    std::vector<std::unique_ptr<AttributeLayout>> retired_;
     std::unique_ptr<AttributeLayout> foreign_;
+    std::unique_ptr<TagPattern> seqends_[2];
+    struct BlockPlan {
+        std::size_t entities = 0;
+        Point3 basePoint;
+        std::vector<const Attribute*> definitions;  // every definition, constant ones too
+        std::vector<AttributeLayout*> variable;
+    };
+    std::unordered_map<const BlockRecord*, BlockPlan> plans_;
     struct Memo {
         std::uint64_t bits = 0;
         std::string_view text;

@@ -135,13 +135,7 @@ Attribute* BlockRecord::addAttributeDefinition(std::string_view tag, std::string
 BlockReference* BlockRecord::addBlockReference(const BlockRecord& block, const Point3& position,
                                                const Point3& scale, double rotationDegrees,
                                                std::string_view layer) {
-    TagListBuilder body(database().arena());
-    body.text(100, "AcDbBlockReference").text(2, block.name()).point(10, position);
-    if (scale.x != 1.0) body.real(41, scale.x);
-    if (scale.y != 1.0) body.real(42, scale.y);
-    if (scale.z != 1.0) body.real(43, scale.z);
-    if (rotationDegrees != 0.0) body.real(50, rotationDegrees);
-    return static_cast<BlockReference*>(database().addEntity(*this, "INSERT", body.take(), layer));
+    return database().addBlockReference(*this, block, position, scale, rotationDegrees, layer);
 }
 
 void BlockRecord::erase() {

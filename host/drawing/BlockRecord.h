@@ -32,6 +32,8 @@ public:
     std::vector<Entity*> entities() const;
     void forEachEntity(const std::function<void(Entity&)>& visit) const;
     std::size_t entityCount() const;
+    // How many entities the block has had, erased ones too: it grows with every one added.
+    std::size_t entitiesMade() const { return entities_.size(); }
     // The ATTDEFs of the block in order.
     std::vector<Attribute*> attributeDefinitions() const;
 

@@ -139,4 +139,15 @@ std::vector<Attribute*> BlockReference::addAttributesFromDefinitions(
         std::abs(scale.y), rotation);
 }
 
+std::vector<Attribute*> BlockReference::addAttributesFromLayouts(
+    const Point3& basePoint, const Point3& position, const Point3& scale, double rotationDegrees,
+    std::span<AttributeLayout* const> layouts,
+    std::span<const std::optional<std::string_view>> values) {
+    if (layouts.empty()) return {};
+    const double rotation = rotationDegrees != 0.0 ? rotationDegrees : 0.0;
+    return database().addAttributesFromLayouts(*this, layouts, values,
+                                               transformOf(basePoint, position, scale, rotation),
+                                               std::abs(scale.y), rotation);
+}
+
 }  // namespace zvdb

@@ -9,6 +9,7 @@
 namespace zvdb {
 
 class Attribute;
+class AttributeLayout;
 class BlockRecord;
 
 class BlockReference : public Entity {
@@ -51,6 +52,12 @@ public:
     std::vector<Attribute*> addAttributesFromDefinitions(
         const BlockRecord& block, const Point3& position, const Point3& scale,
         double rotationDegrees, std::span<const Attribute* const> definitions,
+        std::span<const std::optional<std::string_view>> values);
+    // The same from the layouts of the block's definitions (AttributeLayouts::variableLayouts),
+    // `basePoint` being the block's.
+    std::vector<Attribute*> addAttributesFromLayouts(
+        const Point3& basePoint, const Point3& position, const Point3& scale,
+        double rotationDegrees, std::span<AttributeLayout* const> layouts,
         std::span<const std::optional<std::string_view>> values);
 };
 

@@ -68,6 +68,7 @@ void Database::swapContents(Database& other) {
     warnings_.swap(other.warnings_);
     std::swap(namedObjects_, other.namedObjects_);
     layouts_.swap(other.layouts_);
+    std::swap(lastApplication_, other.lastApplication_);
     for (const auto& object : storage_)
         object->database_ = this;
     for (const auto& object : other.storage_)
@@ -254,8 +255,18 @@ bool Database::isApplicationRegistered(std::string_view application) const {
 }
 
 bool Database::registerApplication(std::string_view application) {
-    if (application.empty() || isApplicationRegistered(application)) return false;
-    return createTableRecord("APPID", application, "AcDbRegAppTableRecord") != nullptr;
+    if (application.empty()) return false;
+    // Objects given extended data name the same application one after another.
+    if (lastApplication_ && !lastApplication_->isErased() &&
+        TagValues::sameName(lastApplication_->text(2), application))
+        return false;
+    SymbolTable* appids = table("APPID");
+    if (DbObject* known = appids ? appids->find(application) : nullptr) {
+        lastApplication_ = known;
+        return false;
+    }
+    lastApplication_ = createTableRecord("APPID", application, "AcDbRegAppTableRecord");
+    return lastApplication_ != nullptr;
 }
 
 // System variables -------------------------------------------------------------------------
@@ -381,6 +392,47 @@ Entity* Database::addEntity(BlockRecord& block, std::string_view type, const std
     return entity;
 }
 
+BlockReference* Database::addBlockReference(BlockRecord& owner, const BlockRecord& block,
+                                            const Point3& position, const Point3& scale,
+                                            double rotationDegrees, std::string_view layer,
+                                            bool attributesFollow) {
+    // The tags that making an INSERT through its builder gives, put straight in place: the
+    // coordinates' texts are shared with the attributes placed by them.
+    AttributeLayouts& reals = attributeLayouts();
+    const std::uint64_t handle = allocateHandle();
+    const bool paper = owner.isPaperSpace();
+    const std::size_t count = 10 + (paper ? 1 : 0) + (scale.x != 1.0 ? 1 : 0) +
+                              (scale.y != 1.0 ? 1 : 0) + (scale.z != 1.0 ? 1 : 0) +
+                              (rotationDegrees != 0.0 ? 1 : 0);
+    std::vector<Tag> tags;
+    // The mark that attributes follow takes its room from what the setters get, as before.
+    tags.reserve(count + kSettersSlack);
+    tags.push_back(Tag{0, "INSERT"});
+    tags.push_back(Tag{5, handleText(arena_, handle)});
+    tags.push_back(Tag{330, handleText(arena_, owner.handle())});
+    tags.push_back(Tag{100, "AcDbEntity"});
+    if (paper) tags.push_back(Tag{67, "1"});
+    tags.push_back(Tag{8, layer.empty() ? std::string_view("0") : storeShared(layer)});
+    tags.push_back(Tag{100, "AcDbBlockReference"});
+    const std::string_view name = block.name();
+    tags.push_back(Tag{2, &block.database() == this ? name : store(name)});
+    tags.push_back(Tag{10, reals.real(*this, position.x)});
+    tags.push_back(Tag{20, reals.real(*this, position.y)});
+    tags.push_back(Tag{30, reals.real(*this, position.z)});
+    if (scale.x != 1.0) tags.push_back(Tag{41, reals.real(*this, scale.x)});
+    if (scale.y != 1.0) tags.push_back(Tag{42, reals.real(*this, scale.y)});
+    if (scale.z != 1.0) tags.push_back(Tag{43, reals.real(*this, scale.z)});
+    if (rotationDegrees != 0.0) tags.push_back(Tag{50, reals.real(*this, rotationDegrees)});
+    if (attributesFollow) tags.push_back(Tag{66, "1"});
+    auto reference =
+        std::make_unique<BlockReference>(*this, std::span<const Tag>(), handle, owner.handle());
+    reference->own_ = std::move(tags);
+    reference->owned_ = true;
+    auto* made = static_cast<BlockReference*>(adopt(std::move(reference)));
+    owner.appendEntity(made);
+    return made;
+}
+
 void Database::ensureSeqend(Entity& parent) {
     if (parent.seqend()) return;
     // A SEQEND is hardly ever changed: its few tags go to the arena.
@@ -424,6 +476,47 @@ AttributeLayouts& Database::attributeLayouts() {
     return *layouts_;
 }
 
+void Database::forgetLayout(const DbObject& definition) {
+    if (layouts_) layouts_->forget(definition);
+}
+
+Attribute* Database::addAttributeFromLayout(BlockReference& reference, AttributeLayout& layout,
+                                            AttributeLayout::Placement& where,
+                                            const std::optional<std::string_view>& value,
+                                            bool first) {
+    const std::uint64_t handle = allocateHandle();
+    Attribute* attribute = nullptr;
+    bool valuePlaced = true;
+    if (TagPattern::Values* own = layout.composeValues(*this, where, value)) {
+        attribute = static_cast<Attribute*>(
+            adopt(std::make_unique<Attribute>(*this, *own, handle, reference.handle())));
+    } else {
+        if (where.owner.empty()) where.owner = handleText(arena_, reference.handle());
+        where.handle = handleText(arena_, handle);
+        valuePlaced = layout.compose(*this, scratch_, where, value);
+        // The tags go to the arena at their exact size: an attribute's later changes are
+        // mostly new values, made in place; one that gains a tag takes a list of its own then.
+        attribute = static_cast<Attribute*>(adopt(std::make_unique<Attribute>(
+            *this, arena_.storeTags(scratch_), handle, reference.handle())));
+    }
+    reference.addSubEntity(attribute);
+    if (first) {
+        if (reference.integer(66) != 1) reference.setInteger(66, 1, "AcDbBlockReference");
+        if (!reference.seqend()) {
+            // As ensureSeqend makes it, from values the drawing holds already.
+            const std::uint64_t seqend = allocateHandle();
+            const std::string_view layer = reference.layer();
+            TagPattern::Values* own =
+                attributeLayouts().seqendPattern(where.paperSpace).make(arena_);
+            own->values()[0] = layer.empty() ? std::string_view("0") : layer;
+            reference.setSeqend(static_cast<Entity*>(
+                adopt(std::make_unique<Entity>(*this, *own, seqend, reference.handle()))));
+        }
+    }
+    if (!valuePlaced) attribute->setTextValue(*value);
+    return attribute;
+}
+
 std::vector<Attribute*> Database::addAttributesFromDefinitions(
     BlockReference& reference, std::span<const Attribute* const> definitions,
     std::span<const std::optional<std::string_view>> values, const Transform& placement,
@@ -431,39 +524,34 @@ std::vector<Attribute*> Database::addAttributesFromDefinitions(
     std::vector<Attribute*> made;
     if (definitions.empty()) return made;
     made.reserve(definitions.size());
-    AttributeLayout::Placement where{placement, heightScale,
-                                     rotation,  reference.inPaperSpace(),
-                                     {},        handleText(arena_, reference.handle())};
+    AttributeLayout::Placement where{placement, heightScale, rotation, reference.inPaperSpace(),
+                                     {},        {}};
     AttributeLayouts& layouts = attributeLayouts();
     for (std::size_t i = 0; i < definitions.size(); ++i) {
-        AttributeLayout& layout = layouts.layout(*this, *definitions[i]);
-        const std::uint64_t handle = allocateHandle();
-        where.handle = handleText(arena_, handle);
         const std::optional<std::string_view> value =
             i < values.size() ? values[i] : std::optional<std::string_view>();
-        const bool valuePlaced = layout.compose(*this, scratch_, where, value);
-        // The tags go to the arena at their exact size: an attribute's later changes are
-        // mostly new values, made in place; one that gains a tag takes a list of its own then.
-        auto* attribute = static_cast<Attribute*>(adopt(std::make_unique<Attribute>(
-            *this, arena_.storeTags(scratch_), handle, reference.handle())));
-        reference.addSubEntity(attribute);
-        if (i == 0) {
-            if (reference.integer(66) != 1) reference.setInteger(66, 1, "AcDbBlockReference");
-            if (!reference.seqend()) {
-                // As ensureSeqend makes it, from values the drawing holds already.
-                const std::uint64_t seqend = allocateHandle();
-                const std::string_view layer = reference.layer();
-                Tag tags[6] = {Tag{0, "SEQEND"}, Tag{5, handleText(arena_, seqend)},
-                               Tag{330, where.owner}, Tag{100, "AcDbEntity"}};
-                std::size_t count = 4;
-                if (where.paperSpace) tags[count++] = Tag{67, "1"};
-                tags[count++] = Tag{8, layer.empty() ? std::string_view("0") : layer};
-                reference.setSeqend(static_cast<Entity*>(adopt(std::make_unique<Entity>(
-                    *this, arena_.storeTags({tags, count}), seqend, reference.handle()))));
-            }
-        }
-        if (!valuePlaced) attribute->setTextValue(*value);
-        made.push_back(attribute);
+        made.push_back(addAttributeFromLayout(reference, layouts.layout(*this, *definitions[i]),
+                                              where, value, i == 0));
+    }
+    return made;
+}
+
+std::vector<Attribute*> Database::addAttributesFromLayouts(
+    BlockReference& reference, std::span<AttributeLayout* const> layouts,
+    std::span<const std::optional<std::string_view>> values, const Transform& placement,
+    double heightScale, double rotation) {
+    std::vector<Attribute*> made;
+    if (layouts.empty()) return made;
+    made.reserve(layouts.size());
+    // The reference's list of attributes at its size at once.
+    std::vector<Entity*>& subs = reference.children().subs;
+    subs.reserve(subs.size() + layouts.size());
+    AttributeLayout::Placement where{placement, heightScale, rotation, reference.inPaperSpace(),
+                                     {},        {}};
+    for (std::size_t i = 0; i < layouts.size(); ++i) {
+        const std::optional<std::string_view> value =
+            i < values.size() ? values[i] : std::optional<std::string_view>();
+        made.push_back(addAttributeFromLayout(reference, *layouts[i], where, value, i == 0));
     }
     return made;
 }

@@ -6,6 +6,7 @@
 //
 // A new Database is an empty drawing (AC1027). DxfLoader reads one from a file and
 // DxfWriter writes it back; objects we do not know are kept as their tags.
+#include "AttributeLayout.h"
 #include "Geometry.h"
 #include "HandleIndex.h"
 #include "HeaderVariables.h"
@@ -24,6 +25,7 @@
 namespace zvdb {
 
 class Attribute;
+class AttributeLayout;
 class AttributeLayouts;
 class BlockRecord;
 class BlockReference;
@@ -117,6 +119,12 @@ public:
     // Building blocks for the typed classes -----------------------------------------------
     // A new entity at the end of `block`: `body` holds the tags after the entity's common
     // ones (its subclass marker first).
+    // A reference to `block` at the end of `owner`, without attributes; `attributesFollow`
+    // marks it (66) as the first attribute added would.
+    BlockReference* addBlockReference(BlockRecord& owner, const BlockRecord& block,
+                                      const Point3& position, const Point3& scale,
+                                      double rotationDegrees, std::string_view layer,
+                                      bool attributesFollow = false);
     Entity* addEntity(BlockRecord& block, std::string_view type, const std::vector<Tag>& body,
                       std::string_view layer);
     // `stored`: the body's values are already held by this database (they are not copied).
@@ -129,6 +137,11 @@ public:
     // are made whole before they are adopted.
     std::vector<Attribute*> addAttributesFromDefinitions(
         BlockReference& reference, std::span<const Attribute* const> definitions,
+        std::span<const std::optional<std::string_view>> values, const Transform& placement,
+        double heightScale, double rotation);
+    // The same from the definitions' layouts (of this drawing, found by attributeLayouts()).
+    std::vector<Attribute*> addAttributesFromLayouts(
+        BlockReference& reference, std::span<AttributeLayout* const> layouts,
         std::span<const std::optional<std::string_view>> values, const Transform& placement,
         double heightScale, double rotation);
     // What the definitions of this drawing's blocks give their attributes, worked out once.
@@ -163,10 +176,14 @@ private:
     std::uint64_t allocateHandle() { return nextHandle_++; }
     void noteHandle(std::uint64_t handle);
     void noteChange();
+    void forgetLayout(const DbObject& definition);
     void forgetBlock(BlockRecord& record);
     // The BLOCK and ENDBLK entities of a block record that has none.
     void addBlockEnds(BlockRecord& record, const Point3& basePoint = {});
     void ensureSeqend(Entity& parent);
+    Attribute* addAttributeFromLayout(BlockReference& reference, AttributeLayout& layout,
+                                      AttributeLayout::Placement& where,
+                                      const std::optional<std::string_view>& value, bool first);
     std::vector<Tag> entityHead(std::string_view type, std::uint64_t handle, std::uint64_t owner,
                                 std::string_view layer, bool paperSpace);
     SymbolTable* addTable(std::string_view name, DbObject* head);
@@ -188,6 +205,8 @@ private:
     // Room where new objects' tags are put together before they get their own.
     std::vector<Tag> scratch_;
     std::unique_ptr<AttributeLayouts> layouts_;
+    // The APPID record registerApplication found or made last.
+    DbObject* lastApplication_ = nullptr;
     std::uint64_t changes_ = 0;
     std::uint64_t contentId_ = 0;
 };

@@ -24,16 +24,53 @@ DbObject::DbObject(Database& database, std::span<const Tag> tags, std::uint64_t 
       handle_(handle),
       owner_(owner) {}
 
+DbObject::DbObject(Database& database, const TagPattern::Values& values, std::uint64_t handle,
+                   std::uint64_t owner)
+    : database_(&database),
+      pattern_(&values),
+      owned_(true),
+      patterned_(true),
+      handle_(handle),
+      owner_(owner) {}
+
 DbObject::~DbObject() = default;
 
 std::span<const Tag> DbObject::tags() const {
-    if (owned_) return own_;
+    if (owned_) {
+        // Asking for the tags is no change: a patterned object only puts together what its
+        // pattern and values say, once.
+        if (patterned_) [[unlikely]]
+            const_cast<DbObject*>(this)->expand();
+        return own_;
+    }
     return {fileTags_, fileCount_};
 }
 
-std::vector<Tag>& DbObject::editTags() {
+void DbObject::expand() {
+    if (!patterned_) return;
+    own_ = pattern_->pattern->expand(pattern_->values(), handle_, owner_, database_->arena());
+    patterned_ = false;
+    pattern_ = nullptr;
+}
+
+void DbObject::noteEdit() {
     database_->noteChange();
+    if (watched_) {
+        watched_ = false;
+        database_->forgetLayout(*this);
+    }
+}
+
+std::vector<Tag>& DbObject::editTags() {
+    return editTags(0);
+}
+
+std::vector<Tag>& DbObject::editTags(std::size_t more) {
+    noteEdit();
+    expand();
     if (!owned_) {
+        // Copied once at the size the change needs, not copied and then grown.
+        own_.reserve(fileCount_ + more);
         own_.assign(fileTags_, fileTags_ + fileCount_);
         owned_ = true;
         fileTags_ = nullptr;
@@ -43,7 +80,8 @@ std::vector<Tag>& DbObject::editTags() {
 }
 
 void DbObject::takeTags(std::vector<Tag> tags) {
-    database_->noteChange();
+    noteEdit();
+    patterned_ = false;
     own_ = std::move(tags);
     owned_ = true;
     fileTags_ = nullptr;
@@ -56,6 +94,7 @@ std::string_view DbObject::store(std::string_view text) const {
 }
 
 std::string_view DbObject::type() const {
+    if (patterned_) return pattern_->pattern->type();
     const auto all = tags();
     return all.empty() ? std::string_view() : all[0].value;
 }
@@ -202,7 +241,8 @@ std::size_t DbObject::subclassEnd(std::string_view subclass) const {
 }
 
 Tag& DbObject::tagForValue(std::size_t index) {
-    database_->noteChange();
+    noteEdit();
+    expand();
     // The tags outside own_ are this object's alone (its range of the file's tag list or of
     // the arena), so a value changes there without a copy of the list.
     return owned_ ? own_[index] : const_cast<Tag*>(fileTags_)[index];
@@ -322,18 +362,20 @@ void fitFor(std::vector<Tag>& all, std::size_t more) {
 
 void DbObject::setXData(std::string_view application, std::span<const Tag> items) {
     database_->registerApplication(application);
-    const std::size_t start = xdataStart();
-    auto& all = editTags();
-    std::size_t begin = all.size(), end = all.size();
-    for (std::size_t i = start; i < all.size(); ++i) {
-        if (all[i].code == 1001 && TagValues::sameName(all[i].value, application)) {
+    const auto current = tags();
+    std::size_t begin = current.size(), end = current.size();
+    for (std::size_t i = xdataStart(); i < current.size(); ++i) {
+        if (current[i].code == 1001 && TagValues::sameName(current[i].value, application)) {
             begin = i;
             end = i + 1;
-            while (end < all.size() && all[end].code != 1001)
+            while (end < current.size() && current[end].code != 1001)
                 ++end;
             break;
         }
     }
+    // A file object's tags are copied once, at the size they will have.
+    const std::size_t after = current.size() - (end - begin) + items.size() + 1;
+    auto& all = editTags(after > current.size() ? after - current.size() : 0);
     std::vector<Tag> group;
     group.reserve(items.size() + 1);
     // the same few application names on many objects: one copy each
@@ -348,7 +390,7 @@ void DbObject::setXData(std::string_view application, std::span<const Tag> items
 
 void DbObject::addXData(std::string_view application, std::span<const Tag> items) {
     database_->registerApplication(application);
-    auto& all = editTags();
+    auto& all = editTags(items.size() + 1);
     fitFor(all, items.size() + 1);
     all.push_back(Tag{1001, database_->storeShared(application)});
     for (const Tag& item : items)

@@ -3,9 +3,11 @@
 // Its tags are the truth; typed classes read and write them, so groups we do not know stay
 // where they were. Tags read from a file stay in the file's tag list (and those of objects
 // made whole at once in the database's arena) until a tag is added or taken out: a new
-// value for a tag is written where the tag is.
+// value for a tag is written where the tag is. Objects made in numbers from one pattern keep
+// only their own values until their tags are asked for.
 #include "Geometry.h"
 #include "Tag.h"
+#include "TagPattern.h"
 
 #include <cstdint>
 #include <span>
@@ -23,6 +25,9 @@ public:
     DbObject(Database& database, std::span<const Tag> tags);
     // For tags just made, whose handle and owner are known (they must be what the tags say).
     DbObject(Database& database, std::span<const Tag> tags, std::uint64_t handle,
+             std::uint64_t owner);
+    // For an object made from a pattern: `values` (in the database's arena) hold its own.
+    DbObject(Database& database, const TagPattern::Values& values, std::uint64_t handle,
              std::uint64_t owner);
     virtual ~DbObject();
     DbObject(const DbObject&) = delete;
@@ -42,6 +47,19 @@ public:
 
     // Tags --------------------------------------------------------------------------------
     std::span<const Tag> tags() const;
+    // Whether the tags are still only a pattern's and the object's own values (then
+    // forEachTag gives them without putting them together).
+    bool isPatterned() const { return patterned_; }
+    // Each tag in order, as tags() would give them.
+    template <class Visit>
+    void forEachTag(Visit&& visit) const {
+        if (patterned_) {
+            pattern_->pattern->forEach(pattern_->values(), handle_, owner_, visit);
+            return;
+        }
+        for (const Tag& tag : tags())
+            visit(tag.code, tag.value);
+    }
     // Index of the first extended-data tag (1001), or the tag count.
     std::size_t xdataStart() const;
     // Index of the first tag with the code, outside application groups (102) and before the
@@ -66,6 +84,10 @@ public:
     void replaceTags(std::span<const Tag> tags);
     // The tags for editing in place; values put in must come from Database::store().
     std::vector<Tag>& editTags();
+
+    // Tells the database's attribute layouts when the tags change, so that what was worked
+    // out from them is worked out again.
+    void watchForLayouts() const { watched_ = true; }
 
     // Extended data ----------------------------------------------------------------------
     // Application names in order of appearance (a name twice when it has two groups).
@@ -105,16 +127,26 @@ protected:
     std::size_t appGroupEnd(std::string_view group) const;  // index of its "102 }" or 0
 
 private:
+    // As editTags, with room for `more` tags when the tags are copied.
+    std::vector<Tag>& editTags(std::size_t more);
     void setTagValue(int code, std::string_view value, std::string_view subclass);
     // The tag at `index`, to take a new value where it is.
     Tag& tagForValue(std::size_t index);
     void cacheIdentity();
+    // Puts a patterned object's tags together; they are its own from then on.
+    void expand();
+    void noteEdit();
 
     Database* database_;
-    const Tag* fileTags_ = nullptr;
+    union {
+        const Tag* fileTags_ = nullptr;
+        const TagPattern::Values* pattern_;  // when patterned_
+    };
     std::uint32_t fileCount_ = 0;
     bool owned_ = false;
     bool erased_ = false;
+    bool patterned_ = false;
+    mutable bool watched_ = false;
     std::vector<Tag> own_;
     std::uint64_t handle_ = 0;
     std::uint64_t owner_ = 0;

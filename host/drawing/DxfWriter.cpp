@@ -45,7 +45,8 @@ void DxfWriter::prepare() {
     std::unordered_set<std::string> seen;
     std::vector<std::string> apps;
     for (const auto& object : db_.storage_) {
-        if (object->isErased()) continue;
+        // A patterned object has no extended data (adding some puts its tags together).
+        if (object->isErased() || object->isPatterned()) continue;
         const auto tags = object->tags();
         for (std::size_t i = 1; i < tags.size(); ++i) {
             if (tags[i].code != 1001 || object->isType("XRECORD")) continue;
@@ -147,6 +148,10 @@ void DxfWriter::writeRaw(const std::string& name) {
 
 void DxfWriter::writeObject(const DbObject& object) {
     if (object.isErased()) return;
+    if (object.isPatterned()) {
+        object.forEachTag([this](int code, std::string_view value) { tag(code, value); });
+        return;
+    }
     const auto tags = object.tags();
     const bool dictionary = dynamic_cast<const Dictionary*>(&object) != nullptr;
     for (std::size_t i = 0; i < tags.size(); ++i) {

@@ -56,6 +56,26 @@ std::span<Tag> StringArena::storeTags(std::span<const Tag> tags) {
     return {at, tags.size()};
 }
 
+void* StringArena::allocate(std::size_t bytes) {
+    constexpr std::size_t kRawChunk = 32 * 1024;
+    bytes = (bytes + 7) & ~std::size_t(7);
+    if (bytes > kRawChunk / 8) {
+        tagChunks_.push_back(std::make_unique_for_overwrite<std::byte[]>(bytes));
+        used_ += bytes;
+        return tagChunks_.back().get();
+    }
+    if (bytes > rawLeft_) {
+        tagChunks_.push_back(std::make_unique_for_overwrite<std::byte[]>(kRawChunk));
+        used_ += kRawChunk;
+        rawCursor_ = tagChunks_.back().get();
+        rawLeft_ = kRawChunk;
+    }
+    void* at = rawCursor_;
+    rawCursor_ += bytes;
+    rawLeft_ -= bytes;
+    return at;
+}
+
 std::string_view StringArena::adopt(std::string&& buffer) {
     used_ += buffer.capacity();
     buffers_.push_back(std::make_unique<std::string>(std::move(buffer)));

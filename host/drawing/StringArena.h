@@ -22,6 +22,9 @@ public:
     // A copy of a tag list (its values must be held already), at its exact size, with no
     // allocation of its own; its owner may change the values in place.
     std::span<Tag> storeTags(std::span<const Tag> tags);
+    // Raw room for small records made of pointers and views (8-byte aligned), at no
+    // allocation of its own.
+    void* allocate(std::size_t bytes);
     std::size_t bytesUsed() const { return used_; }
 
 private:
@@ -33,6 +36,8 @@ private:
     std::vector<std::unique_ptr<std::byte[]>> tagChunks_;
     Tag* tagCursor_ = nullptr;
     std::size_t tagsLeft_ = 0;
+    std::byte* rawCursor_ = nullptr;
+    std::size_t rawLeft_ = 0;
     std::size_t used_ = 0;
 };
 

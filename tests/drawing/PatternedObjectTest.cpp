@@ -1,0 +1,352 @@
+// Attributes and SEQENDs made in numbers keep only their own values beside a pattern shared
+// with their kind: whatever reads them (the tags, the writer, a later change) must find what
+// whole tags would hold, and the file must be the same text either way.
+#include "drawing/Attribute.h"
+#include "drawing/AttributeLayout.h"
+#include "drawing/BlockRecord.h"
+#include "drawing/BlockReference.h"
+#include "drawing/Database.h"
+#include "drawing/DxfLoader.h"
+#include "drawing/DxfWriter.h"
+#include "drawing/SymbolTable.h"
+#include "drawing/TagPattern.h"
+#include "drawing/TagValues.h"
+#include "drawing/UndoJournal.h"
+#include "tests/drawing/StepByStepAttribute.h"
+
+#include <gtest/gtest.h>
+
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+using namespace zvdb;
+
+namespace {
+
+std::vector<std::string> lines(const DbObject& object) {
+    std::vector<std::string> all;
+    for (const Tag& item : object.tags())
+        all.push_back(std::to_string(item.code) + " " + std::string(item.value));
+    return all;
+}
+
+// A block with what real definitions carry: a plain one, an aligned one, a rotated
+// invisible one on a layer of its own with colour and linetype, a constant one, and a
+// multi-line one (an MTEXT part after the text).
+BlockRecord* sampleBlock(Database& db) {
+    db.createLayer("PAGE");
+    db.createLayer("ATTS");
+    BlockRecord* block = db.createBlock("AMOSTRA", {1, 2, 0});
+    block->addLine({0, 0, 0}, {10, 0, 0});
+    block->addAttributeDefinition("TAG", "Tag", "-K?", {1, 3, 0}, 2.5);
+    Attribute* aligned = block->addAttributeDefinition("ALINHADO", "", "", {2, 4, 0}, 1.8);
+    aligned->setPoint(11, {8, 4, 0}, "AcDbText");
+    aligned->setInteger(72, 2, "AcDbText");
+    aligned->setInteger(74, 1, "AcDbAttributeDefinition");
+    Attribute* hidden = block->addAttributeDefinition("OCULTO", "", "h", {0, -2, 0}, 3.0, "ATTS");
+    hidden->setInvisible(true);
+    hidden->setColor(1);
+    hidden->setLinetype("DASHED");
+    hidden->setReal(50, 90.0, "AcDbText");
+    Attribute* fixed = block->addAttributeDefinition("FIXO", "", "c", {0, 9, 0}, 1.0);
+    fixed->setInteger(70, 2, "AcDbAttributeDefinition");
+    Attribute* multi = block->addAttributeDefinition("LINHAS", "", "a", {0, 12, 0}, 1.0);
+    multi->setText(101, "Embedded Object", "AcDbAttributeDefinition");
+    return block;
+}
+
+struct Made {
+    BlockReference* reference;
+    std::vector<Attribute*> attributes;
+};
+
+// A reference made as the list writers make theirs: the block's layouts, values given.
+Made insert(Database& db, BlockRecord& block, const Point3& at, const Point3& scale, double degrees,
+            bool paper, const std::vector<std::optional<std::string_view>>& values) {
+    BlockRecord* owner = paper ? db.paperSpace() : db.modelSpace();
+    BlockReference* reference = owner->addBlockReference(block, at, scale, degrees, "PAGE");
+    Point3 base;
+    const auto layouts = db.attributeLayouts().variableLayouts(db, block, &base);
+    return {reference,
+            reference->addAttributesFromLayouts(base, at, scale, degrees, layouts, values)};
+}
+
+void fill(Database& db, BlockRecord& block) {
+    insert(db, block, {0, 0, 0}, {1, 1, 1}, 0, false, {"-X1", std::nullopt, "", "l"});
+    insert(db, block, {12.5, -7.25, 0}, {1, 1, 1}, 30, false, {});
+    insert(db, block, {100, 200, 3}, {2, 0.5, 1}, 0, false, {"a", "b", "c", "d"});
+    insert(db, block, {-4, 9, 0}, {-1, 1, 1}, 270, false, {std::nullopt, "x"});
+    insert(db, block, {1, 2, 0}, {1, 1, 1}, 45, true, {"paper"});
+}
+
+// Every object's tags put together, as any reader of them would.
+void expandAll(Database& db) {
+    for (BlockRecord* owner : {db.modelSpace(), db.paperSpace()})
+        for (Entity* entity : owner->entities()) {
+            for (Entity* sub : entity->subEntities())
+                (void)sub->tags();
+            if (entity->seqend()) (void)entity->seqend()->tags();
+        }
+}
+
+std::size_t patternedCount(Database& db) {
+    std::size_t count = 0;
+    for (BlockRecord* owner : {db.modelSpace(), db.paperSpace()})
+        for (Entity* entity : owner->entities()) {
+            for (Entity* sub : entity->subEntities())
+                count += sub->isPatterned() ? 1 : 0;
+            if (entity->seqend()) count += entity->seqend()->isPatterned() ? 1 : 0;
+        }
+    return count;
+}
+
+}  // namespace
+
+TEST(PatternedObjects, TheWriterGivesTheSameTextAsTheWholeTags) {
+    Database db;
+    BlockRecord* block = sampleBlock(db);
+    fill(db, *block);
+    // 5 references of 4 variable definitions each, and their SEQENDs.
+    EXPECT_EQ(patternedCount(db), 25u);
+    const std::string patterned = DxfWriter::toText(db);
+    EXPECT_EQ(patternedCount(db), 25u) << "writing puts no tags together";
+    expandAll(db);
+    EXPECT_EQ(patternedCount(db), 0u);
+    EXPECT_EQ(DxfWriter::toText(db), patterned);
+}
+
+TEST(PatternedObjects, TagsAreThoseOfTheStepByStepAttribute) {
+    Database db;
+    BlockRecord* block = sampleBlock(db);
+    const std::vector<std::optional<std::string_view>> values = {"v1", std::nullopt, "v3", "v4"};
+    for (const bool paper : {false, true})
+        for (const double degrees : {0.0, 30.0}) {
+            SCOPED_TRACE(degrees);
+            const Made fast = insert(db, *block, {3, 4, 0}, {1, 2, 1}, degrees, paper, values);
+            BlockRecord* owner = paper ? db.paperSpace() : db.modelSpace();
+            BlockReference* slow =
+                owner->addBlockReference(*block, {3, 4, 0}, {1, 2, 1}, degrees, "PAGE");
+            std::size_t i = 0;
+            for (Attribute* definition : block->attributeDefinitions()) {
+                if (definition->isConstant()) continue;
+                Attribute* made = madeStepByStep(*slow, *definition);
+                if (values[i]) made->setTextValue(*values[i]);
+                ++i;
+            }
+            ASSERT_EQ(fast.attributes.size(), 4u);
+            for (std::size_t k = 0; k < fast.attributes.size(); ++k) {
+                Attribute* mine = fast.attributes[k];
+                // Type, handle and owner are answered without the tags.
+                EXPECT_EQ(mine->type(), "ATTRIB");
+                EXPECT_TRUE(mine->isPatterned());
+                std::vector<std::string> expected = lines(*slow->attributes()[k]);
+                expected[1] = "5 " + TagValues::fromHandle(mine->handle());
+                expected[2] = "330 " + TagValues::fromHandle(fast.reference->handle());
+                EXPECT_EQ(lines(*mine), expected);
+                EXPECT_FALSE(mine->isPatterned());
+            }
+            std::vector<std::string> seqend = lines(*slow->seqend());
+            seqend[1] = "5 " + TagValues::fromHandle(fast.reference->seqend()->handle());
+            seqend[2] = "330 " + TagValues::fromHandle(fast.reference->handle());
+            EXPECT_EQ(lines(*fast.reference->seqend()), seqend);
+            EXPECT_EQ(fast.attributes[3]->text(101), "Embedded Object") << "multi-line part";
+        }
+}
+
+TEST(PatternedObjects, ChangesAfterMakingAreWrittenAndReadBack) {
+    Database db;
+    BlockRecord* block = sampleBlock(db);
+    const Made made = insert(db, *block, {10, 10, 0}, {1, 1, 1}, 0, false, {"A", "B", "C", "D"});
+    const Made other = insert(db, *block, {10, 20, 0}, {1, 1, 1}, 0, false, {"E", "F", "G", "H"});
+    made.attributes[0]->setTextValue("-K9");
+    made.attributes[1]->setPosition({7, 8, 0});
+    const Tag item[] = {Tag{1000, "tied"}};
+    made.attributes[2]->setXData("ZV_PATTERN_TEST", item);
+    made.attributes[3]->erase();
+    other.reference->seqend()->setLayer("ATTS");
+    // The untouched ones stay patterned.
+    EXPECT_TRUE(other.attributes[0]->isPatterned());
+
+    auto copy = DxfLoader::load(DxfWriter::toText(db));
+    EXPECT_NE(copy->table("APPID")->find("ZV_PATTERN_TEST"), nullptr)
+        << "extended data on a patterned object is registered";
+    auto* again = dynamic_cast<BlockReference*>(copy->entityByHandle(made.reference->handle()));
+    ASSERT_NE(again, nullptr);
+    ASSERT_EQ(again->attributes().size(), 3u);
+    EXPECT_EQ(again->attribute("TAG")->textValue(), "-K9");
+    EXPECT_EQ(again->attribute("ALINHADO")->position(), (Point3{7, 8, 0}));
+    EXPECT_EQ(again->attribute("OCULTO")->xdata("ZV_PATTERN_TEST").at(0).value, "tied");
+    EXPECT_EQ(again->attribute("LINHAS"), nullptr);
+    auto* second = dynamic_cast<BlockReference*>(copy->entityByHandle(other.reference->handle()));
+    ASSERT_NE(second, nullptr);
+    EXPECT_EQ(second->attribute("LINHAS")->textValue(), "H");
+    EXPECT_EQ(second->seqend()->layer(), "ATTS");
+}
+
+TEST(PatternedObjects, ADefinitionChangedLaterLeavesEarlierAttributesAsTheyWere) {
+    Database db;
+    BlockRecord* block = sampleBlock(db);
+    const Made before = insert(db, *block, {0, 0, 0}, {1, 1, 1}, 0, false, {});
+    Attribute* first = block->attributeDefinitions()[0];
+    first->setTextValue("new default");
+    first->setReal(40, 9.0, "AcDbText");
+    const Made after = insert(db, *block, {0, 5, 0}, {1, 1, 1}, 0, false, {});
+    // A definition added and one erased change what new references take.
+    block->addAttributeDefinition("NOVO", "", "n", {0, 0, 0}, 1.0);
+    block->attributeDefinitions()[1]->erase();
+    const Made last = insert(db, *block, {0, 10, 0}, {1, 1, 1}, 0, false, {});
+
+    const std::string text = DxfWriter::toText(db);
+    auto copy = DxfLoader::load(text);
+    const auto attribute = [&](const Made& made, std::string_view tag) {
+        auto* reference =
+            dynamic_cast<BlockReference*>(copy->entityByHandle(made.reference->handle()));
+        return reference ? reference->attribute(tag) : nullptr;
+    };
+    ASSERT_NE(attribute(before, "TAG"), nullptr);
+    EXPECT_EQ(attribute(before, "TAG")->textValue(), "-K?");
+    EXPECT_EQ(attribute(before, "TAG")->height(), 2.5);
+    EXPECT_EQ(attribute(after, "TAG")->textValue(), "new default");
+    EXPECT_EQ(attribute(after, "TAG")->height(), 9.0);
+    EXPECT_NE(attribute(after, "ALINHADO"), nullptr);
+    EXPECT_EQ(attribute(last, "ALINHADO"), nullptr);
+    ASSERT_NE(attribute(last, "NOVO"), nullptr);
+    EXPECT_EQ(attribute(last, "NOVO")->textValue(), "n");
+    expandAll(db);
+    EXPECT_EQ(DxfWriter::toText(db), text);
+}
+
+TEST(PatternedObjects, UndoAndASwappedDrawingKeepThem) {
+    Database db;
+    BlockRecord* block = sampleBlock(db);
+    UndoJournal journal;
+    journal.beginGroup(db);
+    fill(db, *block);
+    journal.endGroup(db);
+    const std::string filled = DxfWriter::toText(db);
+    ASSERT_TRUE(journal.undo(db));
+    EXPECT_EQ(patternedCount(db), 0u);
+    EXPECT_EQ(db.modelSpace()->entityCount(), 0u);
+    ASSERT_TRUE(journal.redo(db));
+    EXPECT_EQ(DxfWriter::toText(db), filled);
+
+    // Patterns go with the objects made from them when a drawing takes another's content.
+    auto other = std::make_unique<Database>();
+    BlockRecord* otherBlock = sampleBlock(*other);
+    fill(*other, *otherBlock);
+    const std::string expected = DxfWriter::toText(*other);
+    db.swapContents(*other);
+    other.reset();
+    EXPECT_EQ(DxfWriter::toText(db), expected);
+}
+
+TEST(TagPatterns, HolesAndIdentityAreFilledInOrder) {
+    Database db;
+    std::vector<Tag> tags = {Tag{0, "SEQEND"}, Tag{5, TagPattern::handleHole()},
+                             Tag{330, TagPattern::ownerHole()}, Tag{8, TagPattern::hole(1)},
+                             Tag{62, TagPattern::hole(0)}};
+    const TagPattern pattern(tags);
+    EXPECT_EQ(pattern.holeCount(), 2u);
+    EXPECT_EQ(pattern.type(), "SEQEND");
+    TagPattern::Values* values = pattern.make(db.arena());
+    values->values()[0] = "3";
+    values->values()[1] = "LAYER";
+    std::vector<std::string> visited;
+    pattern.forEach(values->values(), 0x2AF, 0x1F, [&](int code, std::string_view value) {
+        visited.push_back(std::to_string(code) + " " + std::string(value));
+    });
+    EXPECT_EQ(visited,
+              (std::vector<std::string>{"0 SEQEND", "5 2AF", "330 1F", "8 LAYER", "62 3"}));
+    const std::vector<Tag> whole = pattern.expand(values->values(), 0x2AF, 0x1F, db.arena());
+    ASSERT_EQ(whole.size(), 5u);
+    EXPECT_EQ(whole[1].value, "2AF");
+    EXPECT_EQ(whole[4].value, "3");
+    // Extended data is no part of a pattern, and holes are counted.
+    EXPECT_THROW(TagPattern(std::vector<Tag>{Tag{0, "X"}, Tag{1001, "APP"}}), std::logic_error);
+    EXPECT_THROW(TagPattern::hole(TagPattern::kMaxHoles), std::logic_error);
+}
+
+TEST(PatternedObjects, AReferenceMadeForItsAttributesIsMarkedAsTheFirstAttributeWouldMarkIt) {
+    Database db;
+    BlockRecord* block = sampleBlock(db);
+    for (const bool paper : {false, true})
+        for (const double degrees : {0.0, 12.5}) {
+            BlockRecord* owner = paper ? db.paperSpace() : db.modelSpace();
+            const Point3 at{4, -2, 0}, scale{1, 3, 1};
+            const auto layouts = db.attributeLayouts().variableLayouts(db, *block);
+            BlockReference* later = owner->addBlockReference(*block, at, scale, degrees, "PAGE");
+            later->addAttributesFromLayouts(block->basePoint(), at, scale, degrees, layouts, {});
+            BlockReference* marked =
+                db.addBlockReference(*owner, *block, at, scale, degrees, "PAGE", true);
+            EXPECT_EQ(marked->integer(66), 1);
+            marked->addAttributesFromLayouts(block->basePoint(), at, scale, degrees, layouts, {});
+            std::vector<std::string> expected = lines(*later);
+            expected[1] = "5 " + TagValues::fromHandle(marked->handle());
+            EXPECT_EQ(lines(*marked), expected);
+            EXPECT_EQ(marked->attributes().size(), 4u);
+            EXPECT_EQ(marked->tags().back(), (Tag{66, "1"})) << "at the end of its subclass";
+        }
+}
+
+TEST(PatternedObjects, ABlockWhoseBasePointMovesPlacesLaterAttributesByTheNewOne) {
+    Database db;
+    BlockRecord* block = sampleBlock(db);
+    const Made before = insert(db, *block, {10, 0, 0}, {1, 1, 1}, 0, false, {});
+    block->setBasePoint({-3, 7, 0});
+    const Made after = insert(db, *block, {10, 0, 0}, {1, 1, 1}, 0, false, {});
+    BlockReference* slow = db.modelSpace()->addBlockReference(*block, {10, 0, 0});
+    const Attribute* first = block->attributeDefinitions()[0];
+    const Attribute* expected = madeStepByStep(*slow, *first);
+    EXPECT_EQ(after.attributes[0]->position(), expected->position());
+    EXPECT_EQ(after.attributes[0]->position(), (Point3{14, -4, 0}));
+    EXPECT_EQ(before.attributes[0]->position(), (Point3{10, 1, 0})) << "made by the old one";
+}
+
+TEST(ExtendedDataOnFileObjects, AGroupReplacedInPlaceTakesItsRoomOnceAndItsOwnItems) {
+    Database made;
+    BlockRecord* block = made.createBlock("SIMBOLO");
+    BlockReference* symbol = made.modelSpace()->addBlockReference(*block, {1, 2, 0});
+    const Tag first[] = {Tag{1000, "A1"}, Tag{1000, "A2"}};
+    const Tag second[] = {Tag{1000, "B1"}};
+    symbol->setXData("ZV_A", first);
+    symbol->setXData("ZV_B", second);
+    auto loaded = DxfLoader::load(DxfWriter::toText(made));
+    DbObject* read = loaded->objectByHandle(symbol->handle());
+    ASSERT_NE(read, nullptr);
+    const std::size_t before = read->tags().size();
+
+    const Tag longer[] = {Tag{1000, "C1"}, Tag{1070, "7"}, Tag{1000, "C3"}, Tag{1000, "C4"}};
+    read->setXData("ZV_A", longer);
+    EXPECT_EQ(read->tags().size(), before + 2);
+    EXPECT_EQ(read->editTags().capacity(), read->tags().size()) << "copied at its new size";
+    EXPECT_EQ(read->xdataApplications(), (std::vector<std::string_view>{"ZV_A", "ZV_B"}));
+    ASSERT_EQ(read->xdata("ZV_A").size(), 4u);
+    EXPECT_EQ(read->xdata("ZV_A")[1], (Tag{1070, "7"}));
+
+    // Its own items given back, shorter: no stale view of the list it changes.
+    read->setXData("ZV_B", read->xdataItems("ZV_A").first(2));
+    EXPECT_EQ(read->xdata("ZV_B"), (std::vector<Tag>{Tag{1000, "C1"}, Tag{1070, "7"}}));
+    EXPECT_EQ(read->xdata("ZV_A").size(), 4u);
+    auto again = DxfLoader::load(DxfWriter::toText(*loaded));
+    EXPECT_EQ(again->objectByHandle(symbol->handle())->xdata("ZV_B").size(), 2u);
+}
+
+TEST(ExtendedDataOnFileObjects, AnApplicationIsRegisteredOnceAndAgainAfterItsRecordGoes) {
+    Database db;
+    EXPECT_TRUE(db.registerApplication("ZV_APP"));
+    EXPECT_FALSE(db.registerApplication("zv_app")) << "names are compared without case";
+    EXPECT_TRUE(db.registerApplication("ZV_OTHER"));
+    EXPECT_FALSE(db.registerApplication("ZV_APP"));
+    db.table("APPID")->find("ZV_APP")->erase();
+    db.table("APPID")->reindex();
+    EXPECT_FALSE(db.isApplicationRegistered("ZV_APP"));
+    EXPECT_TRUE(db.registerApplication("ZV_APP"));
+    EXPECT_TRUE(db.isApplicationRegistered("ZV_APP"));
+    // A drawing that takes another's content answers from its own table.
+    Database other;
+    db.swapContents(other);
+    EXPECT_TRUE(db.registerApplication("ZV_APP"));
+    EXPECT_FALSE(other.registerApplication("ZV_OTHER"));
+}
