@@ -159,6 +159,7 @@ public:
 private:
     friend class BlockRecord;
     friend class DbObject;
+    friend class Extents;
     friend class DxfLoader;
     friend class DxfWriter;
     friend class DeepCloner;
@@ -209,6 +210,20 @@ private:
     DbObject* lastApplication_ = nullptr;
     std::uint64_t changes_ = 0;
     std::uint64_t contentId_ = 0;
+    // Bounds of block definitions Extents worked out, by block handle and nesting depth;
+    // good while the change count is `boundsAt_`.
+    struct BoundsKey {
+        std::uint64_t handle;
+        int depth;
+        bool operator==(const BoundsKey&) const = default;
+    };
+    struct BoundsHash {
+        std::size_t operator()(const BoundsKey& k) const {
+            return std::hash<std::uint64_t>{}(k.handle * 32 + std::uint64_t(k.depth));
+        }
+    };
+    mutable std::unordered_map<BoundsKey, BoundingBox, BoundsHash> blockBounds_;
+    mutable std::uint64_t boundsAt_ = 0;
 };
 
 }  // namespace zvdb

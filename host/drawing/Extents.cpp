@@ -3,6 +3,7 @@
 #include "Attribute.h"
 #include "BlockRecord.h"
 #include "BlockReference.h"
+#include "Database.h"
 #include "Polyline.h"
 #include "TextEntity.h"
 
@@ -40,12 +41,25 @@ BoundingBox Extents::ofBlock(const BlockRecord& block) {
     return ofBlock(block, 0);
 }
 
+// A block inserted many times is measured once until the drawing changes: a page's
+// extents ask for the same few symbols over and over.
 BoundingBox Extents::ofBlock(const BlockRecord& block, int depth) {
     BoundingBox box;
     if (depth > kMaxDepth) return box;
+    const Database& db = block.database();
+    if (db.boundsAt_ != db.changeCount()) {
+        db.blockBounds_.clear();
+        db.boundsAt_ = db.changeCount();
+    }
+    const Database::BoundsKey key{block.handle(), depth};
+    if (block.handle() != 0) {
+        const auto known = db.blockBounds_.find(key);
+        if (known != db.blockBounds_.end()) return known->second;
+    }
     block.forEachEntity([&](Entity& entity) {
         if (!entity.isType("ATTDEF")) box.add(ofEntity(entity, false, depth + 1));
     });
+    if (block.handle() != 0 && db.boundsAt_ == db.changeCount()) db.blockBounds_.emplace(key, box);
     return box;
 }
 

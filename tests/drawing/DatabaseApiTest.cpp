@@ -440,6 +440,43 @@ TEST_F(DatabaseApi, ExtentsOfEntitiesAndBlocks) {
     EXPECT_TRUE(Extents::ofEntity(*ms->addMText({0, 0, 0}, 1, "abc"), false).max.x > 0);
 }
 
+// A block's bounds are kept between questions: every kind of change to its entities must
+// be seen by the next question.
+TEST_F(DatabaseApi, BlockBoundsFollowChangesOfTheBlock) {
+    BlockRecord* ms = db.modelSpace();
+    BlockRecord* block = db.createBlock("KEPT", {0, 0, 0});
+    Entity* line = block->addLine({0, 0, 0}, {2, 1, 0});
+    BlockReference* a = ms->addBlockReference(*block, {10, 0, 0}, {1, 1, 1}, 0);
+    BlockReference* b = ms->addBlockReference(*block, {20, 0, 0}, {1, 1, 1}, 0);
+    EXPECT_EQ(Extents::ofEntity(*a, false).max, (Point3{12, 1, 0}));
+    EXPECT_EQ(Extents::ofEntity(*b, false).max, (Point3{22, 1, 0}));
+
+    line->setPoint(11, {4, 3, 0});  // an entity of the block edited
+    EXPECT_EQ(Extents::ofEntity(*a, false).max, (Point3{14, 3, 0}));
+    Entity* circle = block->addCircle({0, 0, 0}, 5);  // an entity added
+    EXPECT_EQ(Extents::ofEntity(*b, false).min, (Point3{15, -5, 0}));
+    circle->erase();  // and taken away
+    EXPECT_EQ(Extents::ofEntity(*b, false).min, (Point3{20, 0, 0}));
+    EXPECT_EQ(Extents::ofBlock(*block).max, (Point3{4, 3, 0}));
+
+    // Nested: the inner block's change shows through the outer one.
+    BlockRecord* outer = db.createBlock("OUTER", {0, 0, 0});
+    outer->addBlockReference(*block, {100, 0, 0}, {1, 1, 1}, 0);
+    BlockReference* c = ms->addBlockReference(*outer, {0, 0, 0}, {1, 1, 1}, 0);
+    EXPECT_EQ(Extents::ofEntity(*c, false).max, (Point3{104, 3, 0}));
+    line->setPoint(11, {6, 3, 0});
+    EXPECT_EQ(Extents::ofEntity(*c, false).max, (Point3{106, 3, 0}));
+
+    // Another drawing swapped in (as undo does): its blocks' bounds, not the kept ones.
+    Database other;
+    BlockRecord* same = other.createBlock("KEPT", {0, 0, 0});
+    same->addLine({0, 0, 0}, {1, 9, 0});
+    db.swapContents(other);
+    const BlockRecord* swapped = db.block("KEPT");
+    ASSERT_NE(swapped, nullptr);
+    EXPECT_EQ(Extents::ofBlock(*swapped).max, (Point3{1, 9, 0}));
+}
+
 TEST_F(DatabaseApi, EntitiesMoveByAnOffset) {
     BlockRecord* block = db.createBlock("MOVED", {5, 5, 0});
     Entity* line = block->addLine({5, 5, 0}, {7, 5, 0});
