@@ -73,6 +73,7 @@ void CCDataReader::LiberaLeituras() {
     rotasLidas_ = false;
     Esvazia(caminhos_);
     Esvazia(entidadesLidas_);
+    Esvazia(entidadesAntigas_);
     Esvazia(formas_);
     Esvazia(numerosFios_);
     Esvazia(numerosCabos_);
@@ -400,6 +401,7 @@ void CCDataReader::ConfereVersao() const {
     corteDe_ = OdDbObjectId();
     ligacoesPorElemento_.clear();
     entidadesLidas_.clear();
+    entidadesAntigas_.clear();
     versaoLidas_ = versao;
 }
 
@@ -740,13 +742,29 @@ CCDataReader::EntidadeLida CCDataReader::LeEntidadeGuardada(const OdDbObjectId& 
     return lida;
 }
 
+const CCDataReader::EntidadeLida& CCDataReader::EntidadeGuardada(const OdDbObjectId& id,
+                                                                 CETemplate* modelo) {
+    if (auto achado = entidadesLidas_.find(id); achado != entidadesLidas_.end())
+        return achado->second;
+    EntidadeLida lida;
+    if (auto antiga = entidadesAntigas_.find(id); antiga != entidadesAntigas_.end()) {
+        lida = std::move(antiga->second);
+        entidadesAntigas_.erase(antiga);
+    } else {
+        lida = LeEntidadeGuardada(id, modelo);
+    }
+    if (entidadesLidas_.size() >= limiteLidas_) {
+        // The turn: what was not asked for again since the last one goes.
+        entidadesAntigas_ = std::move(entidadesLidas_);
+        entidadesLidas_ = {};
+    }
+    return entidadesLidas_.emplace(id, std::move(lida)).first->second;
+}
+
 void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
                                  CETemplate* modelo) {
     ConfereVersao();
-    auto achado = entidadesLidas_.find(id);
-    if (achado == entidadesLidas_.end())
-        achado = entidadesLidas_.emplace(id, LeEntidadeGuardada(id, modelo)).first;
-    const EntidadeLida& lida = achado->second;
+    const EntidadeLida& lida = EntidadeGuardada(id, modelo);
     const bool rotas = lida.rotas;
     FormaCampos::ComSufixo& com = lida.forma->Com(sufixo);
     const std::uint32_t qtd = com.qtd;
