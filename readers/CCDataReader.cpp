@@ -78,6 +78,7 @@ void CCDataReader::LiberaLeituras() {
     Esvazia(numerosFios_);
     Esvazia(numerosCabos_);
     Esvazia(ligacoesPorElemento_);
+    Esvazia(ligacoesAntigas_);
     corteDe_ = OdDbObjectId();
     versaoLidas_ = 0;
     // Items share these texts; they keep theirs.
@@ -400,6 +401,7 @@ void CCDataReader::ConfereVersao() const {
     numerosCabos_.clear();
     corteDe_ = OdDbObjectId();
     ligacoesPorElemento_.clear();
+    ligacoesAntigas_.clear();
     entidadesLidas_.clear();
     entidadesAntigas_.clear();
     versaoLidas_ = versao;
@@ -482,8 +484,11 @@ std::unique_ptr<zv::CEAtributo> CCDataReader::AtributoConexaoProximo(const OdDbO
     auto achado = ligacoesPorElemento_.find(elemento);
     if (achado == ligacoesPorElemento_.end()) {
         std::vector<LigacaoGuardada> ligacoes;
-        if (atributosDe_ == elemento &&
-            atributosVersao_ == CICad::VersaoDesenho(elemento.database())) {
+        if (auto antiga = ligacoesAntigas_.find(elemento); antiga != ligacoesAntigas_.end()) {
+            ligacoes = std::move(antiga->second);
+            ligacoesAntigas_.erase(antiga);
+        } else if (atributosDe_ == elemento &&
+                   atributosVersao_ == CICad::VersaoDesenho(elemento.database())) {
             for (const LigacaoLida& lida : ligacoesLidas_)
                 ligacoes.push_back({CICad::GetPosicaoTexto(lida.id),
                                     zv::CEAtributo(lida.tag, QString(), lida.valor, lida.id,
@@ -500,6 +505,11 @@ std::unique_ptr<zv::CEAtributo> CCDataReader::AtributoConexaoProximo(const OdDbO
             }
         }
         atributosDe_ = OdDbObjectId();
+        if (ligacoesPorElemento_.size() >= limiteLidas_) {
+            // The turn, as for the entities kept read.
+            ligacoesAntigas_ = std::move(ligacoesPorElemento_);
+            ligacoesPorElemento_ = {};
+        }
         achado = ligacoesPorElemento_.emplace(elemento, std::move(ligacoes)).first;
     }
     const LigacaoGuardada* melhor = nullptr;

@@ -89,7 +89,8 @@ public:
     // wire stands at the ends of many wires and sides, and its copies share their texts.
     void CopiaEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
                        CETemplate* modelo);
-    // The entities CopiaEntidade keeps read are bounded: past `n` (at least 1) kept since the
+    // The entities CopiaEntidade keeps read, and the elements' connection attributes, are
+    // bounded: past `n` (at least 1) kept since the
     // last turn, those not asked for again since the turn before go, and a later copy reads
     // them again. A list's neighbours are asked for close together, so few are read twice.
     void LimitaEntidadesGuardadas(std::size_t n) { limiteLidas_ = std::max<std::size_t>(n, 1); }
@@ -242,7 +243,9 @@ private:
         CEPonto posicao;
         zv::CEAtributo atributo;
     };
-    mutable std::unordered_map<OdDbObjectId, std::vector<LigacaoGuardada>> ligacoesPorElemento_;
+    // Bounded in two turns as the entities kept read are.
+    mutable std::unordered_map<OdDbObjectId, std::vector<LigacaoGuardada>> ligacoesPorElemento_,
+        ligacoesAntigas_;
     // The last cut point asked for: both sides of a terminal ask for it.
     mutable OdDbObjectId corteDe_;
     mutable CEPonto corte_;
