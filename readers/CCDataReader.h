@@ -222,8 +222,9 @@ private:
     // Those asked for since the last turn, and those of the turn before, which move back when
     // asked for again and go at the next turn.
     mutable std::unordered_map<OdDbObjectId, EntidadeLida> entidadesLidas_, entidadesAntigas_;
-    static constexpr std::size_t kLimiteLidas = 2048;
-    std::size_t limiteLidas_ = kLimiteLidas;
+    // Unbounded unless the reader sets a bound: the other lists ask in orders that would read
+    // many again.
+    std::size_t limiteLidas_ = SIZE_MAX;
     // The entity's kept reading, read now when none is kept.
     const EntidadeLida& EntidadeGuardada(const OdDbObjectId& id, CETemplate* modelo);
     // The entity read apart into the form CopiaEntidade keeps.
