@@ -236,6 +236,9 @@ VetorItens* CCBorneDataReader::LerDados(zvdb::Database* database,
         if (nome.startsWith("BORNE")) Aceita(CriaItemVirtual(id), modelo, *itens);
     }
     progresso.Definir(90);
+    // The numbers seen were only for the repeat check: the writer that follows needs the
+    // memory.
+    QHash<QString, QString>().swap(jumperPorNumero_);
 
     if (modelo.LerLogico("*SEL_REGUA_BORNE_CFG*")) {
         VetorItens escolhidos = SelecionaReguas(*itens);

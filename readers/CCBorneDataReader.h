@@ -8,7 +8,12 @@
 class CCBorneDataReader : public CCDataReader {
 public:
     // A terminal's sides need the wires' elements and points, never their whole texts.
-    CCBorneDataReader() { GuardaCompletas = false; }
+    // Its terminals ask for their neighbours strip by strip: a few thousand kept read are
+    // enough.
+    CCBorneDataReader() {
+        GuardaCompletas = false;
+        LimitaEntidadesGuardadas(2048);
+    }
     void LerLadoIni(CEItemLista& item, const OdDbObjectId& borne, CETemplate& modelo) override;
     void LerLadoFim(CEItemLista& item, const OdDbObjectId& borne, CETemplate& modelo) override;
     // Reads every page of the database; the page list is not used.

@@ -73,10 +73,12 @@ void CCDataReader::LiberaLeituras() {
     rotasLidas_ = false;
     Esvazia(caminhos_);
     Esvazia(entidadesLidas_);
+    Esvazia(entidadesAntigas_);
     Esvazia(formas_);
     Esvazia(numerosFios_);
     Esvazia(numerosCabos_);
     Esvazia(ligacoesPorElemento_);
+    Esvazia(ligacoesAntigas_);
     corteDe_ = OdDbObjectId();
     versaoLidas_ = 0;
     // Items share these texts; they keep theirs.
@@ -399,7 +401,9 @@ void CCDataReader::ConfereVersao() const {
     numerosCabos_.clear();
     corteDe_ = OdDbObjectId();
     ligacoesPorElemento_.clear();
+    ligacoesAntigas_.clear();
     entidadesLidas_.clear();
+    entidadesAntigas_.clear();
     versaoLidas_ = versao;
 }
 
@@ -480,8 +484,11 @@ std::unique_ptr<zv::CEAtributo> CCDataReader::AtributoConexaoProximo(const OdDbO
     auto achado = ligacoesPorElemento_.find(elemento);
     if (achado == ligacoesPorElemento_.end()) {
         std::vector<LigacaoGuardada> ligacoes;
-        if (atributosDe_ == elemento &&
-            atributosVersao_ == CICad::VersaoDesenho(elemento.database())) {
+        if (auto antiga = ligacoesAntigas_.find(elemento); antiga != ligacoesAntigas_.end()) {
+            ligacoes = std::move(antiga->second);
+            ligacoesAntigas_.erase(antiga);
+        } else if (atributosDe_ == elemento &&
+                   atributosVersao_ == CICad::VersaoDesenho(elemento.database())) {
             for (const LigacaoLida& lida : ligacoesLidas_)
                 ligacoes.push_back({CICad::GetPosicaoTexto(lida.id),
                                     zv::CEAtributo(lida.tag, QString(), lida.valor, lida.id,
@@ -498,6 +505,11 @@ std::unique_ptr<zv::CEAtributo> CCDataReader::AtributoConexaoProximo(const OdDbO
             }
         }
         atributosDe_ = OdDbObjectId();
+        if (ligacoesPorElemento_.size() >= limiteLidas_) {
+            // The turn, as for the entities kept read.
+            ligacoesAntigas_ = std::move(ligacoesPorElemento_);
+            ligacoesPorElemento_ = {};
+        }
         achado = ligacoesPorElemento_.emplace(elemento, std::move(ligacoes)).first;
     }
     const LigacaoGuardada* melhor = nullptr;
@@ -740,13 +752,29 @@ CCDataReader::EntidadeLida CCDataReader::LeEntidadeGuardada(const OdDbObjectId& 
     return lida;
 }
 
+const CCDataReader::EntidadeLida& CCDataReader::EntidadeGuardada(const OdDbObjectId& id,
+                                                                 CETemplate* modelo) {
+    if (auto achado = entidadesLidas_.find(id); achado != entidadesLidas_.end())
+        return achado->second;
+    EntidadeLida lida;
+    if (auto antiga = entidadesAntigas_.find(id); antiga != entidadesAntigas_.end()) {
+        lida = std::move(antiga->second);
+        entidadesAntigas_.erase(antiga);
+    } else {
+        lida = LeEntidadeGuardada(id, modelo);
+    }
+    if (entidadesLidas_.size() >= limiteLidas_) {
+        // The turn: what was not asked for again since the last one goes.
+        entidadesAntigas_ = std::move(entidadesLidas_);
+        entidadesLidas_ = {};
+    }
+    return entidadesLidas_.emplace(id, std::move(lida)).first->second;
+}
+
 void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
                                  CETemplate* modelo) {
     ConfereVersao();
-    auto achado = entidadesLidas_.find(id);
-    if (achado == entidadesLidas_.end())
-        achado = entidadesLidas_.emplace(id, LeEntidadeGuardada(id, modelo)).first;
-    const EntidadeLida& lida = achado->second;
+    const EntidadeLida& lida = EntidadeGuardada(id, modelo);
     const bool rotas = lida.rotas;
     FormaCampos::ComSufixo& com = lida.forma->Com(sufixo);
     const std::uint32_t qtd = com.qtd;

@@ -10,6 +10,7 @@
 #include <QHash>
 #include <QStringList>
 
+#include <algorithm>
 #include <memory>
 #include <optional>
 #include <unordered_map>
@@ -88,6 +89,11 @@ public:
     // wire stands at the ends of many wires and sides, and its copies share their texts.
     void CopiaEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
                        CETemplate* modelo);
+    // The entities CopiaEntidade keeps read, and the elements' connection attributes, are
+    // bounded: past `n` (at least 1) kept since the
+    // last turn, those not asked for again since the turn before go, and a later copy reads
+    // them again. A list's neighbours are asked for close together, so few are read twice.
+    void LimitaEntidadesGuardadas(std::size_t n) { limiteLidas_ = std::max<std::size_t>(n, 1); }
     CEItemLista* CriaItemBloco(const OdDbObjectId& referencia, CETemplate& modelo);
     CEItemLista* CriaItemFio(const OdDbObjectId& polilinha, CETemplate& modelo);
     CEItemLista* CriaItemVirtual(const OdDbObjectId& registro);
@@ -213,7 +219,14 @@ private:
         bool qtdPadrao = false;
         bool rotas = false;
     };
-    mutable std::unordered_map<OdDbObjectId, EntidadeLida> entidadesLidas_;
+    // Those asked for since the last turn, and those of the turn before, which move back when
+    // asked for again and go at the next turn.
+    mutable std::unordered_map<OdDbObjectId, EntidadeLida> entidadesLidas_, entidadesAntigas_;
+    // Unbounded unless the reader sets a bound: the other lists ask in orders that would read
+    // many again.
+    std::size_t limiteLidas_ = SIZE_MAX;
+    // The entity's kept reading, read now when none is kept.
+    const EntidadeLida& EntidadeGuardada(const OdDbObjectId& id, CETemplate* modelo);
     // The entity read apart into the form CopiaEntidade keeps.
     EntidadeLida LeEntidadeGuardada(const OdDbObjectId& id, CETemplate* modelo);
     // Per wire polyline: its number as NumeroDoFio gives it, and whether its own field holds
@@ -231,7 +244,9 @@ private:
         CEPonto posicao;
         zv::CEAtributo atributo;
     };
-    mutable std::unordered_map<OdDbObjectId, std::vector<LigacaoGuardada>> ligacoesPorElemento_;
+    // Bounded in two turns as the entities kept read are.
+    mutable std::unordered_map<OdDbObjectId, std::vector<LigacaoGuardada>> ligacoesPorElemento_,
+        ligacoesAntigas_;
     // The last cut point asked for: both sides of a terminal ask for it.
     mutable OdDbObjectId corteDe_;
     mutable CEPonto corte_;

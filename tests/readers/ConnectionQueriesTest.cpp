@@ -322,6 +322,54 @@ TEST_F(NeighbourTest, ANeighbourThatDoesNotOpenLeavesTheSideBlank) {
     EXPECT_FALSE(item.valorCampo("LAYER_SEGFIM").isEmpty());
 }
 
+// A reader that keeps few entities read reads the dropped ones again: every side of every
+// terminal gets what a reader that keeps them all gives, also a symbol wired to two terminals
+// and copied under both sides' suffixes.
+TEST_F(NeighbourTest, EntitiesReadAgainAfterBeingDroppedGiveTheSameSides) {
+    // 201: M -> X (X's insertion point); 202: Y's cut point -> M.
+    zvdb::BlockReference* m = simbolo("NA-1", {200, 200, 0});
+    m->addAttribute("TAG", "-M1", {200, 205, 0}, 2.5);
+    // Each terminal's relation names the connection nearest its wire's end.
+    m->addAttribute("LIGACAO1", "A1", {200, 188, 0}, 2.5);
+    m->addAttribute("LIGACAO2", "A2", {200, 202, 0}, 2.5);
+    zvdb::BlockReference* x = simbolo("BORNE_1", {200, 150, 0});
+    zvdb::BlockReference* y = simbolo("BORNE_1", {200, 260, 0});
+    fio({{200, 190, 0}, {200, 150, 0}}, "201");
+    fio({{200, 250, 0}, {200, 200, 0}}, "202");
+    CCBorneDataReader todos, poucos;
+    poucos.LimitaEntidadesGuardadas(1);
+    todos.CarregaConexoesFios();
+    poucos.CarregaConexoesFios();
+    TemplateDouble modelo;
+    modelo.simbolos["*CHAR_SEP_STD_CFG*"] = ":";
+    modelo.simbolos["*ORDEM_CONCAT_STD*"] = "1";
+    auto lados = [&](CCDataReader& leitor, const zvdb::BlockReference* borne) {
+        CEItemLista item;
+        leitor.LerLadoIni(item, id(borne), modelo);
+        leitor.LerLadoFim(item, id(borne), modelo);
+        return item;
+    };
+    const std::vector<zvdb::BlockReference*> bornes = {x, t, y, u, v, x, b, w, d, s, y, t};
+    for (int volta = 0; volta < 2; ++volta)
+        for (const zvdb::BlockReference* borne : bornes) {
+            const CEItemLista esperado = lados(todos, borne);
+            const CEItemLista item = lados(poucos, borne);
+            EXPECT_EQ(item.campos.keys(), esperado.campos.keys()) << handle(borne).toStdString();
+            EXPECT_EQ(item.campos.values(), esperado.campos.values())
+                << handle(borne).toStdString();
+        }
+    const CEItemLista emX = lados(poucos, x);
+    const CEItemLista emY = lados(poucos, y);
+    EXPECT_EQ(emX.valorCampo("HANDLE_FIM"), handle(m));
+    EXPECT_EQ(emX.valorCampo("TAG_FIM"), "-M1:A1");
+    EXPECT_FALSE(emX.temCampo("HANDLE_INI"));
+    EXPECT_EQ(emY.valorCampo("HANDLE_INI"), handle(m));
+    EXPECT_EQ(emY.valorCampo("TAG_INI"), "-M1:A2");
+    EXPECT_FALSE(emY.temCampo("HANDLE_FIM"));
+    EXPECT_EQ(emX.valorCampo("FIO_SEGFIM"), "201") << emX.textoCampos().toStdString();
+    EXPECT_EQ(emY.valorCampo("FIO_SEGINI"), "202");
+}
+
 // The neighbour's relation and connection, joined the way each template says; a terminal
 // whose INVERTIDO reads "S" in any case has its sides' suffixes swapped.
 TEST_F(NeighbourTest, ASideJoinsRelationAndConnectionAsItsTemplateSays) {
