@@ -71,8 +71,41 @@ CERegistrosCatalogo CEConexaoCatalogo::Consultar(const QString& instrucao, bool 
     return {};
 }
 
+CERegistrosCatalogo CEConexaoCatalogo::ConsultarValores(const QString& modelo,
+                                                        const QStringList& valores,
+                                                        const QString& instrucao) {
+    if (!Conectar()) return {};
+    if (QSqlQuery* preparada = Preparada(modelo)) {
+        ++enviadas_;
+        ultima_ = instrucao;
+        erro_.clear();
+        for (int i = 0; i < valores.size(); ++i)
+            preparada->bindValue(i, valores[i]);
+        if (preparada->exec()) {
+            CERegistrosCatalogo registros = Linhas(*preparada);
+            // A statement left open keeps the file locked against writers.
+            preparada->finish();
+            return registros;
+        }
+        // The text tells what went wrong, and upgrades as usual.
+        preparadas_.remove(modelo);
+    }
+    return Consultar(instrucao, true);
+}
+
+QSqlQuery* CEConexaoCatalogo::Preparada(const QString& modelo) {
+    if (dialeto_.motor() != CEDialetoCatalogo::Sqlite) return nullptr;
+    auto it = preparadas_.find(modelo);
+    if (it != preparadas_.end()) return &it.value();
+    QSqlQuery consulta(banco_);
+    consulta.setForwardOnly(true);
+    if (!consulta.prepare(modelo)) return nullptr;
+    return &preparadas_.insert(modelo, consulta).value();
+}
+
 bool CEConexaoCatalogo::Executar(const QString& instrucao) {
     if (!Conectar()) return false;
+    EsquecerPreparadas();
     if (Rodar(instrucao).Executada()) return true;
     CICad::Log("Catalogue statement failed: " + erro_ + " - " + instrucao);
     return false;
@@ -125,6 +158,7 @@ bool CEConexaoCatalogo::Abrir(const CEDialetoCatalogo::Ligacao& ligacao) {
 }
 
 void CEConexaoCatalogo::Fechar() {
+    EsquecerPreparadas();
     if (!banco_.isValid()) return;
     banco_.close();
     banco_ = QSqlDatabase();
@@ -135,12 +169,19 @@ CERegistrosCatalogo CEConexaoCatalogo::Rodar(const QString& instrucao) {
     ++enviadas_;
     ultima_ = instrucao;
     erro_.clear();
+    // Anything but a read may change the catalogue under the compiled statements.
+    if (!preparadas_.isEmpty() && !instrucao.trimmed().startsWith("select", Qt::CaseInsensitive))
+        EsquecerPreparadas();
     QSqlQuery consulta(banco_);
     consulta.setForwardOnly(true);
     if (!consulta.exec(instrucao)) {
         erro_ = DescricaoErro(consulta.lastError());
         return {};
     }
+    return Linhas(consulta);
+}
+
+CERegistrosCatalogo CEConexaoCatalogo::Linhas(QSqlQuery& consulta) const {
     const QSqlRecord registro = consulta.record();
     QStringList nomes;
     for (int i = 0; i < registro.count(); ++i)

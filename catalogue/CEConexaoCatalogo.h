@@ -4,9 +4,11 @@
 #include "CEDialetoCatalogo.h"
 #include "CERegistrosCatalogo.h"
 
+#include <QHash>
 #include <QString>
 #include <QStringList>
 #include <QtSql/QSqlDatabase>
+#include <QtSql/QSqlQuery>
 
 class CEConexaoCatalogo {
 public:
@@ -23,6 +25,13 @@ public:
     // opens or the statement fails.
     CERegistrosCatalogo Consultar(const QString& instrucao, bool atualizar = false,
                                   bool mostrar = false);
+    // A look-up of one shape asked again and again with other values: `modelo` is its text
+    // with a `?` for each value, `instrucao` the same statement with the values pasted in.
+    // The shape names its columns. On an SQLite catalogue it is compiled once and run again with
+    // the new values until the catalogue changes; otherwise, or when that fails, `instrucao` runs
+    // as Consultar(instrucao, true) does.
+    CERegistrosCatalogo ConsultarValores(const QString& modelo, const QStringList& valores,
+                                         const QString& instrucao);
     // Runs a statement without rows; false when there is no catalogue or it failed (the
     // failure goes to the log).
     bool Executar(const QString& instrucao);
@@ -72,6 +81,13 @@ private:
 
     // Runs the statement on the open connection; an answer that did not run on failure.
     CERegistrosCatalogo Rodar(const QString& instrucao);
+    // The rows of a statement that ran.
+    CERegistrosCatalogo Linhas(QSqlQuery& consulta) const;
+    // The compiled statement of a shape, made on first use; null when the engine keeps
+    // none or the shape does not compile.
+    QSqlQuery* Preparada(const QString& modelo);
+    // A write or an upgrade may change what a compiled statement reads: all go.
+    void EsquecerPreparadas() { preparadas_.clear(); }
     bool Abrir(const CEDialetoCatalogo::Ligacao& ligacao);
     void Fechar();
     bool AvisoLocalDb();
@@ -84,4 +100,5 @@ private:
     int enviadas_ = 0;
     QString ultima_;
     QString erro_;
+    QHash<QString, QSqlQuery> preparadas_;
 };

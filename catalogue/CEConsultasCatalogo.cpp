@@ -61,52 +61,74 @@ QString CEConsultasCatalogo::Primeiro(const QString& instrucao, const QString& c
     return conexao_.Consultar(instrucao, true).Primeiro(coluna);
 }
 
+CERegistrosCatalogo CEConsultasCatalogo::Consultar(const QString& modelo,
+                                                   const QStringList& valores) const {
+    // The statement as text: each `?` becomes its value between single quotes.
+    QString instrucao;
+    instrucao.reserve(modelo.size() + 16 * valores.size());
+    int proximo = 0;
+    for (const QChar c : modelo) {
+        if (c == '?' && proximo < valores.size())
+            instrucao += '\'' + valores[proximo++] + '\'';
+        else
+            instrucao += c;
+    }
+    return conexao_.ConsultarValores(modelo, valores, instrucao);
+}
+
+QString CEConsultasCatalogo::Primeiro(const QString& modelo, const QStringList& valores,
+                                      const QString& coluna) const {
+    return Consultar(modelo, valores).Primeiro(coluna);
+}
+
 QString CEConsultasCatalogo::DescricaoComp(const QString& chave) const {
     if (!Colaveis({chave, Idioma()})) return {};
-    return Primeiro("select rtrim(MENU_DESCR) as MENU_DESCR from BDMENUS where MENU_KEY = '" +
-                        chave + "' AND MENU_KEY_LANG = '" + Idioma() + "'",
-                    "MENU_DESCR");
+    return Primeiro(
+        "select rtrim(MENU_DESCR) as MENU_DESCR from BDMENUS where MENU_KEY = ? AND "
+        "MENU_KEY_LANG = ?",
+        {chave, Idioma()}, "MENU_DESCR");
 }
 
 QString CEConsultasCatalogo::DescricaoFio(const QString& chave) const {
     if (!Colaveis({chave, Idioma()})) return {};
-    return Primeiro("select rtrim(WENU_DESCR) as WENU_DESCR from BDWENUS where WENU_KEY = '" +
-                        chave + "' AND WENU_KEY_LANG = '" + Idioma() + "'",
-                    "WENU_DESCR");
+    return Primeiro(
+        "select rtrim(WENU_DESCR) as WENU_DESCR from BDWENUS where WENU_KEY = ? AND "
+        "WENU_KEY_LANG = ?",
+        {chave, Idioma()}, "WENU_DESCR");
 }
 
 QString CEConsultasCatalogo::DescricaoCabo(const QString& chave) const {
     if (!Colaveis({chave, Idioma()})) return {};
-    return Primeiro("select rtrim(CENU_DESCR) as CENU_DESCR from BDCENU where CENU_KEY = '" +
-                        chave + "' AND CENU_KEY_LANG = '" + Idioma() + "'",
-                    "CENU_DESCR");
+    return Primeiro(
+        "select rtrim(CENU_DESCR) as CENU_DESCR from BDCENU where CENU_KEY = ? AND "
+        "CENU_KEY_LANG = ?",
+        {chave, Idioma()}, "CENU_DESCR");
 }
 
 QString CEConsultasCatalogo::ListaComp(const QString& chave, const QString& norma) const {
     if (!Colaveis({chave, norma})) return {};
     // The tab after "and" is part of the statement as it has always been sent.
-    return Primeiro(
-        "select ZV_LISTA from BDZV where ZV_KEY='" + chave + "' and\tZV_KEY_NOR ='" + norma + "'",
-        "ZV_LISTA");
+    return Primeiro("select ZV_LISTA from BDZV where ZV_KEY=? and\tZV_KEY_NOR =?", {chave, norma},
+                    "ZV_LISTA");
 }
 
 QString CEConsultasCatalogo::ListaFio(const QString& chave, const QString& norma) const {
     if (!Colaveis({chave, norma})) return {};
-    return Primeiro("select WIRE_LISTA from BDWIRE where WIRE_KEY='" + chave +
-                        "' and WIRE_NORMA ='" + norma + "'",
-                    "WIRE_LISTA");
+    return Primeiro("select WIRE_LISTA from BDWIRE where WIRE_KEY=? and WIRE_NORMA =?",
+                    {chave, norma}, "WIRE_LISTA");
 }
 
 QString CEConsultasCatalogo::ListaCabo(const QString& chave, const QString& norma) const {
     if (!Colaveis({chave, norma})) return {};
-    return Primeiro("select CABO_LISTA from BDCABO2 where CABO_KEY='" + chave +
-                        "' and CABO_NORMA ='" + norma + "'",
-                    "CABO_LISTA");
+    return Primeiro("select CABO_LISTA from BDCABO2 where CABO_KEY=? and CABO_NORMA =?",
+                    {chave, norma}, "CABO_LISTA");
 }
 
 QStringList CEConsultasCatalogo::ColunasUsuario(const QString& tabela, const QString& colunaChave,
                                                 const QString& chave) const {
     if (!(Nome(tabela) && Nome(colunaChave) && Colavel(chave))) return {};
+    // Sent as text each time: a compiled "*" would keep the columns of its compiling when
+    // another program changes the table.
     const CERegistrosCatalogo linhas = conexao_.Consultar(
         "SELECT * FROM " + tabela + " WHERE " + colunaChave + " = '" + chave + "'", true);
     QStringList colunas;
@@ -130,15 +152,14 @@ QStringList CEConsultasCatalogo::ColunasCabo(const QString& chave) const {
 
 QString CEConsultasCatalogo::MaterialSap(const QString& chave) const {
     if (!Colavel(chave)) return {};
-    return Primeiro("select MATSAP_MAT from BDMATSAP where MATSAP_TIPO = 'C' AND MATSAP_ZVKEY = '" +
-                        chave + "'",
-                    "MATSAP_MAT");
+    return Primeiro("select MATSAP_MAT from BDMATSAP where MATSAP_TIPO = 'C' AND MATSAP_ZVKEY = ?",
+                    {chave}, "MATSAP_MAT");
 }
 
 QStringList CEConsultasCatalogo::AcessoriosDe(const QString& chave) const {
     if (!Colavel(chave)) return {};
-    const CERegistrosCatalogo linhas = conexao_.Consultar(
-        "select VL_KEY_B, VL_QTDE from BDVINCL where VL_KEY_A = '" + chave + "'", true);
+    const CERegistrosCatalogo linhas =
+        Consultar("select VL_KEY_B, VL_QTDE from BDVINCL where VL_KEY_A = ?", {chave});
     QStringList acessorios;
     for (int i = 0; i < linhas.Linhas(); ++i)
         acessorios << linhas.Valor(i, "VL_KEY_B") + "#" + linhas.Valor(i, "VL_QTDE");
@@ -147,15 +168,16 @@ QStringList CEConsultasCatalogo::AcessoriosDe(const QString& chave) const {
 
 QString CEConsultasCatalogo::TipoComp(const QString& chave) const {
     if (!Colavel(chave)) return {};
-    return Primeiro(" select TIPO_KEY from BDTIPOCOMP where COMP_KEY='" + chave + "'", "TIPO_KEY");
+    return Primeiro(" select TIPO_KEY from BDTIPOCOMP where COMP_KEY=?", {chave}, "TIPO_KEY");
 }
 
 QString CEConsultasCatalogo::BlocoRepresentacao(const QString& chave, const QString& norma,
                                                 const QString& representacao) const {
     if (!Colaveis({chave, norma, representacao})) return {};
-    return Primeiro("select BLK_BLOCO from BDBLOCOS where BLK_ZV_KEY='" + chave +
-                        "' and BLK_NORMA='" + norma + "' and BLK_REP_KEY='" + representacao + "'",
-                    "BLK_BLOCO");
+    return Primeiro(
+        "select BLK_BLOCO from BDBLOCOS where BLK_ZV_KEY=? and BLK_NORMA=? and "
+        "BLK_REP_KEY=?",
+        {chave, norma, representacao}, "BLK_BLOCO");
 }
 
 QString CEConsultasCatalogo::GrupoNome(const QString& grupo, const QString& idioma) const {

@@ -3,6 +3,8 @@
 // connection, with the upgrades on failure, and reads the first row. Keys go into the
 // statements between single quotes as they are, without escaping: a key holding a quote or
 // a backslash answers empty at once, and is never sent.
+#include "CERegistrosCatalogo.h"
+
 #include <QString>
 #include <QStringList>
 
@@ -55,6 +57,11 @@ public:
 private:
     // The first row's value of the column, or empty.
     QString Primeiro(const QString& instrucao, const QString& coluna) const;
+    // The rows of a look-up of `modelo`, with a `?` for each of `valores` (see
+    // CEConexaoCatalogo::ConsultarValores).
+    CERegistrosCatalogo Consultar(const QString& modelo, const QStringList& valores) const;
+    QString Primeiro(const QString& modelo, const QStringList& valores,
+                     const QString& coluna) const;
     static QString Idioma();
 
     CEConexaoCatalogo& conexao_;

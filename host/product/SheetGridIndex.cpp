@@ -30,6 +30,7 @@ void SheetGridIndex::readCatalogue(const CatalogueConnection& catalogue, int lan
     catalogueRead_ = true;
     byKey_.clear();
     asked_.clear();
+    lastGrid_ = nullptr;
     std::map<int, SheetGrid> models;
     for (const QStringList& row : catalogue.rows(
              "select PAGE_KEY, ERASED, COL_LABEL, COL_INT, ROW_LABEL, ROW_INT from BDPAGE")) {
@@ -56,6 +57,7 @@ void SheetGridIndex::readCatalogue(const CatalogueConnection& catalogue, int lan
 void SheetGridIndex::readRegistry(zvdb::Database& database) {
     keyOf_.clear();
     asked_.clear();
+    lastGrid_ = nullptr;
     const PageRegistry registry(database);
     for (const PageGroup& group : registry.groups())
         keyOf_.emplace(upper(group.name), group.key);
@@ -66,7 +68,18 @@ const SheetGrid& SheetGridIndex::gridOf(zvdb::Database* database, const QString&
     if (!catalogueRead_) readCatalogue();
     if (!database || byKey_.empty()) return fixed_;
     if (!(stamp_ == DrawingStamp::of(*database))) readRegistry(*database);
-    if (const SheetGrid* known = asked_.value(group)) return *known;
+    // Held here, the text stays what it was: the same text is the same group.
+    if (lastGrid_ && group.isSharedWith(lastGroup_)) return *lastGrid_;
+    const SheetGrid* grid = asked_.value(group);
+    if (!grid) grid = askedFirst(group);
+    // A literal's text may be another's once its module is gone: never taken for the same.
+    const bool literal = const_cast<QString&>(group).data_ptr()->ref.isStatic();
+    lastGroup_ = literal ? QString() : group;
+    lastGrid_ = literal ? nullptr : grid;
+    return *grid;
+}
+
+const SheetGrid* SheetGridIndex::askedFirst(const QString& group) {
     const SheetGrid* grid = &fixed_;
     auto key = keyOf_.find(group.toUpper().toStdString());
     if (key != keyOf_.end()) {
@@ -75,7 +88,7 @@ const SheetGrid& SheetGridIndex::gridOf(zvdb::Database* database, const QString&
     }
     // Not a text the caller may take away (a module's constant): a copy of its own.
     asked_.insert(QString(group.constData(), group.size()), grid);
-    return *grid;
+    return grid;
 }
 
 QString SheetGridIndex::position(zvdb::Database* database, const std::string& group, double x,

@@ -29,6 +29,7 @@ public:
 
 private:
     const SheetGrid& gridOf(zvdb::Database* database, const QString& group);
+    const SheetGrid* askedFirst(const QString& group);
     void readCatalogue();
     void readCatalogue(const CatalogueConnection& catalogue, int language);
     void readRegistry(zvdb::Database& database);
@@ -40,6 +41,10 @@ private:
     // The grid of each group as it was asked for (a list asks for every symbol), until the
     // registry is read again.
     QHash<QString, const SheetGrid*> asked_;
+    // The last group asked for and its grid: a list asks for one page's symbols in a row,
+    // with the very text of the layer each time.
+    QString lastGroup_;
+    const SheetGrid* lastGrid_ = nullptr;
     SheetGrid fixed_ = SheetGrid::fixed();
 };
 

@@ -5,6 +5,7 @@
 
 #include "product/ProductSettings.h"
 #include "product/SheetGrid.h"
+#include "product/SheetGridIndex.h"
 
 #include <QDir>
 #include <QFile>
@@ -198,6 +199,38 @@ TEST_F(SheetGridCatalogueTest, LanguageRowsErasedRowsAndOneCatalogueReadPerDocum
                                                     "5.0 250.0)"))
                   .toStdString(),
               "\"B1\"");
+}
+
+TEST_F(SheetGridCatalogueTest, OneTextAskedAgainFollowsTheRegistryAndOtherGroups) {
+    makeCatalogue("own.db",
+                  {"create table BDPAGE (ERASED SMALLINT, PAGE_KEY INTEGER, COL_LABEL "
+                   "varchar(200), COL_INT varchar(200), ROW_LABEL varchar(200), ROW_INT "
+                   "varchar(200))",
+                   "create table BDGROUP (ERASED SMALLINT, GROUP_KEY INTEGER, LANG INTEGER, "
+                   "PAGE INTEGER)",
+                   "insert into BDPAGE values (0, 1, 'A;B', '210', 'X;Y', '100'), "
+                   "(0, 2, '1;2;3', '10;20', 'R', '297')",
+                   "insert into BDGROUP values (0, 7, 1, 1), (0, 8, 1, 2)"});
+    writeSettings("own.db", "1");
+    addGroup("G7", 7, {"G7$0001$A"});
+    addGroup("G8", 8, {"G8$0001$A"});
+    SheetGridIndex index;
+    // The same text each time, as a list passes its layer's group for every symbol.
+    const QString g7 = QString::fromUtf8("G7");
+    const QString g8 = QString::fromUtf8("G8");
+    EXPECT_EQ(index.position(database.get(), g7, 5, 250), "XA");
+    EXPECT_EQ(index.position(database.get(), g7, 300, 150), "YB");
+    EXPECT_EQ(index.position(database.get(), g8, 25, 100), "R2");
+    EXPECT_EQ(index.position(database.get(), g7, 5, 250), "XA");
+    // Another text of the same name, and a literal, answer alike.
+    EXPECT_EQ(index.position(database.get(), QStringLiteral("G7"), 300, 150), "YB");
+    EXPECT_EQ(index.position(database.get(), QStringLiteral("G8"), 5, 100), "R1");
+    EXPECT_EQ(index.position(database.get(), g8, 45, 1), "R3");
+    // The group now has the other key: the held text gives the other grid.
+    addGroup("G7", 8, {"G7$0001$A"});
+    EXPECT_EQ(index.position(database.get(), g7, 25, 100), "R2");
+    addGroup("G7", 99, {"G7$0001$A"});
+    EXPECT_EQ(index.position(database.get(), g7, 35, 297 - 37.125), "B2") << "the fixed grid";
 }
 
 }  // namespace
