@@ -556,16 +556,21 @@ void CCDataReader::LeColunasUsuario(const QString& sufixo, CEItemLista& item,
     // Items of one catalogue key repeat its columns: each text is split once, and the items
     // share the value texts.
     for (const QString& coluna : colunas) {
-        auto it = colunasDivididas_.constFind(coluna);
-        if (it == colunasDivididas_.constEnd()) {
-            QString nome, valor;
-            const bool divide = ZVString(coluna).DivideEmDois(kSeparador, nome, valor);
-            it = colunasDivididas_.insert(
-                coluna, {divide && !nome.isEmpty() ? CamposItem::numero(nome) : kSemColuna, valor});
-        }
-        if (it->first != kSemColuna)
-            item.definirCampo(CamposItem::numeroComSufixo(it->first, sufixo), it->second);
+        const auto& [numero, valor] = ColunaDividida(coluna);
+        if (numero != kSemColuna)
+            item.definirCampo(CamposItem::numeroComSufixo(numero, sufixo), valor);
     }
+}
+
+const std::pair<std::uint32_t, QString>& CCDataReader::ColunaDividida(const QString& coluna) {
+    auto it = colunasDivididas_.constFind(coluna);
+    if (it == colunasDivididas_.constEnd()) {
+        QString nome, valor;
+        const bool divide = ZVString(coluna).DivideEmDois(kSeparador, nome, valor);
+        it = colunasDivididas_.insert(
+            coluna, {divide && !nome.isEmpty() ? CamposItem::numero(nome) : kSemColuna, valor});
+    }
+    return *it;
 }
 
 void CCDataReader::LeLayer(const QString& sufixo, CEItemLista& item, const QString& layer) {

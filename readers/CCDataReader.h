@@ -260,6 +260,8 @@ private:
     // is no column has kSemColuna.
     static constexpr std::uint32_t kSemColuna = ~std::uint32_t(0);
     QHash<QString, std::pair<std::uint32_t, QString>> colunasDivididas_;
+    // A column text split, once for the run, whoever meets it first.
+    const std::pair<std::uint32_t, QString>& ColunaDividida(const QString& coluna);
     // What the catalogue says of a symbol's key and standard: every symbol of a key asks
     // the same, so one look-up serves them all.
     struct CatalogoComp {

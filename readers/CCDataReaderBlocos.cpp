@@ -129,16 +129,9 @@ const CCDataReader::CatalogoComp& CCDataReader::DadosCatalogoComp(const QString&
     if (achado != catalogoComp_.end()) return achado->second;
     CatalogoComp dados;
     dados.colunas = catalogo_.ColunasComp(chave);
-    // Each column text is split once for the run, whoever meets it first.
     for (const QString& coluna : dados.colunas) {
-        auto it = colunasDivididas_.constFind(coluna);
-        if (it == colunasDivididas_.constEnd()) {
-            QString nome, valor;
-            const bool divide = ZVString(coluna).DivideEmDois(kSeparador, nome, valor);
-            it = colunasDivididas_.insert(
-                coluna, {divide && !nome.isEmpty() ? CamposItem::numero(nome) : kSemColuna, valor});
-        }
-        if (it->first != kSemColuna) dados.campos.push_back(*it);
+        const std::pair<std::uint32_t, QString>& dividida = ColunaDividida(coluna);
+        if (dividida.first != kSemColuna) dados.campos.push_back(dividida);
     }
     dados.lista = catalogo_.ListaComp(chave, norma);
     dados.descricao = catalogo_.DescricaoComp(chave);
