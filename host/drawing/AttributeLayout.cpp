@@ -147,18 +147,7 @@ bool AttributeLayout::compose(Database& target, std::vector<Tag>& out, const Pla
         const std::size_t at = variant.slots[static_cast<std::size_t>(slot)];
         if (at != kNone) out[at + shift].value = reals.real(target, number);
     };
-    const Point3 p = placement.transform.apply(position_);
-    put(X, p.x);
-    put(Y, p.y);
-    put(Z, p.z);
-    if (variant.slots[AlignX] != kNone) {
-        const Point3 a = placement.transform.apply(alignment_);
-        put(AlignX, a.x);
-        put(AlignY, a.y);
-        put(AlignZ, a.z);
-    }
-    put(Height, height_ * placement.heightScale);
-    if (rotated) put(Rotation, ownRotation_ + placement.rotation);
+    placeNumbers(placement, rotated, variant.slots[AlignX] != kNone, put);
     if (!value) return true;
     if (variant.value == kNone) return false;
     out[variant.value + shift].value = target.store(*value);
@@ -179,18 +168,7 @@ TagPattern::Values* AttributeLayout::composeValues(
         const std::uint8_t hole = variant.holes[static_cast<std::size_t>(slot)];
         if (hole != kNoHole) holes[hole] = reals.real(target, number);
     };
-    const Point3 p = placement.transform.apply(position_);
-    put(X, p.x);
-    put(Y, p.y);
-    put(Z, p.z);
-    if (variant.holes[AlignX] != kNoHole) {
-        const Point3 a = placement.transform.apply(alignment_);
-        put(AlignX, a.x);
-        put(AlignY, a.y);
-        put(AlignZ, a.z);
-    }
-    put(Height, height_ * placement.heightScale);
-    if (rotated) put(Rotation, ownRotation_ + placement.rotation);
+    placeNumbers(placement, rotated, variant.holes[AlignX] != kNoHole, put);
     if (const std::uint8_t hole = variant.holes[SlotCount]; hole != kNoHole)
         holes[hole] = value ? target.store(*value) : variant.tags[variant.value].value;
     return made;

@@ -64,6 +64,24 @@ public:
                                       const std::optional<std::string_view>& value) const;
 
 private:
+    // Each number an attribute placed so takes, by slot: position, alignment point when the
+    // layout has one, height, rotation when turned.
+    template <class Put>
+    void placeNumbers(const Placement& placement, bool rotated, bool aligned, Put&& put) const {
+        const Point3 p = placement.transform.apply(position_);
+        put(X, p.x);
+        put(Y, p.y);
+        put(Z, p.z);
+        if (aligned) {
+            const Point3 a = placement.transform.apply(alignment_);
+            put(AlignX, a.x);
+            put(AlignY, a.y);
+            put(AlignZ, a.z);
+        }
+        put(Height, height_ * placement.heightScale);
+        if (rotated) put(Rotation, ownRotation_ + placement.rotation);
+    }
+
     struct Variant {
         std::vector<Tag> tags;  // without the paper space flag
         std::array<std::size_t, SlotCount> slots{};
