@@ -172,6 +172,8 @@ CERegistrosCatalogo CEConexaoCatalogo::Rodar(const QString& instrucao) {
     // Anything but a read may change the catalogue under the compiled statements.
     if (!preparadas_.isEmpty() && !instrucao.trimmed().startsWith("select", Qt::CaseInsensitive))
         EsquecerPreparadas();
+    if (dialeto_.motor() == CEDialetoCatalogo::Sqlite && instrucao.contains('*'))
+        AtualizarEsquema();
     QSqlQuery consulta(banco_);
     consulta.setForwardOnly(true);
     if (!consulta.exec(instrucao)) {
@@ -179,6 +181,16 @@ CERegistrosCatalogo CEConexaoCatalogo::Rodar(const QString& instrucao) {
         return {};
     }
     return Linhas(consulta);
+}
+
+void CEConexaoCatalogo::AtualizarEsquema() {
+    // SQLite compiles a statement against the tables' shape it last saw and compiles it again
+    // when it runs if another program changed that shape meanwhile; a row of "*" then has
+    // another number of columns than the driver counted, which it does not survive. A read of
+    // the schema table brings the shape up to date first.
+    QSqlQuery esquema(banco_);
+    esquema.setForwardOnly(true);
+    esquema.exec("SELECT count(*) FROM sqlite_master");
 }
 
 CERegistrosCatalogo CEConexaoCatalogo::Linhas(QSqlQuery& consulta) const {

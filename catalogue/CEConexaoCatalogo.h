@@ -81,6 +81,8 @@ private:
 
     // Runs the statement on the open connection; an answer that did not run on failure.
     CERegistrosCatalogo Rodar(const QString& instrucao);
+    // Brings SQLite's idea of the tables' shape up to date (another program may change it).
+    void AtualizarEsquema();
     // The rows of a statement that ran.
     CERegistrosCatalogo Linhas(QSqlQuery& consulta) const;
     // The compiled statement of a shape, made on first use; null when the engine keeps

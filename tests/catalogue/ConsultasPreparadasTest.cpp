@@ -76,6 +76,20 @@ TEST_F(ConsultasPreparadasTest, AnswersFollowChangesOfAnotherProgram) {
     EXPECT_EQ(consultas.MaterialSap("7001"), "42");
 }
 
+TEST_F(ConsultasPreparadasTest, WholeRowsFollowAColumnAddedByAnotherProgram) {
+    CEConsultasCatalogo consultas;
+    EXPECT_FALSE(consultas.ColunasComp("1001").join('|').contains("OUTRA_W"));
+    // The connection's idea of the table is older than the table now: the row still comes
+    // whole, with the new column.
+    EXPECT_EQ(Outro("alter table BDUSER add column OUTRA_W varchar(10)"), "");
+    EXPECT_EQ(Outro("update BDUSER set OUTRA_W = 'dele' where USER_KEY = '1001'"), "");
+    EXPECT_TRUE(consultas.ColunasComp("1001").contains("OUTRA_W" + QString(kSep) + "dele"));
+    EXPECT_TRUE(consultas.ColunasComp("2001").contains("OUTRA_W" + QString(kSep)));
+    // A column gone goes from the rows too.
+    EXPECT_EQ(Outro("alter table BDUSER drop column OUTRA_W"), "");
+    EXPECT_FALSE(consultas.ColunasComp("1001").join('|').contains("OUTRA_W"));
+}
+
 TEST_F(ConsultasPreparadasTest, EachLookUpCountsAndShowsItsStatementText) {
     CEConsultasCatalogo consultas;
     const int antes = Conexao().InstrucoesEnviadas();
