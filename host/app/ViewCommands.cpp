@@ -4,9 +4,6 @@
 #include "HostDocument.h"
 #include "drawing/BlockRecord.h"
 #include "drawing/Database.h"
-#include "drawing/Entity.h"
-#include "drawing/Extents.h"
-#include "drawing/LayerRecord.h"
 #include "plot/PageIndex.h"
 
 #include <QStringList>
@@ -37,10 +34,8 @@ bool zoomWindow(HostDocument& document, const QStringList& corners) {
 bool zoomExtents(HostDocument& document) {
     zvdb::Database* db = document.database();
     if (!db || !db->modelSpace()) return false;
-    zvdb::BoundingBox box;
     // The index by layer keeps this to the entities of the layers that show.
-    for (const zvdb::Entity* entity : document.plotIndex().visibleEntities())
-        box.add(zvdb::Extents::ofEntity(*entity, true));
+    zvdb::BoundingBox box = document.plotIndex().visibleBounds();
     if (box.isEmpty()) box = zvdb::BoundingBox{{0, 0, 0}, {1, 1, 0}};
     document.setView({box.min.x, box.min.y, box.max.x, box.max.y});
     return true;

@@ -48,9 +48,30 @@ void Database::noteHandle(std::uint64_t handle) {
     if (handle >= nextHandle_) nextHandle_ = handle + 1;
 }
 
+namespace {
+
+std::atomic<std::uint64_t> changeSequence{0};
+
+std::uint64_t nextChange() {
+    return changeSequence.fetch_add(1, std::memory_order_relaxed) + 1;
+}
+
+}  // namespace
+
 void Database::noteChange() {
-    static std::atomic<std::uint64_t> sequence{0};
-    changes_ = sequence.fetch_add(1, std::memory_order_relaxed) + 1;
+    changes_ = nextChange();
+    shapes_ = changes_;
+}
+
+void Database::noteLayerEdit(const DbObject& record) {
+    changes_ = nextChange();
+    // A reader that fell this far behind reads the whole table again.
+    constexpr std::size_t kLongLog = 4096;
+    if (layerEdits_.size() >= kLongLog) {
+        layerEdits_.clear();
+        layerEditsEpoch_ = changes_;
+    }
+    layerEdits_.push_back(&record);
 }
 
 void Database::swapContents(Database& other) {
@@ -77,6 +98,10 @@ void Database::swapContents(Database& other) {
     other.noteChange();
     contentId_ = changes_;
     other.contentId_ = other.changes_;
+    layerEdits_.clear();
+    other.layerEdits_.clear();
+    layerEditsEpoch_ = changes_;
+    other.layerEditsEpoch_ = other.changes_;
 }
 
 DbObject* Database::adopt(std::unique_ptr<DbObject> object) {

@@ -65,6 +65,14 @@ public:
     // Changes whenever swapContents puts other objects in: pointers to objects taken
     // before are then no longer this drawing's.
     std::uint64_t contentId() const { return contentId_; }
+    // Goes up with every change but the edits of layer records (their states, colours,
+    // names): what is worked out from entities and blocks alone stays good while it stays.
+    std::uint64_t shapeCount() const { return shapes_; }
+    // The layer records edited or erased since the log last started again, in order, for
+    // readers that follow the layers' states without walking the table. The log starts
+    // again, under another epoch, when it grows long or the contents are swapped.
+    const std::vector<const DbObject*>& layerEdits() const { return layerEdits_; }
+    std::uint64_t layerEditsEpoch() const { return layerEditsEpoch_; }
     // Trades the whole content with another database, this object staying where it is:
     // what holds a Database& goes on working and sees the other drawing (undo, reload).
     void swapContents(Database& other);
@@ -177,6 +185,7 @@ private:
     std::uint64_t allocateHandle() { return nextHandle_++; }
     void noteHandle(std::uint64_t handle);
     void noteChange();
+    void noteLayerEdit(const DbObject& record);
     void forgetLayout(const DbObject& definition);
     void forgetBlock(BlockRecord& record);
     // The BLOCK and ENDBLK entities of a block record that has none.
@@ -210,6 +219,9 @@ private:
     DbObject* lastApplication_ = nullptr;
     std::uint64_t changes_ = 0;
     std::uint64_t contentId_ = 0;
+    std::uint64_t shapes_ = 0;
+    std::vector<const DbObject*> layerEdits_;
+    std::uint64_t layerEditsEpoch_ = 0;
     // Bounds of block definitions Extents worked out, by block handle and nesting depth;
     // good while the change count is `boundsAt_`.
     struct BoundsKey {

@@ -54,7 +54,10 @@ void DbObject::expand() {
 }
 
 void DbObject::noteEdit() {
-    database_->noteChange();
+    if (layerRecord_)
+        database_->noteLayerEdit(*this);
+    else
+        database_->noteChange();
     if (watched_) {
         watched_ = false;
         database_->forgetLayout(*this);
@@ -478,7 +481,10 @@ void DbObject::addReactor(std::uint64_t handle) {
 
 void DbObject::markErased() {
     erased_ = true;
-    database_->noteChange();
+    if (layerRecord_)
+        database_->noteLayerEdit(*this);
+    else
+        database_->noteChange();
 }
 
 void DbObject::erase() {

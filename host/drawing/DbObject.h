@@ -118,6 +118,9 @@ protected:
     friend class DxfLoader;
     void setHandle(std::uint64_t handle);
     void markErased();
+    // Edits of this object go to the drawing's log of layer edits instead of changing its
+    // shapes (layer records).
+    void logEditsAsLayer() { layerRecord_ = true; }
     // Makes the object own these tags (values already in the database's storage).
     void takeTags(std::vector<Tag> tags);
     std::string_view store(std::string_view text) const;
@@ -147,6 +150,7 @@ private:
     bool erased_ = false;
     bool patterned_ = false;
     mutable bool watched_ = false;
+    bool layerRecord_ = false;
     std::vector<Tag> own_;
     std::uint64_t handle_ = 0;
     std::uint64_t owner_ = 0;

@@ -6,7 +6,9 @@ namespace zvdb {
 
 class LayerRecord : public DbObject {
 public:
-    using DbObject::DbObject;
+    LayerRecord(Database& database, std::span<const Tag> tags) : DbObject(database, tags) {
+        logEditsAsLayer();
+    }
 
     std::string_view name() const { return text(2); }
     bool isFrozen() const { return (integer(70) & 1) != 0; }

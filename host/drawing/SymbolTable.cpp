@@ -41,12 +41,14 @@ std::size_t SymbolTable::size() const {
 
 void SymbolTable::add(DbObject* record) {
     records_.push_back(record);
+    ++indexChanges_;
     const auto [it, added] = byName_.try_emplace(TagValues::upperName(recordName(*record)), record);
     if (!added && it->second->isErased()) it->second = record;  // the name is free again
 }
 
 void SymbolTable::reindex() {
     byName_.clear();
+    ++indexChanges_;
     for (DbObject* record : records_)
         if (!record->isErased())
             byName_.try_emplace(TagValues::upperName(recordName(*record)), record);

@@ -2,6 +2,7 @@
 // One table of the TABLES section (LAYER, LTYPE, BLOCK_RECORD...): its head object and its
 // records in order, found by name without regard to case.
 #include <cstddef>
+#include <cstdint>
 #include <functional>
 #include <string>
 #include <string_view>
@@ -26,6 +27,8 @@ public:
     void add(DbObject* record);
     // After a record was renamed or erased.
     void reindex();
+    // Goes up whenever the index by name is made again or grows.
+    std::uint64_t indexChanges() const { return indexChanges_; }
     // Tables made only in memory (block records of an R12 file) are not written.
     bool isWritten() const { return written_; }
     void setWritten(bool written) { written_ = written; }
@@ -45,6 +48,7 @@ private:
     std::vector<DbObject*> records_;
     std::unordered_map<std::string, DbObject*, NameHash, std::equal_to<>> byName_;
     bool written_ = true;
+    std::uint64_t indexChanges_ = 0;
 };
 
 }  // namespace zvdb

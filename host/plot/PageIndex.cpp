@@ -3,9 +3,12 @@
 #include "drawing/BlockRecord.h"
 #include "drawing/Database.h"
 #include "drawing/Entity.h"
+#include "drawing/Extents.h"
 #include "drawing/LayerRecord.h"
+#include "drawing/SymbolTable.h"
 
 #include <algorithm>
+#include <functional>
 
 namespace zvplot {
 
@@ -15,7 +18,7 @@ PageIndex::PageIndex(const zvdb::Database& database)
     if (!model) return;
     std::size_t order = 0;
     for (zvdb::Entity* entity : model->entities()) {
-        byLayer_[std::string(entity->layer())].push_back({order++, entity});
+        byLayer_[std::string(entity->layer())].placed.push_back({order++, entity});
     }
     entityCount_ = order;
 }
@@ -54,7 +57,7 @@ std::vector<zvdb::Entity*> PageIndex::entitiesOn(const std::vector<std::string>&
     for (const std::string& layer : layers) {
         auto it = byLayer_.find(layer);
         if (it == byLayer_.end()) continue;
-        for (const Placed& placed : it->second)
+        for (const Placed& placed : it->second.placed)
             // An entity moved to another layer since the index was made is left out.
             if (!placed.entity->isErased() && placed.entity->layer() == layer)
                 found.push_back(placed);
@@ -69,12 +72,87 @@ std::vector<zvdb::Entity*> PageIndex::entitiesOn(const std::vector<std::string>&
 }
 
 std::vector<zvdb::Entity*> PageIndex::visibleEntities() const {
-    std::vector<std::string> layers;
-    for (const auto& [name, entities] : byLayer_) {
-        const zvdb::LayerRecord* layer = database_->layer(name);
-        if (!layer || (!layer->isFrozen() && !layer->isOff())) layers.push_back(name);
+    return entitiesOn(showingLayers());
+}
+
+zvdb::BoundingBox PageIndex::visibleBounds() const {
+    const std::vector<std::string> layers = showingLayers();
+    std::string key;
+    for (const std::string& name : layers)
+        key.append(name).push_back('\0');
+    if (boundsAt_ != database_->shapeCount()) {
+        bounds_.clear();
+        boundsAt_ = database_->shapeCount();
     }
-    return entitiesOn(layers);
+    if (auto it = bounds_.find(key); it != bounds_.end()) return it->second;
+    zvdb::BoundingBox box;
+    for (const zvdb::Entity* entity : entitiesOn(layers))
+        box.add(zvdb::Extents::ofEntity(*entity, true));
+    // A run shows its pages one by one; a few hundred sets cover any of them.
+    constexpr std::size_t kKeptSets = 512;
+    if (bounds_.size() >= kKeptSets) bounds_.clear();
+    bounds_.emplace(std::move(key), box);
+    return box;
+}
+
+std::vector<std::string> PageIndex::showingLayers() const {
+    followLayerStates();
+    std::vector<std::string> layers;
+    layers.reserve(showing_.size());
+    for (const std::string* name : showing_)
+        layers.push_back(*name);
+    return layers;
+}
+
+void PageIndex::setShows(std::unordered_map<std::string, Layer>::iterator layer, bool shows) const {
+    if (layer->second.shows == shows) return;
+    layer->second.shows = shows;
+    const std::string* name = &layer->first;
+    auto at = std::lower_bound(showing_.begin(), showing_.end(), name, std::less<>());
+    if (shows)
+        showing_.insert(at, name);
+    else
+        showing_.erase(at);
+}
+
+bool PageIndex::layerShows(const std::string& name) const {
+    const zvdb::LayerRecord* layer = database_->layer(name);
+    return !layer || (!layer->isFrozen() && !layer->isOff());
+}
+
+void PageIndex::followLayerStates() const {
+    const zvdb::SymbolTable* table = database_->table("LAYER");
+    const std::uint64_t tableIndex = table ? table->indexChanges() : 0;
+    const std::vector<const zvdb::DbObject*>& edits = database_->layerEdits();
+    if (!statesKnown_ || statesEpoch_ != database_->layerEditsEpoch() ||
+        tableIndexAt_ != tableIndex || editsSeen_ > edits.size())
+        return readLayerStates();
+    for (; editsSeen_ < edits.size(); ++editsSeen_) {
+        const auto* record = static_cast<const zvdb::LayerRecord*>(edits[editsSeen_]);
+        auto known = recordNames_.find(record);
+        // A record not seen before may change what any name finds; a renamed one does once
+        // the table is indexed again, which reads the whole table.
+        if (known == recordNames_.end()) return readLayerStates();
+        if (auto it = byLayer_.find(known->second); it != byLayer_.end())
+            setShows(it, layerShows(known->second));
+    }
+}
+
+void PageIndex::readLayerStates() const {
+    recordNames_.clear();
+    for (const zvdb::LayerRecord* record : database_->layers())
+        recordNames_.emplace(record, std::string(record->name()));
+    showing_.clear();
+    for (auto& [name, layer] : byLayer_) {
+        layer.shows = layerShows(name);
+        if (layer.shows) showing_.push_back(&name);
+    }
+    std::sort(showing_.begin(), showing_.end(), std::less<>());
+    const zvdb::SymbolTable* table = database_->table("LAYER");
+    tableIndexAt_ = table ? table->indexChanges() : 0;
+    statesEpoch_ = database_->layerEditsEpoch();
+    editsSeen_ = database_->layerEdits().size();
+    statesKnown_ = true;
 }
 
 }  // namespace zvplot

@@ -1,6 +1,8 @@
 #pragma once
 // Model space by layer, made in one pass, so that a page's entities (or those of the layers
 // that are showing) are found without walking the whole drawing for every page.
+#include "drawing/Geometry.h"
+
 #include <cstdint>
 #include <string>
 #include <string_view>
@@ -9,6 +11,7 @@
 
 namespace zvdb {
 class Database;
+class DbObject;
 class Entity;
 }  // namespace zvdb
 
@@ -26,6 +29,10 @@ public:
     std::vector<zvdb::Entity*> entitiesOn(const std::vector<std::string>& layers) const;
     // The entities on the layers that are neither frozen nor off, in drawing order.
     std::vector<zvdb::Entity*> visibleEntities() const;
+    // The bounds of those entities, attributes included. Pages shown in turn show the same
+    // layers again: each set of showing layers is measured once while the drawing's
+    // entities and blocks stay as they are.
+    zvdb::BoundingBox visibleBounds() const;
     // Still a true picture of this drawing: nothing was added since (what was erased is left
     // out as the index is read).
     bool matches(const zvdb::Database& database) const;
@@ -35,11 +42,35 @@ private:
         std::size_t order;
         zvdb::Entity* entity;
     };
+    struct Layer {
+        std::vector<Placed> placed;
+        bool shows = false;  // as the layer table said when last read
+    };
+    // Brings the layers' `shows` up to date: from the drawing's log of layer edits when it
+    // can, from the whole table otherwise.
+    void followLayerStates() const;
+    void readLayerStates() const;
+    void setShows(std::unordered_map<std::string, Layer>::iterator layer, bool shows) const;
+    bool layerShows(const std::string& name) const;
+    std::vector<std::string> showingLayers() const;
+
     const zvdb::Database* database_;
     std::uint64_t handleSeed_ = 0;
     std::uint64_t contentId_ = 0;
     std::size_t entityCount_ = 0;
-    std::unordered_map<std::string, std::vector<Placed>> byLayer_;
+    mutable std::unordered_map<std::string, Layer> byLayer_;
+    // The names of the layers that show (keys of byLayer_, which stay where they are), in
+    // the order of their addresses: a handful, where byLayer_ holds every page.
+    mutable std::vector<const std::string*> showing_;
+    // The layer records and their names when the table was last read whole.
+    mutable std::unordered_map<const zvdb::DbObject*, std::string> recordNames_;
+    mutable bool statesKnown_ = false;
+    mutable std::uint64_t statesEpoch_ = 0;
+    mutable std::uint64_t tableIndexAt_ = 0;
+    mutable std::size_t editsSeen_ = 0;
+    // Bounds by set of showing layers, good while the drawing's shape count is `boundsAt_`.
+    mutable std::unordered_map<std::string, zvdb::BoundingBox> bounds_;
+    mutable std::uint64_t boundsAt_ = 0;
 };
 
 }  // namespace zvplot
