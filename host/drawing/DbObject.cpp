@@ -9,6 +9,9 @@
 
 namespace zvdb {
 
+// A drawing holds millions of objects: a flag more must not make each one bigger.
+static_assert(sizeof(DbObject) <= 72, "DbObject grew");
+
 DbObject::DbObject(Database& database, std::span<const Tag> tags)
     : database_(&database),
       fileTags_(tags.data()),

@@ -146,11 +146,12 @@ private:
         const TagPattern::Values* pattern_;  // when patterned_
     };
     std::uint32_t fileCount_ = 0;
-    bool owned_ = false;
-    bool erased_ = false;
-    bool patterned_ = false;
-    mutable bool watched_ = false;
-    bool layerRecord_ = false;
+    // Bits, so that the flags take the four bytes beside the count (millions of objects).
+    bool owned_ : 1 = false;
+    bool erased_ : 1 = false;
+    bool patterned_ : 1 = false;
+    mutable bool watched_ : 1 = false;
+    bool layerRecord_ : 1 = false;
     std::vector<Tag> own_;
     std::uint64_t handle_ = 0;
     std::uint64_t owner_ = 0;
