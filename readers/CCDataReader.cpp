@@ -74,6 +74,7 @@ void CCDataReader::LiberaLeituras() {
     Esvazia(caminhos_);
     Esvazia(entidadesLidas_);
     Esvazia(entidadesAntigas_);
+    avulsa_ = {};
     Esvazia(formas_);
     Esvazia(numerosFios_);
     Esvazia(numerosCabos_);
@@ -734,6 +735,7 @@ CCDataReader::EntidadeLida CCDataReader::LeEntidadeGuardada(const OdDbObjectId& 
     } else if (CICad::EhPolilinha(id)) {
         lido.definirCampo(qtd, kMarca);
         completa = lida.rotas = LeCamposFio(QString(), lido, id);
+        lida.fio = true;
     }
     // The reading is made apart: its values move into the kept form, none is copied.
     std::vector<CamposItem::Campo> campos = lido.campos.retirar();
@@ -767,6 +769,10 @@ const CCDataReader::EntidadeLida& CCDataReader::EntidadeGuardada(const OdDbObjec
         entidadesAntigas_.erase(antiga);
     } else {
         lida = LeEntidadeGuardada(id, modelo);
+        if (lida.fio && !GuardaFios) {
+            avulsa_ = std::move(lida);
+            return avulsa_;
+        }
     }
     if (entidadesLidas_.size() >= limiteLidas_) {
         // The turn: what was not asked for again since the last one goes.

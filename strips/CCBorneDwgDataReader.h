@@ -6,7 +6,12 @@
 
 class CCBorneDwgDataReader : public CCExportDataReader {
 public:
-    CCBorneDwgDataReader() { lerAcessorios_ = false; }
+    // Each wire is copied into the sides of the one or two terminals it reaches, after every
+    // symbol was read: its reading is not kept.
+    CCBorneDwgDataReader() {
+        lerAcessorios_ = false;
+        GuardaFios = false;
+    }
     VetorItens* LerDados(zvdb::Database* database, const std::optional<QStringList>& paginas,
                          CETemplate& modelo, CIProgress& progresso) override;
 

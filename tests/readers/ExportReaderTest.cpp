@@ -424,6 +424,52 @@ TEST_F(ExportTerminalSidesTest, ComponentsAndTerminalsKeepNoSpareRoomOnceRead) {
     EXPECT_TRUE(borneLido("1")->temCampo("FIO_SEGFIM"));
 }
 
+// A reader that keeps no wire's reading gives the sides the very fields a keeping one
+// gives, the wire between two terminals read once for each; the symbols' readings stay kept.
+TEST_F(ExportTerminalSidesTest, WiresReadApartGiveTheSameSidesAndAreNotKept) {
+    x1_ = borne("X1", "1", {20, 200, 0});
+    x2_ = borne("X1", "2", {60, 200, 0});
+    k1_ = componente("-K1", {{"A1", {20, 100, 0}}});
+    const zvdb::Polyline* um = fio({{20, 190, 0}, {20, 100, 0}}, "1");
+    const zvdb::Polyline* ponte =
+        fio({{20, 200, 0}, {20, 220, 0}, {60, 220, 0}, {60, 200, 0}}, "5");
+    ASSERT_TRUE(lisp("(setq EXPORTA 3)"));
+    struct SemFios : CCExportDataReader {
+        SemFios() { GuardaFios = false; }
+    };
+    CCExportDataReader guarda;
+    SemFios avulso;
+    EXPECT_TRUE(guarda.GuardaLeiturasDeFios());
+    EXPECT_FALSE(avulso.GuardaLeiturasDeFios());
+    std::unique_ptr<VetorItens> guardados(guarda.Le(&db(), nullptr, true, std::nullopt));
+    std::unique_ptr<VetorItens> avulsos(avulso.Le(&db(), nullptr, true, std::nullopt));
+    ASSERT_TRUE(guardados && avulsos);
+    const auto id = [this](const zvdb::DbObject* objeto) {
+        return OdDbObjectId(&db(), objeto->handle());
+    };
+    EXPECT_TRUE(guarda.LeituraGuardada(id(ponte)));
+    EXPECT_TRUE(guarda.LeituraGuardada(id(um)));
+    EXPECT_FALSE(avulso.LeituraGuardada(id(ponte)));
+    EXPECT_FALSE(avulso.LeituraGuardada(id(um)));
+    EXPECT_TRUE(avulso.LeituraGuardada(id(k1_)));
+    // Item by item, in the same order, the same fields.
+    ASSERT_EQ(guardados->size(), avulsos->size());
+    int bornes = 0;
+    for (size_t i = 0; i < guardados->size(); ++i) {
+        const CEItemLista& a = *(*guardados)[i];
+        const CEItemLista& b = *(*avulsos)[i];
+        EXPECT_EQ(a.campos.keys(), b.campos.keys());
+        EXPECT_EQ(a.campos.values(), b.campos.values());
+        if (a.valorCampo("ZV_LISTA_TIPO") == "BORNE") {
+            ++bornes;
+            EXPECT_EQ(b.valorCampo("FIO_SEGFIM"), "5");
+        }
+    }
+    EXPECT_EQ(bornes, 2);
+    guardados->destruirItens();
+    avulsos->destruirItens();
+}
+
 TEST_F(ExportTerminalSidesTest, AnInvertedTerminalSwapsItsSides) {
     x1_ = borne("X1", "1", {20, 200, 0});
     x1_->addAttribute("INVERTIDO", "s", {24, 191, 0}, 1.0);

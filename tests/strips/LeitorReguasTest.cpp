@@ -39,6 +39,12 @@ TEST(LeitorReguasTest, ATerminalStaysWithAWireOrAJumperToANumberOfItsOwnStrip) {
     EXPECT_FALSE(CCBorneDwgDataReader::Ligado(*e, chaves));  // nothing wired, no jumper
 }
 
+TEST(LeitorReguasTest, KeepsNoWiresReading) {
+    // Its terminals' sides copy each wire once or twice, after every symbol was read.
+    const CCBorneDwgDataReader leitor;
+    EXPECT_FALSE(leitor.GuardaLeiturasDeFios());
+}
+
 TEST(LeitorReguasTest, EveryBlockTerminalOfTheDemoProjectIsDrawnWhenTheTemplateKeepsThemAll) {
     zvtest::ProductFolder pasta;
     const QString problema = pasta.prepare({"--seed", "1", "--terminals", "120"});
