@@ -7,6 +7,7 @@
 #include "settings/CIMensagens.h"
 
 #include <algorithm>
+#include <cctype>
 #include <cmath>
 
 using zvsdk::ResultBuffer;
@@ -42,6 +43,17 @@ double DistanciaAoSegmento(const CEPonto& p, const CEPonto& a, const CEPonto& b)
 
 bool EhTexto(const CEItemXData& item) {
     return item.codigo == 1000;
+}
+
+// A terminal's block name: BORNE... or BOR-..., in any case.
+bool EhBlocoDeBorne(std::string_view nome) {
+    const auto comeca = [nome](std::string_view prefixo) {
+        return nome.size() >= prefixo.size() &&
+               std::equal(prefixo.begin(), prefixo.end(), nome.begin(), [](char a, char b) {
+                   return a == std::toupper(static_cast<unsigned char>(b));
+               });
+    };
+    return comeca("BORNE") || comeca("BOR-");
 }
 
 }  // namespace
@@ -732,6 +744,7 @@ CCDataReader::EntidadeLida CCDataReader::LeEntidadeGuardada(const OdDbObjectId& 
         lido.definirCampo(qtd, kMarca);
         LeBloco(QString(), lido, id, modelo);
         completa = true;
+        lida.borne = EhBlocoDeBorne(simbolo_.bloco);
     } else if (CICad::EhPolilinha(id)) {
         lido.definirCampo(qtd, kMarca);
         completa = lida.rotas = LeCamposFio(QString(), lido, id);
@@ -769,7 +782,7 @@ const CCDataReader::EntidadeLida& CCDataReader::EntidadeGuardada(const OdDbObjec
         entidadesAntigas_.erase(antiga);
     } else {
         lida = LeEntidadeGuardada(id, modelo);
-        if (lida.fio && !GuardaFios) {
+        if ((lida.fio && !GuardaFios) || (lida.borne && !GuardaBornes)) {
             avulsa_ = std::move(lida);
             return avulsa_;
         }

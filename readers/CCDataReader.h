@@ -98,8 +98,9 @@ public:
     bool LeituraGuardada(const OdDbObjectId& id) const {
         return entidadesLidas_.count(id) || entidadesAntigas_.count(id);
     }
-    // Whether wires' readings are kept (see GuardaFios).
+    // Whether wires' and terminals' readings are kept (see GuardaFios, GuardaBornes).
     bool GuardaLeiturasDeFios() const { return GuardaFios; }
+    bool GuardaLeiturasDeBornes() const { return GuardaBornes; }
     CEItemLista* CriaItemBloco(const OdDbObjectId& referencia, CETemplate& modelo);
     CEItemLista* CriaItemFio(const OdDbObjectId& polilinha, CETemplate& modelo);
     CEItemLista* CriaItemVirtual(const OdDbObjectId& registro);
@@ -149,6 +150,9 @@ protected:
     // The wires' readings are kept for CopiaEntidade too; a reader that copies each wire once
     // (the terminals' sides, read after every symbol) reads them apart and keeps none.
     bool GuardaFios = true;
+    // The same for terminals (blocks BORNE... and BOR-...): a reader that reads every terminal
+    // as an item before any side seldom meets one again as a neighbour.
+    bool GuardaBornes = true;
     CECacheCatalogo& Catalogo() { return catalogo_; }
     // An item kept for the list shares its field names with the items kept before it.
     void PartilhaNomes(CEItemLista& item) { item.partilharNomes(); }
@@ -227,7 +231,8 @@ private:
         std::vector<QString> valores;  // and "1" after them when qtdPadrao
         bool qtdPadrao = false;
         bool rotas = false;
-        bool fio = false;  // a polyline's reading
+        bool fio = false;    // a polyline's reading
+        bool borne = false;  // a terminal's
     };
     // Those asked for since the last turn, and those of the turn before, which move back when
     // asked for again and go at the next turn.
@@ -235,8 +240,8 @@ private:
     // Unbounded unless the reader sets a bound: the other lists ask in orders that would read
     // many again.
     std::size_t limiteLidas_ = SIZE_MAX;
-    // The entity's kept reading, read now when none is kept; a wire's reading that is not to
-    // be kept waits in `avulsa_` for the copy that asked.
+    // The entity's kept reading, read now when none is kept; a wire's or terminal's reading
+    // that is not to be kept waits in `avulsa_` for the copy that asked.
     const EntidadeLida& EntidadeGuardada(const OdDbObjectId& id, CETemplate* modelo);
     EntidadeLida avulsa_;
     // The entity read apart into the form CopiaEntidade keeps.

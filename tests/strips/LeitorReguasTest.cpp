@@ -39,10 +39,11 @@ TEST(LeitorReguasTest, ATerminalStaysWithAWireOrAJumperToANumberOfItsOwnStrip) {
     EXPECT_FALSE(CCBorneDwgDataReader::Ligado(*e, chaves));  // nothing wired, no jumper
 }
 
-TEST(LeitorReguasTest, KeepsNoWiresReading) {
+TEST(LeitorReguasTest, KeepsNoWiresOrTerminalsReading) {
     // Its terminals' sides copy each wire once or twice, after every symbol was read.
     const CCBorneDwgDataReader leitor;
     EXPECT_FALSE(leitor.GuardaLeiturasDeFios());
+    EXPECT_FALSE(leitor.GuardaLeiturasDeBornes());
 }
 
 TEST(LeitorReguasTest, EveryBlockTerminalOfTheDemoProjectIsDrawnWhenTheTemplateKeepsThemAll) {
