@@ -7,6 +7,7 @@
 #include "settings/CIMensagens.h"
 
 #include <algorithm>
+#include <cctype>
 #include <cmath>
 
 using zvsdk::ResultBuffer;
@@ -44,6 +45,17 @@ bool EhTexto(const CEItemXData& item) {
     return item.codigo == 1000;
 }
 
+// A terminal's block name: BORNE... or BOR-..., in any case.
+bool EhBlocoDeBorne(std::string_view nome) {
+    const auto comeca = [nome](std::string_view prefixo) {
+        return nome.size() >= prefixo.size() &&
+               std::equal(prefixo.begin(), prefixo.end(), nome.begin(), [](char a, char b) {
+                   return a == std::toupper(static_cast<unsigned char>(b));
+               });
+    };
+    return comeca("BORNE") || comeca("BOR-");
+}
+
 }  // namespace
 
 CCDataReader::CCDataReader() : tolerancia_(CICad::GetRealLisp("*ESPESSURA_BARRAMENTO*", 0.1)) {}
@@ -74,6 +86,7 @@ void CCDataReader::LiberaLeituras() {
     Esvazia(caminhos_);
     Esvazia(entidadesLidas_);
     Esvazia(entidadesAntigas_);
+    avulsa_ = {};
     Esvazia(formas_);
     Esvazia(numerosFios_);
     Esvazia(numerosCabos_);
@@ -731,9 +744,11 @@ CCDataReader::EntidadeLida CCDataReader::LeEntidadeGuardada(const OdDbObjectId& 
         lido.definirCampo(qtd, kMarca);
         LeBloco(QString(), lido, id, modelo);
         completa = true;
+        lida.borne = EhBlocoDeBorne(simbolo_.bloco);
     } else if (CICad::EhPolilinha(id)) {
         lido.definirCampo(qtd, kMarca);
         completa = lida.rotas = LeCamposFio(QString(), lido, id);
+        lida.fio = true;
     }
     // The reading is made apart: its values move into the kept form, none is copied.
     std::vector<CamposItem::Campo> campos = lido.campos.retirar();
@@ -767,6 +782,10 @@ const CCDataReader::EntidadeLida& CCDataReader::EntidadeGuardada(const OdDbObjec
         entidadesAntigas_.erase(antiga);
     } else {
         lida = LeEntidadeGuardada(id, modelo);
+        if ((lida.fio && !GuardaFios) || (lida.borne && !GuardaBornes)) {
+            avulsa_ = std::move(lida);
+            return avulsa_;
+        }
     }
     if (entidadesLidas_.size() >= limiteLidas_) {
         // The turn: what was not asked for again since the last one goes.

@@ -94,6 +94,13 @@ public:
     // last turn, those not asked for again since the turn before go, and a later copy reads
     // them again. A list's neighbours are asked for close together, so few are read twice.
     void LimitaEntidadesGuardadas(std::size_t n) { limiteLidas_ = std::max<std::size_t>(n, 1); }
+    // Whether CopiaEntidade keeps the entity's reading for the next copy.
+    bool LeituraGuardada(const OdDbObjectId& id) const {
+        return entidadesLidas_.count(id) || entidadesAntigas_.count(id);
+    }
+    // Whether wires' and terminals' readings are kept (see GuardaFios, GuardaBornes).
+    bool GuardaLeiturasDeFios() const { return GuardaFios; }
+    bool GuardaLeiturasDeBornes() const { return GuardaBornes; }
     CEItemLista* CriaItemBloco(const OdDbObjectId& referencia, CETemplate& modelo);
     CEItemLista* CriaItemFio(const OdDbObjectId& polilinha, CETemplate& modelo);
     CEItemLista* CriaItemVirtual(const OdDbObjectId& registro);
@@ -140,6 +147,12 @@ protected:
     // The whole texts of the wires' entries ("HANDLE#CONNECTION#BLOCK") are kept for the
     // readers that ask for them; one that never does leaves them to the answer.
     bool GuardaCompletas = true;
+    // The wires' readings are kept for CopiaEntidade too; a reader that copies each wire once
+    // (the terminals' sides, read after every symbol) reads them apart and keeps none.
+    bool GuardaFios = true;
+    // The same for terminals (blocks BORNE... and BOR-...): a reader that reads every terminal
+    // as an item before any side seldom meets one again as a neighbour.
+    bool GuardaBornes = true;
     CECacheCatalogo& Catalogo() { return catalogo_; }
     // An item kept for the list shares its field names with the items kept before it.
     void PartilhaNomes(CEItemLista& item) { item.partilharNomes(); }
@@ -218,6 +231,8 @@ private:
         std::vector<QString> valores;  // and "1" after them when qtdPadrao
         bool qtdPadrao = false;
         bool rotas = false;
+        bool fio = false;    // a polyline's reading
+        bool borne = false;  // a terminal's
     };
     // Those asked for since the last turn, and those of the turn before, which move back when
     // asked for again and go at the next turn.
@@ -225,8 +240,10 @@ private:
     // Unbounded unless the reader sets a bound: the other lists ask in orders that would read
     // many again.
     std::size_t limiteLidas_ = SIZE_MAX;
-    // The entity's kept reading, read now when none is kept.
+    // The entity's kept reading, read now when none is kept; a wire's or terminal's reading
+    // that is not to be kept waits in `avulsa_` for the copy that asked.
     const EntidadeLida& EntidadeGuardada(const OdDbObjectId& id, CETemplate* modelo);
+    EntidadeLida avulsa_;
     // The entity read apart into the form CopiaEntidade keeps.
     EntidadeLida LeEntidadeGuardada(const OdDbObjectId& id, CETemplate* modelo);
     // Per wire polyline: its number as NumeroDoFio gives it, and whether its own field holds

@@ -6,7 +6,14 @@
 
 class CCBorneDwgDataReader : public CCExportDataReader {
 public:
-    CCBorneDwgDataReader() { lerAcessorios_ = false; }
+    // Each wire is copied into the sides of the one or two terminals it reaches, and each
+    // terminal read as an item before any side asks for a neighbour: their readings are not
+    // kept, the components' are.
+    CCBorneDwgDataReader() {
+        lerAcessorios_ = false;
+        GuardaFios = false;
+        GuardaBornes = false;
+    }
     VetorItens* LerDados(zvdb::Database* database, const std::optional<QStringList>& paginas,
                          CETemplate& modelo, CIProgress& progresso) override;
 

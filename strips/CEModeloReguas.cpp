@@ -117,7 +117,9 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
         if (!simbolosPorHandle.contains(handle))
             simbolosPorHandle.insert(handle, simbolos.back().get());
     }
-    terminais.ordenar({"REGUA", "STRIP", "REGLETA", "NUMERO", "NUMBER", "NUMERO"});
+    // By strip, then number, in the three languages; Spanish shares the Portuguese number
+    // field, which a second time would never decide a comparison.
+    terminais.ordenar({"REGUA", "STRIP", "REGLETA", "NUMERO", "NUMBER"});
     QHash<QString, CEReguaDwg*> reguaPorNome;
     QHash<const CEItemLista*, CEBorneDwg*> bornePorItem;
     for (CEItemLista* item : terminais) {

@@ -424,6 +424,57 @@ TEST_F(ExportTerminalSidesTest, ComponentsAndTerminalsKeepNoSpareRoomOnceRead) {
     EXPECT_TRUE(borneLido("1")->temCampo("FIO_SEGFIM"));
 }
 
+// A reader that keeps no wire's or terminal's reading gives the sides the very fields a
+// keeping one gives: the wire between two terminals is read once for each, and each of those
+// terminals again as the other's neighbour. The components' readings stay kept.
+TEST_F(ExportTerminalSidesTest, WiresAndTerminalsReadApartGiveTheSameSidesAndAreNotKept) {
+    x1_ = borne("X1", "1", {20, 200, 0});
+    x2_ = borne("X1", "2", {60, 200, 0});
+    k1_ = componente("-K1", {{"A1", {20, 100, 0}}});
+    const zvdb::Polyline* um = fio({{20, 190, 0}, {20, 100, 0}}, "1");
+    const zvdb::Polyline* ponte =
+        fio({{20, 200, 0}, {20, 220, 0}, {60, 220, 0}, {60, 200, 0}}, "5");
+    ASSERT_TRUE(lisp("(setq EXPORTA 3)"));
+    struct Avulso : CCExportDataReader {
+        Avulso() {
+            GuardaFios = false;
+            GuardaBornes = false;
+        }
+    };
+    CCExportDataReader guarda;
+    Avulso avulso;
+    EXPECT_TRUE(guarda.GuardaLeiturasDeFios() && guarda.GuardaLeiturasDeBornes());
+    EXPECT_FALSE(avulso.GuardaLeiturasDeFios() || avulso.GuardaLeiturasDeBornes());
+    std::unique_ptr<VetorItens> guardados(guarda.Le(&db(), nullptr, true, std::nullopt));
+    std::unique_ptr<VetorItens> avulsos(avulso.Le(&db(), nullptr, true, std::nullopt));
+    ASSERT_TRUE(guardados && avulsos);
+    const auto id = [this](const zvdb::DbObject* objeto) {
+        return OdDbObjectId(&db(), objeto->handle());
+    };
+    for (const zvdb::DbObject* objeto :
+         std::initializer_list<const zvdb::DbObject*>{ponte, um, x1_, x2_}) {
+        EXPECT_TRUE(guarda.LeituraGuardada(id(objeto)));
+        EXPECT_FALSE(avulso.LeituraGuardada(id(objeto)));
+    }
+    EXPECT_TRUE(avulso.LeituraGuardada(id(k1_)));
+    // Item by item, in the same order, the same fields.
+    ASSERT_EQ(guardados->size(), avulsos->size());
+    QStringList vizinhos;
+    for (size_t i = 0; i < guardados->size(); ++i) {
+        const CEItemLista& a = *(*guardados)[i];
+        const CEItemLista& b = *(*avulsos)[i];
+        EXPECT_EQ(a.campos.keys(), b.campos.keys());
+        EXPECT_EQ(a.campos.values(), b.campos.values());
+        if (b.valorCampo("ZV_LISTA_TIPO") == "BORNE")
+            vizinhos << b.valorCampo("NUMERO") + ">" + b.valorCampo("RELACAO_FIM") + "/" +
+                            b.valorCampo("FIO_SEGFIM");
+    }
+    vizinhos.sort();
+    EXPECT_EQ(vizinhos, QStringList({"1>X1:2/5", "2>X1:1/5"}));
+    guardados->destruirItens();
+    avulsos->destruirItens();
+}
+
 TEST_F(ExportTerminalSidesTest, AnInvertedTerminalSwapsItsSides) {
     x1_ = borne("X1", "1", {20, 200, 0});
     x1_->addAttribute("INVERTIDO", "s", {24, 191, 0}, 1.0);

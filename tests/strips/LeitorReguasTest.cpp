@@ -39,6 +39,13 @@ TEST(LeitorReguasTest, ATerminalStaysWithAWireOrAJumperToANumberOfItsOwnStrip) {
     EXPECT_FALSE(CCBorneDwgDataReader::Ligado(*e, chaves));  // nothing wired, no jumper
 }
 
+TEST(LeitorReguasTest, KeepsNoWiresOrTerminalsReading) {
+    // Its terminals' sides copy each wire once or twice, after every symbol was read.
+    const CCBorneDwgDataReader leitor;
+    EXPECT_FALSE(leitor.GuardaLeiturasDeFios());
+    EXPECT_FALSE(leitor.GuardaLeiturasDeBornes());
+}
+
 TEST(LeitorReguasTest, EveryBlockTerminalOfTheDemoProjectIsDrawnWhenTheTemplateKeepsThemAll) {
     zvtest::ProductFolder pasta;
     const QString problema = pasta.prepare({"--seed", "1", "--terminals", "120"});
