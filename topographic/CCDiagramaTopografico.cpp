@@ -112,6 +112,27 @@ void OrdenaPorChave(Entradas& entradas) {
                    entradas.end());
 }
 
+// What an accessory takes of its owner: tag, strip and number in every language, and the
+// page. The names are looked up once: a project has thousands of accessories.
+const std::vector<std::uint32_t>& NomesDoDono() {
+    static const std::vector<std::uint32_t> nomes = [] {
+        QStringList textos;
+        for (CampoTraduzido campo :
+             {CampoTraduzido::Relacao, CampoTraduzido::Regua, CampoTraduzido::Numero})
+            for (int idioma = 1; idioma <= 3; ++idioma)
+                textos << CICad::TagTraduzida(campo, idioma);
+        textos << "PAGINA"
+               << "GRUPO"
+               << "LAYER"
+               << "POSICAO";
+        std::vector<std::uint32_t> numeros;
+        for (const QString& texto : textos)
+            numeros.push_back(CamposItem::numero(texto));
+        return numeros;
+    }();
+    return nomes;
+}
+
 CEItemXData Texto(const QString& texto) {
     CEItemXData item;
     item.codigo = 1000;
@@ -354,6 +375,7 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
         ~Fim() {
             d.progresso_ = nullptr;
             d.itensPorHandle_.clear();
+            d.camposUsados_.clear();
         }
     } fim{*this};
     progresso.Mostrar();
@@ -419,6 +441,10 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     };
     porSimbolo(comuns);
     porSimbolo(bornes);
+    PreparaLeitura(candidatos_);
+    // Each symbol is read once (an accessory's owner is kept in donos_) and never again as a
+    // neighbour: its reading need not be kept.
+    GuardaSimbolos = false;
     VetorItens itensComuns = LeItens(comuns, modelo);
     VetorItens itensBornes = LeItens(bornes, modelo);
     // Everything is read: what the reading kept goes before the drawing grows.
@@ -661,6 +687,7 @@ VetorItens CCDiagramaTopografico::LeItens(const std::vector<const Entrada*>& ent
         } else {
             item.reset(CriaItemEntidade(candidato.simbolo, modelo));
             if (item && item->valorCampo("ZV_LISTA") != "S") item.reset();
+            if (item) Retem(*item);
             // Its accessories come next and take their owner's fields from this same read.
             if (comAcessorios_.contains(chave))
                 donos_.insert(chave, item ? std::make_shared<const CEItemLista>(*item) : nullptr);
@@ -680,8 +707,9 @@ CEItemLista* CCDiagramaTopografico::LeItemAcessorio(const QString& chave,
     const QString simbolo = chave.section('_', -1);
     auto dono = donos_.constFind(simbolo);
     if (dono == donos_.constEnd()) {
-        std::shared_ptr<const CEItemLista> lido(CriaItemEntidade(candidato.simbolo, modelo));
+        std::shared_ptr<CEItemLista> lido(CriaItemEntidade(candidato.simbolo, modelo));
         if (lido && lido->valorCampo("ZV_LISTA") != "S") lido.reset();
+        if (lido) Retem(*lido);
         dono = donos_.insert(simbolo, lido);
     }
     // The accessory of a symbol that is not on the lists is not in the panel either.
@@ -690,23 +718,7 @@ CEItemLista* CCDiagramaTopografico::LeItemAcessorio(const QString& chave,
     auto item = std::make_unique<CEItemLista>();
     item->ids = origem.ids;
     // It sits with its owner: the owner's tag, strip, number and page, in every language.
-    // The names are looked up once: a project has thousands of accessories.
-    static const std::vector<std::uint32_t> kDoDono = [] {
-        QStringList nomes;
-        for (CampoTraduzido campo :
-             {CampoTraduzido::Relacao, CampoTraduzido::Regua, CampoTraduzido::Numero})
-            for (int idioma = 1; idioma <= 3; ++idioma)
-                nomes << CICad::TagTraduzida(campo, idioma);
-        nomes << "PAGINA"
-              << "GRUPO"
-              << "LAYER"
-              << "POSICAO";
-        std::vector<std::uint32_t> numeros;
-        for (const QString& nome : nomes)
-            numeros.push_back(CamposItem::numero(nome));
-        return numeros;
-    }();
-    for (const std::uint32_t nome : kDoDono)
+    for (const std::uint32_t nome : NomesDoDono())
         if (const QString* valor = origem.campos.procura(nome)) item->definirCampo(nome, *valor);
     // Everything else is the accessory's own.
     static const std::uint32_t kTipo = CamposItem::numero("ZV_LISTA_TIPO"),
@@ -727,7 +739,67 @@ CEItemLista* CCDiagramaTopografico::LeItemAcessorio(const QString& chave,
     LeColunasUsuario(QString(), *item, Catalogo().ColunasComp(candidato.chave));
     const QString* listado = item->campos.procura(kLista);
     if (!listado || *listado != QLatin1String("S")) return nullptr;
+    Retem(*item);
     return item.release();
+}
+
+// ---- what is read of items
+
+// The diagram never loads the project's connections, and without them a terminal's side
+// finds no element: looking costs the wires' index of every page and gives nothing.
+void CCDiagramaTopografico::LerLadoIni(CEItemLista&, const OdDbObjectId&, CETemplate&) {}
+
+void CCDiagramaTopografico::LerLadoFim(CEItemLista&, const OdDbObjectId&, CETemplate&) {}
+
+std::optional<std::vector<std::uint32_t>> CCDiagramaTopografico::CamposUsados(
+    const Parametros& parametros, const std::vector<std::pair<QString, QString>>& blocos) {
+    std::vector<std::uint32_t> campos = NomesDoDono();
+    const auto poe = [&campos](const QString& nome) {
+        if (!nome.isEmpty()) campos.push_back(CamposItem::numero(nome));
+    };
+    for (const char* nome : {"HANDLE", "ZV_LISTA", "QTD", "REGUA", "STRIP", "REGLETA"})
+        poe(QString::fromLatin1(nome));
+    poe(QString::fromLatin1(kCampoSequencia));
+    poe(parametros.borneDist);
+    for (const QString& nome : parametros.ordenacao)
+        poe(nome);
+    for (const auto& [arquivo, nome] : blocos) {
+        // A block the drawing lacks would be loaded here, before its turn.
+        OdDbObjectId id;
+        if (!CICad::GetBlocoId(nome, id)) return std::nullopt;
+        const auto definicoes = CICad::GetDefinicoesAtributos(arquivo, nome);
+        for (int i = 0; definicoes && i < definicoes->Quantidade(); ++i) {
+            const QString tag = (*definicoes)[i].GetTag();
+            poe(tag);
+            poe(tag.trimmed());
+        }
+    }
+    std::sort(campos.begin(), campos.end());
+    campos.erase(std::unique(campos.begin(), campos.end()), campos.end());
+    return campos;
+}
+
+void CCDiagramaTopografico::PreparaLeitura(const Candidatos& candidatos) {
+    camposUsados_.clear();
+    std::vector<std::pair<QString, QString>> blocos;
+    QSet<QString> vistos;
+    for (const auto& [chave, candidato] : candidatos)
+        if (!vistos.contains(candidato.nome)) {
+            vistos.insert(candidato.nome);
+            blocos.emplace_back(candidato.arquivo, candidato.nome);
+        }
+    const auto campos = CamposUsados(parametros_, blocos);
+    if (!campos) return;
+    camposUsados_.assign(campos->empty() ? 0 : campos->back() + 1, 0);
+    for (const std::uint32_t campo : *campos)
+        camposUsados_[campo] = 1;
+}
+
+void CCDiagramaTopografico::Retem(CEItemLista& item) const {
+    if (camposUsados_.empty()) return;
+    const std::vector<char>& usados = camposUsados_;
+    item.campos.reter(
+        [&usados](std::uint32_t nome) { return nome < usados.size() && usados[nome]; });
 }
 
 void CCDiagramaTopografico::LePassos(const VetorItens& bornes) {

@@ -12,8 +12,10 @@
 #include <QString>
 #include <QStringList>
 
+#include <cstdint>
 #include <map>
 #include <memory>
+#include <optional>
 #include <vector>
 
 class CETemplate;
@@ -89,6 +91,16 @@ public:
     // The symbols' parameters, as the template left them.
     static Parametros LeParametros();
 
+    // A terminal's sides are left unread.
+    void LerLadoIni(CEItemLista& item, const OdDbObjectId& entidade, CETemplate& modelo) override;
+    void LerLadoFim(CEItemLista& item, const OdDbObjectId& entidade, CETemplate& modelo) override;
+
+    // The fields a run reads of its items: the blocks' attribute tags, bare and trimmed, and
+    // the names the run itself asks for. Null when a block's tags can't be known without
+    // loading it: the items are then read whole.
+    static std::optional<std::vector<std::uint32_t>> CamposUsados(
+        const Parametros& parametros, const std::vector<std::pair<QString, QString>>& blocos);
+
 private:
     struct Candidato {
         QString chave, norma, bloco;
@@ -122,6 +134,10 @@ private:
     // Is an accessory's block of this representation, for this place in the symbol's list,
     // still in the drawing?
     bool AcessorioDesenhado(const QString& chave, const Candidato& candidato) const;
+    // Works out the fields kept of items read (see CamposUsados).
+    void PreparaLeitura(const Candidatos& candidatos);
+    // Leaves a read item only the fields the run uses.
+    void Retem(CEItemLista& item) const;
     void LePassos(const VetorItens& bornes);
     void LeExtensoes();
     // Makes the pages of one pass and inserts its blocks.
@@ -142,6 +158,8 @@ private:
     QHash<QString, std::shared_ptr<const CEItemLista>> donos_;
     // The symbols that have accessories among the candidates.
     QSet<QString> comAcessorios_;
+    // By name number, the fields kept of items read; empty: all of them.
+    std::vector<char> camposUsados_;
     CIProgress* progresso_ = nullptr;
     int inseridos_ = 0;
     int paginasCriadas_ = 0;
