@@ -133,11 +133,19 @@ const std::vector<std::uint32_t>& NomesDoDono() {
     return nomes;
 }
 
-CEItemXData Texto(const QString& texto) {
-    CEItemXData item;
-    item.codigo = 1000;
-    item.texto = texto;
-    return item;
+std::string_view Vista(const QByteArray& texto) {
+    return {texto.constData(), std::size_t(texto.size())};
+}
+
+// A handle's text as the drawing writes it: upper-case hexadecimal digits without leading
+// zeros, in `digitos`.
+std::string_view TextoHandle(std::uint64_t handle, char (&digitos)[16]) {
+    int n = 0;
+    do {
+        digitos[15 - n++] = "0123456789ABCDEF"[handle & 15];
+        handle >>= 4;
+    } while (handle != 0);
+    return {digitos + 16 - n, std::size_t(n)};
 }
 
 }  // namespace
@@ -344,6 +352,7 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     }
     parametros_ = LeParametros();
     const Parametros& p = parametros_;
+    representacaoU8_ = p.representacao.toUtf8();
     if (p.representacao.isEmpty() || p.representacao == "-1") {
         CICad::ImprimeMensagem(kMsgSemRepresentacao);
         throw int(SemRepresentacao);
@@ -376,6 +385,7 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
             d.progresso_ = nullptr;
             d.itensPorHandle_.clear();
             d.camposUsados_.clear();
+            d.definicoes_.clear();
         }
     } fim{*this};
     progresso.Mostrar();
@@ -852,9 +862,11 @@ void CCDiagramaTopografico::LeExtensoes() {
 void CCDiagramaTopografico::Desenha(const std::vector<Pagina>& paginas,
                                     const QHash<QString, CEPonto>& posicoes) {
     // Every page first, so that no page change happens while blocks go in.
-    QStringList layers;
-    for (size_t i = 0; i < paginas.size(); ++i)
-        layers << CriaPagina(parametros_.grupo);
+    std::vector<PaginaFeita> feitas(paginas.size());
+    for (PaginaFeita& feita : feitas) {
+        feita.layer = CriaPagina(parametros_.grupo);
+        feita.layerU8 = feita.layer.toUtf8();
+    }
     paginasCriadas_ += int(paginas.size());
     Enxuga(paginas);
     // A terminal that starts a strip stands twice in its row: it goes in once, at its
@@ -867,7 +879,7 @@ void CCDiagramaTopografico::Desenha(const std::vector<Pagina>& paginas,
     for (size_t i = 0; i < paginas.size(); ++i) {
         for (const Linha& linha : paginas[i])
             for (const QString& chave : linha)
-                if (--restantes[chave] == 0) Insere(chave, layers[int(i)], posicoes.value(chave));
+                if (--restantes[chave] == 0) Insere(chave, feitas[i], posicoes.value(chave));
         if (progresso_) progresso_->Definir(progresso_->Percentual());
     }
 }
@@ -915,7 +927,7 @@ void CCDiagramaTopografico::Enxuga(const std::vector<Pagina>& paginas) {
     }
 }
 
-void CCDiagramaTopografico::Insere(const QString& chave, const QString& layer,
+void CCDiagramaTopografico::Insere(const QString& chave, PaginaFeita& pagina,
                                    const CEPonto& ponto) {
     const Lido lido = itensPorHandle_.value(chave);
     CEItemLista* item = lido.item;
@@ -926,36 +938,48 @@ void CCDiagramaTopografico::Insere(const QString& chave, const QString& layer,
         const QString* valor = item->campo(tag);
         return valor ? *valor : QString();
     };
-    const OdDbObjectId ref = CICad::InsereBloco(candidato->arquivo, candidato->nome, layer, ponto.x,
-                                                ponto.y, 0.0, 0.0, valores);
+    // The definition is looked up (or loaded) at the block's first insertion, and the page's
+    // layer made at the page's first, as each insertion on its own would do.
+    OdDbObjectId& definicao = definicoes_[candidato->nome];
+    if (definicao.isNull() && !CICad::GetBlocoId(candidato->nome, definicao))
+        definicao = CICad::CarregaBloco(candidato->nome, candidato->arquivo);
+    if (!pagina.pronta) {
+        CICad::CriaLayer(pagina.layer);
+        pagina.pronta = true;
+    }
+    const OdDbObjectId ref = CICad::InsereReferencia(definicao, Vista(pagina.layerU8), ponto.x,
+                                                     ponto.y, 0.0, 0.0, valores);
     if (ref.isNull()) return;  // left out; the run goes on
     ++inseridos_;
     // The block names its symbol; an accessory's block also its place and catalogue key.
     QString handle = item->valorCampo(kHandle);
     const int corte = handle.indexOf('_');
     const bool acessorio = corte >= 0;
-    CEListaXData link{Texto(parametros_.representacao)};
     const QString prefixo = acessorio ? handle.left(corte) : QString();
     if (acessorio) handle = handle.mid(corte + 1);
-    link.push_back(Texto(handle));
+    const QByteArray handleU8 = handle.toUtf8();
+    std::vector<std::string_view> link{Vista(representacaoU8_), Vista(handleU8)};
+    QByteArray prefixoU8, chaveU8;
     if (acessorio) {
-        link.push_back(Texto(prefixo));
-        link.push_back(Texto(candidato->chave));
+        prefixoU8 = prefixo.toUtf8();
+        chaveU8 = candidato->chave.toUtf8();
+        link.push_back(Vista(prefixoU8));
+        link.push_back(Vista(chaveU8));
     }
-    static const QString kRepresentacao(kAppRepresentacao), kAce(kAppRepresentacaoAce);
-    CICad::SetXData(ref, acessorio ? kAce : kRepresentacao, link);
-    LigaSimbolo(candidato->simbolo, prefixo, ZVString::DeHandle(ref.handle()));
+    CICad::SetXDataTextos(ref, acessorio ? kAppRepresentacaoAce : kAppRepresentacao, link);
+    char digitos[16];
+    LigaSimbolo(candidato->simbolo, prefixo, TextoHandle(ref.handle(), digitos));
 }
 
 void CCDiagramaTopografico::LigaSimbolo(const OdDbObjectId& simbolo, const QString& lugar,
-                                        const QString& bloco) {
+                                        std::string_view bloco) {
     if (simbolo.isNull()) return;  // the block stays unlinked; the next run adds it again
     const bool acessorio = !lugar.isEmpty();
     static const QString kEsq(kAppRepresentacaoEsq), kAceEsq(kAppRepresentacaoAceEsq);
     const QString& aplicacao = acessorio ? kAceEsq : kEsq;
     // At most one block per representation, and for accessories one per place in the
     // symbol's list: a stale pair, or the old block of the same one, goes.
-    CEListaXData cadeia;
+    std::vector<QByteArray> ficam;
     for (const auto& [rep, ligado] : Pares(CICad::GetXData(simbolo, aplicacao))) {
         const OdDbObjectId id = CICad::IdDoHandle(ligado);
         if (id.isNull()) continue;
@@ -964,10 +988,15 @@ void CCDiagramaTopografico::LigaSimbolo(const OdDbObjectId& simbolo, const QStri
             const CEListaXData link = CICad::GetXData(id, kAppRepresentacaoAce);
             if (link.size() < 3 || link[2].texto == lugar) continue;
         }
-        cadeia.push_back(Texto(rep));
-        cadeia.push_back(Texto(ligado));
+        ficam.push_back(rep.toUtf8());
+        ficam.push_back(ligado.toUtf8());
     }
-    cadeia.push_back(Texto(parametros_.representacao));
-    cadeia.push_back(Texto(bloco));
-    CICad::SetXData(simbolo, aplicacao, cadeia);
+    std::vector<std::string_view> cadeia;
+    cadeia.reserve(ficam.size() + 2);
+    for (const QByteArray& texto : ficam)
+        cadeia.push_back(Vista(texto));
+    cadeia.push_back(Vista(representacaoU8_));
+    cadeia.push_back(bloco);
+    CICad::SetXDataTextos(simbolo, acessorio ? kAppRepresentacaoAceEsq : kAppRepresentacaoEsq,
+                          cadeia);
 }

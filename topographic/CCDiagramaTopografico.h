@@ -7,6 +7,7 @@
 // laid out as blocks of their own, each tied to its symbol and its place in the list.
 #include "readers/CCExportDataReader.h"
 
+#include <QByteArray>
 #include <QHash>
 #include <QSet>
 #include <QString>
@@ -16,6 +17,7 @@
 #include <map>
 #include <memory>
 #include <optional>
+#include <string_view>
 #include <vector>
 
 class CETemplate;
@@ -144,9 +146,16 @@ private:
     void Desenha(const std::vector<Pagina>& paginas, const QHash<QString, CEPonto>& posicoes);
     // Leaves the items of the pages only the fields their blocks' attributes take.
     void Enxuga(const std::vector<Pagina>& paginas);
-    void Insere(const QString& chave, const QString& layer, const CEPonto& ponto);
+    // A page of the pass: its layer, whose record is made (when missing) before its first
+    // block goes in.
+    struct PaginaFeita {
+        QString layer;
+        QByteArray layerU8;
+        bool pronta = false;
+    };
+    void Insere(const QString& chave, PaginaFeita& pagina, const CEPonto& ponto);
     // `lugar` is an accessory's place ("*0", "#1"), empty for the symbol's own block.
-    void LigaSimbolo(const OdDbObjectId& simbolo, const QString& lugar, const QString& bloco);
+    void LigaSimbolo(const OdDbObjectId& simbolo, const QString& lugar, std::string_view bloco);
 
     Parametros parametros_;
     QString diretorio_;
@@ -160,6 +169,10 @@ private:
     QSet<QString> comAcessorios_;
     // By name number, the fields kept of items read; empty: all of them.
     std::vector<char> camposUsados_;
+    // The representation key as the links write it, and the blocks' definitions by name,
+    // found at their first insertion.
+    QByteArray representacaoU8_;
+    QHash<QString, OdDbObjectId> definicoes_;
     CIProgress* progresso_ = nullptr;
     int inseridos_ = 0;
     int paginasCriadas_ = 0;
