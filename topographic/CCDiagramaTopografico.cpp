@@ -20,6 +20,7 @@
 #include <cstdint>
 #include <iterator>
 #include <memory>
+#include <numeric>
 
 namespace {
 
@@ -102,14 +103,21 @@ void Filtra(Entradas& entradas, Fica fica) {
     entradas.erase(destino, entradas.end());
 }
 
-// In key order; of entries with one key the first gathered stays.
+// In key order; of entries with one key the first gathered stays. The places are sorted and
+// each entry, large beside its key, moves once.
 template <class Entradas>
 void OrdenaPorChave(Entradas& entradas) {
-    const auto porChave = [](const auto& a, const auto& b) { return a.first < b.first; };
-    std::stable_sort(entradas.begin(), entradas.end(), porChave);
-    entradas.erase(std::unique(entradas.begin(), entradas.end(),
-                               [](const auto& a, const auto& b) { return a.first == b.first; }),
-                   entradas.end());
+    std::vector<std::size_t> ordem(entradas.size());
+    std::iota(ordem.begin(), ordem.end(), std::size_t(0));
+    std::stable_sort(ordem.begin(), ordem.end(), [&entradas](std::size_t a, std::size_t b) {
+        return entradas[a].first < entradas[b].first;
+    });
+    Entradas ordenadas;
+    ordenadas.reserve(entradas.size());
+    for (const std::size_t i : ordem)
+        if (ordenadas.empty() || ordenadas.back().first != entradas[i].first)
+            ordenadas.push_back(std::move(entradas[i]));
+    entradas = std::move(ordenadas);
 }
 
 // What an accessory takes of its owner: tag, strip and number in every language, and the
@@ -493,6 +501,10 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     CICad::RegistraApp(kAppRepresentacaoAce);
     CICad::RegistraApp(kAppRepresentacaoAceEsq);
 
+    // Both passes are laid out first: the blocks' extents and the steps then go before the
+    // drawing grows.
+    std::vector<Pagina> paginasComuns, paginasBornes;
+    QHash<QString, CEPonto> posicoesComuns, posicoesBornes;
     if (!itensComuns.empty()) {
         std::vector<QString> chaves;
         chaves.reserve(itensComuns.size());
@@ -500,10 +512,9 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
             chaves.push_back(item->valorCampo(kHandle));
         const auto linhas =
             LinhasBlocos(chaves, extensoes_, retangulo.largura, p.margem, p.colunas);
-        const auto paginas = Paginas(linhas, extensoes_, retangulo.altura, p.margem, p.linhas);
-        Desenha(paginas, PosicoesBlocos(paginas, extensoes_, retangulo, p.margem));
+        paginasComuns = Paginas(linhas, extensoes_, retangulo.altura, p.margem, p.linhas);
+        posicoesComuns = PosicoesBlocos(paginasComuns, extensoes_, retangulo, p.margem);
     }
-    progresso.Definir(75);
     if (!itensBornes.empty()) {
         std::vector<Borne> lista;
         lista.reserve(itensBornes.size());
@@ -512,9 +523,15 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
             lista.push_back({chave, passos_.value(chave), ReguaDe(*item)});
         }
         const auto linhas = LinhasBornes(lista, retangulo.largura, p.margem);
-        const auto paginas = Paginas(linhas, extensoes_, retangulo.altura, p.margem, p.linhas);
-        Desenha(paginas, PosicoesBornes(paginas, extensoes_, passos_, retangulo, p.margem));
+        paginasBornes = Paginas(linhas, extensoes_, retangulo.altura, p.margem, p.linhas);
+        posicoesBornes = PosicoesBornes(paginasBornes, extensoes_, passos_, retangulo, p.margem);
     }
+    extensoes_ = {};
+    passos_ = {};
+    if (!paginasComuns.empty()) Desenha(paginasComuns, posicoesComuns);
+    posicoesComuns = {};
+    progresso.Definir(75);
+    if (!paginasBornes.empty()) Desenha(paginasBornes, posicoesBornes);
     CICad::zvInvokeVoid("atualizaTopografico");
     progresso.Definir(100);
     progresso.Fechar();
@@ -969,6 +986,8 @@ void CCDiagramaTopografico::Insere(const QString& chave, PaginaFeita& pagina,
     CICad::SetXDataTextos(ref, acessorio ? kAppRepresentacaoAce : kAppRepresentacao, link);
     char digitos[16];
     LigaSimbolo(candidato->simbolo, prefixo, TextoHandle(ref.handle(), digitos));
+    // Each item goes in once: its fields give their room to the blocks that follow.
+    item->campos = CamposItem();
 }
 
 void CCDiagramaTopografico::LigaSimbolo(const OdDbObjectId& simbolo, const QString& lugar,

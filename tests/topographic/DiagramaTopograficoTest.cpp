@@ -331,6 +331,8 @@ TEST_F(DiagramaTopograficoTest, AttributesTakeTheSymbolsFieldsAndBothEndsKnowEac
     const Insercao& x12 = blocos.at(H(x12_));
     EXPECT_EQ(x12.atributos["NUMERO"].toString(), "2");
     EXPECT_EQ(x12.atributos["PASSO"].toString(), "6");
+    // A terminal that opens a strip stands twice in its row and goes in once, filled.
+    EXPECT_EQ(blocos.at(H(x21_)).atributos["NUMERO"].toString(), "1");
     // The symbols name their blocks, the virtual one too.
     EXPECT_EQ(esq_[H(k1_)], QStringList({"1", k1.handle}));
     EXPECT_EQ(esq_[H(k2_)], QStringList({"7", H(x11_), "1", blocos.at(H(k2_)).handle}));
