@@ -885,7 +885,6 @@ void CCDiagramaTopografico::Desenha(const std::vector<Pagina>& paginas,
         feita.layerU8 = feita.layer.toUtf8();
     }
     paginasCriadas_ += int(paginas.size());
-    Enxuga(paginas);
     // A terminal that starts a strip stands twice in its row: it goes in once, at its
     // last entry, where its point was left.
     QHash<QString, int> restantes;
@@ -898,49 +897,6 @@ void CCDiagramaTopografico::Desenha(const std::vector<Pagina>& paginas,
             for (const QString& chave : linha)
                 if (--restantes[chave] == 0) Insere(chave, feitas[i], posicoes.value(chave));
         if (progresso_) progresso_->Definir(progresso_->Percentual());
-    }
-}
-
-void CCDiagramaTopografico::Enxuga(const std::vector<Pagina>& paginas) {
-    // The blocks' attributes are all the items give from here on: their other fields go
-    // before the blocks go in, and the drawing grows into their room.
-    std::vector<CEItemLista*> itens;
-    std::vector<std::uint32_t> tags{CamposItem::numero(kHandle)};
-    QSet<QString> blocos;
-    for (const Pagina& pagina : paginas)
-        for (const Linha& linha : pagina)
-            for (const QString& chave : linha) {
-                const Lido lido = itensPorHandle_.value(chave);
-                if (!lido.item || !lido.candidato) continue;
-                itens.push_back(lido.item);
-                const QString& nome = lido.candidato->nome;
-                if (blocos.contains(nome)) continue;
-                blocos.insert(nome);
-                // A block that isn't there would be loaded here, before its turn: the items
-                // stay whole instead.
-                OdDbObjectId id;
-                if (!CICad::GetBlocoId(nome, id)) return;
-                const auto definicoes =
-                    CICad::GetDefinicoesAtributos(lido.candidato->arquivo, nome);
-                for (int i = 0; definicoes && i < definicoes->Quantidade(); ++i) {
-                    const QString tag = (*definicoes)[i].GetTag();
-                    tags.push_back(CamposItem::numero(tag));
-                    tags.push_back(CamposItem::numero(tag.trimmed()));
-                }
-            }
-    // By name number: a few hundred names in the whole program.
-    std::vector<char> pega(*std::max_element(tags.begin(), tags.end()) + 1, 0);
-    for (const std::uint32_t tag : tags)
-        pega[tag] = 1;
-    std::vector<CamposItem::Campo> ficam;
-    for (CEItemLista* item : itens) {
-        ficam.clear();
-        for (const CamposItem::Campo& campo : item->campos.todos())
-            if (campo.nome < pega.size() && pega[campo.nome]) ficam.push_back(campo);
-        if (ficam.size() == size_t(item->campos.size())) continue;
-        CamposItem enxutos;
-        enxutos.juntarOrdenados(ficam);
-        item->campos = std::move(enxutos);
     }
 }
 

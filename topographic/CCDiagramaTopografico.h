@@ -144,8 +144,6 @@ private:
     void LeExtensoes();
     // Makes the pages of one pass and inserts its blocks.
     void Desenha(const std::vector<Pagina>& paginas, const QHash<QString, CEPonto>& posicoes);
-    // Leaves the items of the pages only the fields their blocks' attributes take.
-    void Enxuga(const std::vector<Pagina>& paginas);
     // A page of the pass: its layer, whose record is made (when missing) before its first
     // block goes in.
     struct PaginaFeita {
