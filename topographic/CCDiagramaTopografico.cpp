@@ -47,6 +47,13 @@ const char* const kCampoSequencia = "ZV_TOPO_SEQUENCIA";
 // Every item carries its candidate's key under this name.
 const QString kHandle = QStringLiteral("HANDLE");
 
+// Whether an item read is on the lists.
+bool Listado(const CEItemLista& item) {
+    static const std::uint32_t kLista = CamposItem::numero(QStringLiteral("ZV_LISTA"));
+    const QString* valor = item.campos.procura(kLista);
+    return valor && *valor == QLatin1String("S");
+}
+
 // The catalogue type of terminal blocks.
 const char* const kTipoBorne = "5";
 
@@ -528,6 +535,18 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     }
     extensoes_ = {};
     passos_ = {};
+    // From here each item is given back as its block goes in; those left go at the end.
+    struct Entrega {
+        QHash<QString, Lido>& itens;
+        ~Entrega() {
+            for (Lido& lido : itens) {
+                delete lido.item;
+                lido.item = nullptr;
+            }
+        }
+    } entrega{itensPorHandle_};
+    itensComuns.clear();
+    itensBornes.clear();
     if (!paginasComuns.empty()) Desenha(paginasComuns, posicoesComuns);
     posicoesComuns = {};
     progresso.Definir(75);
@@ -713,15 +732,18 @@ VetorItens CCDiagramaTopografico::LeItens(const std::vector<const Entrada*>& ent
             if (dono.value()) item = std::make_unique<CEItemLista>(*dono.value());
         } else {
             item.reset(CriaItemEntidade(candidato.simbolo, modelo));
-            if (item && item->valorCampo("ZV_LISTA") != "S") item.reset();
+            if (item && !Listado(*item)) item.reset();
             if (item) Retem(*item);
             // Its accessories come next and take their owner's fields from this same read.
             if (comAcessorios_.contains(chave))
                 donos_.insert(chave, item ? std::make_shared<const CEItemLista>(*item) : nullptr);
         }
         if (!item) continue;
-        item->definirCampo(kHandle, chave);
-        item->definirCampo(kCampoSequencia, QString::number(itens.size()));
+        static const std::uint32_t kNumeroHandle = CamposItem::numero(kHandle),
+                                   kNumeroSequencia =
+                                       CamposItem::numero(QString::fromLatin1(kCampoSequencia));
+        item->definirCampo(kNumeroHandle, chave);
+        item->definirCampo(kNumeroSequencia, QString::number(itens.size()));
         itensPorHandle_.insert(chave, {item.get(), &candidato});
         itens.push_back(item.release());
     }
@@ -735,7 +757,7 @@ CEItemLista* CCDiagramaTopografico::LeItemAcessorio(const QString& chave,
     auto dono = donos_.constFind(simbolo);
     if (dono == donos_.constEnd()) {
         std::shared_ptr<CEItemLista> lido(CriaItemEntidade(candidato.simbolo, modelo));
-        if (lido && lido->valorCampo("ZV_LISTA") != "S") lido.reset();
+        if (lido && !Listado(*lido)) lido.reset();
         if (lido) Retem(*lido);
         dono = donos_.insert(simbolo, lido);
     }
@@ -942,8 +964,9 @@ void CCDiagramaTopografico::Insere(const QString& chave, PaginaFeita& pagina,
     CICad::SetXDataTextos(ref, acessorio ? kAppRepresentacaoAce : kAppRepresentacao, link);
     char digitos[16];
     LigaSimbolo(candidato->simbolo, prefixo, TextoHandle(ref.handle(), digitos));
-    // Each item goes in once: its fields give their room to the blocks that follow.
-    item->campos = CamposItem();
+    // Each item goes in once: it gives its room to the blocks that follow.
+    itensPorHandle_.find(chave)->item = nullptr;
+    delete item;
 }
 
 void CCDiagramaTopografico::LigaSimbolo(const OdDbObjectId& simbolo, const QString& lugar,
