@@ -153,6 +153,11 @@ public:
     static OdDbObjectId InsereBloco(const QString& arquivo, const QString& nome,
                                     const QString& layer, double x, double y, double z,
                                     double rotacao, const CEValoresAtributos& valores = {});
+    // The same with the block's definition found and the page's layer made by the caller,
+    // who inserts many references of a few blocks on a few pages.
+    static OdDbObjectId InsereReferencia(const OdDbObjectId& bloco, std::string_view layer,
+                                         double x, double y, double z, double rotacao,
+                                         const CEValoresAtributos& valores = {});
     static std::unique_ptr<zv::CEListaAtributos> GetDefinicoesAtributos(const QString& arquivo,
                                                                         const QString& nome);
     static OdDbObjectId GetReferenciaNoLayer(const QString& nome, const QString& layer);
@@ -274,6 +279,9 @@ public:
     static bool AtributoInvisivel(const OdDbObjectId& atributo);
     static void SetXData(const OdDbObjectId& id, const QString& aplicacao,
                          const CEListaXData& itens);
+    // Extended data of texts alone (code 1000), given in UTF-8.
+    static void SetXDataTextos(const OdDbObjectId& id, std::string_view aplicacao,
+                               const std::vector<std::string_view>& textos);
     static OdDbObjectId GetSimboloMestre(zvdb::Database* database, const OdDbObjectId& entidade);
     static bool GetCircuitoLocal(const OdDbObjectId& entidade, int& numero);
     static bool GetCircuitoLocalInfo(int numero, QString& a, QString& b, QString& c);

@@ -184,6 +184,14 @@ OdDbObjectId CICad::InsereBloco(const QString& arquivo, const QString& nome, con
     OdDbObjectId bloco;
     if (!GetBlocoId(nome, bloco, db)) bloco = CarregaBloco(nome, arquivo);
     CriaLayer(layer, db);
+    return InsereReferencia(bloco, U8(layer), x, y, z, rotacao, valores);
+}
+
+OdDbObjectId CICad::InsereReferencia(const OdDbObjectId& bloco, std::string_view layer, double x,
+                                     double y, double z, double rotacao,
+                                     const CEValoresAtributos& valores) {
+    zvdb::Database* db = GetDatabase();
+    if (!db) return {};
     auto* definicao = Como<zvdb::BlockRecord>(bloco);
     zvdb::BlockRecord* modelo = db->modelSpace();
     if (!definicao || !modelo) return {};
@@ -218,7 +226,7 @@ OdDbObjectId CICad::InsereBloco(const QString& arquivo, const QString& nome, con
         dados.clear();
     }
     zvdb::BlockReference* ref = db->addBlockReference(*modelo, *definicao, ponto, {1, 1, 1}, graus,
-                                                      U8(layer), !leituras.empty());
+                                                      layer, !leituras.empty());
     try {
         ref->addAttributesFromLayouts(base, ponto, {1, 1, 1}, graus, leituras, dados);
     } catch (const std::exception& erro) {

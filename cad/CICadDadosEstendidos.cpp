@@ -153,6 +153,17 @@ void CICad::SetXData(const OdDbObjectId& id, const QString& aplicacao, const CEL
     objeto->setXData(U8(aplicacao), TagsXData(itens).tags);
 }
 
+void CICad::SetXDataTextos(const OdDbObjectId& id, std::string_view aplicacao,
+                           const std::vector<std::string_view>& textos) {
+    zvdb::DbObject* objeto = Objeto(id);
+    if (!objeto) return;
+    std::vector<zvdb::Tag> tags;
+    tags.reserve(textos.size());
+    for (const std::string_view texto : textos)
+        tags.push_back({std::int16_t(1000), texto});
+    objeto->setXData(aplicacao, tags);
+}
+
 OdDbObjectId CICad::IdDoHandle(const QString& handle, zvdb::Database* database) {
     zvdb::Database* db = Db(database);
     const std::uint64_t h = ZVString(handle).ParaHandle();

@@ -76,6 +76,14 @@ public:
     void reservar(std::size_t n) { campos_.reserve(n); }
     // Gives back the spare room of the array once the item is complete.
     void compactar() { campos_.shrink_to_fit(); }
+    // Keeps the fields whose name number `fica` accepts, in their order, and gives back the
+    // room of the others.
+    template <class Fica>
+    void reter(Fica fica) {
+        const auto antes = campos_.size();
+        std::erase_if(campos_, [&fica](const Campo& campo) { return !fica(campo.nome); });
+        if (campos_.size() != antes) campos_.shrink_to_fit();
+    }
 
     const_iterator begin() const { return const_iterator(campos_.data()); }
     const_iterator end() const { return const_iterator(campos_.data() + campos_.size()); }

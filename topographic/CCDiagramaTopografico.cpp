@@ -20,6 +20,7 @@
 #include <cstdint>
 #include <iterator>
 #include <memory>
+#include <numeric>
 
 namespace {
 
@@ -45,6 +46,13 @@ const char* const kCampoSequencia = "ZV_TOPO_SEQUENCIA";
 
 // Every item carries its candidate's key under this name.
 const QString kHandle = QStringLiteral("HANDLE");
+
+// Whether an item read is on the lists.
+bool Listado(const CEItemLista& item) {
+    static const std::uint32_t kLista = CamposItem::numero(QStringLiteral("ZV_LISTA"));
+    const QString* valor = item.campos.procura(kLista);
+    return valor && *valor == QLatin1String("S");
+}
 
 // The catalogue type of terminal blocks.
 const char* const kTipoBorne = "5";
@@ -102,21 +110,57 @@ void Filtra(Entradas& entradas, Fica fica) {
     entradas.erase(destino, entradas.end());
 }
 
-// In key order; of entries with one key the first gathered stays.
+// In key order; of entries with one key the first gathered stays. The places are sorted and
+// each entry, large beside its key, moves once.
 template <class Entradas>
 void OrdenaPorChave(Entradas& entradas) {
-    const auto porChave = [](const auto& a, const auto& b) { return a.first < b.first; };
-    std::stable_sort(entradas.begin(), entradas.end(), porChave);
-    entradas.erase(std::unique(entradas.begin(), entradas.end(),
-                               [](const auto& a, const auto& b) { return a.first == b.first; }),
-                   entradas.end());
+    std::vector<std::size_t> ordem(entradas.size());
+    std::iota(ordem.begin(), ordem.end(), std::size_t(0));
+    std::stable_sort(ordem.begin(), ordem.end(), [&entradas](std::size_t a, std::size_t b) {
+        return entradas[a].first < entradas[b].first;
+    });
+    Entradas ordenadas;
+    ordenadas.reserve(entradas.size());
+    for (const std::size_t i : ordem)
+        if (ordenadas.empty() || ordenadas.back().first != entradas[i].first)
+            ordenadas.push_back(std::move(entradas[i]));
+    entradas = std::move(ordenadas);
 }
 
-CEItemXData Texto(const QString& texto) {
-    CEItemXData item;
-    item.codigo = 1000;
-    item.texto = texto;
-    return item;
+// What an accessory takes of its owner: tag, strip and number in every language, and the
+// page. The names are looked up once: a project has thousands of accessories.
+const std::vector<std::uint32_t>& NomesDoDono() {
+    static const std::vector<std::uint32_t> nomes = [] {
+        QStringList textos;
+        for (CampoTraduzido campo :
+             {CampoTraduzido::Relacao, CampoTraduzido::Regua, CampoTraduzido::Numero})
+            for (int idioma = 1; idioma <= 3; ++idioma)
+                textos << CICad::TagTraduzida(campo, idioma);
+        textos << "PAGINA"
+               << "GRUPO"
+               << "LAYER"
+               << "POSICAO";
+        std::vector<std::uint32_t> numeros;
+        for (const QString& texto : textos)
+            numeros.push_back(CamposItem::numero(texto));
+        return numeros;
+    }();
+    return nomes;
+}
+
+std::string_view Vista(const QByteArray& texto) {
+    return {texto.constData(), std::size_t(texto.size())};
+}
+
+// A handle's text as the drawing writes it: upper-case hexadecimal digits without leading
+// zeros, in `digitos`.
+std::string_view TextoHandle(std::uint64_t handle, char (&digitos)[16]) {
+    int n = 0;
+    do {
+        digitos[15 - n++] = "0123456789ABCDEF"[handle & 15];
+        handle >>= 4;
+    } while (handle != 0);
+    return {digitos + 16 - n, std::size_t(n)};
 }
 
 }  // namespace
@@ -323,6 +367,7 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     }
     parametros_ = LeParametros();
     const Parametros& p = parametros_;
+    representacaoU8_ = p.representacao.toUtf8();
     if (p.representacao.isEmpty() || p.representacao == "-1") {
         CICad::ImprimeMensagem(kMsgSemRepresentacao);
         throw int(SemRepresentacao);
@@ -354,6 +399,8 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
         ~Fim() {
             d.progresso_ = nullptr;
             d.itensPorHandle_.clear();
+            d.camposUsados_.clear();
+            d.definicoes_.clear();
         }
     } fim{*this};
     progresso.Mostrar();
@@ -419,6 +466,10 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     };
     porSimbolo(comuns);
     porSimbolo(bornes);
+    PreparaLeitura(candidatos_);
+    // Each symbol is read once (an accessory's owner is kept in donos_) and never again as a
+    // neighbour: its reading need not be kept.
+    GuardaSimbolos = false;
     VetorItens itensComuns = LeItens(comuns, modelo);
     VetorItens itensBornes = LeItens(bornes, modelo);
     // Everything is read: what the reading kept goes before the drawing grows.
@@ -457,6 +508,10 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     CICad::RegistraApp(kAppRepresentacaoAce);
     CICad::RegistraApp(kAppRepresentacaoAceEsq);
 
+    // Both passes are laid out first: the blocks' extents and the steps then go before the
+    // drawing grows.
+    std::vector<Pagina> paginasComuns, paginasBornes;
+    QHash<QString, CEPonto> posicoesComuns, posicoesBornes;
     if (!itensComuns.empty()) {
         std::vector<QString> chaves;
         chaves.reserve(itensComuns.size());
@@ -464,10 +519,9 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
             chaves.push_back(item->valorCampo(kHandle));
         const auto linhas =
             LinhasBlocos(chaves, extensoes_, retangulo.largura, p.margem, p.colunas);
-        const auto paginas = Paginas(linhas, extensoes_, retangulo.altura, p.margem, p.linhas);
-        Desenha(paginas, PosicoesBlocos(paginas, extensoes_, retangulo, p.margem));
+        paginasComuns = Paginas(linhas, extensoes_, retangulo.altura, p.margem, p.linhas);
+        posicoesComuns = PosicoesBlocos(paginasComuns, extensoes_, retangulo, p.margem);
     }
-    progresso.Definir(75);
     if (!itensBornes.empty()) {
         std::vector<Borne> lista;
         lista.reserve(itensBornes.size());
@@ -476,9 +530,27 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
             lista.push_back({chave, passos_.value(chave), ReguaDe(*item)});
         }
         const auto linhas = LinhasBornes(lista, retangulo.largura, p.margem);
-        const auto paginas = Paginas(linhas, extensoes_, retangulo.altura, p.margem, p.linhas);
-        Desenha(paginas, PosicoesBornes(paginas, extensoes_, passos_, retangulo, p.margem));
+        paginasBornes = Paginas(linhas, extensoes_, retangulo.altura, p.margem, p.linhas);
+        posicoesBornes = PosicoesBornes(paginasBornes, extensoes_, passos_, retangulo, p.margem);
     }
+    extensoes_ = {};
+    passos_ = {};
+    // From here each item is given back as its block goes in; those left go at the end.
+    struct Entrega {
+        QHash<QString, Lido>& itens;
+        ~Entrega() {
+            for (Lido& lido : itens) {
+                delete lido.item;
+                lido.item = nullptr;
+            }
+        }
+    } entrega{itensPorHandle_};
+    itensComuns.clear();
+    itensBornes.clear();
+    if (!paginasComuns.empty()) Desenha(paginasComuns, posicoesComuns);
+    posicoesComuns = {};
+    progresso.Definir(75);
+    if (!paginasBornes.empty()) Desenha(paginasBornes, posicoesBornes);
     CICad::zvInvokeVoid("atualizaTopografico");
     progresso.Definir(100);
     progresso.Fechar();
@@ -660,14 +732,18 @@ VetorItens CCDiagramaTopografico::LeItens(const std::vector<const Entrada*>& ent
             if (dono.value()) item = std::make_unique<CEItemLista>(*dono.value());
         } else {
             item.reset(CriaItemEntidade(candidato.simbolo, modelo));
-            if (item && item->valorCampo("ZV_LISTA") != "S") item.reset();
+            if (item && !Listado(*item)) item.reset();
+            if (item) Retem(*item);
             // Its accessories come next and take their owner's fields from this same read.
             if (comAcessorios_.contains(chave))
                 donos_.insert(chave, item ? std::make_shared<const CEItemLista>(*item) : nullptr);
         }
         if (!item) continue;
-        item->definirCampo(kHandle, chave);
-        item->definirCampo(kCampoSequencia, QString::number(itens.size()));
+        static const std::uint32_t kNumeroHandle = CamposItem::numero(kHandle),
+                                   kNumeroSequencia =
+                                       CamposItem::numero(QString::fromLatin1(kCampoSequencia));
+        item->definirCampo(kNumeroHandle, chave);
+        item->definirCampo(kNumeroSequencia, QString::number(itens.size()));
         itensPorHandle_.insert(chave, {item.get(), &candidato});
         itens.push_back(item.release());
     }
@@ -680,8 +756,9 @@ CEItemLista* CCDiagramaTopografico::LeItemAcessorio(const QString& chave,
     const QString simbolo = chave.section('_', -1);
     auto dono = donos_.constFind(simbolo);
     if (dono == donos_.constEnd()) {
-        std::shared_ptr<const CEItemLista> lido(CriaItemEntidade(candidato.simbolo, modelo));
-        if (lido && lido->valorCampo("ZV_LISTA") != "S") lido.reset();
+        std::shared_ptr<CEItemLista> lido(CriaItemEntidade(candidato.simbolo, modelo));
+        if (lido && !Listado(*lido)) lido.reset();
+        if (lido) Retem(*lido);
         dono = donos_.insert(simbolo, lido);
     }
     // The accessory of a symbol that is not on the lists is not in the panel either.
@@ -690,23 +767,7 @@ CEItemLista* CCDiagramaTopografico::LeItemAcessorio(const QString& chave,
     auto item = std::make_unique<CEItemLista>();
     item->ids = origem.ids;
     // It sits with its owner: the owner's tag, strip, number and page, in every language.
-    // The names are looked up once: a project has thousands of accessories.
-    static const std::vector<std::uint32_t> kDoDono = [] {
-        QStringList nomes;
-        for (CampoTraduzido campo :
-             {CampoTraduzido::Relacao, CampoTraduzido::Regua, CampoTraduzido::Numero})
-            for (int idioma = 1; idioma <= 3; ++idioma)
-                nomes << CICad::TagTraduzida(campo, idioma);
-        nomes << "PAGINA"
-              << "GRUPO"
-              << "LAYER"
-              << "POSICAO";
-        std::vector<std::uint32_t> numeros;
-        for (const QString& nome : nomes)
-            numeros.push_back(CamposItem::numero(nome));
-        return numeros;
-    }();
-    for (const std::uint32_t nome : kDoDono)
+    for (const std::uint32_t nome : NomesDoDono())
         if (const QString* valor = origem.campos.procura(nome)) item->definirCampo(nome, *valor);
     // Everything else is the accessory's own.
     static const std::uint32_t kTipo = CamposItem::numero("ZV_LISTA_TIPO"),
@@ -727,7 +788,67 @@ CEItemLista* CCDiagramaTopografico::LeItemAcessorio(const QString& chave,
     LeColunasUsuario(QString(), *item, Catalogo().ColunasComp(candidato.chave));
     const QString* listado = item->campos.procura(kLista);
     if (!listado || *listado != QLatin1String("S")) return nullptr;
+    Retem(*item);
     return item.release();
+}
+
+// ---- what is read of items
+
+// The diagram never loads the project's connections, and without them a terminal's side
+// finds no element: looking costs the wires' index of every page and gives nothing.
+void CCDiagramaTopografico::LerLadoIni(CEItemLista&, const OdDbObjectId&, CETemplate&) {}
+
+void CCDiagramaTopografico::LerLadoFim(CEItemLista&, const OdDbObjectId&, CETemplate&) {}
+
+std::optional<std::vector<std::uint32_t>> CCDiagramaTopografico::CamposUsados(
+    const Parametros& parametros, const std::vector<std::pair<QString, QString>>& blocos) {
+    std::vector<std::uint32_t> campos = NomesDoDono();
+    const auto poe = [&campos](const QString& nome) {
+        if (!nome.isEmpty()) campos.push_back(CamposItem::numero(nome));
+    };
+    for (const char* nome : {"HANDLE", "ZV_LISTA", "QTD", "REGUA", "STRIP", "REGLETA"})
+        poe(QString::fromLatin1(nome));
+    poe(QString::fromLatin1(kCampoSequencia));
+    poe(parametros.borneDist);
+    for (const QString& nome : parametros.ordenacao)
+        poe(nome);
+    for (const auto& [arquivo, nome] : blocos) {
+        // A block the drawing lacks would be loaded here, before its turn.
+        OdDbObjectId id;
+        if (!CICad::GetBlocoId(nome, id)) return std::nullopt;
+        const auto definicoes = CICad::GetDefinicoesAtributos(arquivo, nome);
+        for (int i = 0; definicoes && i < definicoes->Quantidade(); ++i) {
+            const QString tag = (*definicoes)[i].GetTag();
+            poe(tag);
+            poe(tag.trimmed());
+        }
+    }
+    std::sort(campos.begin(), campos.end());
+    campos.erase(std::unique(campos.begin(), campos.end()), campos.end());
+    return campos;
+}
+
+void CCDiagramaTopografico::PreparaLeitura(const Candidatos& candidatos) {
+    camposUsados_.clear();
+    std::vector<std::pair<QString, QString>> blocos;
+    QSet<QString> vistos;
+    for (const auto& [chave, candidato] : candidatos)
+        if (!vistos.contains(candidato.nome)) {
+            vistos.insert(candidato.nome);
+            blocos.emplace_back(candidato.arquivo, candidato.nome);
+        }
+    const auto campos = CamposUsados(parametros_, blocos);
+    if (!campos) return;
+    camposUsados_.assign(campos->empty() ? 0 : campos->back() + 1, 0);
+    for (const std::uint32_t campo : *campos)
+        camposUsados_[campo] = 1;
+}
+
+void CCDiagramaTopografico::Retem(CEItemLista& item) const {
+    if (camposUsados_.empty()) return;
+    const std::vector<char>& usados = camposUsados_;
+    item.campos.reter(
+        [&usados](std::uint32_t nome) { return nome < usados.size() && usados[nome]; });
 }
 
 void CCDiagramaTopografico::LePassos(const VetorItens& bornes) {
@@ -780,11 +901,12 @@ void CCDiagramaTopografico::LeExtensoes() {
 void CCDiagramaTopografico::Desenha(const std::vector<Pagina>& paginas,
                                     const QHash<QString, CEPonto>& posicoes) {
     // Every page first, so that no page change happens while blocks go in.
-    QStringList layers;
-    for (size_t i = 0; i < paginas.size(); ++i)
-        layers << CriaPagina(parametros_.grupo);
+    std::vector<PaginaFeita> feitas(paginas.size());
+    for (PaginaFeita& feita : feitas) {
+        feita.layer = CriaPagina(parametros_.grupo);
+        feita.layerU8 = feita.layer.toUtf8();
+    }
     paginasCriadas_ += int(paginas.size());
-    Enxuga(paginas);
     // A terminal that starts a strip stands twice in its row: it goes in once, at its
     // last entry, where its point was left.
     QHash<QString, int> restantes;
@@ -795,55 +917,12 @@ void CCDiagramaTopografico::Desenha(const std::vector<Pagina>& paginas,
     for (size_t i = 0; i < paginas.size(); ++i) {
         for (const Linha& linha : paginas[i])
             for (const QString& chave : linha)
-                if (--restantes[chave] == 0) Insere(chave, layers[int(i)], posicoes.value(chave));
+                if (--restantes[chave] == 0) Insere(chave, feitas[i], posicoes.value(chave));
         if (progresso_) progresso_->Definir(progresso_->Percentual());
     }
 }
 
-void CCDiagramaTopografico::Enxuga(const std::vector<Pagina>& paginas) {
-    // The blocks' attributes are all the items give from here on: their other fields go
-    // before the blocks go in, and the drawing grows into their room.
-    std::vector<CEItemLista*> itens;
-    std::vector<std::uint32_t> tags{CamposItem::numero(kHandle)};
-    QSet<QString> blocos;
-    for (const Pagina& pagina : paginas)
-        for (const Linha& linha : pagina)
-            for (const QString& chave : linha) {
-                const Lido lido = itensPorHandle_.value(chave);
-                if (!lido.item || !lido.candidato) continue;
-                itens.push_back(lido.item);
-                const QString& nome = lido.candidato->nome;
-                if (blocos.contains(nome)) continue;
-                blocos.insert(nome);
-                // A block that isn't there would be loaded here, before its turn: the items
-                // stay whole instead.
-                OdDbObjectId id;
-                if (!CICad::GetBlocoId(nome, id)) return;
-                const auto definicoes =
-                    CICad::GetDefinicoesAtributos(lido.candidato->arquivo, nome);
-                for (int i = 0; definicoes && i < definicoes->Quantidade(); ++i) {
-                    const QString tag = (*definicoes)[i].GetTag();
-                    tags.push_back(CamposItem::numero(tag));
-                    tags.push_back(CamposItem::numero(tag.trimmed()));
-                }
-            }
-    // By name number: a few hundred names in the whole program.
-    std::vector<char> pega(*std::max_element(tags.begin(), tags.end()) + 1, 0);
-    for (const std::uint32_t tag : tags)
-        pega[tag] = 1;
-    std::vector<CamposItem::Campo> ficam;
-    for (CEItemLista* item : itens) {
-        ficam.clear();
-        for (const CamposItem::Campo& campo : item->campos.todos())
-            if (campo.nome < pega.size() && pega[campo.nome]) ficam.push_back(campo);
-        if (ficam.size() == size_t(item->campos.size())) continue;
-        CamposItem enxutos;
-        enxutos.juntarOrdenados(ficam);
-        item->campos = std::move(enxutos);
-    }
-}
-
-void CCDiagramaTopografico::Insere(const QString& chave, const QString& layer,
+void CCDiagramaTopografico::Insere(const QString& chave, PaginaFeita& pagina,
                                    const CEPonto& ponto) {
     const Lido lido = itensPorHandle_.value(chave);
     CEItemLista* item = lido.item;
@@ -854,36 +933,51 @@ void CCDiagramaTopografico::Insere(const QString& chave, const QString& layer,
         const QString* valor = item->campo(tag);
         return valor ? *valor : QString();
     };
-    const OdDbObjectId ref = CICad::InsereBloco(candidato->arquivo, candidato->nome, layer, ponto.x,
-                                                ponto.y, 0.0, 0.0, valores);
+    // The definition is looked up (or loaded) at the block's first insertion, and the page's
+    // layer made at the page's first, as each insertion on its own would do.
+    OdDbObjectId& definicao = definicoes_[candidato->nome];
+    if (definicao.isNull() && !CICad::GetBlocoId(candidato->nome, definicao))
+        definicao = CICad::CarregaBloco(candidato->nome, candidato->arquivo);
+    if (!pagina.pronta) {
+        CICad::CriaLayer(pagina.layer);
+        pagina.pronta = true;
+    }
+    const OdDbObjectId ref = CICad::InsereReferencia(definicao, Vista(pagina.layerU8), ponto.x,
+                                                     ponto.y, 0.0, 0.0, valores);
     if (ref.isNull()) return;  // left out; the run goes on
     ++inseridos_;
     // The block names its symbol; an accessory's block also its place and catalogue key.
     QString handle = item->valorCampo(kHandle);
     const int corte = handle.indexOf('_');
     const bool acessorio = corte >= 0;
-    CEListaXData link{Texto(parametros_.representacao)};
     const QString prefixo = acessorio ? handle.left(corte) : QString();
     if (acessorio) handle = handle.mid(corte + 1);
-    link.push_back(Texto(handle));
+    const QByteArray handleU8 = handle.toUtf8();
+    std::vector<std::string_view> link{Vista(representacaoU8_), Vista(handleU8)};
+    QByteArray prefixoU8, chaveU8;
     if (acessorio) {
-        link.push_back(Texto(prefixo));
-        link.push_back(Texto(candidato->chave));
+        prefixoU8 = prefixo.toUtf8();
+        chaveU8 = candidato->chave.toUtf8();
+        link.push_back(Vista(prefixoU8));
+        link.push_back(Vista(chaveU8));
     }
-    static const QString kRepresentacao(kAppRepresentacao), kAce(kAppRepresentacaoAce);
-    CICad::SetXData(ref, acessorio ? kAce : kRepresentacao, link);
-    LigaSimbolo(candidato->simbolo, prefixo, ZVString::DeHandle(ref.handle()));
+    CICad::SetXDataTextos(ref, acessorio ? kAppRepresentacaoAce : kAppRepresentacao, link);
+    char digitos[16];
+    LigaSimbolo(candidato->simbolo, prefixo, TextoHandle(ref.handle(), digitos));
+    // Each item goes in once: it gives its room to the blocks that follow.
+    itensPorHandle_.find(chave)->item = nullptr;
+    delete item;
 }
 
 void CCDiagramaTopografico::LigaSimbolo(const OdDbObjectId& simbolo, const QString& lugar,
-                                        const QString& bloco) {
+                                        std::string_view bloco) {
     if (simbolo.isNull()) return;  // the block stays unlinked; the next run adds it again
     const bool acessorio = !lugar.isEmpty();
     static const QString kEsq(kAppRepresentacaoEsq), kAceEsq(kAppRepresentacaoAceEsq);
     const QString& aplicacao = acessorio ? kAceEsq : kEsq;
     // At most one block per representation, and for accessories one per place in the
     // symbol's list: a stale pair, or the old block of the same one, goes.
-    CEListaXData cadeia;
+    std::vector<QByteArray> ficam;
     for (const auto& [rep, ligado] : Pares(CICad::GetXData(simbolo, aplicacao))) {
         const OdDbObjectId id = CICad::IdDoHandle(ligado);
         if (id.isNull()) continue;
@@ -892,10 +986,15 @@ void CCDiagramaTopografico::LigaSimbolo(const OdDbObjectId& simbolo, const QStri
             const CEListaXData link = CICad::GetXData(id, kAppRepresentacaoAce);
             if (link.size() < 3 || link[2].texto == lugar) continue;
         }
-        cadeia.push_back(Texto(rep));
-        cadeia.push_back(Texto(ligado));
+        ficam.push_back(rep.toUtf8());
+        ficam.push_back(ligado.toUtf8());
     }
-    cadeia.push_back(Texto(parametros_.representacao));
-    cadeia.push_back(Texto(bloco));
-    CICad::SetXData(simbolo, aplicacao, cadeia);
+    std::vector<std::string_view> cadeia;
+    cadeia.reserve(ficam.size() + 2);
+    for (const QByteArray& texto : ficam)
+        cadeia.push_back(Vista(texto));
+    cadeia.push_back(Vista(representacaoU8_));
+    cadeia.push_back(bloco);
+    CICad::SetXDataTextos(simbolo, acessorio ? kAppRepresentacaoAceEsq : kAppRepresentacaoEsq,
+                          cadeia);
 }

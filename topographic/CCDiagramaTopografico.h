@@ -7,13 +7,17 @@
 // laid out as blocks of their own, each tied to its symbol and its place in the list.
 #include "readers/CCExportDataReader.h"
 
+#include <QByteArray>
 #include <QHash>
 #include <QSet>
 #include <QString>
 #include <QStringList>
 
+#include <cstdint>
 #include <map>
 #include <memory>
+#include <optional>
+#include <string_view>
 #include <vector>
 
 class CETemplate;
@@ -89,6 +93,16 @@ public:
     // The symbols' parameters, as the template left them.
     static Parametros LeParametros();
 
+    // A terminal's sides are left unread.
+    void LerLadoIni(CEItemLista& item, const OdDbObjectId& entidade, CETemplate& modelo) override;
+    void LerLadoFim(CEItemLista& item, const OdDbObjectId& entidade, CETemplate& modelo) override;
+
+    // The fields a run reads of its items: the blocks' attribute tags, bare and trimmed, and
+    // the names the run itself asks for. Null when a block's tags can't be known without
+    // loading it: the items are then read whole.
+    static std::optional<std::vector<std::uint32_t>> CamposUsados(
+        const Parametros& parametros, const std::vector<std::pair<QString, QString>>& blocos);
+
 private:
     struct Candidato {
         QString chave, norma, bloco;
@@ -122,15 +136,24 @@ private:
     // Is an accessory's block of this representation, for this place in the symbol's list,
     // still in the drawing?
     bool AcessorioDesenhado(const QString& chave, const Candidato& candidato) const;
+    // Works out the fields kept of items read (see CamposUsados).
+    void PreparaLeitura(const Candidatos& candidatos);
+    // Leaves a read item only the fields the run uses.
+    void Retem(CEItemLista& item) const;
     void LePassos(const VetorItens& bornes);
     void LeExtensoes();
     // Makes the pages of one pass and inserts its blocks.
     void Desenha(const std::vector<Pagina>& paginas, const QHash<QString, CEPonto>& posicoes);
-    // Leaves the items of the pages only the fields their blocks' attributes take.
-    void Enxuga(const std::vector<Pagina>& paginas);
-    void Insere(const QString& chave, const QString& layer, const CEPonto& ponto);
+    // A page of the pass: its layer, whose record is made (when missing) before its first
+    // block goes in.
+    struct PaginaFeita {
+        QString layer;
+        QByteArray layerU8;
+        bool pronta = false;
+    };
+    void Insere(const QString& chave, PaginaFeita& pagina, const CEPonto& ponto);
     // `lugar` is an accessory's place ("*0", "#1"), empty for the symbol's own block.
-    void LigaSimbolo(const OdDbObjectId& simbolo, const QString& lugar, const QString& bloco);
+    void LigaSimbolo(const OdDbObjectId& simbolo, const QString& lugar, std::string_view bloco);
 
     Parametros parametros_;
     QString diretorio_;
@@ -142,6 +165,12 @@ private:
     QHash<QString, std::shared_ptr<const CEItemLista>> donos_;
     // The symbols that have accessories among the candidates.
     QSet<QString> comAcessorios_;
+    // By name number, the fields kept of items read; empty: all of them.
+    std::vector<char> camposUsados_;
+    // The representation key as the links write it, and the blocks' definitions by name,
+    // found at their first insertion.
+    QByteArray representacaoU8_;
+    QHash<QString, OdDbObjectId> definicoes_;
     CIProgress* progresso_ = nullptr;
     int inseridos_ = 0;
     int paginasCriadas_ = 0;

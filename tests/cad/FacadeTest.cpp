@@ -287,6 +287,51 @@ TEST_F(FacadeFixture, InsertingWithValuesMakesEachAttributeWithItsValue) {
     EXPECT_EQ(atributosA[1]->textValue(), "feito");
 }
 
+// A writer that inserts many blocks finds each definition and page once and writes its
+// links as plain texts: the reference, its attributes and its extended data are those that
+// the name-and-file insertion and the item list give.
+TEST_F(FacadeFixture, InsertingAFoundDefinitionAndWritingTextsGiveWhatTheLongWayGives) {
+    const QString caminho = arquivoBloco("CURTO", {"VARIAVEL_1", "VARIAVEL_2"});
+    const CEValoresAtributos valores = [](const QString& tag,
+                                          const QString&) -> std::optional<QString> {
+        return "<" + tag + ">";
+    };
+    const OdDbObjectId longa = CICad::InsereBloco(caminho, "CURTO", "0", 1.5, 2.5, 0, 0.5, valores);
+    OdDbObjectId bloco;
+    ASSERT_TRUE(CICad::GetBlocoId("CURTO", bloco));
+    const OdDbObjectId curta = CICad::InsereReferencia(bloco, "0", 1.5, 2.5, 0, 0.5, valores);
+    ASSERT_FALSE(longa.isNull());
+    ASSERT_FALSE(curta.isNull());
+    EXPECT_NE(longa.handle(), curta.handle());
+    EXPECT_TRUE(CICad::InsereReferencia(OdDbObjectId(), "0", 0, 0, 0, 0, valores).isNull());
+    CICad::RegistraApp("KVR_ZV_REPRESENTACAO");
+    CICad::SetXData(longa, "KVR_ZV_REPRESENTACAO", {{1000, "1"}, {1000, "1A2B"}, {1000, "ç"}});
+    CICad::SetXDataTextos(curta, "KVR_ZV_REPRESENTACAO", {"1", "1A2B", "\xc3\xa7"});
+    const auto texto = [](const zvdb::DbObject& objeto) {
+        std::vector<std::string> linhas;
+        for (const zvdb::Tag& t : objeto.tags())
+            if (t.code != 5 && t.code != 330)
+                linhas.push_back(std::to_string(t.code) + " " + std::string(t.value));
+        return linhas;
+    };
+    auto* a = dynamic_cast<zvdb::BlockReference*>(db().objectByHandle(longa.handle()));
+    auto* b = dynamic_cast<zvdb::BlockReference*>(db().objectByHandle(curta.handle()));
+    ASSERT_TRUE(a && b);
+    EXPECT_EQ(texto(*a), texto(*b));
+    const auto atributosA = a->attributes();
+    const auto atributosB = b->attributes();
+    ASSERT_EQ(atributosA.size(), 2u);
+    ASSERT_EQ(atributosB.size(), 2u);
+    for (size_t i = 0; i < 2; ++i)
+        EXPECT_EQ(texto(*atributosA[i]), texto(*atributosB[i])) << i;
+    EXPECT_EQ(atributosB[1]->textValue(), "<VARIAVEL_2>");
+    const CEListaXData lidos = CICad::GetXData(curta, "KVR_ZV_REPRESENTACAO");
+    ASSERT_EQ(lidos.size(), 3u);
+    EXPECT_EQ(lidos[1].codigo, 1000);
+    EXPECT_EQ(lidos[1].texto, "1A2B");
+    EXPECT_EQ(lidos[2].texto, QString::fromUtf8("\xc3\xa7"));
+}
+
 // The tag and default asked about are those of the definition as it stands at each
 // insertion: a definition edited, or a block redefined from its file, between two rows.
 TEST_F(FacadeFixture, ValuesAreAskedWithTheDefinitionsCurrentTagAndDefault) {

@@ -301,6 +301,22 @@ TEST_F(DiagramaTopograficoTest, RowsOfBlocksAndOfTerminalsStandWhereTheLayoutSay
     EXPECT_EQ(blocos.at(H(x21_)).layer, paginaBornes);
 }
 
+TEST_F(DiagramaTopograficoTest, ASortFieldThatNoBlockShowsStillOrdersTheRow) {
+    // Items keep only the fields the run reads: the sort's, though no view has that tag.
+    k1_->addAttribute("ORDEM", "2", {0, 0, 0}, 2.0);
+    k2_->addAttribute("ORDEM", "1", {0, 0, 0}, 2.0);
+    Modelo({{"PBLTOPO_ORDENACAO", "'(\"ORDEM\")"}});
+    ASSERT_EQ(Executa(), zvsdk::CommandResult::Succeeded) << Saida().toStdString();
+    const auto blocos = PorSimbolo(Salvo());
+    const QString g1 = QString::fromStdString(zvsample::handleText(g1_));
+    // -G1 has no ORDEM and comes first, then -K2 and -K1, justified as above.
+    EXPECT_EQ(blocos.at(g1).x, 0.0);
+    EXPECT_EQ(blocos.at(H(k2_)).x, 45.0);
+    EXPECT_EQ(blocos.at(H(k1_)).x, 80.0);
+    EXPECT_EQ(blocos.at(H(k1_)).atributos["RELACAO"].toString(), "-K1");
+    EXPECT_FALSE(blocos.at(H(k1_)).atributos.contains("ORDEM"));
+}
+
 TEST_F(DiagramaTopograficoTest, AttributesTakeTheSymbolsFieldsAndBothEndsKnowEachOther) {
     // A pair of another representation on the symbol stays beside the new one.
     db().registerApplication("KVR_ZV_REPRESENTACAO_ESQ");
@@ -315,6 +331,8 @@ TEST_F(DiagramaTopograficoTest, AttributesTakeTheSymbolsFieldsAndBothEndsKnowEac
     const Insercao& x12 = blocos.at(H(x12_));
     EXPECT_EQ(x12.atributos["NUMERO"].toString(), "2");
     EXPECT_EQ(x12.atributos["PASSO"].toString(), "6");
+    // A terminal that opens a strip stands twice in its row and goes in once, filled.
+    EXPECT_EQ(blocos.at(H(x21_)).atributos["NUMERO"].toString(), "1");
     // The symbols name their blocks, the virtual one too.
     EXPECT_EQ(esq_[H(k1_)], QStringList({"1", k1.handle}));
     EXPECT_EQ(esq_[H(k2_)], QStringList({"7", H(x11_), "1", blocos.at(H(k2_)).handle}));

@@ -4,10 +4,15 @@
 // twice.
 #include "ProductFolder.h"
 #include "QtPrinters.h"
+#include "drawing/BlockRecord.h"
+#include "drawing/Database.h"
+#include "drawing/DxfLoader.h"
+#include "drawing/DxfWriter.h"
 #include "drawing/PythonChecker.h"
 
 #include <gtest/gtest.h>
 
+#include <QDir>
 #include <QFile>
 #include <QJsonArray>
 #include <QJsonDocument>
@@ -200,6 +205,51 @@ TEST_F(TopograficoZvhost, AMissingTemplateOrFolderWritesNothing) {
     EXPECT_EQ(run.status, 4) << run.err.toStdString();
     EXPECT_FALSE(run.out.contains("Topographic diagram drawn."));
     EXPECT_FALSE(QFile::exists(saida));
+}
+
+// The diagram reads no wiring: a block that asks for what is wired at a terminal's side
+// gets blanks, and the blocks of every symbol are drawn as they are without it.
+TEST(TopograficoLados, ABlockAskingForATerminalsSideGetsABlank) {
+    zvtest::ProductFolder produto;
+    const QString erro =
+        produto.prepare({"--seed", "7", "--terminals", "40", "--numbers", "project"});
+    ASSERT_TRUE(erro.isEmpty()) << erro.toStdString();
+    // Every front view of the product gets an attribute for the element at the first side.
+    const QDir blocos(produto.path("produto/DADOS/1/BLOCOS"));
+    int alterados = 0;
+    for (const QString& nome : blocos.entryList({"TOPO_*.dxf"}, QDir::Files)) {
+        const std::string arquivo = blocos.filePath(nome).toStdString();
+        std::unique_ptr<zvdb::Database> bloco = zvdb::DxfLoader::loadFile(arquivo);
+        ASSERT_TRUE(bloco) << nome.toStdString();
+        bloco->modelSpace()->addAttributeDefinition("REL_INI", "REL_INI", "", {0, -5, 0}, 1.0);
+        zvdb::DxfWriter::saveFile(*bloco, arquivo);
+        ++alterados;
+    }
+    ASSERT_GT(alterados, 5);
+    const QString saida = produto.path("lados.dxf");
+    const zvtest::HostRun run =
+        produto.zvhost({"--quiet", "--load", produto.path("produto/config/zvconfig.lsp"),
+                        "--answer", "template=" + produto.path("produto/templates/topografico.dtp"),
+                        produto.project(), "-o", saida, "diagramaTopografico"});
+    ASSERT_EQ(run.status, 0) << run.out.toStdString() << run.err.toStdString();
+    const QString falta = zvtest::PythonChecker::missing();
+    ASSERT_TRUE(falta.isEmpty()) << falta.toStdString();
+    QString texto;
+    ASSERT_EQ(zvtest::PythonChecker::run("topografico_dxf.py", {saida}, &texto), 0)
+        << texto.toStdString();
+    int comAtributo = 0, vazios = 0, comRelacao = 0;
+    for (const QJsonValue& v :
+         QJsonDocument::fromJson(texto.toUtf8()).object()["inserts"].toArray()) {
+        const QJsonObject atributos = v.toObject()["attribs"].toObject();
+        if (!atributos.contains("REL_INI")) continue;
+        ++comAtributo;
+        if (atributos["REL_INI"].toString().isEmpty()) ++vazios;
+        if (!atributos["RELACAO"].toString().isEmpty()) ++comRelacao;
+    }
+    EXPECT_GT(comAtributo, 40);
+    EXPECT_EQ(vazios, comAtributo);
+    // The symbols' own fields are there all the same.
+    EXPECT_GT(comRelacao, 10);
 }
 
 }  // namespace
