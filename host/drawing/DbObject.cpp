@@ -48,7 +48,7 @@ std::span<const Tag> DbObject::tags() const {
 
 void DbObject::expand() {
     if (!patterned_) return;
-    own_ = pattern_->pattern->expand(pattern_->values(), handle_, owner_, database_->arena());
+    own_ = pattern_->pattern->expand(*pattern_, handle_, owner_, database_->arena());
     patterned_ = false;
     pattern_ = nullptr;
 }
@@ -204,18 +204,45 @@ int DbObject::indexOf(int code, std::size_t from) const {
     return TagList::indexOf(tags(), code, from);
 }
 
+bool DbObject::patternedText(int code, std::string_view& value, bool& absent) const {
+    if (!patterned_) return false;
+    switch (pattern_->pattern->find(*pattern_, code, value)) {
+        case TagPattern::Lookup::Found:
+            absent = false;
+            return true;
+        case TagPattern::Lookup::Absent:
+            absent = true;
+            return true;
+        case TagPattern::Lookup::Unknown:
+            break;
+    }
+    return false;
+}
+
 std::string_view DbObject::text(int code, std::string_view fallback) const {
+    // A patterned object answers from its pattern: reading a value leaves it as compact.
+    std::string_view value;
+    bool absent = false;
+    if (patternedText(code, value, absent)) return absent ? fallback : value;
     const int i = indexOf(code);
     return i < 0 ? fallback : tags()[static_cast<std::size_t>(i)].value;
 }
 
 double DbObject::real(int code, double fallback) const {
+    std::string_view value;
+    bool absent = false;
+    if (patternedText(code, value, absent))
+        return absent ? fallback : TagValues::toReal(value, fallback);
     const int i = indexOf(code);
     return i < 0 ? fallback
                  : TagValues::toReal(tags()[static_cast<std::size_t>(i)].value, fallback);
 }
 
 long long DbObject::integer(int code, long long fallback) const {
+    std::string_view value;
+    bool absent = false;
+    if (patternedText(code, value, absent))
+        return absent ? fallback : TagValues::toInteger(value, fallback);
     const int i = indexOf(code);
     return i < 0 ? fallback
                  : TagValues::toInteger(tags()[static_cast<std::size_t>(i)].value, fallback);
@@ -362,6 +389,17 @@ void fitFor(std::vector<Tag>& all, std::size_t more) {
 
 void DbObject::setXData(std::string_view application, std::span<const Tag> items) {
     database_->registerApplication(application);
+    if (patterned_ && pattern_->pattern->takesXData() && pattern_->xdata().empty()) {
+        // The first group stays beside the object's values, in the arena at its size.
+        noteEdit();
+        std::vector<Tag> group;
+        group.reserve(items.size() + 1);
+        group.push_back(Tag{1001, database_->storeShared(application)});
+        for (const Tag& item : items)
+            group.push_back(Tag{item.code, store(item.value)});
+        const_cast<TagPattern::Values*>(pattern_)->setXData(database_->arena().storeTags(group));
+        return;
+    }
     const auto current = tags();
     std::size_t begin = current.size(), end = current.size();
     for (std::size_t i = xdataStart(); i < current.size(); ++i) {

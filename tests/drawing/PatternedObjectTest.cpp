@@ -247,24 +247,37 @@ TEST(TagPatterns, HolesAndIdentityAreFilledInOrder) {
     std::vector<Tag> tags = {Tag{0, "SEQEND"}, Tag{5, TagPattern::handleHole()},
                              Tag{330, TagPattern::ownerHole()}, Tag{8, TagPattern::hole(1)},
                              Tag{62, TagPattern::hole(0)}};
-    const TagPattern pattern(tags);
+    PatternTexts texts;
+    const TagPattern pattern(tags, texts);
     EXPECT_EQ(pattern.holeCount(), 2u);
     EXPECT_EQ(pattern.type(), "SEQEND");
+    EXPECT_FALSE(pattern.takesXData());
     TagPattern::Values* values = pattern.make(db.arena());
-    values->values()[0] = "3";
-    values->values()[1] = "LAYER";
+    EXPECT_EQ(values->values()[0], 0u) << "holes start empty";
+    values->values()[0] = texts.shared(db.store("3"));
+    values->values()[1] = texts.add(db.store("LAYER"));
     std::vector<std::string> visited;
-    pattern.forEach(values->values(), 0x2AF, 0x1F, [&](int code, std::string_view value) {
+    pattern.forEach(*values, 0x2AF, 0x1F, [&](int code, std::string_view value) {
         visited.push_back(std::to_string(code) + " " + std::string(value));
     });
     EXPECT_EQ(visited,
               (std::vector<std::string>{"0 SEQEND", "5 2AF", "330 1F", "8 LAYER", "62 3"}));
-    const std::vector<Tag> whole = pattern.expand(values->values(), 0x2AF, 0x1F, db.arena());
+    const std::vector<Tag> whole = pattern.expand(*values, 0x2AF, 0x1F, db.arena());
     ASSERT_EQ(whole.size(), 5u);
     EXPECT_EQ(whole[1].value, "2AF");
     EXPECT_EQ(whole[4].value, "3");
+    // Values are read without putting the tags together; the handle is not one of them.
+    std::string_view found;
+    EXPECT_EQ(pattern.find(*values, 8, found), TagPattern::Lookup::Found);
+    EXPECT_EQ(found, "LAYER");
+    EXPECT_EQ(pattern.find(*values, 40, found), TagPattern::Lookup::Absent);
+    EXPECT_EQ(pattern.find(*values, 5, found), TagPattern::Lookup::Unknown);
+    EXPECT_TRUE(values->xdata().empty());
+    const Tag group[] = {Tag{1001, "APP"}};
+    EXPECT_THROW(values->setXData(group), std::logic_error) << "no room for extended data";
     // Extended data is no part of a pattern, and holes are counted.
-    EXPECT_THROW(TagPattern(std::vector<Tag>{Tag{0, "X"}, Tag{1001, "APP"}}), std::logic_error);
+    EXPECT_THROW(TagPattern(std::vector<Tag>{Tag{0, "X"}, Tag{1001, "APP"}}, texts),
+                 std::logic_error);
     EXPECT_THROW(TagPattern::hole(TagPattern::kMaxHoles), std::logic_error);
 }
 
