@@ -51,13 +51,13 @@ AttributeLayout::AttributeLayout(Database& target, const Attribute& definition)
     rotated_ = makeVariant(target, definition, true);
     // Values of a definition of another drawing may go with it: its attributes get whole tags.
     if (&definition.database() == &target) {
-        const PatternTexts& texts = target.attributeLayouts().texts();
+        PatternTexts& texts = target.attributeLayouts().texts();
         makePatterns(plain_, texts);
         makePatterns(rotated_, texts);
     }
 }
 
-void AttributeLayout::makePatterns(Variant& variant, const PatternTexts& texts) {
+void AttributeLayout::makePatterns(Variant& variant, PatternTexts& texts) {
     // The handle and owner come from the object; each slot and the value get a hole.
     std::vector<Tag> tags = variant.tags;
     tags[1].value = TagPattern::handleHole();

@@ -93,7 +93,7 @@ private:
     };
     static constexpr std::uint8_t kNoHole = 0xFF;
     Variant makeVariant(Database& target, const Attribute& definition, bool rotated) const;
-    static void makePatterns(Variant& variant, const PatternTexts& texts);
+    static void makePatterns(Variant& variant, PatternTexts& texts);
 
     Point3 position_;
     Point3 alignment_;

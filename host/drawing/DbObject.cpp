@@ -276,6 +276,16 @@ Tag& DbObject::tagForValue(std::size_t index) {
 }
 
 void DbObject::setTagValue(int code, std::string_view value, std::string_view subclass) {
+    if (patterned_) {
+        // A new value for a hole is the object's own: the pattern stays.
+        const TagPattern& pattern = *pattern_->pattern;
+        if (const int hole = pattern.holeOf(code); hole >= 0) {
+            noteEdit();
+            auto* own = const_cast<TagPattern::Values*>(pattern_);
+            own->values()[hole] = pattern.texts().shared(database_->storeShared(value));
+            return;
+        }
+    }
     const int i = indexOf(code);
     const std::string_view stored = store(value);
     if (i >= 0)
@@ -389,15 +399,30 @@ void fitFor(std::vector<Tag>& all, std::size_t more) {
 
 void DbObject::setXData(std::string_view application, std::span<const Tag> items) {
     database_->registerApplication(application);
-    if (patterned_ && pattern_->pattern->takesXData() && pattern_->xdata().empty()) {
-        // The first group stays beside the object's values, in the arena at its size.
+    if (patterned_ && pattern_->pattern->takesXData()) {
+        // The groups stay beside the object's values, in the arena at their size: the
+        // application's first group replaced where it is, or a new one at the end.
         noteEdit();
-        std::vector<Tag> group;
-        group.reserve(items.size() + 1);
-        group.push_back(Tag{1001, database_->storeShared(application)});
+        const std::span<const Tag> current = pattern_->xdata();
+        std::size_t begin = current.size(), end = current.size();
+        for (std::size_t i = 0; i < current.size(); ++i) {
+            if (current[i].code == 1001 && TagValues::sameName(current[i].value, application)) {
+                begin = i;
+                end = i + 1;
+                while (end < current.size() && current[end].code != 1001)
+                    ++end;
+                break;
+            }
+        }
+        std::vector<Tag> all;
+        all.reserve(current.size() - (end - begin) + items.size() + 1);
+        all.insert(all.end(), current.begin(),
+                   current.begin() + static_cast<std::ptrdiff_t>(begin));
+        all.push_back(Tag{1001, database_->storeShared(application)});
         for (const Tag& item : items)
-            group.push_back(Tag{item.code, store(item.value)});
-        const_cast<TagPattern::Values*>(pattern_)->setXData(database_->arena().storeTags(group));
+            all.push_back(Tag{item.code, store(item.value)});
+        all.insert(all.end(), current.begin() + static_cast<std::ptrdiff_t>(end), current.end());
+        const_cast<TagPattern::Values*>(pattern_)->setXData(database_->arena().storeTags(all));
         return;
     }
     const auto current = tags();

@@ -25,7 +25,7 @@ std::string_view TagPattern::ownerHole() {
     return {kHoleText + kMaxHoles + 1, 1};
 }
 
-TagPattern::TagPattern(std::span<const Tag> tags, const PatternTexts& texts, bool takesXData)
+TagPattern::TagPattern(std::span<const Tag> tags, PatternTexts& texts, bool takesXData)
     : texts_(&texts), takesXData_(takesXData) {
     items_.reserve(tags.size());
     for (const Tag& tag : tags) {
@@ -108,6 +108,13 @@ TagPattern::Lookup TagPattern::find(const Values& values, int code, std::string_
         }
     }
     return Lookup::Absent;
+}
+
+int TagPattern::holeOf(int code) const {
+    if (groups_) return -1;
+    for (std::size_t i = 1; i < items_.size(); ++i)
+        if (items_[i].code == code) return items_[i].kind == Kind::Hole ? items_[i].hole : -1;
+    return -1;
 }
 
 std::string_view TagPattern::hexText(std::uint64_t value, char (&buffer)[20]) {

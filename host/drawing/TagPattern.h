@@ -28,13 +28,13 @@ public:
     // outlive the pattern); no extended data. With `takesXData`, an object made from the
     // pattern keeps one group of extended data given later beside its values (other
     // patterns' objects get theirs as a change).
-    TagPattern(std::span<const Tag> tags, const PatternTexts& texts, bool takesXData = false);
+    TagPattern(std::span<const Tag> tags, PatternTexts& texts, bool takesXData = false);
 
     std::string_view type() const { return items_.empty() ? std::string_view() : items_[0].value; }
     std::size_t holeCount() const { return holes_; }
     std::size_t tagCount() const { return items_.size(); }
     bool takesXData() const { return takesXData_; }
-    const PatternTexts& texts() const { return *texts_; }
+    PatternTexts& texts() const { return *texts_; }
 
     // What an object made from a pattern keeps, in the arena: the pattern, then the number
     // of each hole's value in the pattern's texts, then, for a pattern that takes extended
@@ -85,6 +85,8 @@ public:
     // handle and owner and when the pattern has application groups.
     enum class Lookup { Unknown, Absent, Found };
     Lookup find(const Values& values, int code, std::string_view& value) const;
+    // The hole of the first tag with the code, as find finds it; -1 when that tag is none.
+    int holeOf(int code) const;
 
 private:
     enum class Kind : std::uint8_t { Fixed, Hole, Handle, Owner };
@@ -102,7 +104,7 @@ private:
 
     std::vector<Item> items_;
     std::size_t holes_ = 0;
-    const PatternTexts* texts_;
+    PatternTexts* texts_;
     bool takesXData_ = false;
     bool groups_ = false;
 };
