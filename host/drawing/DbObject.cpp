@@ -41,14 +41,15 @@ std::span<const Tag> DbObject::tags() const {
         // pattern and values say, once.
         if (patterned_) [[unlikely]]
             const_cast<DbObject*>(this)->expand();
-        return own_;
+        return *own_;
     }
     return {fileTags_, fileCount_};
 }
 
 void DbObject::expand() {
     if (!patterned_) return;
-    own_ = pattern_->pattern->expand(*pattern_, handle_, owner_, database_->arena());
+    own_ = std::make_unique<std::vector<Tag>>(
+        pattern_->pattern->expand(*pattern_, handle_, owner_, database_->arena()));
     patterned_ = false;
     pattern_ = nullptr;
 }
@@ -70,19 +71,20 @@ std::vector<Tag>& DbObject::editTags(std::size_t more) {
     expand();
     if (!owned_) {
         // Copied once at the size the change needs, not copied and then grown.
-        own_.reserve(fileCount_ + more);
-        own_.assign(fileTags_, fileTags_ + fileCount_);
+        own_ = std::make_unique<std::vector<Tag>>();
+        own_->reserve(fileCount_ + more);
+        own_->assign(fileTags_, fileTags_ + fileCount_);
         owned_ = true;
         fileTags_ = nullptr;
         fileCount_ = 0;
     }
-    return own_;
+    return *own_;
 }
 
 void DbObject::takeTags(std::vector<Tag> tags) {
     noteEdit();
     patterned_ = false;
-    own_ = std::move(tags);
+    own_ = std::make_unique<std::vector<Tag>>(std::move(tags));
     owned_ = true;
     fileTags_ = nullptr;
     fileCount_ = 0;
@@ -272,7 +274,7 @@ Tag& DbObject::tagForValue(std::size_t index) {
     expand();
     // The tags outside own_ are this object's alone (its range of the file's tag list or of
     // the arena), so a value changes there without a copy of the list.
-    return owned_ ? own_[index] : const_cast<Tag*>(fileTags_)[index];
+    return owned_ ? (*own_)[index] : const_cast<Tag*>(fileTags_)[index];
 }
 
 void DbObject::setTagValue(int code, std::string_view value, std::string_view subclass) {

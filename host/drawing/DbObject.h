@@ -10,6 +10,7 @@
 #include "TagPattern.h"
 
 #include <cstdint>
+#include <memory>
 #include <span>
 #include <string>
 #include <string_view>
@@ -154,7 +155,9 @@ private:
     bool erased_ = false;
     bool patterned_ = false;
     mutable bool watched_ = false;
-    std::vector<Tag> own_;
+    // Held apart: most objects keep their tags in a file's list or the arena, and an empty
+    // list here would cost every one of them its room.
+    std::unique_ptr<std::vector<Tag>> own_;
     std::uint64_t handle_ = 0;
     std::uint64_t owner_ = 0;
 };
