@@ -68,7 +68,12 @@ std::vector<Tag>& DbObject::editTags() {
 
 std::vector<Tag>& DbObject::editTags(std::size_t more) {
     noteEdit();
-    expand();
+    if (patterned_) {
+        // Put together at its size, then given the room the change asks for: a list
+        // doubled for one more tag would keep its spare room for the rest of the run.
+        expand();
+        if (more) own_->reserve(own_->size() + more);
+    }
     if (!owned_) {
         // Copied once at the size the change needs, not copied and then grown.
         own_ = std::make_unique<std::vector<Tag>>();
@@ -287,13 +292,20 @@ void DbObject::setTagValue(int code, std::string_view value, std::string_view su
             own->values()[hole] = pattern.texts().shared(database_->storeShared(value));
             return;
         }
+        // A tag it lacks: put together once, with room for it.
+        std::string_view found;
+        bool absent = false;
+        if (patternedText(code, found, absent) && absent) {
+            TagList::setValue(editTags(1), code, store(value), subclass);
+            return;
+        }
     }
     const int i = indexOf(code);
     const std::string_view stored = store(value);
     if (i >= 0)
         tagForValue(static_cast<std::size_t>(i)).value = stored;
     else
-        TagList::setValue(editTags(), code, stored, subclass);
+        TagList::setValue(editTags(1), code, stored, subclass);
 }
 
 void DbObject::setText(int code, std::string_view value, std::string_view subclass) {
@@ -319,7 +331,7 @@ void DbObject::setPoint(int code, const Point3& p, std::string_view subclass, bo
     for (std::size_t axis = 1; whole && axis < axes; ++axis)
         whole = all[static_cast<std::size_t>(i) + axis].code == code + 10 * static_cast<int>(axis);
     if (!whole) {
-        TagList::setPoint(editTags(), code, values, subclass, withZ);
+        TagList::setPoint(editTags(axes), code, values, subclass, withZ);
         return;
     }
     for (std::size_t axis = 0; axis < axes; ++axis)

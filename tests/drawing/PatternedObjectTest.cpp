@@ -442,6 +442,8 @@ TEST(PatternedReferences, ReadEditedSavedAndLoadedTheyEqualTheirWholeTags) {
     EXPECT_TRUE(made[1]->isPatterned());
     EXPECT_TRUE(made[0]->attributes()[0]->isPatterned());
     EXPECT_FALSE(made[2]->isPatterned());
+    EXPECT_EQ(made[2]->editTags().capacity(), made[2]->tags().size())
+        << "put together with room for the one tag, not doubled for it";
     // The application's record gone, saving names it again from the values.
     db.table("APPID")->find("ZV_OTHER_TEST")->erase();
     db.table("APPID")->reindex();
