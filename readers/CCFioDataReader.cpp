@@ -327,6 +327,10 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
         lugares = 0;
         for (const auto& trecho : trechos)
             lugares = std::max(lugares, trecho.first->campos.size());
+        // The wire's stretches are complete: their spare room goes back now, not after the
+        // whole walk, so the room of every stretch read is not held at once.
+        for (CEItemLista* trecho = item; trecho; trecho = trecho->ligado)
+            PartilhaNomes(*trecho);
         // The first stretch stands behind the later ones; the writer sorts.
         itens->push_back(item);
     }

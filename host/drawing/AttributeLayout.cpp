@@ -51,12 +51,13 @@ AttributeLayout::AttributeLayout(Database& target, const Attribute& definition)
     rotated_ = makeVariant(target, definition, true);
     // Values of a definition of another drawing may go with it: its attributes get whole tags.
     if (&definition.database() == &target) {
-        makePatterns(plain_);
-        makePatterns(rotated_);
+        PatternTexts& texts = target.attributeLayouts().texts();
+        makePatterns(plain_, texts);
+        makePatterns(rotated_, texts);
     }
 }
 
-void AttributeLayout::makePatterns(Variant& variant) {
+void AttributeLayout::makePatterns(Variant& variant, PatternTexts& texts) {
     // The handle and owner come from the object; each slot and the value get a hole.
     std::vector<Tag> tags = variant.tags;
     tags[1].value = TagPattern::handleHole();
@@ -69,10 +70,10 @@ void AttributeLayout::makePatterns(Variant& variant) {
         variant.holes[slot] = static_cast<std::uint8_t>(next);
         tags[at].value = TagPattern::hole(next++);
     }
-    variant.patterns[0] = std::make_unique<TagPattern>(tags);
+    variant.patterns[0] = std::make_unique<TagPattern>(tags, texts);
     // The paper space flag goes right after the entity's subclass marker.
     tags.insert(tags.begin() + 4, Tag{67, "1"});
-    variant.patterns[1] = std::make_unique<TagPattern>(tags);
+    variant.patterns[1] = std::make_unique<TagPattern>(tags, texts);
 }
 
 AttributeLayout::Variant AttributeLayout::makeVariant(Database& target, const Attribute& definition,
@@ -162,15 +163,18 @@ TagPattern::Values* AttributeLayout::composeValues(
     const TagPattern* pattern = variant.patterns[placement.paperSpace ? 1 : 0].get();
     if (!pattern || (value && variant.value == kNone)) return nullptr;
     TagPattern::Values* made = pattern->make(target.arena());
-    std::string_view* holes = made->values();
+    std::uint32_t* holes = made->values();
     AttributeLayouts& reals = target.attributeLayouts();
+    PatternTexts& texts = reals.texts();
     const auto put = [&](int slot, double number) {
         const std::uint8_t hole = variant.holes[static_cast<std::size_t>(slot)];
-        if (hole != kNoHole) holes[hole] = reals.real(target, number);
+        if (hole != kNoHole) holes[hole] = texts.shared(reals.real(target, number));
     };
     placeNumbers(placement, rotated, variant.holes[AlignX] != kNoHole, put);
+    // Short values come back from row to row (a section, a colour, a length): kept once.
     if (const std::uint8_t hole = variant.holes[SlotCount]; hole != kNoHole)
-        holes[hole] = value ? target.store(*value) : variant.tags[variant.value].value;
+        holes[hole] =
+            texts.shared(value ? target.storeShared(*value) : variant.tags[variant.value].value);
     return made;
 }
 
@@ -230,7 +234,31 @@ const TagPattern& AttributeLayouts::seqendPattern(bool paperSpace) {
                                  Tag{330, TagPattern::ownerHole()}, Tag{100, "AcDbEntity"}};
         if (paperSpace) tags.push_back(Tag{67, "1"});
         tags.push_back(Tag{8, TagPattern::hole(0)});
-        made = std::make_unique<TagPattern>(tags);
+        made = std::make_unique<TagPattern>(tags, texts_);
+    }
+    return *made;
+}
+
+const TagPattern& AttributeLayouts::referencePattern(const ReferenceShape& shape) {
+    const unsigned key = (shape.paperSpace ? 1u : 0u) | (shape.scaled[0] ? 2u : 0u) |
+                         (shape.scaled[1] ? 4u : 0u) | (shape.scaled[2] ? 8u : 0u) |
+                         (shape.rotated ? 16u : 0u) | (shape.attributesFollow ? 32u : 0u);
+    std::unique_ptr<TagPattern>& made = references_[key];
+    if (!made) {
+        std::size_t hole = 0;
+        std::vector<Tag> tags = {Tag{0, "INSERT"}, Tag{5, TagPattern::handleHole()},
+                                 Tag{330, TagPattern::ownerHole()}, Tag{100, "AcDbEntity"}};
+        if (shape.paperSpace) tags.push_back(Tag{67, "1"});
+        tags.push_back(Tag{8, TagPattern::hole(hole++)});
+        tags.push_back(Tag{100, "AcDbBlockReference"});
+        for (const int code : {2, 10, 20, 30})
+            tags.push_back(Tag{static_cast<std::int16_t>(code), TagPattern::hole(hole++)});
+        for (int axis = 0; axis < 3; ++axis)
+            if (shape.scaled[axis])
+                tags.push_back(Tag{static_cast<std::int16_t>(41 + axis), TagPattern::hole(hole++)});
+        if (shape.rotated) tags.push_back(Tag{50, TagPattern::hole(hole++)});
+        if (shape.attributesFollow) tags.push_back(Tag{66, "1"});
+        made = std::make_unique<TagPattern>(tags, texts_, true);
     }
     return *made;
 }

@@ -93,7 +93,7 @@ private:
     };
     static constexpr std::uint8_t kNoHole = 0xFF;
     Variant makeVariant(Database& target, const Attribute& definition, bool rotated) const;
-    static void makePatterns(Variant& variant);
+    static void makePatterns(Variant& variant, PatternTexts& texts);
 
     Point3 position_;
     Point3 alignment_;
@@ -127,13 +127,29 @@ public:
     std::string_view real(Database& target, double value);
     // The SEQEND that closes a reference's attributes: its layer is the one hole.
     const TagPattern& seqendPattern(bool paperSpace);
+    // A new reference's tags as Database::addBlockReference makes them, for references in
+    // paper space or not, with or without each scale and the rotation, and marked or not
+    // for attributes: holes for the layer, block name, position and the scales and rotation
+    // it has, and room for one group of extended data.
+    struct ReferenceShape {
+        bool paperSpace = false;
+        bool scaled[3] = {false, false, false};
+        bool rotated = false;
+        bool attributesFollow = false;
+    };
+    const TagPattern& referencePattern(const ReferenceShape& shape);
+    // The values of the holes of every pattern here.
+    PatternTexts& texts() { return texts_; }
 
 private:
+    // First: the patterns below read it until they go.
+    PatternTexts texts_;
     std::unordered_map<const DbObject*, std::unique_ptr<AttributeLayout>> byDefinition_;
     // Layouts given up: attributes made from their patterns still point to them.
     std::vector<std::unique_ptr<AttributeLayout>> retired_;
     std::unique_ptr<AttributeLayout> foreign_;
     std::unique_ptr<TagPattern> seqends_[2];
+    std::unique_ptr<TagPattern> references_[64];
     struct BlockPlan {
         std::size_t entities = 0;
         Point3 basePoint;

@@ -421,38 +421,33 @@ BlockReference* Database::addBlockReference(BlockRecord& owner, const BlockRecor
                                             const Point3& position, const Point3& scale,
                                             double rotationDegrees, std::string_view layer,
                                             bool attributesFollow) {
-    // The tags that making an INSERT through its builder gives, put straight in place: the
-    // coordinates' texts are shared with the attributes placed by them.
-    AttributeLayouts& reals = attributeLayouts();
+    // The tags that making an INSERT through its builder gives, kept as a pattern of
+    // references alike and the reference's own values: the coordinates' texts are shared
+    // with the attributes placed by them.
+    AttributeLayouts& layouts = attributeLayouts();
+    PatternTexts& texts = layouts.texts();
     const std::uint64_t handle = allocateHandle();
-    const bool paper = owner.isPaperSpace();
-    const std::size_t count = 10 + (paper ? 1 : 0) + (scale.x != 1.0 ? 1 : 0) +
-                              (scale.y != 1.0 ? 1 : 0) + (scale.z != 1.0 ? 1 : 0) +
-                              (rotationDegrees != 0.0 ? 1 : 0);
-    std::vector<Tag> tags;
-    // The mark that attributes follow takes its room from what the setters get, as before.
-    tags.reserve(count + kSettersSlack);
-    tags.push_back(Tag{0, "INSERT"});
-    tags.push_back(Tag{5, handleText(arena_, handle)});
-    tags.push_back(Tag{330, handleText(arena_, owner.handle())});
-    tags.push_back(Tag{100, "AcDbEntity"});
-    if (paper) tags.push_back(Tag{67, "1"});
-    tags.push_back(Tag{8, layer.empty() ? std::string_view("0") : storeShared(layer)});
-    tags.push_back(Tag{100, "AcDbBlockReference"});
+    AttributeLayouts::ReferenceShape shape;
+    shape.paperSpace = owner.isPaperSpace();
+    shape.scaled[0] = scale.x != 1.0;
+    shape.scaled[1] = scale.y != 1.0;
+    shape.scaled[2] = scale.z != 1.0;
+    shape.rotated = rotationDegrees != 0.0;
+    shape.attributesFollow = attributesFollow;
+    TagPattern::Values* own = layouts.referencePattern(shape).make(arena_);
+    std::uint32_t* hole = own->values();
+    *hole++ = texts.shared(layer.empty() ? std::string_view("0") : storeShared(layer));
     const std::string_view name = block.name();
-    tags.push_back(Tag{2, &block.database() == this ? name : store(name)});
-    tags.push_back(Tag{10, reals.real(*this, position.x)});
-    tags.push_back(Tag{20, reals.real(*this, position.y)});
-    tags.push_back(Tag{30, reals.real(*this, position.z)});
-    if (scale.x != 1.0) tags.push_back(Tag{41, reals.real(*this, scale.x)});
-    if (scale.y != 1.0) tags.push_back(Tag{42, reals.real(*this, scale.y)});
-    if (scale.z != 1.0) tags.push_back(Tag{43, reals.real(*this, scale.z)});
-    if (rotationDegrees != 0.0) tags.push_back(Tag{50, reals.real(*this, rotationDegrees)});
-    if (attributesFollow) tags.push_back(Tag{66, "1"});
-    auto reference =
-        std::make_unique<BlockReference>(*this, std::span<const Tag>(), handle, owner.handle());
-    reference->own_ = std::move(tags);
-    reference->owned_ = true;
+    *hole++ = texts.shared(&block.database() == this ? name : storeShared(name));
+    const auto real = [&](double value) { return texts.shared(layouts.real(*this, value)); };
+    *hole++ = real(position.x);
+    *hole++ = real(position.y);
+    *hole++ = real(position.z);
+    if (shape.scaled[0]) *hole++ = real(scale.x);
+    if (shape.scaled[1]) *hole++ = real(scale.y);
+    if (shape.scaled[2]) *hole++ = real(scale.z);
+    if (shape.rotated) *hole++ = real(rotationDegrees);
+    auto reference = std::make_unique<BlockReference>(*this, *own, handle, owner.handle());
     auto* made = static_cast<BlockReference*>(adopt(std::move(reference)));
     owner.appendEntity(made);
     return made;
@@ -533,7 +528,8 @@ Attribute* Database::addAttributeFromLayout(BlockReference& reference, Attribute
             const std::string_view layer = reference.layer();
             TagPattern::Values* own =
                 attributeLayouts().seqendPattern(where.paperSpace).make(arena_);
-            own->values()[0] = layer.empty() ? std::string_view("0") : layer;
+            own->values()[0] =
+                attributeLayouts().texts().shared(layer.empty() ? std::string_view("0") : layer);
             reference.setSeqend(static_cast<Entity*>(
                 adopt(std::make_unique<Entity>(*this, *own, seqend, reference.handle()))));
         }

@@ -10,7 +10,7 @@
 namespace zvdb {
 
 // A drawing holds millions of objects: a flag more must not make each one bigger.
-static_assert(sizeof(DbObject) <= 72, "DbObject grew");
+static_assert(sizeof(DbObject) <= 56, "DbObject grew");
 
 DbObject::DbObject(Database& database, std::span<const Tag> tags)
     : database_(&database),
@@ -44,14 +44,15 @@ std::span<const Tag> DbObject::tags() const {
         // pattern and values say, once.
         if (patterned_) [[unlikely]]
             const_cast<DbObject*>(this)->expand();
-        return own_;
+        return *own_;
     }
     return {fileTags_, fileCount_};
 }
 
 void DbObject::expand() {
     if (!patterned_) return;
-    own_ = pattern_->pattern->expand(pattern_->values(), handle_, owner_, database_->arena());
+    own_ = std::make_unique<std::vector<Tag>>(
+        pattern_->pattern->expand(*pattern_, handle_, owner_, database_->arena()));
     patterned_ = false;
     pattern_ = nullptr;
 }
@@ -73,22 +74,28 @@ std::vector<Tag>& DbObject::editTags() {
 
 std::vector<Tag>& DbObject::editTags(std::size_t more) {
     noteEdit();
-    expand();
+    if (patterned_) {
+        // Put together at its size, then given the room the change asks for: a list
+        // doubled for one more tag would keep its spare room for the rest of the run.
+        expand();
+        if (more) own_->reserve(own_->size() + more);
+    }
     if (!owned_) {
         // Copied once at the size the change needs, not copied and then grown.
-        own_.reserve(fileCount_ + more);
-        own_.assign(fileTags_, fileTags_ + fileCount_);
+        own_ = std::make_unique<std::vector<Tag>>();
+        own_->reserve(fileCount_ + more);
+        own_->assign(fileTags_, fileTags_ + fileCount_);
         owned_ = true;
         fileTags_ = nullptr;
         fileCount_ = 0;
     }
-    return own_;
+    return *own_;
 }
 
 void DbObject::takeTags(std::vector<Tag> tags) {
     noteEdit();
     patterned_ = false;
-    own_ = std::move(tags);
+    own_ = std::make_unique<std::vector<Tag>>(std::move(tags));
     owned_ = true;
     fileTags_ = nullptr;
     fileCount_ = 0;
@@ -210,18 +217,45 @@ int DbObject::indexOf(int code, std::size_t from) const {
     return TagList::indexOf(tags(), code, from);
 }
 
+bool DbObject::patternedText(int code, std::string_view& value, bool& absent) const {
+    if (!patterned_) return false;
+    switch (pattern_->pattern->find(*pattern_, code, value)) {
+        case TagPattern::Lookup::Found:
+            absent = false;
+            return true;
+        case TagPattern::Lookup::Absent:
+            absent = true;
+            return true;
+        case TagPattern::Lookup::Unknown:
+            break;
+    }
+    return false;
+}
+
 std::string_view DbObject::text(int code, std::string_view fallback) const {
+    // A patterned object answers from its pattern: reading a value leaves it as compact.
+    std::string_view value;
+    bool absent = false;
+    if (patternedText(code, value, absent)) return absent ? fallback : value;
     const int i = indexOf(code);
     return i < 0 ? fallback : tags()[static_cast<std::size_t>(i)].value;
 }
 
 double DbObject::real(int code, double fallback) const {
+    std::string_view value;
+    bool absent = false;
+    if (patternedText(code, value, absent))
+        return absent ? fallback : TagValues::toReal(value, fallback);
     const int i = indexOf(code);
     return i < 0 ? fallback
                  : TagValues::toReal(tags()[static_cast<std::size_t>(i)].value, fallback);
 }
 
 long long DbObject::integer(int code, long long fallback) const {
+    std::string_view value;
+    bool absent = false;
+    if (patternedText(code, value, absent))
+        return absent ? fallback : TagValues::toInteger(value, fallback);
     const int i = indexOf(code);
     return i < 0 ? fallback
                  : TagValues::toInteger(tags()[static_cast<std::size_t>(i)].value, fallback);
@@ -251,16 +285,33 @@ Tag& DbObject::tagForValue(std::size_t index) {
     expand();
     // The tags outside own_ are this object's alone (its range of the file's tag list or of
     // the arena), so a value changes there without a copy of the list.
-    return owned_ ? own_[index] : const_cast<Tag*>(fileTags_)[index];
+    return owned_ ? (*own_)[index] : const_cast<Tag*>(fileTags_)[index];
 }
 
 void DbObject::setTagValue(int code, std::string_view value, std::string_view subclass) {
+    if (patterned_) {
+        // A new value for a hole is the object's own: the pattern stays.
+        const TagPattern& pattern = *pattern_->pattern;
+        if (const int hole = pattern.holeOf(code); hole >= 0) {
+            noteEdit();
+            auto* own = const_cast<TagPattern::Values*>(pattern_);
+            own->values()[hole] = pattern.texts().shared(database_->storeShared(value));
+            return;
+        }
+        // A tag it lacks: put together once, with room for it.
+        std::string_view found;
+        bool absent = false;
+        if (patternedText(code, found, absent) && absent) {
+            TagList::setValue(editTags(1), code, store(value), subclass);
+            return;
+        }
+    }
     const int i = indexOf(code);
     const std::string_view stored = store(value);
     if (i >= 0)
         tagForValue(static_cast<std::size_t>(i)).value = stored;
     else
-        TagList::setValue(editTags(), code, stored, subclass);
+        TagList::setValue(editTags(1), code, stored, subclass);
 }
 
 void DbObject::setText(int code, std::string_view value, std::string_view subclass) {
@@ -286,7 +337,7 @@ void DbObject::setPoint(int code, const Point3& p, std::string_view subclass, bo
     for (std::size_t axis = 1; whole && axis < axes; ++axis)
         whole = all[static_cast<std::size_t>(i) + axis].code == code + 10 * static_cast<int>(axis);
     if (!whole) {
-        TagList::setPoint(editTags(), code, values, subclass, withZ);
+        TagList::setPoint(editTags(axes), code, values, subclass, withZ);
         return;
     }
     for (std::size_t axis = 0; axis < axes; ++axis)
@@ -368,6 +419,32 @@ void fitFor(std::vector<Tag>& all, std::size_t more) {
 
 void DbObject::setXData(std::string_view application, std::span<const Tag> items) {
     database_->registerApplication(application);
+    if (patterned_ && pattern_->pattern->takesXData()) {
+        // The groups stay beside the object's values, in the arena at their size: the
+        // application's first group replaced where it is, or a new one at the end.
+        noteEdit();
+        const std::span<const Tag> current = pattern_->xdata();
+        std::size_t begin = current.size(), end = current.size();
+        for (std::size_t i = 0; i < current.size(); ++i) {
+            if (current[i].code == 1001 && TagValues::sameName(current[i].value, application)) {
+                begin = i;
+                end = i + 1;
+                while (end < current.size() && current[end].code != 1001)
+                    ++end;
+                break;
+            }
+        }
+        std::vector<Tag> all;
+        all.reserve(current.size() - (end - begin) + items.size() + 1);
+        all.insert(all.end(), current.begin(),
+                   current.begin() + static_cast<std::ptrdiff_t>(begin));
+        all.push_back(Tag{1001, database_->storeShared(application)});
+        for (const Tag& item : items)
+            all.push_back(Tag{item.code, store(item.value)});
+        all.insert(all.end(), current.begin() + static_cast<std::ptrdiff_t>(end), current.end());
+        const_cast<TagPattern::Values*>(pattern_)->setXData(database_->arena().storeTags(all));
+        return;
+    }
     const auto current = tags();
     std::size_t begin = current.size(), end = current.size();
     for (std::size_t i = xdataStart(); i < current.size(); ++i) {

@@ -10,6 +10,7 @@
 #include "TagPattern.h"
 
 #include <cstdint>
+#include <memory>
 #include <span>
 #include <string>
 #include <string_view>
@@ -50,11 +51,15 @@ public:
     // Whether the tags are still only a pattern's and the object's own values (then
     // forEachTag gives them without putting them together).
     bool isPatterned() const { return patterned_; }
+    // The extended data a patterned object keeps beside its values (none for others).
+    std::span<const Tag> patternedXData() const {
+        return patterned_ ? pattern_->xdata() : std::span<const Tag>();
+    }
     // Each tag in order, as tags() would give them.
     template <class Visit>
     void forEachTag(Visit&& visit) const {
         if (patterned_) {
-            pattern_->pattern->forEach(pattern_->values(), handle_, owner_, visit);
+            pattern_->pattern->forEach(*pattern_, handle_, owner_, visit);
             return;
         }
         for (const Tag& tag : tags())
@@ -136,6 +141,9 @@ private:
     // The tag at `index`, to take a new value where it is.
     Tag& tagForValue(std::size_t index);
     void cacheIdentity();
+    // The value of a patterned object's tag without putting its tags together: found
+    // (true, `value` set; empty when the tag is absent and `absent` is set) or not known.
+    bool patternedText(int code, std::string_view& value, bool& absent) const;
     // Puts a patterned object's tags together; they are its own from then on.
     void expand();
     void noteEdit();
@@ -152,7 +160,9 @@ private:
     bool patterned_ : 1 = false;
     mutable bool watched_ : 1 = false;
     bool layerRecord_ : 1 = false;
-    std::vector<Tag> own_;
+    // Held apart: most objects keep their tags in a file's list or the arena, and an empty
+    // list here would cost every one of them its room.
+    std::unique_ptr<std::vector<Tag>> own_;
     std::uint64_t handle_ = 0;
     std::uint64_t owner_ = 0;
 };

@@ -45,8 +45,14 @@ void DxfWriter::prepare() {
     std::unordered_set<std::string> seen;
     std::vector<std::string> apps;
     for (const auto& object : db_.storage_) {
-        // A patterned object has no extended data (adding some puts its tags together).
-        if (object->isErased() || object->isPatterned()) continue;
+        if (object->isErased()) continue;
+        // A patterned object keeps at most the group beside its values.
+        if (object->isPatterned()) {
+            for (const Tag& item : object->patternedXData())
+                if (item.code == 1001 && seen.insert(std::string(item.value)).second)
+                    apps.emplace_back(item.value);
+            continue;
+        }
         const auto tags = object->tags();
         for (std::size_t i = 1; i < tags.size(); ++i) {
             if (tags[i].code != 1001 || object->isType("XRECORD")) continue;

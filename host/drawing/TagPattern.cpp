@@ -25,7 +25,8 @@ std::string_view TagPattern::ownerHole() {
     return {kHoleText + kMaxHoles + 1, 1};
 }
 
-TagPattern::TagPattern(std::span<const Tag> tags) {
+TagPattern::TagPattern(std::span<const Tag> tags, PatternTexts& texts, bool takesXData)
+    : texts_(&texts), takesXData_(takesXData) {
     items_.reserve(tags.size());
     for (const Tag& tag : tags) {
         if (tag.code >= 1000 || tag.code == kRemovedTag)
@@ -45,17 +46,75 @@ TagPattern::TagPattern(std::span<const Tag> tags) {
             }
             item.value = {};
         }
+        if (tag.code == 102) groups_ = true;
         items_.push_back(item);
     }
 }
 
+namespace {
+// A group of extended data kept beside an object's numbers.
+struct XDataRoom {
+    const Tag* tags = nullptr;
+    std::size_t count = 0;
+};
+}  // namespace
+
+std::size_t TagPattern::xdataOffset() const {
+    return (sizeof(Values) + holes_ * sizeof(std::uint32_t) + 7) & ~std::size_t(7);
+}
+
 TagPattern::Values* TagPattern::make(StringArena& arena) const {
-    void* room = arena.allocate(sizeof(Values) + holes_ * sizeof(std::string_view));
+    const std::size_t size = takesXData_ ? xdataOffset() + sizeof(XDataRoom)
+                                         : sizeof(Values) + holes_ * sizeof(std::uint32_t);
+    void* room = arena.allocate(size);
     auto* made = new (room) Values{this};
-    std::string_view* values = made->values();
+    std::uint32_t* values = made->values();
     for (std::size_t i = 0; i < holes_; ++i)
-        new (values + i) std::string_view();
+        values[i] = 0;
+    if (takesXData_) new (static_cast<char*>(room) + xdataOffset()) XDataRoom();
     return made;
+}
+
+std::span<const Tag> TagPattern::Values::xdata() const {
+    if (!pattern->takesXData_) return {};
+    const auto* room = reinterpret_cast<const XDataRoom*>(reinterpret_cast<const char*>(this) +
+                                                          pattern->xdataOffset());
+    return {room->tags, room->count};
+}
+
+void TagPattern::Values::setXData(std::span<const Tag> tags) {
+    if (!pattern->takesXData_) throw std::logic_error("the pattern takes no extended data");
+    auto* room =
+        reinterpret_cast<XDataRoom*>(reinterpret_cast<char*>(this) + pattern->xdataOffset());
+    *room = XDataRoom{tags.data(), tags.size()};
+}
+
+TagPattern::Lookup TagPattern::find(const Values& values, int code, std::string_view& value) const {
+    if (groups_) return Lookup::Unknown;
+    // As DbObject::indexOf looks: after the type.
+    for (std::size_t i = 1; i < items_.size(); ++i) {
+        const Item& item = items_[i];
+        if (item.code != code) continue;
+        switch (item.kind) {
+            case Kind::Fixed:
+                value = item.value;
+                return Lookup::Found;
+            case Kind::Hole:
+                value = (*texts_)[values.values()[item.hole]];
+                return Lookup::Found;
+            case Kind::Handle:
+            case Kind::Owner:
+                return Lookup::Unknown;
+        }
+    }
+    return Lookup::Absent;
+}
+
+int TagPattern::holeOf(int code) const {
+    if (groups_) return -1;
+    for (std::size_t i = 1; i < items_.size(); ++i)
+        if (items_[i].code == code) return items_[i].kind == Kind::Hole ? items_[i].hole : -1;
+    return -1;
 }
 
 std::string_view TagPattern::hexText(std::uint64_t value, char (&buffer)[20]) {
@@ -67,17 +126,19 @@ std::string_view TagPattern::hexText(std::uint64_t value, char (&buffer)[20]) {
     return {buffer + at, sizeof buffer - at};
 }
 
-std::vector<Tag> TagPattern::expand(const std::string_view* values, std::uint64_t handle,
-                                    std::uint64_t owner, StringArena& arena) const {
+std::vector<Tag> TagPattern::expand(const Values& values, std::uint64_t handle, std::uint64_t owner,
+                                    StringArena& arena) const {
+    const std::uint32_t* numbers = values.values();
+    const std::span<const Tag> xdata = values.xdata();
     std::vector<Tag> tags;
-    tags.reserve(items_.size());
+    tags.reserve(items_.size() + xdata.size());
     for (const Item& item : items_) {
         switch (item.kind) {
             case Kind::Fixed:
                 tags.push_back(Tag{item.code, item.value});
                 break;
             case Kind::Hole:
-                tags.push_back(Tag{item.code, values[item.hole]});
+                tags.push_back(Tag{item.code, (*texts_)[numbers[item.hole]]});
                 break;
             case Kind::Handle:
             case Kind::Owner: {
@@ -89,6 +150,7 @@ std::vector<Tag> TagPattern::expand(const std::string_view* values, std::uint64_
             }
         }
     }
+    tags.insert(tags.end(), xdata.begin(), xdata.end());
     return tags;
 }
 

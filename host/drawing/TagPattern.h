@@ -3,6 +3,7 @@
 // the SEQENDs of one space), with holes where each object's own values go. An object made
 // from a pattern keeps only its hole values; its tags are put together when they are asked
 // for or changed, and the writer writes them straight from the pattern.
+#include "PatternTexts.h"
 #include "StringArena.h"
 #include "Tag.h"
 
@@ -23,22 +24,30 @@ public:
     static std::string_view handleHole();
     static std::string_view ownerHole();
 
-    // `tags` with hole marks for values; no extended data (a pattern's objects get theirs
-    // as a change).
-    explicit TagPattern(std::span<const Tag> tags);
+    // `tags` with hole marks for values, the values being numbers of `texts` (which must
+    // outlive the pattern); no extended data. With `takesXData`, an object made from the
+    // pattern keeps one group of extended data given later beside its values (other
+    // patterns' objects get theirs as a change).
+    TagPattern(std::span<const Tag> tags, PatternTexts& texts, bool takesXData = false);
 
     std::string_view type() const { return items_.empty() ? std::string_view() : items_[0].value; }
     std::size_t holeCount() const { return holes_; }
     std::size_t tagCount() const { return items_.size(); }
+    bool takesXData() const { return takesXData_; }
+    PatternTexts& texts() const { return *texts_; }
 
-    // What an object made from a pattern keeps, in the arena: the pattern, then a value for
-    // each hole.
+    // What an object made from a pattern keeps, in the arena: the pattern, then the number
+    // of each hole's value in the pattern's texts, then, for a pattern that takes extended
+    // data, the object's group of it.
     struct Values {
         const TagPattern* pattern;
-        std::string_view* values() { return reinterpret_cast<std::string_view*>(this + 1); }
-        const std::string_view* values() const {
-            return reinterpret_cast<const std::string_view*>(this + 1);
+        std::uint32_t* values() { return reinterpret_cast<std::uint32_t*>(this + 1); }
+        const std::uint32_t* values() const {
+            return reinterpret_cast<const std::uint32_t*>(this + 1);
         }
+        // The extended data (1001 first); empty when none or when the pattern takes none.
+        std::span<const Tag> xdata() const;
+        void setXData(std::span<const Tag> tags);
     };
     // Room for an object's values, every hole empty until the caller fills it in.
     Values* make(StringArena& arena) const;
@@ -46,15 +55,16 @@ public:
     // Each tag with its holes filled, in order. Handle and owner text is made on the spot
     // and lives for the call only.
     template <class Visit>
-    void forEach(const std::string_view* values, std::uint64_t handle, std::uint64_t owner,
+    void forEach(const Values& values, std::uint64_t handle, std::uint64_t owner,
                  Visit&& visit) const {
+        const std::uint32_t* numbers = values.values();
         for (const Item& item : items_) {
             switch (item.kind) {
                 case Kind::Fixed:
                     visit(item.code, item.value);
                     break;
                 case Kind::Hole:
-                    visit(item.code, values[item.hole]);
+                    visit(item.code, (*texts_)[numbers[item.hole]]);
                     break;
                 case Kind::Handle:
                 case Kind::Owner: {
@@ -64,10 +74,19 @@ public:
                 }
             }
         }
+        for (const Tag& tag : values.xdata())
+            visit(tag.code, tag.value);
     }
     // The whole tag list, the handle and owner text kept by the arena.
-    std::vector<Tag> expand(const std::string_view* values, std::uint64_t handle,
-                            std::uint64_t owner, StringArena& arena) const;
+    std::vector<Tag> expand(const Values& values, std::uint64_t handle, std::uint64_t owner,
+                            StringArena& arena) const;
+    // The value of the first tag with the code before the extended data (as
+    // DbObject::indexOf finds it), without putting the tags together. Unknown for the
+    // handle and owner and when the pattern has application groups.
+    enum class Lookup { Unknown, Absent, Found };
+    Lookup find(const Values& values, int code, std::string_view& value) const;
+    // The hole of the first tag with the code, as find finds it; -1 when that tag is none.
+    int holeOf(int code) const;
 
 private:
     enum class Kind : std::uint8_t { Fixed, Hole, Handle, Owner };
@@ -80,8 +99,14 @@ private:
     // Upper-case hexadecimal, as handles are written.
     static std::string_view hexText(std::uint64_t value, char (&buffer)[20]);
 
+    // Where a Values' extended data is kept, after its numbers.
+    std::size_t xdataOffset() const;
+
     std::vector<Item> items_;
     std::size_t holes_ = 0;
+    PatternTexts* texts_;
+    bool takesXData_ = false;
+    bool groups_ = false;
 };
 
 }  // namespace zvdb

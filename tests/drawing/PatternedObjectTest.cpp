@@ -8,6 +8,7 @@
 #include "drawing/Database.h"
 #include "drawing/DxfLoader.h"
 #include "drawing/DxfWriter.h"
+#include "drawing/PatternTexts.h"
 #include "drawing/SymbolTable.h"
 #include "drawing/TagPattern.h"
 #include "drawing/TagValues.h"
@@ -85,6 +86,7 @@ void fill(Database& db, BlockRecord& block) {
 void expandAll(Database& db) {
     for (BlockRecord* owner : {db.modelSpace(), db.paperSpace()})
         for (Entity* entity : owner->entities()) {
+            (void)entity->tags();
             for (Entity* sub : entity->subEntities())
                 (void)sub->tags();
             if (entity->seqend()) (void)entity->seqend()->tags();
@@ -247,24 +249,37 @@ TEST(TagPatterns, HolesAndIdentityAreFilledInOrder) {
     std::vector<Tag> tags = {Tag{0, "SEQEND"}, Tag{5, TagPattern::handleHole()},
                              Tag{330, TagPattern::ownerHole()}, Tag{8, TagPattern::hole(1)},
                              Tag{62, TagPattern::hole(0)}};
-    const TagPattern pattern(tags);
+    PatternTexts texts;
+    const TagPattern pattern(tags, texts);
     EXPECT_EQ(pattern.holeCount(), 2u);
     EXPECT_EQ(pattern.type(), "SEQEND");
+    EXPECT_FALSE(pattern.takesXData());
     TagPattern::Values* values = pattern.make(db.arena());
-    values->values()[0] = "3";
-    values->values()[1] = "LAYER";
+    EXPECT_EQ(values->values()[0], 0u) << "holes start empty";
+    values->values()[0] = texts.shared(db.store("3"));
+    values->values()[1] = texts.add(db.store("LAYER"));
     std::vector<std::string> visited;
-    pattern.forEach(values->values(), 0x2AF, 0x1F, [&](int code, std::string_view value) {
+    pattern.forEach(*values, 0x2AF, 0x1F, [&](int code, std::string_view value) {
         visited.push_back(std::to_string(code) + " " + std::string(value));
     });
     EXPECT_EQ(visited,
               (std::vector<std::string>{"0 SEQEND", "5 2AF", "330 1F", "8 LAYER", "62 3"}));
-    const std::vector<Tag> whole = pattern.expand(values->values(), 0x2AF, 0x1F, db.arena());
+    const std::vector<Tag> whole = pattern.expand(*values, 0x2AF, 0x1F, db.arena());
     ASSERT_EQ(whole.size(), 5u);
     EXPECT_EQ(whole[1].value, "2AF");
     EXPECT_EQ(whole[4].value, "3");
+    // Values are read without putting the tags together; the handle is not one of them.
+    std::string_view found;
+    EXPECT_EQ(pattern.find(*values, 8, found), TagPattern::Lookup::Found);
+    EXPECT_EQ(found, "LAYER");
+    EXPECT_EQ(pattern.find(*values, 40, found), TagPattern::Lookup::Absent);
+    EXPECT_EQ(pattern.find(*values, 5, found), TagPattern::Lookup::Unknown);
+    EXPECT_TRUE(values->xdata().empty());
+    const Tag group[] = {Tag{1001, "APP"}};
+    EXPECT_THROW(values->setXData(group), std::logic_error) << "no room for extended data";
     // Extended data is no part of a pattern, and holes are counted.
-    EXPECT_THROW(TagPattern(std::vector<Tag>{Tag{0, "X"}, Tag{1001, "APP"}}), std::logic_error);
+    EXPECT_THROW(TagPattern(std::vector<Tag>{Tag{0, "X"}, Tag{1001, "APP"}}, texts),
+                 std::logic_error);
     EXPECT_THROW(TagPattern::hole(TagPattern::kMaxHoles), std::logic_error);
 }
 
@@ -349,4 +364,144 @@ TEST(ExtendedDataOnFileObjects, AnApplicationIsRegisteredOnceAndAgainAfterItsRec
     db.swapContents(other);
     EXPECT_TRUE(db.registerApplication("ZV_APP"));
     EXPECT_FALSE(other.registerApplication("ZV_OTHER"));
+}
+
+namespace {
+
+// The tags a new reference has when made whole, one by one.
+std::vector<std::string> wholeReference(const BlockReference& reference, const BlockRecord& owner,
+                                        const Point3& at, const Point3& scale, double degrees) {
+    std::vector<std::string> all = {"0 INSERT", "5 " + TagValues::fromHandle(reference.handle()),
+                                    "330 " + TagValues::fromHandle(owner.handle()),
+                                    "100 AcDbEntity"};
+    if (owner.isPaperSpace()) all.push_back("67 1");
+    all.push_back("8 PAGE");
+    all.push_back("100 AcDbBlockReference");
+    all.push_back("2 AMOSTRA");
+    all.push_back("10 " + TagValues::fromReal(at.x));
+    all.push_back("20 " + TagValues::fromReal(at.y));
+    all.push_back("30 " + TagValues::fromReal(at.z));
+    if (scale.x != 1.0) all.push_back("41 " + TagValues::fromReal(scale.x));
+    if (scale.y != 1.0) all.push_back("42 " + TagValues::fromReal(scale.y));
+    if (scale.z != 1.0) all.push_back("43 " + TagValues::fromReal(scale.z));
+    if (degrees != 0.0) all.push_back("50 " + TagValues::fromReal(degrees));
+    all.push_back("66 1");
+    return all;
+}
+
+}  // namespace
+
+TEST(PatternedReferences, ReadEditedSavedAndLoadedTheyEqualTheirWholeTags) {
+    Database db;
+    BlockRecord* block = sampleBlock(db);
+    struct Case {
+        bool paper;
+        Point3 at, scale;
+        double degrees;
+    };
+    const Case cases[] = {{false, {3, 4, 0}, {1, 1, 1}, 0},
+                          {false, {-1.5, 2.25, 1}, {2, 0.5, 3}, 30},
+                          {true, {7, 8, 0}, {1, 1, 1}, 90}};
+    std::vector<BlockReference*> made;
+    for (const Case& c : cases) {
+        BlockRecord* owner = c.paper ? db.paperSpace() : db.modelSpace();
+        BlockReference* reference =
+            db.addBlockReference(*owner, *block, c.at, c.scale, c.degrees, "PAGE", true);
+        const auto layouts = db.attributeLayouts().variableLayouts(db, *block);
+        const std::vector<std::optional<std::string_view>> values = {"v"};
+        reference->addAttributesFromLayouts(block->basePoint(), c.at, c.scale, c.degrees, layouts,
+                                            values);
+        ASSERT_TRUE(reference->isPatterned());
+        // What the writers and the attributes ask of it is answered from its values.
+        EXPECT_EQ(reference->blockName(), "AMOSTRA");
+        EXPECT_EQ(reference->layer(), "PAGE");
+        EXPECT_EQ(reference->integer(66), 1);
+        EXPECT_EQ(reference->inPaperSpace(), c.paper);
+        EXPECT_EQ(reference->rotation(), c.degrees);
+        EXPECT_EQ(reference->real(41, 1.0), c.scale.x);
+        EXPECT_EQ(reference->color(), 256) << "absent: the fallback";
+        EXPECT_EQ(reference->attribute("TAG")->textValue(), "v");
+        EXPECT_TRUE(reference->isPatterned());
+        EXPECT_TRUE(reference->attributes()[0]->isPatterned());
+        made.push_back(reference);
+    }
+
+    // Extended data stays beside the values: a group, a second one, the first replaced.
+    const Tag link[] = {Tag{1000, "2A"}};
+    const Tag other[] = {Tag{1000, "x"}, Tag{1070, "3"}};
+    const Tag again[] = {Tag{1000, "2B"}};
+    made[0]->setXData("ZV_LINK_TEST", link);
+    made[1]->setXData("ZV_LINK_TEST", link);
+    made[1]->setXData("ZV_OTHER_TEST", other);
+    made[1]->setXData("ZV_LINK_TEST", again);
+    // A value given later to a hole keeps the object patterned; a tag it lacks does not.
+    made[0]->attributes()[0]->setTextValue("changed");
+    made[1]->setRotation(45);
+    made[2]->setColor(3);
+    EXPECT_TRUE(made[0]->isPatterned());
+    EXPECT_TRUE(made[1]->isPatterned());
+    EXPECT_TRUE(made[0]->attributes()[0]->isPatterned());
+    EXPECT_FALSE(made[2]->isPatterned());
+    EXPECT_EQ(made[2]->editTags().capacity(), made[2]->tags().size())
+        << "put together with room for the one tag, not doubled for it";
+    // The application's record gone, saving names it again from the values.
+    db.table("APPID")->find("ZV_OTHER_TEST")->erase();
+    db.table("APPID")->reindex();
+
+    const std::string patterned = DxfWriter::toText(db);
+    EXPECT_TRUE(made[1]->isPatterned()) << "writing puts no tags together";
+    std::vector<std::vector<std::string>> expected;
+    for (std::size_t i = 0; i < made.size(); ++i) {
+        const Case& c = cases[i];
+        BlockRecord* owner = c.paper ? db.paperSpace() : db.modelSpace();
+        std::vector<std::string> whole =
+            wholeReference(*made[i], *owner, c.at, c.scale, i == 1 ? 45.0 : c.degrees);
+        if (i == 0) whole.insert(whole.end(), {"1001 ZV_LINK_TEST", "1000 2A"});
+        if (i == 1)
+            whole.insert(whole.end(), {"1001 ZV_LINK_TEST", "1000 2B", "1001 ZV_OTHER_TEST",
+                                       "1000 x", "1070 3"});
+        if (i == 2) whole.insert(whole.begin() + 6, "62 3");
+        EXPECT_EQ(lines(*made[i]), whole) << i;
+        expected.push_back(whole);
+    }
+    EXPECT_EQ(made[0]->attributes()[0]->textValue(), "changed");
+    expandAll(db);
+    EXPECT_FALSE(made[1]->isPatterned());
+    EXPECT_EQ(DxfWriter::toText(db), patterned) << "the same file either way";
+
+    auto copy = DxfLoader::load(patterned);
+    EXPECT_NE(copy->table("APPID")->find("ZV_OTHER_TEST"), nullptr);
+    for (std::size_t i = 0; i < made.size(); ++i) {
+        auto* read = dynamic_cast<BlockReference*>(copy->entityByHandle(made[i]->handle()));
+        ASSERT_NE(read, nullptr);
+        EXPECT_EQ(lines(*read), expected[i]);
+        EXPECT_EQ(read->attributes().size(), 4u);
+    }
+    auto* first = dynamic_cast<BlockReference*>(copy->entityByHandle(made[0]->handle()));
+    EXPECT_EQ(first->attribute("TAG")->textValue(), "changed");
+    EXPECT_EQ(first->xdata("ZV_LINK_TEST").at(0).value, "2A");
+}
+
+TEST(PatternTexts, SharedViewsKeepOneNumberAndOwnValuesGetTheirs) {
+    Database db;
+    PatternTexts texts;
+    EXPECT_EQ(texts[0], "");
+    EXPECT_EQ(texts.add({}), 0u) << "the empty value is number 0";
+    const std::string_view kept = db.store("12.5");
+    const std::uint32_t number = texts.shared(kept);
+    EXPECT_EQ(texts.shared(kept), number);
+    EXPECT_EQ(texts[number], "12.5");
+    // The same text elsewhere is another value to the table, and numbers never move.
+    const std::uint32_t elsewhere = texts.shared(db.store("12.5"));
+    EXPECT_NE(elsewhere, number);
+    std::vector<std::uint32_t> numbers;
+    std::vector<std::string> values;
+    for (int i = 0; i < 10000; ++i) {
+        values.push_back(std::to_string(i) + "v");
+        numbers.push_back(texts.add(db.store(values.back())));
+    }
+    for (std::size_t i = 0; i < numbers.size(); ++i)
+        ASSERT_EQ(texts[numbers[i]], values[i]);
+    EXPECT_EQ(texts[number], "12.5");
+    EXPECT_EQ(texts.size(), 10003u);
 }
