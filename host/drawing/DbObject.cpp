@@ -6,6 +6,7 @@
 #include "TagValues.h"
 
 #include <algorithm>
+#include <utility>
 
 namespace zvdb {
 
@@ -415,6 +416,20 @@ namespace {
 void fitFor(std::vector<Tag>& all, std::size_t more) {
     if (all.size() + more > all.capacity()) all.reserve(all.size() + more);
 }
+
+// Where the application's extended-data group lies among the tags (searched from `from`):
+// [begin, end), or an empty range at the end when it has none.
+std::pair<std::size_t, std::size_t> applicationGroup(std::span<const Tag> tags, std::size_t from,
+                                                     std::string_view application) {
+    for (std::size_t i = from; i < tags.size(); ++i) {
+        if (tags[i].code != 1001 || !TagValues::sameName(tags[i].value, application)) continue;
+        std::size_t end = i + 1;
+        while (end < tags.size() && tags[end].code != 1001)
+            ++end;
+        return {i, end};
+    }
+    return {tags.size(), tags.size()};
+}
 }  // namespace
 
 void DbObject::setXData(std::string_view application, std::span<const Tag> items) {
@@ -424,16 +439,7 @@ void DbObject::setXData(std::string_view application, std::span<const Tag> items
         // application's first group replaced where it is, or a new one at the end.
         noteEdit();
         const std::span<const Tag> current = pattern_->xdata();
-        std::size_t begin = current.size(), end = current.size();
-        for (std::size_t i = 0; i < current.size(); ++i) {
-            if (current[i].code == 1001 && TagValues::sameName(current[i].value, application)) {
-                begin = i;
-                end = i + 1;
-                while (end < current.size() && current[end].code != 1001)
-                    ++end;
-                break;
-            }
-        }
+        const auto [begin, end] = applicationGroup(current, 0, application);
         std::vector<Tag> all;
         all.reserve(current.size() - (end - begin) + items.size() + 1);
         all.insert(all.end(), current.begin(),
@@ -446,16 +452,7 @@ void DbObject::setXData(std::string_view application, std::span<const Tag> items
         return;
     }
     const auto current = tags();
-    std::size_t begin = current.size(), end = current.size();
-    for (std::size_t i = xdataStart(); i < current.size(); ++i) {
-        if (current[i].code == 1001 && TagValues::sameName(current[i].value, application)) {
-            begin = i;
-            end = i + 1;
-            while (end < current.size() && current[end].code != 1001)
-                ++end;
-            break;
-        }
-    }
+    const auto [begin, end] = applicationGroup(current, xdataStart(), application);
     // A file object's tags are copied once, at the size they will have.
     const std::size_t after = current.size() - (end - begin) + items.size() + 1;
     auto& all = editTags(after > current.size() ? after - current.size() : 0);
