@@ -334,8 +334,6 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
         // The first stretch stands behind the later ones; the writer sorts.
         itens->push_back(item);
     }
-    for (CEItemLista* item : *itens)
-        PartilhaNomes(*item);
     Define(progresso, 100);
     return itens;
 }
