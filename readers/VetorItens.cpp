@@ -9,6 +9,17 @@
 void VetorItens::juntarSemRepetir(const VetorItens& origem) {
     // Most accessories have none of their own: no set of what is here for nothing.
     if (origem.empty()) return;
+    // Readers hand over items made once each: one sorted array of every pointer shows that
+    // nothing repeats, and the batch goes in whole without a node per item.
+    std::vector<const CEItemLista*> todos;
+    todos.reserve(size() + origem.size());
+    todos.insert(todos.end(), begin(), end());
+    todos.insert(todos.end(), origem.begin(), origem.end());
+    std::sort(todos.begin(), todos.end());
+    if (std::adjacent_find(todos.begin(), todos.end()) == todos.end()) {
+        insert(end(), origem.begin(), origem.end());
+        return;
+    }
     std::unordered_set<const CEItemLista*> presentes(begin(), end());
     for (CEItemLista* item : origem)
         if (presentes.insert(item).second) push_back(item);

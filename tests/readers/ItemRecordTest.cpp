@@ -453,6 +453,18 @@ TEST(VectorTest, MergeKeepsPointersOnceInOrder) {
     EXPECT_EQ(destino, VetorItens({a, b, c}));
     destino.juntarSemRepetir(origem);
     EXPECT_EQ(destino, VetorItens({a, b, c}));
+    // A batch with nothing in common goes in whole and in its order; one repeat among many
+    // is still dropped.
+    CEItemLista* d = itens.novo({{"N", "d"}});
+    CEItemLista* e = itens.novo({{"N", "e"}});
+    destino.juntarSemRepetir(VetorItens{e, d});
+    EXPECT_EQ(destino, VetorItens({a, b, c, e, d}));
+    CEItemLista* f = itens.novo({{"N", "f"}});
+    destino.juntarSemRepetir(VetorItens{f, c});
+    EXPECT_EQ(destino, VetorItens({a, b, c, e, d, f}));
+    VetorItens repetidoAqui{a, a};
+    repetidoAqui.juntarSemRepetir(VetorItens{f});
+    EXPECT_EQ(repetidoAqui, VetorItens({a, a, f}));
 }
 
 TEST(VectorTest, InsertRemoveReverse) {
