@@ -4,9 +4,10 @@
 // its wall time, processor time (program and system) and peak resident memory come from
 // wait4. Huge pages stay off unless ZV_HUGE_PAGES is set, so that the figures show how the
 // program itself scales. The table at the end holds every figure and a PASS or FAIL line
-// against the goals: a list within 3 times open-and-save at every size, its peak memory at
-// the largest size within 1.4 times open-and-save's, and the largest/smallest wall time
-// ratio under 4.5 for sizes 4 times apart (scaled for other sizes).
+// against the goals: a list within 3 times open-and-save at every size, the terminal list's
+// peak memory at the largest size within 1.4 times open-and-save's, and the largest/smallest
+// wall time ratio under 4.5 for sizes 4 times apart (scaled for other sizes). `--commands`
+// takes some of the commands only.
 //
 // The machine may be shared: the processor time is printed next to the wall time, and the
 // ratios are given for both. Each pair (open-and-save, then the list) runs `--runs` times
@@ -123,16 +124,33 @@ int main(int argc, char** argv) {
     if (opcao >= 0) {
         vezes = opcao + 1 < sizes.size() ? sizes[opcao + 1].toInt() : 0;
         if (vezes < 1) {
-            std::fprintf(stderr, "usage: bench_terminal_list [--runs N] [SIZE...]\n");
+            std::fprintf(stderr,
+                         "usage: bench_terminal_list [--runs N] [--commands A,B] [SIZE...]\n");
             return 2;
         }
         sizes.erase(sizes.begin() + opcao, sizes.begin() + opcao + 2);
     }
-    if (sizes.isEmpty()) sizes = QStringList{"20000", "80000"};
-    // Every list command the module has today; the others join as they land.
+    // Every list command the module has today, or those named after --commands.
     // The wire list measures along the generated projects' layout routes.
-    const QStringList comandos{"gerarListaBornesGrf", "gerarListaFiosGrf", "gerarListaMateriaisGrf",
-                               "gerarListaCabosGrf", "gerarListaBornesDwg"};
+    QStringList comandos{"gerarListaBornesGrf", "gerarListaFiosGrf", "gerarListaMateriaisGrf",
+                         "gerarListaCabosGrf", "gerarListaBornesDwg"};
+    if (const int escolha = int(sizes.indexOf("--commands")); escolha >= 0) {
+        const QStringList nomes = escolha + 1 < sizes.size()
+                                      ? sizes[escolha + 1].split(',', Qt::SkipEmptyParts)
+                                      : QStringList();
+        if (nomes.isEmpty() || std::any_of(nomes.begin(), nomes.end(), [&](const QString& n) {
+                return !comandos.contains(n);
+            })) {
+            std::fprintf(stderr,
+                         "usage: bench_terminal_list [--runs N] [--commands A,B] [SIZE...]\n"
+                         "commands: %s\n",
+                         qPrintable(comandos.join(',')));
+            return 2;
+        }
+        comandos = nomes;
+        sizes.erase(sizes.begin() + escolha, sizes.begin() + escolha + 2);
+    }
+    if (sizes.isEmpty()) sizes = QStringList{"20000", "80000"};
     QTemporaryDir folder;
     const QString data = folder.filePath("data"), product = folder.filePath("product") + "/";
     QDir().mkpath(data);
@@ -210,7 +228,9 @@ int main(int argc, char** argv) {
             if (!maior || l.terminais > maior->terminais) maior = &l;
         }
         if (!maior) continue;
-        if (maior->lista.rssGb > 1.4 * maior->base.rssGb) passa = false;
+        // The memory goal is the terminal list's; the others' ratios are in the table.
+        if (comando == "gerarListaBornesGrf" && maior->lista.rssGb > 1.4 * maior->base.rssGb)
+            passa = false;
         if (menor != maior) {
             // Linear growth plus 12.5%: 4.5 for sizes 4 times apart.
             const double escala = double(maior->terminais) / menor->terminais;
@@ -223,8 +243,8 @@ int main(int argc, char** argv) {
         }
     }
     std::printf(
-        "%s: every list within 3x open+save, peak memory at the largest size within "
-        "1.4x, size ratio within 1.125x linear\n",
+        "%s: every list within 3x open+save, the terminal list's peak memory at the largest "
+        "size within 1.4x, size ratio within 1.125x linear\n",
         passa ? "PASS" : "FAIL");
     return 0;
 }
