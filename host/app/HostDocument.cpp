@@ -16,7 +16,38 @@ HostDocument::HostDocument(Application& app, const QString& fileName,
                            std::unique_ptr<zvdb::Database> database)
     : app_(app), fileName_(fileName), database_(std::move(database)) {}
 
-HostDocument::~HostDocument() = default;
+HostDocument::~HostDocument() {
+    if (database_) database_->beforeShapeChange(nullptr);
+}
+
+const HostDocument::View& HostDocument::view() {
+    settleView();
+    return view_;
+}
+
+void HostDocument::setView(const View& view) {
+    extentsOf_.reset();
+    view_ = view;
+}
+
+void HostDocument::showExtents() {
+    zvdb::Database* db = database();
+    if (!db) return;
+    extentsOf_ = plotIndex().showingLayers();
+    db->beforeShapeChange([this] { settleView(); });
+}
+
+void HostDocument::settleView() {
+    if (!extentsOf_) return;
+    // No shape changed since the zoom made or checked the index, so it still holds; an index
+    // made again here, in the middle of a change (a handle taken, its object not yet in
+    // model space), would pass for the drawing after the change.
+    const zvplot::PageIndex& index = plotIndex_ ? *plotIndex_ : plotIndex();
+    zvdb::BoundingBox box = index.boundsOf(*extentsOf_);
+    extentsOf_.reset();
+    if (box.isEmpty()) box = zvdb::BoundingBox{{0, 0, 0}, {1, 1, 0}};
+    view_ = {box.min.x, box.min.y, box.max.x, box.max.y};
+}
 
 void HostDocument::addCommand(const QString& name, zvsdk::CommandHandler handler) {
     commands_.insert(name.toUpper(), {name, std::move(handler)});

@@ -5,6 +5,9 @@
 #include <QHash>
 
 #include <memory>
+#include <optional>
+#include <string>
+#include <vector>
 
 namespace zvdb {
 class UndoJournal;
@@ -52,10 +55,14 @@ public:
     struct View {
         double minX = 0.0, minY = 0.0, maxX = 1.0, maxY = 1.0;
     };
-    const View& view() const { return view_; }
+    const View& view();
     // Model space by layer for plotting, made again when entities were added or erased.
     const zvplot::PageIndex& plotIndex();
-    void setView(const View& view) { view_ = view; }
+    void setView(const View& view);
+    // The view of what shows now (the layers neither frozen nor off). It is measured when
+    // first read, or just before the drawing's shapes change, whichever comes first: a
+    // program that shows page after page and reads none of them measures none.
+    void showExtents();
 
     // Undo is kept only where a user can ask for it (the desktop); a host that runs its
     // commands once and exits leaves it off and pays nothing for the brackets.
@@ -82,7 +89,12 @@ private:
     QHash<QString, Command> commands_;
     int commandsStarted_ = 0;
     zvsdk::CommandResult result_ = zvsdk::CommandResult::Succeeded;
+    // Puts the extents showExtents asked for into view_.
+    void settleView();
+
     View view_;
+    // The layers that showed when extents were asked for and not yet measured.
+    std::optional<std::vector<std::string>> extentsOf_;
     std::unique_ptr<zvplot::PageIndex> plotIndex_;
     std::unique_ptr<zvdb::UndoJournal> undo_;
 };

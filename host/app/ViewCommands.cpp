@@ -4,7 +4,6 @@
 #include "HostDocument.h"
 #include "drawing/BlockRecord.h"
 #include "drawing/Database.h"
-#include "plot/PageIndex.h"
 
 #include <QStringList>
 
@@ -34,10 +33,7 @@ bool zoomWindow(HostDocument& document, const QStringList& corners) {
 bool zoomExtents(HostDocument& document) {
     zvdb::Database* db = document.database();
     if (!db || !db->modelSpace()) return false;
-    // The index by layer keeps this to the entities of the layers that show.
-    zvdb::BoundingBox box = document.plotIndex().visibleBounds();
-    if (box.isEmpty()) box = zvdb::BoundingBox{{0, 0, 0}, {1, 1, 0}};
-    document.setView({box.min.x, box.min.y, box.max.x, box.max.y});
+    document.showExtents();
     return true;
 }
 

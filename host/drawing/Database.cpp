@@ -59,8 +59,17 @@ std::uint64_t nextChange() {
 }  // namespace
 
 void Database::noteChange() {
+    shapeAboutToChange();
     changes_ = nextChange();
     shapes_ = changes_;
+}
+
+void Database::shapeAboutToChange() {
+    if (!beforeShapeChange_) return;
+    // Taken out first: what the hook reads must not run it again.
+    const std::function<void()> hook = std::move(beforeShapeChange_);
+    beforeShapeChange_ = nullptr;
+    hook();
 }
 
 void Database::noteLayerEdit(const DbObject& record) {
@@ -75,6 +84,8 @@ void Database::noteLayerEdit(const DbObject& record) {
 }
 
 void Database::swapContents(Database& other) {
+    shapeAboutToChange();
+    other.shapeAboutToChange();
     std::swap(arena_, other.arena_);
     shared_.swap(other.shared_);
     header_.swap(other.header_);
@@ -106,8 +117,8 @@ void Database::swapContents(Database& other) {
 
 DbObject* Database::adopt(std::unique_ptr<DbObject> object) {
     DbObject* raw = object.get();
-    storage_.push_back(std::move(object));
     noteChange();
+    storage_.push_back(std::move(object));
     if (raw->handle() != 0) {
         byHandle_.emplace(raw->handle(), raw);
         noteHandle(raw->handle());

@@ -14,6 +14,7 @@
 #include "Tag.h"
 
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <optional>
 #include <span>
@@ -73,6 +74,11 @@ public:
     // again, under another epoch, when it grows long or the contents are swapped.
     const std::vector<const DbObject*>& layerEdits() const { return layerEdits_; }
     std::uint64_t layerEditsEpoch() const { return layerEditsEpoch_; }
+    // Runs `hook` once, just before the next change that moves shapeCount (an object added,
+    // edited or erased, contents swapped), on the drawing as it still is; another call
+    // replaces it, an empty one takes it back. Work put off until it is needed (the view a
+    // zoom asked for) is done there when the drawing would change under it.
+    void beforeShapeChange(std::function<void()> hook) { beforeShapeChange_ = std::move(hook); }
     // Trades the whole content with another database, this object staying where it is:
     // what holds a Database& goes on working and sees the other drawing (undo, reload).
     void swapContents(Database& other);
@@ -185,6 +191,7 @@ private:
     std::uint64_t allocateHandle() { return nextHandle_++; }
     void noteHandle(std::uint64_t handle);
     void noteChange();
+    void shapeAboutToChange();
     void noteLayerEdit(const DbObject& record);
     void forgetLayout(const DbObject& definition);
     void forgetBlock(BlockRecord& record);
@@ -222,6 +229,7 @@ private:
     std::uint64_t shapes_ = 0;
     std::vector<const DbObject*> layerEdits_;
     std::uint64_t layerEditsEpoch_ = 0;
+    std::function<void()> beforeShapeChange_;
     // Bounds of block definitions Extents worked out, by block handle and nesting depth;
     // good while the change count is `boundsAt_`.
     struct BoundsKey {

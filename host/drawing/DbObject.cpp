@@ -557,11 +557,12 @@ void DbObject::addReactor(std::uint64_t handle) {
 }
 
 void DbObject::markErased() {
-    erased_ = true;
+    // Noted before the mark: what waits for the next change still sees the object.
     if (layerRecord_)
         database_->noteLayerEdit(*this);
     else
         database_->noteChange();
+    erased_ = true;
 }
 
 void DbObject::erase() {

@@ -76,7 +76,10 @@ std::vector<zvdb::Entity*> PageIndex::visibleEntities() const {
 }
 
 zvdb::BoundingBox PageIndex::visibleBounds() const {
-    const std::vector<std::string> layers = showingLayers();
+    return boundsOf(showingLayers());
+}
+
+zvdb::BoundingBox PageIndex::boundsOf(const std::vector<std::string>& layers) const {
     std::string key;
     for (const std::string& name : layers)
         key.append(name).push_back('\0');

@@ -33,6 +33,11 @@ public:
     // layers again: each set of showing layers is measured once while the drawing's
     // entities and blocks stay as they are.
     zvdb::BoundingBox visibleBounds() const;
+    // The same for the entities on these layers, given in the order showingLayers gives
+    // them (the order keys the measures kept).
+    zvdb::BoundingBox boundsOf(const std::vector<std::string>& layers) const;
+    // The names of the layers that hold entities and are neither frozen nor off.
+    std::vector<std::string> showingLayers() const;
     // Still a true picture of this drawing: nothing was added since (what was erased is left
     // out as the index is read).
     bool matches(const zvdb::Database& database) const;
@@ -52,7 +57,6 @@ private:
     void readLayerStates() const;
     void setShows(std::unordered_map<std::string, Layer>::iterator layer, bool shows) const;
     bool layerShows(const std::string& name) const;
-    std::vector<std::string> showingLayers() const;
 
     const zvdb::Database* database_;
     std::uint64_t handleSeed_ = 0;
