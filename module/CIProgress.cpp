@@ -11,6 +11,7 @@ constexpr qint64 kAbreSozinhaMs = 2000;
 constexpr qint64 kTempoMinimoMs = 3000;
 constexpr int kEsperaMs = 50;
 constexpr int kEventosPorPasso = 100;
+constexpr qint64 kIntervaloEventosMs = 20;
 
 zvsdk::UserInterface* Interface() {
     zvsdk::SystemServices* servicos = zvsdk::systemServices();
@@ -42,7 +43,9 @@ void CIProgress::Definir(int percentual, const QString& texto) {
     zvsdk::UserInterface* ui = Interface();
     if (!ui) return;
     ui->setProgress(percentual, texto.isEmpty() ? titulo_ : titulo_ + " ( " + texto + " )");
+    if (eventos_.isValid() && eventos_.elapsed() < kIntervaloEventosMs) return;
     ui->processEvents(kEventosPorPasso);
+    eventos_.start();
 }
 
 void CIProgress::Fechar() {

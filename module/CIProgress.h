@@ -12,8 +12,9 @@ public:
     CIProgress& operator=(const CIProgress&) = delete;
 
     void Mostrar();
-    // Stores the percent; an open window shows "title ( text )" and lets the host handle
-    // at most 100 pending events.
+    // Stores the percent; an open window shows "title ( text )" and, at most every 20 ms,
+    // lets the host handle up to 100 pending events (a reader that steps once per entity
+    // would spend more on the host's event loop than on its entities).
     void Definir(int percentual, const QString& texto = QString());
     // Pumps pending events and closes; a window open less than three seconds after its
     // creation waits 50 ms once, so a fast run does not just flicker.
@@ -30,6 +31,7 @@ public:
 private:
     QString titulo_;
     QElapsedTimer criacao_;
+    QElapsedTimer eventos_;  // since the host last handled events for this window
     int percentual_ = 0;
     bool aberta_ = false;
     bool cancelado_ = false;
