@@ -842,7 +842,10 @@ CEItemLista* CCDataReader::CriaItemFio(const OdDbObjectId& polilinha, CETemplate
     if (ChaveDaEntidade(polilinha).isEmpty()) return nullptr;
     auto* item = new CEItemLista;
     item->ids.push_back(polilinha);
-    LeFio(QString(), *item, polilinha, &modelo);
+    if (FiosDasLeituras && GuardaFios && CICad::EhPolilinha(polilinha))
+        CopiaEntidade(QString(), *item, polilinha, &modelo);
+    else
+        LeFio(QString(), *item, polilinha, &modelo);
     LerLadoIni(*item, polilinha, modelo);
     LerLadoFim(*item, polilinha, modelo);
     return item;

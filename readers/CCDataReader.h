@@ -153,6 +153,9 @@ protected:
     // The same for terminals (blocks BORNE... and BOR-...): a reader that reads every terminal
     // as an item before any side seldom meets one again as a neighbour.
     bool GuardaBornes = true;
+    // CriaItemFio takes the wire's fields from its kept reading: set by a reader that copies
+    // the same polylines again as the ends of its items (the bill of materials).
+    bool FiosDasLeituras = false;
     CECacheCatalogo& Catalogo() { return catalogo_; }
     // An item kept for the list shares its field names with the items kept before it.
     void PartilhaNomes(CEItemLista& item) { item.partilharNomes(); }

@@ -13,6 +13,8 @@
 
 class CCMaterialDataReader : public CCDataReader {
 public:
+    // Each wire's first polyline is read for its item and copied again as its first end.
+    CCMaterialDataReader() { FiosDasLeituras = true; }
     // Nothing on sides: a material has no connections of its own.
     void LerLadoIni(CEItemLista& item, const OdDbObjectId& entidade, CETemplate& modelo) override;
     void LerLadoFim(CEItemLista& item, const OdDbObjectId& entidade, CETemplate& modelo) override;

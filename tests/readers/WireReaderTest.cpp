@@ -99,6 +99,48 @@ TEST_F(WireReaderTest, AWireTouchingNothingIsOneItemWithoutEnds) {
     EXPECT_FALSE(item.temCampo("COMPRIMENTO"));
 }
 
+// A reader that makes wire items from the kept readings, as the bill of materials does.
+class LeitorDasLeituras : public CCFioDataReader {
+public:
+    LeitorDasLeituras() { FiosDasLeituras = true; }
+};
+
+TEST_F(WireReaderTest, AWireItemFromTheKeptReadingEqualsOneReadApart) {
+    const zvdb::Polyline* simples = fio({{200, 200, 0}, {250, 200, 0}}, "30");
+    zvdb::Polyline* comQtd = fio({{200, 100, 0}, {250, 100, 0}}, "31");
+    comQtd->setXData("KVR_ZV_WIRE",
+                     zvsample::XDataItems().text("10006\f1").text("1").text("QTD\f4").tags());
+    // Without its second item the polyline is no complete wire.
+    zvdb::Polyline* incompleto = fio({{200, 0, 0}, {250, 0, 0}}, "32");
+    incompleto->setXData("KVR_ZV_WIRE", zvsample::XDataItems().text("10006\f1").tags());
+    auto campos = [](const CEItemLista* item) {
+        QStringList texto;
+        for (auto it = item->campos.constBegin(); it != item->campos.constEnd(); ++it)
+            texto << it.key() + "=" + it.value();
+        return texto;
+    };
+    CCFioDataReader aParte;
+    LeitorDasLeituras dasLeituras;
+    for (const zvdb::Polyline* linha : {simples, static_cast<const zvdb::Polyline*>(comQtd),
+                                        static_cast<const zvdb::Polyline*>(incompleto)}) {
+        SCOPED_TRACE(linha->handle());
+        const std::unique_ptr<CEItemLista> lido(aParte.CriaItemFio(id(linha), modelo_));
+        const std::unique_ptr<CEItemLista> guardado(dasLeituras.CriaItemFio(id(linha), modelo_));
+        ASSERT_TRUE(lido && guardado);
+        EXPECT_EQ(campos(guardado.get()), campos(lido.get()));
+        EXPECT_TRUE(dasLeituras.LeituraGuardada(id(linha)));
+        // A copy as an end still gets the quantity a wire without one of its own stands for.
+        CEItemLista ponta;
+        dasLeituras.CopiaEntidade("_INI", ponta, id(linha), &modelo_);
+        EXPECT_EQ(ponta.valorCampo("QTD_INI"), linha == simples  ? "1"
+                                               : linha == comQtd ? "4"
+                                                                 : QString());
+    }
+    EXPECT_EQ(campos(std::unique_ptr<CEItemLista>(aParte.CriaItemFio(id(comQtd), modelo_)).get())
+                  .filter("QTD="),
+              QStringList({"QTD=4"}));
+}
+
 TEST_F(WireReaderTest, AnElementThatNoLongerExistsLeavesTheStretchOpen) {
     const zvdb::BlockReference* x1 = borne("X1", "1", {20, 200, 0});
     const zvdb::BlockReference* x2 = borne("X1", "2", {20, 100, 0});
