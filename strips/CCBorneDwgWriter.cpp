@@ -50,7 +50,7 @@ CCBorneDwgWriter::Bloco CCBorneDwgWriter::BlocoSimbolo(const CEItemLista& item) 
 OdDbObjectId CCBorneDwgWriter::Insere(const Bloco& bloco, const QString& layer, double x,
                                       double y) {
     if (!bloco.existe()) return {};
-    return CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, x, y, 0, 0);
+    return insercoes_.Insere(bloco.arquivo, bloco.nome, layer, x, y);
 }
 
 OdDbObjectId CCBorneDwgWriter::InserePreenchido(const Bloco& bloco, const QString& layer, double x,
@@ -124,6 +124,7 @@ void CCBorneDwgWriter::DesenhaSemBorne(const std::vector<CESimboloDwg*>& simbolo
 void CCBorneDwgWriter::Escreve(VetorItens& itens, CETemplate& modelo) {
     modelo_ = CEModeloReguas();
     preenchidos_.Reinicia();
+    insercoes_.Reinicia();
     const CEModeloReguas::Parametros parametros = CEModeloReguas::Parametros::DoModelo(modelo);
     modelo_.Constroi(itens);
     modelo_.CalculaTrilhas();

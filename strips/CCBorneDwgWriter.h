@@ -4,6 +4,7 @@
 // group and inserts the blocks. It takes the item vector of the strip reader: components
 // (ZV_LISTA_TIPO "COMP") and terminals ("BORNE").
 #include "CEModeloReguas.h"
+#include "cad/CEInsercoesBlocos.h"
 #include "catalogue/CECacheCatalogo.h"
 #include "lists/CCListaPaginada.h"
 #include "module/CCDataWriter.h"
@@ -55,6 +56,8 @@ private:
     QHash<QString, Bloco> blocosSimbolo_;
     // The run's blocks, filled from their items.
     CCListaPaginada::BlocosPreenchidos preenchidos_;
+    // The run's bare blocks: frames, separators and jumpers.
+    CEInsercoesBlocos insercoes_;
 
     // The template's values of the run.
     QString norma_, representacao_;
