@@ -103,9 +103,10 @@ void CCBorneDwgWriter::DesenhaRegua(CEReguaDwg& regua, const QString& layer) {
             const OdDbObjectId ref = InserePreenchido(BlocoSimbolo(*simbolo->item), layer, x,
                                                       regua.y - entreBornes_, *simbolo->item);
             if (!ref.isNull()) {
-                CICad::SetXData(
-                    ref, "KVR_ZV_REPRESENTACAO",
-                    {{1000, representacao_}, {1000, simbolo->item->valorCampo("HANDLE")}});
+                const QString* handle = simbolo->item->campos.procura(NumeroCampo<"HANDLE">());
+                const std::string handleUtf8 = handle ? handle->toStdString() : std::string();
+                CICad::SetXDataTextos(ref, "KVR_ZV_REPRESENTACAO",
+                                      {representacaoUtf8_, handleUtf8});
             }
         }
         x += passo_;
@@ -153,6 +154,7 @@ void CCBorneDwgWriter::Escreve(VetorItens& itens, CETemplate& modelo) {
     bornesPorRegua_ = parametros.bornesPorRegua;
     norma_ = modelo.LerTexto("*NORMA_UTILIZADA*");
     representacao_ = modelo.LerTexto("PBLCHAVEREPBORNEDWG");
+    representacaoUtf8_ = representacao_.toStdString();
 
     // Every block the template names must be there before anything is drawn.
     for (const Bloco* bloco :

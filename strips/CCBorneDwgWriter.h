@@ -11,6 +11,8 @@
 
 #include <QString>
 
+#include <string>
+
 class CEItemLista;
 struct OdDbObjectId;
 
@@ -61,6 +63,7 @@ private:
 
     // The template's values of the run.
     QString norma_, representacao_;
+    std::string representacaoUtf8_;  // the symbols' link, as their extended data holds it
     Bloco regua_, borne_, detalhe_, traco_;
     Bloco pontes_[5];  // by track state; 0 is never drawn
     double passo_ = 0.0, distJumper_ = 0.0, entreBornes_ = 0.0, passoSemBorne_ = 0.0;
