@@ -162,8 +162,8 @@ OdDbObjectId CCListaPaginada::BlocosPreenchidos::Insere(const QString& arquivo, 
     if (arquivo.isEmpty()) return {};
     const auto conhecido = comFuncao_.constFind(nome);
     if (conhecido != comFuncao_.constEnd() && !conhecido.value())
-        return CICad::InsereBloco(arquivo, nome, layer, x, y, 0, 0, valor);
-    const OdDbObjectId referencia = CICad::InsereBloco(arquivo, nome, layer, x, y, 0, 0);
+        return insercoes_.Insere(arquivo, nome, layer, x, y, valor);
+    const OdDbObjectId referencia = insercoes_.Insere(arquivo, nome, layer, x, y);
     if (referencia.isNull()) return referencia;
     std::unique_ptr<zv::CEListaAtributos> atributos;
     CICad::GetAtributos(referencia, atributos, false, false);

@@ -3,6 +3,7 @@
 // pages in the project, and fill header, footer and detail rows from page fields and items.
 #include "CEPaginaLista.h"
 
+#include "cad/CEInsercoesBlocos.h"
 #include "cad/OdDbObjectId.h"
 
 #include <QHash>
@@ -66,10 +67,14 @@ public:
         // placed.
         OdDbObjectId Insere(const QString& arquivo, const QString& nome, const QString& layer,
                             double x, double y, const CEItemLista& item, const Valor& valor);
-        void Reinicia() { comFuncao_.clear(); }
+        void Reinicia() {
+            comFuncao_.clear();
+            insercoes_.Reinicia();
+        }
 
     private:
         QHash<QString, bool> comFuncao_;
+        CEInsercoesBlocos insercoes_;
     };
 
     // The running grid of a list's rows, in single precision as the drawing keeps it.

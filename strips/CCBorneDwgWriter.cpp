@@ -50,7 +50,7 @@ CCBorneDwgWriter::Bloco CCBorneDwgWriter::BlocoSimbolo(const CEItemLista& item) 
 OdDbObjectId CCBorneDwgWriter::Insere(const Bloco& bloco, const QString& layer, double x,
                                       double y) {
     if (!bloco.existe()) return {};
-    return CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, x, y, 0, 0);
+    return insercoes_.Insere(bloco.arquivo, bloco.nome, layer, x, y);
 }
 
 OdDbObjectId CCBorneDwgWriter::InserePreenchido(const Bloco& bloco, const QString& layer, double x,
@@ -103,9 +103,10 @@ void CCBorneDwgWriter::DesenhaRegua(CEReguaDwg& regua, const QString& layer) {
             const OdDbObjectId ref = InserePreenchido(BlocoSimbolo(*simbolo->item), layer, x,
                                                       regua.y - entreBornes_, *simbolo->item);
             if (!ref.isNull()) {
-                CICad::SetXData(
-                    ref, "KVR_ZV_REPRESENTACAO",
-                    {{1000, representacao_}, {1000, simbolo->item->valorCampo("HANDLE")}});
+                const QString* handle = simbolo->item->campos.procura(NumeroCampo<"HANDLE">());
+                const std::string handleUtf8 = handle ? handle->toStdString() : std::string();
+                CICad::SetXDataTextos(ref, "KVR_ZV_REPRESENTACAO",
+                                      {representacaoUtf8_, handleUtf8});
             }
         }
         x += passo_;
@@ -124,6 +125,7 @@ void CCBorneDwgWriter::DesenhaSemBorne(const std::vector<CESimboloDwg*>& simbolo
 void CCBorneDwgWriter::Escreve(VetorItens& itens, CETemplate& modelo) {
     modelo_ = CEModeloReguas();
     preenchidos_.Reinicia();
+    insercoes_.Reinicia();
     const CEModeloReguas::Parametros parametros = CEModeloReguas::Parametros::DoModelo(modelo);
     modelo_.Constroi(itens);
     modelo_.CalculaTrilhas();
@@ -152,6 +154,7 @@ void CCBorneDwgWriter::Escreve(VetorItens& itens, CETemplate& modelo) {
     bornesPorRegua_ = parametros.bornesPorRegua;
     norma_ = modelo.LerTexto("*NORMA_UTILIZADA*");
     representacao_ = modelo.LerTexto("PBLCHAVEREPBORNEDWG");
+    representacaoUtf8_ = representacao_.toStdString();
 
     // Every block the template names must be there before anything is drawn.
     for (const Bloco* bloco :

@@ -4,11 +4,14 @@
 // group and inserts the blocks. It takes the item vector of the strip reader: components
 // (ZV_LISTA_TIPO "COMP") and terminals ("BORNE").
 #include "CEModeloReguas.h"
+#include "cad/CEInsercoesBlocos.h"
 #include "catalogue/CECacheCatalogo.h"
 #include "lists/CCListaPaginada.h"
 #include "module/CCDataWriter.h"
 
 #include <QString>
+
+#include <string>
 
 class CEItemLista;
 struct OdDbObjectId;
@@ -55,9 +58,12 @@ private:
     QHash<QString, Bloco> blocosSimbolo_;
     // The run's blocks, filled from their items.
     CCListaPaginada::BlocosPreenchidos preenchidos_;
+    // The run's bare blocks: frames, separators and jumpers.
+    CEInsercoesBlocos insercoes_;
 
     // The template's values of the run.
     QString norma_, representacao_;
+    std::string representacaoUtf8_;  // the symbols' link, as their extended data holds it
     Bloco regua_, borne_, detalhe_, traco_;
     Bloco pontes_[5];  // by track state; 0 is never drawn
     double passo_ = 0.0, distJumper_ = 0.0, entreBornes_ = 0.0, passoSemBorne_ = 0.0;

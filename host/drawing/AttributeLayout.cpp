@@ -265,7 +265,7 @@ const TagPattern& AttributeLayouts::referencePattern(const ReferenceShape& shape
 
 std::string_view AttributeLayouts::real(Database& target, double value) {
     const auto bits = std::bit_cast<std::uint64_t>(value);
-    Memo& memo = reals_[(bits * 0x9E3779B97F4A7C15ull) >> 58];
+    Memo& memo = reals_[(bits * 0x9E3779B97F4A7C15ull) >> (64 - kMemoBits)];
     if (memo.text.empty() || memo.bits != bits)
         memo = Memo{bits, target.storeShared(TagValues::fromReal(value))};
     return memo.text;

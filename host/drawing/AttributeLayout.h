@@ -161,7 +161,10 @@ private:
         std::uint64_t bits = 0;
         std::string_view text;
     };
-    std::array<Memo, 64> reals_{};
+    // A strip or list page places a few hundred distinct coordinates over and over: the memo
+    // holds a page's worth.
+    static constexpr int kMemoBits = 10;
+    std::array<Memo, std::size_t(1) << kMemoBits> reals_{};
 };
 
 }  // namespace zvdb

@@ -2,6 +2,7 @@
 // masters, project settings and the object store.
 #include "FacadeFixture.h"
 #include "QtPrinters.h"
+#include "cad/CEInsercoesBlocos.h"
 #include "cad/CELayoutRotasFios.h"
 #include "cad/CICad.h"
 #include "drawing/Dictionary.h"
@@ -330,6 +331,43 @@ TEST_F(FacadeFixture, InsertingAFoundDefinitionAndWritingTextsGiveWhatTheLongWay
     EXPECT_EQ(lidos[1].codigo, 1000);
     EXPECT_EQ(lidos[1].texto, "1A2B");
     EXPECT_EQ(lidos[2].texto, QString::fromUtf8("\xc3\xa7"));
+}
+
+// A writer's run of insertions finds each block and page once: a reference lands on the
+// layer of its own call, and a definition or a layer erased between two calls is loaded or
+// made again, as the name-and-file insertion would.
+TEST_F(FacadeFixture, RepeatedInsertionsFindAnErasedBlockOrLayerAgain) {
+    const QString caminho = arquivoBloco("REPETIDO", {"VARIAVEL_1"});
+    const CEValoresAtributos valores = [](const QString& tag,
+                                          const QString&) -> std::optional<QString> {
+        return "<" + tag + ">";
+    };
+    CEInsercoesBlocos insercoes;
+    const auto referencia = [this](const OdDbObjectId& id) {
+        return dynamic_cast<zvdb::BlockReference*>(db().objectByHandle(id.handle()));
+    };
+    const OdDbObjectId primeira = insercoes.Insere(caminho, "REPETIDO", "PAG1", 0, 0, valores);
+    const OdDbObjectId segunda = insercoes.Insere(caminho, "REPETIDO", "PAG2", 10, 0);
+    ASSERT_TRUE(referencia(primeira) && referencia(segunda));
+    EXPECT_EQ(referencia(primeira)->layer(), "PAG1");
+    EXPECT_EQ(referencia(segunda)->layer(), "PAG2");
+    ASSERT_EQ(referencia(primeira)->attributes().size(), 1u);
+    EXPECT_EQ(referencia(primeira)->attributes()[0]->textValue(), "<VARIAVEL_1>");
+    EXPECT_TRUE(CICad::ExisteLayer("PAG1"));
+
+    OdDbObjectId antigo;
+    ASSERT_TRUE(CICad::GetBlocoId("REPETIDO", antigo));
+    db().objectByHandle(antigo.handle())->erase();
+    db().layer("PAG2")->erase();
+    ASSERT_FALSE(CICad::ExisteLayer("PAG2"));
+    const OdDbObjectId terceira = insercoes.Insere(caminho, "REPETIDO", "PAG2", 20, 0);
+    ASSERT_TRUE(referencia(terceira));
+    OdDbObjectId novo;
+    ASSERT_TRUE(CICad::GetBlocoId("REPETIDO", novo));
+    EXPECT_NE(novo.handle(), antigo.handle());
+    EXPECT_TRUE(CICad::ExisteLayer("PAG2"));
+    EXPECT_EQ(referencia(terceira)->layer(), "PAG2");
+    EXPECT_EQ(referencia(terceira)->attributes().size(), 1u);
 }
 
 // The tag and default asked about are those of the definition as it stands at each
