@@ -411,6 +411,7 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
             d.progresso_ = nullptr;
             d.itensPorHandle_.clear();
             d.camposUsados_.clear();
+            d.CamposLidos = nullptr;
             d.definicoes_.clear();
             d.comAcessorioLigado_.clear();
         }
@@ -852,6 +853,7 @@ std::optional<std::vector<std::uint32_t>> CCDiagramaTopografico::CamposUsados(
 
 void CCDiagramaTopografico::PreparaLeitura(const Candidatos& candidatos) {
     camposUsados_.clear();
+    CamposLidos = nullptr;
     std::vector<std::pair<QString, QString>> blocos;
     QSet<QString> vistos;
     for (const auto& [chave, candidato] : candidatos)
@@ -864,6 +866,8 @@ void CCDiagramaTopografico::PreparaLeitura(const Candidatos& candidatos) {
     camposUsados_.assign(campos->empty() ? 0 : campos->back() + 1, 0);
     for (const std::uint32_t campo : *campos)
         camposUsados_[campo] = 1;
+    // The symbols' readings write only these: nothing to trim afterwards.
+    if (!camposUsados_.empty()) CamposLidos = &camposUsados_;
 }
 
 void CCDiagramaTopografico::Retem(CEItemLista& item) const {
