@@ -16,6 +16,7 @@
 #include <QSet>
 
 #include <algorithm>
+#include <array>
 #include <cmath>
 #include <cstdint>
 #include <iterator>
@@ -150,6 +151,19 @@ const std::vector<std::uint32_t>& NomesDoDono() {
 
 std::string_view Vista(const QByteArray& texto) {
     return {texto.constData(), std::size_t(texto.size())};
+}
+
+// A key's handle and place (hexadecimal digits and marks) as the links write them: ASCII
+// goes byte for byte into `espaco`, anything else through `reserva`.
+std::string_view Ascii(QStringView texto, std::array<char, 24>& espaco, QByteArray& reserva) {
+    bool ascii = texto.size() <= qsizetype(espaco.size());
+    for (qsizetype i = 0; ascii && i < texto.size(); ++i) {
+        ascii = texto[i].unicode() < 0x80;
+        espaco[std::size_t(i)] = char(texto[i].unicode());
+    }
+    if (ascii) return {espaco.data(), std::size_t(texto.size())};
+    reserva = texto.toUtf8();
+    return Vista(reserva);
 }
 
 // A handle's text as the drawing writes it: upper-case hexadecimal digits without leading
@@ -589,10 +603,15 @@ void CCDiagramaTopografico::ColetaCandidatos(Candidatos& candidatos) {
     for (const OdDbObjectId& id : ids) {
         const CEListaXData dados = CICad::GetXData(id, kAppSimbolo);
         if (dados.empty() || dados.front().codigo != 1000) continue;
-        const QStringList partes = dados.front().texto.split(CCDataReader::kSeparador);
+        // Key and standard: the first two parts of the text.
+        const QString& texto = dados.front().texto;
+        const int corte = texto.indexOf(CCDataReader::kSeparador);
+        const int fim = corte < 0 ? -1 : texto.indexOf(CCDataReader::kSeparador, corte + 1);
         candidatos.emplace_back(
             ZVString::DeHandle(id.handle()),
-            Candidato{partes.value(0), partes.value(1), QString(), id, QString(), QString()});
+            Candidato{corte < 0 ? texto : texto.left(corte),
+                      corte < 0 ? QString() : texto.mid(corte + 1, fim < 0 ? -1 : fim - corte - 1),
+                      QString(), id, QString(), QString()});
     }
     OrdenaPorChave(candidatos);
 }
@@ -983,13 +1002,13 @@ void CCDiagramaTopografico::Insere(const QString& chave, PaginaFeita& pagina,
     const int corte = chave.indexOf('_');
     const bool acessorio = corte >= 0;
     const QString prefixo = acessorio ? chave.left(corte) : QString();
-    const QByteArray handleU8 = acessorio ? chave.mid(corte + 1).toUtf8() : chave.toUtf8();
-    std::vector<std::string_view> link{Vista(representacaoU8_), Vista(handleU8)};
-    QByteArray prefixoU8, chaveU8;
+    std::array<char, 24> handleA, prefixoA;
+    QByteArray handleU8, prefixoU8, chaveU8;
+    std::vector<std::string_view> link{Vista(representacaoU8_),
+                                       Ascii(QStringView(chave).mid(corte + 1), handleA, handleU8)};
     if (acessorio) {
-        prefixoU8 = prefixo.toUtf8();
         chaveU8 = candidato->chave.toUtf8();
-        link.push_back(Vista(prefixoU8));
+        link.push_back(Ascii(prefixo, prefixoA, prefixoU8));
         link.push_back(Vista(chaveU8));
     }
     CICad::SetXDataTextos(ref, acessorio ? kAppRepresentacaoAce : kAppRepresentacao, link);
