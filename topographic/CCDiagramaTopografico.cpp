@@ -596,7 +596,7 @@ void CCDiagramaTopografico::ColetaCandidatos(Candidatos& candidatos) {
         if (!CICad::EhReferencia(id)) continue;
         // Anonymous blocks and connector pins are never drawn.
         const QString bloco = CICad::GetNomeBloco(id).toUpper();
-        if (!bloco.startsWith('*') && !bloco.startsWith("PIN-")) ids.push_back(id);
+        if (!bloco.startsWith('*') && !bloco.startsWith(QLatin1String("PIN-"))) ids.push_back(id);
     }
     for (const auto& [nome, id] : CICad::GetEntradasDicionario({"ESQ_VIRTUAL_ZV"}, db))
         if (CICad::TipoEntidade(id) == "XRECORD") ids.push_back(id);
