@@ -144,6 +144,9 @@ protected:
     // The symbols an item is made of are kept for CopiaEntidade: set by the readers that
     // read them again as neighbours of other symbols (the export reader's sides).
     bool GuardaSimbolos = false;
+    // By name number, the only fields a symbol's reading writes (none past the end); null:
+    // every field. For a reader that keeps a few fields of many symbols.
+    const std::vector<char>* CamposLidos = nullptr;
     // The whole texts of the wires' entries ("HANDLE#CONNECTION#BLOCK") are kept for the
     // readers that ask for them; one that never does leaves them to the answer.
     bool GuardaCompletas = true;

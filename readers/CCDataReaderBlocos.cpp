@@ -192,7 +192,10 @@ void CCDataReader::LeBloco(const QString& s, CEItemLista& item, const OdDbObject
         chave.catalogo ? *chave.catalogo : DadosCatalogoComp(chave.chave, chave.norma);
     chave.catalogo = &catalogo;
     lote_.clear();
-    auto poe = [this](std::uint32_t nome, const QString& valor) { lote_.push_back({nome, valor}); };
+    const std::vector<char>* lidos = CamposLidos;
+    auto poe = [this, lidos](std::uint32_t nome, const QString& valor) {
+        if (!lidos || (nome < lidos->size() && (*lidos)[nome])) lote_.push_back({nome, valor});
+    };
     for (const auto& [nome, valor] : catalogo.campos)
         poe(CamposItem::numeroComSufixo(nome, s), valor);
 

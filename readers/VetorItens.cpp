@@ -84,17 +84,30 @@ void OrdenaItens(VetorItens& itens, const QStringList& campos, bool estavel) {
     QHash<QString, std::uint32_t> indice;
     std::vector<Chave> distintas;
     std::vector<std::uint32_t> ordemDistintas, lugar;
+    static const QString kVazio;
     for (size_t c = 0; c < k; ++c) {
         indice.clear();
         distintas.clear();
+        // The field's number is found once, and the texts are read where the items hold
+        // them; a run of items with one text (a strip's terminals) asks the index once.
+        const std::uint32_t numero = CamposItem::numeroSeHouver(campos[int(c)]);
+        const QString* anterior = nullptr;
+        std::uint32_t postoAnterior = 0;
         for (size_t i = 0; i < n; ++i) {
-            QString valor = Campo(itens[i], campos[int(c)]);
-            auto it = indice.constFind(valor);
-            if (it == indice.constEnd()) {
-                it = indice.insert(valor, std::uint32_t(distintas.size()));
-                distintas.push_back({ZVString::FormaNatural(valor), std::move(valor)});
+            const QString* achado = itens[i] && numero != CamposItem::kSemNome
+                                        ? itens[i]->campos.procura(numero)
+                                        : nullptr;
+            const QString& valor = achado ? *achado : kVazio;
+            if (!anterior || valor != *anterior) {
+                auto it = indice.constFind(valor);
+                if (it == indice.constEnd()) {
+                    it = indice.insert(valor, std::uint32_t(distintas.size()));
+                    distintas.push_back({ZVString::FormaNatural(valor), valor});
+                }
+                postoAnterior = it.value();
+                anterior = &valor;
             }
-            postos[i * k + c] = it.value();
+            postos[i * k + c] = postoAnterior;
         }
         ordemDistintas.resize(distintas.size());
         for (size_t d = 0; d < ordemDistintas.size(); ++d)

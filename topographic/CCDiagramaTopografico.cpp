@@ -16,6 +16,7 @@
 #include <QSet>
 
 #include <algorithm>
+#include <array>
 #include <cmath>
 #include <cstdint>
 #include <iterator>
@@ -152,6 +153,19 @@ std::string_view Vista(const QByteArray& texto) {
     return {texto.constData(), std::size_t(texto.size())};
 }
 
+// A key's handle and place (hexadecimal digits and marks) as the links write them: ASCII
+// goes byte for byte into `espaco`, anything else through `reserva`.
+std::string_view Ascii(QStringView texto, std::array<char, 24>& espaco, QByteArray& reserva) {
+    bool ascii = texto.size() <= qsizetype(espaco.size());
+    for (qsizetype i = 0; ascii && i < texto.size(); ++i) {
+        ascii = texto[i].unicode() < 0x80;
+        espaco[std::size_t(i)] = char(texto[i].unicode());
+    }
+    if (ascii) return {espaco.data(), std::size_t(texto.size())};
+    reserva = texto.toUtf8();
+    return Vista(reserva);
+}
+
 // A handle's text as the drawing writes it: upper-case hexadecimal digits without leading
 // zeros, in `digitos`.
 std::string_view TextoHandle(std::uint64_t handle, char (&digitos)[16]) {
@@ -161,6 +175,15 @@ std::string_view TextoHandle(std::uint64_t handle, char (&digitos)[16]) {
         handle >>= 4;
     } while (handle != 0);
     return {digitos + 16 - n, std::size_t(n)};
+}
+
+// The entries of a pass's pages, to size what is kept per key.
+int Quantidade(const std::vector<CCDiagramaTopografico::Pagina>& paginas) {
+    size_t n = 0;
+    for (const CCDiagramaTopografico::Pagina& pagina : paginas)
+        for (const CCDiagramaTopografico::Linha& linha : pagina)
+            n += linha.size();
+    return int(n);
 }
 
 }  // namespace
@@ -290,6 +313,7 @@ QHash<QString, CEPonto> CCDiagramaTopografico::PosicoesBlocos(const std::vector<
                                                               const Retangulo& retangulo,
                                                               double margem) {
     QHash<QString, CEPonto> posicoes;
+    posicoes.reserve(Quantidade(paginas));
     for (const Pagina& pagina : paginas) {
         double y = retangulo.topo;
         for (const Linha& linha : pagina) {
@@ -320,6 +344,7 @@ QHash<QString, CEPonto> CCDiagramaTopografico::PosicoesBornes(const std::vector<
                                                               const Retangulo& retangulo,
                                                               double margem) {
     QHash<QString, CEPonto> posicoes;
+    posicoes.reserve(Quantidade(paginas));
     for (const Pagina& pagina : paginas) {
         double y = retangulo.topo;
         for (const Linha& linha : pagina) {
@@ -400,7 +425,9 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
             d.progresso_ = nullptr;
             d.itensPorHandle_.clear();
             d.camposUsados_.clear();
+            d.CamposLidos = nullptr;
             d.definicoes_.clear();
+            d.comAcessorioLigado_.clear();
         }
     } fim{*this};
     progresso.Mostrar();
@@ -470,6 +497,7 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     // Each symbol is read once (an accessory's owner is kept in donos_) and never again as a
     // neighbour: its reading need not be kept.
     GuardaSimbolos = false;
+    itensPorHandle_.reserve(int(comuns.size() + bornes.size()));
     VetorItens itensComuns = LeItens(comuns, modelo);
     VetorItens itensBornes = LeItens(bornes, modelo);
     // Everything is read: what the reading kept goes before the drawing grows.
@@ -568,32 +596,45 @@ void CCDiagramaTopografico::ColetaCandidatos(Candidatos& candidatos) {
         if (!CICad::EhReferencia(id)) continue;
         // Anonymous blocks and connector pins are never drawn.
         const QString bloco = CICad::GetNomeBloco(id).toUpper();
-        if (!bloco.startsWith('*') && !bloco.startsWith("PIN-")) ids.push_back(id);
+        if (!bloco.startsWith('*') && !bloco.startsWith(QLatin1String("PIN-"))) ids.push_back(id);
     }
     for (const auto& [nome, id] : CICad::GetEntradasDicionario({"ESQ_VIRTUAL_ZV"}, db))
         if (CICad::TipoEntidade(id) == "XRECORD") ids.push_back(id);
     for (const OdDbObjectId& id : ids) {
         const CEListaXData dados = CICad::GetXData(id, kAppSimbolo);
         if (dados.empty() || dados.front().codigo != 1000) continue;
-        const QStringList partes = dados.front().texto.split(CCDataReader::kSeparador);
+        // Key and standard: the first two parts of the text.
+        const QString& texto = dados.front().texto;
+        const int corte = texto.indexOf(CCDataReader::kSeparador);
+        const int fim = corte < 0 ? -1 : texto.indexOf(CCDataReader::kSeparador, corte + 1);
         candidatos.emplace_back(
             ZVString::DeHandle(id.handle()),
-            Candidato{partes.value(0), partes.value(1), QString(), id, QString(), QString()});
+            Candidato{corte < 0 ? texto : texto.left(corte),
+                      corte < 0 ? QString() : texto.mid(corte + 1, fim < 0 ? -1 : fim - corte - 1),
+                      QString(), id, QString(), QString()});
     }
     OrdenaPorChave(candidatos);
 }
 
 void CCDiagramaTopografico::AdicionaAcessorios(Candidatos& candidatos) {
     std::vector<std::pair<QString, Candidato>> novos;
+    // A catalogue key's accessories are cut out once, and their keys shared by the symbols
+    // of that key: a project has few keys and many symbols.
+    QHash<QString, std::vector<std::pair<int, QString>>> porChave;
     for (const auto& [chave, simbolo] : candidatos) {
-        const QStringList acessorios = Catalogo().AcessoriosDe(simbolo.chave);
-        for (int i = 0; i < acessorios.size(); ++i) {
-            const QString acessorio = acessorios[i].section('#', 0, 0);
-            if (!acessorio.isEmpty())
-                novos.push_back(
-                    {"*" + QString::number(i) + "_" + chave,
-                     {acessorio, simbolo.norma, QString(), simbolo.simbolo, QString(), QString()}});
+        auto doCatalogo = porChave.constFind(simbolo.chave);
+        if (doCatalogo == porChave.constEnd()) {
+            std::vector<std::pair<int, QString>> cortados;
+            const QStringList acessorios = Catalogo().AcessoriosDe(simbolo.chave);
+            for (int i = 0; i < acessorios.size(); ++i)
+                if (QString acessorio = acessorios[i].section('#', 0, 0); !acessorio.isEmpty())
+                    cortados.emplace_back(i, std::move(acessorio));
+            doCatalogo = porChave.insert(simbolo.chave, std::move(cortados));
         }
+        for (const auto& [i, acessorio] : *doCatalogo)
+            novos.push_back(
+                {"*" + QString::number(i) + "_" + chave,
+                 {acessorio, simbolo.norma, QString(), simbolo.simbolo, QString(), QString()}});
         const CEListaXData aditivos = CICad::GetXData(simbolo.simbolo, "ZV_VINC_ADITIVO");
         int indice = 0;
         for (size_t i = 0; i + 1 < aditivos.size(); i += 2) {
@@ -689,23 +730,24 @@ void CCDiagramaTopografico::RenovaBlocos(Candidatos& candidatos) {
 
 void CCDiagramaTopografico::DescartaDesenhados(Candidatos& candidatos) {
     const QString& representacao = parametros_.representacao;
-    Filtra(candidatos, [&](const Entrada& entrada) {
+    Filtra(candidatos, [&](Entrada& entrada) {
         if (entrada.first.contains('_')) return !AcessorioDesenhado(entrada.first, entrada.second);
-        for (const auto& [rep, handle] :
-             Pares(CICad::GetXData(entrada.second.simbolo, kAppRepresentacaoEsq)))
+        const auto pares = Pares(CICad::GetXData(entrada.second.simbolo, kAppRepresentacaoEsq));
+        entrada.second.semLigacoes = pares.empty();
+        for (const auto& [rep, handle] : pares)
             if (rep == representacao && !CICad::IdDoHandle(handle).isNull()) return false;
         return true;
     });
 }
 
-bool CCDiagramaTopografico::AcessorioDesenhado(const QString& chave,
-                                               const Candidato& candidato) const {
+bool CCDiagramaTopografico::AcessorioDesenhado(const QString& chave, Candidato& candidato) const {
     // The symbol's chain names its accessories' blocks; each block says which place of the
     // symbol's list it shows and with which key (a changed catalogue draws the new one).
     const QString lugar = chave.section('_', 0, 0);
     const QString simbolo = chave.section('_', -1);
-    for (const auto& [rep, handle] :
-         Pares(CICad::GetXData(candidato.simbolo, kAppRepresentacaoAceEsq))) {
+    const auto pares = Pares(CICad::GetXData(candidato.simbolo, kAppRepresentacaoAceEsq));
+    candidato.semLigacoes = pares.empty();
+    for (const auto& [rep, handle] : pares) {
         if (rep != parametros_.representacao) continue;
         const OdDbObjectId bloco = CICad::IdDoHandle(handle);
         if (bloco.isNull()) continue;
@@ -830,6 +872,7 @@ std::optional<std::vector<std::uint32_t>> CCDiagramaTopografico::CamposUsados(
 
 void CCDiagramaTopografico::PreparaLeitura(const Candidatos& candidatos) {
     camposUsados_.clear();
+    CamposLidos = nullptr;
     std::vector<std::pair<QString, QString>> blocos;
     QSet<QString> vistos;
     for (const auto& [chave, candidato] : candidatos)
@@ -842,6 +885,8 @@ void CCDiagramaTopografico::PreparaLeitura(const Candidatos& candidatos) {
     camposUsados_.assign(campos->empty() ? 0 : campos->back() + 1, 0);
     for (const std::uint32_t campo : *campos)
         camposUsados_[campo] = 1;
+    // The symbols' readings write only these: nothing to trim afterwards.
+    if (!camposUsados_.empty()) CamposLidos = &camposUsados_;
 }
 
 void CCDiagramaTopografico::Retem(CEItemLista& item) const {
@@ -854,6 +899,7 @@ void CCDiagramaTopografico::Retem(CEItemLista& item) const {
 void CCDiagramaTopografico::LePassos(const VetorItens& bornes) {
     // The step is the default text of the block's attribute named by PBLTOPO_BORNEDIST.
     QHash<QString, QString> porBloco;
+    passos_.reserve(int(bornes.size()));
     const QString& tag = parametros_.borneDist;
     for (CEItemLista* item : bornes) {
         const QString chave = item->valorCampo(kHandle);
@@ -879,6 +925,7 @@ void CCDiagramaTopografico::LePassos(const VetorItens& bornes) {
 void CCDiagramaTopografico::LeExtensoes() {
     // Once per block, for the candidates that have an item: only those are laid out.
     QHash<QString, Extensao> porBloco;
+    extensoes_.reserve(itensPorHandle_.size());
     for (auto it = itensPorHandle_.constBegin(); it != itensPorHandle_.constEnd(); ++it) {
         const QString& chave = it.key();
         const QString& nome = it->candidato->nome;
@@ -907,26 +954,30 @@ void CCDiagramaTopografico::Desenha(const std::vector<Pagina>& paginas,
         feita.layerU8 = feita.layer.toUtf8();
     }
     paginasCriadas_ += int(paginas.size());
-    // A terminal that starts a strip stands twice in its row: it goes in once, at its
-    // last entry, where its point was left.
-    QHash<QString, int> restantes;
-    for (const Pagina& pagina : paginas)
-        for (const Linha& linha : pagina)
-            for (const QString& chave : linha)
-                ++restantes[chave];
+    // A terminal that starts a strip stands twice, its two entries side by side in the pass
+    // (in one row, or ending one row and starting the next): it goes in once, at its later
+    // entry, where its point was left. Every other key stands once.
+    const QString* anterior = nullptr;
+    size_t paginaAnterior = 0;
     for (size_t i = 0; i < paginas.size(); ++i) {
         for (const Linha& linha : paginas[i])
-            for (const QString& chave : linha)
-                if (--restantes[chave] == 0) Insere(chave, feitas[i], posicoes.value(chave));
+            for (const QString& chave : linha) {
+                if (anterior && *anterior != chave)
+                    Insere(*anterior, feitas[paginaAnterior], posicoes.value(*anterior));
+                anterior = &chave;
+                paginaAnterior = i;
+            }
         if (progresso_) progresso_->Definir(progresso_->Percentual());
     }
+    if (anterior) Insere(*anterior, feitas[paginaAnterior], posicoes.value(*anterior));
 }
 
 void CCDiagramaTopografico::Insere(const QString& chave, PaginaFeita& pagina,
                                    const CEPonto& ponto) {
-    const Lido lido = itensPorHandle_.value(chave);
-    CEItemLista* item = lido.item;
-    const Candidato* candidato = lido.candidato;
+    const auto lido = itensPorHandle_.find(chave);
+    if (lido == itensPorHandle_.end()) return;
+    CEItemLista* item = lido->item;
+    const Candidato* candidato = lido->candidato;
     if (!item || !candidato) return;
     // Every attribute takes the item's field of its tag (blank when the item has none).
     const auto valores = [item](const QString& tag, const QString&) -> std::optional<QString> {
@@ -947,30 +998,33 @@ void CCDiagramaTopografico::Insere(const QString& chave, PaginaFeita& pagina,
     if (ref.isNull()) return;  // left out; the run goes on
     ++inseridos_;
     // The block names its symbol; an accessory's block also its place and catalogue key.
-    QString handle = item->valorCampo(kHandle);
-    const int corte = handle.indexOf('_');
+    // The item's handle field is its candidate's key.
+    const int corte = chave.indexOf('_');
     const bool acessorio = corte >= 0;
-    const QString prefixo = acessorio ? handle.left(corte) : QString();
-    if (acessorio) handle = handle.mid(corte + 1);
-    const QByteArray handleU8 = handle.toUtf8();
-    std::vector<std::string_view> link{Vista(representacaoU8_), Vista(handleU8)};
-    QByteArray prefixoU8, chaveU8;
+    const QString prefixo = acessorio ? chave.left(corte) : QString();
+    std::array<char, 24> handleA, prefixoA;
+    QByteArray handleU8, prefixoU8, chaveU8;
+    std::vector<std::string_view> link{Vista(representacaoU8_),
+                                       Ascii(QStringView(chave).mid(corte + 1), handleA, handleU8)};
     if (acessorio) {
-        prefixoU8 = prefixo.toUtf8();
         chaveU8 = candidato->chave.toUtf8();
-        link.push_back(Vista(prefixoU8));
+        link.push_back(Ascii(prefixo, prefixoA, prefixoU8));
         link.push_back(Vista(chaveU8));
     }
     CICad::SetXDataTextos(ref, acessorio ? kAppRepresentacaoAce : kAppRepresentacao, link);
+    // A symbol's own block is linked once a run; its accessories' blocks share one chain.
+    bool semLigacoes = candidato->semLigacoes;
+    if (acessorio && semLigacoes)
+        semLigacoes = comAcessorioLigado_.insert(candidato->simbolo.handle()).second;
     char digitos[16];
-    LigaSimbolo(candidato->simbolo, prefixo, TextoHandle(ref.handle(), digitos));
+    LigaSimbolo(candidato->simbolo, prefixo, TextoHandle(ref.handle(), digitos), semLigacoes);
     // Each item goes in once: it gives its room to the blocks that follow.
-    itensPorHandle_.find(chave)->item = nullptr;
+    lido->item = nullptr;
     delete item;
 }
 
 void CCDiagramaTopografico::LigaSimbolo(const OdDbObjectId& simbolo, const QString& lugar,
-                                        std::string_view bloco) {
+                                        std::string_view bloco, bool semLigacoes) {
     if (simbolo.isNull()) return;  // the block stays unlinked; the next run adds it again
     const bool acessorio = !lugar.isEmpty();
     static const QString kEsq(kAppRepresentacaoEsq), kAceEsq(kAppRepresentacaoAceEsq);
@@ -978,7 +1032,9 @@ void CCDiagramaTopografico::LigaSimbolo(const OdDbObjectId& simbolo, const QStri
     // At most one block per representation, and for accessories one per place in the
     // symbol's list: a stale pair, or the old block of the same one, goes.
     std::vector<QByteArray> ficam;
-    for (const auto& [rep, ligado] : Pares(CICad::GetXData(simbolo, aplicacao))) {
+    const auto pares = semLigacoes ? std::vector<std::pair<QString, QString>>()
+                                   : Pares(CICad::GetXData(simbolo, aplicacao));
+    for (const auto& [rep, ligado] : pares) {
         const OdDbObjectId id = CICad::IdDoHandle(ligado);
         if (id.isNull()) continue;
         if (rep == parametros_.representacao) {

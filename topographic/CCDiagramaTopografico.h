@@ -18,6 +18,7 @@
 #include <memory>
 #include <optional>
 #include <string_view>
+#include <unordered_set>
 #include <vector>
 
 class CETemplate;
@@ -110,6 +111,9 @@ private:
         // The drawing's block name and the block's file, made once per block and shared by
         // its candidates.
         QString nome, arquivo;
+        // The symbol had no link of this kind (its own block, or its accessories') when
+        // the run began: the first link written needs no reading of the old ones.
+        bool semLigacoes = false;
     };
     // Candidates with their keys, in key order once gathered, each key once.
     using Entrada = std::pair<QString, Candidato>;
@@ -135,7 +139,7 @@ private:
                                  CETemplate& modelo);
     // Is an accessory's block of this representation, for this place in the symbol's list,
     // still in the drawing?
-    bool AcessorioDesenhado(const QString& chave, const Candidato& candidato) const;
+    bool AcessorioDesenhado(const QString& chave, Candidato& candidato) const;
     // Works out the fields kept of items read (see CamposUsados).
     void PreparaLeitura(const Candidatos& candidatos);
     // Leaves a read item only the fields the run uses.
@@ -152,8 +156,10 @@ private:
         bool pronta = false;
     };
     void Insere(const QString& chave, PaginaFeita& pagina, const CEPonto& ponto);
-    // `lugar` is an accessory's place ("*0", "#1"), empty for the symbol's own block.
-    void LigaSimbolo(const OdDbObjectId& simbolo, const QString& lugar, std::string_view bloco);
+    // `lugar` is an accessory's place ("*0", "#1"), empty for the symbol's own block;
+    // `semLigacoes`: the symbol is known to have no links of that kind yet.
+    void LigaSimbolo(const OdDbObjectId& simbolo, const QString& lugar, std::string_view bloco,
+                     bool semLigacoes);
 
     Parametros parametros_;
     QString diretorio_;
@@ -171,6 +177,8 @@ private:
     // found at their first insertion.
     QByteArray representacaoU8_;
     QHash<QString, OdDbObjectId> definicoes_;
+    // The symbols given an accessory's link in this run: their chains are no longer empty.
+    std::unordered_set<std::uint64_t> comAcessorioLigado_;
     CIProgress* progresso_ = nullptr;
     int inseridos_ = 0;
     int paginasCriadas_ = 0;

@@ -100,7 +100,8 @@ void Database::swapContents(Database& other) {
     warnings_.swap(other.warnings_);
     std::swap(namedObjects_, other.namedObjects_);
     layouts_.swap(other.layouts_);
-    std::swap(lastApplication_, other.lastApplication_);
+    std::swap(knownApplications_, other.knownApplications_);
+    std::swap(nextKnown_, other.nextKnown_);
     for (const auto& object : storage_)
         object->database_ = this;
     for (const auto& object : other.storage_)
@@ -292,17 +293,23 @@ bool Database::isApplicationRegistered(std::string_view application) const {
 
 bool Database::registerApplication(std::string_view application) {
     if (application.empty()) return false;
-    // Objects given extended data name the same application one after another.
-    if (lastApplication_ && !lastApplication_->isErased() &&
-        TagValues::sameName(lastApplication_->text(2), application))
-        return false;
-    SymbolTable* appids = table("APPID");
-    if (DbObject* known = appids ? appids->find(application) : nullptr) {
-        lastApplication_ = known;
-        return false;
+    // Objects given extended data name the same few applications over and over, often in
+    // turns (a block and the symbol it is tied to): the names asked lately are compared
+    // first, byte for byte, and their records asked whether they still bear them.
+    for (const KnownApplication& known : knownApplications_) {
+        if (!known.record || known.name != application || known.record->isErased()) continue;
+        const std::string_view name = known.record->text(2);
+        if (name == application || TagValues::sameName(name, application)) return false;
     }
-    lastApplication_ = createTableRecord("APPID", application, "AcDbRegAppTableRecord");
-    return lastApplication_ != nullptr;
+    SymbolTable* appids = table("APPID");
+    DbObject* record = appids ? appids->find(application) : nullptr;
+    const bool made = record == nullptr;
+    if (made) record = createTableRecord("APPID", application, "AcDbRegAppTableRecord");
+    if (record) {
+        knownApplications_[nextKnown_] = {record, std::string(application)};
+        nextKnown_ = (nextKnown_ + 1) % knownApplications_.size();
+    }
+    return made && record != nullptr;
 }
 
 // System variables -------------------------------------------------------------------------

@@ -13,6 +13,7 @@
 #include "StringArena.h"
 #include "Tag.h"
 
+#include <array>
 #include <cstdint>
 #include <functional>
 #include <memory>
@@ -222,8 +223,14 @@ private:
     // Room where new objects' tags are put together before they get their own.
     std::vector<Tag> scratch_;
     std::unique_ptr<AttributeLayouts> layouts_;
-    // The APPID record registerApplication found or made last.
-    DbObject* lastApplication_ = nullptr;
+    // The APPID records registerApplication found or made lately, with the names they were
+    // asked by, in turns.
+    struct KnownApplication {
+        DbObject* record = nullptr;
+        std::string name;
+    };
+    std::array<KnownApplication, 4> knownApplications_{};
+    std::size_t nextKnown_ = 0;
     std::uint64_t changes_ = 0;
     std::uint64_t contentId_ = 0;
     std::uint64_t shapes_ = 0;

@@ -20,6 +20,7 @@
 #include <QFileInfo>
 
 #include <memory>
+#include <string_view>
 #include <unordered_set>
 
 namespace zvproduct {
@@ -105,7 +106,10 @@ void refreshPageCounts(zvdb::Database& database) {
     for (const PageGroup& group : registry.groups())
         counts[group.name + "$DE"] = group.pages.size();
     for (zvdb::Entity* entity : database.modelSpace()->entities()) {
-        auto count = counts.find(std::string(entity->layer()));
+        // Nearly every entity lies on a page: only a "$DE" layer's name is worth a copy.
+        const std::string_view layer = entity->layer();
+        if (!layer.ends_with("$DE")) continue;
+        auto count = counts.find(std::string(layer));
         auto* reference = dynamic_cast<zvdb::BlockReference*>(entity);
         if (count == counts.end() || !reference) continue;
         if (zvdb::Attribute* total = reference->attribute("TOTAL"))

@@ -366,6 +366,31 @@ TEST(ExtendedDataOnFileObjects, AnApplicationIsRegisteredOnceAndAgainAfterItsRec
     EXPECT_FALSE(other.registerApplication("ZV_OTHER"));
 }
 
+TEST(ExtendedDataOnFileObjects,
+     ApplicationsAskedInTurnsAreRegisteredOnceWhateverTheirRecordsBecome) {
+    Database db;
+    EXPECT_TRUE(db.registerApplication("ZV_A"));
+    EXPECT_TRUE(db.registerApplication("ZV_B"));
+    for (int i = 0; i < 3; ++i) {
+        EXPECT_FALSE(db.registerApplication("ZV_A"));
+        EXPECT_FALSE(db.registerApplication("ZV_B"));
+        EXPECT_FALSE(db.registerApplication("zv_b"));
+    }
+    // A record renamed no longer answers for the name it was asked by.
+    db.table("APPID")->find("ZV_B")->setText(2, "ZV_C");
+    db.table("APPID")->reindex();
+    EXPECT_TRUE(db.registerApplication("ZV_B"));
+    EXPECT_TRUE(db.isApplicationRegistered("ZV_B"));
+    EXPECT_FALSE(db.registerApplication("zv_b"));
+    EXPECT_FALSE(db.registerApplication("ZV_C"));
+    // Nor does one erased, though it was asked a moment ago.
+    EXPECT_FALSE(db.registerApplication("ZV_A"));
+    db.table("APPID")->find("ZV_A")->erase();
+    db.table("APPID")->reindex();
+    EXPECT_TRUE(db.registerApplication("ZV_A"));
+    EXPECT_TRUE(db.isApplicationRegistered("ZV_A"));
+}
+
 namespace {
 
 // The tags a new reference has when made whole, one by one.

@@ -607,6 +607,30 @@ TEST_F(AcessoriosTopograficos, RunsOnTheOutputAddOnlyMissingAccessoriesAndNeverT
     EXPECT_EQ(aceEsq_[k2].size(), 4);
 }
 
+TEST_F(AcessoriosTopograficos, ChainsThatNameAnotherRepresentationsBlocksKeepThemFirst) {
+    // -K1 is tied already to blocks of representation 2 (any live objects will do), both
+    // for itself and for an accessory; -K2 to nothing.
+    for (const char* app : {"KVR_ZV_REPRESENTACAO_ESQ", "KVR_ZV_REPRESENTACAO_ACE_ESQ"})
+        db().registerApplication(app);
+    const QString k1 = H(k1_), k2 = H(k2_);
+    k1_->setXData("KVR_ZV_REPRESENTACAO_ESQ",
+                  XDataItems().text("2").text(H(x11_).toStdString()).tags());
+    k1_->setXData("KVR_ZV_REPRESENTACAO_ACE_ESQ",
+                  XDataItems().text("2").text(H(x12_).toStdString()).tags());
+    ASSERT_EQ(Executa(), zvsdk::CommandResult::Succeeded) << Saida().toStdString();
+    const auto todas = Salvo();
+    const auto blocos = PorSimbolo(todas);
+    const auto acessorios = PorAcessorio(todas);
+    ASSERT_EQ(acessorios.size(), 5u);
+    // The old pairs stay ahead of this run's; every accessory of -K1 joins the same chain.
+    EXPECT_EQ(esq_[k1], QStringList({"2", H(x11_), "1", blocos.at(k1).handle}));
+    EXPECT_EQ(aceEsq_[k1], QStringList({"2", H(x12_), "1", acessorios.at("#0_" + k1).handle, "1",
+                                        acessorios.at("#1_" + k1).handle, "1",
+                                        acessorios.at("*0_" + k1).handle}));
+    EXPECT_EQ(esq_[k2], QStringList({"1", blocos.at(k2).handle}));
+    EXPECT_EQ(aceEsq_[k2], QStringList({"1", acessorios.at("*0_" + k2).handle}));
+}
+
 TEST_F(AcessoriosTopograficos, AnAccessoryWhoseSymbolIsNotListedIsLeftOutWithIt) {
     // A duct, not on the lists, that adds a side contact: neither is drawn.
     Simbolo("CANALETA", "8503\f1", {{"RELACAO", "-W2"}})
