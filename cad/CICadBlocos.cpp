@@ -1,4 +1,3 @@
-#include "CEInsercoesBlocos.h"
 #include "CICad.h"
 #include "CICadInterno.h"
 #include "app/DrawingFiles.h"
@@ -9,7 +8,6 @@
 #include "drawing/BlockReference.h"
 #include "drawing/DeepCloner.h"
 #include "drawing/Entity.h"
-#include "drawing/LayerRecord.h"
 #include "readers/CEAtributo.h"
 #include "readers/CEListaAtributos.h"
 #include "settings/CIMensagens.h"
@@ -187,35 +185,6 @@ OdDbObjectId CICad::InsereBloco(const QString& arquivo, const QString& nome, con
     if (!GetBlocoId(nome, bloco, db)) bloco = CarregaBloco(nome, arquivo);
     CriaLayer(layer, db);
     return InsereReferencia(bloco, U8(layer), x, y, z, rotacao, valores);
-}
-
-OdDbObjectId CEInsercoesBlocos::Insere(const QString& arquivo, const QString& nome,
-                                       const QString& layer, double x, double y,
-                                       const CEValoresAtributos& valores) {
-    zvdb::Database* db = CICad::GetDatabase();
-    if (!db) return {};
-    if (db != database_) {
-        Reinicia();
-        database_ = db;
-    }
-    OdDbObjectId& bloco = definicoes_[nome];
-    if (!Como<zvdb::BlockRecord>(bloco) && !CICad::GetBlocoId(nome, bloco, db))
-        bloco = CICad::CarregaBloco(nome, arquivo);
-    if (layer != layer_ || (!layer.isEmpty() && !Como<zvdb::LayerRecord>(layerId_))) {
-        CICad::CriaLayer(layer, db);
-        layer_ = layer;
-        layerUtf8_ = U8(layer);
-        layerId_ = Id(Layer(layer, db));
-    }
-    return CICad::InsereReferencia(bloco, layerUtf8_, x, y, 0, 0, valores);
-}
-
-void CEInsercoesBlocos::Reinicia() {
-    database_ = nullptr;
-    definicoes_.clear();
-    layer_ = QString();
-    layerUtf8_.clear();
-    layerId_ = OdDbObjectId();
 }
 
 OdDbObjectId CICad::InsereReferencia(const OdDbObjectId& bloco, std::string_view layer, double x,
