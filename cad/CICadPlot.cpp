@@ -19,9 +19,9 @@ bool CICad::ExtensaoVisivel(double& xMin, double& yMin, double& xMax, double& yM
     zvdb::BoundingBox box;
     auto* documento = dynamic_cast<zvhost::HostDocument*>(zvsdk::activeDocument());
     if (documento && documento->database() == database) {
-        // The host's index by layer: only the layers that show are walked.
-        for (const zvdb::Entity* entity : documento->plotIndex().visibleEntities())
-            box.add(zvdb::Extents::ofEntity(*entity, true));
+        // The host's index by layer walks only the layers that show, and measures a set of
+        // them once while the drawing's shapes stay as they are.
+        box = documento->plotIndex().visibleBounds();
     } else {
         for (const zvdb::Entity* entity : database->modelSpace()->entities()) {
             const zvdb::LayerRecord* layer = database->layer(entity->layer());
