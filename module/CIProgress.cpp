@@ -52,7 +52,10 @@ void CIProgress::Fechar() {
     zvsdk::UserInterface* ui = Interface();
     if (ui) ui->processEvents(kEventosPorPasso);
     if (!aberta_) return;
-    if (criacao_.elapsed() < kTempoMinimoMs) QThread::msleep(kEsperaMs);
+    // A short run waits a little so that its window does not just flicker; a host that
+    // shows no window has nothing to wait for.
+    if (ui && ui->showsProgress() && criacao_.elapsed() < kTempoMinimoMs)
+        QThread::msleep(kEsperaMs);
     aberta_ = false;
     if (ui) ui->closeProgress();
 }

@@ -35,6 +35,7 @@ public:
     void closeProgress() override;
     void processEvents(int maxEvents) override;
     bool progressCancelled() override;
+    bool showsProgress() const override { return progressOnTerminal_ || progressLog_; }
     void enableMainWindow(bool enable) override { mainWindowEnabled_ = enable; }
     bool mainWindowEnabled() const { return mainWindowEnabled_; }
     // Every progress step as a line on stderr, for logs and scripts.

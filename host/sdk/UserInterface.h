@@ -39,6 +39,9 @@ public:
     virtual void showProgress(const QString& title) = 0;
     virtual void setProgress(int percent, const QString& line) = 0;
     virtual void closeProgress() = 0;
+    // Whether the progress surface is shown at all: a quiet host draws nothing, so there is
+    // no window that could flicker.
+    virtual bool showsProgress() const { return true; }
     // Lets the host handle at most `maxEvents` pending window events.
     virtual void processEvents(int maxEvents) = 0;
     // Whether the user asked to stop the running work (the progress window's cancel

@@ -17,6 +17,7 @@ class Gravadora : public zvsdk::UserInterface {
 public:
     QStringList passos;
     int eventos = 0;
+    bool mostra = true;
     void messageBox(const QString&, const QString&) override {}
     bool askYesNo(const QString&, const QString&, bool cancel) override { return cancel; }
     QString fileDialog(const QString&, bool, const QString&, const QString&,
@@ -30,6 +31,7 @@ public:
     }
     void closeProgress() override { passos << "fecha"; }
     void processEvents(int) override { ++eventos; }
+    bool showsProgress() const override { return mostra; }
     void enableMainWindow(bool) override {}
 };
 
@@ -70,6 +72,24 @@ TEST_F(ProgressoTest, EveryStepShowsButTheEventLoopRunsAtMostEveryFewMillisecond
     progresso.Fechar();
     EXPECT_EQ(ui_->eventos, antes + 2);
     EXPECT_EQ(ui_->passos.last(), "fecha");
+}
+
+// A window closed soon after it opened stays a moment so that it does not just flicker; a
+// host that draws no window closes at once.
+TEST_F(ProgressoTest, OnlyAShownWindowWaitsBeforeClosingSoonAfterOpening) {
+    for (const bool mostra : {true, false}) {
+        ui_->mostra = mostra;
+        CIProgress progresso("Lista");
+        progresso.Mostrar();
+        QElapsedTimer tempo;
+        tempo.start();
+        progresso.Fechar();
+        if (mostra)
+            EXPECT_GE(tempo.elapsed(), 50);
+        else
+            EXPECT_LT(tempo.elapsed(), 50);
+        EXPECT_EQ(ui_->passos.last(), "fecha");
+    }
 }
 
 }  // namespace
