@@ -10,6 +10,7 @@
 #include "drawing/Polyline.h"
 
 #include <cmath>
+#include <unordered_map>
 
 using namespace cicad;
 
@@ -96,9 +97,12 @@ std::string_view CICad::NomeLayerUtf8(const OdDbObjectId& id) {
 
 std::vector<CEPonto> CICad::GetVertices(const OdDbObjectId& polilinha) {
     std::vector<CEPonto> pontos;
-    if (auto* p = Como<zvdb::Polyline>(polilinha))
-        for (const zvdb::Point3& v : p->vertices())
-            pontos.push_back({v.x, v.y, v.z});
+    auto* p = Como<zvdb::Polyline>(polilinha);
+    if (!p) return pontos;
+    const std::vector<zvdb::Point3> vertices = p->vertices();
+    pontos.reserve(vertices.size());
+    for (const zvdb::Point3& v : vertices)
+        pontos.push_back({v.x, v.y, v.z});
     return pontos;
 }
 
@@ -148,10 +152,16 @@ QHash<QString, std::vector<OdDbObjectId>> CICad::GetReferenciasPorBloco(zvdb::Da
     QHash<QString, std::vector<OdDbObjectId>> referencias;
     zvdb::Database* db = Db(database);
     if (!db) return referencias;
+    // Thousands of references name a few blocks: each name as the drawing spells it is made
+    // an upper-case text once, and names that differ only in case share one list.
+    std::unordered_map<std::string_view, std::vector<OdDbObjectId>*> porNome;
     for (zvdb::BlockRecord* bloco : db->blocks())
-        bloco->forEachEntity([&referencias](zvdb::Entity& entidade) {
-            if (auto* ref = dynamic_cast<zvdb::BlockReference*>(&entidade))
-                referencias[Q(ref->blockName()).toUpper()].push_back(Id(ref));
+        bloco->forEachEntity([&](zvdb::Entity& entidade) {
+            auto* ref = dynamic_cast<zvdb::BlockReference*>(&entidade);
+            if (!ref) return;
+            std::vector<OdDbObjectId>*& lista = porNome[ref->blockName()];
+            if (!lista) lista = &referencias[Q(ref->blockName()).toUpper()];
+            lista->push_back(Id(ref));
         });
     return referencias;
 }

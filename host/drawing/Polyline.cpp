@@ -15,6 +15,11 @@ std::vector<Point3> Polyline::vertices() const {
     const double elevation = real(38);
     const auto all = tags();
     const std::size_t end = xdataStart();
+    // Counted first: the array is made once at its size.
+    std::size_t count = 0;
+    for (std::size_t i = 1; i < end; ++i)
+        count += all[i].code == 10;
+    points.reserve(count);
     for (std::size_t i = 1; i < end; ++i) {
         if (all[i].code == 10)
             points.push_back(Point3{TagValues::toReal(all[i].value), 0.0, elevation});

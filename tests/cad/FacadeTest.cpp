@@ -695,3 +695,30 @@ TEST_F(FacadeFixture, XrecordsCarryExtendedDataBehindTheirData) {
 }
 
 }  // namespace
+
+TEST_F(FacadeFixture, ReferencesAreListedByTheUpperCaseNameOfTheirBlockInDrawingOrder) {
+    // A reference may spell its block's name in any case; all of them count for the block,
+    // in the order the drawing holds them, nested references included.
+    zvdb::BlockRecord* borne = db().createBlock("BORNE1");
+    zvdb::BlockRecord* motor = db().createBlock("Motor");
+    zvdb::BlockRecord* grupo = db().createBlock("GRUPO");
+    std::vector<OdDbObjectId> esperados;
+    const char* grafias[] = {"BORNE1", "borne1", "Borne1", "BORNE1"};
+    for (int i = 0; i < 4; ++i) {
+        zvdb::BlockReference* ref = db().modelSpace()->addBlockReference(*borne, {i * 10.0, 0, 0});
+        ref->setText(2, grafias[i]);
+        esperados.push_back(OdDbObjectId(&db(), ref->handle()));
+        if (i == 1) db().modelSpace()->addBlockReference(*motor, {0, 50, 0});
+    }
+    zvdb::BlockReference* aninhada = grupo->addBlockReference(*borne, {0, 0, 0});
+    const auto referencias = CICad::GetReferenciasPorBloco(&db());
+    EXPECT_FALSE(referencias.contains("borne1"));
+    EXPECT_EQ(referencias.value("MOTOR").size(), 1u);
+    std::vector<OdDbObjectId> bornes = referencias.value("BORNE1");
+    ASSERT_EQ(bornes.size(), 5u);
+    const auto lugar =
+        std::find(bornes.begin(), bornes.end(), OdDbObjectId(&db(), aninhada->handle()));
+    ASSERT_NE(lugar, bornes.end());
+    bornes.erase(lugar);
+    EXPECT_EQ(bornes, esperados);
+}
