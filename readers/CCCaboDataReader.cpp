@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <span>
 #include <unordered_map>
 
 namespace {
@@ -26,10 +27,34 @@ struct CCCaboDataReader::Janela {
         OdDbObjectId id;
         CEPonto minimo, maximo;
     };
+    // The cells of a layer in flat arrays: the occupied cells' keys ascending, and the
+    // entries of the i-th from inicios[i] to inicios[i + 1] in membros.
     struct Grade {
         QString layer;
-        std::unordered_map<std::int64_t, std::vector<std::uint32_t>> celulas;
         std::vector<std::uint32_t> grandes;  // boxes over too many cells, always tested
+        std::vector<std::pair<std::int64_t, std::uint32_t>> pares;  // while being filled
+        std::vector<std::int64_t> chaves;
+        std::vector<std::uint32_t> inicios, membros;
+
+        void Fecha() {
+            std::sort(pares.begin(), pares.end());
+            membros.reserve(pares.size());
+            for (const auto& [chave, k] : pares) {
+                if (chaves.empty() || chaves.back() != chave) {
+                    chaves.push_back(chave);
+                    inicios.push_back(std::uint32_t(membros.size()));
+                }
+                membros.push_back(k);
+            }
+            inicios.push_back(std::uint32_t(membros.size()));
+            std::vector<std::pair<std::int64_t, std::uint32_t>>().swap(pares);
+        }
+        std::span<const std::uint32_t> Membros(std::int64_t chave) const {
+            const auto achada = std::lower_bound(chaves.begin(), chaves.end(), chave);
+            if (achada == chaves.end() || *achada != chave) return {};
+            const size_t i = size_t(achada - chaves.begin());
+            return {membros.data() + inicios[i], membros.data() + inicios[i + 1]};
+        }
     };
 
     zvdb::Database* database;
@@ -46,18 +71,29 @@ struct CCCaboDataReader::Janela {
     }
 
     Janela(zvdb::Database* db, const std::vector<OdDbObjectId>& ids) : database(db) {
+        // A page's entities share a layer: each spelling of a name is made an upper-case text
+        // once.
+        std::unordered_map<std::string_view, size_t> porGrafia;
         for (const OdDbObjectId& id : ids) {
             Entrada e{id, {}, {}};
             if (!CICad::GetCaixaSelecao(id, e.minimo, e.maximo)) continue;
-            const QString layer = CICad::GetLayerEntidade(id).toUpper();
-            auto onde = porLayer.find(layer);
-            if (onde == porLayer.end()) {
-                onde = porLayer.insert(layer, grades.size());
-                grades.push_back({layer, {}, {}});
-            }
-            Inclui(grades[*onde], std::uint32_t(entradas.size()), e);
+            const auto [grafia, nova] = porGrafia.try_emplace(CICad::NomeLayerUtf8(id), 0);
+            if (nova) grafia->second = GradeDe(CICad::GetLayerEntidade(id).toUpper());
+            Inclui(grades[grafia->second], std::uint32_t(entradas.size()), e);
             entradas.push_back(e);
         }
+        for (Grade& grade : grades)
+            grade.Fecha();
+    }
+
+    // The grade of a layer by its upper-case name, made when new.
+    size_t GradeDe(const QString& layer) {
+        auto onde = porLayer.find(layer);
+        if (onde == porLayer.end()) {
+            onde = porLayer.insert(layer, grades.size());
+            grades.emplace_back().layer = layer;
+        }
+        return *onde;
     }
 
     void Inclui(Grade& grade, std::uint32_t k, const Entrada& e) {
@@ -69,7 +105,7 @@ struct CCCaboDataReader::Janela {
         }
         for (std::int64_t cx = Coluna(e.minimo.x); cx <= Coluna(e.maximo.x); ++cx)
             for (std::int64_t cy = Coluna(e.minimo.y); cy <= Coluna(e.maximo.y); ++cy)
-                grade.celulas[Celula(cx, cy)].push_back(k);
+                grade.pares.emplace_back(Celula(cx, cy), k);
     }
 
     // Layers are frozen and thawed by page swaps: the shown ones are taken again whenever
@@ -106,9 +142,8 @@ struct CCCaboDataReader::Janela {
             achados.insert(achados.end(), grade->grandes.begin(), grade->grandes.end());
             for (std::int64_t cx = Coluna(a.x); cx <= Coluna(b.x); ++cx)
                 for (std::int64_t cy = Coluna(a.y); cy <= Coluna(b.y); ++cy) {
-                    auto celula = grade->celulas.find(Celula(cx, cy));
-                    if (celula == grade->celulas.end()) continue;
-                    achados.insert(achados.end(), celula->second.begin(), celula->second.end());
+                    const std::span<const std::uint32_t> celula = grade->Membros(Celula(cx, cy));
+                    achados.insert(achados.end(), celula.begin(), celula.end());
                 }
         }
         std::sort(achados.begin(), achados.end());

@@ -81,7 +81,10 @@ Transform BlockReference::transformOf(const Point3& base, const Point3& position
 }
 
 Transform BlockReference::transform() const {
-    const BlockRecord* block = definition();
+    return transformFor(definition());
+}
+
+Transform BlockReference::transformFor(const BlockRecord* block) const {
     const Point3 base = block ? block->basePoint() : Point3{};
     const Placing p = readPlacing(tags());
     return transformOf(base, p.position, p.scale, p.rotation, p.extrusion);

@@ -27,6 +27,8 @@ public:
     Point3 extrusion() const { return point(210, Point3{0, 0, 1}); }
     // From the block definition's coordinates to the coordinates of the reference's owner.
     Transform transform() const;
+    // The same with the definition already found (null: none), for a caller that needs both.
+    Transform transformFor(const BlockRecord* block) const;
     // The same for a reference placed by these values, `base` being its block's base point.
     static Transform transformOf(const Point3& base, const Point3& position, const Point3& scale,
                                  double rotationDegrees, const Point3& extrusion = {0, 0, 1});

@@ -108,21 +108,33 @@ BoundingBox Extents::ofEntity(const Entity& entity, bool withAttributes, int dep
     BoundingBox box;
     if (entity.isErased() || depth > kMaxDepth) return box;
     const std::string_view type = entity.type();
-    const Transform ocs = Transform::fromOcs(entity.point(210, {0, 0, 1}));
     if (const auto* reference = dynamic_cast<const BlockReference*>(&entity)) {
         if (const BlockRecord* block = reference->definition())
-            box = transformed(ofBlock(*block, depth + 1), reference->transform());
+            box = transformed(ofBlock(*block, depth + 1), reference->transformFor(block));
         if (withAttributes)
             for (const Attribute* attribute : reference->attributes())
                 if (!attribute->isInvisible()) box.add(ofText(*attribute));
-    } else if (const auto* polyline = dynamic_cast<const Polyline*>(&entity)) {
-        for (const Point3& p : polyline->vertices())
-            box.add(polyline->isLightweight() ? ocs.apply(p) : p);
+        return box;
+    }
+    // The object coordinate system, read only for the kinds drawn in it (a reference's is in
+    // its transform, a text's in its own placing).
+    auto ocs = [&entity] { return Transform::fromOcs(entity.point(210, {0, 0, 1})); };
+    if (const auto* polyline = dynamic_cast<const Polyline*>(&entity)) {
+        const std::vector<Point3> vertices = polyline->vertices();
+        if (vertices.empty()) return box;
+        if (!polyline->isLightweight()) {
+            for (const Point3& p : vertices)
+                box.add(p);
+            return box;
+        }
+        const Transform t = ocs();
+        for (const Point3& p : vertices)
+            box.add(t.apply(p));
     } else if (type == "LINE") {
         box.add(entity.point(10));
         box.add(entity.point(11));
     } else if (type == "CIRCLE") {
-        const Point3 c = ocs.apply(entity.point(10));
+        const Point3 c = ocs().apply(entity.point(10));
         const double r = entity.real(40);
         box.add(c - Point3{r, r, 0});
         box.add(c + Point3{r, r, 0});
@@ -136,9 +148,10 @@ BoundingBox Extents::ofEntity(const Entity& entity, bool withAttributes, int dep
     } else if (type == "POINT") {
         box.add(entity.point(10));
     } else if (type == "SOLID" || type == "TRACE" || type == "3DFACE") {
+        const bool face = type == "3DFACE";
+        const Transform t = face ? Transform() : ocs();
         for (int code : {10, 11, 12, 13})
-            if (entity.has(code))
-                box.add(type == "3DFACE" ? entity.point(code) : ocs.apply(entity.point(code)));
+            if (entity.has(code)) box.add(face ? entity.point(code) : t.apply(entity.point(code)));
     } else if (type == "TEXT" || type == "MTEXT" || type == "ATTDEF" || type == "ATTRIB") {
         box = ofText(entity);
     }
