@@ -260,6 +260,7 @@ public:
     // ---- extended data, masters, project settings
     static void RegistraApp(const QString& aplicacao, zvdb::Database* database = nullptr);
     static bool TemXData(const OdDbObjectId& id, const QString& aplicacao);
+    static bool TemXData(const OdDbObjectId& id, const char* aplicacao);
     // The items behind the application's name; empty when the object has none.
     static CEListaXData GetXData(const OdDbObjectId& id, const QString& aplicacao);
     static CEListaXData GetXData(const OdDbObjectId& id, const char* aplicacao);

@@ -118,8 +118,12 @@ void CICad::RegistraApp(const QString& aplicacao, zvdb::Database* database) {
 }
 
 bool CICad::TemXData(const OdDbObjectId& id, const QString& aplicacao) {
+    return TemXData(id, U8(aplicacao).c_str());
+}
+
+bool CICad::TemXData(const OdDbObjectId& id, const char* aplicacao) {
     zvdb::DbObject* objeto = Objeto(id);
-    return objeto && !objeto->xdataItems(U8(aplicacao)).empty();
+    return objeto && !objeto->xdataItems(aplicacao).empty();
 }
 
 CEListaXData CICad::GetXData(const OdDbObjectId& id, const QString& aplicacao) {

@@ -5,6 +5,8 @@
 
 #include <QThread>
 
+#include <charconv>
+
 namespace {
 
 constexpr qint64 kAbreSozinhaMs = 2000;
@@ -58,6 +60,14 @@ void CIProgress::Fechar() {
         QThread::msleep(kEsperaMs);
     aberta_ = false;
     if (ui) ui->closeProgress();
+}
+
+QString CIProgress::Contagem(int k, int n) {
+    char texto[32];
+    char* fim = std::to_chars(texto, texto + 15, k).ptr;
+    *fim++ = '/';
+    fim = std::to_chars(fim, texto + sizeof texto, n).ptr;
+    return QString::fromLatin1(texto, int(fim - texto));
 }
 
 bool CIProgress::Cancelado() {

@@ -16,9 +16,12 @@ public:
     // lets the host handle up to 100 pending events (a reader that steps once per entity
     // would spend more on the host's event loop than on its entities).
     void Definir(int percentual, const QString& texto = QString());
-    // Pumps pending events and closes; a window open less than three seconds after its
+    // Pumps pending events and closes; a shown window open less than three seconds after its
     // creation waits 50 ms once, so a fast run does not just flicker.
     void Fechar();
+    // The text "k/n" of a step counted over a run, made without the format machinery: a
+    // reader that steps once per entity makes thousands.
+    static QString Contagem(int k, int n);
 
     // The cancel flag: set by Cancelar() or by the user through the host; a long run tests
     // it between its steps and ends early.

@@ -35,7 +35,7 @@ CEItemLista* ItemEmBranco(const QString& regua, int numero) {
 }
 
 QString Progresso(int k, int n) {
-    return QString::asprintf("%d/%d", k, n);
+    return CIProgress::Contagem(k, n);
 }
 
 }  // namespace

@@ -269,7 +269,7 @@ VetorItens* CCCaboDataReader::LeModelSpace(zvdb::Database* database, CETemplate&
     auto* itens = new VetorItens;
     const int n = int(ids.size());
     for (int k = 1; k <= n; ++k) {
-        if (progresso) progresso->Definir(30 + 70 * k / n, QString::asprintf("%d/%d", k, n));
+        if (progresso) progresso->Definir(30 + 70 * k / n, CIProgress::Contagem(k, n));
         const OdDbObjectId& id = ids[size_t(k - 1)];
         if (!CICad::TemXData(id, "KVR_ZV_CABO") && !CICad::TemXData(id, "KVR_ZV_CONEX_BLIND"))
             continue;

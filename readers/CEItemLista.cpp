@@ -2,6 +2,8 @@
 
 #include "cad/CICad.h"
 
+#include <algorithm>
+
 bool CEItemLista::obterCampo(const QString& chave, QString& valor) const {
     const QString* achado = campos.procura(chave);
     if (!achado) return false;
@@ -23,8 +25,16 @@ void CEItemLista::copiarCampos(const CEItemLista& origem) {
 
 void CEItemLista::copiarCamposComSufixo(const CEItemLista& origem, const QString& sufixo) {
     if (sufixo.isEmpty()) return copiarCampos(origem);
-    for (auto it = origem.campos.constBegin(); it != origem.campos.constEnd(); ++it)
-        campos.insert(it.key() + "_" + sufixo, it.value());
+    // The joined names are made once for the program; the batch goes in with one merge.
+    const QString junto = QLatin1Char('_') + sufixo;
+    std::vector<CamposItem::Campo> lote;
+    lote.reserve(origem.campos.todos().size());
+    for (const CamposItem::Campo& campo : origem.campos.todos())
+        lote.push_back({CamposItem::numeroComSufixo(campo.nome, junto), campo.valor});
+    std::sort(lote.begin(), lote.end(), [](const CamposItem::Campo& a, const CamposItem::Campo& b) {
+        return a.nome < b.nome;
+    });
+    campos.juntarOrdenados(lote);
 }
 
 namespace {

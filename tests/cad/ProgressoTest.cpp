@@ -92,4 +92,11 @@ TEST_F(ProgressoTest, OnlyAShownWindowWaitsBeforeClosingSoonAfterOpening) {
     }
 }
 
+TEST(ProgressoContagem, StepsReadAsTheirNumbersOverTheCount) {
+    EXPECT_EQ(CIProgress::Contagem(1, 20314), "1/20314");
+    EXPECT_EQ(CIProgress::Contagem(0, 0), "0/0");
+    EXPECT_EQ(CIProgress::Contagem(-5, 2147483647), "-5/2147483647");
+    EXPECT_EQ(CIProgress::Contagem(-2147483647 - 1, -2147483647 - 1), "-2147483648/-2147483648");
+}
+
 }  // namespace

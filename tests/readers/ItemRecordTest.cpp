@@ -148,6 +148,23 @@ TEST(ItemRecordTest, CopiesOverwriteAndSuffixGetsItsUnderscore) {
     const QString nomes = destino.textoCampos();
     EXPECT_EQ(nomes.count(' '), destino.campos.size());
     EXPECT_TRUE(nomes.contains("TAG_FIM "));
+    // A second copy under the same suffix replaces what the first put and keeps the rest;
+    // names made in any order end up in the item's order.
+    CEItemLista outra;
+    outra.definirCampo("ZZ_NOVO", "z");
+    outra.definirCampo("TAG", "K2");
+    outra.definirCampo("AA_NOVO", "a");
+    destino.definirCampo("PROPRIO_FIM", "fica");
+    destino.copiarCamposComSufixo(outra, "FIM");
+    EXPECT_EQ(destino.valorCampo("TAG_FIM"), "K2");
+    EXPECT_EQ(destino.valorCampo("LAYER_FIM"), "ESQ$1$A");
+    EXPECT_EQ(destino.valorCampo("PROPRIO_FIM"), "fica");
+    EXPECT_EQ(destino.valorCampo("ZZ_NOVO_FIM"), "z");
+    EXPECT_EQ(destino.valorCampo("AA_NOVO_FIM"), "a");
+    const auto& todos = destino.campos.todos();
+    EXPECT_TRUE(std::is_sorted(todos.begin(), todos.end(),
+                               [](const auto& a, const auto& b) { return a.nome < b.nome; }));
+    EXPECT_EQ(destino.campos.size(), 7);
 }
 
 // Items of one run keep one copy of each field name; their fields stay as they were.
