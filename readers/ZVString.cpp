@@ -1,6 +1,7 @@
 #include "ZVString.h"
 
 #include <cstdio>
+#include <string>
 
 namespace {
 
@@ -147,10 +148,12 @@ QString ZVString::Hora(const QTime& hora) {
                    DoisDigitos(hora.second()));
 }
 
-QString ZVString::FormaNatural(const QString& texto) {
+namespace {
+
+// The natural form of the text appended to `destino`, one code unit at a time.
+template <class Destino>
+void AcrescentaNatural(const QString& texto, Destino& destino) {
     constexpr int kLargura = 10;
-    QString natural;
-    natural.reserve(texto.size() + kLargura);
     const QChar* p = texto.constData();
     const QChar* fim = p + texto.size();
     while (p < fim) {
@@ -159,11 +162,25 @@ QString ZVString::FormaNatural(const QString& texto) {
             ++p;
         const int digitos = int(p - inicio);
         if (digitos == 0) {
-            natural += *p++;
+            destino.push_back(char16_t((p++)->unicode()));
             continue;
         }
-        if (digitos < kLargura) natural += QString(kLargura - digitos, '0');
-        natural.append(inicio, digitos);
+        for (int i = digitos; i < kLargura; ++i)
+            destino.push_back(u'0');
+        for (const QChar* d = inicio; d < p; ++d)
+            destino.push_back(char16_t(d->unicode()));
     }
-    return natural;
+}
+
+}  // namespace
+
+QString ZVString::FormaNatural(const QString& texto) {
+    std::u16string natural;
+    natural.reserve(size_t(texto.size()) + 10);
+    AcrescentaNatural(texto, natural);
+    return QString(reinterpret_cast<const QChar*>(natural.data()), int(natural.size()));
+}
+
+void ZVString::AcrescentaFormaNatural(const QString& texto, std::vector<char16_t>& destino) {
+    AcrescentaNatural(texto, destino);
 }
