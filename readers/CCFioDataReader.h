@@ -83,6 +83,9 @@ private:
     void PreencheExtremidade(const QString& lado, CEItemLista& item, const QStringList& elementos,
                              int indice, CETemplate* modelo);
     void CarregaTransicoes();
+    // What ComporRelacaoFio does, given the connection's value (empty without one).
+    void ComporRelacao(const QString& sufixo, CEItemLista& item, CETemplate* modelo,
+                       const QString& lig);
     // The first place of the full text of the entry at `indice` in the wire's list, as
     // PontoDaConexaoCompleta finds it; -1 when it has none.
     int PrimeiroLugar(const QString& numero, int indice);
