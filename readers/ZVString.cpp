@@ -1,5 +1,6 @@
 #include "ZVString.h"
 
+#include <charconv>
 #include <cstdio>
 #include <string>
 
@@ -76,11 +77,15 @@ bool ZVString::DivideEmTres(const QString& separadores, QString& primeiro, QStri
 }
 
 ZVString ZVString::DeReal(double valor, int precisao) {
+    // What printf writes for "%.*f" (six digits by default), made without going through the
+    // format machinery: every length and total of a list passes here.
     char buffer[512];
-    if (precisao >= 0)
-        std::snprintf(buffer, sizeof buffer, "%.*f", precisao, valor);
-    else
-        std::snprintf(buffer, sizeof buffer, "%f", valor);
+    const int digitos = precisao >= 0 ? precisao : 6;
+    const std::to_chars_result feito =
+        std::to_chars(buffer, buffer + sizeof buffer, valor, std::chars_format::fixed, digitos);
+    if (feito.ec == std::errc())
+        return ZVString(QString::fromLatin1(buffer, int(feito.ptr - buffer)));
+    std::snprintf(buffer, sizeof buffer, "%.*f", digitos, valor);
     return ZVString(QString::fromLatin1(buffer));
 }
 

@@ -11,6 +11,7 @@
 
 #include <algorithm>
 #include <cstdint>
+#include <cstdio>
 #include <memory>
 #include <vector>
 
@@ -103,6 +104,21 @@ TEST(ZVStringTest, PrefixNumbersAndHandles) {
     EXPECT_EQ(ZVString("fFfFfFfFfFfFfFf").ParaHandle(), 0xFFFFFFFFFFFFFFFu);
     EXPECT_EQ(ZVString("FFFFFFFFFFFFFFFF").ParaHandle(), 0xFFFFFFFFFFFFFFFFu);
     EXPECT_EQ(ZVString(" 2AF ").ParaHandle(), 0x2AFu);
+}
+
+TEST(ZVStringTest, RealsAreWrittenAsPrintfWritesThem) {
+    // Ties in binary round to even, as printf does; signs, zeros and the large and the tiny
+    // as it writes them too.
+    const double valores[] = {0.125, 0.375, 2.5,  3.5,    -2.5,        1.0 / 3.0, 2.456,
+                              -0.0,  0.0,   1e-7, 5e-7,   123456.789,  1e20,      -1e22,
+                              1e300, 0.5,   1.5,  0.0625, 999.9999995, 1150.0,    0.045};
+    for (const double v : valores)
+        for (const int precisao : {-1, 0, 1, 2, 3, 6, 9}) {
+            char esperado[512];
+            std::snprintf(esperado, sizeof esperado, "%.*f", precisao < 0 ? 6 : precisao, v);
+            EXPECT_EQ(ZVString::DeReal(v, precisao), QString::fromLatin1(esperado))
+                << v << " " << precisao;
+        }
 }
 
 TEST(ZVStringTest, NaturalFormPadsShortDigitRunsOnly) {
