@@ -152,8 +152,9 @@ bool CCFioDataReader::PosicaoLayout(const QString& elemento, const QString& cone
     VistaLayout lida;
     const VistaLayout* vista = nullptr;
     if (composicao_) {
-        auto achada = vistas_.find(elemento);
-        if (achada == vistas_.end()) achada = vistas_.emplace(elemento, LeVista(elemento)).first;
+        const std::uint64_t handle = ZVString(elemento).ParaHandle();
+        auto achada = vistas_.find(handle);
+        if (achada == vistas_.end()) achada = vistas_.emplace(handle, LeVista(elemento)).first;
         vista = &achada->second;
     } else {
         lida = LeVista(elemento);
