@@ -7,7 +7,9 @@
 #include "readers/VetorItens.h"
 #include "readers/ZVString.h"
 
+#include <cstdint>
 #include <optional>
+#include <string_view>
 
 namespace {
 
@@ -187,9 +189,14 @@ void CCFioGrfWriter::InsereLinha(const CCListaPaginada::Bloco& bloco, const QStr
         bloco.arquivo, bloco.nome, layer, linha.x, linha.y, item,
         [&](const QString& tag, const QString& padrao) { return valor(PapelDoTag(tag), padrao); });
     if (ref.isNull()) return;
-    if (!variasColunas_ && !item.ids.empty() && !item.ids.front().isNull())
-        CICad::SetXData(ref, "KVR_ZV_LINK",
-                        {{1000, ZVString::DeHandle(item.ids.front().handle())}});
+    if (!variasColunas_ && !item.ids.empty() && !item.ids.front().isNull()) {
+        // The handle's text as DeHandle writes it, made here in UTF-8 for the drawing.
+        char digitos[16];
+        int n = 0;
+        for (std::uint64_t h = item.ids.front().handle(); n == 0 || h; h >>= 4)
+            digitos[15 - n++] = "0123456789ABCDEF"[h & 15];
+        CICad::SetXDataTextos(ref, "KVR_ZV_LINK", {std::string_view(digitos + 16 - n, size_t(n))});
+    }
 }
 
 const QString& CCFioGrfWriter::Impresso(const QString& comprimento) {

@@ -549,7 +549,11 @@ VetorItens* CCDataReader::LeDicionarioCabos(zvdb::Database* database) {
 }
 
 bool CCDataReader::EhEquipamento(const OdDbObjectId& id) const {
-    return !id.isNull() && CICad::TemXData(id, "KVR_ZV_EQUIPO");
+    // Asked at every entry of every wire: the application's name is passed as it stands,
+    // not made into a text first. TextoXData answers whether it has items, as TemXData.
+    QString texto;
+    bool temTexto = false;
+    return !id.isNull() && CICad::TextoXData(id, "KVR_ZV_EQUIPO", texto, temTexto);
 }
 
 // ---- items from entities

@@ -79,6 +79,13 @@ bool MesmoPonto(const CEPonto& a, const CEPonto& b) {
 // Wires of up to this many entries find repeated texts by comparing them all.
 constexpr int kEntradasSemIndice = 16;
 
+// The names and values the walks write for every wire and end, made once: a text made from
+// a literal at each use costs an allocation.
+const QString kIni = QStringLiteral("INI"), kFim = QStringLiteral("FIM"),
+              kWireLista = QStringLiteral("WIRE_LISTA"), kSim = QStringLiteral("S"),
+              kTipoLista = QStringLiteral("ZV_LISTA_TIPO"), kAnilha = QStringLiteral("ANILHA"),
+              kHandleIni = QStringLiteral("HANDLE_INI");
+
 }  // namespace
 
 // Sets up a walk over the wires: the composition read once with its template, and no wire
@@ -234,8 +241,7 @@ std::optional<QString> CCFioDataReader::LigacaoProxima(const QString& numero,
 void CCFioDataReader::PreencheExtremidade(const QString& lado, CEItemLista& item,
                                           const QStringList& elementos, int indice,
                                           CETemplate* modelo) {
-    static const QString kIni = QStringLiteral("INI"), kSufixoIni = QStringLiteral("_INI"),
-                         kSufixoFim = QStringLiteral("_FIM");
+    static const QString kSufixoIni = QStringLiteral("_INI"), kSufixoFim = QStringLiteral("_FIM");
     const QString& sufixo = lado == kIni ? kSufixoIni : kSufixoFim;
     CopiaEntidade(sufixo, item, CICad::IdDoHandle(elementos.value(indice)), modelo);
     // The wire's number, asked by both parts below: an element's fields copied under the
@@ -281,12 +287,12 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
         const QString campo = CampoFio(*item);
         const QString numero = campo.isEmpty() ? QString() : item->valorCampo(campo);
         // The first polyline of a number speaks for all polylines of that number.
-        if (numero.isEmpty() || item->valorCampo("WIRE_LISTA") != "S" || numeros.contains(numero) ||
+        if (numero.isEmpty() || item->valorCampo(kWireLista) != kSim || numeros.contains(numero) ||
             (modelo && !modelo->FiltraItem(*item))) {
             delete item;
             continue;
         }
-        item->definirCampo("ZV_LISTA_TIPO", "FIO");
+        item->definirCampo(kTipoLista, QStringLiteral("FIO"));
         numeros.insert(numero);
 
         const QStringList* a = ListaConexoes(numero);
@@ -299,7 +305,7 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
             std::optional<CEItemLista> padrao;
             if (n > 2) padrao = *item;
             item->campos.reservar(size_t(lugares));
-            PreencheExtremidade("INI", *item, elementos, 0, modelo);
+            PreencheExtremidade(kIni, *item, elementos, 0, modelo);
             CEItemLista* atual = item;
             trechos[atual] = {0, -1};
             for (int i = 1; i < n; ++i) {
@@ -309,13 +315,13 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
                 // A run of one equipment is one passage: the wire goes in and out of it.
                 const bool equipamento = EhEquipamento(elemento);
                 if (elementos[i] != elementos[i - 1] || !equipamento) {
-                    PreencheExtremidade("FIM", *atual, elementos, i, modelo);
+                    PreencheExtremidade(kFim, *atual, elementos, i, modelo);
                     trechos[atual].fim = i;
                 }
                 if (i != n - 1 && (elementos[i] != elementos[i + 1] || !equipamento)) {
                     auto* novo = new CEItemLista(*padrao);
                     novo->campos.reservar(size_t(lugares));
-                    PreencheExtremidade("INI", *novo, elementos, i, modelo);
+                    PreencheExtremidade(kIni, *novo, elementos, i, modelo);
                     atual->ligado = novo;
                     itens->push_back(novo);
                     atual = novo;
@@ -360,12 +366,12 @@ VetorItens* CCFioDataReader::LeAnilhas(const QHash<QString, QString>& opcoes, CE
         if (!item) continue;
         const QString campo = CampoFio(*item);
         const QString numero = campo.isEmpty() ? QString() : item->valorCampo(campo);
-        if (numero.isEmpty() || item->valorCampo("WIRE_LISTA") != "S" || numeros.contains(numero)) {
+        if (numero.isEmpty() || item->valorCampo(kWireLista) != kSim || numeros.contains(numero)) {
             delete item;
             continue;
         }
         numeros.insert(numero);
-        item->definirCampo("ZV_LISTA_TIPO", "ANILHA");
+        item->definirCampo(kTipoLista, kAnilha);
         const size_t primeiro = itens->size();
         itens->push_back(item);
 
@@ -376,13 +382,13 @@ VetorItens* CCFioDataReader::LeAnilhas(const QHash<QString, QString>& opcoes, CE
         CEItemLista* atual = item;
         Trechos trechos;
         for (int i = 0; n >= 2 && i + 1 < n; ++i) {
-            PreencheExtremidade("INI", *atual, elementos, i, modelo);
-            PreencheExtremidade("FIM", *atual, elementos, i + 1, modelo);
+            PreencheExtremidade(kIni, *atual, elementos, i, modelo);
+            PreencheExtremidade(kFim, *atual, elementos, i + 1, modelo);
             trechos[atual] = {i, i + 1};
             if (i + 2 == n) break;
             CEItemLista* novo = ItemFio(fio, modelo);
             if (!novo) break;
-            novo->definirCampo("ZV_LISTA_TIPO", "ANILHA");
+            novo->definirCampo(kTipoLista, kAnilha);
             atual->ligado = novo;
             itens->push_back(novo);
             atual = novo;
@@ -393,7 +399,7 @@ VetorItens* CCFioDataReader::LeAnilhas(const QHash<QString, QString>& opcoes, CE
         for (size_t k = primeiro + 1; k < itens->size(); ++k) {
             CEItemLista* esta = (*itens)[k];
             CEItemLista* antes = (*itens)[destino - 1];
-            if (esta->valorCampo("HANDLE_INI") == antes->valorCampo("HANDLE_INI")) {
+            if (esta->valorCampo(kHandleIni) == antes->valorCampo(kHandleIni)) {
                 antes->ligado = esta->ligado;
                 trechos.erase(esta);
                 delete esta;
@@ -428,7 +434,7 @@ void CCFioDataReader::LeSegmento(const QString& lado, CEItemLista& item, const Q
 
 void CCFioDataReader::LeSegmentoNoIndice(const QString& lado, CEItemLista& item,
                                          const QString& numero, int indice, CETemplate* modelo) {
-    static const QString kIni = QStringLiteral("INI"), kLayerIni = QStringLiteral("LAYER_INI"),
+    static const QString kLayerIni = QStringLiteral("LAYER_INI"),
                          kLayerFim = QStringLiteral("LAYER_FIM"),
                          kSegIni = QStringLiteral("_SEGINI"), kSegFim = QStringLiteral("_SEGFIM");
     const bool ini = lado == kIni;
@@ -449,12 +455,7 @@ void CCFioDataReader::CompoeExtremidade(const QString& sufixo, CEItemLista& item
 
 void CCFioDataReader::CompoeExtremidade(const QString& sufixo, CEItemLista& item,
                                         CETemplate* modelo, const QString& numero, int indice) {
-    const std::optional<QString> valor = Ligacao(numero, indice);
-    std::unique_ptr<zv::CEAtributo> ligacao;
-    if (valor)
-        ligacao =
-            std::make_unique<zv::CEAtributo>(QString(), QString(), *valor, OdDbObjectId(), false);
-    ComporRelacaoFio(sufixo, item, modelo, ligacao.get());
+    ComporRelacao(sufixo, item, modelo, Ligacao(numero, indice).value_or(QString()));
 }
 
 CCFioDataReader::Composicao CCFioDataReader::LeComposicao(CETemplate* modelo) {
@@ -467,12 +468,18 @@ CCFioDataReader::Composicao CCFioDataReader::LeComposicao(CETemplate* modelo) {
 
 void CCFioDataReader::ComporRelacaoFio(const QString& s, CEItemLista& item, CETemplate* modelo,
                                        const zv::CEAtributo* ligacao) {
-    const Composicao composicao =
-        composicao_ && modeloComposicao_ == modelo ? *composicao_ : LeComposicao(modelo);
+    ComporRelacao(s, item, modelo, ligacao ? ligacao->GetValor() : QString());
+}
+
+void CCFioDataReader::ComporRelacao(const QString& s, CEItemLista& item, CETemplate* modelo,
+                                    const QString& lig) {
+    std::optional<Composicao> lida;
+    const Composicao& composicao = composicao_ && modeloComposicao_ == modelo
+                                       ? *composicao_
+                                       : lida.emplace(LeComposicao(modelo));
     const QString& sep = composicao.sep;
     const QString& sepLig = composicao.sepLig;
     const bool relacaoPrimeiro = composicao.relacaoPrimeiro;
-    const QString lig = ligacao ? ligacao->GetValor() : QString();
     const NomesExtremidade& nomes = Nomes(s);
     auto campo = [&item](const NomeCampo& nome) {
         const QString* valor = nome.Em(item);

@@ -7,6 +7,7 @@
 #include <QSet>
 
 #include <array>
+#include <cstdint>
 #include <optional>
 #include <unordered_map>
 
@@ -83,6 +84,9 @@ private:
     void PreencheExtremidade(const QString& lado, CEItemLista& item, const QStringList& elementos,
                              int indice, CETemplate* modelo);
     void CarregaTransicoes();
+    // What ComporRelacaoFio does, given the connection's value (empty without one).
+    void ComporRelacao(const QString& sufixo, CEItemLista& item, CETemplate* modelo,
+                       const QString& lig);
     // The first place of the full text of the entry at `indice` in the wire's list, as
     // PontoDaConexaoCompleta finds it; -1 when it has none.
     int PrimeiroLugar(const QString& numero, int indice);
@@ -136,9 +140,11 @@ private:
         std::vector<std::pair<QString, OdDbObjectId>> pontos;
     };
     VistaLayout LeVista(const QString& elemento);
-    std::unordered_map<QString, VistaLayout> vistas_;  // by element, for one walk
-    QHash<QString, QString> rotasLayoutFio_;           // wire key (and key + "$") to route handle
-    QHash<QString, QString> paineisLayout_;            // panel key to view handle
+    // By the element's handle as a number, for one walk: texts naming the same handle name
+    // the same element, and a text that is no handle names none.
+    std::unordered_map<std::uint64_t, VistaLayout> vistas_;
+    QHash<QString, QString> rotasLayoutFio_;  // wire key (and key + "$") to route handle
+    QHash<QString, QString> paineisLayout_;   // panel key to view handle
     QHash<QString, QString> layoutPorRelacao_;
     std::vector<std::pair<OdDbObjectId, OdDbObjectId>> transicoes_;
     bool layoutCarregado_ = false, layoutMapeado_ = false, transicoesCarregadas_ = false;

@@ -5,6 +5,7 @@
 #include "CEAtributo.h"
 #include "CEListaAtributos.h"
 
+#include <algorithm>
 #include <bit>
 #include <cmath>
 #include <cstdint>
@@ -15,6 +16,9 @@ namespace {
 
 // A vertex counts only when it lies strictly closer to the point than this.
 constexpr double kDistanciaMaxima = 999.0;
+
+// Chains of up to this many stretches are checked for repeats without a set.
+constexpr std::size_t kCadeiaCurta = 16;
 
 double Distancia(const CEPonto& a, const CEPonto& b) {
     return std::sqrt((a.x - b.x) * (a.x - b.x) + (a.y - b.y) * (a.y - b.y) +
@@ -148,8 +152,9 @@ bool CCFioDataReader::PosicaoLayout(const QString& elemento, const QString& cone
     VistaLayout lida;
     const VistaLayout* vista = nullptr;
     if (composicao_) {
-        auto achada = vistas_.find(elemento);
-        if (achada == vistas_.end()) achada = vistas_.emplace(elemento, LeVista(elemento)).first;
+        const std::uint64_t handle = ZVString(elemento).ParaHandle();
+        auto achada = vistas_.find(handle);
+        if (achada == vistas_.end()) achada = vistas_.emplace(handle, LeVista(elemento)).first;
         vista = &achada->second;
     } else {
         lida = LeVista(elemento);
@@ -217,7 +222,7 @@ QString CCFioDataReader::ComprimentoFio(const QString& chave, const CEPonto& ini
             CarregaTransicoes();
         }
     }
-    const QString texto = QString::asprintf("%f", comprimento);
+    const QString texto = ZVString::DeReal(comprimento);
     comprimentos_.emplace(std::move(memoria), texto);
     return texto;
 }
@@ -225,10 +230,19 @@ QString CCFioDataReader::ComprimentoFio(const QString& chave, const CEPonto& ini
 void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const QStringList& elementos,
                                           const Trechos* trechos) {
     if (!primeiro || elementos.isEmpty()) return;
+    // The chain up to its first repeat. Most wires have a few stretches: those are looked
+    // for in the chain itself, and only a long chain gets a set.
     std::vector<CEItemLista*> cadeia;
     std::unordered_set<CEItemLista*> vistos;
-    for (CEItemLista* item = primeiro; item && vistos.insert(item).second; item = item->ligado)
+    for (CEItemLista* item = primeiro; item; item = item->ligado) {
+        if (cadeia.size() < kCadeiaCurta) {
+            if (std::find(cadeia.begin(), cadeia.end(), item) != cadeia.end()) break;
+        } else {
+            if (vistos.empty()) vistos.insert(cadeia.begin(), cadeia.end());
+            if (!vistos.insert(item).second) break;
+        }
         cadeia.push_back(item);
+    }
     const QString campo = CampoFio(*primeiro);
     if (campo.isEmpty()) return;
     const QString chave = primeiro->valorCampo(campo);

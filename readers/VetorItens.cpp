@@ -1,9 +1,13 @@
 #include "VetorItens.h"
 
+#include "ZVString.h"
+
 #include <QHash>
+#include <QStringView>
 
 #include <algorithm>
 #include <cstdint>
+#include <functional>
 #include <unordered_set>
 
 void VetorItens::juntarSemRepetir(const VetorItens& origem) {
@@ -71,6 +75,52 @@ int VetorItens::compararItens(const CEItemLista* a, const CEItemLista* b,
 
 namespace {
 
+// The distinct texts of one field, each with its natural form; the forms lie side by side
+// in one buffer, so sorting them reads contiguous memory and makes no text per value.
+class TextosDistintos {
+public:
+    // Room for up to `n` distinct texts.
+    explicit TextosDistintos(size_t n) {
+        size_t lugares = 16;
+        while (lugares < 2 * n)
+            lugares *= 2;
+        tabela_.assign(lugares, kLivre);
+    }
+    // The number of the text, given a new one when first seen. The text must outlive this.
+    std::uint32_t numero(const QString& texto) {
+        const size_t mascara = tabela_.size() - 1;
+        for (size_t i = qHash(texto) & mascara;; i = (i + 1) & mascara) {
+            std::uint32_t& lugar = tabela_[i];
+            if (lugar == kLivre) {
+                lugar = std::uint32_t(textos_.size());
+                textos_.push_back(&texto);
+                inicios_.push_back(std::uint32_t(naturais_.size()));
+                ZVString::AcrescentaFormaNatural(texto, naturais_);
+                return lugar;
+            }
+            if (*textos_[lugar] == texto) return lugar;
+        }
+    }
+    size_t size() const { return textos_.size(); }
+    // The order of two texts: by natural form, then by the raw text ("01" before "1").
+    bool antes(std::uint32_t a, std::uint32_t b) const {
+        if (const int c = natural(a).compare(natural(b)); c != 0) return c < 0;
+        return textos_[a]->compare(*textos_[b]) < 0;
+    }
+
+private:
+    static constexpr std::uint32_t kLivre = ~std::uint32_t(0);
+    QStringView natural(std::uint32_t d) const {
+        const std::uint32_t fim =
+            d + 1 < inicios_.size() ? inicios_[d + 1] : std::uint32_t(naturais_.size());
+        return QStringView(naturais_.data() + inicios_[d], qsizetype(fim - inicios_[d]));
+    }
+    std::vector<std::uint32_t> tabela_;
+    std::vector<const QString*> textos_;
+    std::vector<std::uint32_t> inicios_;
+    std::vector<char16_t> naturais_;
+};
+
 // Ties keep their first order when `estavel`; else they fall where the sort leaves them.
 void OrdenaItens(VetorItens& itens, const QStringList& campos, bool estavel) {
     if (campos.isEmpty() || itens.size() < 2) return;
@@ -81,15 +131,12 @@ void OrdenaItens(VetorItens& itens, const QStringList& campos, bool estavel) {
     // items tie on the first fields. Two places compare as their texts do, so the sort below
     // makes the very same moves as one comparing the texts.
     std::vector<std::uint32_t> postos(n * k);
-    QHash<QString, std::uint32_t> indice;
-    std::vector<Chave> distintas;
     std::vector<std::uint32_t> ordemDistintas, lugar;
     static const QString kVazio;
     for (size_t c = 0; c < k; ++c) {
-        indice.clear();
-        distintas.clear();
+        TextosDistintos distintas(n);
         // The field's number is found once, and the texts are read where the items hold
-        // them; a run of items with one text (a strip's terminals) asks the index once.
+        // them; a run of items with one text (a strip's terminals) asks the table once.
         const std::uint32_t numero = CamposItem::numeroSeHouver(campos[int(c)]);
         const QString* anterior = nullptr;
         std::uint32_t postoAnterior = 0;
@@ -99,12 +146,7 @@ void OrdenaItens(VetorItens& itens, const QStringList& campos, bool estavel) {
                                         : nullptr;
             const QString& valor = achado ? *achado : kVazio;
             if (!anterior || valor != *anterior) {
-                auto it = indice.constFind(valor);
-                if (it == indice.constEnd()) {
-                    it = indice.insert(valor, std::uint32_t(distintas.size()));
-                    distintas.push_back({ZVString::FormaNatural(valor), valor});
-                }
-                postoAnterior = it.value();
+                postoAnterior = distintas.numero(valor);
                 anterior = &valor;
             }
             postos[i * k + c] = postoAnterior;
@@ -113,9 +155,7 @@ void OrdenaItens(VetorItens& itens, const QStringList& campos, bool estavel) {
         for (size_t d = 0; d < ordemDistintas.size(); ++d)
             ordemDistintas[d] = std::uint32_t(d);
         std::sort(ordemDistintas.begin(), ordemDistintas.end(),
-                  [&](std::uint32_t a, std::uint32_t b) {
-                      return CompararChaves(distintas[a], distintas[b]) < 0;
-                  });
+                  [&distintas](std::uint32_t a, std::uint32_t b) { return distintas.antes(a, b); });
         lugar.resize(distintas.size());
         for (size_t d = 0; d < ordemDistintas.size(); ++d)
             lugar[ordemDistintas[d]] = std::uint32_t(d);
@@ -164,6 +204,9 @@ VetorItens VetorItens::filtrar(const std::vector<std::pair<QString, QString>>& p
 }
 
 void VetorItens::destruirItens() {
+    // In the order the items lie in memory, not the list's: a sorted list visits them all
+    // over the heap, and each one's fields were made next to it.
+    std::sort(begin(), end(), std::less<CEItemLista*>());
     for (CEItemLista* item : *this)
         delete item;
     clear();

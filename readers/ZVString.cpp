@@ -1,6 +1,8 @@
 #include "ZVString.h"
 
+#include <charconv>
 #include <cstdio>
+#include <string>
 
 namespace {
 
@@ -75,11 +77,15 @@ bool ZVString::DivideEmTres(const QString& separadores, QString& primeiro, QStri
 }
 
 ZVString ZVString::DeReal(double valor, int precisao) {
+    // What printf writes for "%.*f" (six digits by default), made without going through the
+    // format machinery: every length and total of a list passes here.
     char buffer[512];
-    if (precisao >= 0)
-        std::snprintf(buffer, sizeof buffer, "%.*f", precisao, valor);
-    else
-        std::snprintf(buffer, sizeof buffer, "%f", valor);
+    const int digitos = precisao >= 0 ? precisao : 6;
+    const std::to_chars_result feito =
+        std::to_chars(buffer, buffer + sizeof buffer, valor, std::chars_format::fixed, digitos);
+    if (feito.ec == std::errc())
+        return ZVString(QString::fromLatin1(buffer, int(feito.ptr - buffer)));
+    std::snprintf(buffer, sizeof buffer, "%.*f", digitos, valor);
     return ZVString(QString::fromLatin1(buffer));
 }
 
@@ -147,10 +153,12 @@ QString ZVString::Hora(const QTime& hora) {
                    DoisDigitos(hora.second()));
 }
 
-QString ZVString::FormaNatural(const QString& texto) {
+namespace {
+
+// The natural form of the text appended to `destino`, one code unit at a time.
+template <class Destino>
+void AcrescentaNatural(const QString& texto, Destino& destino) {
     constexpr int kLargura = 10;
-    QString natural;
-    natural.reserve(texto.size() + kLargura);
     const QChar* p = texto.constData();
     const QChar* fim = p + texto.size();
     while (p < fim) {
@@ -159,11 +167,25 @@ QString ZVString::FormaNatural(const QString& texto) {
             ++p;
         const int digitos = int(p - inicio);
         if (digitos == 0) {
-            natural += *p++;
+            destino.push_back(char16_t((p++)->unicode()));
             continue;
         }
-        if (digitos < kLargura) natural += QString(kLargura - digitos, '0');
-        natural.append(inicio, digitos);
+        for (int i = digitos; i < kLargura; ++i)
+            destino.push_back(u'0');
+        for (const QChar* d = inicio; d < p; ++d)
+            destino.push_back(char16_t(d->unicode()));
     }
-    return natural;
+}
+
+}  // namespace
+
+QString ZVString::FormaNatural(const QString& texto) {
+    std::u16string natural;
+    natural.reserve(size_t(texto.size()) + 10);
+    AcrescentaNatural(texto, natural);
+    return QString(reinterpret_cast<const QChar*>(natural.data()), int(natural.size()));
+}
+
+void ZVString::AcrescentaFormaNatural(const QString& texto, std::vector<char16_t>& destino) {
+    AcrescentaNatural(texto, destino);
 }

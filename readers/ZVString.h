@@ -6,6 +6,7 @@
 #include <QStringList>
 
 #include <cstdint>
+#include <vector>
 
 class ZVString : public QString {
 public:
@@ -46,4 +47,6 @@ public:
     // The natural form: every run of fewer than ten digits is padded with zeros in front
     // to ten digits, so "2" sorts before "10"; longer runs stay as they are.
     static QString FormaNatural(const QString& texto);
+    // The same form appended to `destino`, for many texts kept side by side.
+    static void AcrescentaFormaNatural(const QString& texto, std::vector<char16_t>& destino);
 };

@@ -11,6 +11,7 @@
 
 #include <algorithm>
 #include <cstdint>
+#include <cstdio>
 #include <memory>
 #include <vector>
 
@@ -103,6 +104,21 @@ TEST(ZVStringTest, PrefixNumbersAndHandles) {
     EXPECT_EQ(ZVString("fFfFfFfFfFfFfFf").ParaHandle(), 0xFFFFFFFFFFFFFFFu);
     EXPECT_EQ(ZVString("FFFFFFFFFFFFFFFF").ParaHandle(), 0xFFFFFFFFFFFFFFFFu);
     EXPECT_EQ(ZVString(" 2AF ").ParaHandle(), 0x2AFu);
+}
+
+TEST(ZVStringTest, RealsAreWrittenAsPrintfWritesThem) {
+    // Ties in binary round to even, as printf does; signs, zeros and the large and the tiny
+    // as it writes them too.
+    const double valores[] = {0.125, 0.375, 2.5,  3.5,    -2.5,        1.0 / 3.0, 2.456,
+                              -0.0,  0.0,   1e-7, 5e-7,   123456.789,  1e20,      -1e22,
+                              1e300, 0.5,   1.5,  0.0625, 999.9999995, 1150.0,    0.045};
+    for (const double v : valores)
+        for (const int precisao : {-1, 0, 1, 2, 3, 6, 9}) {
+            char esperado[512];
+            std::snprintf(esperado, sizeof esperado, "%.*f", precisao < 0 ? 6 : precisao, v);
+            EXPECT_EQ(ZVString::DeReal(v, precisao), QString::fromLatin1(esperado))
+                << v << " " << precisao;
+        }
 }
 
 TEST(ZVStringTest, NaturalFormPadsShortDigitRunsOnly) {
@@ -432,6 +448,58 @@ TEST(OrderingTest, TiedItemsEndUpWhereAnItemByItemComparisonSortPutsThem) {
         }
     EXPECT_GT(empates, 300);
     EXPECT_GT(trocados, 0);
+}
+
+TEST(OrderingTest, ManyDistinctTextsSortAsTheirComparisonDoes) {
+    // Thousands of distinct texts, with digit runs short and long, leading zeros and texts
+    // that differ only there, many appearing more than once and some fields absent: the
+    // order must still be the one a field-by-field comparison gives.
+    Itens itens;
+    VetorItens v;
+    std::uint32_t semente = 5;
+    auto sorteio = [&semente](std::uint32_t limite) {
+        semente = semente * 1103515245u + 12345u;
+        return (semente >> 16) % limite;
+    };
+    auto texto = [&sorteio]() {
+        QString t;
+        for (std::uint32_t partes = 1 + sorteio(4); partes > 0; --partes) {
+            if (sorteio(2)) {
+                t += QChar(u"AaBx-:"[sorteio(6)]);
+            } else {
+                if (sorteio(5) == 0) t += '0';
+                t += QString::number(sorteio(3) == 0 ? 100000000000ull + sorteio(50) : sorteio(40));
+            }
+        }
+        return t;
+    };
+    for (int i = 0; i < 3000; ++i) {
+        CEItemLista* item = itens.novo({{"ID", ""}});
+        item->definirCampoInteiro("ID", i);
+        item->definirCampo("A", texto());
+        if (sorteio(7) != 0) item->definirCampo("B", texto());
+        v.push_back(item);
+    }
+    const QStringList campos = {"B", "A"};
+    QSet<QString> distintos;
+    for (const CEItemLista* item : v)
+        distintos.insert(item->valorCampo("A"));
+    EXPECT_GT(distintos.size(), 1000);
+    EXPECT_LT(distintos.size(), 3000);
+    VetorItens esperado = v;
+    std::sort(esperado.begin(), esperado.end(), [&](const CEItemLista* a, const CEItemLista* b) {
+        return VetorItens::compararItens(a, b, campos) < 0;
+    });
+    VetorItens estavel = v;
+    std::stable_sort(estavel.begin(), estavel.end(),
+                     [&](const CEItemLista* a, const CEItemLista* b) {
+                         return VetorItens::compararItens(a, b, campos) < 0;
+                     });
+    VetorItens ordenado = v;
+    ordenado.ordenar(campos);
+    EXPECT_EQ(Valores(ordenado, "ID"), Valores(esperado, "ID"));
+    v.ordenarEstavel(campos);
+    EXPECT_EQ(Valores(v, "ID"), Valores(estavel, "ID"));
 }
 
 TEST(OrderingTest, AStableSortKeepsTiedItemsInTheirFirstOrder) {

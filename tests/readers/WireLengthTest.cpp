@@ -204,6 +204,41 @@ TEST_F(WireLengthTest, StretchesBetweenTheSamePointsShareOneAnswer) {
     EXPECT_EQ(leitor.ComprimentoFio("8", a, b), "0.000000");
 }
 
+TEST_F(WireLengthTest, AChainThatComesBackOnItselfIsMeasuredOncePerStretch) {
+    // Terminals with views along one route, each gap 10 longer than the one before, so the
+    // length an item gets tells which stretch of the list it was measured as.
+    CICad::SetRealLisp("PBLCOMPFIOPORCENTO", 0.0);
+    CICad::SetRealLisp("PBLCOMPFIOABSOLUTO", 0.0);
+    constexpr int kElementos = 25;
+    QStringList elementos;
+    std::vector<zvdb::Point3> vertices;
+    double x = 0;
+    for (int k = 0; k < kElementos; ++k) {
+        zvdb::BlockReference* b = borne("X9", std::to_string(k + 1), {400.0 + 20 * k, 400, 0});
+        vista(*b, {x, 0, 0}, {});
+        elementos << handle(b);
+        vertices.push_back({x, 0, 0});
+        x += 10 * (k + 1);
+    }
+    rota(vertices, "12");
+    CCFioDataReader leitor;
+    // Chains short and long, each linked back to its second item at its end: every item is
+    // measured once, as the stretch of its place in the chain.
+    for (const int n : {3, kElementos - 1}) {
+        std::vector<std::unique_ptr<CEItemLista>> cadeia;
+        for (int k = 0; k < n; ++k) {
+            cadeia.push_back(std::make_unique<CEItemLista>());
+            cadeia.back()->definirCampo("FIO", "12");
+            if (k > 0) cadeia[size_t(k - 1)]->ligado = cadeia.back().get();
+        }
+        cadeia.back()->ligado = cadeia[1].get();
+        leitor.CalculaComprimentos(cadeia.front().get(), elementos);
+        for (int k = 0; k < n; ++k)
+            EXPECT_EQ(cadeia[size_t(k)]->valorCampo("COMPRIMENTO").toDouble(), 10.0 * (k + 1))
+                << "chain of " << n << ", item " << k;
+    }
+}
+
 TEST_F(WireLengthTest, ASecondRouteOfTheSameWireIsSearchedToo) {
     CCFioDataReader leitor;
     rota({{0, 0, 0}, {0, 100, 0}}, "9");
