@@ -15,10 +15,13 @@
 #include <QFileInfo>
 #include <QRandomGenerator>
 
+#include <algorithm>
 #include <cmath>
 #include <cstdint>
 #include <exception>
+#include <forward_list>
 #include <optional>
+#include <span>
 #include <string>
 #include <string_view>
 #include <unordered_map>
@@ -95,6 +98,70 @@ const TextosDefinicao& Textos(const zvdb::AttributeLayout& leitura) {
     return porLeitura[leitura.serial()] = {Q(leitura.tag()).trimmed(),
                                            Q(leitura.defaultValue()).trimmed()};
 }
+
+// What a new reference takes: its block's variable layouts and the value given for each
+// (none: the default), in UTF-8. For the few attributes of a row or a symbol everything
+// stays on the stack: plain ASCII values, the most, in one buffer, others in strings.
+class NovosAtributos {
+public:
+    static constexpr std::size_t kNaPilha = 16;
+    std::span<zvdb::AttributeLayout* const> leituras;
+    std::span<const std::optional<std::string_view>> dados;
+    zvdb::Point3 base;
+
+    void Le(std::span<zvdb::AttributeLayout* const> variaveis, const CEValoresAtributos& valores) {
+        // A copy: asking for the values must not leave the layouts in the air.
+        zvdb::AttributeLayout** copia = leiturasPilha_;
+        if (variaveis.size() > kNaPilha) {
+            leiturasHeap_.resize(variaveis.size());
+            copia = leiturasHeap_.data();
+        }
+        std::copy(variaveis.begin(), variaveis.end(), copia);
+        leituras = {copia, variaveis.size()};
+        if (!valores) return;
+        std::optional<std::string_view>* lidos = dadosPilha_;
+        if (variaveis.size() > kNaPilha) {
+            dadosHeap_.resize(variaveis.size());
+            lidos = dadosHeap_.data();
+        }
+        for (std::size_t i = 0; i < leituras.size(); ++i) {
+            const TextosDefinicao& textosDef = Textos(*leituras[i]);
+            const std::optional<QString> valor = valores(textosDef.tag, textosDef.padrao);
+            lidos[i] = valor ? std::optional<std::string_view>(Guarda(*valor)) : std::nullopt;
+        }
+        dados = {lidos, leituras.size()};
+    }
+    void Esquece() {
+        leituras = {};
+        dados = {};
+    }
+
+private:
+    std::string_view Guarda(const QString& texto) {
+        const auto tamanho = static_cast<std::size_t>(texto.size());
+        if (tamanho <= sizeof buffer_ - usado_) {
+            const QChar* letras = texto.constData();
+            char* destino = buffer_ + usado_;
+            std::size_t i = 0;
+            for (; i < tamanho && letras[i].unicode() < 0x80; ++i)
+                destino[i] = static_cast<char>(letras[i].unicode());
+            if (i == tamanho) {
+                usado_ += tamanho;
+                return {destino, tamanho};
+            }
+        }
+        outros_.push_front(U8(texto));
+        return outros_.front();
+    }
+
+    zvdb::AttributeLayout* leiturasPilha_[kNaPilha];
+    std::optional<std::string_view> dadosPilha_[kNaPilha];
+    std::vector<zvdb::AttributeLayout*> leiturasHeap_;
+    std::vector<std::optional<std::string_view>> dadosHeap_;
+    char buffer_[1024];
+    std::size_t usado_ = 0;
+    std::forward_list<std::string> outros_;  // what views point into stays where it is
+};
 
 }  // namespace
 
@@ -201,34 +268,20 @@ OdDbObjectId CICad::InsereReferencia(const OdDbObjectId& bloco, std::string_view
     // The block's variable definitions and the values given for them come first: the
     // reference is then made marked for its attributes, and each attribute with its value,
     // placed from the values just given, instead of being found and set again.
-    std::vector<zvdb::AttributeLayout*> leituras;
-    zvdb::Point3 base;
-    std::vector<std::optional<std::string_view>> dados;
-    std::vector<std::string> textos;  // what `dados` points into
+    NovosAtributos novos;
     try {
-        const auto variaveis = db->attributeLayouts().variableLayouts(*db, *definicao, &base);
-        leituras.assign(variaveis.begin(), variaveis.end());
-        if (valores) {
-            dados.reserve(leituras.size());
-            textos.reserve(leituras.size());
-            for (const zvdb::AttributeLayout* leitura : leituras) {
-                const TextosDefinicao& textosDef = Textos(*leitura);
-                const std::optional<QString> valor = valores(textosDef.tag, textosDef.padrao);
-                dados.emplace_back();
-                if (!valor) continue;
-                textos.push_back(U8(*valor));
-                dados.back() = textos.back();
-            }
-        }
+        zvdb::Point3 base;
+        novos.Le(db->attributeLayouts().variableLayouts(*db, *definicao, &base), valores);
+        novos.base = base;
     } catch (const std::exception& erro) {
         Log("CICAd::CriarAtributos: " + QString::fromUtf8(erro.what()));
-        leituras.clear();
-        dados.clear();
+        novos.Esquece();
     }
     zvdb::BlockReference* ref = db->addBlockReference(*modelo, *definicao, ponto, {1, 1, 1}, graus,
-                                                      layer, !leituras.empty());
+                                                      layer, !novos.leituras.empty());
     try {
-        ref->addAttributesFromLayouts(base, ponto, {1, 1, 1}, graus, leituras, dados);
+        ref->placeAttributesFromLayouts(novos.base, ponto, {1, 1, 1}, graus, novos.leituras,
+                                        novos.dados);
     } catch (const std::exception& erro) {
         Log("CICAd::CriarAtributos: " + QString::fromUtf8(erro.what()));
     }

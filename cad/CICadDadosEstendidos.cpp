@@ -157,11 +157,7 @@ void CICad::SetXDataTextos(const OdDbObjectId& id, std::string_view aplicacao,
                            const std::vector<std::string_view>& textos) {
     zvdb::DbObject* objeto = Objeto(id);
     if (!objeto) return;
-    std::vector<zvdb::Tag> tags;
-    tags.reserve(textos.size());
-    for (const std::string_view texto : textos)
-        tags.push_back({std::int16_t(1000), texto});
-    objeto->setXData(aplicacao, tags);
+    objeto->setXDataTexts(aplicacao, textos);
 }
 
 OdDbObjectId CICad::IdDoHandle(const QString& handle, zvdb::Database* database) {

@@ -125,6 +125,8 @@ public:
                                                       Point3* basePoint = nullptr);
     // A real as tag text, answered from the values given lately when it is one of them.
     std::string_view real(Database& target, double value);
+    // The same as a number of texts(), as texts().shared(real(...)) answers it.
+    std::uint32_t realNumber(Database& target, double value);
     // The SEQEND that closes a reference's attributes: its layer is the one hole.
     const TagPattern& seqendPattern(bool paperSpace);
     // A new reference's tags as Database::addBlockReference makes them, for references in
@@ -160,7 +162,9 @@ private:
     struct Memo {
         std::uint64_t bits = 0;
         std::string_view text;
+        std::uint32_t number = 0;  // of texts_; 0 until asked for
     };
+    Memo& memo(Database& target, double value);
     // A strip or list page places a few hundred distinct coordinates over and over: the memo
     // holds a page's worth.
     static constexpr int kMemoBits = 10;

@@ -15,6 +15,7 @@
 #include "XRecord.h"
 
 #include <atomic>
+#include <functional>
 
 namespace zvdb {
 
@@ -100,6 +101,8 @@ void Database::swapContents(Database& other) {
     warnings_.swap(other.warnings_);
     std::swap(namedObjects_, other.namedObjects_);
     layouts_.swap(other.layouts_);
+    modelSpace_ = KnownSpace{};
+    other.modelSpace_ = KnownSpace{};
     std::swap(knownApplications_, other.knownApplications_);
     std::swap(nextKnown_, other.nextKnown_);
     for (const auto& object : storage_)
@@ -247,7 +250,17 @@ std::vector<BlockRecord*> Database::blocks() const {
 }
 
 BlockRecord* Database::modelSpace() const {
-    return block("*Model_Space");
+    KnownSpace& known = modelSpace_;
+    // The table's look-up by name answers the same while its index and the record stand.
+    if (known.record && known.table->indexChanges() == known.index && !known.record->isErased())
+        return known.record;
+    BlockRecord* found = block("*Model_Space");
+    known = KnownSpace{};
+    if (found) {
+        const SymbolTable* blocks = table("BLOCK_RECORD");
+        known = KnownSpace{found, blocks, blocks->indexChanges()};
+    }
+    return found;
 }
 
 BlockRecord* Database::paperSpace() const {
@@ -298,6 +311,15 @@ bool Database::registerApplication(std::string_view application) {
     // first, byte for byte, and their records asked whether they still bear them.
     for (const KnownApplication& known : knownApplications_) {
         if (!known.record || known.name != application || known.record->isErased()) continue;
+        // A new name is a new value in the tag, or new tags: the same view where the name
+        // stood is the same name.
+        const auto tags = known.record->tags();
+        const std::less<const Tag*> before;
+        if (known.nameTag && !before(known.nameTag, tags.data()) &&
+            before(known.nameTag, tags.data() + tags.size()) &&
+            known.nameTag->value.data() == known.nameText.data() &&
+            known.nameTag->value.size() == known.nameText.size())
+            return false;
         const std::string_view name = known.record->text(2);
         if (name == application || TagValues::sameName(name, application)) return false;
     }
@@ -306,7 +328,12 @@ bool Database::registerApplication(std::string_view application) {
     const bool made = record == nullptr;
     if (made) record = createTableRecord("APPID", application, "AcDbRegAppTableRecord");
     if (record) {
-        knownApplications_[nextKnown_] = {record, std::string(application)};
+        KnownApplication known{record, std::string(application), nullptr, {}};
+        if (const int at = record->indexOf(2); at >= 0) {
+            known.nameTag = &record->tags()[static_cast<std::size_t>(at)];
+            known.nameText = known.nameTag->value;
+        }
+        knownApplications_[nextKnown_] = std::move(known);
         nextKnown_ = (nextKnown_ + 1) % knownApplications_.size();
     }
     return made && record != nullptr;
@@ -446,7 +473,7 @@ BlockReference* Database::addBlockReference(BlockRecord& owner, const BlockRecor
     PatternTexts& texts = layouts.texts();
     const std::uint64_t handle = allocateHandle();
     AttributeLayouts::ReferenceShape shape;
-    shape.paperSpace = owner.isPaperSpace();
+    shape.paperSpace = &owner != modelSpace() && owner.isPaperSpace();
     shape.scaled[0] = scale.x != 1.0;
     shape.scaled[1] = scale.y != 1.0;
     shape.scaled[2] = scale.z != 1.0;
@@ -457,7 +484,7 @@ BlockReference* Database::addBlockReference(BlockRecord& owner, const BlockRecor
     *hole++ = texts.shared(layer.empty() ? std::string_view("0") : storeShared(layer));
     const std::string_view name = block.name();
     *hole++ = texts.shared(&block.database() == this ? name : storeShared(name));
-    const auto real = [&](double value) { return texts.shared(layouts.real(*this, value)); };
+    const auto real = [&](double value) { return layouts.realNumber(*this, value); };
     *hole++ = real(position.x);
     *hole++ = real(position.y);
     *hole++ = real(position.z);
@@ -518,6 +545,18 @@ void Database::forgetLayout(const DbObject& definition) {
     if (layouts_) layouts_->forget(definition);
 }
 
+namespace {
+// Whether the object's flag (66 or 67) is set, as integer() == 1 answers, from its pattern
+// when the pattern fixes it.
+bool flagSet(const DbObject& object, int code) {
+    if (const TagPattern* pattern = object.pattern()) {
+        const int fixed = code == 66 ? pattern->attributesFollowFlag() : pattern->paperSpaceFlag();
+        if (fixed >= 0) return fixed == 1;
+    }
+    return object.integer(code) == 1;
+}
+}  // namespace
+
 Attribute* Database::addAttributeFromLayout(BlockReference& reference, AttributeLayout& layout,
                                             AttributeLayout::Placement& where,
                                             const std::optional<std::string_view>& value,
@@ -539,7 +578,7 @@ Attribute* Database::addAttributeFromLayout(BlockReference& reference, Attribute
     }
     reference.addSubEntity(attribute);
     if (first) {
-        if (reference.integer(66) != 1) reference.setInteger(66, 1, "AcDbBlockReference");
+        if (!flagSet(reference, 66)) reference.setInteger(66, 1, "AcDbBlockReference");
         if (!reference.seqend()) {
             // As ensureSeqend makes it, from values the drawing holds already.
             const std::uint64_t seqend = allocateHandle();
@@ -575,24 +614,24 @@ std::vector<Attribute*> Database::addAttributesFromDefinitions(
     return made;
 }
 
-std::vector<Attribute*> Database::addAttributesFromLayouts(
-    BlockReference& reference, std::span<AttributeLayout* const> layouts,
-    std::span<const std::optional<std::string_view>> values, const Transform& placement,
-    double heightScale, double rotation) {
-    std::vector<Attribute*> made;
-    if (layouts.empty()) return made;
-    made.reserve(layouts.size());
+void Database::addAttributesFromLayouts(BlockReference& reference,
+                                        std::span<AttributeLayout* const> layouts,
+                                        std::span<const std::optional<std::string_view>> values,
+                                        const Transform& placement, double heightScale,
+                                        double rotation, std::vector<Attribute*>* made) {
+    if (layouts.empty()) return;
+    if (made) made->reserve(made->size() + layouts.size());
     // The reference's list of attributes at its size at once.
     std::vector<Entity*>& subs = reference.children().subs;
     subs.reserve(subs.size() + layouts.size());
-    AttributeLayout::Placement where{placement, heightScale, rotation, reference.inPaperSpace(),
+    AttributeLayout::Placement where{placement, heightScale, rotation, flagSet(reference, 67),
                                      {},        {}};
     for (std::size_t i = 0; i < layouts.size(); ++i) {
         const std::optional<std::string_view> value =
             i < values.size() ? values[i] : std::optional<std::string_view>();
-        made.push_back(addAttributeFromLayout(reference, *layouts[i], where, value, i == 0));
+        Attribute* attribute = addAttributeFromLayout(reference, *layouts[i], where, value, i == 0);
+        if (made) made->push_back(attribute);
     }
-    return made;
 }
 
 Entity* Database::addVertex(Polyline& polyline, const Point3& p) {

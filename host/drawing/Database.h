@@ -154,11 +154,13 @@ public:
         BlockReference& reference, std::span<const Attribute* const> definitions,
         std::span<const std::optional<std::string_view>> values, const Transform& placement,
         double heightScale, double rotation);
-    // The same from the definitions' layouts (of this drawing, found by attributeLayouts()).
-    std::vector<Attribute*> addAttributesFromLayouts(
-        BlockReference& reference, std::span<AttributeLayout* const> layouts,
-        std::span<const std::optional<std::string_view>> values, const Transform& placement,
-        double heightScale, double rotation);
+    // The same from the definitions' layouts (of this drawing, found by attributeLayouts()),
+    // the attributes made put in `made` when it is given.
+    void addAttributesFromLayouts(BlockReference& reference,
+                                  std::span<AttributeLayout* const> layouts,
+                                  std::span<const std::optional<std::string_view>> values,
+                                  const Transform& placement, double heightScale, double rotation,
+                                  std::vector<Attribute*>* made);
     // What the definitions of this drawing's blocks give their attributes, worked out once.
     AttributeLayouts& attributeLayouts();
     Entity* addVertex(Polyline& polyline, const Point3& p);
@@ -223,11 +225,22 @@ private:
     // Room where new objects' tags are put together before they get their own.
     std::vector<Tag> scratch_;
     std::unique_ptr<AttributeLayouts> layouts_;
+    // Model space as modelSpace() found it last, good while the block table's index stays
+    // the same and the record is not erased (references go there by the thousand).
+    struct KnownSpace {
+        BlockRecord* record = nullptr;
+        const SymbolTable* table = nullptr;
+        std::uint64_t index = 0;
+    };
+    mutable KnownSpace modelSpace_;
     // The APPID records registerApplication found or made lately, with the names they were
     // asked by, in turns.
     struct KnownApplication {
         DbObject* record = nullptr;
         std::string name;
+        // The record's name tag as it stood then: while it stands so, the name is the same.
+        const Tag* nameTag = nullptr;
+        std::string_view nameText;
     };
     std::array<KnownApplication, 4> knownApplications_{};
     std::size_t nextKnown_ = 0;
