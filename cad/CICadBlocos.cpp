@@ -1,3 +1,4 @@
+#include "CETextosUtf8.h"
 #include "CICad.h"
 #include "CICadInterno.h"
 #include "app/DrawingFiles.h"
@@ -19,7 +20,6 @@
 #include <cmath>
 #include <cstdint>
 #include <exception>
-#include <forward_list>
 #include <optional>
 #include <span>
 #include <string>
@@ -101,7 +101,7 @@ const TextosDefinicao& Textos(const zvdb::AttributeLayout& leitura) {
 
 // What a new reference takes: its block's variable layouts and the value given for each
 // (none: the default), in UTF-8. For the few attributes of a row or a symbol everything
-// stays on the stack: plain ASCII values, the most, in one buffer, others in strings.
+// stays on the stack.
 class NovosAtributos {
 public:
     static constexpr std::size_t kNaPilha = 16;
@@ -127,7 +127,8 @@ public:
         for (std::size_t i = 0; i < leituras.size(); ++i) {
             const TextosDefinicao& textosDef = Textos(*leituras[i]);
             const std::optional<QString> valor = valores(textosDef.tag, textosDef.padrao);
-            lidos[i] = valor ? std::optional<std::string_view>(Guarda(*valor)) : std::nullopt;
+            lidos[i] =
+                valor ? std::optional<std::string_view>(textos_.Guarda(*valor)) : std::nullopt;
         }
         dados = {lidos, leituras.size()};
     }
@@ -137,30 +138,11 @@ public:
     }
 
 private:
-    std::string_view Guarda(const QString& texto) {
-        const auto tamanho = static_cast<std::size_t>(texto.size());
-        if (tamanho <= sizeof buffer_ - usado_) {
-            const QChar* letras = texto.constData();
-            char* destino = buffer_ + usado_;
-            std::size_t i = 0;
-            for (; i < tamanho && letras[i].unicode() < 0x80; ++i)
-                destino[i] = static_cast<char>(letras[i].unicode());
-            if (i == tamanho) {
-                usado_ += tamanho;
-                return {destino, tamanho};
-            }
-        }
-        outros_.push_front(U8(texto));
-        return outros_.front();
-    }
-
     zvdb::AttributeLayout* leiturasPilha_[kNaPilha];
     std::optional<std::string_view> dadosPilha_[kNaPilha];
     std::vector<zvdb::AttributeLayout*> leiturasHeap_;
     std::vector<std::optional<std::string_view>> dadosHeap_;
-    char buffer_[1024];
-    std::size_t usado_ = 0;
-    std::forward_list<std::string> outros_;  // what views point into stays where it is
+    CETextosUtf8 textos_;
 };
 
 }  // namespace

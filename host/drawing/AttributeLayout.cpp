@@ -265,7 +265,7 @@ const TagPattern& AttributeLayouts::referencePattern(const ReferenceShape& shape
 
 AttributeLayouts::Memo& AttributeLayouts::memo(Database& target, double value) {
     const auto bits = std::bit_cast<std::uint64_t>(value);
-    Memo& memo = reals_[(bits * 0x9E3779B97F4A7C15ull) >> (64 - kMemoBits)];
+    Memo& memo = reals_[slotOf(bits)];
     if (memo.text.empty() || memo.bits != bits)
         memo = Memo{bits, target.storeShared(TagValues::fromReal(value))};
     return memo;
@@ -275,7 +275,7 @@ std::string_view AttributeLayouts::real(Database& target, double value) {
     return memo(target, value).text;
 }
 
-std::uint32_t AttributeLayouts::realNumber(Database& target, double value) {
+std::uint32_t AttributeLayouts::newRealNumber(Database& target, double value) {
     Memo& known = memo(target, value);
     if (known.number == 0) known.number = texts_.shared(known.text);
     return known.number;

@@ -103,6 +103,8 @@ void Database::swapContents(Database& other) {
     layouts_.swap(other.layouts_);
     modelSpace_ = KnownSpace{};
     other.modelSpace_ = KnownSpace{};
+    lastReference_ = LastReference{};
+    other.lastReference_ = LastReference{};
     std::swap(knownApplications_, other.knownApplications_);
     std::swap(nextKnown_, other.nextKnown_);
     for (const auto& object : storage_)
@@ -304,39 +306,66 @@ bool Database::isApplicationRegistered(std::string_view application) const {
     return appids && appids->find(application);
 }
 
+namespace {
+// Whether the record's name still stands in the tag where it was found: a new name is a new
+// value there, or new tags.
+bool stillNamed(const DbObject& record, const Tag* nameTag, std::string_view nameText) {
+    const auto tags = record.tags();
+    const std::less<const Tag*> before;
+    return nameTag && !before(nameTag, tags.data()) && before(nameTag, tags.data() + tags.size()) &&
+           nameTag->value.data() == nameText.data() && nameTag->value.size() == nameText.size();
+}
+
+// The record's name tag, where text(2) finds it; null when it has none.
+const Tag* nameTagOf(const DbObject& record) {
+    const int at = record.indexOf(2);
+    return at >= 0 ? &record.tags()[static_cast<std::size_t>(at)] : nullptr;
+}
+}  // namespace
+
 bool Database::registerApplication(std::string_view application) {
-    if (application.empty()) return false;
+    bool made = false;
+    knownApplication(application, made);
+    return made;
+}
+
+Database::KnownApplication* Database::knownApplication(std::string_view application, bool& made) {
+    made = false;
+    if (application.empty()) return nullptr;
     // Objects given extended data name the same few applications over and over, often in
     // turns (a block and the symbol it is tied to): the names asked lately are compared
     // first, byte for byte, and their records asked whether they still bear them.
-    for (const KnownApplication& known : knownApplications_) {
+    for (KnownApplication& known : knownApplications_) {
         if (!known.record || known.name != application || known.record->isErased()) continue;
-        // A new name is a new value in the tag, or new tags: the same view where the name
-        // stood is the same name.
-        const auto tags = known.record->tags();
-        const std::less<const Tag*> before;
-        if (known.nameTag && !before(known.nameTag, tags.data()) &&
-            before(known.nameTag, tags.data() + tags.size()) &&
-            known.nameTag->value.data() == known.nameText.data() &&
-            known.nameTag->value.size() == known.nameText.size())
-            return false;
+        if (stillNamed(*known.record, known.nameTag, known.nameText)) return &known;
         const std::string_view name = known.record->text(2);
-        if (name == application || TagValues::sameName(name, application)) return false;
+        if (name == application || TagValues::sameName(name, application)) return &known;
     }
     SymbolTable* appids = table("APPID");
     DbObject* record = appids ? appids->find(application) : nullptr;
-    const bool made = record == nullptr;
+    made = record == nullptr;
     if (made) record = createTableRecord("APPID", application, "AcDbRegAppTableRecord");
-    if (record) {
-        KnownApplication known{record, std::string(application), nullptr, {}};
-        if (const int at = record->indexOf(2); at >= 0) {
-            known.nameTag = &record->tags()[static_cast<std::size_t>(at)];
-            known.nameText = known.nameTag->value;
-        }
-        knownApplications_[nextKnown_] = std::move(known);
-        nextKnown_ = (nextKnown_ + 1) % knownApplications_.size();
+    if (!record) {
+        made = false;
+        return nullptr;
     }
-    return made && record != nullptr;
+    KnownApplication& known = knownApplications_[nextKnown_];
+    const Tag* nameTag = nameTagOf(*record);
+    known = KnownApplication{record,
+                             std::string(application),
+                             nameTag,
+                             nameTag ? nameTag->value : std::string_view(),
+                             {}};
+    nextKnown_ = (nextKnown_ + 1) % knownApplications_.size();
+    return &known;
+}
+
+std::string_view Database::registeredName(std::string_view application) {
+    bool made = false;
+    KnownApplication* known = knownApplication(application, made);
+    if (!known) return storeShared(application);
+    if (known->stored.empty()) known->stored = storeShared(application);
+    return known->stored;
 }
 
 // System variables -------------------------------------------------------------------------
@@ -481,9 +510,23 @@ BlockReference* Database::addBlockReference(BlockRecord& owner, const BlockRecor
     shape.attributesFollow = attributesFollow;
     TagPattern::Values* own = layouts.referencePattern(shape).make(arena_);
     std::uint32_t* hole = own->values();
-    *hole++ = texts.shared(layer.empty() ? std::string_view("0") : storeShared(layer));
-    const std::string_view name = block.name();
-    *hole++ = texts.shared(&block.database() == this ? name : storeShared(name));
+    LastReference& last = lastReference_;
+    if (last.layerNumber == 0 || last.layer != layer) {
+        last.layer = layer;
+        last.layerNumber = texts.shared(layer.empty() ? std::string_view("0") : storeShared(layer));
+    }
+    *hole++ = last.layerNumber;
+    if (&block.database() != this) {
+        *hole++ = texts.shared(storeShared(block.name()));
+    } else {
+        if (last.block != &block || !stillNamed(block, last.nameTag, last.nameText)) {
+            last.block = &block;
+            last.nameTag = nameTagOf(block);
+            last.nameText = last.nameTag ? last.nameTag->value : std::string_view();
+            last.nameNumber = texts.shared(block.name());
+        }
+        *hole++ = last.nameNumber;
+    }
     const auto real = [&](double value) { return layouts.realNumber(*this, value); };
     *hole++ = real(position.x);
     *hole++ = real(position.y);
@@ -557,6 +600,17 @@ bool flagSet(const DbObject& object, int code) {
 }
 }  // namespace
 
+std::uint32_t Database::layerNumber(const Entity& entity) {
+    // A patterned entity holds its layer as a number already.
+    const DbObject& object = entity;
+    if (object.patterned_)
+        if (const int hole = object.pattern_->pattern->holeOf(8); hole >= 0)
+            if (const std::uint32_t number = object.pattern_->values()[hole]; number != 0)
+                return number;
+    const std::string_view layer = entity.layer();
+    return attributeLayouts().texts().shared(layer.empty() ? std::string_view("0") : layer);
+}
+
 Attribute* Database::addAttributeFromLayout(BlockReference& reference, AttributeLayout& layout,
                                             AttributeLayout::Placement& where,
                                             const std::optional<std::string_view>& value,
@@ -582,11 +636,9 @@ Attribute* Database::addAttributeFromLayout(BlockReference& reference, Attribute
         if (!reference.seqend()) {
             // As ensureSeqend makes it, from values the drawing holds already.
             const std::uint64_t seqend = allocateHandle();
-            const std::string_view layer = reference.layer();
             TagPattern::Values* own =
                 attributeLayouts().seqendPattern(where.paperSpace).make(arena_);
-            own->values()[0] =
-                attributeLayouts().texts().shared(layer.empty() ? std::string_view("0") : layer);
+            own->values()[0] = layerNumber(reference);
             reference.setSeqend(static_cast<Entity*>(
                 adopt(std::make_unique<Entity>(*this, *own, seqend, reference.handle()))));
         }

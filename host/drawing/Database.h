@@ -201,6 +201,8 @@ private:
     // The BLOCK and ENDBLK entities of a block record that has none.
     void addBlockEnds(BlockRecord& record, const Point3& basePoint = {});
     void ensureSeqend(Entity& parent);
+    // The entity's layer as a number of the pattern texts ("0" for none).
+    std::uint32_t layerNumber(const Entity& entity);
     Attribute* addAttributeFromLayout(BlockReference& reference, AttributeLayout& layout,
                                       AttributeLayout::Placement& where,
                                       const std::optional<std::string_view>& value, bool first);
@@ -241,7 +243,24 @@ private:
         // The record's name tag as it stood then: while it stands so, the name is the same.
         const Tag* nameTag = nullptr;
         std::string_view nameText;
+        std::string_view stored;  // `name` as storeShared gave it, once asked for
     };
+    // The entry that answers for the application, its record found or made (`made` set
+    // then); null for an empty name.
+    KnownApplication* knownApplication(std::string_view application, bool& made);
+    // The application registered, and its name as the drawing holds it for extended data.
+    std::string_view registeredName(std::string_view application);
+    // The layer and block of the reference made last, as numbers of the pattern texts: a
+    // writer places many references on one page, of a few blocks.
+    struct LastReference {
+        std::string layer;
+        std::uint32_t layerNumber = 0;
+        const BlockRecord* block = nullptr;
+        const Tag* nameTag = nullptr;
+        std::string_view nameText;
+        std::uint32_t nameNumber = 0;
+    };
+    LastReference lastReference_;
     std::array<KnownApplication, 4> knownApplications_{};
     std::size_t nextKnown_ = 0;
     std::uint64_t changes_ = 0;

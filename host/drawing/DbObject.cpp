@@ -445,9 +445,8 @@ std::pair<std::size_t, std::size_t> applicationGroup(std::span<const Tag> tags, 
 
 template <class Fill>
 void DbObject::setXDataWith(std::string_view application, std::size_t count, Fill&& fill) {
-    database_->registerApplication(application);
     // the same few application names on many objects: one copy each
-    const std::string_view name = database_->storeShared(application);
+    const std::string_view name = database_->registeredName(application);
     if (patterned_ && pattern_->pattern->takesXData()) {
         // The groups stay beside the object's values, in the arena at their size, made
         // there at once: the application's first group replaced where it is, or a new one
