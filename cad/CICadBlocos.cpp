@@ -88,15 +88,45 @@ struct TextosDefinicao {
     QString tag, padrao;
 };
 
+// Goes up when the table of texts below starts again: what was found there went with it.
+std::uint64_t geracaoTextos = 0;
+
 const TextosDefinicao& Textos(const zvdb::AttributeLayout& leitura) {
     // By the layout's serial, which no other layout shares: drawings that come and go leave
     // theirs behind, so the table starts again when it grows large.
     static std::unordered_map<std::uint64_t, TextosDefinicao> porLeitura;
     const auto conhecido = porLeitura.find(leitura.serial());
     if (conhecido != porLeitura.end()) return conhecido->second;
-    if (porLeitura.size() >= 4096) porLeitura.clear();
+    if (porLeitura.size() >= 4096) {
+        porLeitura.clear();
+        ++geracaoTextos;
+    }
     return porLeitura[leitura.serial()] = {Q(leitura.tag()).trimmed(),
                                            Q(leitura.defaultValue()).trimmed()};
+}
+
+// The texts of the layouts the last reference took, in order: the next one is most often
+// of the same block, and takes them without a look-up each. Good while the table above has
+// not started again.
+const TextosDefinicao* const* TextosDe(std::span<zvdb::AttributeLayout* const> leituras) {
+    static std::vector<std::uint64_t> seriais;
+    static std::vector<const TextosDefinicao*> textos;
+    static std::uint64_t geracao = 0;
+    bool iguais = geracao == geracaoTextos && seriais.size() == leituras.size();
+    for (std::size_t i = 0; iguais && i < leituras.size(); ++i)
+        iguais = seriais[i] == leituras[i]->serial();
+    while (!iguais) {
+        const std::uint64_t antes = geracaoTextos;
+        seriais.clear();
+        textos.clear();
+        for (const zvdb::AttributeLayout* leitura : leituras) {
+            textos.push_back(&Textos(*leitura));
+            seriais.push_back(leitura->serial());
+        }
+        geracao = geracaoTextos;
+        iguais = geracao == antes;  // else a text found first went with the table
+    }
+    return textos.data();
 }
 
 // What a new reference takes: its block's variable layouts and the value given for each
@@ -124,8 +154,19 @@ public:
             dadosHeap_.resize(variaveis.size());
             lidos = dadosHeap_.data();
         }
+        // Copied: a value asked for may place another reference.
+        const TextosDefinicao* textosPilha[kNaPilha];
+        std::vector<const TextosDefinicao*> textosHeap;
+        const TextosDefinicao** textos = textosPilha;
+        if (leituras.size() > kNaPilha) {
+            textosHeap.resize(leituras.size());
+            textos = textosHeap.data();
+        }
+        std::copy_n(TextosDe(leituras), leituras.size(), textos);
+        const std::uint64_t geracao = geracaoTextos;
         for (std::size_t i = 0; i < leituras.size(); ++i) {
-            const TextosDefinicao& textosDef = Textos(*leituras[i]);
+            const TextosDefinicao& textosDef =
+                geracao == geracaoTextos ? *textos[i] : Textos(*leituras[i]);
             const std::optional<QString> valor = valores(textosDef.tag, textosDef.padrao);
             lidos[i] =
                 valor ? std::optional<std::string_view>(textos_.Guarda(*valor)) : std::nullopt;

@@ -102,11 +102,20 @@ Transform BlockReference::transformOf(const Point3& base, const Point3& position
     const double radians = rotationDegrees * std::numbers::pi / 180.0;
     if (extrusion == Point3{0, 0, 1} && finite(base) && finite(position) && finite(scale) &&
         std::isfinite(radians)) {
+        // Unturned and unscaled, the product's linear part is the identity.
+        if (radians == 0.0 && scale == Point3{1, 1, 1}) {
+            Transform t;
+            t.move = Point3{position.x + 0.0, position.y + 0.0, position.z + 0.0};
+            t.move = t.apply(base * -1.0);
+            return t;
+        }
+        // The move is worked out as the product works it out; the linear part only differs
+        // where an entry is out of range (the product multiplies it by zero).
         const Transform t = alongZ(base, position, scale, radians);
-        bool allFinite = finite(t.move);
+        bool inRange = true;
         for (const double entry : t.linear)
-            allFinite = allFinite && std::isfinite(entry);
-        if (allFinite) return t;
+            inRange = inRange && std::isfinite(entry);
+        if (inRange) return t;
     }
     return Transform::fromOcs(extrusion) * Transform::translation(position) *
            Transform::rotationZ(radians) * Transform::scaling(scale.x, scale.y, scale.z) *

@@ -521,9 +521,10 @@ BlockReference* Database::addBlockReference(BlockRecord& owner, const BlockRecor
     } else {
         if (last.block != &block || !stillNamed(block, last.nameTag, last.nameText)) {
             last.block = &block;
-            last.nameTag = nameTagOf(block);
-            last.nameText = last.nameTag ? last.nameTag->value : std::string_view();
-            last.nameNumber = texts.shared(block.name());
+            last.nameTag = block.isPatterned() ? nullptr : nameTagOf(block);
+            // The tag text(2) reads, read once.
+            last.nameText = last.nameTag ? last.nameTag->value : block.name();
+            last.nameNumber = texts.shared(last.nameText);
         }
         *hole++ = last.nameNumber;
     }

@@ -57,15 +57,17 @@ std::span<Tag> StringArena::storeTags(std::span<const Tag> tags) {
 }
 
 void* StringArena::allocate(std::size_t bytes) {
+    // The room comes cleared, a chunk at a time: records made there (patterned objects'
+    // values) start empty without each clearing its own.
     constexpr std::size_t kRawChunk = 32 * 1024;
     bytes = (bytes + 7) & ~std::size_t(7);
     if (bytes > kRawChunk / 8) {
-        tagChunks_.push_back(std::make_unique_for_overwrite<std::byte[]>(bytes));
+        tagChunks_.push_back(std::make_unique<std::byte[]>(bytes));
         used_ += bytes;
         return tagChunks_.back().get();
     }
     if (bytes > rawLeft_) {
-        tagChunks_.push_back(std::make_unique_for_overwrite<std::byte[]>(kRawChunk));
+        tagChunks_.push_back(std::make_unique<std::byte[]>(kRawChunk));
         used_ += kRawChunk;
         rawCursor_ = tagChunks_.back().get();
         rawLeft_ = kRawChunk;
