@@ -100,15 +100,18 @@ Transform BlockReference::transformOf(const Point3& base, const Point3& position
                                       const Point3& scale, double rotationDegrees,
                                       const Point3& extrusion) {
     const double radians = rotationDegrees * std::numbers::pi / 180.0;
-    if (extrusion == Point3{0, 0, 1} && finite(base) && finite(position) && finite(scale) &&
-        std::isfinite(radians)) {
-        // Unturned and unscaled, the product's linear part is the identity.
+    if (extrusion == Point3{0, 0, 1} && finite(position)) {
+        // Unturned and unscaled, the product's linear part is the identity, and its move is
+        // this one whatever the base point.
         if (radians == 0.0 && scale == Point3{1, 1, 1}) {
             Transform t;
             t.move = Point3{position.x + 0.0, position.y + 0.0, position.z + 0.0};
             t.move = t.apply(base * -1.0);
             return t;
         }
+    }
+    if (extrusion == Point3{0, 0, 1} && finite(base) && finite(position) && finite(scale) &&
+        std::isfinite(radians)) {
         // The move is worked out as the product works it out; the linear part only differs
         // where an entry is out of range (the product multiplies it by zero).
         const Transform t = alongZ(base, position, scale, radians);

@@ -105,6 +105,8 @@ void Database::swapContents(Database& other) {
     other.modelSpace_ = KnownSpace{};
     lastReference_ = LastReference{};
     other.lastReference_ = LastReference{};
+    blockNames_ = {};
+    other.blockNames_ = {};
     std::swap(knownApplications_, other.knownApplications_);
     std::swap(nextKnown_, other.nextKnown_);
     for (const auto& object : storage_)
@@ -516,18 +518,8 @@ BlockReference* Database::addBlockReference(BlockRecord& owner, const BlockRecor
         last.layerNumber = texts.shared(layer.empty() ? std::string_view("0") : storeShared(layer));
     }
     *hole++ = last.layerNumber;
-    if (&block.database() != this) {
-        *hole++ = texts.shared(storeShared(block.name()));
-    } else {
-        if (last.block != &block || !stillNamed(block, last.nameTag, last.nameText)) {
-            last.block = &block;
-            last.nameTag = block.isPatterned() ? nullptr : nameTagOf(block);
-            // The tag text(2) reads, read once.
-            last.nameText = last.nameTag ? last.nameTag->value : block.name();
-            last.nameNumber = texts.shared(last.nameText);
-        }
-        *hole++ = last.nameNumber;
-    }
+    *hole++ = &block.database() != this ? texts.shared(storeShared(block.name()))
+                                        : blockNameNumber(block);
     const auto real = [&](double value) { return layouts.realNumber(*this, value); };
     *hole++ = real(position.x);
     *hole++ = real(position.y);
@@ -540,6 +532,19 @@ BlockReference* Database::addBlockReference(BlockRecord& owner, const BlockRecor
     auto* made = static_cast<BlockReference*>(adopt(std::move(reference)));
     owner.appendEntity(made);
     return made;
+}
+
+std::uint32_t Database::blockNameNumber(const BlockRecord& block) {
+    const auto at = reinterpret_cast<std::uintptr_t>(&block) * 0x9E3779B97F4A7C15ull;
+    KnownBlockName& known = blockNames_[at >> 60];
+    if (known.block != &block || !stillNamed(block, known.nameTag, known.nameText)) {
+        known.block = &block;
+        known.nameTag = block.isPatterned() ? nullptr : nameTagOf(block);
+        // The tag text(2) reads, read once.
+        known.nameText = known.nameTag ? known.nameTag->value : block.name();
+        known.number = attributeLayouts().texts().shared(known.nameText);
+    }
+    return known.number;
 }
 
 void Database::ensureSeqend(Entity& parent) {

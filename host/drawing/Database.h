@@ -255,12 +255,19 @@ private:
     struct LastReference {
         std::string layer;
         std::uint32_t layerNumber = 0;
+    };
+    LastReference lastReference_;
+    // The names of the blocks referenced lately, by block: a writer takes a few blocks in
+    // turns (a symbol and its accessories).
+    struct KnownBlockName {
         const BlockRecord* block = nullptr;
         const Tag* nameTag = nullptr;
         std::string_view nameText;
-        std::uint32_t nameNumber = 0;
+        std::uint32_t number = 0;
     };
-    LastReference lastReference_;
+    std::array<KnownBlockName, 16> blockNames_{};
+    // The block's name as a number of the pattern texts.
+    std::uint32_t blockNameNumber(const BlockRecord& block);
     std::array<KnownApplication, 4> knownApplications_{};
     std::size_t nextKnown_ = 0;
     std::uint64_t changes_ = 0;

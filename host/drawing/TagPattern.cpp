@@ -79,9 +79,11 @@ std::size_t TagPattern::xdataOffset() const {
 TagPattern::Values* TagPattern::make(StringArena& arena) const {
     const std::size_t size = takesXData_ ? xdataOffset() + sizeof(XDataRoom)
                                          : sizeof(Values) + holes_ * sizeof(std::uint32_t);
-    // The arena's raw room comes cleared: every hole is empty already.
     void* room = arena.allocate(size);
     auto* made = new (room) Values{this};
+    std::uint32_t* values = made->values();
+    for (std::size_t i = 0; i < holes_; ++i)
+        values[i] = 0;
     if (takesXData_) new (static_cast<char*>(room) + xdataOffset()) XDataRoom();
     return made;
 }

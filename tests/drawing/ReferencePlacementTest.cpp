@@ -79,11 +79,15 @@ TEST(ReferencePlacement, ValuesOutOfRangeTakeTheProductToo) {
     } cases[] = {{{0, 0, 0}, {infinite, 0, 0}, {1, 1, 1}},
                  {{1, 2, 3}, {4, 5, 6}, {huge, huge, 1}},
                  {{huge, 0, 0}, {-huge, 0, 0}, {4, 1, 1}},
-                 {{0, std::nan(""), 0}, {1, 1, 1}, {1, 1, 1}}};
-    for (const auto& c : cases) {
-        const auto made = bits(BlockReference::transformOf(c.base, c.position, c.scale, 30));
-        EXPECT_EQ(made, bits(composed(c.base, c.position, c.scale, 30)));
-    }
+                 {{0, std::nan(""), 0}, {1, 1, 1}, {1, 1, 1}},
+                 {{infinite, -infinite, 0}, {1, 2, 3}, {1, 1, 1}},
+                 {{1, 2, 3}, {0, -infinite, 0}, {1, 1, 1}}};
+    for (const auto& c : cases)
+        for (const double degrees : {0.0, 30.0}) {
+            const auto made =
+                bits(BlockReference::transformOf(c.base, c.position, c.scale, degrees));
+            EXPECT_EQ(made, bits(composed(c.base, c.position, c.scale, degrees)));
+        }
     // Another extrusion goes through the product whatever the values.
     const Point3 down{0, 0, -1};
     const Transform turned = BlockReference::transformOf({1, 2, 0}, {3, 4, 0}, {1, 1, 1}, 0, down);
