@@ -1,3 +1,4 @@
+#include "CETextosUtf8.h"
 #include "CICad.h"
 #include "CICadInterno.h"
 #include "app/DrawingFiles.h"
@@ -15,10 +16,12 @@
 #include <QFileInfo>
 #include <QRandomGenerator>
 
+#include <algorithm>
 #include <cmath>
 #include <cstdint>
 #include <exception>
 #include <optional>
+#include <span>
 #include <string>
 #include <string_view>
 #include <unordered_map>
@@ -85,16 +88,103 @@ struct TextosDefinicao {
     QString tag, padrao;
 };
 
+// Goes up when the table of texts below starts again: what was found there went with it.
+std::uint64_t geracaoTextos = 0;
+
 const TextosDefinicao& Textos(const zvdb::AttributeLayout& leitura) {
     // By the layout's serial, which no other layout shares: drawings that come and go leave
     // theirs behind, so the table starts again when it grows large.
     static std::unordered_map<std::uint64_t, TextosDefinicao> porLeitura;
     const auto conhecido = porLeitura.find(leitura.serial());
     if (conhecido != porLeitura.end()) return conhecido->second;
-    if (porLeitura.size() >= 4096) porLeitura.clear();
+    if (porLeitura.size() >= 4096) {
+        porLeitura.clear();
+        ++geracaoTextos;
+    }
     return porLeitura[leitura.serial()] = {Q(leitura.tag()).trimmed(),
                                            Q(leitura.defaultValue()).trimmed()};
 }
+
+// The texts of the layouts the last reference took, in order: the next one is most often
+// of the same block, and takes them without a look-up each. Good while the table above has
+// not started again.
+const TextosDefinicao* const* TextosDe(std::span<zvdb::AttributeLayout* const> leituras) {
+    static std::vector<std::uint64_t> seriais;
+    static std::vector<const TextosDefinicao*> textos;
+    static std::uint64_t geracao = 0;
+    bool iguais = geracao == geracaoTextos && seriais.size() == leituras.size();
+    for (std::size_t i = 0; iguais && i < leituras.size(); ++i)
+        iguais = seriais[i] == leituras[i]->serial();
+    while (!iguais) {
+        const std::uint64_t antes = geracaoTextos;
+        seriais.clear();
+        textos.clear();
+        for (const zvdb::AttributeLayout* leitura : leituras) {
+            textos.push_back(&Textos(*leitura));
+            seriais.push_back(leitura->serial());
+        }
+        geracao = geracaoTextos;
+        iguais = geracao == antes;  // else a text found first went with the table
+    }
+    return textos.data();
+}
+
+// What a new reference takes: its block's variable layouts and the value given for each
+// (none: the default), in UTF-8. For the few attributes of a row or a symbol everything
+// stays on the stack.
+class NovosAtributos {
+public:
+    static constexpr std::size_t kNaPilha = 16;
+    std::span<zvdb::AttributeLayout* const> leituras;
+    std::span<const std::optional<std::string_view>> dados;
+    zvdb::Point3 base;
+
+    void Le(std::span<zvdb::AttributeLayout* const> variaveis, const CEValoresAtributos& valores) {
+        // A copy: asking for the values must not leave the layouts in the air.
+        zvdb::AttributeLayout** copia = leiturasPilha_;
+        if (variaveis.size() > kNaPilha) {
+            leiturasHeap_.resize(variaveis.size());
+            copia = leiturasHeap_.data();
+        }
+        std::copy(variaveis.begin(), variaveis.end(), copia);
+        leituras = {copia, variaveis.size()};
+        if (!valores) return;
+        std::optional<std::string_view>* lidos = dadosPilha_;
+        if (variaveis.size() > kNaPilha) {
+            dadosHeap_.resize(variaveis.size());
+            lidos = dadosHeap_.data();
+        }
+        // Copied: a value asked for may place another reference.
+        const TextosDefinicao* textosPilha[kNaPilha];
+        std::vector<const TextosDefinicao*> textosHeap;
+        const TextosDefinicao** textos = textosPilha;
+        if (leituras.size() > kNaPilha) {
+            textosHeap.resize(leituras.size());
+            textos = textosHeap.data();
+        }
+        std::copy_n(TextosDe(leituras), leituras.size(), textos);
+        const std::uint64_t geracao = geracaoTextos;
+        for (std::size_t i = 0; i < leituras.size(); ++i) {
+            const TextosDefinicao& textosDef =
+                geracao == geracaoTextos ? *textos[i] : Textos(*leituras[i]);
+            const std::optional<QString> valor = valores(textosDef.tag, textosDef.padrao);
+            lidos[i] =
+                valor ? std::optional<std::string_view>(textos_.Guarda(*valor)) : std::nullopt;
+        }
+        dados = {lidos, leituras.size()};
+    }
+    void Esquece() {
+        leituras = {};
+        dados = {};
+    }
+
+private:
+    zvdb::AttributeLayout* leiturasPilha_[kNaPilha];
+    std::optional<std::string_view> dadosPilha_[kNaPilha];
+    std::vector<zvdb::AttributeLayout*> leiturasHeap_;
+    std::vector<std::optional<std::string_view>> dadosHeap_;
+    CETextosUtf8 textos_;
+};
 
 }  // namespace
 
@@ -201,34 +291,20 @@ OdDbObjectId CICad::InsereReferencia(const OdDbObjectId& bloco, std::string_view
     // The block's variable definitions and the values given for them come first: the
     // reference is then made marked for its attributes, and each attribute with its value,
     // placed from the values just given, instead of being found and set again.
-    std::vector<zvdb::AttributeLayout*> leituras;
-    zvdb::Point3 base;
-    std::vector<std::optional<std::string_view>> dados;
-    std::vector<std::string> textos;  // what `dados` points into
+    NovosAtributos novos;
     try {
-        const auto variaveis = db->attributeLayouts().variableLayouts(*db, *definicao, &base);
-        leituras.assign(variaveis.begin(), variaveis.end());
-        if (valores) {
-            dados.reserve(leituras.size());
-            textos.reserve(leituras.size());
-            for (const zvdb::AttributeLayout* leitura : leituras) {
-                const TextosDefinicao& textosDef = Textos(*leitura);
-                const std::optional<QString> valor = valores(textosDef.tag, textosDef.padrao);
-                dados.emplace_back();
-                if (!valor) continue;
-                textos.push_back(U8(*valor));
-                dados.back() = textos.back();
-            }
-        }
+        zvdb::Point3 base;
+        novos.Le(db->attributeLayouts().variableLayouts(*db, *definicao, &base), valores);
+        novos.base = base;
     } catch (const std::exception& erro) {
         Log("CICAd::CriarAtributos: " + QString::fromUtf8(erro.what()));
-        leituras.clear();
-        dados.clear();
+        novos.Esquece();
     }
     zvdb::BlockReference* ref = db->addBlockReference(*modelo, *definicao, ponto, {1, 1, 1}, graus,
-                                                      layer, !leituras.empty());
+                                                      layer, !novos.leituras.empty());
     try {
-        ref->addAttributesFromLayouts(base, ponto, {1, 1, 1}, graus, leituras, dados);
+        ref->placeAttributesFromLayouts(novos.base, ponto, {1, 1, 1}, graus, novos.leituras,
+                                        novos.dados);
     } catch (const std::exception& erro) {
         Log("CICAd::CriarAtributos: " + QString::fromUtf8(erro.what()));
     }

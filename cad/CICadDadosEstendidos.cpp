@@ -1,3 +1,4 @@
+#include "CETextosUtf8.h"
 #include "CICad.h"
 #include "CICadInterno.h"
 
@@ -72,33 +73,43 @@ CEListaXData ConverteXData(std::span<const zvdb::Tag> itens) {
 }
 
 // The items as tags over texts of their own: the drawing stores each value when the tags
-// are set, so they are not put in its storage here too.
-struct TagsXData {
-    std::vector<std::string> textos;
-    std::vector<zvdb::Tag> tags;
-
+// are set, so they are not put in its storage here too. A few items stay on the stack.
+class TagsXData {
+public:
     explicit TagsXData(const CEListaXData& itens) {
         std::size_t n = 0;
         for (const CEItemXData& item : itens)
             n += item.codigo >= 1010 && item.codigo <= 1013 ? 3 : 1;
-        textos.reserve(n);  // no reallocation: the tags hold views of the texts
-        tags.reserve(n);
+        tags_ = pilha_;
+        if (n > kNaPilha) {
+            heap_.resize(n);
+            tags_ = heap_.data();
+        }
         for (const CEItemXData& item : itens) {
             if (item.codigo >= 1010 && item.codigo <= 1013) {
-                poe(item.codigo, QByteArray::number(item.x, 'g', 17).toStdString());
-                poe(item.codigo + 10, QByteArray::number(item.y, 'g', 17).toStdString());
-                poe(item.codigo + 20, QByteArray::number(item.z, 'g', 17).toStdString());
+                Poe(item.codigo, QByteArray::number(item.x, 'g', 17).toStdString());
+                Poe(item.codigo + 10, QByteArray::number(item.y, 'g', 17).toStdString());
+                Poe(item.codigo + 20, QByteArray::number(item.z, 'g', 17).toStdString());
             } else {
-                poe(item.codigo, U8(item.texto));
+                tags_[n_++] = {std::int16_t(item.codigo), textos_.Guarda(item.texto)};
             }
         }
     }
+    std::span<const zvdb::Tag> Tags() const { return {tags_, n_}; }
+    // The application's name, kept with the items.
+    std::string_view Nome(const QString& aplicacao) { return textos_.Guarda(aplicacao); }
 
 private:
-    void poe(int codigo, std::string texto) {
-        textos.push_back(std::move(texto));
-        tags.push_back({std::int16_t(codigo), textos.back()});
+    void Poe(int codigo, std::string texto) {
+        tags_[n_++] = {std::int16_t(codigo), textos_.Guarda(std::move(texto))};
     }
+
+    static constexpr std::size_t kNaPilha = 8;
+    CETextosUtf8 textos_;
+    zvdb::Tag pilha_[kNaPilha];
+    std::vector<zvdb::Tag> heap_;
+    zvdb::Tag* tags_ = nullptr;
+    std::size_t n_ = 0;
 };
 
 // The handle in an extended-data item (text or handle group).
@@ -154,18 +165,15 @@ bool CICad::TextoXData(const OdDbObjectId& id, const char* aplicacao, QString& t
 void CICad::SetXData(const OdDbObjectId& id, const QString& aplicacao, const CEListaXData& itens) {
     zvdb::DbObject* objeto = Objeto(id);
     if (!objeto) return;
-    objeto->setXData(U8(aplicacao), TagsXData(itens).tags);
+    TagsXData tags(itens);
+    objeto->setXData(tags.Nome(aplicacao), tags.Tags());
 }
 
 void CICad::SetXDataTextos(const OdDbObjectId& id, std::string_view aplicacao,
                            const std::vector<std::string_view>& textos) {
     zvdb::DbObject* objeto = Objeto(id);
     if (!objeto) return;
-    std::vector<zvdb::Tag> tags;
-    tags.reserve(textos.size());
-    for (const std::string_view texto : textos)
-        tags.push_back({std::int16_t(1000), texto});
-    objeto->setXData(aplicacao, tags);
+    objeto->setXDataTexts(aplicacao, textos);
 }
 
 OdDbObjectId CICad::IdDoHandle(const QString& handle, zvdb::Database* database) {
@@ -284,7 +292,7 @@ CEListaXData CICad::GetPaineisDefinidos() {
 void CICad::SetPaineisDefinidos(const CEListaXData& paineis) {
     Protegido("CICad::SetPaineisDefinidos", [&] {
         if (zvdb::Entity* ponto = PontoConfiguracao("KVR_ZV_PAINEL", true))
-            ponto->setXData("KVR_ZV_PAINEL", TagsXData(paineis).tags);
+            ponto->setXData("KVR_ZV_PAINEL", TagsXData(paineis).Tags());
         return 0;
     });
 }

@@ -168,7 +168,7 @@ TagPattern::Values* AttributeLayout::composeValues(
     PatternTexts& texts = reals.texts();
     const auto put = [&](int slot, double number) {
         const std::uint8_t hole = variant.holes[static_cast<std::size_t>(slot)];
-        if (hole != kNoHole) holes[hole] = texts.shared(reals.real(target, number));
+        if (hole != kNoHole) holes[hole] = reals.realNumber(target, number);
     };
     placeNumbers(placement, rotated, variant.holes[AlignX] != kNoHole, put);
     // Short values come back from row to row (a section, a colour, a length): kept once.
@@ -263,12 +263,22 @@ const TagPattern& AttributeLayouts::referencePattern(const ReferenceShape& shape
     return *made;
 }
 
-std::string_view AttributeLayouts::real(Database& target, double value) {
+AttributeLayouts::Memo& AttributeLayouts::memo(Database& target, double value) {
     const auto bits = std::bit_cast<std::uint64_t>(value);
-    Memo& memo = reals_[(bits * 0x9E3779B97F4A7C15ull) >> (64 - kMemoBits)];
+    Memo& memo = reals_[slotOf(bits)];
     if (memo.text.empty() || memo.bits != bits)
         memo = Memo{bits, target.storeShared(TagValues::fromReal(value))};
-    return memo.text;
+    return memo;
+}
+
+std::string_view AttributeLayouts::real(Database& target, double value) {
+    return memo(target, value).text;
+}
+
+std::uint32_t AttributeLayouts::newRealNumber(Database& target, double value) {
+    Memo& known = memo(target, value);
+    if (known.number == 0) known.number = texts_.shared(known.text);
+    return known.number;
 }
 
 }  // namespace zvdb

@@ -9,6 +9,7 @@
 #include "TagPattern.h"
 
 #include <array>
+#include <bit>
 #include <cstddef>
 #include <cstdint>
 #include <memory>
@@ -125,6 +126,15 @@ public:
                                                       Point3* basePoint = nullptr);
     // A real as tag text, answered from the values given lately when it is one of them.
     std::string_view real(Database& target, double value);
+    // The same as a number of texts(), as texts().shared(real(...)) answers it; a value
+    // given lately is answered here, without a call.
+    std::uint32_t realNumber(Database& target, double value) {
+        const auto bits = std::bit_cast<std::uint64_t>(value);
+        const Memo& known = reals_[slotOf(bits)];
+        // A number is only kept beside the text of the same value.
+        if (known.number != 0 && known.bits == bits) return known.number;
+        return newRealNumber(target, value);
+    }
     // The SEQEND that closes a reference's attributes: its layer is the one hole.
     const TagPattern& seqendPattern(bool paperSpace);
     // A new reference's tags as Database::addBlockReference makes them, for references in
@@ -160,7 +170,13 @@ private:
     struct Memo {
         std::uint64_t bits = 0;
         std::string_view text;
+        std::uint32_t number = 0;  // of texts_; 0 until asked for
     };
+    Memo& memo(Database& target, double value);
+    std::uint32_t newRealNumber(Database& target, double value);
+    static std::size_t slotOf(std::uint64_t bits) {
+        return static_cast<std::size_t>((bits * 0x9E3779B97F4A7C15ull) >> (64 - kMemoBits));
+    }
     // A strip or list page places a few hundred distinct coordinates over and over: the memo
     // holds a page's worth.
     static constexpr int kMemoBits = 10;

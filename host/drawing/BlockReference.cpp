@@ -72,12 +72,57 @@ Placing readPlacing(std::span<const Tag> all) {
 
 }  // namespace
 
+namespace {
+
+bool finite(const Point3& p) {
+    return std::isfinite(p.x) && std::isfinite(p.y) && std::isfinite(p.z);
+}
+
+// The product below for a reference along the Z axis, without the products by identities:
+// each of those gives the other factor plus zero (a negative zero comes out positive), so
+// these sums give the same bits for finite values.
+Transform alongZ(const Point3& base, const Point3& position, const Point3& scale, double radians) {
+    const double c = radians == 0.0 ? 1.0 : std::cos(radians);
+    const double s = radians == 0.0 ? radians : std::sin(radians);
+    const double rotation[9] = {c, -s, 0, s, c, 0, 0, 0, 1};
+    const double scales[3] = {scale.x, scale.y, scale.z};
+    Transform t;
+    for (int i = 0; i < 9; ++i)
+        t.linear[i] = ((rotation[i] + 0.0) * scales[i % 3]) + 0.0;
+    t.move = Point3{position.x + 0.0, position.y + 0.0, position.z + 0.0};
+    t.move = t.apply(base * -1.0);
+    return t;
+}
+
+}  // namespace
+
 Transform BlockReference::transformOf(const Point3& base, const Point3& position,
                                       const Point3& scale, double rotationDegrees,
                                       const Point3& extrusion) {
+    const double radians = rotationDegrees * std::numbers::pi / 180.0;
+    if (extrusion == Point3{0, 0, 1} && finite(position)) {
+        // Unturned and unscaled, the product's linear part is the identity, and its move is
+        // this one whatever the base point.
+        if (radians == 0.0 && scale == Point3{1, 1, 1}) {
+            Transform t;
+            t.move = Point3{position.x + 0.0, position.y + 0.0, position.z + 0.0};
+            t.move = t.apply(base * -1.0);
+            return t;
+        }
+    }
+    if (extrusion == Point3{0, 0, 1} && finite(base) && finite(position) && finite(scale) &&
+        std::isfinite(radians)) {
+        // The move is worked out as the product works it out; the linear part only differs
+        // where an entry is out of range (the product multiplies it by zero).
+        const Transform t = alongZ(base, position, scale, radians);
+        bool inRange = true;
+        for (const double entry : t.linear)
+            inRange = inRange && std::isfinite(entry);
+        if (inRange) return t;
+    }
     return Transform::fromOcs(extrusion) * Transform::translation(position) *
-           Transform::rotationZ(rotationDegrees * std::numbers::pi / 180.0) *
-           Transform::scaling(scale.x, scale.y, scale.z) * Transform::translation(base * -1.0);
+           Transform::rotationZ(radians) * Transform::scaling(scale.x, scale.y, scale.z) *
+           Transform::translation(base * -1.0);
 }
 
 Transform BlockReference::transform() const {
@@ -146,11 +191,24 @@ std::vector<Attribute*> BlockReference::addAttributesFromLayouts(
     const Point3& basePoint, const Point3& position, const Point3& scale, double rotationDegrees,
     std::span<AttributeLayout* const> layouts,
     std::span<const std::optional<std::string_view>> values) {
-    if (layouts.empty()) return {};
+    std::vector<Attribute*> made;
+    if (layouts.empty()) return made;
     const double rotation = rotationDegrees != 0.0 ? rotationDegrees : 0.0;
-    return database().addAttributesFromLayouts(*this, layouts, values,
-                                               transformOf(basePoint, position, scale, rotation),
-                                               std::abs(scale.y), rotation);
+    database().addAttributesFromLayouts(*this, layouts, values,
+                                        transformOf(basePoint, position, scale, rotation),
+                                        std::abs(scale.y), rotation, &made);
+    return made;
+}
+
+void BlockReference::placeAttributesFromLayouts(
+    const Point3& basePoint, const Point3& position, const Point3& scale, double rotationDegrees,
+    std::span<AttributeLayout* const> layouts,
+    std::span<const std::optional<std::string_view>> values) {
+    if (layouts.empty()) return;
+    const double rotation = rotationDegrees != 0.0 ? rotationDegrees : 0.0;
+    database().addAttributesFromLayouts(*this, layouts, values,
+                                        transformOf(basePoint, position, scale, rotation),
+                                        std::abs(scale.y), rotation, nullptr);
 }
 
 }  // namespace zvdb

@@ -61,6 +61,11 @@ public:
         const Point3& basePoint, const Point3& position, const Point3& scale,
         double rotationDegrees, std::span<AttributeLayout* const> layouts,
         std::span<const std::optional<std::string_view>> values);
+    // The same for a caller that does not keep the attributes made.
+    void placeAttributesFromLayouts(const Point3& basePoint, const Point3& position,
+                                    const Point3& scale, double rotationDegrees,
+                                    std::span<AttributeLayout* const> layouts,
+                                    std::span<const std::optional<std::string_view>> values);
 };
 
 }  // namespace zvdb

@@ -15,6 +15,7 @@
 #include "XRecord.h"
 
 #include <atomic>
+#include <functional>
 
 namespace zvdb {
 
@@ -100,6 +101,12 @@ void Database::swapContents(Database& other) {
     warnings_.swap(other.warnings_);
     std::swap(namedObjects_, other.namedObjects_);
     layouts_.swap(other.layouts_);
+    modelSpace_ = KnownSpace{};
+    other.modelSpace_ = KnownSpace{};
+    lastReference_ = LastReference{};
+    other.lastReference_ = LastReference{};
+    blockNames_ = {};
+    other.blockNames_ = {};
     std::swap(knownApplications_, other.knownApplications_);
     std::swap(nextKnown_, other.nextKnown_);
     for (const auto& object : storage_)
@@ -247,7 +254,17 @@ std::vector<BlockRecord*> Database::blocks() const {
 }
 
 BlockRecord* Database::modelSpace() const {
-    return block("*Model_Space");
+    KnownSpace& known = modelSpace_;
+    // The table's look-up by name answers the same while its index and the record stand.
+    if (known.record && known.table->indexChanges() == known.index && !known.record->isErased())
+        return known.record;
+    BlockRecord* found = block("*Model_Space");
+    known = KnownSpace{};
+    if (found) {
+        const SymbolTable* blocks = table("BLOCK_RECORD");
+        known = KnownSpace{found, blocks, blocks->indexChanges()};
+    }
+    return found;
 }
 
 BlockRecord* Database::paperSpace() const {
@@ -291,25 +308,66 @@ bool Database::isApplicationRegistered(std::string_view application) const {
     return appids && appids->find(application);
 }
 
+namespace {
+// Whether the record's name still stands in the tag where it was found: a new name is a new
+// value there, or new tags.
+bool stillNamed(const DbObject& record, const Tag* nameTag, std::string_view nameText) {
+    const auto tags = record.tags();
+    const std::less<const Tag*> before;
+    return nameTag && !before(nameTag, tags.data()) && before(nameTag, tags.data() + tags.size()) &&
+           nameTag->value.data() == nameText.data() && nameTag->value.size() == nameText.size();
+}
+
+// The record's name tag, where text(2) finds it; null when it has none.
+const Tag* nameTagOf(const DbObject& record) {
+    const int at = record.indexOf(2);
+    return at >= 0 ? &record.tags()[static_cast<std::size_t>(at)] : nullptr;
+}
+}  // namespace
+
 bool Database::registerApplication(std::string_view application) {
-    if (application.empty()) return false;
+    bool made = false;
+    knownApplication(application, made);
+    return made;
+}
+
+Database::KnownApplication* Database::knownApplication(std::string_view application, bool& made) {
+    made = false;
+    if (application.empty()) return nullptr;
     // Objects given extended data name the same few applications over and over, often in
     // turns (a block and the symbol it is tied to): the names asked lately are compared
     // first, byte for byte, and their records asked whether they still bear them.
-    for (const KnownApplication& known : knownApplications_) {
+    for (KnownApplication& known : knownApplications_) {
         if (!known.record || known.name != application || known.record->isErased()) continue;
+        if (stillNamed(*known.record, known.nameTag, known.nameText)) return &known;
         const std::string_view name = known.record->text(2);
-        if (name == application || TagValues::sameName(name, application)) return false;
+        if (name == application || TagValues::sameName(name, application)) return &known;
     }
     SymbolTable* appids = table("APPID");
     DbObject* record = appids ? appids->find(application) : nullptr;
-    const bool made = record == nullptr;
+    made = record == nullptr;
     if (made) record = createTableRecord("APPID", application, "AcDbRegAppTableRecord");
-    if (record) {
-        knownApplications_[nextKnown_] = {record, std::string(application)};
-        nextKnown_ = (nextKnown_ + 1) % knownApplications_.size();
+    if (!record) {
+        made = false;
+        return nullptr;
     }
-    return made && record != nullptr;
+    KnownApplication& known = knownApplications_[nextKnown_];
+    const Tag* nameTag = nameTagOf(*record);
+    known = KnownApplication{record,
+                             std::string(application),
+                             nameTag,
+                             nameTag ? nameTag->value : std::string_view(),
+                             {}};
+    nextKnown_ = (nextKnown_ + 1) % knownApplications_.size();
+    return &known;
+}
+
+std::string_view Database::registeredName(std::string_view application) {
+    bool made = false;
+    KnownApplication* known = knownApplication(application, made);
+    if (!known) return storeShared(application);
+    if (known->stored.empty()) known->stored = storeShared(application);
+    return known->stored;
 }
 
 // System variables -------------------------------------------------------------------------
@@ -446,7 +504,7 @@ BlockReference* Database::addBlockReference(BlockRecord& owner, const BlockRecor
     PatternTexts& texts = layouts.texts();
     const std::uint64_t handle = allocateHandle();
     AttributeLayouts::ReferenceShape shape;
-    shape.paperSpace = owner.isPaperSpace();
+    shape.paperSpace = &owner != modelSpace() && owner.isPaperSpace();
     shape.scaled[0] = scale.x != 1.0;
     shape.scaled[1] = scale.y != 1.0;
     shape.scaled[2] = scale.z != 1.0;
@@ -454,10 +512,15 @@ BlockReference* Database::addBlockReference(BlockRecord& owner, const BlockRecor
     shape.attributesFollow = attributesFollow;
     TagPattern::Values* own = layouts.referencePattern(shape).make(arena_);
     std::uint32_t* hole = own->values();
-    *hole++ = texts.shared(layer.empty() ? std::string_view("0") : storeShared(layer));
-    const std::string_view name = block.name();
-    *hole++ = texts.shared(&block.database() == this ? name : storeShared(name));
-    const auto real = [&](double value) { return texts.shared(layouts.real(*this, value)); };
+    LastReference& last = lastReference_;
+    if (last.layerNumber == 0 || last.layer != layer) {
+        last.layer = layer;
+        last.layerNumber = texts.shared(layer.empty() ? std::string_view("0") : storeShared(layer));
+    }
+    *hole++ = last.layerNumber;
+    *hole++ = &block.database() != this ? texts.shared(storeShared(block.name()))
+                                        : blockNameNumber(block);
+    const auto real = [&](double value) { return layouts.realNumber(*this, value); };
     *hole++ = real(position.x);
     *hole++ = real(position.y);
     *hole++ = real(position.z);
@@ -469,6 +532,19 @@ BlockReference* Database::addBlockReference(BlockRecord& owner, const BlockRecor
     auto* made = static_cast<BlockReference*>(adopt(std::move(reference)));
     owner.appendEntity(made);
     return made;
+}
+
+std::uint32_t Database::blockNameNumber(const BlockRecord& block) {
+    const auto at = reinterpret_cast<std::uintptr_t>(&block) * 0x9E3779B97F4A7C15ull;
+    KnownBlockName& known = blockNames_[at >> 60];
+    if (known.block != &block || !stillNamed(block, known.nameTag, known.nameText)) {
+        known.block = &block;
+        known.nameTag = block.isPatterned() ? nullptr : nameTagOf(block);
+        // The tag text(2) reads, read once.
+        known.nameText = known.nameTag ? known.nameTag->value : block.name();
+        known.number = attributeLayouts().texts().shared(known.nameText);
+    }
+    return known.number;
 }
 
 void Database::ensureSeqend(Entity& parent) {
@@ -518,6 +594,29 @@ void Database::forgetLayout(const DbObject& definition) {
     if (layouts_) layouts_->forget(definition);
 }
 
+namespace {
+// Whether the object's flag (66 or 67) is set, as integer() == 1 answers, from its pattern
+// when the pattern fixes it.
+bool flagSet(const DbObject& object, int code) {
+    if (const TagPattern* pattern = object.pattern()) {
+        const int fixed = code == 66 ? pattern->attributesFollowFlag() : pattern->paperSpaceFlag();
+        if (fixed >= 0) return fixed == 1;
+    }
+    return object.integer(code) == 1;
+}
+}  // namespace
+
+std::uint32_t Database::layerNumber(const Entity& entity) {
+    // A patterned entity holds its layer as a number already.
+    const DbObject& object = entity;
+    if (object.patterned_)
+        if (const int hole = object.pattern_->pattern->holeOf(8); hole >= 0)
+            if (const std::uint32_t number = object.pattern_->values()[hole]; number != 0)
+                return number;
+    const std::string_view layer = entity.layer();
+    return attributeLayouts().texts().shared(layer.empty() ? std::string_view("0") : layer);
+}
+
 Attribute* Database::addAttributeFromLayout(BlockReference& reference, AttributeLayout& layout,
                                             AttributeLayout::Placement& where,
                                             const std::optional<std::string_view>& value,
@@ -539,15 +638,13 @@ Attribute* Database::addAttributeFromLayout(BlockReference& reference, Attribute
     }
     reference.addSubEntity(attribute);
     if (first) {
-        if (reference.integer(66) != 1) reference.setInteger(66, 1, "AcDbBlockReference");
+        if (!flagSet(reference, 66)) reference.setInteger(66, 1, "AcDbBlockReference");
         if (!reference.seqend()) {
             // As ensureSeqend makes it, from values the drawing holds already.
             const std::uint64_t seqend = allocateHandle();
-            const std::string_view layer = reference.layer();
             TagPattern::Values* own =
                 attributeLayouts().seqendPattern(where.paperSpace).make(arena_);
-            own->values()[0] =
-                attributeLayouts().texts().shared(layer.empty() ? std::string_view("0") : layer);
+            own->values()[0] = layerNumber(reference);
             reference.setSeqend(static_cast<Entity*>(
                 adopt(std::make_unique<Entity>(*this, *own, seqend, reference.handle()))));
         }
@@ -575,24 +672,24 @@ std::vector<Attribute*> Database::addAttributesFromDefinitions(
     return made;
 }
 
-std::vector<Attribute*> Database::addAttributesFromLayouts(
-    BlockReference& reference, std::span<AttributeLayout* const> layouts,
-    std::span<const std::optional<std::string_view>> values, const Transform& placement,
-    double heightScale, double rotation) {
-    std::vector<Attribute*> made;
-    if (layouts.empty()) return made;
-    made.reserve(layouts.size());
+void Database::addAttributesFromLayouts(BlockReference& reference,
+                                        std::span<AttributeLayout* const> layouts,
+                                        std::span<const std::optional<std::string_view>> values,
+                                        const Transform& placement, double heightScale,
+                                        double rotation, std::vector<Attribute*>* made) {
+    if (layouts.empty()) return;
+    if (made) made->reserve(made->size() + layouts.size());
     // The reference's list of attributes at its size at once.
     std::vector<Entity*>& subs = reference.children().subs;
     subs.reserve(subs.size() + layouts.size());
-    AttributeLayout::Placement where{placement, heightScale, rotation, reference.inPaperSpace(),
+    AttributeLayout::Placement where{placement, heightScale, rotation, flagSet(reference, 67),
                                      {},        {}};
     for (std::size_t i = 0; i < layouts.size(); ++i) {
         const std::optional<std::string_view> value =
             i < values.size() ? values[i] : std::optional<std::string_view>();
-        made.push_back(addAttributeFromLayout(reference, *layouts[i], where, value, i == 0));
+        Attribute* attribute = addAttributeFromLayout(reference, *layouts[i], where, value, i == 0);
+        if (made) made->push_back(attribute);
     }
-    return made;
 }
 
 Entity* Database::addVertex(Polyline& polyline, const Point3& p) {

@@ -154,11 +154,13 @@ public:
         BlockReference& reference, std::span<const Attribute* const> definitions,
         std::span<const std::optional<std::string_view>> values, const Transform& placement,
         double heightScale, double rotation);
-    // The same from the definitions' layouts (of this drawing, found by attributeLayouts()).
-    std::vector<Attribute*> addAttributesFromLayouts(
-        BlockReference& reference, std::span<AttributeLayout* const> layouts,
-        std::span<const std::optional<std::string_view>> values, const Transform& placement,
-        double heightScale, double rotation);
+    // The same from the definitions' layouts (of this drawing, found by attributeLayouts()),
+    // the attributes made put in `made` when it is given.
+    void addAttributesFromLayouts(BlockReference& reference,
+                                  std::span<AttributeLayout* const> layouts,
+                                  std::span<const std::optional<std::string_view>> values,
+                                  const Transform& placement, double heightScale, double rotation,
+                                  std::vector<Attribute*>* made);
     // What the definitions of this drawing's blocks give their attributes, worked out once.
     AttributeLayouts& attributeLayouts();
     Entity* addVertex(Polyline& polyline, const Point3& p);
@@ -199,6 +201,8 @@ private:
     // The BLOCK and ENDBLK entities of a block record that has none.
     void addBlockEnds(BlockRecord& record, const Point3& basePoint = {});
     void ensureSeqend(Entity& parent);
+    // The entity's layer as a number of the pattern texts ("0" for none).
+    std::uint32_t layerNumber(const Entity& entity);
     Attribute* addAttributeFromLayout(BlockReference& reference, AttributeLayout& layout,
                                       AttributeLayout::Placement& where,
                                       const std::optional<std::string_view>& value, bool first);
@@ -223,12 +227,47 @@ private:
     // Room where new objects' tags are put together before they get their own.
     std::vector<Tag> scratch_;
     std::unique_ptr<AttributeLayouts> layouts_;
+    // Model space as modelSpace() found it last, good while the block table's index stays
+    // the same and the record is not erased (references go there by the thousand).
+    struct KnownSpace {
+        BlockRecord* record = nullptr;
+        const SymbolTable* table = nullptr;
+        std::uint64_t index = 0;
+    };
+    mutable KnownSpace modelSpace_;
     // The APPID records registerApplication found or made lately, with the names they were
     // asked by, in turns.
     struct KnownApplication {
         DbObject* record = nullptr;
         std::string name;
+        // The record's name tag as it stood then: while it stands so, the name is the same.
+        const Tag* nameTag = nullptr;
+        std::string_view nameText;
+        std::string_view stored;  // `name` as storeShared gave it, once asked for
     };
+    // The entry that answers for the application, its record found or made (`made` set
+    // then); null for an empty name.
+    KnownApplication* knownApplication(std::string_view application, bool& made);
+    // The application registered, and its name as the drawing holds it for extended data.
+    std::string_view registeredName(std::string_view application);
+    // The layer and block of the reference made last, as numbers of the pattern texts: a
+    // writer places many references on one page, of a few blocks.
+    struct LastReference {
+        std::string layer;
+        std::uint32_t layerNumber = 0;
+    };
+    LastReference lastReference_;
+    // The names of the blocks referenced lately, by block: a writer takes a few blocks in
+    // turns (a symbol and its accessories).
+    struct KnownBlockName {
+        const BlockRecord* block = nullptr;
+        const Tag* nameTag = nullptr;
+        std::string_view nameText;
+        std::uint32_t number = 0;
+    };
+    std::array<KnownBlockName, 16> blockNames_{};
+    // The block's name as a number of the pattern texts.
+    std::uint32_t blockNameNumber(const BlockRecord& block);
     std::array<KnownApplication, 4> knownApplications_{};
     std::size_t nextKnown_ = 0;
     std::uint64_t changes_ = 0;

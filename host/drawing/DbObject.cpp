@@ -2,10 +2,13 @@
 
 #include "Database.h"
 #include "Dictionary.h"
+#include "ObjectPool.h"
 #include "TagList.h"
 #include "TagValues.h"
 
 #include <algorithm>
+#include <memory>
+#include <new>
 #include <utility>
 
 namespace zvdb {
@@ -38,6 +41,14 @@ DbObject::DbObject(Database& database, const TagPattern::Values& values, std::ui
       owner_(owner) {}
 
 DbObject::~DbObject() = default;
+
+void* DbObject::operator new(std::size_t bytes) {
+    return pool::take(bytes);
+}
+
+void DbObject::operator delete(void* room, std::size_t bytes) noexcept {
+    pool::give(room, bytes);
+}
 
 std::span<const Tag> DbObject::tags() const {
     if (owned_) {
@@ -432,40 +443,64 @@ std::pair<std::size_t, std::size_t> applicationGroup(std::span<const Tag> tags, 
 }
 }  // namespace
 
-void DbObject::setXData(std::string_view application, std::span<const Tag> items) {
-    database_->registerApplication(application);
+template <class Fill>
+void DbObject::setXDataWith(std::string_view application, std::size_t count, Fill&& fill) {
+    // the same few application names on many objects: one copy each
+    const std::string_view name = database_->registeredName(application);
     if (patterned_ && pattern_->pattern->takesXData()) {
-        // The groups stay beside the object's values, in the arena at their size: the
-        // application's first group replaced where it is, or a new one at the end.
+        // The groups stay beside the object's values, in the arena at their size, made
+        // there at once: the application's first group replaced where it is, or a new one
+        // at the end.
         noteEdit();
         const std::span<const Tag> current = pattern_->xdata();
         const auto [begin, end] = applicationGroup(current, 0, application);
-        std::vector<Tag> all;
-        all.reserve(current.size() - (end - begin) + items.size() + 1);
-        all.insert(all.end(), current.begin(),
-                   current.begin() + static_cast<std::ptrdiff_t>(begin));
-        all.push_back(Tag{1001, database_->storeShared(application)});
-        for (const Tag& item : items)
-            all.push_back(Tag{item.code, store(item.value)});
-        all.insert(all.end(), current.begin() + static_cast<std::ptrdiff_t>(end), current.end());
-        const_cast<TagPattern::Values*>(pattern_)->setXData(database_->arena().storeTags(all));
+        const std::size_t size = current.size() - (end - begin) + count + 1;
+        Tag* all = static_cast<Tag*>(database_->arena().allocate(size * sizeof(Tag)));
+        Tag* at = std::uninitialized_copy(
+            current.begin(), current.begin() + static_cast<std::ptrdiff_t>(begin), all);
+        new (at++) Tag{1001, name};
+        std::uninitialized_default_construct_n(at, count);
+        fill(at);
+        std::uninitialized_copy(current.begin() + static_cast<std::ptrdiff_t>(end), current.end(),
+                                at + count);
+        const_cast<TagPattern::Values*>(pattern_)->setXData({all, size});
         return;
     }
+    // The group is made before the tags change: the items may be some of them.
+    constexpr std::size_t kOnStack = 16;
+    Tag onStack[kOnStack];
+    std::vector<Tag> onHeap;
+    Tag* group = onStack;
+    if (count + 1 > kOnStack) {
+        onHeap.resize(count + 1);
+        group = onHeap.data();
+    }
+    group[0] = Tag{1001, name};
+    fill(group + 1);
     const auto current = tags();
     const auto [begin, end] = applicationGroup(current, xdataStart(), application);
     // A file object's tags are copied once, at the size they will have.
-    const std::size_t after = current.size() - (end - begin) + items.size() + 1;
+    const std::size_t after = current.size() - (end - begin) + count + 1;
     auto& all = editTags(after > current.size() ? after - current.size() : 0);
-    std::vector<Tag> group;
-    group.reserve(items.size() + 1);
-    // the same few application names on many objects: one copy each
-    group.push_back(Tag{1001, database_->storeShared(application)});
-    for (const Tag& item : items)
-        group.push_back(Tag{item.code, store(item.value)});
     all.erase(all.begin() + static_cast<std::ptrdiff_t>(begin),
               all.begin() + static_cast<std::ptrdiff_t>(end));
-    fitFor(all, group.size());
-    all.insert(all.begin() + static_cast<std::ptrdiff_t>(begin), group.begin(), group.end());
+    fitFor(all, count + 1);
+    all.insert(all.begin() + static_cast<std::ptrdiff_t>(begin), group, group + count + 1);
+}
+
+void DbObject::setXData(std::string_view application, std::span<const Tag> items) {
+    setXDataWith(application, items.size(), [&](Tag* out) {
+        for (const Tag& item : items)
+            *out++ = Tag{item.code, store(item.value)};
+    });
+}
+
+void DbObject::setXDataTexts(std::string_view application,
+                             std::span<const std::string_view> texts) {
+    setXDataWith(application, texts.size(), [&](Tag* out) {
+        for (const std::string_view text : texts)
+            *out++ = Tag{1000, store(text)};
+    });
 }
 
 void DbObject::addXData(std::string_view application, std::span<const Tag> items) {

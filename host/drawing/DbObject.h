@@ -33,6 +33,9 @@ public:
     virtual ~DbObject();
     DbObject(const DbObject&) = delete;
     DbObject& operator=(const DbObject&) = delete;
+    // Objects take their room from the pool of their size (ObjectPool.h).
+    static void* operator new(std::size_t bytes);
+    static void operator delete(void* room, std::size_t bytes) noexcept;
 
     Database& database() const { return *database_; }
     std::string_view type() const;  // "LINE", "DICTIONARY", "LAYER"...
@@ -51,6 +54,8 @@ public:
     // Whether the tags are still only a pattern's and the object's own values (then
     // forEachTag gives them without putting them together).
     bool isPatterned() const { return patterned_; }
+    // The pattern of a patterned object; null for others.
+    const TagPattern* pattern() const { return patterned_ ? pattern_->pattern : nullptr; }
     // The extended data a patterned object keeps beside its values (none for others).
     std::span<const Tag> patternedXData() const {
         return patterned_ ? pattern_->xdata() : std::span<const Tag>();
@@ -107,6 +112,8 @@ public:
     // Replaces the application's first group (later groups stay) or appends one; the
     // application is registered in the APPID table.
     void setXData(std::string_view application, std::span<const Tag> items);
+    // The same with text items (code 1000), as many as `texts`.
+    void setXDataTexts(std::string_view application, std::span<const std::string_view> texts);
     // Adds a further group even if the application has one.
     void addXData(std::string_view application, std::span<const Tag> items);
     bool removeXData(std::string_view application);
@@ -144,6 +151,10 @@ private:
     // The value of a patterned object's tag without putting its tags together: found
     // (true, `value` set; empty when the tag is absent and `absent` is set) or not known.
     bool patternedText(int code, std::string_view& value, bool& absent) const;
+    // Replaces or appends the application's first group, made by `fill` into the `count`
+    // tags after its name.
+    template <class Fill>
+    void setXDataWith(std::string_view application, std::size_t count, Fill&& fill);
     // Puts a patterned object's tags together; they are its own from then on.
     void expand();
     void noteEdit();

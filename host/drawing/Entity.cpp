@@ -2,6 +2,7 @@
 
 #include "BlockRecord.h"
 #include "Database.h"
+#include "ObjectPool.h"
 #include "TagValues.h"
 
 namespace zvdb {
@@ -14,6 +15,14 @@ BlockRecord* Entity::block() const {
 const std::vector<Entity*>& Entity::subEntities() const {
     static const std::vector<Entity*> none;
     return children_ ? children_->subs : none;
+}
+
+void* Entity::Children::operator new(std::size_t bytes) {
+    return pool::take(bytes);
+}
+
+void Entity::Children::operator delete(void* room, std::size_t bytes) noexcept {
+    pool::give(room, bytes);
 }
 
 Entity::Children& Entity::children() {

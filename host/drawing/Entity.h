@@ -50,6 +50,8 @@ private:
     struct Children {
         std::vector<Entity*> subs;
         Entity* seqend = nullptr;
+        static void* operator new(std::size_t bytes);
+        static void operator delete(void* room, std::size_t bytes) noexcept;
     };
     Children& children();
     std::unique_ptr<Children> children_;

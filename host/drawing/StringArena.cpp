@@ -12,23 +12,25 @@ constexpr std::size_t kChunk = 64 * 1024;
 
 std::string_view StringArena::store(std::string_view text) {
     if (text.empty()) return {};
-    if (text.size() > left_) {
-        const std::size_t size = text.size() > kChunk / 4 ? text.size() : kChunk;
-        chunks_.push_back(std::make_unique<char[]>(size));
-        if (size != kChunk) {
-            std::memcpy(chunks_.back().get(), text.data(), text.size());
-            used_ += size;
-            return {chunks_.back().get(), text.size()};
-        }
-        cursor_ = chunks_.back().get();
-        left_ = size;
-        used_ += size;
-    }
+    if (text.size() > left_) return storeInNewChunk(text);
     std::memcpy(cursor_, text.data(), text.size());
     std::string_view result(cursor_, text.size());
     cursor_ += text.size();
     left_ -= text.size();
     return result;
+}
+
+std::string_view StringArena::storeInNewChunk(std::string_view text) {
+    const std::size_t size = text.size() > kChunk / 4 ? text.size() : kChunk;
+    chunks_.push_back(std::make_unique_for_overwrite<char[]>(size));
+    used_ += size;
+    if (size != kChunk) {
+        std::memcpy(chunks_.back().get(), text.data(), text.size());
+        return {chunks_.back().get(), text.size()};
+    }
+    cursor_ = chunks_.back().get();
+    left_ = size;
+    return store(text);
 }
 
 std::span<Tag> StringArena::storeTags(std::span<const Tag> tags) {
@@ -56,24 +58,30 @@ std::span<Tag> StringArena::storeTags(std::span<const Tag> tags) {
     return {at, tags.size()};
 }
 
+namespace {
+constexpr std::size_t kRawChunk = 32 * 1024;
+}
+
 void* StringArena::allocate(std::size_t bytes) {
-    constexpr std::size_t kRawChunk = 32 * 1024;
     bytes = (bytes + 7) & ~std::size_t(7);
+    if (bytes > rawLeft_ || bytes > kRawChunk / 8) return allocateInNewChunk(bytes);
+    void* at = rawCursor_;
+    rawCursor_ += bytes;
+    rawLeft_ -= bytes;
+    return at;
+}
+
+void* StringArena::allocateInNewChunk(std::size_t bytes) {
     if (bytes > kRawChunk / 8) {
         tagChunks_.push_back(std::make_unique_for_overwrite<std::byte[]>(bytes));
         used_ += bytes;
         return tagChunks_.back().get();
     }
-    if (bytes > rawLeft_) {
-        tagChunks_.push_back(std::make_unique_for_overwrite<std::byte[]>(kRawChunk));
-        used_ += kRawChunk;
-        rawCursor_ = tagChunks_.back().get();
-        rawLeft_ = kRawChunk;
-    }
-    void* at = rawCursor_;
-    rawCursor_ += bytes;
-    rawLeft_ -= bytes;
-    return at;
+    tagChunks_.push_back(std::make_unique_for_overwrite<std::byte[]>(kRawChunk));
+    used_ += kRawChunk;
+    rawCursor_ = tagChunks_.back().get();
+    rawLeft_ = kRawChunk;
+    return allocate(bytes);
 }
 
 std::string_view StringArena::adopt(std::string&& buffer) {

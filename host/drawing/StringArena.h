@@ -28,6 +28,10 @@ public:
     std::size_t bytesUsed() const { return used_; }
 
 private:
+    // The rare paths, apart from the calls that only move a cursor.
+    [[gnu::noinline]] std::string_view storeInNewChunk(std::string_view text);
+    [[gnu::noinline]] void* allocateInNewChunk(std::size_t bytes);
+
     std::vector<std::unique_ptr<char[]>> chunks_;
     std::vector<std::unique_ptr<std::string>> buffers_;
     char* cursor_ = nullptr;

@@ -49,6 +49,19 @@ TagPattern::TagPattern(std::span<const Tag> tags, PatternTexts& texts, bool take
         if (tag.code == 102) groups_ = true;
         items_.push_back(item);
     }
+    paperSpace_ = fixedFlag(67);
+    attributesFollow_ = fixedFlag(66);
+}
+
+std::int8_t TagPattern::fixedFlag(int code) const {
+    if (groups_) return -1;
+    for (std::size_t i = 1; i < items_.size(); ++i) {
+        const Item& item = items_[i];
+        if (item.code != code) continue;
+        if (item.kind != Kind::Fixed) return -1;
+        return item.value == "1" ? 1 : item.value == "0" ? 0 : -1;
+    }
+    return 0;
 }
 
 namespace {

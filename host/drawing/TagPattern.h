@@ -87,6 +87,11 @@ public:
     Lookup find(const Values& values, int code, std::string_view& value) const;
     // The hole of the first tag with the code, as find finds it; -1 when that tag is none.
     int holeOf(int code) const;
+    // The paper space flag (67) and the attributes-follow flag (66) of every object of the
+    // pattern, as DbObject::integer reads them: 1 or 0 when the pattern fixes it for all,
+    // -1 when it is the object's own.
+    int paperSpaceFlag() const { return paperSpace_; }
+    int attributesFollowFlag() const { return attributesFollow_; }
 
 private:
     enum class Kind : std::uint8_t { Fixed, Hole, Handle, Owner };
@@ -107,6 +112,9 @@ private:
     PatternTexts* texts_;
     bool takesXData_ = false;
     bool groups_ = false;
+    std::int8_t paperSpace_ = -1;
+    std::int8_t attributesFollow_ = -1;
+    std::int8_t fixedFlag(int code) const;
 };
 
 }  // namespace zvdb

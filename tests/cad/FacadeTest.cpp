@@ -6,6 +6,7 @@
 #include "cad/CELayoutRotasFios.h"
 #include "cad/CICad.h"
 #include "drawing/Dictionary.h"
+#include "drawing/DxfLoader.h"
 #include "drawing/Polyline.h"
 #include "drawing/TextEntity.h"
 #include "drawing/XRecord.h"
@@ -372,6 +373,53 @@ TEST_F(FacadeFixture, RepeatedInsertionsFindAnErasedBlockOrLayerAgain) {
 
 // The tag and default asked about are those of the definition as it stands at each
 // insertion: a definition edited, or a block redefined from its file, between two rows.
+// Values of every kind reach their attributes as UTF-8: plain, accented, empty, longer than
+// a row's values together, and for more attributes than a row has; read back from the
+// drawing and from the saved file alike.
+TEST_F(FacadeFixture, EveryValueReachesItsAttributeWhateverItsTextAndTheirNumber) {
+    QStringList tags;
+    for (int i = 0; i < 20; ++i)
+        tags << QString("CAMPO_%1").arg(i);
+    const QString caminho = arquivoBloco("MUITOS", tags);
+    const QString longo = QString("x").repeated(1500);
+    const auto valor = [&](const QString& tag) -> std::optional<QString> {
+        const int i = tag.mid(6).toInt();
+        if (i == 3) return std::nullopt;
+        if (i == 5) return longo;
+        if (i % 4 == 1) return QString::fromUtf8("ação Ø ") + tag;
+        if (i == 6) return QString();
+        return tag.toLower();
+    };
+    const CEValoresAtributos valores = [&](const QString& tag, const QString&) {
+        return valor(tag);
+    };
+    OdDbObjectId bloco;
+    ASSERT_FALSE(CICad::InsereBloco(caminho, "MUITOS", "0", 0, 0, 0, 0).isNull());
+    ASSERT_TRUE(CICad::GetBlocoId("MUITOS", bloco));
+    const OdDbObjectId id = CICad::InsereReferencia(bloco, "0", 3, 4, 0, 0, valores);
+    auto* ref = dynamic_cast<zvdb::BlockReference*>(db().objectByHandle(id.handle()));
+    ASSERT_TRUE(ref);
+    const auto esperados = [&] {
+        std::vector<std::string> todos;
+        for (const QString& tag : tags)
+            todos.push_back(valor(tag).value_or(QString()).toStdString());
+        return todos;
+    }();
+    const auto lidos = [](const zvdb::BlockReference& referencia) {
+        std::vector<std::string> todos;
+        for (zvdb::Attribute* atributo : referencia.attributes())
+            todos.emplace_back(atributo->textValue());
+        return todos;
+    };
+    EXPECT_EQ(lidos(*ref), esperados);
+    EXPECT_EQ(esperados[9], "ação Ø CAMPO_9");
+    EXPECT_EQ(esperados[5].size(), 1500u);
+    const auto salvo = zvdb::DxfLoader::load(zvdb::DxfWriter::toText(db()));
+    auto* lido = dynamic_cast<zvdb::BlockReference*>(salvo->objectByHandle(id.handle()));
+    ASSERT_TRUE(lido);
+    EXPECT_EQ(lidos(*lido), esperados);
+}
+
 TEST_F(FacadeFixture, ValuesAreAskedWithTheDefinitionsCurrentTagAndDefault) {
     const QString caminho = arquivoBloco("ROW", {"CAMPO_A", "CAMPO_B"}, [](zvdb::Database& b) {
         for (zvdb::Attribute* def : b.modelSpace()->attributeDefinitions())
