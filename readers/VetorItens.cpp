@@ -81,34 +81,45 @@ void OrdenaItens(VetorItens& itens, const QStringList& campos, bool estavel) {
     // items tie on the first fields. Two places compare as their texts do, so the sort below
     // makes the very same moves as one comparing the texts.
     std::vector<std::uint32_t> postos(n * k);
-    QHash<QString, std::uint32_t> indice;
-    std::vector<Chave> distintas;
-    std::vector<std::uint32_t> ordemDistintas, lugar;
     static const QString kVazio;
-    for (size_t c = 0; c < k; ++c) {
-        indice.clear();
-        distintas.clear();
-        // The field's number is found once, and the texts are read where the items hold
-        // them; a run of items with one text (a strip's terminals) asks the index once.
-        const std::uint32_t numero = CamposItem::numeroSeHouver(campos[int(c)]);
+    // Per field: its number, its texts' index and the distinct texts in order of meeting.
+    struct PorCampo {
+        std::uint32_t numero = CamposItem::kSemNome;
+        QHash<QString, std::uint32_t> indice;
+        std::vector<Chave> distintas;
         const QString* anterior = nullptr;
         std::uint32_t postoAnterior = 0;
-        for (size_t i = 0; i < n; ++i) {
-            const QString* achado = itens[i] && numero != CamposItem::kSemNome
-                                        ? itens[i]->campos.procura(numero)
+    };
+    std::vector<PorCampo> porCampo(k);
+    for (size_t c = 0; c < k; ++c)
+        porCampo[c].numero = CamposItem::numeroSeHouver(campos[int(c)]);
+    // One pass over the items reads all their sort fields while each item's fields are at
+    // hand; a run of items with one text (a strip's terminals) asks the field's index once.
+    for (size_t i = 0; i < n; ++i) {
+        const CEItemLista* item = itens[i];
+        for (size_t c = 0; c < k; ++c) {
+            PorCampo& campo = porCampo[c];
+            const QString* achado = item && campo.numero != CamposItem::kSemNome
+                                        ? item->campos.procura(campo.numero)
                                         : nullptr;
             const QString& valor = achado ? *achado : kVazio;
-            if (!anterior || valor != *anterior) {
-                auto it = indice.constFind(valor);
-                if (it == indice.constEnd()) {
-                    it = indice.insert(valor, std::uint32_t(distintas.size()));
-                    distintas.push_back({ZVString::FormaNatural(valor), valor});
+            if (!campo.anterior || valor != *campo.anterior) {
+                auto it = campo.indice.constFind(valor);
+                if (it == campo.indice.constEnd()) {
+                    it = campo.indice.insert(valor, std::uint32_t(campo.distintas.size()));
+                    campo.distintas.push_back({ZVString::FormaNatural(valor), valor});
                 }
-                postoAnterior = it.value();
-                anterior = &valor;
+                campo.postoAnterior = it.value();
+                campo.anterior = &valor;
             }
-            postos[i * k + c] = postoAnterior;
+            postos[i * k + c] = campo.postoAnterior;
         }
+    }
+    // Each field's texts are put in order once; an item's place becomes the rank of its
+    // text, so two places compare as their texts do.
+    std::vector<std::uint32_t> ordemDistintas, lugar;
+    for (size_t c = 0; c < k; ++c) {
+        const std::vector<Chave>& distintas = porCampo[c].distintas;
         ordemDistintas.resize(distintas.size());
         for (size_t d = 0; d < ordemDistintas.size(); ++d)
             ordemDistintas[d] = std::uint32_t(d);
