@@ -4,8 +4,6 @@
 #include "readers/CCBorneDataReader.h"
 #include "readers/VetorItens.h"
 
-#include <QMap>
-
 #include <algorithm>
 #include <array>
 #include <cstdint>
@@ -97,12 +95,13 @@ void CEModeloReguas::Monta(const VetorItens& itens, const Parametros& p) {
 }
 
 void CEModeloReguas::Constroi(const VetorItens& itens) {
-    static const QString kTipo = QStringLiteral("ZV_LISTA_TIPO"), kComp = QStringLiteral("COMP"),
-                         kBorne = QStringLiteral("BORNE"), kHandle = QStringLiteral("HANDLE");
+    static const QString kComp = QStringLiteral("COMP"), kBorne = QStringLiteral("BORNE"),
+                         kSemValor;
+    const std::uint32_t tipoCampo = NumeroCampo<"ZV_LISTA_TIPO">();
     VetorItens componentes, terminais;
     for (CEItemLista* item : itens) {
         if (!item) continue;
-        const QString* tipo = item->campo(kTipo);
+        const QString* tipo = item->campos.procura(tipoCampo);
         if (!tipo) continue;
         if (*tipo == kComp)
             componentes.push_back(item);
@@ -110,18 +109,22 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
             terminais.push_back(item);
     }
     componentes.ordenar({"RELACAO", "TAG", "ETIQUETA"});
+    simbolos.reserve(simbolos.size() + componentes.size());
+    simbolosPorHandle.reserve(int(componentes.size()));
     for (CEItemLista* item : componentes) {
         simbolos.push_back(std::make_unique<CESimboloDwg>(item));
         // The first symbol of a handle keeps it.
-        const QString handle = item->valorCampo(kHandle);
-        if (!simbolosPorHandle.contains(handle))
-            simbolosPorHandle.insert(handle, simbolos.back().get());
+        const QString* handle = item->campos.procura(NumeroCampo<"HANDLE">());
+        const QString& texto = handle ? *handle : kSemValor;
+        if (!simbolosPorHandle.contains(texto))
+            simbolosPorHandle.insert(texto, simbolos.back().get());
     }
     // By strip, then number, in the three languages; Spanish shares the Portuguese number
     // field, which a second time would never decide a comparison.
     terminais.ordenar({"REGUA", "STRIP", "REGLETA", "NUMERO", "NUMBER"});
     QHash<QString, CEReguaDwg*> reguaPorNome;
-    QHash<const CEItemLista*, CEBorneDwg*> bornePorItem;
+    bornes.reserve(bornes.size() + terminais.size());
+    bornesPorChave.reserve(int(terminais.size()));
     for (CEItemLista* item : terminais) {
         const QString nome = CCBorneDataReader::Regua(*item);
         const QString chave = Chave(nome, CCBorneDataReader::Numero(*item));
@@ -134,12 +137,14 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
         }
         regua->bornes.push_back(borne.get());
         borne->regua = regua;
-        static const std::pair<QString, QString> kLados[] = {
-            {QStringLiteral("REL_INI"), QStringLiteral("HANDLE_INI")},
-            {QStringLiteral("REL_FIM"), QStringLiteral("HANDLE_FIM")}};
-        for (const auto& [rel, handle] : kLados) {
-            if (item->valorCampo(rel).isEmpty()) continue;
-            if (CESimboloDwg* simbolo = simbolosPorHandle.value(item->valorCampo(handle))) {
+        const std::pair<std::uint32_t, std::uint32_t> lados[] = {
+            {NumeroCampo<"REL_INI">(), NumeroCampo<"HANDLE_INI">()},
+            {NumeroCampo<"REL_FIM">(), NumeroCampo<"HANDLE_FIM">()}};
+        for (const auto& [rel, handle] : lados) {
+            const QString* relacao = item->campos.procura(rel);
+            if (!relacao || relacao->isEmpty()) continue;
+            const QString* deQuem = item->campos.procura(handle);
+            if (CESimboloDwg* simbolo = simbolosPorHandle.value(deQuem ? *deQuem : kSemValor)) {
                 borne->ligados.push_back(simbolo);
                 simbolo->Liga(borne.get());
             }
@@ -159,6 +164,7 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
     // A terminal wired to two symbols is looked at by both: its connection values are
     // gathered once for the build.
     LigacoesDosBornes valores;
+    valores.valores.reserve(bornes.size());
     for (std::uint32_t nome = 0; nome < CamposItem::quantidadeNomes(); ++nome)
         if (PrefixoDoNome(nome) == kLigacoesDoBorne) valores.nomes.push_back(nome);
     for (const auto& regua : reguas)
@@ -174,32 +180,32 @@ std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& sim
         const int p = PrefixoDoNome(campo.nome);
         if (p >= 0 && p < kLigacoesDoBorne) porIdioma[size_t(p)].push_back(&campo);
     }
-    // A suffix given in two languages keeps the first language's value.
-    QMap<QString, QString> ligacoes;
+    // A suffix given in two languages keeps the first language's value; the connections go
+    // in the order of their suffixes. A symbol has a few: a small array does, with no node
+    // to allocate per connection.
+    std::vector<std::pair<QString, const QString*>> ligacoes;
     for (int p = 0; p < kLigacoesDoBorne; ++p)
         for (const CamposItem::Campo* campo : porIdioma[size_t(p)]) {
-            const QString sufixo = CamposItem::nome(campo->nome).mid(int(qstrlen(kPrefixos[p])));
-            if (!ligacoes.contains(sufixo)) ligacoes.insert(sufixo, campo->valor);
+            QString sufixo = CamposItem::nome(campo->nome).mid(int(qstrlen(kPrefixos[p])));
+            const bool visto = std::any_of(ligacoes.begin(), ligacoes.end(),
+                                           [&sufixo](const auto& l) { return l.first == sufixo; });
+            if (!visto) ligacoes.emplace_back(std::move(sufixo), &campo->valor);
         }
-    // The terminals of each connection value, in the symbol's own order.
-    QHash<QString, std::vector<CEBorneDwg*>> porLigacao;
-    for (CEItemDwg* ligado : simbolo.ligados) {
-        auto* borne = static_cast<CEBorneDwg*>(ligado);
-        for (const QString& valor : ValoresDeLigacao(*borne, valores)) {
-            auto& lista = porLigacao[valor];
-            if (lista.empty() || lista.back() != borne) lista.push_back(borne);
-        }
-    }
+    std::sort(ligacoes.begin(), ligacoes.end(),
+              [](const auto& a, const auto& b) { return a.first < b.first; });
+    // Each connection takes the first terminal wired to the symbol, in the symbol's own
+    // order, that has the connection's value on a side and is not taken yet.
     std::vector<CEBorneDwg*> ordem;
-    std::unordered_set<const CEBorneDwg*> tomados;
-    for (const QString& valor : ligacoes) {
-        const auto it = porLigacao.constFind(valor);
-        if (it == porLigacao.constEnd()) continue;
-        for (CEBorneDwg* borne : it.value())
-            if (tomados.insert(borne).second) {
-                ordem.push_back(borne);
-                break;
-            }
+    for (const auto& ligacao : ligacoes) {
+        const QString& valor = *ligacao.second;
+        for (CEItemDwg* ligado : simbolo.ligados) {
+            auto* borne = static_cast<CEBorneDwg*>(ligado);
+            if (std::find(ordem.begin(), ordem.end(), borne) != ordem.end()) continue;
+            const std::vector<QString>& seus = ValoresDeLigacao(*borne, valores);
+            if (std::find(seus.begin(), seus.end(), valor) == seus.end()) continue;
+            ordem.push_back(borne);
+            break;
+        }
     }
     return ordem;
 }
@@ -227,6 +233,8 @@ void CEModeloReguas::OrdenaPorSimbolos(CEReguaDwg& regua, LigacoesDosBornes& val
     ordem.reserve(regua.bornes.size());
     std::unordered_set<const CEBorneDwg*> colocados;
     std::unordered_set<const CESimboloDwg*> tratados;
+    colocados.reserve(regua.bornes.size());
+    tratados.reserve(regua.bornes.size());
     for (CEBorneDwg* borne : regua.bornes) {
         for (CEItemDwg* ligado : borne->ligados) {
             auto* simbolo = static_cast<CESimboloDwg*>(ligado);
