@@ -15,9 +15,25 @@ namespace {
 
 constexpr QChar kSeparador(0x000C);
 
-bool Difere(const CEItemLista* a, const CEItemLista* b, const QStringList& campos) {
+// The numbers of the names, each looked up once for a pass over the strips; a name no item
+// has stays kSemNome, and every item holds it empty.
+std::vector<std::uint32_t> Numeros(const QStringList& campos) {
+    std::vector<std::uint32_t> numeros;
+    numeros.reserve(size_t(campos.size()));
     for (const QString& campo : campos)
-        if (a->valorCampo(campo) != b->valorCampo(campo)) return true;
+        numeros.push_back(CamposItem::numeroSeHouver(campo));
+    return numeros;
+}
+
+// Whether the items differ in one of the fields; a field an item lacks reads as empty.
+bool Difere(const CEItemLista* a, const CEItemLista* b, const std::vector<std::uint32_t>& campos) {
+    static const QString kVazio;
+    for (const std::uint32_t campo : campos) {
+        if (campo == CamposItem::kSemNome) continue;
+        const QString* va = a->campos.procura(campo);
+        const QString* vb = b->campos.procura(campo);
+        if ((va ? *va : kVazio) != (vb ? *vb : kVazio)) return true;
+    }
     return false;
 }
 
@@ -279,8 +295,8 @@ void CEModeloReguas::CalculaTrilhas() {
     }
 }
 
-size_t CEModeloReguas::Corte(const CEReguaDwg& regua, int limite, const QStringList& chaves,
-                             bool& quebra) const {
+size_t CEModeloReguas::Corte(const CEReguaDwg& regua, int limite,
+                             const std::vector<std::uint32_t>& chaves, bool& quebra) const {
     const auto& lista = regua.bornes;
     const size_t n = lista.size();
     quebra = false;
@@ -306,7 +322,8 @@ size_t CEModeloReguas::Corte(const CEReguaDwg& regua, int limite, const QStringL
     return n;
 }
 
-void CEModeloReguas::CortaReguas(int limite, const QStringList& chaves) {
+void CEModeloReguas::CortaReguas(int limite, const QStringList& chavesQuebra) {
+    const std::vector<std::uint32_t> chaves = Numeros(chavesQuebra);
     std::vector<std::unique_ptr<CEReguaDwg>> novas;
     novas.reserve(reguas.size());
     auto anexa = [&](std::unique_ptr<CEReguaDwg> regua) {
@@ -367,7 +384,8 @@ void CEModeloReguas::CalculaPontos(double distancia, double refX, double refY) {
     }
 }
 
-void CEModeloReguas::CalculaDetalhes(const QStringList& campos) {
+void CEModeloReguas::CalculaDetalhes(const QStringList& camposDetalhe) {
+    const std::vector<std::uint32_t> campos = Numeros(camposDetalhe);
     for (const auto& regua : reguas) {
         regua->detalhes.clear();
         const auto& lista = regua->bornes;

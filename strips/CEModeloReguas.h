@@ -72,6 +72,6 @@ private:
                                                         LigacoesDosBornes& valores);
     // Where the next piece of a strip begins (the terminal count when no cut is due), and
     // whether the strip ends its page there.
-    size_t Corte(const CEReguaDwg& regua, int limite, const QStringList& chaves,
+    size_t Corte(const CEReguaDwg& regua, int limite, const std::vector<std::uint32_t>& chaves,
                  bool& quebra) const;
 };
