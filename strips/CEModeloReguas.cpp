@@ -10,6 +10,7 @@
 #include <iterator>
 #include <limits>
 #include <unordered_set>
+#include <utility>
 
 namespace {
 
@@ -212,13 +213,19 @@ std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& sim
     // Each connection takes the first terminal wired to the symbol, in the symbol's own
     // order, that has the connection's value on a side and is not taken yet.
     std::vector<CEBorneDwg*> ordem;
+    if (ligacoes.empty()) return ordem;
+    // The terminals' values are found once, not at each connection.
+    std::vector<std::pair<CEBorneDwg*, const std::vector<QString>*>> bornes;
+    bornes.reserve(simbolo.ligados.size());
+    for (CEItemDwg* ligado : simbolo.ligados) {
+        auto* borne = static_cast<CEBorneDwg*>(ligado);
+        bornes.emplace_back(borne, &ValoresDeLigacao(*borne, valores));
+    }
     for (const auto& ligacao : ligacoes) {
         const QString& valor = *ligacao.second;
-        for (CEItemDwg* ligado : simbolo.ligados) {
-            auto* borne = static_cast<CEBorneDwg*>(ligado);
+        for (const auto& [borne, seus] : bornes) {
             if (std::find(ordem.begin(), ordem.end(), borne) != ordem.end()) continue;
-            const std::vector<QString>& seus = ValoresDeLigacao(*borne, valores);
-            if (std::find(seus.begin(), seus.end(), valor) == seus.end()) continue;
+            if (std::find(seus->begin(), seus->end(), valor) == seus->end()) continue;
             ordem.push_back(borne);
             break;
         }
@@ -247,20 +254,27 @@ const std::vector<QString>& CEModeloReguas::ValoresDeLigacao(const CEBorneDwg& b
 void CEModeloReguas::OrdenaPorSimbolos(CEReguaDwg& regua, LigacoesDosBornes& valores) {
     std::vector<CEBorneDwg*> ordem;
     ordem.reserve(regua.bornes.size());
-    std::unordered_set<const CEBorneDwg*> colocados;
+    // Which of the strip's terminals are placed: a flag beside each, found by address in
+    // one sorted array, with no node per terminal.
+    std::vector<const CEBorneDwg*> porEndereco(regua.bornes.begin(), regua.bornes.end());
+    std::sort(porEndereco.begin(), porEndereco.end());
+    std::vector<char> colocado(porEndereco.size(), 0);
+    auto coloca = [&](const CEBorneDwg* borne) {
+        const auto it = std::lower_bound(porEndereco.begin(), porEndereco.end(), borne);
+        char& marca = colocado[size_t(it - porEndereco.begin())];
+        return !std::exchange(marca, char(1));
+    };
     std::unordered_set<const CESimboloDwg*> tratados;
-    colocados.reserve(regua.bornes.size());
     tratados.reserve(regua.bornes.size());
     for (CEBorneDwg* borne : regua.bornes) {
         for (CEItemDwg* ligado : borne->ligados) {
             auto* simbolo = static_cast<CESimboloDwg*>(ligado);
             if (!tratados.insert(simbolo).second) continue;
             for (CEBorneDwg* irmao : BornesDoSimbolo(*simbolo, valores))
-                if (irmao->regua == &regua && colocados.insert(irmao).second)
-                    ordem.push_back(irmao);
+                if (irmao->regua == &regua && coloca(irmao)) ordem.push_back(irmao);
         }
         // A terminal its symbols did not place keeps its turn: none is lost.
-        if (colocados.insert(borne).second) ordem.push_back(borne);
+        if (coloca(borne)) ordem.push_back(borne);
     }
     regua.bornes = std::move(ordem);
 }
