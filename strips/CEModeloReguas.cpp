@@ -79,6 +79,21 @@ int PrefixoDoNome(std::uint32_t numero) {
     return prefixo;
 }
 
+// The item's values under the names, ascending: a terminal holds many fields and few side
+// connections, so each name is looked for from where the one before stood.
+void LeLigacoes(const CEItemLista& item, const std::vector<std::uint32_t>& nomes,
+                std::vector<QString>& valores) {
+    const std::vector<CamposItem::Campo>& campos = item.campos.todos();
+    auto lugar = campos.begin();
+    for (const std::uint32_t nome : nomes) {
+        lugar = std::lower_bound(
+            lugar, campos.end(), nome,
+            [](const CamposItem::Campo& c, std::uint32_t n) { return c.nome < n; });
+        if (lugar == campos.end()) break;
+        if (lugar->nome == nome) valores.push_back(lugar->valor);
+    }
+}
+
 }  // namespace
 
 CEModeloReguas::Parametros CEModeloReguas::Parametros::DoModelo(CETemplate& modelo) {
@@ -139,6 +154,10 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
     // By strip, then number, in the three languages; Spanish shares the Portuguese number
     // field, which a second time would never decide a comparison.
     terminais.ordenar({"REGUA", "STRIP", "REGLETA", "NUMERO", "NUMBER"});
+    // The names of side connections: each terminal's values are read as it is built.
+    std::vector<std::uint32_t> nomesLigacao;
+    for (std::uint32_t nome = 0; nome < CamposItem::quantidadeNomes(); ++nome)
+        if (PrefixoDoNome(nome) == kLigacoesDoBorne) nomesLigacao.push_back(nome);
     QHash<QString, CEReguaDwg*> reguaPorNome;
     bornes.reserve(bornes.size() + terminais.size());
     bornesPorChave.reserve(int(terminais.size()));
@@ -166,6 +185,7 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
                 simbolo->Liga(borne.get());
             }
         }
+        LeLigacoes(*item, nomesLigacao, borne->ligacoes);
         bornesPorChave.insert(chave, borne.get());
         bornes.push_back(std::move(borne));
     }
@@ -178,18 +198,11 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
         borne->proximo = busca(borne->item->proximo);
         borne->anterior = busca(borne->item->anterior);
     }
-    // A terminal wired to two symbols is looked at by both: its connection values are
-    // gathered once for the build.
-    LigacoesDosBornes valores;
-    valores.valores.reserve(bornes.size());
-    for (std::uint32_t nome = 0; nome < CamposItem::quantidadeNomes(); ++nome)
-        if (PrefixoDoNome(nome) == kLigacoesDoBorne) valores.nomes.push_back(nome);
     for (const auto& regua : reguas)
-        OrdenaPorSimbolos(*regua, valores);
+        OrdenaPorSimbolos(*regua);
 }
 
-std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& simbolo,
-                                                         LigacoesDosBornes& valores) const {
+std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& simbolo) const {
     // The symbol's connections by suffix: LIGACAO_1, CONNECTION_2... One pass over its
     // fields sorts them by language.
     std::array<std::vector<const CamposItem::Campo*>, kLigacoesDoBorne> porIdioma;
@@ -213,19 +226,13 @@ std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& sim
     // Each connection takes the first terminal wired to the symbol, in the symbol's own
     // order, that has the connection's value on a side and is not taken yet.
     std::vector<CEBorneDwg*> ordem;
-    if (ligacoes.empty()) return ordem;
-    // The terminals' values are found once, not at each connection.
-    std::vector<std::pair<CEBorneDwg*, const std::vector<QString>*>> bornes;
-    bornes.reserve(simbolo.ligados.size());
-    for (CEItemDwg* ligado : simbolo.ligados) {
-        auto* borne = static_cast<CEBorneDwg*>(ligado);
-        bornes.emplace_back(borne, &ValoresDeLigacao(*borne, valores));
-    }
     for (const auto& ligacao : ligacoes) {
         const QString& valor = *ligacao.second;
-        for (const auto& [borne, seus] : bornes) {
+        for (CEItemDwg* ligado : simbolo.ligados) {
+            auto* borne = static_cast<CEBorneDwg*>(ligado);
             if (std::find(ordem.begin(), ordem.end(), borne) != ordem.end()) continue;
-            if (std::find(seus->begin(), seus->end(), valor) == seus->end()) continue;
+            const std::vector<QString>& seus = borne->ligacoes;
+            if (std::find(seus.begin(), seus.end(), valor) == seus.end()) continue;
             ordem.push_back(borne);
             break;
         }
@@ -233,25 +240,7 @@ std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& sim
     return ordem;
 }
 
-const std::vector<QString>& CEModeloReguas::ValoresDeLigacao(const CEBorneDwg& borne,
-                                                             LigacoesDosBornes& valores) {
-    auto [it, novo] = valores.valores.try_emplace(&borne);
-    if (!novo) return it->second;
-    // A terminal holds many fields and few side connections: each of those names is looked
-    // for from where the one before stood.
-    const std::vector<CamposItem::Campo>& campos = borne.item->campos.todos();
-    auto lugar = campos.begin();
-    for (const std::uint32_t nome : valores.nomes) {
-        lugar = std::lower_bound(
-            lugar, campos.end(), nome,
-            [](const CamposItem::Campo& c, std::uint32_t n) { return c.nome < n; });
-        if (lugar == campos.end()) break;
-        if (lugar->nome == nome) it->second.push_back(lugar->valor);
-    }
-    return it->second;
-}
-
-void CEModeloReguas::OrdenaPorSimbolos(CEReguaDwg& regua, LigacoesDosBornes& valores) {
+void CEModeloReguas::OrdenaPorSimbolos(CEReguaDwg& regua) {
     std::vector<CEBorneDwg*> ordem;
     ordem.reserve(regua.bornes.size());
     // Which of the strip's terminals are placed: a flag beside each, found by address in
@@ -270,7 +259,7 @@ void CEModeloReguas::OrdenaPorSimbolos(CEReguaDwg& regua, LigacoesDosBornes& val
         for (CEItemDwg* ligado : borne->ligados) {
             auto* simbolo = static_cast<CESimboloDwg*>(ligado);
             if (!tratados.insert(simbolo).second) continue;
-            for (CEBorneDwg* irmao : BornesDoSimbolo(*simbolo, valores))
+            for (CEBorneDwg* irmao : BornesDoSimbolo(*simbolo))
                 if (irmao->regua == &regua && coloca(irmao)) ordem.push_back(irmao);
         }
         // A terminal its symbols did not place keeps its turn: none is lost.
