@@ -159,6 +159,7 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
     for (std::uint32_t nome = 0; nome < CamposItem::quantidadeNomes(); ++nome)
         if (PrefixoDoNome(nome) == kLigacoesDoBorne) nomesLigacao.push_back(nome);
     QHash<QString, CEReguaDwg*> reguaPorNome;
+    CEReguaDwg* ultima = nullptr;
     bornes.reserve(bornes.size() + terminais.size());
     bornesPorChave.reserve(int(terminais.size()));
     for (CEItemLista* item : terminais) {
@@ -166,11 +167,16 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
         const QString chave = Chave(nome, CCBorneDataReader::Numero(*item));
         if (bornesPorChave.contains(chave)) continue;  // the first of a strip and number wins
         auto borne = std::make_unique<CEBorneDwg>(item);
-        CEReguaDwg*& regua = reguaPorNome[nome];
-        if (!regua) {
-            reguas.push_back(std::make_unique<CEReguaDwg>(nome));
-            regua = reguas.back().get();
+        // Sorted by strip, a terminal mostly stands on the strip of the one before.
+        if (!ultima || ultima->nome != nome) {
+            CEReguaDwg*& regua = reguaPorNome[nome];
+            if (!regua) {
+                reguas.push_back(std::make_unique<CEReguaDwg>(nome));
+                regua = reguas.back().get();
+            }
+            ultima = regua;
         }
+        CEReguaDwg* regua = ultima;
         regua->bornes.push_back(borne.get());
         borne->regua = regua;
         const std::pair<std::uint32_t, std::uint32_t> lados[] = {
@@ -203,23 +209,21 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
 }
 
 std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& simbolo) const {
-    // The symbol's connections by suffix: LIGACAO_1, CONNECTION_2... One pass over its
-    // fields sorts them by language.
-    std::array<std::vector<const CamposItem::Campo*>, kLigacoesDoBorne> porIdioma;
-    for (const CamposItem::Campo& campo : simbolo.item->campos.todos()) {
-        const int p = PrefixoDoNome(campo.nome);
-        if (p >= 0 && p < kLigacoesDoBorne) porIdioma[size_t(p)].push_back(&campo);
-    }
-    // A suffix given in two languages keeps the first language's value; the connections go
-    // in the order of their suffixes. A symbol has a few: a small array does, with no node
-    // to allocate per connection.
-    std::vector<std::pair<QString, const QString*>> ligacoes;
+    // The symbol's connections by suffix: LIGACAO_1, CONNECTION_2... A suffix given in two
+    // languages keeps the first language's value; the connections go in the order of their
+    // suffixes. A symbol has a few fields and fewer connections: one look at its fields per
+    // language, and the suffixes read in place in the names, with nothing allocated but the
+    // small array.
+    const std::vector<CamposItem::Campo>& campos = simbolo.item->campos.todos();
+    std::vector<std::pair<QStringRef, const QString*>> ligacoes;
     for (int p = 0; p < kLigacoesDoBorne; ++p)
-        for (const CamposItem::Campo* campo : porIdioma[size_t(p)]) {
-            QString sufixo = CamposItem::nome(campo->nome).mid(int(qstrlen(kPrefixos[p])));
+        for (const CamposItem::Campo& campo : campos) {
+            if (PrefixoDoNome(campo.nome) != p) continue;
+            const QStringRef sufixo =
+                CamposItem::nome(campo.nome).midRef(int(qstrlen(kPrefixos[p])));
             const bool visto = std::any_of(ligacoes.begin(), ligacoes.end(),
                                            [&sufixo](const auto& l) { return l.first == sufixo; });
-            if (!visto) ligacoes.emplace_back(std::move(sufixo), &campo->valor);
+            if (!visto) ligacoes.emplace_back(sufixo, &campo.valor);
         }
     std::sort(ligacoes.begin(), ligacoes.end(),
               [](const auto& a, const auto& b) { return a.first < b.first; });
