@@ -209,21 +209,25 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
 }
 
 std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& simbolo) const {
-    // The symbol's connections by suffix: LIGACAO_1, CONNECTION_2... A suffix given in two
-    // languages keeps the first language's value; the connections go in the order of their
-    // suffixes. A symbol has a few fields and fewer connections: one look at its fields per
-    // language, and the suffixes read in place in the names, with nothing allocated but the
-    // small array.
-    const std::vector<CamposItem::Campo>& campos = simbolo.item->campos.todos();
+    // The symbol's connections by suffix: LIGACAO_1, CONNECTION_2... One pass over its
+    // fields finds them with their languages.
+    std::vector<std::pair<int, const CamposItem::Campo*>> achados;
+    for (const CamposItem::Campo& campo : simbolo.item->campos.todos()) {
+        const int p = PrefixoDoNome(campo.nome);
+        if (p >= 0 && p < kLigacoesDoBorne) achados.emplace_back(p, &campo);
+    }
+    // A suffix given in two languages keeps the first language's value; the connections go
+    // in the order of their suffixes. A symbol has few: small arrays do, with the suffixes
+    // read in place in the names.
     std::vector<std::pair<QStringRef, const QString*>> ligacoes;
     for (int p = 0; p < kLigacoesDoBorne; ++p)
-        for (const CamposItem::Campo& campo : campos) {
-            if (PrefixoDoNome(campo.nome) != p) continue;
+        for (const auto& [idioma, campo] : achados) {
+            if (idioma != p) continue;
             const QStringRef sufixo =
-                CamposItem::nome(campo.nome).midRef(int(qstrlen(kPrefixos[p])));
+                CamposItem::nome(campo->nome).midRef(int(qstrlen(kPrefixos[p])));
             const bool visto = std::any_of(ligacoes.begin(), ligacoes.end(),
                                            [&sufixo](const auto& l) { return l.first == sufixo; });
-            if (!visto) ligacoes.emplace_back(sufixo, &campo.valor);
+            if (!visto) ligacoes.emplace_back(sufixo, &campo->valor);
         }
     std::sort(ligacoes.begin(), ligacoes.end(),
               [](const auto& a, const auto& b) { return a.first < b.first; });
