@@ -131,26 +131,41 @@ void OrdenaItens(VetorItens& itens, const QStringList& campos, bool estavel) {
     // items tie on the first fields. Two places compare as their texts do, so the sort below
     // makes the very same moves as one comparing the texts.
     std::vector<std::uint32_t> postos(n * k);
-    std::vector<std::uint32_t> ordemDistintas, lugar;
     static const QString kVazio;
-    for (size_t c = 0; c < k; ++c) {
-        TextosDistintos distintas(n);
-        // The field's number is found once, and the texts are read where the items hold
-        // them; a run of items with one text (a strip's terminals) asks the table once.
-        const std::uint32_t numero = CamposItem::numeroSeHouver(campos[int(c)]);
+    // Per field: its number (found once), its distinct texts, and the last text met.
+    struct PorCampo {
+        std::uint32_t numero;
+        TextosDistintos distintas;
         const QString* anterior = nullptr;
         std::uint32_t postoAnterior = 0;
-        for (size_t i = 0; i < n; ++i) {
-            const QString* achado = itens[i] && numero != CamposItem::kSemNome
-                                        ? itens[i]->campos.procura(numero)
+    };
+    std::vector<PorCampo> porCampo;
+    porCampo.reserve(k);
+    for (size_t c = 0; c < k; ++c)
+        porCampo.push_back({CamposItem::numeroSeHouver(campos[int(c)]), TextosDistintos(n)});
+    // One pass over the items reads all their sort fields where the items hold them, while
+    // each item's fields are at hand; a run of items with one text (a strip's terminals)
+    // asks the field's table once.
+    for (size_t i = 0; i < n; ++i) {
+        const CEItemLista* item = itens[i];
+        for (size_t c = 0; c < k; ++c) {
+            PorCampo& campo = porCampo[c];
+            const QString* achado = item && campo.numero != CamposItem::kSemNome
+                                        ? item->campos.procura(campo.numero)
                                         : nullptr;
             const QString& valor = achado ? *achado : kVazio;
-            if (!anterior || valor != *anterior) {
-                postoAnterior = distintas.numero(valor);
-                anterior = &valor;
+            if (!campo.anterior || valor != *campo.anterior) {
+                campo.postoAnterior = campo.distintas.numero(valor);
+                campo.anterior = &valor;
             }
-            postos[i * k + c] = postoAnterior;
+            postos[i * k + c] = campo.postoAnterior;
         }
+    }
+    // Each field's texts are put in order once; an item's place becomes the rank of its
+    // text, so two places compare as their texts do.
+    std::vector<std::uint32_t> ordemDistintas, lugar;
+    for (size_t c = 0; c < k; ++c) {
+        const TextosDistintos& distintas = porCampo[c].distintas;
         ordemDistintas.resize(distintas.size());
         for (size_t d = 0; d < ordemDistintas.size(); ++d)
             ordemDistintas[d] = std::uint32_t(d);

@@ -6,9 +6,10 @@
 
 #include <QSet>
 
+#include <algorithm>
 #include <array>
 #include <memory>
-#include <unordered_set>
+#include <vector>
 
 namespace {
 
@@ -128,10 +129,12 @@ VetorItens* CCBorneDwgDataReader::LerDados(zvdb::Database* database,
 
     auto* resposta = new VetorItens(componentes);
     resposta->insert(resposta->end(), bornes.begin(), bornes.end());
-    // What the filters took out is freed now: nothing that stays points at it.
-    const std::unordered_set<CEItemLista*> ficam(resposta->begin(), resposta->end());
+    // What the filters took out is freed now: nothing that stays points at it. What stays
+    // is found in one sorted array, with no node per item.
+    std::vector<const CEItemLista*> ficam(resposta->begin(), resposta->end());
+    std::sort(ficam.begin(), ficam.end());
     for (CEItemLista* item : *lidos)
-        if (!ficam.count(item)) delete item;
+        if (!std::binary_search(ficam.begin(), ficam.end(), item)) delete item;
     progresso.Definir(95);
     return resposta;
 }

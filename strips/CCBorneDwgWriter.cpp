@@ -53,13 +53,32 @@ OdDbObjectId CCBorneDwgWriter::Insere(const Bloco& bloco, const QString& layer, 
     return insercoes_.Insere(bloco.arquivo, bloco.nome, layer, x, y);
 }
 
+const CCBorneDwgWriter::CampoDoTag& CCBorneDwgWriter::CampoDe(const QString& tag) {
+    auto it = camposPorTag_.find(tag);
+    if (it == camposPorTag_.end())
+        it = camposPorTag_.insert(
+            tag, {ComecaCom(tag, "VARIAVEL", "VARIABLE"), CamposItem::kSemNome, SIZE_MAX});
+    CampoDoTag& campo = it.value();
+    // A name no item had may come with a later item: it is looked up again then.
+    if (!campo.variavel && campo.nomes != CamposItem::quantidadeNomes()) {
+        campo.numero = CamposItem::numeroSeHouver(tag);
+        campo.nomes = CamposItem::quantidadeNomes();
+    }
+    return campo;
+}
+
 OdDbObjectId CCBorneDwgWriter::InserePreenchido(const Bloco& bloco, const QString& layer, double x,
                                                 double y, const CEItemLista& item) {
     // A VARIAVEL cell names the field in its default text; any other is the field of its tag.
     return preenchidos_.Insere(bloco.arquivo, bloco.nome, layer, x, y, item,
-                               [&item](const QString& tag, const QString& padrao) {
-                                   return std::optional<QString>(item.valorCampo(
-                                       ComecaCom(tag, "VARIAVEL", "VARIABLE") ? padrao : tag));
+                               [this, &item](const QString& tag, const QString& padrao) {
+                                   const CampoDoTag& campo = CampoDe(tag);
+                                   if (campo.variavel)
+                                       return std::optional<QString>(item.valorCampo(padrao));
+                                   const QString* valor = campo.numero == CamposItem::kSemNome
+                                                              ? nullptr
+                                                              : item.campos.procura(campo.numero);
+                                   return std::optional<QString>(valor ? *valor : QString());
                                });
 }
 

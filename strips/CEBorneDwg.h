@@ -2,6 +2,8 @@
 // One terminal of a drawn strip, with the state of each jumper track beside it.
 #include "CEItemDwg.h"
 
+#include <QString>
+
 #include <cstdint>
 #include <vector>
 
@@ -29,4 +31,7 @@ public:
     // The terminals of the item's jumper links, when they are in the drawing.
     CEBorneDwg* proximo = nullptr;
     CEBorneDwg* anterior = nullptr;
+    // The values of the item's side connections (LIG_...), in field order: the symbols wired
+    // to the terminal place it by them.
+    std::vector<QString> ligacoes;
 };

@@ -4,22 +4,37 @@
 #include "readers/CCBorneDataReader.h"
 #include "readers/VetorItens.h"
 
-#include <QMap>
-
 #include <algorithm>
 #include <array>
 #include <cstdint>
 #include <iterator>
 #include <limits>
 #include <unordered_set>
+#include <utility>
 
 namespace {
 
 constexpr QChar kSeparador(0x000C);
 
-bool Difere(const CEItemLista* a, const CEItemLista* b, const QStringList& campos) {
+// The numbers of the names, each looked up once for a pass over the strips; a name no item
+// has stays kSemNome, and every item holds it empty.
+std::vector<std::uint32_t> Numeros(const QStringList& campos) {
+    std::vector<std::uint32_t> numeros;
+    numeros.reserve(size_t(campos.size()));
     for (const QString& campo : campos)
-        if (a->valorCampo(campo) != b->valorCampo(campo)) return true;
+        numeros.push_back(CamposItem::numeroSeHouver(campo));
+    return numeros;
+}
+
+// Whether the items differ in one of the fields; a field an item lacks reads as empty.
+bool Difere(const CEItemLista* a, const CEItemLista* b, const std::vector<std::uint32_t>& campos) {
+    static const QString kVazio;
+    for (const std::uint32_t campo : campos) {
+        if (campo == CamposItem::kSemNome) continue;
+        const QString* va = a->campos.procura(campo);
+        const QString* vb = b->campos.procura(campo);
+        if ((va ? *va : kVazio) != (vb ? *vb : kVazio)) return true;
+    }
     return false;
 }
 
@@ -64,6 +79,21 @@ int PrefixoDoNome(std::uint32_t numero) {
     return prefixo;
 }
 
+// The item's values under the names, ascending: a terminal holds many fields and few side
+// connections, so each name is looked for from where the one before stood.
+void LeLigacoes(const CEItemLista& item, const std::vector<std::uint32_t>& nomes,
+                std::vector<QString>& valores) {
+    const std::vector<CamposItem::Campo>& campos = item.campos.todos();
+    auto lugar = campos.begin();
+    for (const std::uint32_t nome : nomes) {
+        lugar = std::lower_bound(
+            lugar, campos.end(), nome,
+            [](const CamposItem::Campo& c, std::uint32_t n) { return c.nome < n; });
+        if (lugar == campos.end()) break;
+        if (lugar->nome == nome) valores.push_back(lugar->valor);
+    }
+}
+
 }  // namespace
 
 CEModeloReguas::Parametros CEModeloReguas::Parametros::DoModelo(CETemplate& modelo) {
@@ -97,12 +127,13 @@ void CEModeloReguas::Monta(const VetorItens& itens, const Parametros& p) {
 }
 
 void CEModeloReguas::Constroi(const VetorItens& itens) {
-    static const QString kTipo = QStringLiteral("ZV_LISTA_TIPO"), kComp = QStringLiteral("COMP"),
-                         kBorne = QStringLiteral("BORNE"), kHandle = QStringLiteral("HANDLE");
+    static const QString kComp = QStringLiteral("COMP"), kBorne = QStringLiteral("BORNE"),
+                         kSemValor;
+    const std::uint32_t tipoCampo = NumeroCampo<"ZV_LISTA_TIPO">();
     VetorItens componentes, terminais;
     for (CEItemLista* item : itens) {
         if (!item) continue;
-        const QString* tipo = item->campo(kTipo);
+        const QString* tipo = item->campos.procura(tipoCampo);
         if (!tipo) continue;
         if (*tipo == kComp)
             componentes.push_back(item);
@@ -110,40 +141,57 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
             terminais.push_back(item);
     }
     componentes.ordenar({"RELACAO", "TAG", "ETIQUETA"});
+    simbolos.reserve(simbolos.size() + componentes.size());
+    simbolosPorHandle.reserve(int(componentes.size()));
     for (CEItemLista* item : componentes) {
         simbolos.push_back(std::make_unique<CESimboloDwg>(item));
         // The first symbol of a handle keeps it.
-        const QString handle = item->valorCampo(kHandle);
-        if (!simbolosPorHandle.contains(handle))
-            simbolosPorHandle.insert(handle, simbolos.back().get());
+        const QString* handle = item->campos.procura(NumeroCampo<"HANDLE">());
+        const QString& texto = handle ? *handle : kSemValor;
+        if (!simbolosPorHandle.contains(texto))
+            simbolosPorHandle.insert(texto, simbolos.back().get());
     }
     // By strip, then number, in the three languages; Spanish shares the Portuguese number
     // field, which a second time would never decide a comparison.
     terminais.ordenar({"REGUA", "STRIP", "REGLETA", "NUMERO", "NUMBER"});
+    // The names of side connections: each terminal's values are read as it is built.
+    std::vector<std::uint32_t> nomesLigacao;
+    for (std::uint32_t nome = 0; nome < CamposItem::quantidadeNomes(); ++nome)
+        if (PrefixoDoNome(nome) == kLigacoesDoBorne) nomesLigacao.push_back(nome);
     QHash<QString, CEReguaDwg*> reguaPorNome;
-    QHash<const CEItemLista*, CEBorneDwg*> bornePorItem;
+    CEReguaDwg* ultima = nullptr;
+    bornes.reserve(bornes.size() + terminais.size());
+    bornesPorChave.reserve(int(terminais.size()));
     for (CEItemLista* item : terminais) {
         const QString nome = CCBorneDataReader::Regua(*item);
         const QString chave = Chave(nome, CCBorneDataReader::Numero(*item));
         if (bornesPorChave.contains(chave)) continue;  // the first of a strip and number wins
         auto borne = std::make_unique<CEBorneDwg>(item);
-        CEReguaDwg*& regua = reguaPorNome[nome];
-        if (!regua) {
-            reguas.push_back(std::make_unique<CEReguaDwg>(nome));
-            regua = reguas.back().get();
+        // Sorted by strip, a terminal mostly stands on the strip of the one before.
+        if (!ultima || ultima->nome != nome) {
+            CEReguaDwg*& regua = reguaPorNome[nome];
+            if (!regua) {
+                reguas.push_back(std::make_unique<CEReguaDwg>(nome));
+                regua = reguas.back().get();
+            }
+            ultima = regua;
         }
+        CEReguaDwg* regua = ultima;
         regua->bornes.push_back(borne.get());
         borne->regua = regua;
-        static const std::pair<QString, QString> kLados[] = {
-            {QStringLiteral("REL_INI"), QStringLiteral("HANDLE_INI")},
-            {QStringLiteral("REL_FIM"), QStringLiteral("HANDLE_FIM")}};
-        for (const auto& [rel, handle] : kLados) {
-            if (item->valorCampo(rel).isEmpty()) continue;
-            if (CESimboloDwg* simbolo = simbolosPorHandle.value(item->valorCampo(handle))) {
+        const std::pair<std::uint32_t, std::uint32_t> lados[] = {
+            {NumeroCampo<"REL_INI">(), NumeroCampo<"HANDLE_INI">()},
+            {NumeroCampo<"REL_FIM">(), NumeroCampo<"HANDLE_FIM">()}};
+        for (const auto& [rel, handle] : lados) {
+            const QString* relacao = item->campos.procura(rel);
+            if (!relacao || relacao->isEmpty()) continue;
+            const QString* deQuem = item->campos.procura(handle);
+            if (CESimboloDwg* simbolo = simbolosPorHandle.value(deQuem ? *deQuem : kSemValor)) {
                 borne->ligados.push_back(simbolo);
                 simbolo->Liga(borne.get());
             }
         }
+        LeLigacoes(*item, nomesLigacao, borne->ligacoes);
         bornesPorChave.insert(chave, borne.get());
         bornes.push_back(std::move(borne));
     }
@@ -156,87 +204,74 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
         borne->proximo = busca(borne->item->proximo);
         borne->anterior = busca(borne->item->anterior);
     }
-    // A terminal wired to two symbols is looked at by both: its connection values are
-    // gathered once for the build.
-    LigacoesDosBornes valores;
-    for (std::uint32_t nome = 0; nome < CamposItem::quantidadeNomes(); ++nome)
-        if (PrefixoDoNome(nome) == kLigacoesDoBorne) valores.nomes.push_back(nome);
     for (const auto& regua : reguas)
-        OrdenaPorSimbolos(*regua, valores);
+        OrdenaPorSimbolos(*regua);
 }
 
-std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& simbolo,
-                                                         LigacoesDosBornes& valores) const {
+std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& simbolo) const {
     // The symbol's connections by suffix: LIGACAO_1, CONNECTION_2... One pass over its
-    // fields sorts them by language.
-    std::array<std::vector<const CamposItem::Campo*>, kLigacoesDoBorne> porIdioma;
+    // fields finds them with their languages.
+    std::vector<std::pair<int, const CamposItem::Campo*>> achados;
     for (const CamposItem::Campo& campo : simbolo.item->campos.todos()) {
         const int p = PrefixoDoNome(campo.nome);
-        if (p >= 0 && p < kLigacoesDoBorne) porIdioma[size_t(p)].push_back(&campo);
+        if (p >= 0 && p < kLigacoesDoBorne) achados.emplace_back(p, &campo);
     }
-    // A suffix given in two languages keeps the first language's value.
-    QMap<QString, QString> ligacoes;
+    // A suffix given in two languages keeps the first language's value; the connections go
+    // in the order of their suffixes. A symbol has few: small arrays do, with the suffixes
+    // read in place in the names.
+    std::vector<std::pair<QStringRef, const QString*>> ligacoes;
     for (int p = 0; p < kLigacoesDoBorne; ++p)
-        for (const CamposItem::Campo* campo : porIdioma[size_t(p)]) {
-            const QString sufixo = CamposItem::nome(campo->nome).mid(int(qstrlen(kPrefixos[p])));
-            if (!ligacoes.contains(sufixo)) ligacoes.insert(sufixo, campo->valor);
+        for (const auto& [idioma, campo] : achados) {
+            if (idioma != p) continue;
+            const QStringRef sufixo =
+                CamposItem::nome(campo->nome).midRef(int(qstrlen(kPrefixos[p])));
+            const bool visto = std::any_of(ligacoes.begin(), ligacoes.end(),
+                                           [&sufixo](const auto& l) { return l.first == sufixo; });
+            if (!visto) ligacoes.emplace_back(sufixo, &campo->valor);
         }
-    // The terminals of each connection value, in the symbol's own order.
-    QHash<QString, std::vector<CEBorneDwg*>> porLigacao;
-    for (CEItemDwg* ligado : simbolo.ligados) {
-        auto* borne = static_cast<CEBorneDwg*>(ligado);
-        for (const QString& valor : ValoresDeLigacao(*borne, valores)) {
-            auto& lista = porLigacao[valor];
-            if (lista.empty() || lista.back() != borne) lista.push_back(borne);
-        }
-    }
+    std::sort(ligacoes.begin(), ligacoes.end(),
+              [](const auto& a, const auto& b) { return a.first < b.first; });
+    // Each connection takes the first terminal wired to the symbol, in the symbol's own
+    // order, that has the connection's value on a side and is not taken yet.
     std::vector<CEBorneDwg*> ordem;
-    std::unordered_set<const CEBorneDwg*> tomados;
-    for (const QString& valor : ligacoes) {
-        const auto it = porLigacao.constFind(valor);
-        if (it == porLigacao.constEnd()) continue;
-        for (CEBorneDwg* borne : it.value())
-            if (tomados.insert(borne).second) {
-                ordem.push_back(borne);
-                break;
-            }
+    for (const auto& ligacao : ligacoes) {
+        const QString& valor = *ligacao.second;
+        for (CEItemDwg* ligado : simbolo.ligados) {
+            auto* borne = static_cast<CEBorneDwg*>(ligado);
+            if (std::find(ordem.begin(), ordem.end(), borne) != ordem.end()) continue;
+            const std::vector<QString>& seus = borne->ligacoes;
+            if (std::find(seus.begin(), seus.end(), valor) == seus.end()) continue;
+            ordem.push_back(borne);
+            break;
+        }
     }
     return ordem;
 }
 
-const std::vector<QString>& CEModeloReguas::ValoresDeLigacao(const CEBorneDwg& borne,
-                                                             LigacoesDosBornes& valores) {
-    auto [it, novo] = valores.valores.try_emplace(&borne);
-    if (!novo) return it->second;
-    // A terminal holds many fields and few side connections: each of those names is looked
-    // for from where the one before stood.
-    const std::vector<CamposItem::Campo>& campos = borne.item->campos.todos();
-    auto lugar = campos.begin();
-    for (const std::uint32_t nome : valores.nomes) {
-        lugar = std::lower_bound(
-            lugar, campos.end(), nome,
-            [](const CamposItem::Campo& c, std::uint32_t n) { return c.nome < n; });
-        if (lugar == campos.end()) break;
-        if (lugar->nome == nome) it->second.push_back(lugar->valor);
-    }
-    return it->second;
-}
-
-void CEModeloReguas::OrdenaPorSimbolos(CEReguaDwg& regua, LigacoesDosBornes& valores) {
+void CEModeloReguas::OrdenaPorSimbolos(CEReguaDwg& regua) {
     std::vector<CEBorneDwg*> ordem;
     ordem.reserve(regua.bornes.size());
-    std::unordered_set<const CEBorneDwg*> colocados;
+    // Which of the strip's terminals are placed: a flag beside each, found by address in
+    // one sorted array, with no node per terminal.
+    std::vector<const CEBorneDwg*> porEndereco(regua.bornes.begin(), regua.bornes.end());
+    std::sort(porEndereco.begin(), porEndereco.end());
+    std::vector<char> colocado(porEndereco.size(), 0);
+    auto coloca = [&](const CEBorneDwg* borne) {
+        const auto it = std::lower_bound(porEndereco.begin(), porEndereco.end(), borne);
+        char& marca = colocado[size_t(it - porEndereco.begin())];
+        return !std::exchange(marca, char(1));
+    };
     std::unordered_set<const CESimboloDwg*> tratados;
+    tratados.reserve(regua.bornes.size());
     for (CEBorneDwg* borne : regua.bornes) {
         for (CEItemDwg* ligado : borne->ligados) {
             auto* simbolo = static_cast<CESimboloDwg*>(ligado);
             if (!tratados.insert(simbolo).second) continue;
-            for (CEBorneDwg* irmao : BornesDoSimbolo(*simbolo, valores))
-                if (irmao->regua == &regua && colocados.insert(irmao).second)
-                    ordem.push_back(irmao);
+            for (CEBorneDwg* irmao : BornesDoSimbolo(*simbolo))
+                if (irmao->regua == &regua && coloca(irmao)) ordem.push_back(irmao);
         }
         // A terminal its symbols did not place keeps its turn: none is lost.
-        if (colocados.insert(borne).second) ordem.push_back(borne);
+        if (coloca(borne)) ordem.push_back(borne);
     }
     regua.bornes = std::move(ordem);
 }
@@ -271,8 +306,8 @@ void CEModeloReguas::CalculaTrilhas() {
     }
 }
 
-size_t CEModeloReguas::Corte(const CEReguaDwg& regua, int limite, const QStringList& chaves,
-                             bool& quebra) const {
+size_t CEModeloReguas::Corte(const CEReguaDwg& regua, int limite,
+                             const std::vector<std::uint32_t>& chaves, bool& quebra) const {
     const auto& lista = regua.bornes;
     const size_t n = lista.size();
     quebra = false;
@@ -298,7 +333,8 @@ size_t CEModeloReguas::Corte(const CEReguaDwg& regua, int limite, const QStringL
     return n;
 }
 
-void CEModeloReguas::CortaReguas(int limite, const QStringList& chaves) {
+void CEModeloReguas::CortaReguas(int limite, const QStringList& chavesQuebra) {
+    const std::vector<std::uint32_t> chaves = Numeros(chavesQuebra);
     std::vector<std::unique_ptr<CEReguaDwg>> novas;
     novas.reserve(reguas.size());
     auto anexa = [&](std::unique_ptr<CEReguaDwg> regua) {
@@ -359,7 +395,8 @@ void CEModeloReguas::CalculaPontos(double distancia, double refX, double refY) {
     }
 }
 
-void CEModeloReguas::CalculaDetalhes(const QStringList& campos) {
+void CEModeloReguas::CalculaDetalhes(const QStringList& camposDetalhe) {
+    const std::vector<std::uint32_t> campos = Numeros(camposDetalhe);
     for (const auto& regua : reguas) {
         regua->detalhes.clear();
         const auto& lista = regua->bornes;

@@ -13,7 +13,6 @@
 
 #include <cstdint>
 #include <memory>
-#include <unordered_map>
 #include <vector>
 
 class CETemplate;
@@ -58,20 +57,11 @@ public:
     std::vector<std::unique_ptr<CEReguaDwg>> reguas;
 
 private:
-    // Per terminal, the values of its side connections (LIG_...) in field order; `nomes`, the
-    // numbers of the names that are side connections, ascending.
-    struct LigacoesDosBornes {
-        std::vector<std::uint32_t> nomes;
-        std::unordered_map<const CEBorneDwg*, std::vector<QString>> valores;
-    };
-    void OrdenaPorSimbolos(CEReguaDwg& regua, LigacoesDosBornes& valores);
+    void OrdenaPorSimbolos(CEReguaDwg& regua);
     // The symbol's terminals in the order of its connections; those that match none drop.
-    std::vector<CEBorneDwg*> BornesDoSimbolo(const CESimboloDwg& simbolo,
-                                             LigacoesDosBornes& valores) const;
-    static const std::vector<QString>& ValoresDeLigacao(const CEBorneDwg& borne,
-                                                        LigacoesDosBornes& valores);
+    std::vector<CEBorneDwg*> BornesDoSimbolo(const CESimboloDwg& simbolo) const;
     // Where the next piece of a strip begins (the terminal count when no cut is due), and
     // whether the strip ends its page there.
-    size_t Corte(const CEReguaDwg& regua, int limite, const QStringList& chaves,
+    size_t Corte(const CEReguaDwg& regua, int limite, const std::vector<std::uint32_t>& chaves,
                  bool& quebra) const;
 };

@@ -37,6 +37,9 @@ struct Insercao {
     QStringList rep;
 };
 
+// A tag of the terminal block whose field no item of these tests has until one test gives it.
+const QString kAcabamento = QStringLiteral("ACABAMENTO_BORNE_DESENHO");
+
 class DesenhoReguasTest : public ::testing::Test {
 protected:
     static void SetUpTestSuite() {
@@ -48,7 +51,7 @@ protected:
         ASSERT_TRUE(problema.isEmpty()) << problema.toStdString();
         // The strip pieces: each a frame with the attributes that its role fills.
         Bloco("REGUA_CAB", {{"REGUA", ""}, {"TITULO", "Regua"}});
-        Bloco("REGUA_BORNE", {{"VARIAVEL_NUMERO", "NUMERO"}, {"ZV_KEY", ""}});
+        Bloco("REGUA_BORNE", {{"VARIAVEL_NUMERO", "NUMERO"}, {"ZV_KEY", ""}, {kAcabamento, ""}});
         Bloco("REGUA_DET",
               {{"VARIAVEL_REL", "RELACAO_INI"}, {"FUNCAO_QTD", "(itoa (length reg))"}});
         for (const char* nome :
@@ -236,6 +239,27 @@ TEST_F(DesenhoReguasTest, ARunKeepsItsFieldsAfterItsDetailIsDrawn) {
     for (const Insercao& i : Salvo())
         if (i.nome == "REGUA_DET") relacoes << i.atributos["VARIAVEL_REL"].toString();
     EXPECT_EQ(relacoes, QStringList({"K1", "K2"}));
+}
+
+// Each terminal's block shows its own fields, a field missing as blank; a writer that drew
+// before any item had a field shows it once an item has it.
+TEST_F(DesenhoReguasTest, TerminalAttributesComeFromEachItemAndFromFieldsNamedLater) {
+    ASSERT_EQ(CamposItem::numeroSeHouver(kAcabamento), CamposItem::kSemNome);
+    auto x1 = itens_.Regua("X1", 3);
+    x1[0]->definirCampo("ZV_KEY", "1001");
+    x1[2]->definirCampo("ZV_KEY", "1002");
+    CCBorneDwgWriter escritor;
+    escritor.EscreverItens(itens_.itens, modelo_);
+    x1[1]->definirCampo(kAcabamento, "Azul");
+    escritor.EscreverItens(itens_.itens, modelo_);
+    QStringList chaves, acabamentos;
+    for (const Insercao& i : Salvo())
+        if (i.nome == "REGUA_BORNE") {
+            chaves << i.atributos["ZV_KEY"].toString();
+            acabamentos << i.atributos[kAcabamento].toString();
+        }
+    EXPECT_EQ(chaves, QStringList({"1001", "", "1002", "1001", "", "1002"}));
+    EXPECT_EQ(acabamentos, QStringList({"", "", "", "", "Azul", ""}));
 }
 
 TEST_F(DesenhoReguasTest, AFullStripHasNoSeparatorBehindItsLastRunAndPagesHoldTwoStrips) {
