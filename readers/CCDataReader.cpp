@@ -9,6 +9,7 @@
 #include <algorithm>
 #include <cctype>
 #include <cmath>
+#include <span>
 
 using zvsdk::ResultBuffer;
 
@@ -213,7 +214,7 @@ CEPonto CCDataReader::PontoDaConexaoCompleta(const QString& fio, const QString& 
     return i >= 0 && size_t(i) < it->pontos.size() ? it->pontos[size_t(i)] : CEPonto{};
 }
 
-bool CCDataReader::FioSobPonto(const std::vector<CEPonto>& vertices, const CEPonto& ponto) const {
+bool CCDataReader::FioSobPonto(std::span<const CEPonto> vertices, const CEPonto& ponto) const {
     for (size_t i = 0; i + 1 < vertices.size(); ++i) {
         const CEPonto& a = vertices[i];
         const CEPonto& b = vertices[i + 1];
@@ -226,19 +227,31 @@ bool CCDataReader::FioSobPonto(const std::vector<CEPonto>& vertices, const CEPon
 // A point passes a segment only within the tolerance of the segment's box (a z that differs
 // between its ends widens the box by that much), so each segment goes into the grid cells
 // its widened box meets; a segment with coordinates that are not finite is tried always.
+// The wires' vertices lie in one array and the cells' wires in another, each cell's from
+// its start to the next one's: a layer's index is a few arrays, not an array per wire and
+// per cell.
 struct CCDataReader::FiosDoLayer {
     std::vector<OdDbObjectId> fios;  // in the answer's order
-    std::vector<std::vector<CEPonto>> vertices;
-    std::vector<std::uint32_t> sempre;  // wires tried at every point
-    bool semGrade = false;              // no grid: every wire is tried
+    std::vector<CEPonto> pontos;
+    std::vector<std::uint32_t> inicios{0};  // the w-th wire's vertices from inicios[w]
+    std::vector<std::uint32_t> sempre;      // wires tried at every point
+    bool semGrade = false;                  // no grid: every wire is tried
     double x0 = 0, y0 = 0, passo = 1;
     std::size_t nx = 0, ny = 0;
-    std::vector<std::vector<std::uint32_t>> celulas;
+    std::vector<std::uint32_t> iniciosCelulas;  // nx * ny + 1 when there is a grid
+    std::vector<std::uint32_t> membros;         // each cell's wires, ascending
 
     std::size_t Celula(double v, double origem, std::size_t n) const {
         const double c = std::floor((v - origem) / passo);
         if (!(c > 0)) return 0;
         return c >= double(n - 1) ? n - 1 : std::size_t(c);
+    }
+    std::span<const CEPonto> Vertices(std::size_t w) const {
+        return {pontos.data() + inicios[w], pontos.data() + inicios[w + 1]};
+    }
+    std::span<const std::uint32_t> Membros(std::size_t celula) const {
+        return {membros.data() + iniciosCelulas[celula],
+                membros.data() + iniciosCelulas[celula + 1]};
     }
 };
 
@@ -268,11 +281,12 @@ const CCDataReader::FiosDoLayer& CCDataReader::IndiceFios(const QString& layer) 
     for (const QString& handle : *it) {
         const OdDbObjectId fio = CICad::IdDoHandle(handle);
         if (!CICad::EhPolilinha(fio) || CICad::NomeLayerUtf8(fio) != nome) continue;
-        std::vector<CEPonto> vertices = CICad::GetVertices(fio);
+        const std::vector<CEPonto> vertices = CICad::GetVertices(fio);
         if (!vertices.empty()) primeirosVertices_.emplace(fio, vertices.front());
         if (vertices.size() < 2) continue;
         f.fios.push_back(fio);
-        f.vertices.push_back(std::move(vertices));
+        f.pontos.insert(f.pontos.end(), vertices.begin(), vertices.end());
+        f.inicios.push_back(std::uint32_t(f.pontos.size()));
     }
     // Widened boxes of the segments; the grid spans the finite ones.
     struct Caixa {
@@ -287,7 +301,7 @@ const CCDataReader::FiosDoLayer& CCDataReader::IndiceFios(const QString& layer) 
     }
     double minX = HUGE_VAL, minY = HUGE_VAL, maxX = -HUGE_VAL, maxY = -HUGE_VAL;
     for (std::uint32_t w = 0; w < f.fios.size(); ++w) {
-        const std::vector<CEPonto>& v = f.vertices[w];
+        const std::span<const CEPonto> v = f.Vertices(w);
         bool sempre = false;
         for (size_t i = 0; i + 1 < v.size(); ++i) {
             const CEPonto& a = v[i];
@@ -321,16 +335,34 @@ const CCDataReader::FiosDoLayer& CCDataReader::IndiceFios(const QString& layer) 
     f.y0 = minY;
     f.nx = std::min<std::size_t>(std::size_t(largura / f.passo) + 1, 1024);
     f.ny = std::min<std::size_t>(std::size_t(altura / f.passo) + 1, 1024);
-    f.celulas.resize(f.nx * f.ny);
-    for (const Caixa& c : caixas) {
-        const std::size_t i1 = f.Celula(c.x1, f.x0, f.nx), i2 = f.Celula(c.x2, f.x0, f.nx);
-        const std::size_t j1 = f.Celula(c.y1, f.y0, f.ny), j2 = f.Celula(c.y2, f.y0, f.ny);
-        for (std::size_t j = j1; j <= j2; ++j)
-            for (std::size_t i = i1; i <= i2; ++i) {
-                std::vector<std::uint32_t>& celula = f.celulas[j * f.nx + i];
-                if (celula.empty() || celula.back() != c.fio) celula.push_back(c.fio);
-            }
-    }
+    // Two walks over the boxes: the first counts each cell's wires, the second puts them
+    // in place. A wire enters a cell once, however many of its segments meet the cell.
+    const std::size_t nCelulas = f.nx * f.ny;
+    static constexpr std::uint32_t kNenhum = ~std::uint32_t(0);
+    std::vector<std::uint32_t> ultimo(nCelulas, kNenhum);
+    auto cadaCelula = [&f, &caixas, &ultimo](auto&& faz) {
+        std::fill(ultimo.begin(), ultimo.end(), kNenhum);
+        for (const Caixa& c : caixas) {
+            const std::size_t i1 = f.Celula(c.x1, f.x0, f.nx), i2 = f.Celula(c.x2, f.x0, f.nx);
+            const std::size_t j1 = f.Celula(c.y1, f.y0, f.ny), j2 = f.Celula(c.y2, f.y0, f.ny);
+            for (std::size_t j = j1; j <= j2; ++j)
+                for (std::size_t i = i1; i <= i2; ++i) {
+                    const std::size_t celula = j * f.nx + i;
+                    if (ultimo[celula] == c.fio) continue;
+                    ultimo[celula] = c.fio;
+                    faz(celula, c.fio);
+                }
+        }
+    };
+    f.iniciosCelulas.assign(nCelulas + 1, 0);
+    cadaCelula([&f](std::size_t celula, std::uint32_t) { ++f.iniciosCelulas[celula + 1]; });
+    for (std::size_t k = 0; k < nCelulas; ++k)
+        f.iniciosCelulas[k + 1] += f.iniciosCelulas[k];
+    f.membros.resize(f.iniciosCelulas[nCelulas]);
+    std::vector<std::uint32_t> proximo(f.iniciosCelulas.begin(), f.iniciosCelulas.end() - 1);
+    cadaCelula([&f, &proximo](std::size_t celula, std::uint32_t fio) {
+        f.membros[proximo[celula]++] = fio;
+    });
     return f;
 }
 
@@ -339,16 +371,15 @@ OdDbObjectId CCDataReader::FioNoPonto(const QString& layer, const CEPonto& ponto
     // The first wire in the answer's order wins, even when a later one is closer.
     if (f.semGrade || !std::isfinite(ponto.x) || !std::isfinite(ponto.y)) {
         for (size_t w = 0; w < f.fios.size(); ++w)
-            if (FioSobPonto(f.vertices[w], ponto)) return f.fios[w];
+            if (FioSobPonto(f.Vertices(w), ponto)) return f.fios[w];
         return {};
     }
-    static const std::vector<std::uint32_t> kNenhuma;
-    const bool dentro = !f.celulas.empty() && ponto.x >= f.x0 && ponto.y >= f.y0 &&
+    const bool dentro = !f.iniciosCelulas.empty() && ponto.x >= f.x0 && ponto.y >= f.y0 &&
                         ponto.x <= f.x0 + f.passo * double(f.nx) &&
                         ponto.y <= f.y0 + f.passo * double(f.ny);
-    const std::vector<std::uint32_t>& celula =
-        dentro ? f.celulas[f.Celula(ponto.y, f.y0, f.ny) * f.nx + f.Celula(ponto.x, f.x0, f.nx)]
-               : kNenhuma;
+    const std::span<const std::uint32_t> celula =
+        dentro ? f.Membros(f.Celula(ponto.y, f.y0, f.ny) * f.nx + f.Celula(ponto.x, f.x0, f.nx))
+               : std::span<const std::uint32_t>();
     // Both lists ascend: walk them as one, in the answer's order.
     size_t i = 0, k = 0;
     while (i < celula.size() || k < f.sempre.size()) {
@@ -359,7 +390,7 @@ OdDbObjectId CCDataReader::FioNoPonto(const QString& layer, const CEPonto& ponto
             w = f.sempre[k++];
             if (i < celula.size() && celula[i] == w) ++i;
         }
-        if (FioSobPonto(f.vertices[w], ponto)) return f.fios[w];
+        if (FioSobPonto(f.Vertices(w), ponto)) return f.fios[w];
     }
     return {};
 }

@@ -13,6 +13,7 @@
 #include <algorithm>
 #include <memory>
 #include <optional>
+#include <span>
 #include <unordered_map>
 #include <utility>
 #include <vector>
@@ -173,7 +174,7 @@ private:
         std::vector<std::uint64_t> handles;
     };
     void CarregaConexoes(const QString& funcao, bool detalhes);
-    bool FioSobPonto(const std::vector<CEPonto>& vertices, const CEPonto& ponto) const;
+    bool FioSobPonto(std::span<const CEPonto> vertices, const CEPonto& ponto) const;
     // The wires of a layer with their vertices, read once, and a grid of their segments that
     // answers the wire-at-point question from the few wires near the point.
     struct FiosDoLayer;

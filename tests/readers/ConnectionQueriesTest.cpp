@@ -149,6 +149,63 @@ TEST_F(ConnectionQueriesTest, TheFirstWireOfTheLayerWinsOverACloserOne) {
     EXPECT_EQ(r->FioNoPonto(layer, {50.3, 430, 0}), id(dobra));
 }
 
+// On a page of many wires the grid must answer as trying every wire in order would: each
+// wire also stands alone on a layer of its own, which tells whether it is under a point,
+// and the page's answer is the first wire that is.
+TEST_F(ConnectionQueriesTest, OnAPageOfManyWiresTheFirstWireUnderThePointWins) {
+    std::uint64_t semente = 12345;
+    auto sorteio = [&semente](double de, double ate) {
+        semente = semente * 6364136223846793005ULL + 1442695040888963407ULL;
+        return de + (ate - de) * double(semente >> 11) / double(1ULL << 53);
+    };
+    constexpr int kFios = 150;
+    std::vector<std::vector<zvdb::Point3>> tracados;
+    std::vector<const zvdb::Polyline*> naPagina;
+    std::vector<QString> sozinhos;
+    for (int w = 0; w < kFios; ++w) {
+        // Mostly short wires, some crossing much of the page, bends of up to four segments.
+        const double alcance = w % 10 == 0 ? 400 : 40;
+        std::vector<zvdb::Point3> pontos{{sorteio(0, 500), sorteio(0, 300), 0}};
+        const int segmentos = 1 + w % 4;
+        for (int k = 0; k < segmentos; ++k) {
+            const zvdb::Point3& ultimo = pontos.back();
+            pontos.push_back(
+                k % 2 ? zvdb::Point3{ultimo.x, ultimo.y + sorteio(-alcance, alcance), 0}
+                      : zvdb::Point3{ultimo.x + sorteio(-alcance, alcance), ultimo.y, 0});
+        }
+        tracados.push_back(pontos);
+        naPagina.push_back(fio(pontos, std::to_string(w + 1)));
+        const std::string proprio = "ESQ$" + std::to_string(1000 + w) + "$A";
+        db().createLayer(proprio);
+        fio(pontos, std::to_string(w + 1), proprio);
+        sozinhos.push_back(QString::fromStdString(proprio));
+    }
+    auto r = leitor(0.5);
+    const QString pagina = QString::fromStdString(kPagina);
+    int achados = 0;
+    for (int q = 0; q < 3000; ++q) {
+        // Points on and beside the wires' segments, and anywhere on the page.
+        zvdb::Point3 p{sorteio(-10, 510), sorteio(-10, 310), 0};
+        if (q % 3 != 0) {
+            const std::vector<zvdb::Point3>& t = tracados[std::size_t(q) % tracados.size()];
+            const std::size_t k = std::size_t(q / 3) % (t.size() - 1);
+            const double u = sorteio(-0.02, 1.02);
+            p = {t[k].x + u * (t[k + 1].x - t[k].x) + sorteio(-0.7, 0.7),
+                 t[k].y + u * (t[k + 1].y - t[k].y) + sorteio(-0.7, 0.7), 0};
+        }
+        const CEPonto ponto{p.x, p.y, p.z};
+        OdDbObjectId esperado;
+        for (int w = 0; w < kFios && esperado.isNull(); ++w)
+            if (!r->FioNoPonto(sozinhos[std::size_t(w)], ponto).isNull())
+                esperado = id(naPagina[std::size_t(w)]);
+        achados += !esperado.isNull();
+        ASSERT_EQ(r->FioNoPonto(pagina, ponto), esperado) << q << " at " << p.x << ", " << p.y;
+    }
+    // Both kinds of answer were asked for many times.
+    EXPECT_GT(achados, 1000);
+    EXPECT_LT(achados, 2900);
+}
+
 TEST_F(ConnectionQueriesTest, ALayersWiresAreAskedForOncePerReader) {
     fio({{0, 100, 0}, {100, 100, 0}}, "1");
     auto r = leitor(0.5);
