@@ -9,6 +9,7 @@
 #include "drawing/BlockReference.h"
 #include "drawing/DeepCloner.h"
 #include "drawing/Entity.h"
+#include "drawing/SmallBuffer.h"
 #include "readers/CEAtributo.h"
 #include "readers/CEListaAtributos.h"
 #include "settings/CIMensagens.h"
@@ -134,35 +135,19 @@ const TextosDefinicao* const* TextosDe(std::span<zvdb::AttributeLayout* const> l
 // stays on the stack.
 class NovosAtributos {
 public:
-    static constexpr std::size_t kNaPilha = 16;
     std::span<zvdb::AttributeLayout* const> leituras;
     std::span<const std::optional<std::string_view>> dados;
     zvdb::Point3 base;
 
     void Le(std::span<zvdb::AttributeLayout* const> variaveis, const CEValoresAtributos& valores) {
         // A copy: asking for the values must not leave the layouts in the air.
-        zvdb::AttributeLayout** copia = leiturasPilha_;
-        if (variaveis.size() > kNaPilha) {
-            leiturasHeap_.resize(variaveis.size());
-            copia = leiturasHeap_.data();
-        }
-        std::copy(variaveis.begin(), variaveis.end(), copia);
-        leituras = {copia, variaveis.size()};
+        std::copy(variaveis.begin(), variaveis.end(), leituras_.prepare(variaveis.size()));
+        leituras = leituras_.span();
         if (!valores) return;
-        std::optional<std::string_view>* lidos = dadosPilha_;
-        if (variaveis.size() > kNaPilha) {
-            dadosHeap_.resize(variaveis.size());
-            lidos = dadosHeap_.data();
-        }
+        std::optional<std::string_view>* lidos = dados_.prepare(leituras.size());
         // Copied: a value asked for may place another reference.
-        const TextosDefinicao* textosPilha[kNaPilha];
-        std::vector<const TextosDefinicao*> textosHeap;
-        const TextosDefinicao** textos = textosPilha;
-        if (leituras.size() > kNaPilha) {
-            textosHeap.resize(leituras.size());
-            textos = textosHeap.data();
-        }
-        std::copy_n(TextosDe(leituras), leituras.size(), textos);
+        zvdb::SmallBuffer<const TextosDefinicao*, kNaPilha> textos(leituras.size());
+        std::copy_n(TextosDe(leituras), leituras.size(), textos.data());
         const std::uint64_t geracao = geracaoTextos;
         for (std::size_t i = 0; i < leituras.size(); ++i) {
             const TextosDefinicao& textosDef =
@@ -179,10 +164,9 @@ public:
     }
 
 private:
-    zvdb::AttributeLayout* leiturasPilha_[kNaPilha];
-    std::optional<std::string_view> dadosPilha_[kNaPilha];
-    std::vector<zvdb::AttributeLayout*> leiturasHeap_;
-    std::vector<std::optional<std::string_view>> dadosHeap_;
+    static constexpr std::size_t kNaPilha = 16;
+    zvdb::SmallBuffer<zvdb::AttributeLayout*, kNaPilha> leituras_;
+    zvdb::SmallBuffer<std::optional<std::string_view>, kNaPilha> dados_;
     CETextosUtf8 textos_;
 };
 

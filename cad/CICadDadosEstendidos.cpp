@@ -5,6 +5,7 @@
 #include "drawing/BlockRecord.h"
 #include "drawing/Dictionary.h"
 #include "drawing/Entity.h"
+#include "drawing/SmallBuffer.h"
 #include "host/sdk/Document.h"
 #include "host/sdk/LispInterface.h"
 #include "readers/ZVString.h"
@@ -80,11 +81,7 @@ public:
         std::size_t n = 0;
         for (const CEItemXData& item : itens)
             n += item.codigo >= 1010 && item.codigo <= 1013 ? 3 : 1;
-        tags_ = pilha_;
-        if (n > kNaPilha) {
-            heap_.resize(n);
-            tags_ = heap_.data();
-        }
+        tags_.prepare(n);
         for (const CEItemXData& item : itens) {
             if (item.codigo >= 1010 && item.codigo <= 1013) {
                 Poe(item.codigo, QByteArray::number(item.x, 'g', 17).toStdString());
@@ -95,7 +92,7 @@ public:
             }
         }
     }
-    std::span<const zvdb::Tag> Tags() const { return {tags_, n_}; }
+    std::span<const zvdb::Tag> Tags() const { return tags_.span().first(n_); }
     // The application's name, kept with the items.
     std::string_view Nome(const QString& aplicacao) { return textos_.Guarda(aplicacao); }
 
@@ -104,11 +101,8 @@ private:
         tags_[n_++] = {std::int16_t(codigo), textos_.Guarda(std::move(texto))};
     }
 
-    static constexpr std::size_t kNaPilha = 8;
     CETextosUtf8 textos_;
-    zvdb::Tag pilha_[kNaPilha];
-    std::vector<zvdb::Tag> heap_;
-    zvdb::Tag* tags_ = nullptr;
+    zvdb::SmallBuffer<zvdb::Tag, 8> tags_;
     std::size_t n_ = 0;
 };
 

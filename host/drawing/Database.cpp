@@ -594,18 +594,6 @@ void Database::forgetLayout(const DbObject& definition) {
     if (layouts_) layouts_->forget(definition);
 }
 
-namespace {
-// Whether the object's flag (66 or 67) is set, as integer() == 1 answers, from its pattern
-// when the pattern fixes it.
-bool flagSet(const DbObject& object, int code) {
-    if (const TagPattern* pattern = object.pattern()) {
-        const int fixed = code == 66 ? pattern->attributesFollowFlag() : pattern->paperSpaceFlag();
-        if (fixed >= 0) return fixed == 1;
-    }
-    return object.integer(code) == 1;
-}
-}  // namespace
-
 std::uint32_t Database::layerNumber(const Entity& entity) {
     // A patterned entity holds its layer as a number already.
     const DbObject& object = entity;
@@ -638,7 +626,7 @@ Attribute* Database::addAttributeFromLayout(BlockReference& reference, Attribute
     }
     reference.addSubEntity(attribute);
     if (first) {
-        if (!flagSet(reference, 66)) reference.setInteger(66, 1, "AcDbBlockReference");
+        if (!reference.flag(66)) reference.setInteger(66, 1, "AcDbBlockReference");
         if (!reference.seqend()) {
             // As ensureSeqend makes it, from values the drawing holds already.
             const std::uint64_t seqend = allocateHandle();
@@ -682,7 +670,7 @@ void Database::addAttributesFromLayouts(BlockReference& reference,
     // The reference's list of attributes at its size at once.
     std::vector<Entity*>& subs = reference.children().subs;
     subs.reserve(subs.size() + layouts.size());
-    AttributeLayout::Placement where{placement, heightScale, rotation, flagSet(reference, 67),
+    AttributeLayout::Placement where{placement, heightScale, rotation, reference.inPaperSpace(),
                                      {},        {}};
     for (std::size_t i = 0; i < layouts.size(); ++i) {
         const std::optional<std::string_view> value =

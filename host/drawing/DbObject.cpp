@@ -3,6 +3,7 @@
 #include "Database.h"
 #include "Dictionary.h"
 #include "ObjectPool.h"
+#include "SmallBuffer.h"
 #include "TagList.h"
 #include "TagValues.h"
 
@@ -273,6 +274,15 @@ long long DbObject::integer(int code, long long fallback) const {
                  : TagValues::toInteger(tags()[static_cast<std::size_t>(i)].value, fallback);
 }
 
+bool DbObject::flag(int code) const {
+    if (patterned_ && (code == 66 || code == 67)) {
+        const TagPattern& pattern = *pattern_->pattern;
+        const int fixed = code == 66 ? pattern.attributesFollowFlag() : pattern.paperSpaceFlag();
+        if (fixed >= 0) return fixed == 1;
+    }
+    return integer(code) == 1;
+}
+
 Point3 DbObject::point(int code, const Point3& fallback) const {
     const int i = indexOf(code);
     if (i < 0) return fallback;
@@ -467,14 +477,8 @@ void DbObject::setXDataWith(std::string_view application, std::size_t count, Fil
         return;
     }
     // The group is made before the tags change: the items may be some of them.
-    constexpr std::size_t kOnStack = 16;
-    Tag onStack[kOnStack];
-    std::vector<Tag> onHeap;
-    Tag* group = onStack;
-    if (count + 1 > kOnStack) {
-        onHeap.resize(count + 1);
-        group = onHeap.data();
-    }
+    SmallBuffer<Tag, 16> room(count + 1);
+    Tag* group = room.data();
     group[0] = Tag{1001, name};
     fill(group + 1);
     const auto current = tags();

@@ -54,8 +54,6 @@ public:
     // Whether the tags are still only a pattern's and the object's own values (then
     // forEachTag gives them without putting them together).
     bool isPatterned() const { return patterned_; }
-    // The pattern of a patterned object; null for others.
-    const TagPattern* pattern() const { return patterned_ ? pattern_->pattern : nullptr; }
     // The extended data a patterned object keeps beside its values (none for others).
     std::span<const Tag> patternedXData() const {
         return patterned_ ? pattern_->xdata() : std::span<const Tag>();
@@ -79,6 +77,9 @@ public:
     std::string_view text(int code, std::string_view fallback = {}) const;
     double real(int code, double fallback = 0.0) const;
     long long integer(int code, long long fallback = 0) const;
+    // Whether the integer under `code` reads 1. A patterned object's paper-space (67) and
+    // attributes-follow (66) flags come from its pattern when the pattern fixes them.
+    bool flag(int code) const;
     // A point from `code`, `code + 10` and `code + 20`.
     Point3 point(int code, const Point3& fallback = {}) const;
     std::uint64_t handleAt(int code) const;

@@ -22,7 +22,7 @@ public:
     void setColor(int color) { setInteger(62, color, "AcDbEntity"); }
     std::string_view linetype() const { return text(6, "BYLAYER"); }
     void setLinetype(std::string_view linetype) { setText(6, linetype, "AcDbEntity"); }
-    bool inPaperSpace() const { return integer(67) == 1; }
+    bool inPaperSpace() const { return flag(67); }
     // The block record that holds the entity (for a sub-entity, its parent's).
     BlockRecord* block() const;
     // The INSERT of an ATTRIB, the POLYLINE of a VERTEX or SEQEND; else null.

@@ -88,7 +88,7 @@ public:
     // The hole of the first tag with the code, as find finds it; -1 when that tag is none.
     int holeOf(int code) const;
     // The paper space flag (67) and the attributes-follow flag (66) of every object of the
-    // pattern, as DbObject::integer reads them: 1 or 0 when the pattern fixes it for all,
+    // pattern, as DbObject::flag reads them: 1 or 0 when the pattern fixes it for all,
     // -1 when it is the object's own.
     int paperSpaceFlag() const { return paperSpace_; }
     int attributesFollowFlag() const { return attributesFollow_; }
