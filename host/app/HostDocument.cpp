@@ -21,7 +21,7 @@ HostDocument::~HostDocument() {
 }
 
 const HostDocument::View& HostDocument::view() {
-    settleView();
+    settleView(false);
     return view_;
 }
 
@@ -33,17 +33,27 @@ void HostDocument::setView(const View& view) {
 void HostDocument::showExtents() {
     zvdb::Database* db = database();
     if (!db) return;
-    extentsOf_ = plotIndex().showingLayers();
-    db->beforeShapeChange([this] { settleView(); });
+    // Only the layer states are taken now: a run that zooms at its end and is never looked
+    // at does not index the drawing for it.
+    extentsOf_ = zvplot::PageIndex::hiddenLayers(*db);
+    db->beforeShapeChange([this] { settleView(true); });
 }
 
-void HostDocument::settleView() {
+void HostDocument::settleView(bool changing) {
     if (!extentsOf_) return;
-    // No shape changed since the zoom made or checked the index, so it still holds; an index
-    // made again here, in the middle of a change (a handle taken, its object not yet in
-    // model space), would pass for the drawing after the change.
-    const zvplot::PageIndex& index = plotIndex_ ? *plotIndex_ : plotIndex();
-    zvdb::BoundingBox box = index.boundsOf(*extentsOf_);
+    // No shape changed since the zoom, so an index made now shows the drawing of the zoom.
+    // One made in the middle of a change (a handle taken, its object not yet in model
+    // space) would pass for the drawing after the change: that one is not kept.
+    zvdb::Database& db = *database();
+    std::unique_ptr<zvplot::PageIndex> apart;
+    const zvplot::PageIndex* index = nullptr;
+    if (plotIndex_ && plotIndex_->matches(db))
+        index = plotIndex_.get();
+    else if (changing)
+        index = (apart = std::make_unique<zvplot::PageIndex>(db)).get();
+    else
+        index = &plotIndex();
+    zvdb::BoundingBox box = index->boundsOf(index->layersExcept(*extentsOf_));
     extentsOf_.reset();
     if (box.isEmpty()) box = zvdb::BoundingBox{{0, 0, 0}, {1, 1, 0}};
     view_ = {box.min.x, box.min.y, box.max.x, box.max.y};

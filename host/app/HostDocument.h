@@ -7,6 +7,7 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <unordered_set>
 #include <vector>
 
 namespace zvdb {
@@ -89,12 +90,14 @@ private:
     QHash<QString, Command> commands_;
     int commandsStarted_ = 0;
     zvsdk::CommandResult result_ = zvsdk::CommandResult::Succeeded;
-    // Puts the extents showExtents asked for into view_.
-    void settleView();
+    // Puts the extents showExtents asked for into view_; `changing` when a change of the
+    // drawing is about to happen.
+    void settleView(bool changing);
 
     View view_;
-    // The layers that showed when extents were asked for and not yet measured.
-    std::optional<std::vector<std::string>> extentsOf_;
+    // The layers hidden when extents were asked for and not yet measured (upper-case names):
+    // nothing is measured until the view is read or a shape is about to change.
+    std::optional<std::unordered_set<std::string>> extentsOf_;
     std::unique_ptr<zvplot::PageIndex> plotIndex_;
     std::unique_ptr<zvdb::UndoJournal> undo_;
 };

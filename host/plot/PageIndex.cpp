@@ -6,6 +6,7 @@
 #include "drawing/Extents.h"
 #include "drawing/LayerRecord.h"
 #include "drawing/SymbolTable.h"
+#include "drawing/TagValues.h"
 
 #include <algorithm>
 #include <functional>
@@ -103,6 +104,28 @@ std::vector<std::string> PageIndex::showingLayers() const {
     std::vector<std::string> layers;
     layers.reserve(showing_.size());
     for (const std::string* name : showing_)
+        layers.push_back(*name);
+    return layers;
+}
+
+std::unordered_set<std::string> PageIndex::hiddenLayers(const zvdb::Database& database) {
+    std::unordered_set<std::string> hidden;
+    for (const zvdb::LayerRecord* record : database.layers())
+        if (record->isFrozen() || record->isOff())
+            hidden.insert(zvdb::TagValues::upperName(record->name()));
+    return hidden;
+}
+
+std::vector<std::string> PageIndex::layersExcept(
+    const std::unordered_set<std::string>& hidden) const {
+    std::vector<const std::string*> names;
+    for (const auto& [name, layer] : byLayer_)
+        if (!hidden.contains(zvdb::TagValues::upperName(name))) names.push_back(&name);
+    // The order of showingLayers: that of the names' places, which stay where they are.
+    std::sort(names.begin(), names.end(), std::less<>());
+    std::vector<std::string> layers;
+    layers.reserve(names.size());
+    for (const std::string* name : names)
         layers.push_back(*name);
     return layers;
 }

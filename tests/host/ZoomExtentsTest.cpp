@@ -78,6 +78,21 @@ TEST_F(ZoomExtentsTest, LayersShownAtTheZoomAreTheOnesMeasured) {
     expectView(document_->view(), {-9, -9, 120, 130});
 }
 
+TEST_F(ZoomExtentsTest, AnEntitySpellingAHiddenLayerInOtherCaseStaysHidden) {
+    db().modelSpace()->addLine({-70, -70, 0}, {-60, -60, 0}, "p2");
+    db().modelSpace()->addLine({30, 30, 0}, {35, 36, 0}, "p1");
+    zoomExtents();
+    db().layer("P2")->setFrozen(false);
+    expectView(document_->view(), {0, 0, 35, 36});
+    // Measured when a shape is about to change, from the layer states of the zoom.
+    db().layer("P2")->setFrozen(true);
+    zoomExtents();
+    db().layer("P2")->setFrozen(false);
+    db().layer("P1")->setFrozen(true);
+    line_->erase();
+    expectView(document_->view(), {0, 0, 35, 36});
+}
+
 TEST_F(ZoomExtentsTest, AWindowAfterTheZoomWinsAndLaterChangesLeaveIt) {
     zoomExtents();
     ASSERT_TRUE(document_->runCommand({"_.zoom", "_W", "1,2", "3,4"}));
