@@ -41,19 +41,17 @@ void HostDocument::showExtents() {
 
 void HostDocument::settleView(bool changing) {
     if (!extentsOf_) return;
-    // No shape changed since the zoom, so an index made now shows the drawing of the zoom.
-    // One made in the middle of a change (a handle taken, its object not yet in model
-    // space) would pass for the drawing after the change: that one is not kept.
+    // No shape changed since the zoom, so the drawing is still the zoom's. In the middle of a
+    // change (a handle taken, its object not yet in model space) an index made now would
+    // pass for the drawing after the change: the bounds are then measured without one.
     zvdb::Database& db = *database();
-    std::unique_ptr<zvplot::PageIndex> apart;
-    const zvplot::PageIndex* index = nullptr;
+    zvdb::BoundingBox box;
     if (plotIndex_ && plotIndex_->matches(db))
-        index = plotIndex_.get();
+        box = plotIndex_->boundsOf(plotIndex_->layersExcept(*extentsOf_));
     else if (changing)
-        index = (apart = std::make_unique<zvplot::PageIndex>(db)).get();
+        box = zvplot::PageIndex::boundsExcept(db, *extentsOf_);
     else
-        index = &plotIndex();
-    zvdb::BoundingBox box = index->boundsOf(index->layersExcept(*extentsOf_));
+        box = plotIndex().boundsOf(plotIndex().layersExcept(*extentsOf_));
     extentsOf_.reset();
     if (box.isEmpty()) box = zvdb::BoundingBox{{0, 0, 0}, {1, 1, 0}};
     view_ = {box.min.x, box.min.y, box.max.x, box.max.y};

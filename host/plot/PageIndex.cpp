@@ -130,6 +130,27 @@ std::vector<std::string> PageIndex::layersExcept(
     return layers;
 }
 
+zvdb::BoundingBox PageIndex::boundsExcept(const zvdb::Database& database,
+                                          const std::unordered_set<std::string>& hidden) {
+    zvdb::BoundingBox box;
+    const zvdb::BlockRecord* model = database.modelSpace();
+    if (!model) return box;
+    // Model space runs page by page: the last layer's answer serves the entities after it.
+    std::string last;
+    bool lastShows = false, known = false;
+    for (const zvdb::Entity* entity : model->entities()) {
+        if (entity->isErased()) continue;
+        const std::string_view layer = entity->layer();
+        if (!known || layer != last) {
+            last.assign(layer);
+            lastShows = !hidden.contains(zvdb::TagValues::upperName(layer));
+            known = true;
+        }
+        if (lastShows) box.add(zvdb::Extents::ofEntity(*entity, true));
+    }
+    return box;
+}
+
 void PageIndex::setShows(std::unordered_map<std::string, Layer>::iterator layer, bool shows) const {
     if (layer->second.shows == shows) return;
     layer->second.shows = shows;

@@ -45,6 +45,10 @@ public:
     // The names of the layers that hold entities, but for those whose upper-case names are
     // in `hidden`, in the order showingLayers gives them.
     std::vector<std::string> layersExcept(const std::unordered_set<std::string>& hidden) const;
+    // The bounds of the model-space entities on layers whose upper-case names are not in
+    // `hidden`, attributes included, from one walk of model space and no index.
+    static zvdb::BoundingBox boundsExcept(const zvdb::Database& database,
+                                          const std::unordered_set<std::string>& hidden);
     // Still a true picture of this drawing: nothing was added since (what was erased is left
     // out as the index is read).
     bool matches(const zvdb::Database& database) const;

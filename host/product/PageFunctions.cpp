@@ -112,8 +112,10 @@ void refreshPageCounts(zvdb::Database& database) {
         auto count = counts.find(std::string(layer));
         auto* reference = dynamic_cast<zvdb::BlockReference*>(entity);
         if (count == counts.end() || !reference) continue;
-        if (zvdb::Attribute* total = reference->attribute("TOTAL"))
-            total->setText(1, std::to_string(count->second));
+        // A count that stands is left alone: the title block is not changed for nothing.
+        zvdb::Attribute* total = reference->attribute("TOTAL");
+        const std::string text = std::to_string(count->second);
+        if (total && total->text(1) != text) total->setText(1, text);
     }
 }
 

@@ -130,6 +130,15 @@ TEST_F(PagesTest, ThawingAPageAndTheGroupCounts) {
     de->addAttribute("TOTAL", "1", {380, 14, 0}, 2.5);
     run("(atualizarpaginas)");
     EXPECT_EQ(de->attribute("TOTAL")->text(1), "3");
+    // Counts that stand leave the drawing as it is.
+    const std::uint64_t shapes = database->shapeCount();
+    run("(atualizarpaginas)");
+    EXPECT_EQ(database->shapeCount(), shapes);
+    de->attribute("TOTAL")->setText(1, "9");
+    const std::uint64_t edited = database->shapeCount();
+    run("(atualizarpaginas)");
+    EXPECT_EQ(de->attribute("TOTAL")->text(1), "3");
+    EXPECT_NE(database->shapeCount(), edited);
     database->setCurrentLayer("ESQ$0002$A");
     run("(AtualizaModemacro)");
     EXPECT_EQ(show("*ZV_MODEMACRO*"), "\"ZV ESQ$0002$A (4)\"");
