@@ -106,7 +106,6 @@ void CCDataReader::LiberaLeituras() {
     Esvazia(ligacoesLidas_);
     Esvazia(chaves_);
     semChave_.Esquece();
-    Esvazia(camposFio_);
     Esvazia(textosFio_);
     Esvazia(tags_);
     Esvazia(valores_);
@@ -696,7 +695,7 @@ void CCDataReader::LeRotasDoItem(const CEItemLista& item, CETemplate* modelo) {
 }
 
 bool CCDataReader::LeCamposFio(const QString& s, CEItemLista& item, const OdDbObjectId& polilinha) {
-    // Wires repeat their key and field texts: each is split and looked up once for the run.
+    // Wires repeat their key texts: each is split and looked up once for the run.
     PoeColunasFio(s, item, ChaveDaEntidadeLida(polilinha));
     if (appFioEm_ != polilinha.database() ||
         appFioVersao_ != CICad::VersaoDesenho(polilinha.database())) {
@@ -713,14 +712,15 @@ bool CCDataReader::LeCamposFio(const QString& s, CEItemLista& item, const OdDbOb
             textosFio_[1].empty())
             return false;
         item.definirCampo(NumeroCampo<"ZV_KEY">(s), chave->chave);
+        // Each wire has a number of its own: its field texts are split as they come.
         for (size_t i = 2; i < textosFio_.size(); ++i) {
-            CampoFioLido& campo = CampoFioDoTexto(textosFio_[i]);
-            if (!campo.valido) continue;
-            // Under a suffix the whole name only is numbered, as each field was written.
-            if (s.isEmpty() && campo.numero == CamposItem::kSemNome)
-                campo.numero = CamposItem::numero(campo.nome);
-            item.definirCampo(s.isEmpty() ? campo.numero : CamposItem::numero(campo.nome + s),
-                              campo.valor);
+            QString nome, valor;
+            const std::string_view texto = textosFio_[i];
+            if (ZVString(QString::fromUtf8(texto.data(), int(texto.size())))
+                    .DivideEmDois(kSeparador, nome, valor) &&
+                !nome.isEmpty())
+                item.definirCampo(CamposItem::numero(s.isEmpty() ? nome : QString(nome + s)),
+                                  valor);
         }
     }
     const auto& [lista, descricao] = ListaDescricaoFioDe(*chave);

@@ -385,16 +385,6 @@ private:
     // the catalogue once per key.
     void PoeColunasFio(const QString& s, CEItemLista& item, const ChaveLida& chave);
     const std::pair<QString, QString>& ListaDescricaoFioDe(const ChaveLida& chave);
-    // A wire's extended-data field ("NAME<separator>VALUE") by its text in the drawing: its
-    // name (numbered when first written without suffix) and value; `valido` false for a
-    // text that is no field. Wires of one number repeat theirs.
-    struct CampoFioLido {
-        bool valido = false;
-        std::uint32_t numero = CamposItem::kSemNome;
-        QString nome, valor;
-    };
-    PorTexto<CampoFioLido> camposFio_;
-    CampoFioLido& CampoFioDoTexto(std::string_view texto);
     std::vector<std::string_view> textosFio_;  // the items of the wire being read
     // The last symbol read, and the fields of one reading before they join the item (in
     // order of writing: a later one of the same name wins).

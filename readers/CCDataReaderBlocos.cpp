@@ -82,16 +82,6 @@ const std::pair<QString, QString>& CCDataReader::ListaDescricaoFioDe(const Chave
     return *chave.listaDescricaoFio;
 }
 
-CCDataReader::CampoFioLido& CCDataReader::CampoFioDoTexto(std::string_view texto) {
-    auto it = camposFio_.find(texto);
-    if (it != camposFio_.end()) return it->second;
-    Limita(camposFio_);
-    CampoFioLido campo;
-    campo.valido = ZVString(Texto(texto)).DivideEmDois(kSeparador, campo.nome, campo.valor) &&
-                   !campo.nome.isEmpty();
-    return camposFio_.emplace(std::string(texto), std::move(campo)).first->second;
-}
-
 CCDataReader::TagLida& CCDataReader::TagDoTexto(std::string_view tag) {
     auto it = tags_.find(tag);
     if (it != tags_.end()) return it->second;
