@@ -553,8 +553,8 @@ std::unique_ptr<zv::CEAtributo> CCDataReader::AtributoConexaoProximo(const OdDbO
         atributosDe_ = OdDbObjectId();
         if (ligacoesPorElemento_.size() >= limiteLidas_) {
             // The turn, as for the entities kept read.
-            ligacoesAntigas_ = std::move(ligacoesPorElemento_);
-            ligacoesPorElemento_ = {};
+            std::swap(ligacoesAntigas_, ligacoesPorElemento_);
+            ligacoesPorElemento_.limpa();
         }
         achado = &ligacoesPorElemento_.insere(elemento, std::move(ligacoes));
     }
@@ -828,8 +828,9 @@ const CCDataReader::EntidadeLida& CCDataReader::EntidadeGuardada(const OdDbObjec
     }
     if (entidadesLidas_.size() >= limiteLidas_) {
         // The turn: what was not asked for again since the last one goes.
-        entidadesAntigas_ = std::move(entidadesLidas_);
-        entidadesLidas_ = {};
+        // The arrays are kept: each turn fills as many again.
+        std::swap(entidadesAntigas_, entidadesLidas_);
+        entidadesLidas_.limpa();
     }
     return entidadesLidas_.insere(id, std::move(lida));
 }

@@ -73,6 +73,13 @@ public:
         --n_;
         return true;
     }
+    // Empties the table and keeps its array for the entries to come.
+    void limpa() {
+        if (n_ == 0) return;
+        for (Entrada& e : entradas_)
+            if (e.ocupada) e = Entrada();
+        n_ = 0;
+    }
     // Empties the table and gives its memory back.
     void libera() {
         std::vector<Entrada>().swap(entradas_);

@@ -8,6 +8,7 @@
 #include <QString>
 
 #include <cstdint>
+#include <memory>
 #include <random>
 #include <unordered_map>
 #include <vector>
@@ -97,6 +98,22 @@ TEST(TabelaIdsTest, MovedFromAndReleasedTablesAreEmptyAndUsable) {
     EXPECT_EQ(outra.procura(OdDbObjectId(Desenho(1), 77)), nullptr);
     outra.insere(OdDbObjectId(Desenho(1), 77), 7);
     EXPECT_EQ(*outra.procura(OdDbObjectId(Desenho(1), 77)), 7);
+}
+
+TEST(TabelaIdsTest, EmptyingInPlaceLetsGoOfTheValuesAndTakesNewOnes) {
+    const auto valor = std::make_shared<int>(1);
+    TabelaIds<std::shared_ptr<int>> tabela;
+    for (std::uint64_t h = 1; h <= 40; ++h)
+        tabela.insere(OdDbObjectId(Desenho(1), h), valor);
+    EXPECT_EQ(valor.use_count(), 41);
+    tabela.limpa();
+    EXPECT_EQ(valor.use_count(), 1);
+    EXPECT_TRUE(tabela.empty());
+    EXPECT_EQ(tabela.procura(OdDbObjectId(Desenho(1), 7)), nullptr);
+    tabela.insere(OdDbObjectId(Desenho(1), 7), valor);
+    ASSERT_NE(tabela.procura(OdDbObjectId(Desenho(1), 7)), nullptr);
+    EXPECT_EQ(*tabela.procura(OdDbObjectId(Desenho(1), 7)), valor);
+    EXPECT_EQ(tabela.size(), 1u);
 }
 
 }  // namespace
