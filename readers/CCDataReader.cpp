@@ -88,6 +88,8 @@ void CCDataReader::LiberaLeituras() {
     entidadesLidas_.libera();
     entidadesAntigas_.libera();
     avulsa_ = {};
+    leitura_ = {};
+    Esvazia(nomesLidos_);
     Esvazia(formas_);
     numerosFios_.libera();
     Esvazia(numerosCabos_);
@@ -780,7 +782,8 @@ CCDataReader::EntidadeLida CCDataReader::LeEntidadeGuardada(const OdDbObjectId& 
     // A QTD of the entity's own replaces this mark; without one the mark stays.
     static const QString kMarca = QStringLiteral("\x01");
     const std::uint32_t qtd = NumeroCampo<"QTD">();
-    CEItemLista lido;
+    CEItemLista& lido = leitura_;
+    lido.campos.clear();
     EntidadeLida lida;
     bool completa = false;
     if (CICad::EhReferencia(id)) {
@@ -796,8 +799,8 @@ CCDataReader::EntidadeLida CCDataReader::LeEntidadeGuardada(const OdDbObjectId& 
     // The reading is made apart: its values move into the kept form, none is copied.
     std::vector<CamposItem::Campo> campos = lido.campos.retirar();
     bool marcada = false;
-    std::vector<std::uint32_t> nomes;
-    nomes.reserve(campos.size());
+    std::vector<std::uint32_t>& nomes = nomesLidos_;
+    nomes.clear();
     lida.valores.reserve(campos.size() + 1);
     for (CamposItem::Campo& campo : campos) {
         if (campo.nome == qtd && campo.valor == kMarca) {
@@ -809,9 +812,11 @@ CCDataReader::EntidadeLida CCDataReader::LeEntidadeGuardada(const OdDbObjectId& 
     }
     lida.qtdPadrao = marcada && completa;
     if (lida.qtdPadrao) lida.valores.push_back(QStringLiteral("1"));
-    std::unique_ptr<FormaCampos>& forma = formas_[nomes];
-    if (!forma) forma = std::make_unique<FormaCampos>(FormaCampos{std::move(nomes), {}});
-    lida.forma = forma.get();
+    auto forma = formas_.find(nomes);
+    if (forma == formas_.end())
+        forma = formas_.emplace(nomes, std::make_unique<FormaCampos>(FormaCampos{nomes, {}})).first;
+    lida.forma = forma->second.get();
+    lido.campos.reaproveitar(std::move(campos));
     return lida;
 }
 

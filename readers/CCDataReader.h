@@ -254,6 +254,9 @@ private:
     EntidadeLida avulsa_;
     // The entity read apart into the form CopiaEntidade keeps.
     EntidadeLida LeEntidadeGuardada(const OdDbObjectId& id, CETemplate* modelo);
+    // The item each reading is made in and the names it gave: their arrays serve the next.
+    CEItemLista leitura_;
+    std::vector<std::uint32_t> nomesLidos_;
     // Per wire polyline: its number as NumeroDoFio gives it, and whether its own field holds
     // one; every terminal side and neighbour asks for the wires at its points.
     struct NumeroFio {
