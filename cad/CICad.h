@@ -264,6 +264,10 @@ public:
     // The items behind the application's name; empty when the object has none.
     static CEListaXData GetXData(const OdDbObjectId& id, const QString& aplicacao);
     static CEListaXData GetXData(const OdDbObjectId& id, const char* aplicacao);
+    // The texts of those items as the drawing holds them (UTF-8), one per item GetXData
+    // gives; valid until the object changes. Empty when the object has none.
+    static void TextosXData(const OdDbObjectId& id, const char* aplicacao,
+                            std::vector<std::string_view>& textos);
     // The points (codes 1010 to 1013) of those items, in order, as GetXData reads them.
     static std::vector<CEPonto> PontosXData(const OdDbObjectId& id, const char* aplicacao);
     // Whether the object has items under the application; `texto` takes the first text item,

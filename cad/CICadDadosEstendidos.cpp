@@ -140,6 +140,23 @@ CEListaXData CICad::GetXData(const OdDbObjectId& id, const char* aplicacao) {
     return objeto ? ConverteXData(objeto->xdataItems(aplicacao)) : CEListaXData();
 }
 
+void CICad::TextosXData(const OdDbObjectId& id, const char* aplicacao,
+                        std::vector<std::string_view>& textos) {
+    textos.clear();
+    zvdb::DbObject* objeto = Objeto(id);
+    if (!objeto) return;
+    const std::span<const zvdb::Tag> itens = objeto->xdataItems(aplicacao);
+    for (std::size_t i = 0; i < itens.size(); ++i) {
+        textos.push_back(itens[i].value);
+        const int codigo = itens[i].code;
+        if (codigo < 1010 || codigo > 1013) continue;
+        // A point's y and z items belong to its one item, as GetXData reads them.
+        while (i + 1 < itens.size() &&
+               (itens[i + 1].code == codigo + 10 || itens[i + 1].code == codigo + 20))
+            ++i;
+    }
+}
+
 bool CICad::TextoXData(const OdDbObjectId& id, const char* aplicacao, QString& texto,
                        bool& temTexto) {
     zvdb::DbObject* objeto = Objeto(id);

@@ -85,14 +85,16 @@ void CCDataReader::LiberaLeituras() {
     Esvazia(rotasPorChave_);
     rotasLidas_ = false;
     Esvazia(caminhos_);
-    Esvazia(entidadesLidas_);
-    Esvazia(entidadesAntigas_);
+    entidadesLidas_.libera();
+    entidadesAntigas_.libera();
     avulsa_ = {};
+    leitura_ = {};
+    Esvazia(nomesLidos_);
     Esvazia(formas_);
-    Esvazia(numerosFios_);
+    numerosFios_.libera();
     Esvazia(numerosCabos_);
-    Esvazia(ligacoesPorElemento_);
-    Esvazia(ligacoesAntigas_);
+    ligacoesPorElemento_.libera();
+    ligacoesAntigas_.libera();
     corteDe_ = OdDbObjectId();
     versaoLidas_ = 0;
     // Items share these texts; they keep theirs.
@@ -105,6 +107,8 @@ void CCDataReader::LiberaLeituras() {
     atributosDe_ = OdDbObjectId();
     Esvazia(ligacoesLidas_);
     Esvazia(chaves_);
+    semChave_.Esquece();
+    Esvazia(textosFio_);
     Esvazia(tags_);
     Esvazia(valores_);
     Esvazia(lote_);
@@ -441,21 +445,20 @@ QString CCDataReader::NumeroNoCabo(const OdDbObjectId& entidade) const {
 void CCDataReader::ConfereVersao() const {
     const std::uint64_t versao = CICad::VersaoDesenho();
     if (versao == versaoLidas_) return;
-    numerosFios_.clear();
+    numerosFios_.libera();
     numerosCabos_.clear();
     corteDe_ = OdDbObjectId();
-    ligacoesPorElemento_.clear();
-    ligacoesAntigas_.clear();
-    entidadesLidas_.clear();
-    entidadesAntigas_.clear();
+    ligacoesPorElemento_.libera();
+    ligacoesAntigas_.libera();
+    entidadesLidas_.libera();
+    entidadesAntigas_.libera();
     versaoLidas_ = versao;
 }
 
 const CCDataReader::NumeroFio& CCDataReader::NumeroDoFioGuardado(
     const OdDbObjectId& entidade) const {
     ConfereVersao();
-    auto achado = numerosFios_.find(entidade);
-    if (achado != numerosFios_.end()) return achado->second;
+    if (const NumeroFio* achado = numerosFios_.procura(entidade)) return *achado;
     NumeroFio numero;
     if (std::optional<QString> proprio = NumeroNoCampoFio(entidade)) {
         numero.numero = *proprio;
@@ -463,7 +466,7 @@ const CCDataReader::NumeroFio& CCDataReader::NumeroDoFioGuardado(
     } else {
         numero.numero = NumeroNoCabo(entidade);
     }
-    return numerosFios_.emplace(entidade, std::move(numero)).first->second;
+    return numerosFios_.insere(entidade, std::move(numero));
 }
 
 QString CCDataReader::NumeroDoFio(const OdDbObjectId& entidade) const {
@@ -525,40 +528,41 @@ std::unique_ptr<zv::CEAtributo> CCDataReader::AtributoConexaoProximo(const OdDbO
     // An element is asked at each of its connections: its connection attributes and their
     // places are read once.
     ConfereVersao();
-    auto achado = ligacoesPorElemento_.find(elemento);
-    if (achado == ligacoesPorElemento_.end()) {
+    const std::vector<LigacaoGuardada>* achado = ligacoesPorElemento_.procura(elemento);
+    if (!achado) {
         std::vector<LigacaoGuardada> ligacoes;
-        if (auto antiga = ligacoesAntigas_.find(elemento); antiga != ligacoesAntigas_.end()) {
-            ligacoes = std::move(antiga->second);
-            ligacoesAntigas_.erase(antiga);
-        } else if (atributosDe_ == elemento &&
-                   atributosVersao_ == CICad::VersaoDesenho(elemento.database())) {
-            for (const LigacaoLida& lida : ligacoesLidas_)
-                ligacoes.push_back({CICad::GetPosicaoTexto(lida.id),
-                                    zv::CEAtributo(lida.tag, QString(), lida.valor, lida.id,
-                                                   CICad::AtributoInvisivel(lida.id))});
-        } else {
-            std::unique_ptr<zv::CEListaAtributos> atributos;
-            CICad::GetAtributos(elemento, atributos, false, false);
-            for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
-                const zv::CEAtributo& atributo = (*atributos)[i];
-                const QString tag = atributo.GetTag().toUpper();
-                if (std::any_of(std::begin(kPalavrasConexao), std::end(kPalavrasConexao),
-                                [&tag](QLatin1String palavra) { return tag.startsWith(palavra); }))
-                    ligacoes.push_back({CICad::GetPosicaoTexto(atributo.GetId()), atributo});
+        // One kept at the turn before comes back as it was.
+        if (!ligacoesAntigas_.retira(elemento, ligacoes)) {
+            if (atributosDe_ == elemento &&
+                atributosVersao_ == CICad::VersaoDesenho(elemento.database())) {
+                for (const LigacaoLida& lida : ligacoesLidas_)
+                    ligacoes.push_back({CICad::GetPosicaoTexto(lida.id),
+                                        zv::CEAtributo(lida.tag, QString(), lida.valor, lida.id,
+                                                       CICad::AtributoInvisivel(lida.id))});
+            } else {
+                std::unique_ptr<zv::CEListaAtributos> atributos;
+                CICad::GetAtributos(elemento, atributos, false, false);
+                for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
+                    const zv::CEAtributo& atributo = (*atributos)[i];
+                    const QString tag = atributo.GetTag().toUpper();
+                    if (std::any_of(
+                            std::begin(kPalavrasConexao), std::end(kPalavrasConexao),
+                            [&tag](QLatin1String palavra) { return tag.startsWith(palavra); }))
+                        ligacoes.push_back({CICad::GetPosicaoTexto(atributo.GetId()), atributo});
+                }
             }
         }
         atributosDe_ = OdDbObjectId();
         if (ligacoesPorElemento_.size() >= limiteLidas_) {
             // The turn, as for the entities kept read.
-            ligacoesAntigas_ = std::move(ligacoesPorElemento_);
-            ligacoesPorElemento_ = {};
+            std::swap(ligacoesAntigas_, ligacoesPorElemento_);
+            ligacoesPorElemento_.limpa();
         }
-        achado = ligacoesPorElemento_.emplace(elemento, std::move(ligacoes)).first;
+        achado = &ligacoesPorElemento_.insere(elemento, std::move(ligacoes));
     }
     const LigacaoGuardada* melhor = nullptr;
     double menor = 0.0;
-    for (const LigacaoGuardada& ligacao : achado->second) {
+    for (const LigacaoGuardada& ligacao : *achado) {
         const double d = Distancia(ligacao.posicao, ponto);
         if (!melhor || d < menor) melhor = &ligacao, menor = d;
     }
@@ -693,30 +697,36 @@ void CCDataReader::LeRotasDoItem(const CEItemLista& item, CETemplate* modelo) {
 }
 
 bool CCDataReader::LeCamposFio(const QString& s, CEItemLista& item, const OdDbObjectId& polilinha) {
-    const QString chaveTexto = ChaveDaEntidade(polilinha);
-    LeColunasUsuario(s, item, catalogo_.ColunasFio(chaveTexto));
+    // Wires repeat their key texts: each is split and looked up once for the run.
+    PoeColunasFio(s, item, ChaveDaEntidadeLida(polilinha));
     if (appFioEm_ != polilinha.database() ||
         appFioVersao_ != CICad::VersaoDesenho(polilinha.database())) {
         CICad::RegistraApp("KVR_ZV_WIRE", polilinha.database());
         appFioEm_ = polilinha.database();
         appFioVersao_ = CICad::VersaoDesenho(polilinha.database());
     }
-    const CEListaXData fio = CICad::GetXData(polilinha, "KVR_ZV_WIRE");
-    QString chave, norma;
-    if (!fio.empty()) {
-        ZVString(fio[0].texto).DivideEmDois(kSeparador, chave, norma);
-        const QString segundo = fio.size() > 1 ? fio[1].texto : QString();
+    CICad::TextosXData(polilinha, "KVR_ZV_WIRE", textosFio_);
+    const ChaveLida* chave = &semChave_;
+    if (!textosFio_.empty()) {
+        chave = &ChaveDoTexto(textosFio_[0]);
         // Without key, standard and its second item the polyline is no complete wire.
-        if (chave.isEmpty() || norma.isEmpty() || segundo.isEmpty()) return false;
-        item.definirCampo(NumeroCampo<"ZV_KEY">(s), chave);
-        for (size_t i = 2; i < fio.size(); ++i) {
+        if (chave->chave.isEmpty() || chave->norma.isEmpty() || textosFio_.size() < 2 ||
+            textosFio_[1].empty())
+            return false;
+        item.definirCampo(NumeroCampo<"ZV_KEY">(s), chave->chave);
+        // Each wire has a number of its own: its field texts are split as they come.
+        for (size_t i = 2; i < textosFio_.size(); ++i) {
             QString nome, valor;
-            if (ZVString(fio[i].texto).DivideEmDois(kSeparador, nome, valor) && !nome.isEmpty())
-                item.definirCampo(nome + s, valor);
+            const std::string_view texto = textosFio_[i];
+            if (ZVString(QString::fromUtf8(texto.data(), int(texto.size())))
+                    .DivideEmDois(kSeparador, nome, valor) &&
+                !nome.isEmpty())
+                item.definirCampo(CamposItem::numero(s.isEmpty() ? nome : QString(nome + s)),
+                                  valor);
         }
     }
-    item.definirCampo(NumeroCampo<"WIRE_LISTA">(s), catalogo_.ListaFio(chave, norma));
-    const QString descricao = catalogo_.DescricaoFio(chave);
+    const auto& [lista, descricao] = ListaDescricaoFioDe(*chave);
+    item.definirCampo(NumeroCampo<"WIRE_LISTA">(s), lista);
     item.definirCampo(NumeroCampo<"DESCRICAO">(s), descricao);
     item.definirCampo(NumeroCampo<"TP_DESCRI">(s), descricao);
     item.definirCampo(NumeroCampo<"POSICAO">(s), Posicao(polilinha));
@@ -772,7 +782,8 @@ CCDataReader::EntidadeLida CCDataReader::LeEntidadeGuardada(const OdDbObjectId& 
     // A QTD of the entity's own replaces this mark; without one the mark stays.
     static const QString kMarca = QStringLiteral("\x01");
     const std::uint32_t qtd = NumeroCampo<"QTD">();
-    CEItemLista lido;
+    CEItemLista& lido = leitura_;
+    lido.campos.clear();
     EntidadeLida lida;
     bool completa = false;
     if (CICad::EhReferencia(id)) {
@@ -788,8 +799,8 @@ CCDataReader::EntidadeLida CCDataReader::LeEntidadeGuardada(const OdDbObjectId& 
     // The reading is made apart: its values move into the kept form, none is copied.
     std::vector<CamposItem::Campo> campos = lido.campos.retirar();
     bool marcada = false;
-    std::vector<std::uint32_t> nomes;
-    nomes.reserve(campos.size());
+    std::vector<std::uint32_t>& nomes = nomesLidos_;
+    nomes.clear();
     lida.valores.reserve(campos.size() + 1);
     for (CamposItem::Campo& campo : campos) {
         if (campo.nome == qtd && campo.valor == kMarca) {
@@ -801,21 +812,19 @@ CCDataReader::EntidadeLida CCDataReader::LeEntidadeGuardada(const OdDbObjectId& 
     }
     lida.qtdPadrao = marcada && completa;
     if (lida.qtdPadrao) lida.valores.push_back(QStringLiteral("1"));
-    std::unique_ptr<FormaCampos>& forma = formas_[nomes];
-    if (!forma) forma = std::make_unique<FormaCampos>(FormaCampos{std::move(nomes), {}});
-    lida.forma = forma.get();
+    auto forma = formas_.find(nomes);
+    if (forma == formas_.end())
+        forma = formas_.emplace(nomes, std::make_unique<FormaCampos>(FormaCampos{nomes, {}})).first;
+    lida.forma = forma->second.get();
+    lido.campos.reaproveitar(std::move(campos));
     return lida;
 }
 
 const CCDataReader::EntidadeLida& CCDataReader::EntidadeGuardada(const OdDbObjectId& id,
                                                                  CETemplate* modelo) {
-    if (auto achado = entidadesLidas_.find(id); achado != entidadesLidas_.end())
-        return achado->second;
+    if (const EntidadeLida* achado = entidadesLidas_.procura(id)) return *achado;
     EntidadeLida lida;
-    if (auto antiga = entidadesAntigas_.find(id); antiga != entidadesAntigas_.end()) {
-        lida = std::move(antiga->second);
-        entidadesAntigas_.erase(antiga);
-    } else {
+    if (!entidadesAntigas_.retira(id, lida)) {
         lida = LeEntidadeGuardada(id, modelo);
         if ((lida.fio && !GuardaFios) || (lida.borne && !GuardaBornes)) {
             avulsa_ = std::move(lida);
@@ -824,10 +833,11 @@ const CCDataReader::EntidadeLida& CCDataReader::EntidadeGuardada(const OdDbObjec
     }
     if (entidadesLidas_.size() >= limiteLidas_) {
         // The turn: what was not asked for again since the last one goes.
-        entidadesAntigas_ = std::move(entidadesLidas_);
-        entidadesLidas_ = {};
+        // The arrays are kept: each turn fills as many again.
+        std::swap(entidadesAntigas_, entidadesLidas_);
+        entidadesLidas_.limpa();
     }
-    return entidadesLidas_.emplace(id, std::move(lida)).first->second;
+    return entidadesLidas_.insere(id, std::move(lida));
 }
 
 void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,

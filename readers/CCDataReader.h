@@ -3,6 +3,7 @@
 // it, kept in maps for one run, with point and neighbour queries on it; and the building of
 // items from drawing entities, their attributes, extended data and catalogue data.
 #include "CEAtributo.h"
+#include "TabelaIds.h"
 #include "VetorItens.h"
 #include "cad/CICad.h"
 #include "catalogue/CECacheCatalogo.h"
@@ -97,7 +98,7 @@ public:
     void LimitaEntidadesGuardadas(std::size_t n) { limiteLidas_ = std::max<std::size_t>(n, 1); }
     // Whether CopiaEntidade keeps the entity's reading for the next copy.
     bool LeituraGuardada(const OdDbObjectId& id) const {
-        return entidadesLidas_.count(id) || entidadesAntigas_.count(id);
+        return entidadesLidas_.contains(id) || entidadesAntigas_.contains(id);
     }
     // Whether wires' and terminals' readings are kept (see GuardaFios, GuardaBornes).
     bool GuardaLeiturasDeFios() const { return GuardaFios; }
@@ -243,7 +244,7 @@ private:
     };
     // Those asked for since the last turn, and those of the turn before, which move back when
     // asked for again and go at the next turn.
-    mutable std::unordered_map<OdDbObjectId, EntidadeLida> entidadesLidas_, entidadesAntigas_;
+    mutable TabelaIds<EntidadeLida> entidadesLidas_, entidadesAntigas_;
     // Unbounded unless the reader sets a bound: the other lists ask in orders that would read
     // many again.
     std::size_t limiteLidas_ = SIZE_MAX;
@@ -253,13 +254,16 @@ private:
     EntidadeLida avulsa_;
     // The entity read apart into the form CopiaEntidade keeps.
     EntidadeLida LeEntidadeGuardada(const OdDbObjectId& id, CETemplate* modelo);
+    // The item each reading is made in and the names it gave: their arrays serve the next.
+    CEItemLista leitura_;
+    std::vector<std::uint32_t> nomesLidos_;
     // Per wire polyline: its number as NumeroDoFio gives it, and whether its own field holds
     // one; every terminal side and neighbour asks for the wires at its points.
     struct NumeroFio {
         QString numero;
         bool proprio = false;
     };
-    mutable std::unordered_map<OdDbObjectId, NumeroFio> numerosFios_;
+    mutable TabelaIds<NumeroFio> numerosFios_;
     // Per cable record (by handle text): its CABO or CABLE attribute, shared by its cores.
     mutable QHash<QString, std::optional<QString>> numerosCabos_;
     QString NumeroNoCabo(const OdDbObjectId& entidade) const;
@@ -269,8 +273,7 @@ private:
         zv::CEAtributo atributo;
     };
     // Bounded in two turns as the entities kept read are.
-    mutable std::unordered_map<OdDbObjectId, std::vector<LigacaoGuardada>> ligacoesPorElemento_,
-        ligacoesAntigas_;
+    mutable TabelaIds<std::vector<LigacaoGuardada>> ligacoesPorElemento_, ligacoesAntigas_;
     // The last cut point asked for: both sides of a terminal ask for it.
     mutable OdDbObjectId corteDe_;
     mutable CEPonto corte_;
@@ -353,6 +356,15 @@ private:
     struct ChaveLida {
         QString chave, norma;
         mutable const CatalogoComp* catalogo = nullptr;
+        // As a wire's key: its catalogue columns split, and its list and description.
+        mutable std::optional<std::vector<std::pair<std::uint32_t, QString>>> colunasFio;
+        mutable std::optional<std::pair<QString, QString>> listaDescricaoFio;
+        // Forgets what the catalogue said: its readings are given back.
+        void Esquece() const {
+            catalogo = nullptr;
+            colunasFio.reset();
+            listaDescricaoFio.reset();
+        }
     };
     mutable PorTexto<ChaveLida> chaves_;
     const ChaveLida semChave_;  // of an entity without a key text
@@ -370,6 +382,13 @@ private:
     // their items share one text.
     PorTexto<QString> valores_;
     const QString& ValorDoTexto(std::string_view valor);
+    // The key text of an entity as ChaveENorma reads it; semChave_ without one.
+    const ChaveLida& ChaveDaEntidadeLida(const OdDbObjectId& entidade) const;
+    // A wire's catalogue columns under the suffix, and its list and description, asked of
+    // the catalogue once per key.
+    void PoeColunasFio(const QString& s, CEItemLista& item, const ChaveLida& chave);
+    const std::pair<QString, QString>& ListaDescricaoFioDe(const ChaveLida& chave);
+    std::vector<std::string_view> textosFio_;  // the items of the wire being read
     // The last symbol read, and the fields of one reading before they join the item (in
     // order of writing: a later one of the same name wins).
     CESimboloLido simbolo_;

@@ -49,6 +49,39 @@ bool CCDataReader::ChaveENorma(const OdDbObjectId& entidade, QString& chave, QSt
     return true;
 }
 
+const CCDataReader::ChaveLida& CCDataReader::ChaveDaEntidadeLida(
+    const OdDbObjectId& entidade) const {
+    std::string_view texto;
+    bool temTexto = false;
+    if (!CICad::TextoChave(entidade, texto, temTexto) || !temTexto) return semChave_;
+    return ChaveDoTexto(texto);
+}
+
+void CCDataReader::PoeColunasFio(const QString& s, CEItemLista& item, const ChaveLida& chave) {
+    if (chave.colunasFio) {
+        for (const auto& [nome, valor] : *chave.colunasFio)
+            item.definirCampo(CamposItem::numeroComSufixo(nome, s), valor);
+        return;
+    }
+    // The first time each column is split and written in turn: names are numbered in the
+    // order they are first met.
+    std::vector<std::pair<std::uint32_t, QString>> campos;
+    for (const QString& coluna : catalogo_.ColunasFio(chave.chave)) {
+        const std::pair<std::uint32_t, QString>& dividida = ColunaDividida(coluna);
+        if (dividida.first == kSemColuna) continue;
+        campos.push_back(dividida);
+        item.definirCampo(CamposItem::numeroComSufixo(dividida.first, s), dividida.second);
+    }
+    chave.colunasFio = std::move(campos);
+}
+
+const std::pair<QString, QString>& CCDataReader::ListaDescricaoFioDe(const ChaveLida& chave) {
+    if (!chave.listaDescricaoFio)
+        chave.listaDescricaoFio.emplace(catalogo_.ListaFio(chave.chave, chave.norma),
+                                        catalogo_.DescricaoFio(chave.chave));
+    return *chave.listaDescricaoFio;
+}
+
 CCDataReader::TagLida& CCDataReader::TagDoTexto(std::string_view tag) {
     auto it = tags_.find(tag);
     if (it != tags_.end()) return it->second;

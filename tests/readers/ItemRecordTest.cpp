@@ -358,6 +358,23 @@ TEST(ItemRecordTest, FieldsHandedOverLeaveNoneBehind) {
     EXPECT_EQ(item.valorCampo("ENTREGA_A"), "3");
 }
 
+// An array handed back comes empty, whatever it held, and the item fills it again.
+TEST(ItemRecordTest, AnArrayHandedBackComesEmptyAndKeepsItsRoom) {
+    CEItemLista item;
+    for (const char* nome : {"VOLTA_A", "VOLTA_B", "VOLTA_C"})
+        item.definirCampo(nome, "x");
+    std::vector<CamposItem::Campo> campos = item.campos.retirar();
+    const std::size_t lugar = campos.capacity();
+    item.campos.reaproveitar(std::move(campos));
+    EXPECT_TRUE(item.campos.isEmpty());
+    EXPECT_FALSE(item.temCampo("VOLTA_B"));
+    item.definirCampo("VOLTA_C", "1");
+    EXPECT_EQ(item.campos.size(), 1);
+    EXPECT_EQ(item.valorCampo("VOLTA_C"), "1");
+    // The room is the array's own: taken out again, it has at least what it had.
+    EXPECT_GE(item.campos.retirar().capacity(), lugar);
+}
+
 // Asking for a name no item ever had does not add it to the program's name table.
 TEST(ItemRecordTest, LookingUpAnUnknownNameLeavesTheNameTableAlone) {
     CEItemLista item;

@@ -337,6 +337,46 @@ TEST_F(WireReaderTest, TheNumberIsReadFromAnyLanguagesWireField) {
     EXPECT_EQ(numeros, QStringList({"ALAMBRE=8", "CABO=9", "WIRE=7"}));
 }
 
+TEST_F(WireReaderTest, AWiresFieldsFollowItsTextsUnderAnySuffixAndAfterAChange) {
+    zvdb::Polyline* a = fio({{0, 10, 0}, {10, 10, 0}}, "30");
+    zvdb::Polyline* b = fio({{0, 20, 0}, {10, 20, 0}}, "30");
+    const auto textos = [](const CEItemLista& item) { return item.textoCampos(); };
+    // One reader reads both wires of one key and number, the second under a suffix; each
+    // gives what a reader of its own gives.
+    CCFioDataReader leitor, sozinhoA, sozinhoB;
+    CEItemLista lidoA, lidoB, aParteA, aParteB;
+    leitor.LeFio(QString(), lidoA, id(a), &modelo_);
+    leitor.LeFio("_X", lidoB, id(b), &modelo_);
+    sozinhoA.LeFio(QString(), aParteA, id(a), &modelo_);
+    sozinhoB.LeFio("_X", aParteB, id(b), &modelo_);
+    EXPECT_EQ(textos(lidoA), textos(aParteA));
+    EXPECT_EQ(textos(lidoB), textos(aParteB));
+    EXPECT_EQ(lidoA.valorCampo("FIO"), "30");
+    EXPECT_EQ(lidoB.valorCampo("FIO_X"), "30");
+    EXPECT_FALSE(lidoB.temCampo("FIO"));
+    EXPECT_EQ(lidoB.valorCampo("ZV_KEY_X"), "10006");
+
+    // The texts changed in the drawing: the next reading gives the new fields; a text of
+    // three parts or of separators alone is no field.
+    b->setXData("KVR_ZV_WIRE", zvsample::XDataItems()
+                                   .text("10006\f1")
+                                   .text("1")
+                                   .text("FIO\f31")
+                                   .text("COR\fAZ")
+                                   .text("A\fB\fC")
+                                   .text("\f\f")
+                                   .tags());
+    CEItemLista depois;
+    leitor.LeFio(QString(), depois, id(b), &modelo_);
+    EXPECT_EQ(depois.valorCampo("FIO"), "31");
+    EXPECT_EQ(depois.valorCampo("COR"), "AZ");
+    EXPECT_FALSE(depois.temCampo("A"));
+    CCFioDataReader novo;
+    CEItemLista novoB;
+    novo.LeFio(QString(), novoB, id(b), &modelo_);
+    EXPECT_EQ(textos(depois), textos(novoB));
+}
+
 class FiltroTemplate : public TemplateDouble {
 public:
     bool FiltraItem(const CEItemLista& item) override { return item.valorCampo("FIO") != "51"; }
