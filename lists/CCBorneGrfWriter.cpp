@@ -161,7 +161,7 @@ void CCBorneGrfWriter::InsereMarcas(const CELinhaLista& linha, const QString& la
     auto insere = [&](int marca, double x) {
         if (marca < 0 || marca > 3) return;
         const auto& bloco = marcas_[size_t(marca)];
-        CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, x, linha.y, 0, 0);
+        detalhes_.insercoes.Insere(bloco.arquivo, bloco.nome, layer, x, linha.y);
     };
     for (size_t k = 0; k < linha.marcas.size(); ++k)
         insere(linha.marcas[k], linha.x + double(k) * distColunas_);
@@ -175,6 +175,7 @@ void CCBorneGrfWriter::EscreverItens(VetorItens& itens, CETemplate& modelo) {
     numColunas_ = modelo.LerInteiro("*NUM_COLUNAS_CFG*");
     visualizarJumper_ = modelo.LerTexto("*VISUALIZAR_JUMPER_CFG*") == "1";
     const bool variasColunas = modelo.LerLogico("*COLUNA_SN*");
+    detalhes_.Reinicia();
     const auto blocos = CCListaPaginada::ResolveBlocos(
         modelo, {"LISTA_CABEC", "LISTA_DETALHE", "LISTA_RODAPE", "LISTA_TOTAL"},
         {"BLK_CTR_LST_CABEC_BORN", "BLK_CTR_LST_DET_BORN", "BLK_CTR_LST_RODAPE_BORN",
@@ -188,7 +189,7 @@ void CCBorneGrfWriter::EscreverItens(VetorItens& itens, CETemplate& modelo) {
         CCListaPaginada::InsereCampos(blocos[0], pagina.nome, pagina.atributos, true);
         for (const CELinhaLista& linha : pagina.linhas) {
             if (!linha.item) continue;
-            CCListaPaginada::InsereDetalhe(blocos[1], pagina.nome, linha, variasColunas);
+            CCListaPaginada::InsereDetalhe(detalhes_, blocos[1], pagina.nome, linha, variasColunas);
             if (visualizarJumper_) InsereMarcas(linha, pagina.nome);
         }
         CCListaPaginada::InsereCampos(blocos[2], pagina.nome, pagina.atributos, false);

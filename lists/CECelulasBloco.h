@@ -1,0 +1,70 @@
+#pragma once
+// What a list writer makes of each cell of a block it places row after row, worked out once
+// for the block instead of once a cell placed. A cell is known again by its tag and default
+// text being the very texts the block's definition gave at that place before; these are kept
+// here, so they cannot be freed and their memory handed to other texts. Any other texts (a
+// block read again, another block by that name) are worked out anew and kept instead.
+#include "readers/CamposItem.h"
+
+#include <QHash>
+#include <QString>
+
+#include <cstddef>
+#include <cstdint>
+#include <vector>
+
+template <typename Papel>
+class CECelulasBloco {
+public:
+    // The cells of one placing of the block of that name start here, in their order.
+    void Inicia(const QString& nome) {
+        atual_ = &porBloco_[nome];
+        indice_ = 0;
+    }
+    // What the next cell is: the kept answer when its texts are the ones seen at its place,
+    // else `resolve(tag, padrao)`, kept for the next time.
+    template <typename Resolve>
+    Papel& Proxima(const QString& tag, const QString& padrao, Resolve&& resolve) {
+        std::vector<Celula>& celulas = *atual_;
+        if (indice_ >= celulas.size()) celulas.resize(indice_ + 1);
+        Celula& celula = celulas[indice_++];
+        if (!celula.conhecida || !celula.tag.isSharedWith(tag) ||
+            !celula.padrao.isSharedWith(padrao))
+            celula = {tag, padrao, resolve(tag, padrao), true};
+        return celula.papel;
+    }
+    void Reinicia() {
+        porBloco_.clear();
+        atual_ = nullptr;
+        indice_ = 0;
+    }
+
+private:
+    struct Celula {
+        QString tag;
+        QString padrao;
+        Papel papel{};
+        bool conhecida = false;
+    };
+    QHash<QString, std::vector<Celula>> porBloco_;
+    std::vector<Celula>* atual_ = nullptr;
+    std::size_t indice_ = 0;
+};
+
+// A field of the items by its name's number, found once. A name that no item had yet is
+// looked for again when names were added since.
+struct CECampoPorNumero {
+    std::uint32_t numero = CamposItem::kSemNome;
+    std::size_t nomes = 0;
+
+    static CECampoPorNumero De(const QString& nome) {
+        return {CamposItem::numeroSeHouver(nome), CamposItem::quantidadeNomes()};
+    }
+    // The item's value of the field (empty when it has none), as CamposItem::value gives it.
+    QString Valor(const CamposItem& campos, const QString& nome) {
+        if (numero == CamposItem::kSemNome && nomes != CamposItem::quantidadeNomes())
+            *this = De(nome);
+        const QString* valor = numero == CamposItem::kSemNome ? nullptr : campos.procura(numero);
+        return valor ? *valor : QString();
+    }
+};
