@@ -33,7 +33,8 @@ CCBorneDwgWriter::Bloco CCBorneDwgWriter::BlocoConfigurado(const QString& valor)
 }
 
 CCBorneDwgWriter::Bloco CCBorneDwgWriter::BlocoSimbolo(const CEItemLista& item) {
-    const QString chave = item.valorCampo("ZV_KEY");
+    const QString* campo = item.campos.procura(NumeroCampo<"ZV_KEY">());
+    const QString chave = campo ? *campo : QString();
     auto it = blocosSimbolo_.constFind(chave);
     if (it != blocosSimbolo_.constEnd()) return it.value();
     const QString nome = catalogo_.BlocoRepresentacao(chave, norma_, representacao_);
