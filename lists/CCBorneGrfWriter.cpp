@@ -8,6 +8,8 @@
 #include "readers/ZVString.h"
 #include "settings/CIMensagens.h"
 
+#include <utility>
+
 namespace {
 
 constexpr auto& kReguas = CCBorneDataReader::kCamposRegua;
@@ -57,13 +59,15 @@ std::vector<CEPaginaLista> CCBorneGrfWriter::Diagrama(VetorItens& itens, CETempl
     paginas.back().atributos = CCListaPaginada::CamposPrimeiraPagina(n);
     for (const char* campo : kReguas)
         paginas.back().atributos.insert(campo, CCBorneDataReader::Regua(*presentes[0]));
+    // Read once: nothing in the layout runs LISP that could change it.
+    const bool preenche = modelo.LerLogico("*PREENCHE_ATE_FINAL*");
+    QString seguinte = CCBorneDataReader::Regua(*presentes[0]);
     for (int i = 0; i < n; ++i) {
         CEItemLista& item = *presentes[size_t(i)];
         grade.Coloca(paginas.back(), &item);
-        const QString atual = CCBorneDataReader::Regua(item);
-        const QString seguinte =
-            i + 1 < n ? CCBorneDataReader::Regua(*presentes[size_t(i + 1)]) : QString();
-        const bool preenche = modelo.LerLogico("*PREENCHE_ATE_FINAL*");
+        // Each item's strip is read once: as the next one's, then as its own.
+        const QString atual = std::exchange(
+            seguinte, i + 1 < n ? CCBorneDataReader::Regua(*presentes[size_t(i + 1)]) : QString());
         bool quebra = false;
         if (!preenche && i + 1 < n) {
             if (atual != seguinte) {
