@@ -1,9 +1,10 @@
 #pragma once
 // What a list writer makes of each cell of a block it places row after row, worked out once
-// for the block instead of once a cell placed. A cell is known again by its tag and default
-// text being the very texts the block's definition gave at that place before; these are kept
-// here, so they cannot be freed and their memory handed to other texts. Any other texts (a
-// block read again, another block by that name) are worked out anew and kept instead.
+// for the block instead of once a cell placed. What a cell is depends on its tag and default
+// text alone: a cell whose texts are those seen at its place before keeps the answer. Most
+// often they are the very texts of the block's definition, told at once by their shared
+// memory (kept here, so it cannot be freed and handed to other texts); texts read back from
+// a placed reference are compared. Any other texts are worked out anew and kept instead.
 #include "readers/CamposItem.h"
 
 #include <QHash>
@@ -28,8 +29,7 @@ public:
         std::vector<Celula>& celulas = *atual_;
         if (indice_ >= celulas.size()) celulas.resize(indice_ + 1);
         Celula& celula = celulas[indice_++];
-        if (!celula.conhecida || !celula.tag.isSharedWith(tag) ||
-            !celula.padrao.isSharedWith(padrao))
+        if (!celula.conhecida || !Mesmo(celula.tag, tag) || !Mesmo(celula.padrao, padrao))
             celula = {tag, padrao, resolve(tag, padrao), true};
         return celula.papel;
     }
@@ -40,6 +40,14 @@ public:
     }
 
 private:
+    // Equal texts of other memory are taken in place of the kept ones: the next placing
+    // most often brings the same memory again.
+    static bool Mesmo(QString& guardado, const QString& texto) {
+        if (guardado.isSharedWith(texto)) return true;
+        if (guardado != texto) return false;
+        guardado = texto;
+        return true;
+    }
     struct Celula {
         QString tag;
         QString padrao;

@@ -1,6 +1,6 @@
 // What the list writers keep of a block's cells from one row to the next: a cell is worked
-// out again only when its texts are not the very ones seen at its place, and a field name no
-// item had yet is found once an item has it.
+// out again only when its texts are not the ones seen at its place, and a field name no item
+// had yet is found once an item has it.
 #include "lists/CECelulasBloco.h"
 #include "readers/CEItemLista.h"
 
@@ -35,21 +35,26 @@ TEST(CelulasBlocoTest, TheSameTextsAtAPlaceAreWorkedOutOnceForEveryPlacing) {
     EXPECT_EQ(resolve.vezes, 2);
 }
 
-TEST(CelulasBlocoTest, EqualTextsOfOtherMemoryOrOtherTextsAreWorkedOutAgain) {
+TEST(CelulasBlocoTest, EqualTextsOfOtherMemoryKeepTheAnswerAndOtherTextsAreWorkedOutAgain) {
     CECelulasBloco<QString> celulas;
     Contador resolve;
     const QString tag = "VARIAVEL_1", padrao = "FIO";
     celulas.Inicia("LINHA");
     celulas.Proxima(tag, padrao, resolve);
+    // As read back from a placed reference: the same texts, in memory of their own.
     celulas.Inicia("LINHA");
-    EXPECT_EQ(celulas.Proxima(Outra(tag), padrao, resolve), "VARIAVEL_1/FIO");
-    EXPECT_EQ(resolve.vezes, 2);
+    EXPECT_EQ(celulas.Proxima(Outra(tag), Outra(padrao), resolve), "VARIAVEL_1/FIO");
+    EXPECT_EQ(resolve.vezes, 1);
     // The block changed: the place now holds another cell, and its answer is the new one.
     const QString nova = "FUNCAO_1";
     celulas.Inicia("LINHA");
     EXPECT_EQ(celulas.Proxima(nova, padrao, resolve), "FUNCAO_1/FIO");
     celulas.Inicia("LINHA");
     EXPECT_EQ(celulas.Proxima(nova, padrao, resolve), "FUNCAO_1/FIO");
+    EXPECT_EQ(resolve.vezes, 2);
+    // A changed default text alone is another cell too.
+    celulas.Inicia("LINHA");
+    EXPECT_EQ(celulas.Proxima(nova, Outra(padrao) + "_2", resolve), "FUNCAO_1/FIO_2");
     EXPECT_EQ(resolve.vezes, 3);
 }
 
