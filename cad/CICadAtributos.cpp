@@ -99,10 +99,14 @@ void CICad::GetAtributosPorId(const OdDbObjectId& id, std::unique_ptr<zv::CEList
 }
 
 std::vector<OdDbObjectId> CICad::GetIdsAtributos(const OdDbObjectId& referencia) {
+    // Straight from the reference's own list, in one array: no list of attributes between.
     std::vector<OdDbObjectId> ids;
-    if (auto* ref = Como<zvdb::BlockReference>(referencia))
-        for (zvdb::Attribute* atributo : ref->attributes())
-            ids.push_back(Id(atributo));
+    auto* ref = Como<zvdb::BlockReference>(referencia);
+    if (!ref) return ids;
+    ids.reserve(ref->subEntities().size());
+    for (zvdb::Entity* sub : ref->subEntities())
+        if (!sub->isErased())
+            if (auto* atributo = dynamic_cast<zvdb::Attribute*>(sub)) ids.push_back(Id(atributo));
     return ids;
 }
 

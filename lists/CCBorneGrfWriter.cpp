@@ -8,6 +8,8 @@
 #include "readers/ZVString.h"
 #include "settings/CIMensagens.h"
 
+#include <utility>
+
 namespace {
 
 constexpr auto& kReguas = CCBorneDataReader::kCamposRegua;
@@ -57,13 +59,15 @@ std::vector<CEPaginaLista> CCBorneGrfWriter::Diagrama(VetorItens& itens, CETempl
     paginas.back().atributos = CCListaPaginada::CamposPrimeiraPagina(n);
     for (const char* campo : kReguas)
         paginas.back().atributos.insert(campo, CCBorneDataReader::Regua(*presentes[0]));
+    // Read once: nothing in the layout runs LISP that could change it.
+    const bool preenche = modelo.LerLogico("*PREENCHE_ATE_FINAL*");
+    QString seguinte = CCBorneDataReader::Regua(*presentes[0]);
     for (int i = 0; i < n; ++i) {
         CEItemLista& item = *presentes[size_t(i)];
         grade.Coloca(paginas.back(), &item);
-        const QString atual = CCBorneDataReader::Regua(item);
-        const QString seguinte =
-            i + 1 < n ? CCBorneDataReader::Regua(*presentes[size_t(i + 1)]) : QString();
-        const bool preenche = modelo.LerLogico("*PREENCHE_ATE_FINAL*");
+        // Each item's strip is read once: as the next one's, then as its own.
+        const QString atual = std::exchange(
+            seguinte, i + 1 < n ? CCBorneDataReader::Regua(*presentes[size_t(i + 1)]) : QString());
         bool quebra = false;
         if (!preenche && i + 1 < n) {
             if (atual != seguinte) {
@@ -161,7 +165,7 @@ void CCBorneGrfWriter::InsereMarcas(const CELinhaLista& linha, const QString& la
     auto insere = [&](int marca, double x) {
         if (marca < 0 || marca > 3) return;
         const auto& bloco = marcas_[size_t(marca)];
-        CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, x, linha.y, 0, 0);
+        detalhes_.insercoes.Insere(bloco.arquivo, bloco.nome, layer, x, linha.y);
     };
     for (size_t k = 0; k < linha.marcas.size(); ++k)
         insere(linha.marcas[k], linha.x + double(k) * distColunas_);
@@ -175,6 +179,7 @@ void CCBorneGrfWriter::EscreverItens(VetorItens& itens, CETemplate& modelo) {
     numColunas_ = modelo.LerInteiro("*NUM_COLUNAS_CFG*");
     visualizarJumper_ = modelo.LerTexto("*VISUALIZAR_JUMPER_CFG*") == "1";
     const bool variasColunas = modelo.LerLogico("*COLUNA_SN*");
+    detalhes_.Reinicia();
     const auto blocos = CCListaPaginada::ResolveBlocos(
         modelo, {"LISTA_CABEC", "LISTA_DETALHE", "LISTA_RODAPE", "LISTA_TOTAL"},
         {"BLK_CTR_LST_CABEC_BORN", "BLK_CTR_LST_DET_BORN", "BLK_CTR_LST_RODAPE_BORN",
@@ -188,7 +193,7 @@ void CCBorneGrfWriter::EscreverItens(VetorItens& itens, CETemplate& modelo) {
         CCListaPaginada::InsereCampos(blocos[0], pagina.nome, pagina.atributos, true);
         for (const CELinhaLista& linha : pagina.linhas) {
             if (!linha.item) continue;
-            CCListaPaginada::InsereDetalhe(blocos[1], pagina.nome, linha, variasColunas);
+            CCListaPaginada::InsereDetalhe(detalhes_, blocos[1], pagina.nome, linha, variasColunas);
             if (visualizarJumper_) InsereMarcas(linha, pagina.nome);
         }
         CCListaPaginada::InsereCampos(blocos[2], pagina.nome, pagina.atributos, false);

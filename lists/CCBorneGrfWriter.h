@@ -23,4 +23,5 @@ private:
     int numColunas_ = 0;
     bool visualizarJumper_ = false;
     std::vector<CCListaPaginada::Bloco> marcas_;
+    CCListaPaginada::Detalhes detalhes_;
 };

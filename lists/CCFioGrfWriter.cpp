@@ -169,25 +169,31 @@ void CCFioGrfWriter::InsereLinha(const CCListaPaginada::Bloco& bloco, const QStr
     const QString comprimento = item.valorCampo(kComprimento);
     std::optional<QString> impresso;
     // A cell's value from its role and its default text; none leaves the cell as it is.
-    const auto valor = [&](Papel papel, const QString& padrao) -> std::optional<QString> {
-        switch (papel) {
+    const auto celula = [this](const QString& tag, const QString& padrao) {
+        const Papel papel = PapelDoTag(tag);
+        const bool campo = papel == Papel::Variavel || papel == Papel::Total;
+        return CelulaLinha{papel, campo ? CECampoPorNumero::De(padrao) : CECampoPorNumero{}};
+    };
+    const auto valor = [&](const QString& tag, const QString& padrao) -> std::optional<QString> {
+        CelulaLinha& esta = celulas_.Proxima(tag, padrao, celula);
+        switch (esta.papel) {
             case Papel::Variavel: {
-                QString texto = item.valorCampo(padrao);
+                QString texto = esta.campo.Valor(item.campos, padrao);
                 if (comprimento.isEmpty() || texto != comprimento) return texto;
                 if (!impresso) impresso = Impresso(comprimento);
                 return *impresso;
             }
             case Papel::Total:
-                return item.valorCampo(padrao);
+                return esta.campo.Valor(item.campos, padrao);
             case Papel::Funcao:
             case Papel::Outro:
                 break;
         }
         return std::nullopt;
     };
-    const OdDbObjectId ref = preenchidos_.Insere(
-        bloco.arquivo, bloco.nome, layer, linha.x, linha.y, item,
-        [&](const QString& tag, const QString& padrao) { return valor(PapelDoTag(tag), padrao); });
+    celulas_.Inicia(bloco.nome);
+    const OdDbObjectId ref =
+        preenchidos_.Insere(bloco.arquivo, bloco.nome, layer, linha.x, linha.y, item, valor);
     if (ref.isNull()) return;
     if (!variasColunas_ && !item.ids.empty() && !item.ids.front().isNull()) {
         // The handle's text as DeHandle writes it, made here in UTF-8 for the drawing.
@@ -214,6 +220,7 @@ void CCFioGrfWriter::EscrevePagina(const CEPaginaLista& pagina) {
 
 void CCFioGrfWriter::EscreverItens(VetorItens& itens, CETemplate& modelo) {
     preenchidos_.Reinicia();
+    celulas_.Reinicia();
     impressos_.clear();
     grupo_ = modelo.LerTexto("FUNCAO_LSTGRW");
     variasColunas_ = modelo.LerLogico("*COLUNA_SN*");

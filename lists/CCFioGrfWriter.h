@@ -44,6 +44,12 @@ protected:
     // Header, detail, first-row detail, footer, total.
     std::vector<CCListaPaginada::Bloco> blocos_;
     QHash<QString, Papel> papeis_;
+    // What each cell of the row blocks is, and the field it shows, found once.
+    struct CelulaLinha {
+        Papel papel = Papel::Outro;
+        CECampoPorNumero campo;
+    };
+    CECelulasBloco<CelulaLinha> celulas_;
     // The run's row blocks, filled from their items.
     CCListaPaginada::BlocosPreenchidos preenchidos_;
     // A length's printed form with the run's digits; rows repeat a few lengths.

@@ -97,7 +97,7 @@ bool EhVariavel(const QString& tag) {
 
 }  // namespace
 
-void CCListaPaginada::InsereDetalhe(const Bloco& bloco, const QString& layer,
+void CCListaPaginada::InsereDetalhe(Detalhes& detalhes, const Bloco& bloco, const QString& layer,
                                     const CELinhaLista& linha, bool variasColunas) {
     if (!bloco.existe() || !linha.item) return;
     // A field named by the default value is the attribute's value from the start; functions
@@ -105,15 +105,24 @@ void CCListaPaginada::InsereDetalhe(const Bloco& bloco, const QString& layer,
     // reference is whole.
     std::vector<std::pair<size_t, QString>> funcoes;
     size_t indice = 0;
-    const auto valores = [&](const QString& tag, const QString& padrao) -> std::optional<QString> {
+    const auto celula = [](const QString& tag, const QString& padrao) {
         const QString maiuscula = tag.toUpper();
+        if (EhVariavel(maiuscula))
+            return CelulaDetalhe{CelulaDetalhe::Tipo::Variavel, CECampoPorNumero::De(padrao)};
+        if (EhFuncao(maiuscula)) return CelulaDetalhe{CelulaDetalhe::Tipo::Funcao, {}};
+        return CelulaDetalhe{};
+    };
+    const auto valores = [&](const QString& tag, const QString& padrao) -> std::optional<QString> {
+        CelulaDetalhe& esta = detalhes.celulas.Proxima(tag, padrao, celula);
         const size_t este = indice++;
-        if (EhVariavel(maiuscula)) return linha.item->valorCampo(padrao);
-        if (EhFuncao(maiuscula)) funcoes.emplace_back(este, padrao);
+        if (esta.tipo == CelulaDetalhe::Tipo::Variavel)
+            return esta.campo.Valor(linha.item->campos, padrao);
+        if (esta.tipo == CelulaDetalhe::Tipo::Funcao) funcoes.emplace_back(este, padrao);
         return std::nullopt;
     };
+    detalhes.celulas.Inicia(bloco.nome);
     const OdDbObjectId ref =
-        CICad::InsereBloco(bloco.arquivo, bloco.nome, layer, linha.x, linha.y, 0, 0, valores);
+        detalhes.insercoes.Insere(bloco.arquivo, bloco.nome, layer, linha.x, linha.y, valores);
     if (ref.isNull()) return;
     if (!funcoes.empty()) {
         const std::vector<OdDbObjectId> atributos = CICad::GetIdsAtributos(ref);

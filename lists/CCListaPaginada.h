@@ -1,6 +1,7 @@
 #pragma once
 // What every graphic list writer does alike: resolve and import its blocks, create its
 // pages in the project, and fill header, footer and detail rows from page fields and items.
+#include "CECelulasBloco.h"
 #include "CEPaginaLista.h"
 
 #include "cad/CEInsercoesBlocos.h"
@@ -43,10 +44,24 @@ public:
     // Header (fields looked up in upper case) or footer (as they stand), at the origin.
     static void InsereCampos(const Bloco& bloco, const QString& layer,
                              const QHash<QString, QString>& campos, bool maiusculas);
+    // What detail rows keep from one to the next: the block and the page's layer found, and
+    // what each cell of the block is (a VARIAVEL field by its number, a FUNCAO, or neither).
+    struct CelulaDetalhe {
+        enum class Tipo { Variavel, Funcao, Outra } tipo = Tipo::Outra;
+        CECampoPorNumero campo;
+    };
+    struct Detalhes {
+        CEInsercoesBlocos insercoes;
+        CECelulasBloco<CelulaDetalhe> celulas;
+        void Reinicia() {
+            insercoes.Reinicia();
+            celulas.Reinicia();
+        }
+    };
     // A detail row: VARIAVEL fields, FUNCAO expressions; the link back to the item's
     // drawing object unless the page has several columns.
-    static void InsereDetalhe(const Bloco& bloco, const QString& layer, const CELinhaLista& linha,
-                              bool variasColunas);
+    static void InsereDetalhe(Detalhes& detalhes, const Bloco& bloco, const QString& layer,
+                              const CELinhaLista& linha, bool variasColunas);
     // The value of a FUNCAO expression for the published item; empty unless a string.
     static QString AvaliaFuncao(const QString& expressao);
 

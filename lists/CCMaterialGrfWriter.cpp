@@ -550,6 +550,32 @@ void CCMaterialGrfWriter::InsereLinha(const CCListaPaginada::Bloco& bloco, const
                         {{1000, ZVString::DeHandle(item.ids.front().handle())}});
 }
 
+double CCMaterialGrfWriter::SomaCampo(const VetorItens& itens, const QString& campo) {
+    // By the field's number; the members of a group share one text of their sums, which is
+    // read as a number once (known by being that very text).
+    const std::uint32_t numero = CamposItem::numeroSeHouver(campo);
+    static const QString kVazio;
+    const double vazio = CETemplateLisp::TextoParaReal(kVazio);
+    const QString* anterior = nullptr;
+    double valorAnterior = 0;
+    double soma = 0;
+    for (const CEItemLista* item : itens)
+        for (const CEItemLista* m = item; m; m = m->ligado) {
+            const QString* texto =
+                numero == CamposItem::kSemNome ? nullptr : m->campos.procura(numero);
+            if (!texto) {
+                soma += vazio;
+                continue;
+            }
+            if (!anterior || !texto->isSharedWith(*anterior)) {
+                valorAnterior = CETemplateLisp::TextoParaReal(*texto);
+                anterior = texto;
+            }
+            soma += valorAnterior;
+        }
+    return soma;
+}
+
 void CCMaterialGrfWriter::EscreverItens(VetorItens& itens, CETemplate& modelo) {
     const QString grupo = modelo.LerTexto("FUNCAO_LM_GRF");
     const auto blocos = CCListaPaginada::ResolveBlocos(
@@ -562,10 +588,8 @@ void CCMaterialGrfWriter::EscreverItens(VetorItens& itens, CETemplate& modelo) {
     const bool variasColunas = modelo.LerLogico("*COLUNA_SN*");
     LeEspecificacoes(blocos);
     SomaGrupos(itens, digitos_);
-    for (const CEItemLista* item : itens)
-        for (const CEItemLista* m = item; m; m = m->ligado)
-            for (auto& [campo, soma] : totais)
-                soma += CETemplateLisp::TextoParaReal(m->valorCampo(campo));
+    for (auto& [campo, soma] : totais)
+        soma = SomaCampo(itens, campo);
     std::vector<CEPaginaLista> paginas = Diagrama(itens, modelo);
     Pergunta(blocos);
     CCListaPaginada::CriaPaginas(grupo, paginas);

@@ -34,6 +34,9 @@ public:
     // Group sums and numbering: QTD and COMPRIMENTO (and LENGTH) over each chain, set on
     // every member; SEQUENCIA and SEQUENCE on each entry.
     static void SomaGrupos(VetorItens& itens, int digitos);
+    // The sum of a field's numbers over every item and the members of its chain, as the
+    // total block shows it.
+    static double SomaCampo(const VetorItens& itens, const QString& campo);
     // The page layout, without touching the drawing. `especificacoes` and `especificacoesAce`
     // are the row definitions of the detail and accessory blocks (read from the blocks).
     std::vector<CEPaginaLista> Diagrama(VetorItens& itens, CETemplate& modelo);

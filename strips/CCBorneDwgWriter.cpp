@@ -33,7 +33,8 @@ CCBorneDwgWriter::Bloco CCBorneDwgWriter::BlocoConfigurado(const QString& valor)
 }
 
 CCBorneDwgWriter::Bloco CCBorneDwgWriter::BlocoSimbolo(const CEItemLista& item) {
-    const QString chave = item.valorCampo("ZV_KEY");
+    const QString* campo = item.campos.procura(NumeroCampo<"ZV_KEY">());
+    const QString chave = campo ? *campo : QString();
     auto it = blocosSimbolo_.constFind(chave);
     if (it != blocosSimbolo_.constEnd()) return it.value();
     const QString nome = catalogo_.BlocoRepresentacao(chave, norma_, representacao_);
@@ -53,32 +54,19 @@ OdDbObjectId CCBorneDwgWriter::Insere(const Bloco& bloco, const QString& layer, 
     return insercoes_.Insere(bloco.arquivo, bloco.nome, layer, x, y);
 }
 
-const CCBorneDwgWriter::CampoDoTag& CCBorneDwgWriter::CampoDe(const QString& tag) {
-    auto it = camposPorTag_.find(tag);
-    if (it == camposPorTag_.end())
-        it = camposPorTag_.insert(
-            tag, {ComecaCom(tag, "VARIAVEL", "VARIABLE"), CamposItem::kSemNome, SIZE_MAX});
-    CampoDoTag& campo = it.value();
-    // A name no item had may come with a later item: it is looked up again then.
-    if (!campo.variavel && campo.nomes != CamposItem::quantidadeNomes()) {
-        campo.numero = CamposItem::numeroSeHouver(tag);
-        campo.nomes = CamposItem::quantidadeNomes();
-    }
-    return campo;
-}
-
 OdDbObjectId CCBorneDwgWriter::InserePreenchido(const Bloco& bloco, const QString& layer, double x,
                                                 double y, const CEItemLista& item) {
     // A VARIAVEL cell names the field in its default text; any other is the field of its tag.
+    const auto celula = [](const QString& tag, const QString& padrao) {
+        const bool variavel = ComecaCom(tag, "VARIAVEL", "VARIABLE");
+        return CampoDaCelula{variavel, CECampoPorNumero::De(variavel ? padrao : tag)};
+    };
+    celulas_.Inicia(bloco.nome);
     return preenchidos_.Insere(bloco.arquivo, bloco.nome, layer, x, y, item,
-                               [this, &item](const QString& tag, const QString& padrao) {
-                                   const CampoDoTag& campo = CampoDe(tag);
-                                   if (campo.variavel)
-                                       return std::optional<QString>(item.valorCampo(padrao));
-                                   const QString* valor = campo.numero == CamposItem::kSemNome
-                                                              ? nullptr
-                                                              : item.campos.procura(campo.numero);
-                                   return std::optional<QString>(valor ? *valor : QString());
+                               [this, &item, &celula](const QString& tag, const QString& padrao) {
+                                   CampoDaCelula& esta = celulas_.Proxima(tag, padrao, celula);
+                                   return std::optional<QString>(
+                                       esta.campo.Valor(item.campos, esta.variavel ? padrao : tag));
                                });
 }
 
@@ -145,6 +133,7 @@ void CCBorneDwgWriter::Escreve(VetorItens& itens, CETemplate& modelo) {
     modelo_ = CEModeloReguas();
     preenchidos_.Reinicia();
     insercoes_.Reinicia();
+    celulas_.Reinicia();
     const CEModeloReguas::Parametros parametros = CEModeloReguas::Parametros::DoModelo(modelo);
     modelo_.Constroi(itens);
     modelo_.CalculaTrilhas();

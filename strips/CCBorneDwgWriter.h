@@ -53,16 +53,14 @@ private:
     OdDbObjectId InserePreenchido(const Bloco& bloco, const QString& layer, double x, double y,
                                   const CEItemLista& item);
 
-    // What a block's attribute tag asks of an item: the field its default text names (a
-    // VARIAVEL cell), or the field of the tag's own name, by number. Blocks repeat a few
-    // tags over every terminal and symbol: each is looked at once.
-    struct CampoDoTag {
+    // What a block's attribute asks of an item: the field its default text names (a
+    // VARIAVEL cell), or the field of the tag's own name, by number. Blocks repeat their
+    // cells over every terminal and symbol: each is looked at once.
+    struct CampoDaCelula {
         bool variavel = false;
-        std::uint32_t numero = 0;
-        std::size_t nomes = 0;  // the names the program held when the number was looked up
+        CECampoPorNumero campo;
     };
-    const CampoDoTag& CampoDe(const QString& tag);
-    QHash<QString, CampoDoTag> camposPorTag_;
+    CECelulasBloco<CampoDaCelula> celulas_;
     QString prefixo_;
     QString pastaRede_;
     CEModeloReguas modelo_;

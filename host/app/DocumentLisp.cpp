@@ -3,6 +3,8 @@
 #include "Interrupts.h"
 #include "LispChains.h"
 
+#include <utility>
+
 namespace zvhost {
 
 namespace {
@@ -63,6 +65,8 @@ int DocumentLisp::lispPutStringPairs(const QString& name, const zvsdk::StringPai
     // here; the rest is filled again in place.
     Value* link = &list;
     for (int i = 0; i < count; ++i) {
+        // Past the end of the last list, the cells a shorter one left over go on.
+        if (link->isNil() && spare_.isCons()) *link = std::exchange(spare_, Value());
         if (!link->isCons() || !alone(*link)) *link = Value::cons(Value(), Value());
         zvlisp::Cons* cell = link->asCons();
         if (!cell->car.isCons() || !alone(cell->car)) cell->car = Value::cons(Value(), Value());
@@ -71,6 +75,9 @@ int DocumentLisp::lispPutStringPairs(const QString& name, const zvsdk::StringPai
         fillText(pair->cdr, *pairs[i].value);
         link = &cell->cdr;
     }
+    // Items differ in their number of fields: the cells past this list's end are kept for
+    // a longer one, instead of being freed now and made again then.
+    if (link->isCons() && alone(*link)) spare_ = std::exchange(*link, Value());
     *link = Value();
     symbol->value = list;
     symbol->assigned = true;
@@ -100,6 +107,7 @@ zvlisp::Symbol* DocumentLisp::remember(const QString& name, zvlisp::Symbol* symb
 
 void DocumentLisp::forgetPairs() {
     pairs_ = Value();
+    spare_ = Value();
 }
 
 zvsdk::ResultBuffer* DocumentLisp::lispInvoke(const zvsdk::ResultBuffer* call) {

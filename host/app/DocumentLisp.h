@@ -72,6 +72,8 @@ private:
     QHash<QString, zvlisp::Symbol*> symbolsByName_;
     // The last list of pairs built, kept to be filled again.
     zvlisp::Value pairs_;
+    // The cells a shorter list left past its end, for the next longer one.
+    zvlisp::Value spare_;
     QHash<QString, zvlisp::Value> readTexts_;
     QHash<QString, ChainSource> chainAnswers_;
     std::vector<InvokeListener> invokeListeners_;

@@ -115,6 +115,30 @@ TEST_F(PositionChainsTest, FunctionsNeverDefinedAnswerNothingAndAreNotMadeSymbol
     zvsdk::releaseChain(value);
 }
 
+TEST_F(PositionChainsTest, ListsOfChangingLengthReadRightAndATailHeldElsewhereStaysAsItWas) {
+    const QString a = "A", b = "B", c = "C", um = "1", dois = "2", tres = "3";
+    const zvsdk::StringPair tres_pares[] = {{&a, &um}, {&b, &dois}, {&c, &tres}};
+    const zvsdk::StringPair outros_tres[] = {{&c, &um}, {&a, &dois}, {&b, &tres}};
+    const zvsdk::StringPair um_par[] = {{&b, &um}};
+    ASSERT_EQ(lisp().lispPutStringPairs("reg", tres_pares, 3), zvsdk::RTNORM);
+    ASSERT_EQ(lisp().lispPutStringPairs("reg", um_par, 1), zvsdk::RTNORM);
+    EXPECT_EQ(ev("reg"), "((\"B\" . \"1\"))");
+    ASSERT_EQ(lisp().lispPutStringPairs("reg", outros_tres, 3), zvsdk::RTNORM);
+    EXPECT_EQ(ev("reg"), "((\"C\" . \"1\") (\"A\" . \"2\") (\"B\" . \"3\"))");
+    // A tail that LISP keeps is its own: shorter and longer lists after it leave it alone.
+    ev("(setq cauda (cdr reg))");
+    ASSERT_EQ(lisp().lispPutStringPairs("reg", um_par, 1), zvsdk::RTNORM);
+    ASSERT_EQ(lisp().lispPutStringPairs("reg", tres_pares, 3), zvsdk::RTNORM);
+    EXPECT_EQ(ev("reg"), "((\"A\" . \"1\") (\"B\" . \"2\") (\"C\" . \"3\"))");
+    EXPECT_EQ(ev("cauda"), "((\"A\" . \"2\") (\"B\" . \"3\"))");
+    // Forgotten, then built anew at every length.
+    lisp().forgetPairs();
+    ASSERT_EQ(lisp().lispPutStringPairs("reg", um_par, 1), zvsdk::RTNORM);
+    ASSERT_EQ(lisp().lispPutStringPairs("reg", outros_tres, 3), zvsdk::RTNORM);
+    EXPECT_EQ(ev("reg"), "((\"C\" . \"1\") (\"A\" . \"2\") (\"B\" . \"3\"))");
+    EXPECT_EQ(ev("cauda"), "((\"A\" . \"2\") (\"B\" . \"3\"))");
+}
+
 TEST_F(PositionChainsTest, PairsPublishedAgainAndAgainStayRightAfterTheListIsForgotten) {
     const QString a = "A", b = "B", um = "1", dois = "2";
     const zvsdk::StringPair dois_pares[] = {{&a, &um}, {&b, &dois}};
