@@ -144,8 +144,11 @@ void TabelaConexoes::Carrega(const ResultBuffer* resposta, bool detalhes, bool c
             if (no->restype == zvsdk::RTSTR) {
                 const QString& texto = no->rstring;
                 const int corte = detalhes ? texto.indexOf(QLatin1Char('#')) : -1;
-                textos_.push_back(texto);
-                cortes_.push_back(corte < 0 ? int(texto.size()) : corte);
+                // Without the whole texts only the element is kept: the answer's longer
+                // texts go with it.
+                const bool soElemento = detalhes && !completas && corte >= 0;
+                textos_.push_back(soElemento ? texto.left(corte) : texto);
+                cortes_.push_back(corte < 0 || soElemento ? int(textos_.back().size()) : corte);
                 const QStringView elemento = QStringView(texto).left(cortes_.back());
                 handles_.push_back(Handle(elemento));
                 pontos_.push_back({});
