@@ -49,9 +49,12 @@ QString TabelaConexoes::Textos::value(int i) const {
     if (i < 0 || i >= total_) return {};
     const std::size_t k = primeiro_ + std::size_t(i);
     const QString& texto = tabela_->textos_[k];
-    // the whole text is shared, a part is made
-    return inteiros_ || tabela_->cortes_[k] == texto.size() ? texto
-                                                            : texto.left(tabela_->cortes_[k]);
+    if (inteiros_ || tabela_->cortes_[k] == texto.size()) return texto;
+    // a part is made once, when first asked for
+    std::vector<QString>& feitos = tabela_->elementos_;
+    if (feitos.size() < tabela_->textos_.size()) feitos.resize(tabela_->textos_.size());
+    if (feitos[k].isNull()) feitos[k] = texto.left(tabela_->cortes_[k]);
+    return feitos[k];
 }
 
 int TabelaConexoes::Textos::indexOf(QStringView texto) const {

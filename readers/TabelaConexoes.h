@@ -80,7 +80,8 @@ private:
 
     std::vector<Fio> fios_;
     std::vector<QString> textos_;
-    std::vector<std::int32_t> cortes_;  // an element's length in its text
+    std::vector<std::int32_t> cortes_;        // an element's length in its text
+    mutable std::vector<QString> elementos_;  // the elements cut from their texts so far
     std::vector<CEPonto> pontos_;
     std::vector<std::uint64_t> handles_;
     std::vector<std::uint32_t> indice_;  // record place + 1; 0 a free slot; a power of two long

@@ -113,6 +113,8 @@ TEST_F(ConnectionLoadTest, EveryNumberOfALargeAnswerFindsItsOwnEntries) {
     CICad::AvaliaLisp(cabos + "))");
     LeitorBase leitor;
     leitor.CarregaConexoesFios();
+    // an element asked for before the cables come is the same after
+    EXPECT_EQ(leitor.ListaConexoes("5")->value(0), "15");
     leitor.CarregaConexoesCabos();
     for (int i = 0; i < kFios; ++i) {
         const QString numero = QString::number(i);
