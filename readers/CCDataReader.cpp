@@ -151,10 +151,10 @@ CEPonto CCDataReader::PontoDaConexao(const QString& fio, const QString& elemento
 }
 
 CEPonto CCDataReader::PontoDaConexaoCompleta(const QString& fio, const QString& texto) const {
-    const auto completas = conexoes_.Completas(fio);
-    if (!completas) return {};
-    const std::span<const CEPonto> pontos = *conexoes_.Pontos(fio);
-    const int i = completas->indexOf(texto);
+    const auto c = conexoes_.DoFio(fio);
+    if (!c) return {};
+    const std::span<const CEPonto> pontos = c->pontos;
+    const int i = c->completas.indexOf(texto);
     return i >= 0 && size_t(i) < pontos.size() ? pontos[size_t(i)] : CEPonto{};
 }
 

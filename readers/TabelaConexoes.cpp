@@ -78,19 +78,26 @@ void TabelaConexoes::Reserva(std::size_t fios) {
     while (tamanho < fios * 2)
         tamanho *= 2;
     if (tamanho <= indice_.size()) return;
-    indice_.assign(tamanho, 0);
+    indice_.assign(tamanho, Vaga{});
     for (std::uint32_t lugar = 0; lugar < fios_.size(); ++lugar)
         Indexa(lugar);
+}
+
+// Wire numbers are alike ("101", "102"...) and so are the low bits of their hashes: the slot
+// is taken from the high bits of a product.
+std::size_t TabelaConexoes::Espalha(std::uint32_t hash, std::size_t mascara) {
+    return std::size_t((std::uint64_t(hash) * 0x9E3779B97F4A7C15ull) >> 32) & mascara;
 }
 
 // The record takes the slot of its number, or a free one.
 void TabelaConexoes::Indexa(std::uint32_t lugar) {
     const std::size_t mascara = indice_.size() - 1;
     const QString& numero = fios_[lugar].numero;
-    for (std::size_t slot = qHash(numero) & mascara;; slot = (slot + 1) & mascara) {
-        std::uint32_t& ocupante = indice_[slot];
-        if (ocupante == 0 || fios_[ocupante - 1].numero == numero) {
-            ocupante = lugar + 1;
+    const std::uint32_t hash = qHash(numero);
+    for (std::size_t slot = Espalha(hash, mascara);; slot = (slot + 1) & mascara) {
+        Vaga& vaga = indice_[slot];
+        if (vaga.lugar == 0 || (vaga.hash == hash && fios_[vaga.lugar - 1].numero == numero)) {
+            vaga = {hash, lugar + 1};
             return;
         }
     }
@@ -99,10 +106,12 @@ void TabelaConexoes::Indexa(std::uint32_t lugar) {
 const TabelaConexoes::Fio* TabelaConexoes::Procura(const QString& numero) const {
     if (indice_.empty()) return nullptr;
     const std::size_t mascara = indice_.size() - 1;
-    for (std::size_t slot = qHash(numero) & mascara;; slot = (slot + 1) & mascara) {
-        const std::uint32_t ocupante = indice_[slot];
-        if (ocupante == 0) return nullptr;
-        if (fios_[ocupante - 1].numero == numero) return &fios_[ocupante - 1];
+    const std::uint32_t hash = qHash(numero);
+    for (std::size_t slot = Espalha(hash, mascara);; slot = (slot + 1) & mascara) {
+        const Vaga& vaga = indice_[slot];
+        if (vaga.lugar == 0) return nullptr;
+        if (vaga.hash == hash && fios_[vaga.lugar - 1].numero == numero)
+            return &fios_[vaga.lugar - 1];
     }
 }
 
@@ -195,6 +204,7 @@ std::optional<TabelaConexoes::Entradas> TabelaConexoes::DoFio(const QString& fio
     const Fio* f = Procura(fio);
     if (!f) return std::nullopt;
     return Entradas{Textos(this, f->primeiro, int(f->total), f->inteiros),
+                    Textos(this, f->primeiraCompleta, int(f->completas), true),
                     {pontos_.data() + f->primeiro, f->total},
                     {handles_.data() + f->primeiro, f->total}};
 }

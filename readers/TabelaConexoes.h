@@ -55,10 +55,11 @@ public:
     std::optional<Textos> Elementos(const QString& fio) const;
     std::optional<Textos> Completas(const QString& fio) const;
     std::optional<std::span<const CEPonto>> Pontos(const QString& fio) const;
-    // A wire's entries in one look-up: elements, points, and the elements' handles as
+    // A wire's entries in one look-up: elements, whole texts, points, and the elements' handles as
     // numbers for comparing with entities.
     struct Entradas {
         Textos elementos;
+        Textos completas;
         std::span<const CEPonto> pontos;
         std::span<const std::uint64_t> handles;
     };
@@ -84,5 +85,11 @@ private:
     mutable std::vector<QString> elementos_;  // the elements cut from their texts so far
     std::vector<CEPonto> pontos_;
     std::vector<std::uint64_t> handles_;
-    std::vector<std::uint32_t> indice_;  // record place + 1; 0 a free slot; a power of two long
+    // The numbers' hashes keep most compares off the texts.
+    struct Vaga {
+        std::uint32_t hash = 0;
+        std::uint32_t lugar = 0;  // record place + 1; 0 a free slot
+    };
+    static std::size_t Espalha(std::uint32_t hash, std::size_t mascara);
+    std::vector<Vaga> indice_;  // a power of two long
 };
