@@ -187,7 +187,7 @@ int CCFioDataReader::PrimeiroLugar(const QString& numero, int indice) {
         if (n <= kEntradasSemIndice) {
             for (int i = 0; i < n; ++i) {
                 int j = 0;
-                while (completas->vista(j) != completas->vista(i))
+                while (!completas->MesmoTexto(j, i))
                     ++j;
                 primeiros[size_t(i)] = j;
             }
@@ -230,7 +230,8 @@ std::optional<QString> CCFioDataReader::LigacaoProxima(const QString& numero,
     const auto elementos = ListaConexoes(numero);
     const auto pontos = PontosConexao(numero);
     if (elementos && pontos && indice >= 0 && indice < elementos->size() &&
-        size_t(indice) < pontos->size() && elementos->vista(indice) == elemento &&
+        size_t(indice) < pontos->size() &&
+        TabelaConexoes::Iguais(elementos->vista(indice), elemento) &&
         MesmoPonto((*pontos)[size_t(indice)], ponto))
         return Ligacao(numero, indice);
     const std::unique_ptr<zv::CEAtributo> atributo =
@@ -314,11 +315,11 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
                 if (elemento.isNull()) break;
                 // A run of one equipment is one passage: the wire goes in and out of it.
                 const bool equipamento = EhEquipamento(elemento);
-                if (elementos.vista(i) != elementos.vista(i - 1) || !equipamento) {
+                if (!elementos.MesmoTexto(i, i - 1) || !equipamento) {
                     PreencheExtremidade(kFim, *atual, elementos, i, modelo);
                     trechos[atual].fim = i;
                 }
-                if (i != n - 1 && (elementos.vista(i) != elementos.vista(i + 1) || !equipamento)) {
+                if (i != n - 1 && (!elementos.MesmoTexto(i, i + 1) || !equipamento)) {
                     auto* novo = new CEItemLista(*padrao);
                     novo->campos.reservar(size_t(lugares));
                     PreencheExtremidade(kIni, *novo, elementos, i, modelo);

@@ -2,8 +2,6 @@
 
 #include "ZVString.h"
 
-#include <QHash>
-
 using zvsdk::ResultBuffer;
 
 namespace {
@@ -38,13 +36,6 @@ std::uint64_t Handle(QStringView texto) {
 
 // ---- Textos
 
-QStringView TabelaConexoes::Textos::vista(int i) const {
-    if (i < 0 || i >= total_) return {};
-    const std::size_t k = primeiro_ + std::size_t(i);
-    const QStringView texto(tabela_->textos_[k]);
-    return inteiros_ ? texto : texto.left(tabela_->cortes_[k]);
-}
-
 QString TabelaConexoes::Textos::value(int i) const {
     if (i < 0 || i >= total_) return {};
     const std::size_t k = primeiro_ + std::size_t(i);
@@ -59,7 +50,7 @@ QString TabelaConexoes::Textos::value(int i) const {
 
 int TabelaConexoes::Textos::indexOf(QStringView texto) const {
     for (int i = 0; i < total_; ++i)
-        if (vista(i) == texto) return i;
+        if (Iguais(vista(i), texto)) return i;
     return -1;
 }
 
@@ -83,6 +74,14 @@ void TabelaConexoes::Reserva(std::size_t fios) {
         Indexa(lugar);
 }
 
+// FNV-1a over the code units.
+std::uint32_t TabelaConexoes::HashDe(QStringView numero) {
+    std::uint32_t hash = 2166136261u;
+    for (const QChar c : numero)
+        hash = (hash ^ c.unicode()) * 16777619u;
+    return hash;
+}
+
 // Wire numbers are alike ("101", "102"...) and so are the low bits of their hashes: the slot
 // is taken from the high bits of a product.
 std::size_t TabelaConexoes::Espalha(std::uint32_t hash, std::size_t mascara) {
@@ -93,10 +92,11 @@ std::size_t TabelaConexoes::Espalha(std::uint32_t hash, std::size_t mascara) {
 void TabelaConexoes::Indexa(std::uint32_t lugar) {
     const std::size_t mascara = indice_.size() - 1;
     const QString& numero = fios_[lugar].numero;
-    const std::uint32_t hash = qHash(numero);
+    const std::uint32_t hash = HashDe(numero);
     for (std::size_t slot = Espalha(hash, mascara);; slot = (slot + 1) & mascara) {
         Vaga& vaga = indice_[slot];
-        if (vaga.lugar == 0 || (vaga.hash == hash && fios_[vaga.lugar - 1].numero == numero)) {
+        if (vaga.lugar == 0 ||
+            (vaga.hash == hash && Iguais(fios_[vaga.lugar - 1].numero, numero))) {
             vaga = {hash, lugar + 1};
             return;
         }
@@ -106,11 +106,11 @@ void TabelaConexoes::Indexa(std::uint32_t lugar) {
 const TabelaConexoes::Fio* TabelaConexoes::Procura(const QString& numero) const {
     if (indice_.empty()) return nullptr;
     const std::size_t mascara = indice_.size() - 1;
-    const std::uint32_t hash = qHash(numero);
+    const std::uint32_t hash = HashDe(numero);
     for (std::size_t slot = Espalha(hash, mascara);; slot = (slot + 1) & mascara) {
         const Vaga& vaga = indice_[slot];
         if (vaga.lugar == 0) return nullptr;
-        if (vaga.hash == hash && fios_[vaga.lugar - 1].numero == numero)
+        if (vaga.hash == hash && Iguais(fios_[vaga.lugar - 1].numero, numero))
             return &fios_[vaga.lugar - 1];
     }
 }

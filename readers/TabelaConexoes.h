@@ -12,6 +12,7 @@
 #include <QStringView>
 
 #include <cstdint>
+#include <cstring>
 #include <optional>
 #include <span>
 #include <vector>
@@ -25,6 +26,8 @@ public:
         int size() const { return total_; }
         bool isEmpty() const { return total_ == 0; }
         QStringView vista(int i) const;
+        // Whether the entries at i and j have the same text.
+        bool MesmoTexto(int i, int j) const { return Iguais(vista(i), vista(j)); }
         // Out of range: the empty text.
         QString value(int i) const;
         QString at(int i) const { return value(i); }
@@ -64,6 +67,11 @@ public:
         std::span<const std::uint64_t> handles;
     };
     std::optional<Entradas> DoFio(const QString& fio) const;
+    // Code unit by code unit, as QString compares, inline: most texts here are a few units.
+    static bool Iguais(QStringView a, QStringView b) {
+        return a.size() == b.size() &&
+               (a.empty() || std::memcmp(a.data(), b.data(), std::size_t(a.size()) * 2) == 0);
+    }
     int Fios() const { return int(fios_.size()); }
 
 private:
@@ -90,6 +98,14 @@ private:
         std::uint32_t hash = 0;
         std::uint32_t lugar = 0;  // record place + 1; 0 a free slot
     };
+    static std::uint32_t HashDe(QStringView numero);
     static std::size_t Espalha(std::uint32_t hash, std::size_t mascara);
     std::vector<Vaga> indice_;  // a power of two long
 };
+
+inline QStringView TabelaConexoes::Textos::vista(int i) const {
+    if (i < 0 || i >= total_) return {};
+    const std::size_t k = primeiro_ + std::size_t(i);
+    const QStringView texto(tabela_->textos_[k]);
+    return inteiros_ ? texto : texto.left(tabela_->cortes_[k]);
+}
