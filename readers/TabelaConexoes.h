@@ -3,8 +3,8 @@
 // record a wire, its entries side by side in arrays shared by all wires, and the wire
 // numbers in an open-addressed index of record places. The entries' texts are the answer's
 // own (shared, not copied) where the whole texts are kept; an element's text (the part before
-// the first "#") is cut from it only when someone asks for it as a QString. A few arrays are freed
-// at once, not a hash node, three lists and two vectors per wire.
+// the first "#") is cut from its whole text once, when first asked for as a QString. A few
+// arrays are freed at once, not a hash node, two lists and two vectors per wire.
 #include "cad/CICad.h"
 
 #include <QString>
