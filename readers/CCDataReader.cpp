@@ -127,95 +127,39 @@ void CCDataReader::CarregaConexoesCabos() {
     CarregaConexoes("getConexoesTodosCabos", false);
 }
 
-// The answer: a list with one element per wire: its number, then its entries, each a list
-// of a string (the element, with "#"-separated details) and up to three reals. Two list
-// ends in a row close a wire.
 void CCDataReader::CarregaConexoes(const QString& funcao, bool detalhes) {
     ResultBuffer* resposta = CICad::zvInvokeLista(funcao);
-    const ResultBuffer* no = resposta && resposta->restype != zvsdk::RTNIL ? resposta : nullptr;
-    // the wires (the lists one level down) counted first: the map grows once
-    int fios = 0, nivel = 0;
-    for (const ResultBuffer* p = no; p; p = p->rbnext) {
-        if (p->restype == zvsdk::RTLB && nivel++ == 1) ++fios;
-        if (p->restype == zvsdk::RTLE) --nivel;
-    }
-    conexoes_.reserve(conexoes_.size() + fios);
-    for (; no; no = no ? no->rbnext : nullptr) {
-        if (no->restype == zvsdk::RTLB || no->restype == zvsdk::RTLE) continue;
-        const QString fio = no->restype == zvsdk::RTSTR ? no->rstring : QString();
-        Conexoes conexoes;
-        if (!detalhes) {
-            // a wire of the same number keeps its whole texts; nothing else of it is copied
-            auto antes = conexoes_.constFind(fio);
-            if (antes != conexoes_.constEnd()) conexoes.completas = antes->completas;
-        }
-        if (no->rbnext && no->rbnext->restype == zvsdk::RTLE) {
-            conexoes_[fio] = std::move(conexoes);
-            no = no->rbnext;
-            continue;
-        }
-        // the wire's entries counted first: its lists are made at their size at once
-        int entradas = 0;
-        for (const ResultBuffer* adiante = no->rbnext; adiante; adiante = adiante->rbnext) {
-            if (adiante->restype == zvsdk::RTLE && adiante->rbnext &&
-                adiante->rbnext->restype == zvsdk::RTLE)
-                break;
-            entradas += adiante->restype == zvsdk::RTSTR;
-        }
-        conexoes.elementos.reserve(entradas);
-        conexoes.handles.reserve(static_cast<std::size_t>(entradas));
-        conexoes.pontos.reserve(static_cast<std::size_t>(entradas));
-        if (detalhes && GuardaCompletas) conexoes.completas.reserve(entradas);
-        int coordenada = 0;
-        for (no = no->rbnext; no; no = no->rbnext) {
-            if (no->restype == zvsdk::RTLE && no->rbnext && no->rbnext->restype == zvsdk::RTLE)
-                break;
-            if (no->restype == zvsdk::RTSTR) {
-                // the handle before the first "#", or the whole text
-                conexoes.elementos
-                    << (detalhes ? no->rstring.left(no->rstring.indexOf('#')) : no->rstring);
-                conexoes.handles.push_back(ZVString(conexoes.elementos.back()).ParaHandle());
-                if (detalhes && GuardaCompletas) conexoes.completas << no->rstring;
-                conexoes.pontos.push_back({});
-                coordenada = 0;
-            } else if (no->restype == zvsdk::RTREAL && !conexoes.pontos.empty() && coordenada < 3) {
-                CEPonto& p = conexoes.pontos.back();
-                (coordenada == 0 ? p.x : coordenada == 1 ? p.y : p.z) = no->rreal;
-                ++coordenada;
-            }
-        }
-        conexoes_[fio] = std::move(conexoes);
-    }
+    conexoes_.Carrega(resposta, detalhes, GuardaCompletas);
     CICad::LiberaLista(resposta);
 }
 
-const QStringList* CCDataReader::ListaConexoes(const QString& fio) const {
-    auto it = conexoes_.constFind(fio);
-    return it == conexoes_.constEnd() ? nullptr : &it->elementos;
+std::optional<TabelaConexoes::Textos> CCDataReader::ListaConexoes(const QString& fio) const {
+    return conexoes_.Elementos(fio);
 }
 
-const QStringList* CCDataReader::ListaConexoesCompletas(const QString& fio) const {
-    auto it = conexoes_.constFind(fio);
-    return it == conexoes_.constEnd() ? nullptr : &it->completas;
+std::optional<TabelaConexoes::Textos> CCDataReader::ListaConexoesCompletas(
+    const QString& fio) const {
+    return conexoes_.Completas(fio);
 }
 
-const std::vector<CEPonto>* CCDataReader::PontosConexao(const QString& fio) const {
-    auto it = conexoes_.constFind(fio);
-    return it == conexoes_.constEnd() ? nullptr : &it->pontos;
+std::optional<std::span<const CEPonto>> CCDataReader::PontosConexao(const QString& fio) const {
+    return conexoes_.Pontos(fio);
 }
 
 CEPonto CCDataReader::PontoDaConexao(const QString& fio, const QString& elemento) const {
-    auto it = conexoes_.constFind(fio);
-    if (it == conexoes_.constEnd()) return {};
-    const int i = it->elementos.indexOf(elemento);
-    return i >= 0 && size_t(i) < it->pontos.size() ? it->pontos[size_t(i)] : CEPonto{};
+    const auto c = conexoes_.DoFio(fio);
+    if (!c) return {};
+    const std::span<const CEPonto> pontos = c->pontos;
+    const int i = c->elementos.indexOf(elemento);
+    return i >= 0 && size_t(i) < pontos.size() ? pontos[size_t(i)] : CEPonto{};
 }
 
 CEPonto CCDataReader::PontoDaConexaoCompleta(const QString& fio, const QString& texto) const {
-    auto it = conexoes_.constFind(fio);
-    if (it == conexoes_.constEnd()) return {};
-    const int i = it->completas.indexOf(texto);
-    return i >= 0 && size_t(i) < it->pontos.size() ? it->pontos[size_t(i)] : CEPonto{};
+    const auto c = conexoes_.DoFio(fio);
+    if (!c) return {};
+    const std::span<const CEPonto> pontos = c->pontos;
+    const int i = c->completas.indexOf(texto);
+    return i >= 0 && size_t(i) < pontos.size() ? pontos[size_t(i)] : CEPonto{};
 }
 
 bool CCDataReader::FioSobPonto(std::span<const CEPonto> vertices, const CEPonto& ponto) const {
@@ -485,10 +429,10 @@ QString CCDataReader::VizinhoNaConexao(const OdDbObjectId& entidade, const CEPon
 QString CCDataReader::VizinhoNoFio(const OdDbObjectId& fio, const OdDbObjectId& entidade,
                                    const CEPonto& ponto, bool anterior) const {
     if (fio.isNull()) return {};
-    auto c = conexoes_.constFind(NumeroDoFio(fio));
-    if (c == conexoes_.constEnd()) return {};
-    const QStringList& elementos = c->elementos;
-    const std::vector<CEPonto>& pontos = c->pontos;
+    const auto c = conexoes_.DoFio(NumeroDoFio(fio));
+    if (!c) return {};
+    const TabelaConexoes::Textos& elementos = c->elementos;
+    const std::span<const CEPonto> pontos = c->pontos;
     if (elementos.size() < 2 || pontos.size() < 2) return {};
     auto ehEntidade = [&](int i) { return c->handles[size_t(i)] == entidade.handle(); };
     bool seguinte = false;

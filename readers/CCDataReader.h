@@ -3,6 +3,7 @@
 // it, kept in maps for one run, with point and neighbour queries on it; and the building of
 // items from drawing entities, their attributes, extended data and catalogue data.
 #include "CEAtributo.h"
+#include "TabelaConexoes.h"
 #include "TabelaIds.h"
 #include "VetorItens.h"
 #include "cad/CICad.h"
@@ -57,9 +58,10 @@ public:
     // ---- connections
     void CarregaConexoesFios();
     void CarregaConexoesCabos();
-    const QStringList* ListaConexoes(const QString& fio) const;
-    const QStringList* ListaConexoesCompletas(const QString& fio) const;
-    const std::vector<CEPonto>* PontosConexao(const QString& fio) const;
+    // Views into the loaded table: they hold until the reads are freed.
+    std::optional<TabelaConexoes::Textos> ListaConexoes(const QString& fio) const;
+    std::optional<TabelaConexoes::Textos> ListaConexoesCompletas(const QString& fio) const;
+    std::optional<std::span<const CEPonto>> PontosConexao(const QString& fio) const;
     CEPonto PontoDaConexao(const QString& fio, const QString& elemento) const;
     CEPonto PontoDaConexaoCompleta(const QString& fio, const QString& texto) const;
     // The wire of the layer under the point; null when there is none.
@@ -167,13 +169,6 @@ protected:
     double Tolerancia() const { return tolerancia_; }
 
 private:
-    struct Conexoes {
-        QStringList elementos;
-        QStringList completas;
-        std::vector<CEPonto> pontos;
-        // The elements' handles as numbers, for comparing with entities.
-        std::vector<std::uint64_t> handles;
-    };
     void CarregaConexoes(const QString& funcao, bool detalhes);
     bool FioSobPonto(std::span<const CEPonto> vertices, const CEPonto& ponto) const;
     // The wires of a layer with their vertices, read once, and a grid of their segments that
@@ -197,7 +192,7 @@ private:
     QHash<int, Circuito> circuitos_;
     // The circuit of a number as GetCircuitoLocal found it (`tem`); empty texts without one.
     const Circuito& CircuitoDe(bool tem, int numero);
-    QHash<QString, Conexoes> conexoes_;
+    TabelaConexoes conexoes_;
     QHash<QString, QStringList> fiosPorLayer_;
     std::unordered_map<QString, std::unique_ptr<FiosDoLayer>> indicesFios_;
     std::uint64_t versaoIndices_ = 0;  // the drawing's version the indexes were read at

@@ -277,7 +277,7 @@ void CCExportDataReader::AoLigarFim(CEItemLista& item, const OdDbObjectId& entid
 
 QString CCExportDataReader::VizinhoPorLigacao(const QString& fio, const QString& proprio,
                                               const QString& ligacao, bool anteriorPrimeiro) const {
-    const QStringList* completas = ListaConexoesCompletas(fio);
+    const auto completas = ListaConexoesCompletas(fio);
     if (!completas) return {};
     const auto handle = [&](qsizetype i) { return completas->at(i).section('#', 0, 0); };
     for (qsizetype i = 0; i < completas->size(); ++i) {
@@ -328,7 +328,7 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
         // The terminal is met where this wire touches it, which may be its cut point.
         const QString campo = CampoFio(item);
         fio = campo.isEmpty() ? QString() : item.valorCampo(campo);
-        const QStringList* elementos = ListaConexoes(fio);
+        const auto elementos = ListaConexoes(fio);
         const CEPonto p = CICad::GetPosicao(entidade);
         const CEPonto q = PontoDeCorte(entidade);
         ponto = elementos && elementos->contains(proprio) ? PontoDaConexao(fio, proprio) : p;

@@ -175,7 +175,7 @@ CCFioDataReader::FioAtual& CCFioDataReader::Fio(const QString& numero) {
 }
 
 int CCFioDataReader::PrimeiroLugar(const QString& numero, int indice) {
-    const QStringList* completas = ListaConexoesCompletas(numero);
+    const auto completas = ListaConexoesCompletas(numero);
     if (!completas) return -1;
     const int n = int(completas->size());
     // An entry past the list's end has the empty text.
@@ -187,7 +187,7 @@ int CCFioDataReader::PrimeiroLugar(const QString& numero, int indice) {
         if (n <= kEntradasSemIndice) {
             for (int i = 0; i < n; ++i) {
                 int j = 0;
-                while ((*completas)[j] != (*completas)[i])
+                while (!completas->MesmoTexto(j, i))
                     ++j;
                 primeiros[size_t(i)] = j;
             }
@@ -203,8 +203,8 @@ int CCFioDataReader::PrimeiroLugar(const QString& numero, int indice) {
 }
 
 std::optional<QString> CCFioDataReader::Ligacao(const QString& numero, int indice) {
-    const QStringList* elementos = ListaConexoes(numero);
-    const std::vector<CEPonto>* pontos = PontosConexao(numero);
+    const auto elementos = ListaConexoes(numero);
+    const auto pontos = PontosConexao(numero);
     if (!elementos || !pontos || indice < 0 || indice >= elementos->size() ||
         size_t(indice) >= pontos->size())
         return std::nullopt;
@@ -227,10 +227,11 @@ std::optional<QString> CCFioDataReader::Ligacao(const QString& numero, int indic
 std::optional<QString> CCFioDataReader::LigacaoProxima(const QString& numero,
                                                        const QString& elemento, int indice,
                                                        const CEPonto& ponto) {
-    const QStringList* elementos = ListaConexoes(numero);
-    const std::vector<CEPonto>* pontos = PontosConexao(numero);
+    const auto elementos = ListaConexoes(numero);
+    const auto pontos = PontosConexao(numero);
     if (elementos && pontos && indice >= 0 && indice < elementos->size() &&
-        size_t(indice) < pontos->size() && (*elementos)[indice] == elemento &&
+        size_t(indice) < pontos->size() &&
+        TabelaConexoes::Iguais(elementos->vista(indice), elemento) &&
         MesmoPonto((*pontos)[size_t(indice)], ponto))
         return Ligacao(numero, indice);
     const std::unique_ptr<zv::CEAtributo> atributo =
@@ -239,7 +240,7 @@ std::optional<QString> CCFioDataReader::LigacaoProxima(const QString& numero,
 }
 
 void CCFioDataReader::PreencheExtremidade(const QString& lado, CEItemLista& item,
-                                          const QStringList& elementos, int indice,
+                                          const TabelaConexoes::Textos& elementos, int indice,
                                           CETemplate* modelo) {
     static const QString kSufixoIni = QStringLiteral("_INI"), kSufixoFim = QStringLiteral("_FIM");
     const QString& sufixo = lado == kIni ? kSufixoIni : kSufixoFim;
@@ -295,8 +296,8 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
         item->definirCampo(kTipoLista, QStringLiteral("FIO"));
         numeros.insert(numero);
 
-        const QStringList* a = ListaConexoes(numero);
-        const QStringList elementos = a ? *a : QStringList();
+        const TabelaConexoes::Textos elementos =
+            ListaConexoes(numero).value_or(TabelaConexoes::Textos());
         Trechos trechos;
         if (!elementos.isEmpty()) {
             const int n = int(elementos.size());
@@ -314,11 +315,11 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
                 if (elemento.isNull()) break;
                 // A run of one equipment is one passage: the wire goes in and out of it.
                 const bool equipamento = EhEquipamento(elemento);
-                if (elementos[i] != elementos[i - 1] || !equipamento) {
+                if (!elementos.MesmoTexto(i, i - 1) || !equipamento) {
                     PreencheExtremidade(kFim, *atual, elementos, i, modelo);
                     trechos[atual].fim = i;
                 }
-                if (i != n - 1 && (elementos[i] != elementos[i + 1] || !equipamento)) {
+                if (i != n - 1 && (!elementos.MesmoTexto(i, i + 1) || !equipamento)) {
                     auto* novo = new CEItemLista(*padrao);
                     novo->campos.reservar(size_t(lugares));
                     PreencheExtremidade(kIni, *novo, elementos, i, modelo);
@@ -375,8 +376,8 @@ VetorItens* CCFioDataReader::LeAnilhas(const QHash<QString, QString>& opcoes, CE
         const size_t primeiro = itens->size();
         itens->push_back(item);
 
-        const QStringList* a = ListaConexoes(numero);
-        const QStringList elementos = a ? *a : QStringList();
+        const TabelaConexoes::Textos elementos =
+            ListaConexoes(numero).value_or(TabelaConexoes::Textos());
         const int n = int(elementos.size());
         // A ferrule on each conductor end: a stretch between every two elements.
         CEItemLista* atual = item;
@@ -421,9 +422,9 @@ void CCFioDataReader::LeSegmento(const QString& lado, CEItemLista& item, const Q
     const QString campo = CampoFio(item);
     if (campo.isEmpty()) return;
     const QString numero = item.valorCampo(campo);
-    const QStringList* completas = ListaConexoesCompletas(numero);
+    const auto completas = ListaConexoesCompletas(numero);
     const int lugar = completas ? int(completas->indexOf(completo)) : -1;
-    const std::vector<CEPonto>* pontos = PontosConexao(numero);
+    const auto pontos = PontosConexao(numero);
     const CEPonto ponto = pontos && lugar >= 0 && size_t(lugar) < pontos->size()
                               ? (*pontos)[size_t(lugar)]
                               : CEPonto{};
@@ -439,7 +440,7 @@ void CCFioDataReader::LeSegmentoNoIndice(const QString& lado, CEItemLista& item,
                          kSegIni = QStringLiteral("_SEGINI"), kSegFim = QStringLiteral("_SEGFIM");
     const bool ini = lado == kIni;
     const int lugar = PrimeiroLugar(numero, indice);
-    const std::vector<CEPonto>* pontos = PontosConexao(numero);
+    const auto pontos = PontosConexao(numero);
     const CEPonto ponto = pontos && lugar >= 0 && size_t(lugar) < pontos->size()
                               ? (*pontos)[size_t(lugar)]
                               : CEPonto{};

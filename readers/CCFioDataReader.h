@@ -66,7 +66,9 @@ public:
     // stretch is measured between the elements it joins: those `trechos` gives, else the
     // k-th and the next of the list for the k-th stretch; an open stretch to the element
     // after its start.
-    void CalculaComprimentos(CEItemLista* primeiro, const QStringList& elementos,
+    // `elementos`: a QStringList or the loaded table's TabelaConexoes::Textos.
+    template <class Lista>
+    void CalculaComprimentos(CEItemLista* primeiro, const Lista& elementos,
                              const Trechos* trechos = nullptr);
     // CAMINHOFIO and PATHWIRE of each item from the routes read for its wire.
     void AplicaCaminhos(VetorItens& itens);
@@ -81,8 +83,9 @@ private:
     // The answer of getListaFios for the layers, as object ids.
     std::vector<OdDbObjectId> ListaFios(const QStringList& layers);
     // One end of a stretch from the element at `indice` of the wire's lists.
-    void PreencheExtremidade(const QString& lado, CEItemLista& item, const QStringList& elementos,
-                             int indice, CETemplate* modelo);
+    void PreencheExtremidade(const QString& lado, CEItemLista& item,
+                             const TabelaConexoes::Textos& elementos, int indice,
+                             CETemplate* modelo);
     void CarregaTransicoes();
     // What ComporRelacaoFio does, given the connection's value (empty without one).
     void ComporRelacao(const QString& sufixo, CEItemLista& item, CETemplate* modelo,

@@ -227,7 +227,8 @@ QString CCFioDataReader::ComprimentoFio(const QString& chave, const CEPonto& ini
     return texto;
 }
 
-void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const QStringList& elementos,
+template <class Lista>
+void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const Lista& elementos,
                                           const Trechos* trechos) {
     if (!primeiro || elementos.isEmpty()) return;
     // The chain up to its first repeat. Most wires have a few stretches: those are looked
@@ -246,7 +247,7 @@ void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const QStringLi
     const QString campo = CampoFio(*primeiro);
     if (campo.isEmpty()) return;
     const QString chave = primeiro->valorCampo(campo);
-    const std::vector<CEPonto>* pontos = PontosConexao(chave);
+    const auto pontos = PontosConexao(chave);
     auto pontoDe = [pontos](int i) {
         return pontos && size_t(i) < pontos->size() ? (*pontos)[size_t(i)] : CEPonto{};
     };
@@ -285,6 +286,11 @@ void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const QStringLi
         item.definirCampo(kComprimento, comprimento);
     }
 }
+
+template void CCFioDataReader::CalculaComprimentos(CEItemLista*, const QStringList&,
+                                                   const Trechos*);
+template void CCFioDataReader::CalculaComprimentos(CEItemLista*, const TabelaConexoes::Textos&,
+                                                   const Trechos*);
 
 void CCFioDataReader::AplicaCaminhos(VetorItens& itens) {
     for (CEItemLista* item : itens) {

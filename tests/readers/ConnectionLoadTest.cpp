@@ -18,9 +18,10 @@ TEST_F(ConnectionLoadTest, EntriesGiveTheirHandleTheirWholeTextAndTheirPoint) {
     leitor.CarregaConexoesFios();
     leitor.CarregaConexoesCabos();
     ASSERT_TRUE(leitor.ListaConexoes("7"));
-    EXPECT_EQ(*leitor.ListaConexoes("7"), QStringList({"1A", "2B", ""}));
-    EXPECT_EQ(*leitor.ListaConexoesCompletas("7"), QStringList({"1A#13#NA-1", "2B", "#X#Y"}));
-    const std::vector<CEPonto>& pontos = *leitor.PontosConexao("7");
+    EXPECT_EQ(leitor.ListaConexoes("7")->ParaLista(), QStringList({"1A", "2B", ""}));
+    EXPECT_EQ(leitor.ListaConexoesCompletas("7")->ParaLista(),
+              QStringList({"1A#13#NA-1", "2B", "#X#Y"}));
+    const std::span<const CEPonto> pontos = *leitor.PontosConexao("7");
     ASSERT_EQ(pontos.size(), 3u);
     EXPECT_EQ(pontos[1].y, 5.0);
     EXPECT_EQ(pontos[1].z, 0.0);  // two reals: z stays 0
@@ -28,7 +29,7 @@ TEST_F(ConnectionLoadTest, EntriesGiveTheirHandleTheirWholeTextAndTheirPoint) {
     ASSERT_TRUE(leitor.ListaConexoes("8"));
     EXPECT_TRUE(leitor.ListaConexoes("8")->isEmpty());
     // a cable's entries go whole into the handle list
-    EXPECT_EQ(*leitor.ListaConexoes("W1"), QStringList({"3C#K"}));
+    EXPECT_EQ(leitor.ListaConexoes("W1")->ParaLista(), QStringList({"3C#K"}));
     EXPECT_EQ(leitor.PontoDaConexao("W1", "3C#K").x, 1.0);
 }
 
@@ -39,14 +40,14 @@ TEST_F(ConnectionLoadTest, TheTerminalReaderKeepsHandlesAndPointsButNotTheWholeT
     CCBorneDataReader bornes;
     bornes.CarregaConexoesFios();
     ASSERT_TRUE(bornes.ListaConexoes("7"));
-    EXPECT_EQ(*bornes.ListaConexoes("7"), QStringList({"1A", "2B"}));
+    EXPECT_EQ(bornes.ListaConexoes("7")->ParaLista(), QStringList({"1A", "2B"}));
     EXPECT_EQ(bornes.PontoDaConexao("7", "2B").y, 5.0);
     ASSERT_TRUE(bornes.ListaConexoesCompletas("7"));
     EXPECT_TRUE(bornes.ListaConexoesCompletas("7")->isEmpty());
     // any other reader keeps them
     LeitorBase base;
     base.CarregaConexoesFios();
-    EXPECT_EQ(*base.ListaConexoesCompletas("7"), QStringList({"1A#13#NA-1", "2B#4#X"}));
+    EXPECT_EQ(base.ListaConexoesCompletas("7")->ParaLista(), QStringList({"1A#13#NA-1", "2B#4#X"}));
 }
 
 TEST_F(ConnectionLoadTest, ACableOfAWiresNumberTakesItsEntriesButKeepsTheWiresWholeTexts) {
@@ -55,9 +56,99 @@ TEST_F(ConnectionLoadTest, ACableOfAWiresNumberTakesItsEntriesButKeepsTheWiresWh
     LeitorBase leitor;
     leitor.CarregaConexoesFios();
     leitor.CarregaConexoesCabos();
-    EXPECT_EQ(*leitor.ListaConexoes("7"), QStringList({"3C"}));
-    EXPECT_EQ(*leitor.ListaConexoesCompletas("7"), QStringList({"1A#13#NA-1"}));
+    EXPECT_EQ(leitor.ListaConexoes("7")->ParaLista(), QStringList({"3C"}));
+    EXPECT_EQ(leitor.ListaConexoesCompletas("7")->ParaLista(), QStringList({"1A#13#NA-1"}));
     EXPECT_EQ(leitor.PontoDaConexao("7", "3C").z, 6.0);
+}
+
+TEST_F(ConnectionLoadTest, AWireWithoutEntriesBeforeAnotherTakesNoneOfItsEntries) {
+    CICad::AvaliaLisp(
+        "(defun getConexoesTodosFios () '((\"8\") (\"9\" (\"1A#2#B\" 1.0 2.0 3.0)) (\"10\")))");
+    LeitorBase leitor;
+    leitor.CarregaConexoesFios();
+    ASSERT_TRUE(leitor.ListaConexoes("8"));
+    EXPECT_TRUE(leitor.ListaConexoes("8")->isEmpty());
+    EXPECT_TRUE(leitor.PontosConexao("8")->empty());
+    EXPECT_EQ(leitor.ListaConexoes("9")->ParaLista(), QStringList({"1A"}));
+    EXPECT_EQ(leitor.PontosConexao("9")->size(), 1u);
+    EXPECT_TRUE(leitor.ListaConexoes("10")->isEmpty());
+    EXPECT_FALSE(leitor.ListaConexoes("11"));
+}
+
+TEST_F(ConnectionLoadTest, ANumberGivenAgainTakesThePlaceOfTheOneBefore) {
+    CICad::AvaliaLisp(
+        "(defun getConexoesTodosFios () '((\"7\" (\"1A#1#X\" 1.0 0.0 0.0)) (\"7\" (\"2B#2#Y\" "
+        "2.0 0.0 0.0) (\"3C#3#Z\" 3.0 0.0 0.0))))");
+    CICad::AvaliaLisp(
+        "(defun getConexoesTodosCabos () '((\"7\" (\"4D\" 4.0 0.0 0.0)) (\"7\" (\"5E\" 5.0 "
+        "0.0 0.0))))");
+    LeitorBase leitor;
+    leitor.CarregaConexoesFios();
+    EXPECT_EQ(leitor.ListaConexoes("7")->ParaLista(), QStringList({"2B", "3C"}));
+    EXPECT_EQ(leitor.PontoDaConexaoCompleta("7", "3C#3#Z").x, 3.0);
+    EXPECT_EQ(leitor.PontoDaConexao("7", "1A").x, 0.0);  // the first one's entries are gone
+    // each cable of the number keeps the whole texts of the one before: the wire's
+    leitor.CarregaConexoesCabos();
+    EXPECT_EQ(leitor.ListaConexoes("7")->ParaLista(), QStringList({"5E"}));
+    EXPECT_EQ(leitor.ListaConexoesCompletas("7")->ParaLista(), QStringList({"2B#2#Y", "3C#3#Z"}));
+    // a whole text's place gives the point of the entry at that place
+    EXPECT_EQ(leitor.PontoDaConexaoCompleta("7", "2B#2#Y").x, 5.0);
+    EXPECT_EQ(leitor.PontoDaConexaoCompleta("7", "3C#3#Z").x, 0.0);
+}
+
+// Numbers of many wires, then of cables: each finds its own entries however the wires
+// before it filled the index.
+TEST_F(ConnectionLoadTest, EveryNumberOfALargeAnswerFindsItsOwnEntries) {
+    constexpr int kFios = 300, kCabos = 500;
+    QString fios = "(defun getConexoesTodosFios () '(",
+            cabos = "(defun getConexoesTodosCabos () '(";
+    for (int i = 0; i < kFios; ++i)
+        fios += QString("(\"%1\" (\"%2#C#B\" %1.0 1.0 0.0) (\"%3\" %1.0 2.0 0.0))")
+                    .arg(i)
+                    .arg(i + 16, 0, 16)
+                    .arg(i + 17, 0, 16);
+    for (int i = 0; i < kCabos; ++i)
+        cabos += QString("(\"W%1\" (\"%2\" %1.0 3.0 0.0))").arg(i).arg(i + 4096, 0, 16);
+    CICad::AvaliaLisp(fios + "))");
+    CICad::AvaliaLisp(cabos + "))");
+    LeitorBase leitor;
+    leitor.CarregaConexoesFios();
+    // an element asked for before the cables come is the same after
+    EXPECT_EQ(leitor.ListaConexoes("5")->value(0), "15");
+    leitor.CarregaConexoesCabos();
+    for (int i = 0; i < kFios; ++i) {
+        const QString numero = QString::number(i);
+        const auto elementos = leitor.ListaConexoes(numero);
+        ASSERT_TRUE(elementos) << i;
+        EXPECT_EQ(elementos->ParaLista(),
+                  QStringList({QString::number(i + 16, 16), QString::number(i + 17, 16)}))
+            << i;
+        EXPECT_EQ(leitor.PontoDaConexao(numero, QString::number(i + 17, 16)).y, 2.0) << i;
+        EXPECT_EQ(leitor.PontosConexao(numero)->front().x, double(i)) << i;
+    }
+    for (int i = 0; i < kCabos; ++i) {
+        const auto elementos = leitor.ListaConexoes(QString("W%1").arg(i));
+        ASSERT_TRUE(elementos) << i;
+        EXPECT_EQ(elementos->value(0), QString::number(i + 4096, 16)) << i;
+        EXPECT_EQ(elementos->value(1), QString()) << i;  // past the end: empty
+    }
+    EXPECT_FALSE(leitor.ListaConexoes(QString::number(kFios)));
+}
+
+TEST_F(ConnectionLoadTest, FreedReadsForgetTheWiresAndALaterLoadFindsThemAgain) {
+    CICad::AvaliaLisp("(defun getConexoesTodosFios () '((\"7\" (\"1A#13#NA-1\" 1.0 2.0 3.0))))");
+    LeitorBase leitor;
+    leitor.CarregaConexoesFios();
+    const auto antes = leitor.ListaConexoesCompletas("7");
+    ASSERT_TRUE(antes);
+    // the answer's chain is gone: the texts the table holds are still whole
+    EXPECT_EQ(antes->value(0), "1A#13#NA-1");
+    leitor.LiberaLeituras();
+    EXPECT_FALSE(leitor.ListaConexoes("7"));
+    EXPECT_FALSE(leitor.PontosConexao("7"));
+    EXPECT_EQ(leitor.PontoDaConexao("7", "1A").x, 0.0);
+    leitor.CarregaConexoesFios();
+    EXPECT_EQ(leitor.PontoDaConexao("7", "1A").z, 3.0);
 }
 
 }  // namespace

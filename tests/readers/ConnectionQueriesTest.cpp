@@ -302,10 +302,10 @@ protected:
 };
 
 TEST_F(NeighbourTest, TheWireHoldsItsElementsInOrderWithTheirPoints) {
-    const QStringList* elementos = r->ListaConexoes("104");
+    const auto elementos = r->ListaConexoes("104");
     ASSERT_TRUE(elementos);
-    EXPECT_EQ(*elementos, QStringList({handle(c), handle(w), handle(w), handle(d)}));
-    const std::vector<CEPonto>* pontos = r->PontosConexao("104");
+    EXPECT_EQ(elementos->ParaLista(), QStringList({handle(c), handle(w), handle(w), handle(d)}));
+    const auto pontos = r->PontosConexao("104");
     ASSERT_TRUE(pontos);
     ASSERT_EQ(pontos->size(), 4u);
     EXPECT_DOUBLE_EQ((*pontos)[2].y, 140.0);

@@ -200,7 +200,7 @@ TEST_F(WireReaderTest, AReaderThatGaveBackItsReadsReadsTheSameAgain) {
     itens_.destruirItens();
     // Connections, entities read and indexes go; the next walk loads them again.
     leitor.LiberaLeituras();
-    EXPECT_EQ(leitor.ListaConexoes("12"), nullptr);
+    EXPECT_FALSE(leitor.ListaConexoes("12"));
     le(leitor);
     QStringList depois;
     for (const CEItemLista* item : itens_)

@@ -1,0 +1,210 @@
+#include "TabelaConexoes.h"
+
+#include "ZVString.h"
+
+using zvsdk::ResultBuffer;
+
+namespace {
+
+bool EhFimDeFio(const ResultBuffer* no) {
+    return no->restype == zvsdk::RTLE && no->rbnext && no->rbnext->restype == zvsdk::RTLE;
+}
+
+// ZVString::ParaHandle of the text, without a copy when it is plain hexadecimal digits.
+std::uint64_t Handle(QStringView texto) {
+    if (texto.size() > 0 && texto.size() <= 15) {
+        std::uint64_t valor = 0;
+        bool digitos = true;
+        for (const QChar c : texto) {
+            const char16_t u = c.unicode();
+            const int digito = u >= '0' && u <= '9'   ? u - '0'
+                               : u >= 'A' && u <= 'F' ? u - 'A' + 10
+                               : u >= 'a' && u <= 'f' ? u - 'a' + 10
+                                                      : -1;
+            if (digito < 0) {
+                digitos = false;
+                break;
+            }
+            valor = valor << 4 | std::uint64_t(digito);
+        }
+        if (digitos) return valor;
+    }
+    return ZVString(texto.toString()).ParaHandle();
+}
+
+}  // namespace
+
+// ---- Textos
+
+QString TabelaConexoes::Textos::value(int i) const {
+    if (i < 0 || i >= total_) return {};
+    const std::size_t k = primeiro_ + std::size_t(i);
+    const QString& texto = tabela_->textos_[k];
+    if (inteiros_ || tabela_->cortes_[k] == texto.size()) return texto;
+    // a part is made once, when first asked for
+    std::vector<QString>& feitos = tabela_->elementos_;
+    if (feitos.size() < tabela_->textos_.size()) feitos.resize(tabela_->textos_.size());
+    if (feitos[k].isNull()) feitos[k] = texto.left(tabela_->cortes_[k]);
+    return feitos[k];
+}
+
+int TabelaConexoes::Textos::indexOf(QStringView texto) const {
+    for (int i = 0; i < total_; ++i)
+        if (Iguais(vista(i), texto)) return i;
+    return -1;
+}
+
+QStringList TabelaConexoes::Textos::ParaLista() const {
+    QStringList lista;
+    lista.reserve(total_);
+    for (int i = 0; i < total_; ++i)
+        lista << value(i);
+    return lista;
+}
+
+// ---- the table
+
+void TabelaConexoes::Reserva(std::size_t fios) {
+    std::size_t tamanho = 16;
+    while (tamanho < fios * 2)
+        tamanho *= 2;
+    if (tamanho <= indice_.size()) return;
+    indice_.assign(tamanho, Vaga{});
+    for (std::uint32_t lugar = 0; lugar < fios_.size(); ++lugar)
+        Indexa(lugar);
+}
+
+// FNV-1a over the code units.
+std::uint32_t TabelaConexoes::HashDe(QStringView numero) {
+    std::uint32_t hash = 2166136261u;
+    for (const QChar c : numero)
+        hash = (hash ^ c.unicode()) * 16777619u;
+    return hash;
+}
+
+// Wire numbers are alike ("101", "102"...) and so are the low bits of their hashes: the slot
+// is taken from the high bits of a product.
+std::size_t TabelaConexoes::Espalha(std::uint32_t hash, std::size_t mascara) {
+    return std::size_t((std::uint64_t(hash) * 0x9E3779B97F4A7C15ull) >> 32) & mascara;
+}
+
+// The record takes the slot of its number, or a free one.
+void TabelaConexoes::Indexa(std::uint32_t lugar) {
+    const std::size_t mascara = indice_.size() - 1;
+    const QString& numero = fios_[lugar].numero;
+    const std::uint32_t hash = HashDe(numero);
+    for (std::size_t slot = Espalha(hash, mascara);; slot = (slot + 1) & mascara) {
+        Vaga& vaga = indice_[slot];
+        if (vaga.lugar == 0 ||
+            (vaga.hash == hash && Iguais(fios_[vaga.lugar - 1].numero, numero))) {
+            vaga = {hash, lugar + 1};
+            return;
+        }
+    }
+}
+
+const TabelaConexoes::Fio* TabelaConexoes::Procura(const QString& numero) const {
+    if (indice_.empty()) return nullptr;
+    const std::size_t mascara = indice_.size() - 1;
+    const std::uint32_t hash = HashDe(numero);
+    for (std::size_t slot = Espalha(hash, mascara);; slot = (slot + 1) & mascara) {
+        const Vaga& vaga = indice_[slot];
+        if (vaga.lugar == 0) return nullptr;
+        if (vaga.hash == hash && Iguais(fios_[vaga.lugar - 1].numero, numero))
+            return &fios_[vaga.lugar - 1];
+    }
+}
+
+void TabelaConexoes::Carrega(const ResultBuffer* resposta, bool detalhes, bool completas) {
+    const ResultBuffer* no = resposta && resposta->restype != zvsdk::RTNIL ? resposta : nullptr;
+    // the wires (the lists one level down) and the texts counted first: each array grows once
+    std::size_t fios = 0, entradas = 0;
+    int nivel = 0;
+    for (const ResultBuffer* p = no; p; p = p->rbnext) {
+        if (p->restype == zvsdk::RTLB && nivel++ == 1) ++fios;
+        if (p->restype == zvsdk::RTLE) --nivel;
+        entradas += p->restype == zvsdk::RTSTR;
+    }
+    fios_.reserve(fios_.size() + fios);
+    Reserva(fios_.size() + fios);
+    textos_.reserve(textos_.size() + entradas);
+    cortes_.reserve(cortes_.size() + entradas);
+    pontos_.reserve(pontos_.size() + entradas);
+    handles_.reserve(handles_.size() + entradas);
+    for (; no; no = no ? no->rbnext : nullptr) {
+        if (no->restype == zvsdk::RTLB || no->restype == zvsdk::RTLE) continue;
+        Fio fio;
+        if (no->restype == zvsdk::RTSTR) fio.numero = no->rstring;
+        fio.primeiro = std::uint32_t(textos_.size());
+        fio.inteiros = !detalhes;
+        if (!detalhes) {
+            // a wire of the same number keeps its whole texts; nothing else of it is kept
+            if (const Fio* antes = Procura(fio.numero)) {
+                fio.primeiraCompleta = antes->primeiraCompleta;
+                fio.completas = antes->completas;
+            }
+        }
+        // a number closed at once: a wire without entries
+        if (no->rbnext && no->rbnext->restype == zvsdk::RTLE) {
+            fios_.push_back(std::move(fio));
+            Indexa(std::uint32_t(fios_.size() - 1));
+            no = no->rbnext;
+            continue;
+        }
+        int coordenada = 0;
+        for (no = no->rbnext; no && !EhFimDeFio(no); no = no->rbnext) {
+            if (no->restype == zvsdk::RTSTR) {
+                const QString& texto = no->rstring;
+                const int corte = detalhes ? texto.indexOf(QLatin1Char('#')) : -1;
+                // Without the whole texts only the element is kept: the answer's longer
+                // texts go with it.
+                const bool soElemento = detalhes && !completas && corte >= 0;
+                textos_.push_back(soElemento ? texto.left(corte) : texto);
+                cortes_.push_back(corte < 0 || soElemento ? int(textos_.back().size()) : corte);
+                const QStringView elemento = QStringView(texto).left(cortes_.back());
+                handles_.push_back(Handle(elemento));
+                pontos_.push_back({});
+                coordenada = 0;
+            } else if (no->restype == zvsdk::RTREAL && textos_.size() > fio.primeiro &&
+                       coordenada < 3) {
+                CEPonto& p = pontos_.back();
+                (coordenada == 0 ? p.x : coordenada == 1 ? p.y : p.z) = no->rreal;
+                ++coordenada;
+            }
+        }
+        fio.total = std::uint32_t(textos_.size()) - fio.primeiro;
+        if (detalhes && completas) {
+            fio.primeiraCompleta = fio.primeiro;
+            fio.completas = fio.total;
+        }
+        fios_.push_back(std::move(fio));
+        Indexa(std::uint32_t(fios_.size() - 1));
+    }
+}
+
+std::optional<TabelaConexoes::Textos> TabelaConexoes::Elementos(const QString& fio) const {
+    const Fio* f = Procura(fio);
+    if (!f) return std::nullopt;
+    return Textos(this, f->primeiro, int(f->total), f->inteiros);
+}
+
+std::optional<TabelaConexoes::Textos> TabelaConexoes::Completas(const QString& fio) const {
+    const Fio* f = Procura(fio);
+    if (!f) return std::nullopt;
+    return Textos(this, f->primeiraCompleta, int(f->completas), true);
+}
+
+std::optional<std::span<const CEPonto>> TabelaConexoes::Pontos(const QString& fio) const {
+    const Fio* f = Procura(fio);
+    if (!f) return std::nullopt;
+    return std::span<const CEPonto>(pontos_.data() + f->primeiro, f->total);
+}
+
+std::optional<TabelaConexoes::Entradas> TabelaConexoes::DoFio(const QString& fio) const {
+    const Fio* f = Procura(fio);
+    if (!f) return std::nullopt;
+    return Entradas{Textos(this, f->primeiro, int(f->total), f->inteiros),
+                    Textos(this, f->primeiraCompleta, int(f->completas), true),
+                    {pontos_.data() + f->primeiro, f->total},
+                    {handles_.data() + f->primeiro, f->total}};
+}

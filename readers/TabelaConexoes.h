@@ -1,0 +1,111 @@
+#pragma once
+// The wires' (and cables') connections as the LISP answers give them, in flat arrays: one
+// record a wire, its entries side by side in arrays shared by all wires, and the wire
+// numbers in an open-addressed index of record places. The entries' texts are the answer's
+// own (shared, not copied) where the whole texts are kept; an element's text (the part before
+// the first "#") is cut from its whole text once, when first asked for as a QString. A few
+// arrays are freed at once, not a hash node, two lists and two vectors per wire.
+#include "cad/CICad.h"
+
+#include <QString>
+#include <QStringList>
+#include <QStringView>
+
+#include <cstdint>
+#include <cstring>
+#include <optional>
+#include <span>
+#include <vector>
+
+class TabelaConexoes {
+public:
+    // The texts of one wire's entries: their element part, or the whole texts.
+    class Textos {
+    public:
+        Textos() = default;
+        int size() const { return total_; }
+        bool isEmpty() const { return total_ == 0; }
+        QStringView vista(int i) const;
+        // Whether the entries at i and j have the same text.
+        bool MesmoTexto(int i, int j) const { return Iguais(vista(i), vista(j)); }
+        // Out of range: the empty text.
+        QString value(int i) const;
+        QString at(int i) const { return value(i); }
+        QString operator[](int i) const { return value(i); }
+        int indexOf(QStringView texto) const;
+        bool contains(QStringView texto) const { return indexOf(texto) >= 0; }
+        QStringList ParaLista() const;
+
+    private:
+        friend class TabelaConexoes;
+        Textos(const TabelaConexoes* tabela, std::uint32_t primeiro, int total, bool inteiros)
+            : tabela_(tabela), primeiro_(primeiro), total_(total), inteiros_(inteiros) {}
+        const TabelaConexoes* tabela_ = nullptr;
+        std::uint32_t primeiro_ = 0;
+        int total_ = 0;
+        bool inteiros_ = false;
+    };
+
+    // Adds the wires of an answer: a list with one element per wire, its number then its
+    // entries, each a list of a text and up to three reals; two list ends in a row close a
+    // wire. With `detalhes` an entry's element is its text before the first "#" and, when
+    // `completas`, its whole text is kept too; without, the element is the whole text and a
+    // wire of a number already there keeps that one's whole texts. A number given again
+    // takes the place of the one before.
+    void Carrega(const zvsdk::ResultBuffer* resposta, bool detalhes, bool completas);
+
+    // Null when the wire is not there.
+    std::optional<Textos> Elementos(const QString& fio) const;
+    std::optional<Textos> Completas(const QString& fio) const;
+    std::optional<std::span<const CEPonto>> Pontos(const QString& fio) const;
+    // A wire's entries in one look-up: elements, whole texts, points, and the elements' handles as
+    // numbers for comparing with entities.
+    struct Entradas {
+        Textos elementos;
+        Textos completas;
+        std::span<const CEPonto> pontos;
+        std::span<const std::uint64_t> handles;
+    };
+    std::optional<Entradas> DoFio(const QString& fio) const;
+    // Code unit by code unit, as QString compares, inline: most texts here are a few units.
+    static bool Iguais(QStringView a, QStringView b) {
+        return a.size() == b.size() &&
+               (a.empty() || std::memcmp(a.data(), b.data(), std::size_t(a.size()) * 2) == 0);
+    }
+    int Fios() const { return int(fios_.size()); }
+
+private:
+    struct Fio {
+        QString numero;
+        std::uint32_t primeiro = 0;  // its entries
+        std::uint32_t total = 0;
+        std::uint32_t primeiraCompleta = 0;  // its whole texts (another wire's: see Carrega)
+        std::uint32_t completas = 0;
+        bool inteiros = false;  // the element is the whole text
+    };
+    const Fio* Procura(const QString& numero) const;
+    void Indexa(std::uint32_t lugar);
+    void Reserva(std::size_t fios);
+
+    std::vector<Fio> fios_;
+    std::vector<QString> textos_;
+    std::vector<std::int32_t> cortes_;        // an element's length in its text
+    mutable std::vector<QString> elementos_;  // the elements cut from their texts so far
+    std::vector<CEPonto> pontos_;
+    std::vector<std::uint64_t> handles_;
+    // The numbers' hashes keep most compares off the texts.
+    struct Vaga {
+        std::uint32_t hash = 0;
+        std::uint32_t lugar = 0;  // record place + 1; 0 a free slot
+    };
+    static std::uint32_t HashDe(QStringView numero);
+    static std::size_t Espalha(std::uint32_t hash, std::size_t mascara);
+    std::vector<Vaga> indice_;  // a power of two long
+};
+
+inline QStringView TabelaConexoes::Textos::vista(int i) const {
+    if (i < 0 || i >= total_) return {};
+    const std::size_t k = primeiro_ + std::size_t(i);
+    const QStringView texto(tabela_->textos_[k]);
+    return inteiros_ ? texto : texto.left(tabela_->cortes_[k]);
+}
