@@ -35,7 +35,8 @@ void HostDocument::showExtents() {
     if (!db) return;
     // Only the layer states are taken now: a run that zooms at its end and is never looked
     // at does not index the drawing for it.
-    extentsOf_ = zvplot::PageIndex::hiddenLayers(*db);
+    extentsOf_.reset();
+    extentsOf_ = hiddenLayers_.now(*db);
     db->beforeShapeChange([this] { settleView(true); });
 }
 

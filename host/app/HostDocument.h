@@ -1,5 +1,6 @@
 #pragma once
 // One open drawing of the host: its commands, command line, LISP environment and database.
+#include "plot/HiddenLayers.h"
 #include "sdk/Document.h"
 
 #include <QHash>
@@ -97,7 +98,8 @@ private:
     View view_;
     // The layers hidden when extents were asked for and not yet measured (upper-case names):
     // nothing is measured until the view is read or a shape is about to change.
-    std::optional<std::unordered_set<std::string>> extentsOf_;
+    std::shared_ptr<const zvplot::HiddenLayers::Names> extentsOf_;
+    zvplot::HiddenLayers hiddenLayers_;
     std::unique_ptr<zvplot::PageIndex> plotIndex_;
     std::unique_ptr<zvdb::UndoJournal> undo_;
 };

@@ -108,14 +108,6 @@ std::vector<std::string> PageIndex::showingLayers() const {
     return layers;
 }
 
-std::unordered_set<std::string> PageIndex::hiddenLayers(const zvdb::Database& database) {
-    std::unordered_set<std::string> hidden;
-    for (const zvdb::LayerRecord* record : database.layers())
-        if (record->isFrozen() || record->isOff())
-            hidden.insert(zvdb::TagValues::upperName(record->name()));
-    return hidden;
-}
-
 std::vector<std::string> PageIndex::layersExcept(
     const std::unordered_set<std::string>& hidden) const {
     std::vector<const std::string*> names;

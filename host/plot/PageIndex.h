@@ -39,9 +39,6 @@ public:
     zvdb::BoundingBox boundsOf(const std::vector<std::string>& layers) const;
     // The names of the layers that hold entities and are neither frozen nor off.
     std::vector<std::string> showingLayers() const;
-    // The upper-case names of the drawing's layers that are frozen or off: what showed at a
-    // moment, kept without indexing the drawing.
-    static std::unordered_set<std::string> hiddenLayers(const zvdb::Database& database);
     // The names of the layers that hold entities, but for those whose upper-case names are
     // in `hidden`, in the order showingLayers gives them.
     std::vector<std::string> layersExcept(const std::unordered_set<std::string>& hidden) const;
