@@ -9,6 +9,7 @@
 #include "readers/ZVString.h"
 
 #include <algorithm>
+#include <bit>
 #include <cmath>
 #include <cstdint>
 #include <vector>
@@ -48,10 +49,7 @@ QString Avalia(const QString& expressao) {
 class ItensVistos {
 public:
     explicit ItensVistos(size_t quantos) {
-        size_t capacidade = 16;
-        while (capacidade < 2 * quantos)
-            capacidade *= 2;
-        tabela_.assign(capacidade, nullptr);
+        tabela_.assign(std::bit_ceil(std::max<size_t>(16, 2 * quantos)), nullptr);
     }
     bool contem(const CEItemLista* item) const { return tabela_[lugar(item)] == item; }
     void insere(const CEItemLista* item) {

@@ -2,6 +2,9 @@
 
 #include "ZVString.h"
 
+#include <algorithm>
+#include <bit>
+
 using zvsdk::ResultBuffer;
 
 namespace {
@@ -65,9 +68,7 @@ QStringList TabelaConexoes::Textos::ParaLista() const {
 // ---- the table
 
 void TabelaConexoes::Reserva(std::size_t fios) {
-    std::size_t tamanho = 16;
-    while (tamanho < fios * 2)
-        tamanho *= 2;
+    const std::size_t tamanho = std::bit_ceil(std::max<std::size_t>(16, fios * 2));
     if (tamanho <= indice_.size()) return;
     indice_.assign(tamanho, Vaga{});
     for (std::uint32_t lugar = 0; lugar < fios_.size(); ++lugar)

@@ -6,6 +6,7 @@
 #include <QStringView>
 
 #include <algorithm>
+#include <bit>
 #include <cstdint>
 #include <functional>
 #include <unordered_set>
@@ -81,10 +82,7 @@ class TextosDistintos {
 public:
     // Room for up to `n` distinct texts.
     explicit TextosDistintos(size_t n) {
-        size_t lugares = 16;
-        while (lugares < 2 * n)
-            lugares *= 2;
-        tabela_.assign(lugares, kLivre);
+        tabela_.assign(std::bit_ceil(std::max<size_t>(16, 2 * n)), kLivre);
     }
     // The number of the text, given a new one when first seen. The text must outlive this.
     std::uint32_t numero(const QString& texto) {

@@ -35,6 +35,7 @@ void HostDocument::showExtents() {
     if (!db) return;
     // Only the layer states are taken now: a run that zooms at its end and is never looked
     // at does not index the drawing for it.
+    // The zoom before is let go first, so that the follower updates its set in place.
     extentsOf_.reset();
     extentsOf_ = hiddenLayers_.now(*db);
     db->beforeShapeChange([this] { settleView(true); });
