@@ -48,6 +48,15 @@ void GravaTextoConfiguracao(const QString& aplicacao, const QString& valor) {
     ponto->setXData(U8(aplicacao), std::span<const zvdb::Tag>(&item, 1));
 }
 
+// Past a point's y and z items, which belong to its one item (`i` at its x).
+void PassaPonto(std::span<const zvdb::Tag> itens, std::size_t& i) {
+    const int codigo = itens[i].code;
+    if (codigo < 1010 || codigo > 1013) return;
+    while (i + 1 < itens.size() &&
+           (itens[i + 1].code == codigo + 10 || itens[i + 1].code == codigo + 20))
+        ++i;
+}
+
 CEItemXData ItemXData(std::span<const zvdb::Tag> itens, std::size_t& i) {
     CEItemXData item;
     item.codigo = itens[i].code;
@@ -58,9 +67,7 @@ CEItemXData ItemXData(std::span<const zvdb::Tag> itens, std::size_t& i) {
             if (itens[j].code == item.codigo + 10) item.y = Q(itens[j].value).toDouble();
             if (itens[j].code == item.codigo + 20) item.z = Q(itens[j].value).toDouble();
         }
-        while (i + 1 < itens.size() &&
-               (itens[i + 1].code == item.codigo + 10 || itens[i + 1].code == item.codigo + 20))
-            ++i;
+        PassaPonto(itens, i);
     }
     return item;
 }
@@ -148,12 +155,7 @@ void CICad::TextosXData(const OdDbObjectId& id, const char* aplicacao,
     const std::span<const zvdb::Tag> itens = objeto->xdataItems(aplicacao);
     for (std::size_t i = 0; i < itens.size(); ++i) {
         textos.push_back(itens[i].value);
-        const int codigo = itens[i].code;
-        if (codigo < 1010 || codigo > 1013) continue;
-        // A point's y and z items belong to its one item, as GetXData reads them.
-        while (i + 1 < itens.size() &&
-               (itens[i + 1].code == codigo + 10 || itens[i + 1].code == codigo + 20))
-            ++i;
+        PassaPonto(itens, i);
     }
 }
 
