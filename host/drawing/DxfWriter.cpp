@@ -61,10 +61,6 @@ void DxfWriter::prepare() {
     }
     for (const std::string& app : apps)
         db_.registerApplication(app);
-    for (const auto& table : db_.tables_) {
-        if (table->head() && table->head()->has(70))
-            table->head()->setInteger(70, static_cast<long long>(table->size()));
-    }
     db_.header_.setText("$HANDSEED", 5, TagValues::fromHandle(db_.handleSeed()));
     legacyEncoding_ = db_.version() < "AC1021";
     codePage_ = std::string(db_.header_.text("$DWGCODEPAGE", "ANSI_1252"));
@@ -170,6 +166,20 @@ void DxfWriter::writeObject(const DbObject& object) {
     }
 }
 
+// The head's record count is written as the table stands; the head itself is left as it
+// is, so that saving is no edit of the drawing.
+void DxfWriter::writeTableHead(const SymbolTable& table) {
+    const DbObject& head = *table.head();
+    if (head.isErased()) return;
+    const std::string count = TagValues::fromInteger(static_cast<long long>(table.size()));
+    const int at = head.indexOf(70);
+    int i = 0;
+    head.forEachTag([&](int code, std::string_view value) {
+        if (code != kRemovedTag) tag(code, i == at ? std::string_view(count) : value);
+        ++i;
+    });
+}
+
 bool DxfWriter::isErasedObject(const Tag& pointer) const {
     if (pointer.code != 350 && pointer.code != 360) return false;
     const DbObject* object = db_.byHandle_.find(TagValues::toHandle(pointer.value));
@@ -190,7 +200,7 @@ void DxfWriter::writeTables() {
     for (const auto& table : db_.tables_) {
         if (!table->isWritten()) continue;
         if (table->head())
-            writeObject(*table->head());
+            writeTableHead(*table);
         else {
             tag(0, "TABLE");
             tag(2, table->name());

@@ -36,6 +36,7 @@ private:
     void writeEntity(const class Entity& entity);
     void tag(int code, std::string_view value);
     void flush();
+    void writeTableHead(const class SymbolTable& table);
     bool isErasedObject(const Tag& pointer) const;
 
     Database& db_;

@@ -13,6 +13,7 @@
 #include "drawing/Extents.h"
 #include "drawing/LayerRecord.h"
 #include "drawing/Polyline.h"
+#include "drawing/SymbolTable.h"
 #include "drawing/TextEntity.h"
 #include "drawing/XRecord.h"
 
@@ -326,6 +327,24 @@ TEST_F(DatabaseApi, ChangeCountMovesOnEveryChangeAndOnlyThen) {
     EXPECT_TRUE(changed());
     Database other;
     EXPECT_NE(other.changeCount(), db.changeCount()) << "two drawings never share a count";
+}
+
+TEST_F(DatabaseApi, SavingChangesNothingAndCountsEachTableAsItStands) {
+    const std::uint64_t layersBefore = db.table("LAYER")->size();
+    for (const char* name : {"A", "B", "C"})
+        db.createLayer(name);
+    const std::uint64_t changes = db.changeCount();
+    const std::uint64_t shapes = db.shapeCount();
+    const std::unique_ptr<Database> again = reloaded(db);
+    EXPECT_EQ(db.changeCount(), changes) << "a save is no edit";
+    EXPECT_EQ(db.shapeCount(), shapes);
+    for (const auto& table : again->tables()) {
+        if (!table->head() || !table->head()->has(70)) continue;
+        EXPECT_EQ(table->head()->integer(70), static_cast<long long>(table->size()))
+            << table->name();
+    }
+    EXPECT_EQ(again->table("LAYER")->size(), layersBefore + 3);
+    EXPECT_EQ(DxfWriter::toText(*again), DxfWriter::toText(db)) << "the counts read back stand";
 }
 
 TEST_F(DatabaseApi, DeepCloneBringsBlocksLayersAndTranslatesHandles) {
