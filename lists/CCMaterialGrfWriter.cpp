@@ -216,17 +216,24 @@ bool CCMaterialGrfWriter::LinhaTexto(CEItemLista& item, Especificacoes& defs, in
                                      QHash<QString, QString>& mapa, bool ultima, bool& funcao,
                                      bool* temLinha) {
     // The expression runs once per member, not once per wrapped row.
+    // A published item must not change: the answers join it once LISP lets go of it.
+    std::vector<std::pair<QString, QString>> respostas;
     for (CEItemLista* m = &item; m; m = m->ligado) {
-        bool publicado = false;
+        respostas.clear();
         for (const itemDet& s : defs) {
             if (!s.valido || s.modo.compare("M", Qt::CaseInsensitive) != 0 || !EhFuncao(s.tag))
                 continue;
-            if (m->temCampo(s.campo + kCache)) continue;
-            if (!publicado) m->paraLisp();
-            publicado = true;
-            m->definirCampo(s.campo + kCache, Avalia(s.campo));
+            const QString campo = s.campo + kCache;
+            const auto dada = [&campo](const auto& r) { return r.first == campo; };
+            if (m->temCampo(campo) || std::any_of(respostas.begin(), respostas.end(), dada))
+                continue;
+            if (respostas.empty()) m->paraLisp();
+            respostas.emplace_back(campo, Avalia(s.campo));
         }
-        if (publicado) CEItemLista::limparLisp();
+        if (respostas.empty()) continue;
+        CEItemLista::limparLisp();
+        for (const auto& [campo, valor] : respostas)
+            m->definirCampo(campo, valor);
     }
     bool conteudo = false;
     for (const CEItemLista* m = &item; m; m = m->ligado)

@@ -18,15 +18,52 @@ bool alone(const Value& value) {
     return value.isHeap() && value.asObject()->refs == 1;
 }
 
-// `slot` made a string of `text`: its own string filled again when nothing else holds it.
-inline void fillText(Value& slot, const QString& text) {
-    if (slot.isString() && alone(slot)) {
-        QString& held = static_cast<zvlisp::StringObject*>(slot.asObject())->text;
-        if (!held.isSharedWith(text)) held = text;
-        return;
+// The pairs a module published, read from its texts only when LISP asks.
+struct PublishedPairs : zvlisp::DeferredList {
+    std::vector<zvsdk::StringPair> pairs;
+    Value made;
+    bool isMade = false;
+
+    Value list() override {
+        if (!isMade) {
+            for (auto p = pairs.rbegin(); p != pairs.rend(); ++p)
+                made = Value::cons(Value::cons(Value::string(*p->key), Value::string(*p->value)),
+                                   std::move(made));
+            drop();
+            isMade = true;
+        }
+        return made;
     }
-    slot = Value::string(text);
-}
+    Value assocText(const QString& key) override {
+        if (isMade) {
+            for (const Value* c = &made; c->isCons(); c = &c->asCons()->cdr) {
+                const Value& pair = c->asCons()->car;
+                if (pair.asCons()->car.asString() == key) return pair;
+            }
+            return Value();
+        }
+        // Only a text of the same length can be equal: most keys pass without a comparison.
+        for (const zvsdk::StringPair& p : pairs)
+            if (p.key->size() == key.size() && *p.key == key)
+                return Value::cons(Value::string(*p.key), Value::string(*p.value));
+        return Value();
+    }
+    void fill(const zvsdk::StringPair* given, int count) {
+        pairs.assign(given, given + count);
+        made = Value();
+        isMade = false;
+    }
+    // Reads nil from now on: the texts are gone.
+    void forget() {
+        drop();
+        made = Value();
+        isMade = true;
+    }
+
+private:
+    void drop() { std::vector<zvsdk::StringPair>().swap(pairs); }
+};
+
 }  // namespace
 
 DocumentLisp::DocumentLisp(std::function<void(const QString&)> output) {
@@ -38,7 +75,7 @@ int DocumentLisp::lispGetSymbol(const QString& name, zvsdk::ResultBuffer** value
     const zvlisp::Symbol* symbol = knownSymbol(name);
     if (!symbol || !symbol->assigned || !value) return zvsdk::RTERROR;
     try {
-        *value = LispChains::toChain(symbol->value);
+        *value = LispChains::toChain(zvlisp::Interpreter::valueOf(symbol));
     } catch (const zvlisp::LispError&) {
         return zvsdk::RTERROR;
     }
@@ -48,6 +85,7 @@ int DocumentLisp::lispGetSymbol(const QString& name, zvsdk::ResultBuffer** value
 int DocumentLisp::lispPutSymbol(const QString& name, const zvsdk::ResultBuffer* value) {
     if (name.isEmpty()) return zvsdk::RTERROR;
     zvlisp::Symbol* symbol = symbolOf(name);
+    if (symbol == pairsSymbol_) settlePairs(symbol);
     symbol->value = LispChains::value(lisp_, value);
     symbol->assigned = true;
     return zvsdk::RTNORM;
@@ -57,32 +95,27 @@ int DocumentLisp::lispPutStringPairs(const QString& name, const zvsdk::StringPai
                                      int count) {
     if (name.isEmpty()) return zvsdk::RTERROR;
     zvlisp::Symbol* symbol = symbolOf(name);
-    if (symbol->value.same(pairs_)) symbol->value = Value();
-    Value list = std::move(pairs_);
-    // Held elsewhere as a whole: that holder keeps it as it is.
-    if (!alone(list)) list = Value();
-    // A cell, a pair or a text that something else holds too is left to it and replaced
-    // here; the rest is filled again in place.
-    Value* link = &list;
-    for (int i = 0; i < count; ++i) {
-        // Past the end of the last list, the cells a shorter one left over go on.
-        if (link->isNil() && spare_.isCons()) *link = std::exchange(spare_, Value());
-        if (!link->isCons() || !alone(*link)) *link = Value::cons(Value(), Value());
-        zvlisp::Cons* cell = link->asCons();
-        if (!cell->car.isCons() || !alone(cell->car)) cell->car = Value::cons(Value(), Value());
-        zvlisp::Cons* pair = cell->car.asCons();
-        fillText(pair->car, *pairs[i].key);
-        fillText(pair->cdr, *pairs[i].value);
-        link = &cell->cdr;
-    }
-    // Items differ in their number of fields: the cells past this list's end are kept for
-    // a longer one, instead of being freed now and made again then.
-    if (link->isCons() && alone(*link)) spare_ = std::exchange(*link, Value());
-    *link = Value();
-    symbol->value = list;
+    settlePairs(symbol);
     symbol->assigned = true;
-    pairs_ = std::move(list);
+    pairsSymbol_ = symbol;
+    if (count <= 0) {
+        symbol->value = Value();
+        return zvsdk::RTNORM;
+    }
+    if (pairs_.isNil()) pairs_ = Value::object(zvlisp::Type::Deferred, new PublishedPairs);
+    static_cast<PublishedPairs*>(pairs_.asObject())->fill(pairs, count);
+    symbol->value = pairs_;
     return zvsdk::RTNORM;
+}
+
+void DocumentLisp::settlePairs(zvlisp::Symbol* setNow) {
+    if (pairs_.isNil()) return;
+    if (setNow && setNow->value.same(pairs_)) setNow->value = Value();
+    if (alone(pairs_)) return;
+    // A binding saved it, or another symbol still shows it: that holder keeps the list as
+    // it stands, and the next pairs go to a new one.
+    static_cast<PublishedPairs*>(pairs_.asObject())->list();
+    pairs_ = Value();
 }
 
 zvlisp::Symbol* DocumentLisp::symbolOf(const QString& name) {
@@ -106,8 +139,12 @@ zvlisp::Symbol* DocumentLisp::remember(const QString& name, zvlisp::Symbol* symb
 }
 
 void DocumentLisp::forgetPairs() {
+    if (!pairs_.isNil()) {
+        auto* published = static_cast<PublishedPairs*>(pairs_.asObject());
+        if (!published->isMade) published->forget();
+    }
     pairs_ = Value();
-    spare_ = Value();
+    pairsSymbol_ = nullptr;
 }
 
 zvsdk::ResultBuffer* DocumentLisp::lispInvoke(const zvsdk::ResultBuffer* call) {

@@ -23,12 +23,14 @@ public:
     // with one 5019 node.
     int lispGetSymbol(const QString& name, zvsdk::ResultBuffer** value) override;
     int lispPutSymbol(const QString& name, const zvsdk::ResultBuffer* value) override;
-    // Builds the list straight from the texts, without a chain in between. A list run
-    // publishes one item after another: the cells of the previous list are filled again
-    // when nothing but this document holds them any more.
+    // The symbol holds the pairs as they are given; the list is made from the texts only
+    // when LISP reads the symbol, and `(assoc "text" symbol)` finds its pair without it. A
+    // list run publishes one item after another and mostly looks up a field or two. The
+    // texts are read until the symbol is set again (pairs or lispPutSymbol), or another
+    // name gets pairs: then whatever else still holds the list gets it made whole.
     int lispPutStringPairs(const QString& name, const zvsdk::StringPair* pairs, int count) override;
-    // Lets go of the list kept for the next pairs: its texts may be a module's own, and
-    // must go before the module is unloaded.
+    // Lets go of the pairs last published: their texts may be a module's own, gone with the
+    // module, or gone after the command. What still holds them reads nil.
     void forgetPairs();
     // Errors are printed on the command line and answered with null.
     zvsdk::ResultBuffer* lispInvoke(const zvsdk::ResultBuffer* call) override;
@@ -68,12 +70,15 @@ private:
     zvlisp::Symbol* knownSymbol(const QString& name);
     zvlisp::Symbol* remember(const QString& name, zvlisp::Symbol* symbol);
 
+    // The pairs last published are about to be set again or replaced: a holder other than
+    // `setNow` gets them made whole while their texts stand.
+    void settlePairs(zvlisp::Symbol* setNow);
+
     zvlisp::Interpreter lisp_;
     QHash<QString, zvlisp::Symbol*> symbolsByName_;
-    // The last list of pairs built, kept to be filled again.
+    // The pairs last published, kept to be given the next ones, and their symbol.
     zvlisp::Value pairs_;
-    // The cells a shorter list left past its end, for the next longer one.
-    zvlisp::Value spare_;
+    zvlisp::Symbol* pairsSymbol_ = nullptr;
     QHash<QString, zvlisp::Value> readTexts_;
     QHash<QString, ChainSource> chainAnswers_;
     std::vector<InvokeListener> invokeListeners_;

@@ -97,6 +97,8 @@ bool HostDocument::execute(const QString& name, zvsdk::CommandResult* result) {
         try {
             handler();
         } catch (const std::bad_alloc&) {
+            // What the command published may be gone with the memory it freed on the way out.
+            if (documentLisp) documentLisp->forgetPairs();
             reportCommandResult(zvsdk::CommandResult::OutOfMemory);
         }
     }

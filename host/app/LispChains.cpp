@@ -68,6 +68,9 @@ void LispChains::append(const Value& value, ResultBuffer**& tail, int depth) {
                 tail, zvsdk::newEntity(static_cast<zvlisp::EnameObject*>(value.asObject())->name));
         case Type::Cons:
             break;
+        case Type::Deferred:
+            return append(static_cast<zvlisp::DeferredList*>(value.asObject())->list(), tail,
+                          depth);
         default:
             return push(tail, zvsdk::newString(zvlisp::Printer::prin1(value)));
     }

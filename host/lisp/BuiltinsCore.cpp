@@ -184,7 +184,8 @@ void defineEvaluation(Interpreter& in) {
         "vl-symbol-name",
         [](Interpreter& in, Args a) { return Value::string(in.toSym(a[0])->name); }, 1, 1);
     in.define(
-        "vl-symbol-value", [](Interpreter& in, Args a) { return in.toSym(a[0])->value; }, 1, 1);
+        "vl-symbol-value",
+        [](Interpreter& in, Args a) { return Interpreter::valueOf(in.toSym(a[0])); }, 1, 1);
     in.define("atoms-family", atomsFamily, 1, 2);
 }
 

@@ -77,6 +77,7 @@ void Interpreter::registerBuiltins() {
     registerFileBuiltins(*this);
     registerFileSystemBuiltins(*this);
     registerSystemBuiltins(*this);
+    assoc_ = findSymbol("ASSOC")->value.asObject();
 }
 
 void Interpreter::define(const QString& name, NativeFn fn, int minArgs, int maxArgs) {
@@ -106,7 +107,13 @@ void Interpreter::setGlobal(const QString& name, Value value) {
 
 Value Interpreter::global(const QString& name) const {
     const Symbol* symbol = findSymbol(name);
-    return symbol ? symbol->value : Value();
+    return symbol ? valueOf(symbol) : Value();
+}
+
+Value Interpreter::valueOf(const Symbol* symbol) {
+    if (symbol->value.type() == Type::Deferred) [[unlikely]]
+        return static_cast<DeferredList*>(symbol->value.asObject())->list();
+    return symbol->value;
 }
 
 void Interpreter::poll() {
@@ -123,7 +130,7 @@ void Interpreter::poll() {
 Value Interpreter::eval(const Value& form) {
     switch (form.type()) {
         case Type::Symbol:
-            return form.asSymbol()->value;
+            return valueOf(form.asSymbol());
         case Type::Cons:
             return evalCall(form);
         default:
@@ -145,18 +152,39 @@ Value Interpreter::evalCall(const Value& form) {
     if (cell->car.isSymbol()) {
         Symbol* symbol = cell->car.asSymbol();
         if (symbol->special) return symbol->special(*this, cell->cdr);
-        function = symbol->value;
+        function = valueOf(symbol);
         if (function.isNil()) fail("no function definition: " + symbol->name);
     } else {
         function = eval(cell->car);
     }
     if (!function.isFunction()) function = toFunction(function);
+    if (Value found; assocDeferred(function, cell, found)) return found;
     SmallVector<Value, 6> args;
     const Value* arg = &cell->cdr;
     for (; arg->isCons(); arg = &arg->asCons()->cdr)
         args.push_back(eval(arg->asCons()->car));
     if (!arg->isNil()) badType("listp", *arg);
     return invoke(function, Args(args.data(), args.size()));
+}
+
+bool Interpreter::assocDeferred(const Value& function, const Cons* form, Value& result) {
+    if (function.asObject() != assoc_ || !form->cdr.isCons()) return false;
+    const Cons* first = form->cdr.asCons();
+    if (!first->cdr.isCons()) return false;
+    const Cons* second = first->cdr.asCons();
+    if (!second->cdr.isNil() || !second->car.isSymbol()) return false;
+    const Symbol* symbol = second->car.asSymbol();
+    if (symbol->value.type() != Type::Deferred) return false;
+    // The key is evaluated once, before the list is read, as the call would: what it does
+    // may set the symbol again.
+    const Value key = eval(first->car);
+    if (key.isString() && symbol->value.type() == Type::Deferred) {
+        result = static_cast<DeferredList*>(symbol->value.asObject())->assocText(key.asString());
+    } else {
+        const Value args[2] = {key, valueOf(symbol)};
+        result = invoke(function, Args(args, 2));
+    }
+    return true;
 }
 
 Value Interpreter::invoke(const Value& function, Args args) {
@@ -238,7 +266,7 @@ Value Interpreter::toFunction(const Value& function) {
         case Type::User:
             return function;
         case Type::Symbol: {
-            const Value& value = function.asSymbol()->value;
+            const Value value = valueOf(function.asSymbol());
             if (value.isFunction()) return value;
             if (value.isCons()) return toFunction(value);
             fail("no function definition: " + function.asSymbol()->name);

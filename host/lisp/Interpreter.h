@@ -51,6 +51,8 @@ public:
     void setGlobal(const QString& name, Value value);
     // The value of a global; nil when unset.
     Value global(const QString& name) const;
+    // The symbol's value, a deferred list made whole.
+    static Value valueOf(const Symbol* symbol);
     Value t() const { return Value::symbol(t_); }
     Value boolean(bool b) const { return b ? t() : Value(); }
     // The empty symbol (princ) gives: the prompt prints nothing for it.
@@ -150,6 +152,9 @@ public:
 private:
     friend class DepthGuard;
     Value evalCall(const Value& form);
+    // (assoc key symbol) on a symbol holding a deferred list, answered without making the
+    // list; false when the form is not that.
+    bool assocDeferred(const Value& function, const Cons* form, Value& result);
     template <typename Body>
     bool topLevel(Body body, Value* result);
     Value invoke(const Value& function, Args args);
@@ -162,6 +167,7 @@ private:
     Symbol* t_ = nullptr;
     Symbol* quiet_ = nullptr;
     Symbol* lambda_ = nullptr;
+    const Object* assoc_ = nullptr;  // the built-in assoc, as registered
     Symbol* errorHandler_ = nullptr;
     std::function<void(const QString&)> output_;
     bool atLineStart_ = true;  // errors begin on a line of their own

@@ -110,6 +110,8 @@ void Printer::append(QString& out, const Value& value, bool escape, int depth) {
         case Type::Pickset:
             out += "<Selection set: " + QString::number(quintptr(value.asObject()), 16) + '>';
             return;
+        case Type::Deferred:
+            return append(out, static_cast<DeferredList*>(value.asObject())->list(), escape, depth);
         case Type::Cons:
             break;
     }

@@ -26,7 +26,8 @@ enum class Type : std::uint8_t {
     File,
     Ename,
     Error,
-    Pickset
+    Pickset,
+    Deferred
 };
 
 struct Symbol;
@@ -165,6 +166,16 @@ struct PicksetObject : Object {
 struct ErrorObject : Object {
     explicit ErrorObject(const QString& m) : message(m) {}
     QString message;
+};
+
+// A list its maker fills in only when it is read. Only a symbol's value is ever one: reading
+// the symbol gives the list (Interpreter::valueOf), and `(assoc "text" symbol)` may find its
+// pair without the rest being made.
+struct DeferredList : Object {
+    // The whole list; the same list at each call.
+    virtual Value list() = 0;
+    // What `assoc` answers for a text key: the first pair whose key is that text, or nil.
+    virtual Value assocText(const QString& key) = 0;
 };
 
 inline void Value::retain() const {

@@ -19,7 +19,9 @@ public:
     virtual void releaseResultBuffer(ResultBuffer* chain) { releaseChain(chain); }
     // Sets the symbol to an association list of dotted string pairs, in the given order.
     // A list run publishes one item per row this way, so a host may build the list
-    // directly; the default goes through a chain and lispPutSymbol.
+    // directly, or only when LISP reads it; the default goes through a chain and
+    // lispPutSymbol. The caller keeps the texts alive and unchanged until it sets the
+    // symbol again (pairs or lispPutSymbol) or publishes pairs under another name.
     virtual int lispPutStringPairs(const QString& name, const StringPair* pairs, int count);
 };
 

@@ -162,4 +162,82 @@ TEST_F(PositionChainsTest, PairsPublishedAgainAndAgainStayRightAfterTheListIsFor
     EXPECT_EQ(ev("outro"), "nil");
 }
 
+TEST_F(PositionChainsTest, AssocFindsAPublishedPairAsTheListWouldAnswer) {
+    const QString a = "A", b = "B", bb = "BB", um = "1", dois = "2", tres = "3";
+    const zvsdk::StringPair pares[] = {{&a, &um}, {&bb, &dois}, {&b, &dois}, {&b, &tres}};
+    ASSERT_EQ(lisp().lispPutStringPairs("reg", pares, 4), zvsdk::RTNORM);
+    EXPECT_EQ(ev("(assoc \"B\" reg)"), "(\"B\" . \"2\")") << "the first of two wins";
+    EXPECT_EQ(ev("(cdr (assoc \"BB\" reg))"), "\"2\"");
+    EXPECT_EQ(ev("(assoc \"b\" reg)"), "nil") << "keys are compared as spelt";
+    EXPECT_EQ(ev("(assoc \"Z\" reg)"), "nil");
+    EXPECT_EQ(ev("(assoc 'A reg)"), "nil") << "a symbol is no text";
+    // what the key's expression does to the symbol comes first, as in any call
+    EXPECT_EQ(ev("(assoc (progn (setq reg (list (cons \"A\" \"novo\"))) \"A\") reg)"),
+              "(\"A\" . \"novo\")");
+    ASSERT_EQ(lisp().lispPutStringPairs("reg", pares, 4), zvsdk::RTNORM);
+    EXPECT_EQ(ev("(assoc \"A\" (cdr reg))"), "nil");
+    EXPECT_EQ(ev("(eq reg reg)"), "T") << "read twice, the same list";
+    EXPECT_EQ(ev("(eq (assoc \"A\" reg) (car reg))"), "T") << "a list read once is the one";
+    // a function of the user's own under the name is the one called
+    ev("(defun assoc (k l) \"meu\")");
+    EXPECT_EQ(ev("(assoc \"A\" reg)"), "\"meu\"");
+}
+
+TEST_F(PositionChainsTest, WhatHoldsPublishedPairsWhenTheyAreSetAgainKeepsTheirTexts) {
+    QString a = "A", um = "1", b = "B", dois = "2";
+    const zvsdk::StringPair antigo[] = {{&a, &um}};
+    const zvsdk::StringPair novo[] = {{&b, &dois}};
+    // The module publishes again and drops the old texts while a function's binding holds
+    // the earlier publication; the binding gives it back as it was.
+    interpreter().define(
+        "publica-de-novo",
+        [&](zvlisp::Interpreter&, zvlisp::Args) {
+            lisp().lispPutStringPairs("reg", novo, 1);
+            a = "apagado", um = "apagado";
+            return zvlisp::Value();
+        },
+        0, 0);
+    ev("(defun com-reg (reg) (publica-de-novo) (cdr (assoc \"B\" reg)))");
+    ASSERT_EQ(lisp().lispPutStringPairs("reg", antigo, 1), zvsdk::RTNORM);
+    EXPECT_EQ(ev("(com-reg nil)"), "\"2\"");
+    EXPECT_EQ(ev("reg"), "((\"A\" . \"1\"))");
+    // Set by the module through a chain while a binding holds it: the same.
+    a = "A", um = "1";
+    ASSERT_EQ(lisp().lispPutStringPairs("reg", antigo, 1), zvsdk::RTNORM);
+    interpreter().define(
+        "limpa-reg",
+        [&](zvlisp::Interpreter&, zvlisp::Args) {
+            ResultBuffer* nil = zvsdk::newNode(zvsdk::RTNIL);
+            lisp().lispPutSymbol("reg", nil);
+            zvsdk::releaseChain(nil);
+            a = "apagado", um = "apagado";
+            return zvlisp::Value();
+        },
+        0, 0);
+    ev("(defun com-reg-2 (/ reg) (limpa-reg) reg)");
+    EXPECT_EQ(ev("(com-reg-2)"), "nil");
+    EXPECT_EQ(ev("reg"), "((\"A\" . \"1\"))");
+}
+
+TEST_F(PositionChainsTest, PublishedPairsReadWholeThroughTheHostAndForgottenReadNil) {
+    const QString a = "A", b = "B", um = "1", dois = "2";
+    const zvsdk::StringPair pares[] = {{&a, &um}, {&b, &dois}};
+    ASSERT_EQ(lisp().lispPutStringPairs("reg", pares, 2), zvsdk::RTNORM);
+    ResultBuffer* value = nullptr;
+    ASSERT_EQ(lisp().lispGetSymbol("reg", &value), zvsdk::RTNORM);
+    EXPECT_EQ(value->restype, zvsdk::RTLB);
+    std::vector<QString> texts;
+    for (const ResultBuffer* n = value; n; n = n->rbnext)
+        if (n->restype == zvsdk::RTSTR) texts.push_back(n->rstring);
+    zvsdk::releaseChain(value);
+    EXPECT_EQ(texts, (std::vector<QString>{"A", "1", "B", "2"}));
+    EXPECT_EQ(ev("(vl-symbol-value 'reg)"), "((\"A\" . \"1\") (\"B\" . \"2\"))");
+    // Forgotten before LISP read them (their texts may be gone): nil, not the old texts.
+    ASSERT_EQ(lisp().lispPutStringPairs("reg", pares, 2), zvsdk::RTNORM);
+    ev("(defun le-reg () reg)");
+    lisp().forgetPairs();
+    EXPECT_EQ(ev("(le-reg)"), "nil");
+    EXPECT_EQ(ev("(assoc \"A\" reg)"), "nil");
+}
+
 }  // namespace
