@@ -2,6 +2,7 @@
 // time the owner waits or goes; the items and readings the lists hand over leave their
 // containers empty and usable at once.
 #include "ReaderFixture.h"
+#include "module/CZVListasApp.h"
 #include "readers/Descarte.h"
 #include "readers/LeitorBase.h"
 #include "readers/VetorItens.h"
@@ -147,6 +148,27 @@ TEST(DescarteTest, AnOwnerThatGotNothingGoesAtOnce) {
     }
     // The module's went with its owner.
     EXPECT_EQ(Descarte::DoModulo(), nullptr);
+}
+
+TEST(DescarteTest, TheModulesAppHoldsTheOwnerAndFreesAllBeforeItGoes) {
+    ASSERT_EQ(Descarte::DoModulo(), nullptr);
+    CZVListasApp* app = CZVListasApp::CriarInstancia();
+    Descarte* descarte = Descarte::DoModulo();
+    ASSERT_NE(descarte, nullptr);
+    Registro registro;
+    Porteira porteira;
+    ASSERT_TRUE(descarte->Entregar(Marcado(registro, 1, &porteira)));
+    ASSERT_TRUE(descarte->Entregar(Marcado(registro, 2)));
+    std::thread abre([&porteira] {
+        std::this_thread::sleep_for(std::chrono::milliseconds(50));
+        porteira.Abre();
+    });
+    app->deleteModule();
+    // Gone with the module, after what it held was freed.
+    EXPECT_EQ(Descarte::DoModulo(), nullptr);
+    EXPECT_EQ(CZVListasApp::Instancia(), nullptr);
+    EXPECT_EQ(registro.Copia().size(), 2u);
+    abre.join();
 }
 
 namespace {
