@@ -2,6 +2,7 @@
 
 #include "CEAtributo.h"
 #include "CEListaAtributos.h"
+#include "Descarte.h"
 #include "cad/CELayoutRotasFios.h"
 #include "lists/CETemplate.h"
 #include "settings/CIMensagens.h"
@@ -10,6 +11,8 @@
 #include <cctype>
 #include <cmath>
 #include <span>
+#include <tuple>
+#include <utility>
 
 using zvsdk::ResultBuffer;
 
@@ -65,56 +68,32 @@ CCDataReader::~CCDataReader() = default;
 
 namespace {
 
-// Empties a container and gives its memory back.
-template <class T>
-void Esvazia(T& conteudo) {
-    T vazio;
-    std::swap(conteudo, vazio);
+// Takes the containers' contents out, leaving each as a new one.
+template <class... T>
+std::tuple<T...> Retira(T&... conteudos) {
+    return std::tuple<T...>(std::exchange(conteudos, T{})...);
 }
 
 }  // namespace
 
 void CCDataReader::LiberaLeituras() {
-    Esvazia(circuitos_);
-    Esvazia(conexoes_);
-    Esvazia(fiosPorLayer_);
-    Esvazia(indicesFios_);
-    Esvazia(primeirosVertices_);
+    // Items share the texts of these; they keep theirs.
+    auto leituras =
+        Retira(circuitos_, conexoes_, fiosPorLayer_, indicesFios_, primeirosVertices_, rotas_,
+               rotasPorChave_, caminhos_, entidadesLidas_, entidadesAntigas_, avulsa_, leitura_,
+               nomesLidos_, formas_, numerosFios_, numerosCabos_, ligacoesPorElemento_,
+               ligacoesAntigas_, layers_, gruposPaginas_, textosTipo_, colunasDivididas_,
+               catalogoComp_, constantes_, ligacoesLidas_, chaves_, textosFio_, tags_, valores_,
+               lote_, ordemLote_, basesAcessorio_, basesColunas_);
     versaoIndices_ = 0;
-    Esvazia(rotas_);
-    Esvazia(rotasPorChave_);
     rotasLidas_ = false;
-    Esvazia(caminhos_);
-    entidadesLidas_.libera();
-    entidadesAntigas_.libera();
-    avulsa_ = {};
-    leitura_ = {};
-    Esvazia(nomesLidos_);
-    Esvazia(formas_);
-    numerosFios_.libera();
-    Esvazia(numerosCabos_);
-    ligacoesPorElemento_.libera();
-    ligacoesAntigas_.libera();
     corteDe_ = OdDbObjectId();
     versaoLidas_ = 0;
-    // Items share these texts; they keep theirs.
-    Esvazia(layers_);
-    Esvazia(gruposPaginas_);
-    Esvazia(textosTipo_);
-    Esvazia(colunasDivididas_);
-    Esvazia(catalogoComp_);
-    Esvazia(constantes_);
     atributosDe_ = OdDbObjectId();
-    Esvazia(ligacoesLidas_);
-    Esvazia(chaves_);
+    // It points into the catalogue answers just taken.
     semChave_.Esquece();
-    Esvazia(textosFio_);
-    Esvazia(tags_);
-    Esvazia(valores_);
-    Esvazia(lote_);
-    Esvazia(ordemLote_);
-    Esvazia(basesAcessorio_);
-    Esvazia(basesColunas_);
+    // The module's commands go on while another thread frees them; elsewhere they go now.
+    if (Descarte* descarte = Descarte::DoModulo()) descarte->Entregar(std::move(leituras));
 }
 
 // ---- connections

@@ -1,5 +1,7 @@
 #include "VetorItens.h"
 
+#include "Descarte.h"
+
 #include "ZVString.h"
 
 #include <QHash>
@@ -216,11 +218,27 @@ VetorItens VetorItens::filtrar(const std::vector<std::pair<QString, QString>>& p
     return resultado;
 }
 
+namespace {
+
+// Items that go together, wherever that happens.
+struct ItensADestruir {
+    std::vector<CEItemLista*> itens;
+    explicit ItensADestruir(std::vector<CEItemLista*>&& v) noexcept : itens(std::move(v)) {}
+    ItensADestruir(ItensADestruir&&) noexcept = default;
+    ItensADestruir& operator=(ItensADestruir&&) = delete;
+    ~ItensADestruir() {
+        // In the order the items lie in memory, not the list's: a sorted list visits them
+        // all over the heap, and each one's fields were made next to it.
+        std::sort(itens.begin(), itens.end(), std::less<CEItemLista*>());
+        for (CEItemLista* item : itens)
+            delete item;
+    }
+};
+
+}  // namespace
+
 void VetorItens::destruirItens() {
-    // In the order the items lie in memory, not the list's: a sorted list visits them all
-    // over the heap, and each one's fields were made next to it.
-    std::sort(begin(), end(), std::less<CEItemLista*>());
-    for (CEItemLista* item : *this)
-        delete item;
-    clear();
+    ItensADestruir feitos{std::exchange(static_cast<std::vector<CEItemLista*>&>(*this), {})};
+    // The module's commands go on while another thread frees them; elsewhere they go now.
+    if (Descarte* descarte = Descarte::DoModulo()) descarte->Entregar(std::move(feitos));
 }
