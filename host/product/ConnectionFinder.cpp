@@ -11,6 +11,7 @@
 #include "drawing/TagValues.h"
 
 #include <algorithm>
+#include <bit>
 #include <climits>
 #include <cmath>
 #include <span>
@@ -202,6 +203,7 @@ struct ConnectionFinder::Scratch {
     std::vector<const Spot*> near;
     std::vector<std::uint32_t> seen;
     std::vector<zvdb::Point3> vertices;
+    std::vector<Touch> touches;
 };
 
 namespace {
@@ -338,9 +340,8 @@ void ConnectionFinder::indexSymbol(const zvdb::BlockReference& reference, std::s
     }
 }
 
-std::size_t ConnectionFinder::slotOf(std::int32_t layer, std::uint64_t cell) {
-    std::uint64_t h = cell ^ (static_cast<std::uint64_t>(static_cast<std::uint32_t>(layer)) *
-                              0x9E3779B97F4A7C15ull);
+std::size_t ConnectionFinder::slotOf(std::uint64_t cell) {
+    std::uint64_t h = cell * 0x9E3779B97F4A7C15ull;
     h ^= h >> 29;
     h *= 0xBF58476D1CE4E5B9ull;
     h ^= h >> 32;
@@ -349,12 +350,13 @@ std::size_t ConnectionFinder::slotOf(std::int32_t layer, std::uint64_t cell) {
 
 const ConnectionFinder::CellRun* ConnectionFinder::run(std::int32_t layer,
                                                        std::uint64_t cell) const {
-    if (grid_.empty()) return nullptr;
-    const std::size_t mask = grid_.size() - 1;
-    for (std::size_t slot = slotOf(layer, cell) & mask;; slot = (slot + 1) & mask) {
-        const CellRun& run = grid_[slot];
+    const auto id = static_cast<std::size_t>(layer);
+    if (id >= layerCells_.size() || layerCells_[id].empty) return nullptr;
+    const LayerCells& table = layerCells_[id];
+    for (std::size_t slot = slotOf(cell) & table.mask;; slot = (slot + 1) & table.mask) {
+        const CellRun& run = grid_[table.first + slot];
         if (run.end == 0) return nullptr;
-        if (run.cell == cell && run.layer == layer) return &run;
+        if (run.cell == cell) return &run;
     }
 }
 
@@ -375,26 +377,34 @@ void ConnectionFinder::buildGrid() {
     });
     std::vector<Spot> sorted;
     sorted.reserve(spots_.size());
-    std::size_t cells = 0;
+    // the cells of each layer counted on the way
+    std::vector<std::uint32_t> cells(layers_.size(), 0);
     for (std::size_t i = 0; i < keys.size(); ++i) {
         sorted.push_back(spots_[keys[i].index]);
-        cells += i == 0 || keys[i].layer != keys[i - 1].layer || keys[i].cell != keys[i - 1].cell;
+        if (i == 0 || keys[i].layer != keys[i - 1].layer || keys[i].cell != keys[i - 1].cell)
+            ++cells[static_cast<std::size_t>(keys[i].layer)];
     }
     spots_ = std::move(sorted);
-    std::size_t size = 16;
-    while (size < cells * 2)
-        size *= 2;
-    grid_.assign(cells ? size : 0, CellRun{0, 0, 0, 0});
-    const std::size_t mask = size - 1;
+    layerCells_.assign(layers_.size(), LayerCells{});
+    std::size_t size = 0;
+    for (std::size_t layer = 0; layer < cells.size(); ++layer) {
+        if (cells[layer] == 0) continue;
+        const std::size_t own = std::bit_ceil(std::max<std::size_t>(4, cells[layer] * 2));
+        layerCells_[layer] = {static_cast<std::uint32_t>(size), static_cast<std::uint32_t>(own - 1),
+                              false};
+        size += own;
+    }
+    grid_.assign(size, CellRun{0, 0, 0});
     for (std::uint32_t i = 0; i < spots_.size();) {
         std::uint32_t end = i + 1;
         while (end < spots_.size() && spots_[end].layer == spots_[i].layer &&
                spots_[end].cell == spots_[i].cell)
             ++end;
-        std::size_t slot = slotOf(spots_[i].layer, spots_[i].cell) & mask;
-        while (grid_[slot].end != 0)
-            slot = (slot + 1) & mask;
-        grid_[slot] = {spots_[i].cell, spots_[i].layer, i, end};
+        const LayerCells& table = layerCells_[static_cast<std::size_t>(spots_[i].layer)];
+        std::size_t slot = slotOf(spots_[i].cell) & table.mask;
+        while (grid_[table.first + slot].end != 0)
+            slot = (slot + 1) & table.mask;
+        grid_[table.first + slot] = {spots_[i].cell, i, end};
         i = end;
     }
 }
@@ -504,22 +514,70 @@ std::string ConnectionFinder::wireNumber(const zvdb::Polyline& polyline) {
     return std::string(wireNumberOf(Roles(polyline).items(polyline, Roles::Wire)));
 }
 
+namespace {
+
+// The wires' numbers in the order they first come, each with the places of its polylines
+// in that order: views into the drawing, in flat arrays (no node, no text made per wire).
+struct WireGroups {
+    std::vector<std::string_view> numbers;
+    std::vector<std::uint32_t> first;  // a wire's lines in `lines`, first[w] to first[w + 1]
+    std::vector<std::uint32_t> lines;
+
+    explicit WireGroups(std::span<const std::string_view> lineNumbers) {
+        const std::size_t mask =
+            std::bit_ceil(std::max<std::size_t>(16, lineNumbers.size() * 2)) - 1;
+        std::vector<std::uint32_t> slots(mask + 1, 0);  // a wire's place + 1; 0 free
+        std::vector<std::uint32_t> wireOf(lineNumbers.size(), UINT32_MAX);
+        std::vector<std::uint32_t> count;
+        for (std::size_t line = 0; line < lineNumbers.size(); ++line) {
+            const std::string_view number = lineNumbers[line];
+            if (number.empty()) continue;  // an unnumbered wire joins nothing
+            std::size_t slot = std::hash<std::string_view>{}(number)&mask;
+            while (slots[slot] != 0 && numbers[slots[slot] - 1] != number)
+                slot = (slot + 1) & mask;
+            if (slots[slot] == 0) {
+                numbers.push_back(number);
+                count.push_back(0);
+                slots[slot] = static_cast<std::uint32_t>(numbers.size());
+            }
+            wireOf[line] = slots[slot] - 1;
+            ++count[wireOf[line]];
+        }
+        first.assign(numbers.size() + 1, 0);
+        for (std::size_t w = 0; w < numbers.size(); ++w)
+            first[w + 1] = first[w] + count[w];
+        lines.resize(first.back());
+        std::vector<std::uint32_t> next(first.begin(), first.end() - 1);
+        for (std::size_t line = 0; line < wireOf.size(); ++line)
+            if (wireOf[line] != UINT32_MAX)
+                lines[next[wireOf[line]]++] = static_cast<std::uint32_t>(line);
+    }
+};
+
+}  // namespace
+
+// Wire by wire, its polylines in their order: each wire's vectors are made to size once.
 std::vector<WireConnections> ConnectionFinder::wires() const {
-    std::vector<WireConnections> result;
-    // Numbers as views into the drawing: a polyline of a wire met before makes no text.
-    std::unordered_map<std::string_view, std::size_t> byNumber;
-    byNumber.reserve(wireLines_.size());
+    std::vector<std::string_view> lineNumbers(wireLines_.size());
+    for (std::size_t i = 0; i < wireLines_.size(); ++i)
+        lineNumbers[i] = wireLines_[i].number;
+    const WireGroups groups(lineNumbers);
+    lineNumbers = {};
+    std::vector<WireConnections> result(groups.numbers.size());
     Scratch scratch;
-    for (const Line& line : wireLines_) {
-        const std::string_view number = line.number;
-        if (number.empty()) continue;  // an unnumbered wire joins nothing
-        auto [it, added] = byNumber.emplace(number, result.size());
-        if (added) result.push_back({std::string(number), {}, {}});
-        WireConnections& wire = result[it->second];
-        wire.polylines.push_back(line.handle);
-        readVertices(*line.polyline, scratch.vertices);
-        for (const zvdb::Point3& vertex : scratch.vertices)
-            touchesAt(line.layer, vertex, tolerance_, wire.touches, scratch);
+    for (std::size_t w = 0; w < groups.numbers.size(); ++w) {
+        WireConnections& wire = result[w];
+        wire.number = groups.numbers[w];
+        wire.polylines.reserve(groups.first[w + 1] - groups.first[w]);
+        scratch.touches.clear();
+        for (std::uint32_t k = groups.first[w]; k < groups.first[w + 1]; ++k) {
+            const Line& line = wireLines_[groups.lines[k]];
+            wire.polylines.push_back(line.handle);
+            readVertices(*line.polyline, scratch.vertices);
+            for (const zvdb::Point3& vertex : scratch.vertices)
+                touchesAt(line.layer, vertex, tolerance_, scratch.touches, scratch);
+        }
+        wire.touches.assign(scratch.touches.begin(), scratch.touches.end());
     }
     return result;
 }

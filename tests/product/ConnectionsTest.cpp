@@ -112,6 +112,30 @@ TEST_F(ConnectionsTest, LeadsOfOneCableAndPolylinesOfOneWireMakeOneEntryEach) {
     EXPECT_EQ(show("(mapcar 'car (getConexoesTodosFios))"), "(\"301\" \"302\")");
 }
 
+TEST_F(ConnectionsTest, AWiresPolylinesAmongOtherWiresMakeOneEntryInPageOrder) {
+    auto* onTwo = terminal("ESQ$0002$A", {100, 200, 0}, "X1", "3");
+    auto* later = wire("ESQ$0002$A", {{100, 190, 0}, {100, 150, 0}}, "401");  // drawn first
+    auto* other = terminal("ESQ$0001$A", {200, 200, 0}, "X1", "2");
+    auto* between = wire("ESQ$0001$A", {{200, 190, 0}, {200, 150, 0}}, "402");
+    auto* onOne = terminal("ESQ$0001$A", {100, 200, 0}, "X1", "1");
+    auto* first = wire("ESQ$0001$A", {{100, 150, 0}, {100, 190, 0}}, "401");
+    wire("ESQ$0001$A", {{300, 190, 0}, {300, 150, 0}}, "403");
+    const std::vector<WireConnections> wires = ConnectionFinder(*database, 0.1).wires();
+    ASSERT_EQ(wires.size(), 3u);
+    EXPECT_EQ(wires[0].number, "402");
+    EXPECT_EQ(wires[1].number, "401");
+    EXPECT_EQ(wires[2].number, "403");
+    EXPECT_EQ(wires[1].polylines, (std::vector<std::uint64_t>{first->handle(), later->handle()}));
+    EXPECT_EQ(wires[0].polylines, std::vector<std::uint64_t>{between->handle()});
+    ASSERT_EQ(wires[1].touches.size(), 2u);
+    EXPECT_EQ(wires[1].touches[0].symbol, onOne->handle());
+    EXPECT_EQ(wires[1].touches[1].symbol, onTwo->handle());
+    ASSERT_EQ(wires[0].touches.size(), 1u);
+    EXPECT_EQ(wires[0].touches[0].symbol, other->handle());
+    EXPECT_EQ(wires[0].touches[0].point, (zvdb::Point3{200, 190, 0}));
+    EXPECT_TRUE(wires[2].touches.empty());
+}
+
 TEST_F(ConnectionsTest, WireListsByPage) {
     terminal("ESQ$0001$A", {100, 200, 0}, "X1", "1");
     auto* one = wire("ESQ$0001$A", {{100, 190, 0}, {100, 150, 0}}, "201");
