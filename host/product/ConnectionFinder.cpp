@@ -23,10 +23,15 @@ namespace {
 
 constexpr double kLeadTolerance = 0.3;
 
+char upper(char c) {
+    return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c;
+}
+
+// `prefix` is upper-case ASCII: no locale can make another byte one of its letters.
 bool startsWithNoCase(std::string_view text, std::string_view prefix) {
     if (text.size() < prefix.size()) return false;
     for (std::size_t i = 0; i < prefix.size(); ++i)
-        if (std::toupper(static_cast<unsigned char>(text[i])) != prefix[i]) return false;
+        if (upper(text[i]) != prefix[i]) return false;
     return true;
 }
 
@@ -74,10 +79,6 @@ std::string_view wireNumberOf(std::span<const zvdb::Tag> items) {
         if (!value.empty()) return value;
     }
     return {};
-}
-
-char upper(char c) {
-    return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c;
 }
 
 // `name` is `upperName` ignoring case; `upperName` is upper case.
@@ -490,16 +491,25 @@ void ConnectionFinder::touchesAt(std::int32_t layer, const zvdb::Point3& p, doub
 std::vector<zvdb::Polyline*> ConnectionFinder::polylinesInPageOrder(zvdb::Database& database,
                                                                     const char* application) {
     const auto pages = PageRegistry(database).pages();
-    std::unordered_map<std::string, int> order;
+    std::unordered_map<std::string_view, int> order;
     for (std::size_t i = 0; i < pages.size(); ++i)
         order.emplace(pages[i], static_cast<int>(i));
     std::vector<std::pair<std::pair<int, std::uint64_t>, zvdb::Polyline*>> found;
+    // entities come page by page: the rank of the last layer serves the next polyline
+    std::string_view lastLayer;
+    int lastRank = -1;
     for (zvdb::Entity* entity : database.modelSpace()->entities()) {
-        auto* polyline = dynamic_cast<zvdb::Polyline*>(entity);
-        if (!polyline || !polyline->hasXData(application)) continue;
-        auto page = order.find(std::string(polyline->layer()));
-        const int rank = page == order.end() ? INT_MAX : page->second;
-        found.push_back({{rank, polyline->handle()}, polyline});
+        // no kind of polyline derives from Polyline: its type tells it at once
+        if (typeid(*entity) != typeid(zvdb::Polyline)) continue;
+        auto* polyline = static_cast<zvdb::Polyline*>(entity);
+        if (!polyline->hasXData(application)) continue;
+        const std::string_view layer = polyline->layer();
+        if (lastRank < 0 || layer != lastLayer) {
+            auto page = order.find(layer);
+            lastLayer = layer;
+            lastRank = page == order.end() ? INT_MAX : page->second;
+        }
+        found.push_back({{lastRank, polyline->handle()}, polyline});
     }
     std::sort(found.begin(), found.end(),
               [](const auto& a, const auto& b) { return a.first < b.first; });

@@ -136,6 +136,17 @@ TEST_F(ConnectionsTest, AWiresPolylinesAmongOtherWiresMakeOneEntryInPageOrder) {
     EXPECT_TRUE(wires[2].touches.empty());
 }
 
+TEST_F(ConnectionsTest, PolylinesInPageOrderThenByHandleAndOffThePagesLast) {
+    auto* second = wire("ESQ$0002$A", {{0, 0, 0}, {10, 0, 0}}, "501");
+    auto* off = wire("OUTRO", {{0, 0, 0}, {10, 0, 0}}, "502");
+    auto* first = wire("ESQ$0001$A", {{0, 0, 0}, {10, 0, 0}}, "503");
+    database->modelSpace()->addLwPolyline({{0, 0, 0}, {5, 5, 0}}, false, "ESQ$0001$A");
+    auto* secondToo = wire("ESQ$0002$A", {{0, 5, 0}, {10, 5, 0}}, "504");
+    auto* firstToo = wire("ESQ$0001$A", {{0, 5, 0}, {10, 5, 0}}, "505");
+    const std::vector<zvdb::Polyline*> expected = {first, firstToo, second, secondToo, off};
+    EXPECT_EQ(ConnectionFinder::polylinesInPageOrder(*database, "KVR_ZV_WIRE"), expected);
+}
+
 TEST_F(ConnectionsTest, WireListsByPage) {
     terminal("ESQ$0001$A", {100, 200, 0}, "X1", "1");
     auto* one = wire("ESQ$0001$A", {{100, 190, 0}, {100, 150, 0}}, "201");
