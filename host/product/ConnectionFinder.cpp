@@ -526,8 +526,8 @@ std::string ConnectionFinder::wireNumber(const zvdb::Polyline& polyline) {
 
 namespace {
 
-// The wires' numbers in the order they first come, each with the places of its polylines
-// in that order: views into the drawing, in flat arrays (no node, no text made per wire).
+// The numbers of wires (or cables) in the order they first come, each with the places of
+// its polylines in that order, in flat arrays: no node and no text made per wire.
 struct WireGroups {
     std::vector<std::string_view> numbers;
     std::vector<std::uint32_t> first;  // a wire's lines in `lines`, first[w] to first[w + 1]
@@ -593,40 +593,47 @@ std::vector<WireConnections> ConnectionFinder::wires() const {
 }
 
 std::vector<WireConnections> ConnectionFinder::cables() const {
-    // blind connections by the handle of their lead
-    std::unordered_map<std::uint64_t, std::vector<const Line*>> blinds;
-    for (const Line& blind : blindLines_) {
-        const auto items = Roles(*blind.polyline).items(*blind.polyline, Roles::Blind);
-        if (items.size() >= 2) blinds[zvdb::TagValues::toHandle(items[1].value)].push_back(&blind);
+    // blind connections by the handle of their lead, in their order for each lead
+    std::vector<std::pair<std::uint64_t, std::uint32_t>> blinds;
+    for (std::size_t i = 0; i < blindLines_.size(); ++i) {
+        const zvdb::Polyline& blind = *blindLines_[i].polyline;
+        const auto items = Roles(blind).items(blind, Roles::Blind);
+        if (items.size() >= 2)
+            blinds.push_back(
+                {zvdb::TagValues::toHandle(items[1].value), static_cast<std::uint32_t>(i)});
     }
+    std::sort(blinds.begin(), blinds.end());
     Scratch scratch;
-    auto ends = [&](const Line& line, bool firstToo, std::vector<Touch>& out) {
+    auto ends = [&](const Line& line, bool firstToo) {
         readVertices(*line.polyline, scratch.vertices);
         const auto& vertices = scratch.vertices;
         if (vertices.empty()) return;
-        if (firstToo) touchesAt(line.layer, vertices.front(), kLeadTolerance, out, scratch);
+        if (firstToo)
+            touchesAt(line.layer, vertices.front(), kLeadTolerance, scratch.touches, scratch);
         if (vertices.size() > 1)
-            touchesAt(line.layer, vertices.back(), kLeadTolerance, out, scratch);
+            touchesAt(line.layer, vertices.back(), kLeadTolerance, scratch.touches, scratch);
     };
-    std::vector<WireConnections> result;
-    std::unordered_map<std::string, std::size_t> byNumber;
-    byNumber.reserve(leadLines_.size());
-    for (const Line& lead : leadLines_) {
-        std::string number = cableNumber(*lead.polyline);
-        if (number.empty()) continue;
-        // a cable's next lead finds its number without a node made and dropped
-        auto it = byNumber.find(number);
-        if (it == byNumber.end()) {
-            it = byNumber.emplace(std::move(number), result.size()).first;
-            result.push_back({it->first, {}, {}});
+    std::vector<std::string> leadNumbers(leadLines_.size());
+    for (std::size_t i = 0; i < leadLines_.size(); ++i)
+        leadNumbers[i] = cableNumber(*leadLines_[i].polyline);
+    const std::vector<std::string_view> views(leadNumbers.begin(), leadNumbers.end());
+    const WireGroups groups(views);
+    std::vector<WireConnections> result(groups.numbers.size());
+    for (std::size_t c = 0; c < groups.numbers.size(); ++c) {
+        WireConnections& cable = result[c];
+        cable.number = groups.numbers[c];
+        cable.polylines.reserve(groups.first[c + 1] - groups.first[c]);
+        scratch.touches.clear();
+        for (std::uint32_t k = groups.first[c]; k < groups.first[c + 1]; ++k) {
+            const Line& lead = leadLines_[groups.lines[k]];
+            cable.polylines.push_back(lead.handle);
+            ends(lead, true);
+            auto own = std::lower_bound(blinds.begin(), blinds.end(),
+                                        std::pair<std::uint64_t, std::uint32_t>{lead.handle, 0});
+            for (; own != blinds.end() && own->first == lead.handle; ++own)
+                ends(blindLines_[own->second], false);
         }
-        WireConnections& cable = result[it->second];
-        cable.polylines.push_back(lead.handle);
-        ends(lead, true, cable.touches);
-        auto own = blinds.find(lead.handle);
-        if (own == blinds.end()) continue;
-        for (const Line* blind : own->second)
-            ends(*blind, false, cable.touches);
+        cable.touches.assign(scratch.touches.begin(), scratch.touches.end());
     }
     return result;
 }

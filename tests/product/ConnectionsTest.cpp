@@ -89,6 +89,57 @@ TEST_F(ConnectionsTest, CableLeadWithBlindConnectionOnTheNextPage) {
     EXPECT_EQ(show("(getFiosPorLayer \"ESQ$0001$A\")"), "(\"" + hex(lead) + "\")");
 }
 
+TEST_F(ConnectionsTest, CablesAmongEachOtherKeepTheirLeadsAndBlindConnectionsInOrder) {
+    const std::string path[] = {"ZV_CABOS"};
+    auto makeCable = [&](const std::string& name) {
+        auto* cable = database->dictionaryAt(path, true)->getOrCreateXRecord(name);
+        cable->setData(zvsample::XDataItems().add(1, name).tags());
+        cable->setXData("KVR_ZV_ATT_VIRTUAL",
+                        zvsample::XDataItems().text("CABO\f" + name + "\fN").tags());
+        return cable;
+    };
+    auto addLead = [&](zvdb::DbObject* cable, const std::string& layer, double x) {
+        auto* lead = database->modelSpace()->addLwPolyline({{x, 90, 0}, {x, 10, 0}}, false, layer);
+        lead->setXData("KVR_ZV_CABO",
+                       zvsample::XDataItems().text("20001\f1").handle(cable->handle()).tags());
+        return lead;
+    };
+    auto addBlind = [&](zvdb::Polyline* lead, const std::string& layer, double x) {
+        auto* blind = database->modelSpace()->addLwPolyline({{0, 0, 0}, {x, 10, 0}}, false, layer);
+        blind->setXData("KVR_ZV_CONEX_BLIND",
+                        zvsample::XDataItems().text("W").handle(lead->handle()).tags());
+    };
+    zvdb::DbObject* w1 = makeCable("W1");
+    zvdb::DbObject* w2 = makeCable("W2");
+    std::vector<std::uint64_t> at;  // terminals at the leads' first ends, then the blinds'
+    for (double x : {100.0, 200.0, 300.0})
+        at.push_back(terminal("ESQ$0001$A", {x, 100, 0}, "X5", "1")->handle());
+    for (double x : {100.0, 200.0, 300.0})
+        at.push_back(terminal("ESQ$0002$A", {x, 20, 0}, "X5", "2")->handle());
+    auto* second = addLead(w1, "ESQ$0001$A", 300);
+    auto* other = addLead(w2, "ESQ$0001$A", 200);
+    auto* first = addLead(w1, "ESQ$0001$A", 100);
+    // blinds drawn in another order than their leads, two for the second lead
+    addBlind(second, "ESQ$0002$A", 300);
+    addBlind(other, "ESQ$0002$A", 200);
+    addBlind(first, "ESQ$0002$A", 100);
+    addBlind(second, "ESQ$0002$A", 200);
+    const std::vector<WireConnections> cables = ConnectionFinder(*database, 0.1).cables();
+    ASSERT_EQ(cables.size(), 2u);
+    EXPECT_EQ(cables[0].number, "W1\f20001");
+    EXPECT_EQ(cables[1].number, "W2\f20001");
+    EXPECT_EQ(cables[0].polylines, (std::vector<std::uint64_t>{second->handle(), first->handle()}));
+    EXPECT_EQ(cables[1].polylines, std::vector<std::uint64_t>{other->handle()});
+    auto symbols = [](const WireConnections& cable) {
+        std::vector<std::uint64_t> found;
+        for (const Touch& touch : cable.touches)
+            found.push_back(touch.symbol);
+        return found;
+    };
+    EXPECT_EQ(symbols(cables[0]), (std::vector<std::uint64_t>{at[2], at[5], at[4], at[0], at[3]}));
+    EXPECT_EQ(symbols(cables[1]), (std::vector<std::uint64_t>{at[1], at[4]}));
+}
+
 TEST_F(ConnectionsTest, LeadsOfOneCableAndPolylinesOfOneWireMakeOneEntryEach) {
     auto* a = terminal("ESQ$0001$A", {100, 100, 0}, "X3", "1");
     auto* b = terminal("ESQ$0001$A", {200, 100, 0}, "X3", "2");
