@@ -520,8 +520,8 @@ std::vector<zvdb::Polyline*> ConnectionFinder::polylinesInPageOrder(zvdb::Databa
     return result;
 }
 
-std::string ConnectionFinder::wireNumber(const zvdb::Polyline& polyline) {
-    return std::string(wireNumberOf(Roles(polyline).items(polyline, Roles::Wire)));
+std::string_view ConnectionFinder::wireNumber(const zvdb::Polyline& polyline) {
+    return wireNumberOf(Roles(polyline).items(polyline, Roles::Wire));
 }
 
 namespace {

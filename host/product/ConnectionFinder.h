@@ -47,8 +47,9 @@ public:
     std::vector<WireConnections> cables() const;
     double tolerance() const { return tolerance_; }
 
-    // The wire number of a KVR_ZV_WIRE polyline (FIO, WIRE, ALAMBRE or CABO item); empty.
-    static std::string wireNumber(const zvdb::Polyline& polyline);
+    // The wire number of a KVR_ZV_WIRE polyline (FIO, WIRE, ALAMBRE or CABO item); empty. A
+    // view into the drawing's storage.
+    static std::string_view wireNumber(const zvdb::Polyline& polyline);
     // "NAME\fKEY" of a lead: its cable's CABO field and its own key; empty.
     std::string cableNumber(const zvdb::Polyline& lead) const;
     // Model-space polylines with the application's extended data, by registry page order

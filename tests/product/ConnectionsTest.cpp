@@ -217,6 +217,18 @@ TEST_F(ConnectionsTest, WireListsByPage) {
               "(\"" + hex(two) + "\" \"" + hex(three) + "\")");
 }
 
+TEST_F(ConnectionsTest, WireListsOfLayersOffThePagesWhosePolylinesAlternate) {
+    // off the pages the polylines go by handle alone, so their layers take turns
+    auto* one = wire("OFF1", {{0, 0, 0}, {10, 0, 0}}, "601");
+    auto* two = wire("OFF2", {{0, 0, 0}, {10, 0, 0}}, "602");
+    auto* three = wire("OFF1", {{0, 5, 0}, {10, 5, 0}}, "603");
+    auto* oneAgain = wire("OFF2", {{0, 5, 0}, {10, 5, 0}}, "601");
+    EXPECT_EQ(show("(getListaFiosProj \"proj.dxf\" \"OFF1\")"),
+              "(\"" + hex(one) + "\" \"" + hex(three) + "\")");
+    EXPECT_EQ(show("(getListaFiosProj \"proj.dxf\" \"OFF2\")"),
+              "(\"" + hex(oneAgain) + "\" \"" + hex(two) + "\")");
+}
+
 TEST_F(ConnectionsTest, WireHandlesAreUpperCaseHexadecimalTexts) {
     // Wires until one's handle has a letter among its digits.
     std::string texts = "(";
