@@ -4,10 +4,13 @@
 
 #include "product/ConnectionAnswers.h"
 #include "product/ProductContext.h"
+#include "sdk/NodeChains.h"
 
 #include <charconv>
+#include <memory>
 #include <string>
 #include <string_view>
+#include <utility>
 
 namespace zvhost {
 
@@ -57,24 +60,22 @@ QString entryText(const zvproduct::Touch& touch, bool details, std::string& scra
     return text;
 }
 
-// A chain under construction; what is built so far goes if the building stops half-way.
-class ChainBuilder {
+// Fills in the nodes of a chain made beforehand, one after the other.
+class ChainFiller {
 public:
-    ~ChainBuilder() { zvsdk::releaseChain(head_); }
-    void push(ResultBuffer* node) {
-        *tail_ = node;
-        tail_ = &node->rbnext;
+    explicit ChainFiller(ResultBuffer* chain) : node_(chain) {}
+    ResultBuffer& next(short type) {
+        ResultBuffer& node = *node_;
+        node_ = node_->rbnext;
+        node.restype = type;
+        return node;
     }
-    ResultBuffer* take() {
-        ResultBuffer* head = head_;
-        head_ = nullptr;
-        tail_ = &head_;
-        return head;
-    }
+    void mark(short type) { next(type); }
+    void real(double value) { next(zvsdk::RTREAL).rreal = value; }
+    void text(QString&& value) { next(zvsdk::RTSTR).rstring = std::move(value); }
 
 private:
-    ResultBuffer* head_ = nullptr;
-    ResultBuffer** tail_ = &head_;
+    ResultBuffer* node_;
 };
 
 }  // namespace
@@ -82,24 +83,31 @@ private:
 ResultBuffer* ConnectionChains::toChain(const std::vector<zvproduct::WireConnections>& wires,
                                         bool details) {
     if (wires.empty()) return zvsdk::newNode(zvsdk::RTNIL);
-    ChainBuilder chain;
+    // All the nodes at once: the answer's two list marks, three nodes a wire, six an entry.
+    std::size_t nodes = 2;
+    for (const zvproduct::WireConnections& wire : wires)
+        nodes += 3 + 6 * wire.touches.size();
+    ResultBuffer* chain = zvsdk::newChain(nodes);
+    ChainFiller fill(chain);
+    // the nodes go if the filling stops half-way
+    std::unique_ptr<ResultBuffer, void (*)(ResultBuffer*)> owner(chain, zvsdk::releaseChain);
     std::string text;
-    chain.push(zvsdk::newNode(zvsdk::RTLB));
+    fill.mark(zvsdk::RTLB);
     for (const zvproduct::WireConnections& wire : wires) {
-        chain.push(zvsdk::newNode(zvsdk::RTLB));
-        chain.push(zvsdk::newString(qText(wire.number)));
+        fill.mark(zvsdk::RTLB);
+        fill.text(qText(wire.number));
         for (const zvproduct::Touch& touch : wire.touches) {
-            chain.push(zvsdk::newNode(zvsdk::RTLB));
-            chain.push(zvsdk::newString(entryText(touch, details, text)));
-            chain.push(zvsdk::newReal(touch.point.x));
-            chain.push(zvsdk::newReal(touch.point.y));
-            chain.push(zvsdk::newReal(touch.point.z));
-            chain.push(zvsdk::newNode(zvsdk::RTLE));
+            fill.mark(zvsdk::RTLB);
+            fill.text(entryText(touch, details, text));
+            fill.real(touch.point.x);
+            fill.real(touch.point.y);
+            fill.real(touch.point.z);
+            fill.mark(zvsdk::RTLE);
         }
-        chain.push(zvsdk::newNode(zvsdk::RTLE));
+        fill.mark(zvsdk::RTLE);
     }
-    chain.push(zvsdk::newNode(zvsdk::RTLE));
-    return chain.take();
+    fill.mark(zvsdk::RTLE);
+    return owner.release();
 }
 
 void ConnectionChains::install(DocumentLisp& lisp, const zvproduct::ProductContext& context) {

@@ -11,6 +11,7 @@
 #include "drawing/TagValues.h"
 
 #include <algorithm>
+#include <bit>
 #include <climits>
 #include <cmath>
 #include <span>
@@ -22,10 +23,15 @@ namespace {
 
 constexpr double kLeadTolerance = 0.3;
 
+char upper(char c) {
+    return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c;
+}
+
+// `prefix` is upper-case ASCII: no locale can make another byte one of its letters.
 bool startsWithNoCase(std::string_view text, std::string_view prefix) {
     if (text.size() < prefix.size()) return false;
     for (std::size_t i = 0; i < prefix.size(); ++i)
-        if (std::toupper(static_cast<unsigned char>(text[i])) != prefix[i]) return false;
+        if (upper(text[i]) != prefix[i]) return false;
     return true;
 }
 
@@ -73,10 +79,6 @@ std::string_view wireNumberOf(std::span<const zvdb::Tag> items) {
         if (!value.empty()) return value;
     }
     return {};
-}
-
-char upper(char c) {
-    return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c;
 }
 
 // `name` is `upperName` ignoring case; `upperName` is upper case.
@@ -202,6 +204,7 @@ struct ConnectionFinder::Scratch {
     std::vector<const Spot*> near;
     std::vector<std::uint32_t> seen;
     std::vector<zvdb::Point3> vertices;
+    std::vector<Touch> touches;
 };
 
 namespace {
@@ -338,9 +341,8 @@ void ConnectionFinder::indexSymbol(const zvdb::BlockReference& reference, std::s
     }
 }
 
-std::size_t ConnectionFinder::slotOf(std::int32_t layer, std::uint64_t cell) {
-    std::uint64_t h = cell ^ (static_cast<std::uint64_t>(static_cast<std::uint32_t>(layer)) *
-                              0x9E3779B97F4A7C15ull);
+std::size_t ConnectionFinder::slotOf(std::uint64_t cell) {
+    std::uint64_t h = cell * 0x9E3779B97F4A7C15ull;
     h ^= h >> 29;
     h *= 0xBF58476D1CE4E5B9ull;
     h ^= h >> 32;
@@ -349,12 +351,13 @@ std::size_t ConnectionFinder::slotOf(std::int32_t layer, std::uint64_t cell) {
 
 const ConnectionFinder::CellRun* ConnectionFinder::run(std::int32_t layer,
                                                        std::uint64_t cell) const {
-    if (grid_.empty()) return nullptr;
-    const std::size_t mask = grid_.size() - 1;
-    for (std::size_t slot = slotOf(layer, cell) & mask;; slot = (slot + 1) & mask) {
-        const CellRun& run = grid_[slot];
+    const auto id = static_cast<std::size_t>(layer);
+    if (id >= layerCells_.size() || layerCells_[id].empty) return nullptr;
+    const LayerCells& table = layerCells_[id];
+    for (std::size_t slot = slotOf(cell) & table.mask;; slot = (slot + 1) & table.mask) {
+        const CellRun& run = grid_[table.first + slot];
         if (run.end == 0) return nullptr;
-        if (run.cell == cell && run.layer == layer) return &run;
+        if (run.cell == cell) return &run;
     }
 }
 
@@ -375,26 +378,34 @@ void ConnectionFinder::buildGrid() {
     });
     std::vector<Spot> sorted;
     sorted.reserve(spots_.size());
-    std::size_t cells = 0;
+    // the cells of each layer counted on the way
+    std::vector<std::uint32_t> cells(layers_.size(), 0);
     for (std::size_t i = 0; i < keys.size(); ++i) {
         sorted.push_back(spots_[keys[i].index]);
-        cells += i == 0 || keys[i].layer != keys[i - 1].layer || keys[i].cell != keys[i - 1].cell;
+        if (i == 0 || keys[i].layer != keys[i - 1].layer || keys[i].cell != keys[i - 1].cell)
+            ++cells[static_cast<std::size_t>(keys[i].layer)];
     }
     spots_ = std::move(sorted);
-    std::size_t size = 16;
-    while (size < cells * 2)
-        size *= 2;
-    grid_.assign(cells ? size : 0, CellRun{0, 0, 0, 0});
-    const std::size_t mask = size - 1;
+    layerCells_.assign(layers_.size(), LayerCells{});
+    std::size_t size = 0;
+    for (std::size_t layer = 0; layer < cells.size(); ++layer) {
+        if (cells[layer] == 0) continue;
+        const std::size_t own = std::bit_ceil(std::max<std::size_t>(4, cells[layer] * 2));
+        layerCells_[layer] = {static_cast<std::uint32_t>(size), static_cast<std::uint32_t>(own - 1),
+                              false};
+        size += own;
+    }
+    grid_.assign(size, CellRun{0, 0, 0});
     for (std::uint32_t i = 0; i < spots_.size();) {
         std::uint32_t end = i + 1;
         while (end < spots_.size() && spots_[end].layer == spots_[i].layer &&
                spots_[end].cell == spots_[i].cell)
             ++end;
-        std::size_t slot = slotOf(spots_[i].layer, spots_[i].cell) & mask;
-        while (grid_[slot].end != 0)
-            slot = (slot + 1) & mask;
-        grid_[slot] = {spots_[i].cell, spots_[i].layer, i, end};
+        const LayerCells& table = layerCells_[static_cast<std::size_t>(spots_[i].layer)];
+        std::size_t slot = slotOf(spots_[i].cell) & table.mask;
+        while (grid_[table.first + slot].end != 0)
+            slot = (slot + 1) & table.mask;
+        grid_[table.first + slot] = {spots_[i].cell, i, end};
         i = end;
     }
 }
@@ -480,16 +491,25 @@ void ConnectionFinder::touchesAt(std::int32_t layer, const zvdb::Point3& p, doub
 std::vector<zvdb::Polyline*> ConnectionFinder::polylinesInPageOrder(zvdb::Database& database,
                                                                     const char* application) {
     const auto pages = PageRegistry(database).pages();
-    std::unordered_map<std::string, int> order;
+    std::unordered_map<std::string_view, int> order;
     for (std::size_t i = 0; i < pages.size(); ++i)
         order.emplace(pages[i], static_cast<int>(i));
     std::vector<std::pair<std::pair<int, std::uint64_t>, zvdb::Polyline*>> found;
+    // entities come page by page: the rank of the last layer serves the next polyline
+    std::string_view lastLayer;
+    int lastRank = -1;
     for (zvdb::Entity* entity : database.modelSpace()->entities()) {
-        auto* polyline = dynamic_cast<zvdb::Polyline*>(entity);
-        if (!polyline || !polyline->hasXData(application)) continue;
-        auto page = order.find(std::string(polyline->layer()));
-        const int rank = page == order.end() ? INT_MAX : page->second;
-        found.push_back({{rank, polyline->handle()}, polyline});
+        // no kind of polyline derives from Polyline: its type tells it at once
+        if (typeid(*entity) != typeid(zvdb::Polyline)) continue;
+        auto* polyline = static_cast<zvdb::Polyline*>(entity);
+        if (!polyline->hasXData(application)) continue;
+        const std::string_view layer = polyline->layer();
+        if (lastRank < 0 || layer != lastLayer) {
+            auto page = order.find(layer);
+            lastLayer = layer;
+            lastRank = page == order.end() ? INT_MAX : page->second;
+        }
+        found.push_back({{lastRank, polyline->handle()}, polyline});
     }
     std::sort(found.begin(), found.end(),
               [](const auto& a, const auto& b) { return a.first < b.first; });
@@ -500,65 +520,120 @@ std::vector<zvdb::Polyline*> ConnectionFinder::polylinesInPageOrder(zvdb::Databa
     return result;
 }
 
-std::string ConnectionFinder::wireNumber(const zvdb::Polyline& polyline) {
-    return std::string(wireNumberOf(Roles(polyline).items(polyline, Roles::Wire)));
+std::string_view ConnectionFinder::wireNumber(const zvdb::Polyline& polyline) {
+    return wireNumberOf(Roles(polyline).items(polyline, Roles::Wire));
 }
 
+namespace {
+
+// The numbers of wires (or cables) in the order they first come, each with the places of
+// its polylines in that order, in flat arrays: no node and no text made per wire.
+struct WireGroups {
+    std::vector<std::string_view> numbers;
+    std::vector<std::uint32_t> first;  // a wire's lines in `lines`, first[w] to first[w + 1]
+    std::vector<std::uint32_t> lines;
+
+    explicit WireGroups(std::span<const std::string_view> lineNumbers) {
+        const std::size_t mask =
+            std::bit_ceil(std::max<std::size_t>(16, lineNumbers.size() * 2)) - 1;
+        std::vector<std::uint32_t> slots(mask + 1, 0);  // a wire's place + 1; 0 free
+        std::vector<std::uint32_t> wireOf(lineNumbers.size(), UINT32_MAX);
+        std::vector<std::uint32_t> count;
+        for (std::size_t line = 0; line < lineNumbers.size(); ++line) {
+            const std::string_view number = lineNumbers[line];
+            if (number.empty()) continue;  // an unnumbered wire joins nothing
+            std::size_t slot = std::hash<std::string_view>{}(number)&mask;
+            while (slots[slot] != 0 && numbers[slots[slot] - 1] != number)
+                slot = (slot + 1) & mask;
+            if (slots[slot] == 0) {
+                numbers.push_back(number);
+                count.push_back(0);
+                slots[slot] = static_cast<std::uint32_t>(numbers.size());
+            }
+            wireOf[line] = slots[slot] - 1;
+            ++count[wireOf[line]];
+        }
+        first.assign(numbers.size() + 1, 0);
+        for (std::size_t w = 0; w < numbers.size(); ++w)
+            first[w + 1] = first[w] + count[w];
+        lines.resize(first.back());
+        std::vector<std::uint32_t> next(first.begin(), first.end() - 1);
+        for (std::size_t line = 0; line < wireOf.size(); ++line)
+            if (wireOf[line] != UINT32_MAX)
+                lines[next[wireOf[line]]++] = static_cast<std::uint32_t>(line);
+    }
+};
+
+}  // namespace
+
+// Wire by wire, its polylines in their order: each wire's vectors are made to size once.
 std::vector<WireConnections> ConnectionFinder::wires() const {
-    std::vector<WireConnections> result;
-    // Numbers as views into the drawing: a polyline of a wire met before makes no text.
-    std::unordered_map<std::string_view, std::size_t> byNumber;
-    byNumber.reserve(wireLines_.size());
+    std::vector<std::string_view> lineNumbers(wireLines_.size());
+    for (std::size_t i = 0; i < wireLines_.size(); ++i)
+        lineNumbers[i] = wireLines_[i].number;
+    const WireGroups groups(lineNumbers);
+    lineNumbers = {};
+    std::vector<WireConnections> result(groups.numbers.size());
     Scratch scratch;
-    for (const Line& line : wireLines_) {
-        const std::string_view number = line.number;
-        if (number.empty()) continue;  // an unnumbered wire joins nothing
-        auto [it, added] = byNumber.emplace(number, result.size());
-        if (added) result.push_back({std::string(number), {}, {}});
-        WireConnections& wire = result[it->second];
-        wire.polylines.push_back(line.handle);
-        readVertices(*line.polyline, scratch.vertices);
-        for (const zvdb::Point3& vertex : scratch.vertices)
-            touchesAt(line.layer, vertex, tolerance_, wire.touches, scratch);
+    for (std::size_t w = 0; w < groups.numbers.size(); ++w) {
+        WireConnections& wire = result[w];
+        wire.number = groups.numbers[w];
+        wire.polylines.reserve(groups.first[w + 1] - groups.first[w]);
+        scratch.touches.clear();
+        for (std::uint32_t k = groups.first[w]; k < groups.first[w + 1]; ++k) {
+            const Line& line = wireLines_[groups.lines[k]];
+            wire.polylines.push_back(line.handle);
+            readVertices(*line.polyline, scratch.vertices);
+            for (const zvdb::Point3& vertex : scratch.vertices)
+                touchesAt(line.layer, vertex, tolerance_, scratch.touches, scratch);
+        }
+        wire.touches.assign(scratch.touches.begin(), scratch.touches.end());
     }
     return result;
 }
 
 std::vector<WireConnections> ConnectionFinder::cables() const {
-    // blind connections by the handle of their lead
-    std::unordered_map<std::uint64_t, std::vector<const Line*>> blinds;
-    for (const Line& blind : blindLines_) {
-        const auto items = Roles(*blind.polyline).items(*blind.polyline, Roles::Blind);
-        if (items.size() >= 2) blinds[zvdb::TagValues::toHandle(items[1].value)].push_back(&blind);
+    // blind connections by the handle of their lead, in their order for each lead
+    std::vector<std::pair<std::uint64_t, std::uint32_t>> blinds;
+    for (std::size_t i = 0; i < blindLines_.size(); ++i) {
+        const zvdb::Polyline& blind = *blindLines_[i].polyline;
+        const auto items = Roles(blind).items(blind, Roles::Blind);
+        if (items.size() >= 2)
+            blinds.push_back(
+                {zvdb::TagValues::toHandle(items[1].value), static_cast<std::uint32_t>(i)});
     }
+    std::sort(blinds.begin(), blinds.end());
     Scratch scratch;
-    auto ends = [&](const Line& line, bool firstToo, std::vector<Touch>& out) {
+    auto ends = [&](const Line& line, bool firstToo) {
         readVertices(*line.polyline, scratch.vertices);
         const auto& vertices = scratch.vertices;
         if (vertices.empty()) return;
-        if (firstToo) touchesAt(line.layer, vertices.front(), kLeadTolerance, out, scratch);
+        if (firstToo)
+            touchesAt(line.layer, vertices.front(), kLeadTolerance, scratch.touches, scratch);
         if (vertices.size() > 1)
-            touchesAt(line.layer, vertices.back(), kLeadTolerance, out, scratch);
+            touchesAt(line.layer, vertices.back(), kLeadTolerance, scratch.touches, scratch);
     };
-    std::vector<WireConnections> result;
-    std::unordered_map<std::string, std::size_t> byNumber;
-    byNumber.reserve(leadLines_.size());
-    for (const Line& lead : leadLines_) {
-        std::string number = cableNumber(*lead.polyline);
-        if (number.empty()) continue;
-        // a cable's next lead finds its number without a node made and dropped
-        auto it = byNumber.find(number);
-        if (it == byNumber.end()) {
-            it = byNumber.emplace(std::move(number), result.size()).first;
-            result.push_back({it->first, {}, {}});
+    std::vector<std::string> leadNumbers(leadLines_.size());
+    for (std::size_t i = 0; i < leadLines_.size(); ++i)
+        leadNumbers[i] = cableNumber(*leadLines_[i].polyline);
+    const std::vector<std::string_view> views(leadNumbers.begin(), leadNumbers.end());
+    const WireGroups groups(views);
+    std::vector<WireConnections> result(groups.numbers.size());
+    for (std::size_t c = 0; c < groups.numbers.size(); ++c) {
+        WireConnections& cable = result[c];
+        cable.number = groups.numbers[c];
+        cable.polylines.reserve(groups.first[c + 1] - groups.first[c]);
+        scratch.touches.clear();
+        for (std::uint32_t k = groups.first[c]; k < groups.first[c + 1]; ++k) {
+            const Line& lead = leadLines_[groups.lines[k]];
+            cable.polylines.push_back(lead.handle);
+            ends(lead, true);
+            auto own = std::lower_bound(blinds.begin(), blinds.end(),
+                                        std::pair<std::uint64_t, std::uint32_t>{lead.handle, 0});
+            for (; own != blinds.end() && own->first == lead.handle; ++own)
+                ends(blindLines_[own->second], false);
         }
-        WireConnections& cable = result[it->second];
-        cable.polylines.push_back(lead.handle);
-        ends(lead, true, cable.touches);
-        auto own = blinds.find(lead.handle);
-        if (own == blinds.end()) continue;
-        for (const Line* blind : own->second)
-            ends(*blind, false, cable.touches);
+        cable.touches.assign(scratch.touches.begin(), scratch.touches.end());
     }
     return result;
 }

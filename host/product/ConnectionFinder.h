@@ -47,8 +47,9 @@ public:
     std::vector<WireConnections> cables() const;
     double tolerance() const { return tolerance_; }
 
-    // The wire number of a KVR_ZV_WIRE polyline (FIO, WIRE, ALAMBRE or CABO item); empty.
-    static std::string wireNumber(const zvdb::Polyline& polyline);
+    // The wire number of a KVR_ZV_WIRE polyline (FIO, WIRE, ALAMBRE or CABO item); empty. A
+    // view into the drawing's storage.
+    static std::string_view wireNumber(const zvdb::Polyline& polyline);
     // "NAME\fKEY" of a lead: its cable's CABO field and its own key; empty.
     std::string cableNumber(const zvdb::Polyline& lead) const;
     // Model-space polylines with the application's extended data, by registry page order
@@ -80,8 +81,14 @@ private:
     // open-addressed table: a vertex asks nine cells, most of them empty.
     struct CellRun {
         std::uint64_t cell;
-        std::int32_t layer;
         std::uint32_t begin, end;  // end 0: a free slot
+    };
+    // Each layer has a table of its own, a power of two long, in grid_: the polylines come
+    // page by page, and a page's cells stay in the cache while it is read.
+    struct LayerCells {
+        std::uint32_t first = 0;
+        std::uint32_t mask = 0;  // its size - 1
+        bool empty = true;       // no spot on the layer, no table
     };
     struct Scratch;
 
@@ -91,7 +98,7 @@ private:
     void addSpot(std::uint32_t symbol, std::int32_t layer, const zvdb::Point3& p,
                  std::string_view connection);
     std::uint64_t cellKey(long long x, long long y) const;
-    static std::size_t slotOf(std::int32_t layer, std::uint64_t cell);
+    static std::size_t slotOf(std::uint64_t cell);
     const CellRun* run(std::int32_t layer, std::uint64_t cell) const;
     void buildGrid();
     void sortLines();
@@ -107,7 +114,8 @@ private:
     std::int32_t lastLayerId_ = -1;
     std::vector<Symbol> symbols_;
     std::vector<Spot> spots_;
-    std::vector<CellRun> grid_;  // a power of two long
+    std::vector<CellRun> grid_;
+    std::vector<LayerCells> layerCells_;  // by layer id
     std::vector<Line> wireLines_, leadLines_, blindLines_;
 };
 

@@ -11,23 +11,32 @@ namespace zvproduct {
 void WireListIndex::rebuild(zvdb::Database& database) {
     firsts_.clear();
     byLayer_.clear();
-    std::unordered_map<std::string, std::uint32_t> rankOf;
+    // numbers and layers as views into the drawing, which holds still while this runs
+    std::unordered_map<std::string_view, std::uint32_t> rankOf;
     std::vector<std::uint32_t> placesSeen;  // polylines met so far, by wire rank
+    // polylines come page by page: the last layer's entries serve the next polyline
+    std::string_view lastLayer;
+    std::vector<OnLayer>* onLayer = nullptr;
     for (zvdb::Polyline* polyline :
          ConnectionFinder::polylinesInPageOrder(database, "KVR_ZV_WIRE")) {
-        const std::string number = ConnectionFinder::wireNumber(*polyline);
+        const std::string_view number = ConnectionFinder::wireNumber(*polyline);
         if (number.empty()) continue;  // an unnumbered wire is no wire of the lists
-        const auto [it, added] = rankOf.emplace(number, static_cast<std::uint32_t>(firsts_.size()));
+        const auto [it, added] =
+            rankOf.try_emplace(number, static_cast<std::uint32_t>(firsts_.size()));
         if (added) {
             firsts_.push_back(polyline->handle());
             placesSeen.push_back(0);
         }
         const std::uint32_t wire = it->second;
         const std::uint32_t place = placesSeen[wire]++;
-        std::vector<OnLayer>& onLayer = byLayer_[std::string(polyline->layer())];
+        const std::string_view layer = polyline->layer();
+        if (!onLayer || layer != lastLayer) {
+            onLayer = &byLayer_[std::string(layer)];
+            lastLayer = layer;
+        }
         // polylines come in page order, so a wire's first one on this layer is the one kept
-        if (onLayer.empty() || onLayer.back().wire != wire)
-            onLayer.push_back({wire, place, polyline->handle()});
+        if (onLayer->empty() || onLayer->back().wire != wire)
+            onLayer->push_back({wire, place, polyline->handle()});
     }
     // within a layer a wire can come back after others; the later entries only repeat it
     for (auto& [layer, entries] : byLayer_) {

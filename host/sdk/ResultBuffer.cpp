@@ -1,5 +1,7 @@
 #include "ResultBuffer.h"
+#include "NodeChains.h"
 
+#include <algorithm>
 #include <atomic>
 #include <new>
 
@@ -20,8 +22,9 @@ struct Block {
 
 std::atomic<std::size_t> blocksInUse{0};
 
-void drop(Block* block) {
-    if (block->live.fetch_sub(1, std::memory_order_acq_rel) != 1) return;
+// `count` of the block's nodes (or its taking new ones) are done with.
+void drop(Block* block, std::uint32_t count = 1) {
+    if (block->live.fetch_sub(count, std::memory_order_acq_rel) != count) return;
     delete block;
     blocksInUse.fetch_sub(1, std::memory_order_relaxed);
 }
@@ -40,7 +43,8 @@ thread_local Current current;
 }  // namespace
 
 struct NodeBlocks {
-    static ResultBuffer* make() {
+    // The thread's block with room for a node.
+    static Current& room() {
         Current& to = current;
         if (!to.block || to.next == kNodes) {
             auto* block = new Block;
@@ -49,23 +53,70 @@ struct NodeBlocks {
             to.block = block;
             to.next = 0;
         }
+        return to;
+    }
+
+    static ResultBuffer* place(Current& to) {
         auto* node = new (to.block->storage + to.next * sizeof(ResultBuffer)) ResultBuffer;
         node->place.index_ = ++to.next;
-        to.block->live.fetch_add(1, std::memory_order_relaxed);
         return node;
     }
 
-    static void free(ResultBuffer* node) {
-        const std::uint16_t index = node->place.index_;
-        if (index == 0) {
-            delete node;
-            return;
+    static ResultBuffer* make() {
+        Current& to = room();
+        to.block->live.fetch_add(1, std::memory_order_relaxed);
+        return place(to);
+    }
+
+    // A block's worth of nodes at a time, each block counted once.
+    static ResultBuffer* makeChain(std::size_t count) {
+        ResultBuffer* head = nullptr;
+        ResultBuffer** tail = &head;
+        while (count > 0) {
+            Current& to = room();
+            const auto some =
+                static_cast<std::uint16_t>(std::min<std::size_t>(count, kNodes - to.next));
+            to.block->live.fetch_add(some, std::memory_order_relaxed);
+            for (std::uint16_t i = 0; i < some; ++i) {
+                *tail = place(to);
+                tail = &(*tail)->rbnext;
+            }
+            count -= some;
         }
+        return head;
+    }
+
+    // The block a node was made in; null for a node of its own.
+    static Block* blockOf(const ResultBuffer* node) {
+        const std::uint16_t index = node->place.index_;
+        if (index == 0) return nullptr;
         // the storage opens the block
-        auto* block = reinterpret_cast<Block*>(reinterpret_cast<unsigned char*>(node) -
-                                               (index - 1) * sizeof(ResultBuffer));
-        node->~ResultBuffer();
-        drop(block);
+        return reinterpret_cast<Block*>(const_cast<unsigned char*>(
+            reinterpret_cast<const unsigned char*>(node) - (index - 1) * sizeof(ResultBuffer)));
+    }
+
+    // Neighbours in a chain are mostly neighbours in a block: a run of them is counted off
+    // the block at once.
+    static void freeChain(ResultBuffer* chain) {
+        Block* run = nullptr;
+        std::uint32_t inRun = 0;
+        while (chain) {
+            ResultBuffer* next = chain->rbnext;
+            Block* block = blockOf(chain);
+            if (!block) {
+                delete chain;
+            } else {
+                chain->~ResultBuffer();
+                if (block != run) {
+                    if (run) drop(run, inRun);
+                    run = block;
+                    inRun = 0;
+                }
+                ++inRun;
+            }
+            chain = next;
+        }
+        if (run) drop(run, inRun);
     }
 };
 
@@ -113,12 +164,12 @@ ResultBuffer* newPoint(double x, double y, double z, bool threeD) {
     return node;
 }
 
+ResultBuffer* newChain(std::size_t count) {
+    return NodeBlocks::makeChain(count);
+}
+
 void releaseChain(ResultBuffer* chain) {
-    while (chain) {
-        ResultBuffer* next = chain->rbnext;
-        NodeBlocks::free(chain);
-        chain = next;
-    }
+    NodeBlocks::freeChain(chain);
 }
 
 ResultBuffer* copyChain(const ResultBuffer* chain) {

@@ -11,6 +11,7 @@
 #include "product/ProductContext.h"
 #include "product/ProductLisp.h"
 #include "sample/ProjectGenerator.h"
+#include "sdk/NodeChains.h"
 #include "sdk/ResultBuffer.h"
 
 #include <algorithm>
@@ -177,6 +178,46 @@ TEST(ResultBufferBlocks, BlocksGoWithTheirLastNodeInAnyOrderAndFromAnyThread) {
     }).join();
     EXPECT_EQ(zvsdk::nodeBlocksInUse(), here + 2);
     zvsdk::releaseChain(chain);
+    EXPECT_EQ(zvsdk::nodeBlocksInUse(), here);
+}
+
+TEST(ResultBufferBlocks, AChainMadeAtOnceSpansBlocksAndGoesInAnyPieces) {
+    const std::size_t here = zvsdk::nodeBlocksInUse();
+    ResultBuffer* chain = nullptr;
+    // a thread of its own starts with no block: 2500 nodes take three
+    std::thread([&chain] { chain = zvsdk::newChain(2500); }).join();
+    EXPECT_EQ(zvsdk::nodeBlocksInUse(), here + 3);
+    std::vector<ResultBuffer*> nodes;
+    for (ResultBuffer* node = chain; node; node = node->rbnext)
+        nodes.push_back(node);
+    ASSERT_EQ(nodes.size(), 2500u);
+    EXPECT_EQ(nodes[1234]->restype, zvsdk::RTNONE);
+    EXPECT_TRUE(nodes[1234]->rstring.isNull());
+    EXPECT_EQ(nodes[2499]->rpoint[2], 0.0);
+    nodes[6]->rstring = QStringLiteral("freed with its node");
+    auto relink = [](std::vector<ResultBuffer*> piece) {
+        for (std::size_t i = 0; i < piece.size(); ++i)
+            piece[i]->rbnext = i + 1 < piece.size() ? piece[i + 1] : nullptr;
+        zvsdk::releaseChain(piece.front());
+    };
+    // The even nodes of the first two blocks shuffled, with a node of its own among them:
+    // the block changes at nearly every node, and none of the blocks is done with.
+    std::vector<ResultBuffer*> even, odd, last;
+    for (std::size_t i = 0; i < 2048; ++i)
+        (i % 2 ? odd : even).push_back(nodes[i]);
+    last.assign(nodes.begin() + 2048, nodes.end());
+    std::shuffle(even.begin(), even.end(), std::mt19937(3));
+    auto* own = new ResultBuffer;
+    own->restype = zvsdk::RTSTR;
+    own->rstring = QStringLiteral("own");
+    even.insert(even.begin() + 100, own);
+    relink(even);
+    EXPECT_EQ(zvsdk::nodeBlocksInUse(), here + 3);
+    // the odd ones backwards: the first two blocks go
+    std::reverse(odd.begin(), odd.end());
+    relink(odd);
+    EXPECT_EQ(zvsdk::nodeBlocksInUse(), here + 1);
+    relink(last);
     EXPECT_EQ(zvsdk::nodeBlocksInUse(), here);
 }
 

@@ -89,6 +89,57 @@ TEST_F(ConnectionsTest, CableLeadWithBlindConnectionOnTheNextPage) {
     EXPECT_EQ(show("(getFiosPorLayer \"ESQ$0001$A\")"), "(\"" + hex(lead) + "\")");
 }
 
+TEST_F(ConnectionsTest, CablesAmongEachOtherKeepTheirLeadsAndBlindConnectionsInOrder) {
+    const std::string path[] = {"ZV_CABOS"};
+    auto makeCable = [&](const std::string& name) {
+        auto* cable = database->dictionaryAt(path, true)->getOrCreateXRecord(name);
+        cable->setData(zvsample::XDataItems().add(1, name).tags());
+        cable->setXData("KVR_ZV_ATT_VIRTUAL",
+                        zvsample::XDataItems().text("CABO\f" + name + "\fN").tags());
+        return cable;
+    };
+    auto addLead = [&](zvdb::DbObject* cable, const std::string& layer, double x) {
+        auto* lead = database->modelSpace()->addLwPolyline({{x, 90, 0}, {x, 10, 0}}, false, layer);
+        lead->setXData("KVR_ZV_CABO",
+                       zvsample::XDataItems().text("20001\f1").handle(cable->handle()).tags());
+        return lead;
+    };
+    auto addBlind = [&](zvdb::Polyline* lead, const std::string& layer, double x) {
+        auto* blind = database->modelSpace()->addLwPolyline({{0, 0, 0}, {x, 10, 0}}, false, layer);
+        blind->setXData("KVR_ZV_CONEX_BLIND",
+                        zvsample::XDataItems().text("W").handle(lead->handle()).tags());
+    };
+    zvdb::DbObject* w1 = makeCable("W1");
+    zvdb::DbObject* w2 = makeCable("W2");
+    std::vector<std::uint64_t> at;  // terminals at the leads' first ends, then the blinds'
+    for (double x : {100.0, 200.0, 300.0})
+        at.push_back(terminal("ESQ$0001$A", {x, 100, 0}, "X5", "1")->handle());
+    for (double x : {100.0, 200.0, 300.0})
+        at.push_back(terminal("ESQ$0002$A", {x, 20, 0}, "X5", "2")->handle());
+    auto* second = addLead(w1, "ESQ$0001$A", 300);
+    auto* other = addLead(w2, "ESQ$0001$A", 200);
+    auto* first = addLead(w1, "ESQ$0001$A", 100);
+    // blinds drawn in another order than their leads, two for the second lead
+    addBlind(second, "ESQ$0002$A", 300);
+    addBlind(other, "ESQ$0002$A", 200);
+    addBlind(first, "ESQ$0002$A", 100);
+    addBlind(second, "ESQ$0002$A", 200);
+    const std::vector<WireConnections> cables = ConnectionFinder(*database, 0.1).cables();
+    ASSERT_EQ(cables.size(), 2u);
+    EXPECT_EQ(cables[0].number, "W1\f20001");
+    EXPECT_EQ(cables[1].number, "W2\f20001");
+    EXPECT_EQ(cables[0].polylines, (std::vector<std::uint64_t>{second->handle(), first->handle()}));
+    EXPECT_EQ(cables[1].polylines, std::vector<std::uint64_t>{other->handle()});
+    auto symbols = [](const WireConnections& cable) {
+        std::vector<std::uint64_t> found;
+        for (const Touch& touch : cable.touches)
+            found.push_back(touch.symbol);
+        return found;
+    };
+    EXPECT_EQ(symbols(cables[0]), (std::vector<std::uint64_t>{at[2], at[5], at[4], at[0], at[3]}));
+    EXPECT_EQ(symbols(cables[1]), (std::vector<std::uint64_t>{at[1], at[4]}));
+}
+
 TEST_F(ConnectionsTest, LeadsOfOneCableAndPolylinesOfOneWireMakeOneEntryEach) {
     auto* a = terminal("ESQ$0001$A", {100, 100, 0}, "X3", "1");
     auto* b = terminal("ESQ$0001$A", {200, 100, 0}, "X3", "2");
@@ -112,6 +163,41 @@ TEST_F(ConnectionsTest, LeadsOfOneCableAndPolylinesOfOneWireMakeOneEntryEach) {
     EXPECT_EQ(show("(mapcar 'car (getConexoesTodosFios))"), "(\"301\" \"302\")");
 }
 
+TEST_F(ConnectionsTest, AWiresPolylinesAmongOtherWiresMakeOneEntryInPageOrder) {
+    auto* onTwo = terminal("ESQ$0002$A", {100, 200, 0}, "X1", "3");
+    auto* later = wire("ESQ$0002$A", {{100, 190, 0}, {100, 150, 0}}, "401");  // drawn first
+    auto* other = terminal("ESQ$0001$A", {200, 200, 0}, "X1", "2");
+    auto* between = wire("ESQ$0001$A", {{200, 190, 0}, {200, 150, 0}}, "402");
+    auto* onOne = terminal("ESQ$0001$A", {100, 200, 0}, "X1", "1");
+    auto* first = wire("ESQ$0001$A", {{100, 150, 0}, {100, 190, 0}}, "401");
+    wire("ESQ$0001$A", {{300, 190, 0}, {300, 150, 0}}, "403");
+    const std::vector<WireConnections> wires = ConnectionFinder(*database, 0.1).wires();
+    ASSERT_EQ(wires.size(), 3u);
+    EXPECT_EQ(wires[0].number, "402");
+    EXPECT_EQ(wires[1].number, "401");
+    EXPECT_EQ(wires[2].number, "403");
+    EXPECT_EQ(wires[1].polylines, (std::vector<std::uint64_t>{first->handle(), later->handle()}));
+    EXPECT_EQ(wires[0].polylines, std::vector<std::uint64_t>{between->handle()});
+    ASSERT_EQ(wires[1].touches.size(), 2u);
+    EXPECT_EQ(wires[1].touches[0].symbol, onOne->handle());
+    EXPECT_EQ(wires[1].touches[1].symbol, onTwo->handle());
+    ASSERT_EQ(wires[0].touches.size(), 1u);
+    EXPECT_EQ(wires[0].touches[0].symbol, other->handle());
+    EXPECT_EQ(wires[0].touches[0].point, (zvdb::Point3{200, 190, 0}));
+    EXPECT_TRUE(wires[2].touches.empty());
+}
+
+TEST_F(ConnectionsTest, PolylinesInPageOrderThenByHandleAndOffThePagesLast) {
+    auto* second = wire("ESQ$0002$A", {{0, 0, 0}, {10, 0, 0}}, "501");
+    auto* off = wire("OUTRO", {{0, 0, 0}, {10, 0, 0}}, "502");
+    auto* first = wire("ESQ$0001$A", {{0, 0, 0}, {10, 0, 0}}, "503");
+    database->modelSpace()->addLwPolyline({{0, 0, 0}, {5, 5, 0}}, false, "ESQ$0001$A");
+    auto* secondToo = wire("ESQ$0002$A", {{0, 5, 0}, {10, 5, 0}}, "504");
+    auto* firstToo = wire("ESQ$0001$A", {{0, 5, 0}, {10, 5, 0}}, "505");
+    const std::vector<zvdb::Polyline*> expected = {first, firstToo, second, secondToo, off};
+    EXPECT_EQ(ConnectionFinder::polylinesInPageOrder(*database, "KVR_ZV_WIRE"), expected);
+}
+
 TEST_F(ConnectionsTest, WireListsByPage) {
     terminal("ESQ$0001$A", {100, 200, 0}, "X1", "1");
     auto* one = wire("ESQ$0001$A", {{100, 190, 0}, {100, 150, 0}}, "201");
@@ -129,6 +215,18 @@ TEST_F(ConnectionsTest, WireListsByPage) {
     oneOnTwo->erase();
     EXPECT_EQ(show("(getFiosPorLayer \"ESQ$0002$A\")"),
               "(\"" + hex(two) + "\" \"" + hex(three) + "\")");
+}
+
+TEST_F(ConnectionsTest, WireListsOfLayersOffThePagesWhosePolylinesAlternate) {
+    // off the pages the polylines go by handle alone, so their layers take turns
+    auto* one = wire("OFF1", {{0, 0, 0}, {10, 0, 0}}, "601");
+    auto* two = wire("OFF2", {{0, 0, 0}, {10, 0, 0}}, "602");
+    auto* three = wire("OFF1", {{0, 5, 0}, {10, 5, 0}}, "603");
+    auto* oneAgain = wire("OFF2", {{0, 5, 0}, {10, 5, 0}}, "601");
+    EXPECT_EQ(show("(getListaFiosProj \"proj.dxf\" \"OFF1\")"),
+              "(\"" + hex(one) + "\" \"" + hex(three) + "\")");
+    EXPECT_EQ(show("(getListaFiosProj \"proj.dxf\" \"OFF2\")"),
+              "(\"" + hex(oneAgain) + "\" \"" + hex(two) + "\")");
 }
 
 TEST_F(ConnectionsTest, WireHandlesAreUpperCaseHexadecimalTexts) {
