@@ -429,8 +429,8 @@ TEST_F(ModeloReguasTest, DetailRunsCloseWhereAFieldChangesWithTheLastTerminalsFi
     const auto& detalhes = modelo.reguas[0]->detalhes;
     QStringList runs;
     for (const CEDetalheReguaDwg& d : detalhes)
-        runs << QString::number(d.quantidade) + "/" + d.campos.value("NUMERO") + "/" +
-                    d.campos.value("RELACAO_INI");
+        runs << QString::number(d.quantidade) + "/" + d.ultimo->valorCampo("NUMERO") + "/" +
+                    d.ultimo->valorCampo("RELACAO_INI");
     EXPECT_EQ(runs, QStringList({"2/2/K1", "1/3/K2", "2/5/", "1/6/K1"}));
     // Without fields the whole strip is one run.
     modelo.CalculaDetalhes({});
