@@ -212,6 +212,9 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
         if (!tipo || tipo->isEmpty()) {
             const bool borne = !item->ids.empty() && CICad::EhReferencia(item->ids.front()) &&
                                EhBorne(CICad::GetNomeBloco(item->ids.front()));
+            // A component's array was made to measure when it was kept: it grows by exactly
+            // the kind, its fields moved once, not to twice its size and back.
+            if (!borne && !tipo) item->campos.reservar(size_t(item->campos.size()) + 1);
             item->definirCampo(tipoCampo, borne ? kBorne : kComp);
             // A component is complete with its kind: the room the kind's field grew goes.
             if (borne)
