@@ -212,9 +212,10 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
         if (!tipo || tipo->isEmpty()) {
             const bool borne = !item->ids.empty() && CICad::EhReferencia(item->ids.front()) &&
                                EhBorne(CICad::GetNomeBloco(item->ids.front()));
-            // A component's array was made to measure when it was kept: it grows by exactly
-            // the kind, its fields moved once, not to twice its size and back.
-            if (!borne && !tipo) item->campos.reservar(size_t(item->campos.size()) + 1);
+            // An array made to measure when its item was kept grows by exactly the kind, its
+            // fields moved once, not to twice its size and back; a terminal's grows with its
+            // sides below.
+            if (!tipo) item->campos.reservar(size_t(item->campos.size()) + 1);
             item->definirCampo(tipoCampo, borne ? kBorne : kComp);
             // A component is complete with its kind: the room the kind's field grew goes.
             if (borne)
@@ -233,9 +234,14 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
         itens.push_back(item);
     }
     resultado_.clear();
+    // Terminals read alike hold about as many fields once their sides are read: room for as
+    // many as the terminal before held moves a terminal's fields once, not at each doubling.
+    size_t medida = 0;
     for (CEItemLista* borne : bornes) {
+        if (size_t(borne->campos.size()) < medida) borne->campos.reservar(medida);
         AoLigarInicio(*borne, borne->ids.front(), &modelo);
         AoLigarFim(*borne, borne->ids.front(), &modelo);
+        medida = size_t(borne->campos.size());
         // The sides were the terminal's last fields: the room their growth left goes.
         PartilhaNomes(*borne);
     }
