@@ -160,9 +160,8 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
     bornesPorChave.reserve(int(terminais.size()));
     for (CEItemLista* item : terminais) {
         const QString nome = CCBorneDataReader::Regua(*item);
-        ChaveBorne chave{nome, CCBorneDataReader::Numero(*item)};
         // The first of a strip and number wins.
-        CEBorneDwg*& doNumero = bornesPorChave[std::move(chave)];
+        CEBorneDwg*& doNumero = bornesPorChave[ChaveBorne{nome, CCBorneDataReader::Numero(*item)}];
         if (doNumero) continue;
         CEBorneDwg* const borne = &bornes.emplace_back(item);
         doNumero = borne;
