@@ -345,26 +345,40 @@ const NomesBorne& Nomes() {
     return nomes;
 }
 
-// The first item of each strip and number, per language, for the jumper look-ups.
+// The first item of each strip and number, per language, for the jumper look-ups. A key is
+// the two texts as the items hold them, shared: no text is joined per terminal.
 class IndiceBornes {
 public:
     explicit IndiceBornes(const VetorItens& itens) {
-        for (int i = 0; i < 3; ++i)
+        for (int i = 0; i < 3; ++i) {
+            regua_[i] = CamposItem::numeroSeHouver(Nomes().reguas[i]);
+            numero_[i] = CamposItem::numeroSeHouver(Nomes().numeros[i]);
             indice_[i].reserve(itens.size());
+        }
         for (CEItemLista* item : itens)
             for (int i = 0; item && i < 3; ++i)
-                indice_[i].insert({Chave(*item, i, item->valorCampo(Nomes().numeros[i])), item});
+                indice_[i].insert({{Valor(*item, regua_[i]), Valor(*item, numero_[i])}, item});
     }
     CEItemLista* Busca(const CEItemLista& de, int idioma, const QString& numero) const {
-        auto it = indice_[idioma].find(Chave(de, idioma, numero));
+        auto it = indice_[idioma].find({Valor(de, regua_[idioma]), numero});
         return it == indice_[idioma].end() ? nullptr : it->second;
     }
 
 private:
-    static QString Chave(const CEItemLista& item, int idioma, const QString& numero) {
-        return item.valorCampo(Nomes().reguas[idioma]) + QChar(0x1F) + numero;
+    struct Chave {
+        QString regua, numero;
+        bool operator==(const Chave&) const = default;
+    };
+    struct HashChave {
+        size_t operator()(const Chave& c) const { return qHash(c.numero, qHash(c.regua)); }
+    };
+    // The item's value under the name's number; empty when it has none.
+    static QString Valor(const CEItemLista& item, std::uint32_t nome) {
+        const QString* valor = nome == CamposItem::kSemNome ? nullptr : item.campos.procura(nome);
+        return valor ? *valor : QString();
     }
-    std::unordered_map<QString, CEItemLista*> indice_[3];
+    std::uint32_t regua_[3], numero_[3];
+    std::unordered_map<Chave, CEItemLista*, HashChave> indice_[3];
 };
 
 // The terminals bridged to `inicio`, followed through their own jumper texts, depth first.

@@ -212,6 +212,10 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
         if (!tipo || tipo->isEmpty()) {
             const bool borne = !item->ids.empty() && CICad::EhReferencia(item->ids.front()) &&
                                EhBorne(CICad::GetNomeBloco(item->ids.front()));
+            // An array made to measure when its item was kept grows by exactly the kind, its
+            // fields moved once, not to twice its size and back; a terminal's grows with its
+            // sides below.
+            if (!tipo) item->campos.reservar(size_t(item->campos.size()) + 1);
             item->definirCampo(tipoCampo, borne ? kBorne : kComp);
             // A component is complete with its kind: the room the kind's field grew goes.
             if (borne)
@@ -230,9 +234,14 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
         itens.push_back(item);
     }
     resultado_.clear();
+    // Terminals read alike hold about as many fields once their sides are read: room for as
+    // many as the terminal before held moves a terminal's fields once, not at each doubling.
+    size_t medida = 0;
     for (CEItemLista* borne : bornes) {
+        if (size_t(borne->campos.size()) < medida) borne->campos.reservar(medida);
         AoLigarInicio(*borne, borne->ids.front(), &modelo);
         AoLigarFim(*borne, borne->ids.front(), &modelo);
+        medida = size_t(borne->campos.size());
         // The sides were the terminal's last fields: the room their growth left goes.
         PartilhaNomes(*borne);
     }
@@ -309,8 +318,13 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
                          kEquipo = QStringLiteral("KVR_ZV_EQUIPO");
     const QString& sufixo = inicio == invertido ? kIni : kFim;
     const QString& segundo = inicio == invertido ? kSegFim : kSegIni;
-    const QString proprio = ZVString::DeHandle(entidade.handle());
     const bool doBorne = !item.ids.empty() && item.ids.front() == entidade;
+    // The terminal's own handle: a terminal's side asks for it only at an equipment.
+    std::optional<QString> handleProprio;
+    const auto proprio = [&]() -> const QString& {
+        if (!handleProprio) handleProprio = ZVString::DeHandle(entidade.handle());
+        return *handleProprio;
+    };
 
     CEPonto ponto, outro;
     QString fio, conectado;
@@ -331,7 +345,7 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
         const auto elementos = ListaConexoes(fio);
         const CEPonto p = CICad::GetPosicao(entidade);
         const CEPonto q = PontoDeCorte(entidade);
-        ponto = elementos && elementos->contains(proprio) ? PontoDaConexao(fio, proprio) : p;
+        ponto = elementos && elementos->contains(proprio()) ? PontoDaConexao(fio, proprio()) : p;
         const auto distancia = [](const CEPonto& a, const CEPonto& b) {
             return std::hypot(a.x - b.x, a.y - b.y, a.z - b.z);
         };
@@ -345,7 +359,7 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
         const std::unique_ptr<zv::CEAtributo> propria = AtributoConexaoProximo(entidade, ponto);
         if (propria && !propria->GetValor().isEmpty()) {
             const QString achado =
-                VizinhoPorLigacao(fio, proprio, propria->GetValor(), doBorne ? !inicio : true);
+                VizinhoPorLigacao(fio, proprio(), propria->GetValor(), doBorne ? !inicio : true);
             if (!achado.isEmpty()) conectado = achado;
         }
     }
@@ -359,9 +373,10 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
             item.definirCampo(nome.ParaDefinir(), QString());
         CopiaAtributos(sufixo, item, conectado);
         // After the copy: an element it read for the first time lends its attributes to
-        // the connection's question.
-        const std::unique_ptr<zv::CEAtributo> atributo =
-            AtributoConexaoProximo(objeto, PontoDaConexao(fio, conectado));
+        // the connection's question. A terminal's side found the element's point already.
+        const bool mesmoVizinho = lado && conectado == lado->vizinho;
+        const std::unique_ptr<zv::CEAtributo> atributo = AtributoConexaoProximo(
+            objeto, mesmoVizinho ? lado->pontoElemento : PontoDaConexao(fio, conectado));
         if (atributo) ligacao = atributo->GetValor();
     }
     // The wire at the terminal's other point; a terminal's side reads the wires of both its
@@ -378,7 +393,7 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
             CopiaAtributos(segundo, item, ZVString::DeHandle(fioOutro.handle()));
     }
     // The terminal's side names the element by the handle its fields came from.
-    CompoeRelacao(sufixo, item, modelo, ligacao, doBorne ? QString() : proprio);
+    CompoeRelacao(sufixo, item, modelo, ligacao, doBorne ? QString() : proprio());
 }
 
 void CCExportDataReader::CopiaAtributos(const QString& sufixo, CEItemLista& item,

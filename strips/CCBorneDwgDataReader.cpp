@@ -13,15 +13,6 @@
 
 namespace {
 
-QString Chave(const QString& regua, const QString& numero) {
-    QString chave;
-    chave.reserve(regua.size() + numero.size() + 1);
-    chave += regua;
-    chave += QLatin1Char('\n');
-    chave += numero;
-    return chave;
-}
-
 // The strip and number fields of the three languages, made once: every terminal asks.
 struct CamposRegua {
     std::array<QString, 3> reguas, numeros;
@@ -48,20 +39,21 @@ const QString& Valor(const CEItemLista& item, const QString& campo) {
 
 }  // namespace
 
-QSet<QString> CCBorneDwgDataReader::ChavesBornes(const VetorItens& bornes) {
+QSet<CEModeloReguas::ChaveBorne> CCBorneDwgDataReader::ChavesBornes(const VetorItens& bornes) {
     const CamposRegua& campos = Campos();
-    QSet<QString> chaves;
+    QSet<CEModeloReguas::ChaveBorne> chaves;
     chaves.reserve(int(bornes.size()));
     for (const CEItemLista* borne : bornes)
         for (size_t i = 0; i < 3; ++i) {
             const QString& regua = Valor(*borne, campos.reguas[i]);
             const QString& numero = Valor(*borne, campos.numeros[i]);
-            if (!regua.isEmpty() && !numero.isEmpty()) chaves.insert(Chave(regua, numero));
+            if (!regua.isEmpty() && !numero.isEmpty()) chaves.insert({regua, numero});
         }
     return chaves;
 }
 
-bool CCBorneDwgDataReader::Ligado(const CEItemLista& borne, const QSet<QString>& bornes) {
+bool CCBorneDwgDataReader::Ligado(const CEItemLista& borne,
+                                  const QSet<CEModeloReguas::ChaveBorne>& bornes) {
     static const QString kRelacaoIni = QStringLiteral("RELACAO_INI"),
                          kRelacaoFim = QStringLiteral("RELACAO_FIM"),
                          kJumper = QStringLiteral("JUMPER");
@@ -74,7 +66,7 @@ bool CCBorneDwgDataReader::Ligado(const CEItemLista& borne, const QSet<QString>&
         const QString& regua = Valor(borne, campos.reguas[i]);
         if (regua.isEmpty()) continue;
         for (const QString& numero : numeros)
-            if (bornes.contains(Chave(regua, numero.trimmed()))) return true;
+            if (bornes.contains(CEModeloReguas::ChaveBorne{regua, numero.trimmed()})) return true;
     }
     return false;
 }
@@ -98,21 +90,13 @@ VetorItens* CCBorneDwgDataReader::LerDados(zvdb::Database* database,
         if (*tipo == kComp) componentes.push_back(item);
         if (*tipo == kBorne) bornes.push_back(item);
     }
-    if (!modelo.LerTexto("*FILTRO_TEMPLATE*").isEmpty()) {
-        VetorItens ficam;
-        const std::uint32_t listaCampo = NumeroCampo<"ZV_LISTA">();
-        for (CEItemLista* item : componentes) {
-            if (!modelo.FiltraItem(*item)) continue;
-            const QString* lista = item->campos.procura(listaCampo);
-            if (!lista || *lista != QLatin1String("N")) ficam.push_back(item);
-        }
-        componentes = std::move(ficam);
-    }
+    // The components need no filter of their own here: the export read asked the
+    // template's filter of every symbol as it read it, and kept listed symbols only.
     // A cancelled strip picker draws no terminal.
     if (CICad::GetBoolLisp("*SEL_REGUA_BORNE_CFG*"))
         bornes = CCBorneDataReader::SelecionaReguas(bornes);
     if (!CICad::GetBoolLisp("*BORNES_SEM_LIG_GRX*")) {
-        const QSet<QString> chaves = ChavesBornes(bornes);
+        const QSet<CEModeloReguas::ChaveBorne> chaves = ChavesBornes(bornes);
         VetorItens ficam;
         for (CEItemLista* borne : bornes)
             if (Ligado(*borne, chaves)) ficam.push_back(borne);

@@ -2,6 +2,7 @@
 // The strip drawing's reader: the export reader's components and terminals, with the
 // drawing's own filters on top: components the template refuses, terminals of strips the
 // user did not pick, and terminals with nothing wired and no jumper on their strip go.
+#include "CEModeloReguas.h"
 #include "readers/CCExportDataReader.h"
 
 class CCBorneDwgDataReader : public CCExportDataReader {
@@ -19,7 +20,7 @@ public:
 
     // True when the terminal has a wire on a side, or a jumper to a number of its strip
     // among `bornes` (strip and number in any of the three languages).
-    static bool Ligado(const CEItemLista& borne, const QSet<QString>& bornes);
-    // "strip\nnumber" keys of the terminals, one for each language that gives both.
-    static QSet<QString> ChavesBornes(const VetorItens& bornes);
+    static bool Ligado(const CEItemLista& borne, const QSet<CEModeloReguas::ChaveBorne>& bornes);
+    // The strip and number of the terminals, one key for each language that gives both.
+    static QSet<CEModeloReguas::ChaveBorne> ChavesBornes(const VetorItens& bornes);
 };

@@ -70,6 +70,25 @@ OdDbObjectId CCBorneDwgWriter::InserePreenchido(const Bloco& bloco, const QStrin
                                });
 }
 
+void CCBorneDwgWriter::InsereDetalhe(const CEDetalheReguaDwg& detalhe, const QString& layer,
+                                     double x, double y) {
+    // The run's last terminal lends its fields to an item of no entity while the block goes
+    // in (its functions see no entity), and takes them back, even when the insertion throws.
+    struct Emprestimo {
+        CEItemLista* dono;
+        CEItemLista campos;
+        explicit Emprestimo(CEItemLista* d) : dono(d) {
+            if (dono) std::swap(campos.campos, dono->campos);
+        }
+        ~Emprestimo() {
+            if (dono) std::swap(campos.campos, dono->campos);
+        }
+        Emprestimo(const Emprestimo&) = delete;
+        Emprestimo& operator=(const Emprestimo&) = delete;
+    } emprestimo(detalhe.ultimo);
+    InserePreenchido(detalhe_, layer, x, y, emprestimo.campos);
+}
+
 void CCBorneDwgWriter::DesenhaRegua(CEReguaDwg& regua, const QString& layer) {
     const OdDbObjectId cabecalho = Insere(regua_, layer, regua.x, regua.y);
     if (!cabecalho.isNull())
@@ -82,12 +101,7 @@ void CCBorneDwgWriter::DesenhaRegua(CEReguaDwg& regua, const QString& layer) {
     int contagem = 0;
     for (CEDetalheReguaDwg& detalhe : regua.detalhes) {
         const double k = detalhe.quantidade;
-        // The run's fields lend themselves to an item of no entity while its block goes in,
-        // and go back to the run.
-        CEItemLista campos;
-        std::swap(campos.campos, detalhe.campos);
-        InserePreenchido(detalhe_, layer, c + k * passo_ * 0.5 - passo_ * 0.5, regua.y, campos);
-        std::swap(campos.campos, detalhe.campos);
+        InsereDetalhe(detalhe, layer, c + k * passo_ * 0.5 - passo_ * 0.5, regua.y);
         contagem += detalhe.quantidade;
         if (contagem < limite) Insere(traco_, layer, c + k * passo_ - passo_ * 0.5, regua.y);
         c += k * passo_;

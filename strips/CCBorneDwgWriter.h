@@ -46,6 +46,8 @@ private:
     Bloco BlocoSimbolo(const CEItemLista& item);
     OdDbObjectId Insere(const Bloco& bloco, const QString& layer, double x, double y);
     void DesenhaRegua(CEReguaDwg& regua, const QString& layer);
+    // A run's detail block, filled from the run's last terminal.
+    void InsereDetalhe(const CEDetalheReguaDwg& detalhe, const QString& layer, double x, double y);
     void DesenhaSemBorne(const std::vector<CESimboloDwg*>& simbolos, const QString& layer);
     // The block placed with its attributes filled from the item: functions evaluated with
     // the item's fields, VARIAVEL cells from the field their text names, any other from the

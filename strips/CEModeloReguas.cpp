@@ -14,8 +14,6 @@
 
 namespace {
 
-constexpr QChar kSeparador(0x000C);
-
 // The numbers of the names, each looked up once for a pass over the strips; a name no item
 // has stays kSemNome, and every item holds it empty.
 std::vector<std::uint32_t> Numeros(const QStringList& campos) {
@@ -109,12 +107,13 @@ CEModeloReguas::Parametros CEModeloReguas::Parametros::DoModelo(CETemplate& mode
     return p;
 }
 
-QString CEModeloReguas::Chave(const QString& regua, const QString& numero) {
-    return regua + kSeparador + numero;
+uint qHash(const CEModeloReguas::ChaveBorne& chave, uint semente) {
+    // The strip's hash seeds the number's.
+    return qHash(chave.numero, qHash(chave.regua, semente));
 }
 
 CEBorneDwg* CEModeloReguas::Borne(const QString& regua, const QString& numero) const {
-    return bornesPorChave.value(Chave(regua, numero));
+    return bornesPorChave.value(ChaveBorne{regua, numero});
 }
 
 void CEModeloReguas::Monta(const VetorItens& itens, const Parametros& p) {
@@ -141,15 +140,13 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
             terminais.push_back(item);
     }
     componentes.ordenar({"RELACAO", "TAG", "ETIQUETA"});
-    simbolos.reserve(simbolos.size() + componentes.size());
     simbolosPorHandle.reserve(int(componentes.size()));
     for (CEItemLista* item : componentes) {
-        simbolos.push_back(std::make_unique<CESimboloDwg>(item));
+        CESimboloDwg& simbolo = simbolos.emplace_back(item);
         // The first symbol of a handle keeps it.
         const QString* handle = item->campos.procura(NumeroCampo<"HANDLE">());
         const QString& texto = handle ? *handle : kSemValor;
-        if (!simbolosPorHandle.contains(texto))
-            simbolosPorHandle.insert(texto, simbolos.back().get());
+        if (!simbolosPorHandle.contains(texto)) simbolosPorHandle.insert(texto, &simbolo);
     }
     // By strip, then number, in the three languages; Spanish shares the Portuguese number
     // field, which a second time would never decide a comparison.
@@ -160,13 +157,14 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
         if (PrefixoDoNome(nome) == kLigacoesDoBorne) nomesLigacao.push_back(nome);
     QHash<QString, CEReguaDwg*> reguaPorNome;
     CEReguaDwg* ultima = nullptr;
-    bornes.reserve(bornes.size() + terminais.size());
     bornesPorChave.reserve(int(terminais.size()));
     for (CEItemLista* item : terminais) {
         const QString nome = CCBorneDataReader::Regua(*item);
-        const QString chave = Chave(nome, CCBorneDataReader::Numero(*item));
-        if (bornesPorChave.contains(chave)) continue;  // the first of a strip and number wins
-        auto borne = std::make_unique<CEBorneDwg>(item);
+        // The first of a strip and number wins.
+        CEBorneDwg*& doNumero = bornesPorChave[ChaveBorne{nome, CCBorneDataReader::Numero(*item)}];
+        if (doNumero) continue;
+        CEBorneDwg* const borne = &bornes.emplace_back(item);
+        doNumero = borne;
         // Sorted by strip, a terminal mostly stands on the strip of the one before.
         if (!ultima || ultima->nome != nome) {
             CEReguaDwg*& regua = reguaPorNome[nome];
@@ -177,7 +175,7 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
             ultima = regua;
         }
         CEReguaDwg* regua = ultima;
-        regua->bornes.push_back(borne.get());
+        regua->bornes.push_back(borne);
         borne->regua = regua;
         const std::pair<std::uint32_t, std::uint32_t> lados[] = {
             {NumeroCampo<"REL_INI">(), NumeroCampo<"HANDLE_INI">()},
@@ -188,21 +186,19 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
             const QString* deQuem = item->campos.procura(handle);
             if (CESimboloDwg* simbolo = simbolosPorHandle.value(deQuem ? *deQuem : kSemValor)) {
                 borne->ligados.push_back(simbolo);
-                simbolo->Liga(borne.get());
+                simbolo->Liga(borne);
             }
         }
         LeLigacoes(*item, nomesLigacao, borne->ligacoes);
-        bornesPorChave.insert(chave, borne.get());
-        bornes.push_back(std::move(borne));
     }
     // Jumper links by strip and number, so a duplicate's link lands on the terminal kept.
     auto busca = [this](const CEItemLista* ligado) -> CEBorneDwg* {
         if (!ligado) return nullptr;
         return Borne(CCBorneDataReader::Regua(*ligado), CCBorneDataReader::Numero(*ligado));
     };
-    for (const auto& borne : bornes) {
-        borne->proximo = busca(borne->item->proximo);
-        borne->anterior = busca(borne->item->anterior);
+    for (CEBorneDwg& borne : bornes) {
+        borne.proximo = busca(borne.item->proximo);
+        borne.anterior = busca(borne.item->anterior);
     }
     for (const auto& regua : reguas)
         OrdenaPorSimbolos(*regua);
@@ -409,9 +405,9 @@ void CEModeloReguas::CalculaDetalhes(const QStringList& camposDetalhe) {
     }
 }
 
-std::vector<CESimboloDwg*> CEModeloReguas::SimbolosSemBorne() const {
+std::vector<CESimboloDwg*> CEModeloReguas::SimbolosSemBorne() {
     std::vector<CESimboloDwg*> sem;
-    for (const auto& simbolo : simbolos)
-        if (simbolo->ligados.empty()) sem.push_back(simbolo.get());
+    for (CESimboloDwg& simbolo : simbolos)
+        if (simbolo.ligados.empty()) sem.push_back(&simbolo);
     return sem;
 }

@@ -12,6 +12,7 @@
 #include <QStringList>
 
 #include <cstdint>
+#include <deque>
 #include <memory>
 #include <vector>
 
@@ -44,14 +45,20 @@ public:
     void CalculaDetalhes(const QStringList& campos);
 
     // Symbols that no terminal of the drawing is wired to, in symbol order.
-    std::vector<CESimboloDwg*> SimbolosSemBorne() const;
-    // The key of a terminal: strip name, U+000C, number.
-    static QString Chave(const QString& regua, const QString& numero);
+    std::vector<CESimboloDwg*> SimbolosSemBorne();
+    // A terminal by strip name and number: the two texts as they stand, shared, not joined
+    // into a new text per terminal.
+    struct ChaveBorne {
+        QString regua, numero;
+        bool operator==(const ChaveBorne&) const = default;
+    };
     CEBorneDwg* Borne(const QString& regua, const QString& numero) const;
 
-    std::vector<std::unique_ptr<CEBorneDwg>> bornes;
-    QHash<QString, CEBorneDwg*> bornesPorChave;
-    std::vector<std::unique_ptr<CESimboloDwg>> simbolos;
+    // The terminals and symbols live in blocks of a few, in the order they were made, and
+    // stay where they are as more are added: no allocation of their own.
+    std::deque<CEBorneDwg> bornes;
+    QHash<ChaveBorne, CEBorneDwg*> bornesPorChave;
+    std::deque<CESimboloDwg> simbolos;
     QHash<QString, CESimboloDwg*> simbolosPorHandle;
     std::vector<std::unique_ptr<CEPaginaDwg>> paginas;
     std::vector<std::unique_ptr<CEReguaDwg>> reguas;
@@ -65,3 +72,5 @@ private:
     size_t Corte(const CEReguaDwg& regua, int limite, const std::vector<std::uint32_t>& chaves,
                  bool& quebra) const;
 };
+
+uint qHash(const CEModeloReguas::ChaveBorne& chave, uint semente = 0);

@@ -303,6 +303,42 @@ TEST_F(ComandoReguasTest, NoTerminalLeftDrawsNoPageAndSaysSo) {
     EXPECT_EQ(Hash(pasta_->project()), antes);
 }
 
+// The template's filter keeps a component out as it does a terminal: a wired component it
+// refuses stands under no strip, and the others still do.
+TEST_F(ComandoReguasTest, TheTemplatesFilterKeepsARefusedComponentFromTheStrips) {
+    // The handles of the components drawn under the strips, which their symbols link back to.
+    const auto sobReguas = [](const QString& arquivo) {
+        QStringList handles;
+        const auto db = zvdb::DxfLoader::loadFile(arquivo.toStdString());
+        for (zvdb::Entity* e : db->modelSpace()->entities())
+            if (auto* ref = dynamic_cast<zvdb::BlockReference*>(e))
+                if (ref->layer().starts_with("REGUAS$")) {
+                    const auto itens = ref->xdataItems("KVR_ZV_REPRESENTACAO");
+                    if (itens.empty()) continue;
+                    const std::string_view handle = itens.back().value;
+                    handles << QString::fromUtf8(handle.data(), int(handle.size()));
+                }
+        handles.sort();
+        return handles;
+    };
+    const QString todos = pasta_->path("componentes-todos.dxf");
+    zvtest::HostRun r = Desenha(pasta_->project(), todos, QString());
+    ASSERT_EQ(r.status, 0) << r.err.toStdString();
+    const QStringList antes = sobReguas(todos);
+    ASSERT_GT(antes.size(), 1);
+    const QString recusado = antes.front();
+    ASSERT_NE(antes.back(), recusado);
+    const QString filtrada = pasta_->path("componente-recusado.dxf");
+    r = Desenha(pasta_->project(), filtrada,
+                Modelo("reguas-recusa",
+                       "(setq *FILTRO_TEMPLATE* \"(/= (cdr (assoc \\\"HANDLE\\\" reg)) \\\"" +
+                           recusado + "\\\")\")"));
+    ASSERT_EQ(r.status, 0) << r.err.toStdString();
+    const QStringList depois = sobReguas(filtrada);
+    EXPECT_FALSE(depois.contains(recusado)) << recusado.toStdString();
+    EXPECT_TRUE(depois.contains(antes.back())) << antes.back().toStdString();
+}
+
 TEST_F(ComandoReguasTest, AMissingBlockFileEndsTheCommandAndNothingIsSaved) {
     const QByteArray antes = Hash(pasta_->project());
     const QString saida = pasta_->path("sem-bloco.dxf");

@@ -222,19 +222,23 @@ TEST_F(DesenhoReguasTest, TerminalsDetailsSeparatorsAndTracksStandWhereTheLayout
     }
 }
 
-// A run's fields fill its detail block, and the laid-out model keeps them after drawing.
-TEST_F(DesenhoReguasTest, ARunKeepsItsFieldsAfterItsDetailIsDrawn) {
+// A run's last terminal fills its detail block, and keeps every field of its own after
+// the detail is drawn.
+TEST_F(DesenhoReguasTest, ARunsLastTerminalKeepsItsFieldsAfterItsDetailIsDrawn) {
     auto x1 = itens_.Regua("X1", 3);
     const char* lados[] = {"K1", "K2", "K2"};
     for (size_t i = 0; i < x1.size(); ++i)
         x1[i]->definirCampo("RELACAO_INI", lados[i]);
+    const QStringList antes = CEDetalheReguaDwg::NomesCampos(*x1[2]);
     CCBorneDwgWriter escritor;
     escritor.EscreverItens(itens_.itens, modelo_);
     const auto& detalhes = escritor.Modelo().reguas.at(0)->detalhes;
     ASSERT_EQ(detalhes.size(), 2u);
-    EXPECT_EQ(detalhes[0].campos.value("RELACAO_INI"), "K1");
-    EXPECT_EQ(detalhes[1].campos.value("RELACAO_INI"), "K2");
-    EXPECT_EQ(detalhes[1].campos.size(), x1[2]->campos.size());
+    EXPECT_EQ(detalhes[0].ultimo, x1[0]);
+    EXPECT_EQ(detalhes[1].ultimo, x1[2]);
+    EXPECT_EQ(CEDetalheReguaDwg::NomesCampos(*x1[2]), antes);
+    EXPECT_EQ(x1[2]->valorCampo("RELACAO_INI"), "K2");
+    EXPECT_EQ(x1[1]->valorCampo("RELACAO_INI"), "K2");
     QStringList relacoes;
     for (const Insercao& i : Salvo())
         if (i.nome == "REGUA_DET") relacoes << i.atributos["VARIAVEL_REL"].toString();

@@ -77,6 +77,56 @@ TEST_F(ModeloReguasTest, NumbersThatAreNotNumbersSortAfterTheNumbersAndStillDraw
     EXPECT_NE(modelo.Borne("X1", ""), nullptr);
 }
 
+// A terminal is found by its strip and number as two texts: a strip whose name runs on into
+// the number of another is a terminal of its own.
+TEST_F(ModeloReguasTest, StripAndNumberAreTwoTextsThatDoNotRunTogether) {
+    CEItemLista* a = itens_.Borne("X1", "10");
+    CEItemLista* b = itens_.Borne("X11", "0");
+    CEItemLista* c = itens_.Borne("X", "110");
+    CEModeloReguas& modelo = Modelo();
+    EXPECT_EQ(modelo.bornes.size(), 3u);
+    ASSERT_NE(modelo.Borne("X1", "10"), nullptr);
+    ASSERT_NE(modelo.Borne("X11", "0"), nullptr);
+    ASSERT_NE(modelo.Borne("X", "110"), nullptr);
+    EXPECT_EQ(modelo.Borne("X1", "10")->item, a);
+    EXPECT_EQ(modelo.Borne("X11", "0")->item, b);
+    EXPECT_EQ(modelo.Borne("X", "110")->item, c);
+    EXPECT_EQ(modelo.Borne("X1", "1"), nullptr);
+    EXPECT_EQ(modelo.Borne("X110", ""), nullptr);
+}
+
+// Many terminals and symbols: every strip, symbol and look-up still points at the terminal
+// made for its item once all are made.
+TEST_F(ModeloReguasTest, ManyTerminalsStayWhereTheStripsAndSymbolsPointAtThem) {
+    std::vector<CEItemLista*> feitos;
+    for (int r = 1; r <= 7; ++r)
+        for (CEItemLista* borne : itens_.Regua("X" + QString::number(r), 300))
+            feitos.push_back(borne);
+    for (int s = 0; s < 400; ++s) {
+        const QString handle = "S" + QString::number(s);
+        CEItemLista* simbolo = itens_.Simbolo(handle, "K" + QString::number(s), {"1"});
+        ItensRegua::Liga(feitos[size_t(s) * 5], "INI", simbolo, "1");
+    }
+    CEModeloReguas& modelo = Modelo();
+    ASSERT_EQ(modelo.bornes.size(), feitos.size());
+    ASSERT_EQ(modelo.simbolos.size(), 400u);
+    size_t vistos = 0;
+    for (const auto& regua : modelo.reguas)
+        for (const CEBorneDwg* borne : regua->bornes) {
+            ++vistos;
+            EXPECT_EQ(borne->regua, regua.get());
+            EXPECT_EQ(modelo.Borne(regua->nome, borne->item->valorCampo("NUMERO")), borne);
+        }
+    EXPECT_EQ(vistos, feitos.size());
+    for (int s = 0; s < 400; ++s) {
+        const CESimboloDwg* simbolo = modelo.simbolosPorHandle.value("S" + QString::number(s));
+        ASSERT_NE(simbolo, nullptr);
+        ASSERT_EQ(simbolo->ligados.size(), 1u);
+        EXPECT_EQ(simbolo->Ligado(0)->item, feitos[size_t(s) * 5]);
+        EXPECT_EQ(static_cast<const CEBorneDwg*>(simbolo->Ligado(0))->PrimeiroSimbolo(), simbolo);
+    }
+}
+
 TEST_F(ModeloReguasTest, StripNamesComeFromTheFirstLanguageThatHasOne) {
     CEItemLista* ingles = itens_.Borne("", "1");
     ingles->definirCampo("STRIP", "X7");
@@ -429,8 +479,8 @@ TEST_F(ModeloReguasTest, DetailRunsCloseWhereAFieldChangesWithTheLastTerminalsFi
     const auto& detalhes = modelo.reguas[0]->detalhes;
     QStringList runs;
     for (const CEDetalheReguaDwg& d : detalhes)
-        runs << QString::number(d.quantidade) + "/" + d.campos.value("NUMERO") + "/" +
-                    d.campos.value("RELACAO_INI");
+        runs << QString::number(d.quantidade) + "/" + d.ultimo->valorCampo("NUMERO") + "/" +
+                    d.ultimo->valorCampo("RELACAO_INI");
     EXPECT_EQ(runs, QStringList({"2/2/K1", "1/3/K2", "2/5/", "1/6/K1"}));
     // Without fields the whole strip is one run.
     modelo.CalculaDetalhes({});
