@@ -90,8 +90,16 @@ VetorItens* CCBorneDwgDataReader::LerDados(zvdb::Database* database,
         if (*tipo == kComp) componentes.push_back(item);
         if (*tipo == kBorne) bornes.push_back(item);
     }
-    // The components need no filter of their own here: the export read asked the
-    // template's filter of every symbol as it read it, and kept listed symbols only.
+    if (!modelo.LerTexto("*FILTRO_TEMPLATE*").isEmpty()) {
+        VetorItens ficam;
+        const std::uint32_t listaCampo = NumeroCampo<"ZV_LISTA">();
+        for (CEItemLista* item : componentes) {
+            if (!modelo.FiltraItem(*item)) continue;
+            const QString* lista = item->campos.procura(listaCampo);
+            if (!lista || *lista != QLatin1String("N")) ficam.push_back(item);
+        }
+        componentes = std::move(ficam);
+    }
     // A cancelled strip picker draws no terminal.
     if (CICad::GetBoolLisp("*SEL_REGUA_BORNE_CFG*"))
         bornes = CCBorneDataReader::SelecionaReguas(bornes);
