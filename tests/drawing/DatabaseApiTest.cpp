@@ -347,6 +347,44 @@ TEST_F(DatabaseApi, SavingChangesNothingAndCountsEachTableAsItStands) {
     EXPECT_EQ(DxfWriter::toText(*again), DxfWriter::toText(db)) << "the counts read back stand";
 }
 
+TEST_F(DatabaseApi, ExtendedDataOfAFilesObjectsFollowsEveryEdit) {
+    // Objects read from a file: their extended data found before and after each kind of
+    // edit, on short and very long tag lists.
+    for (const int vertices : {2, 40000}) {
+        std::vector<Point3> points;
+        for (int i = 0; i < vertices; ++i)
+            points.push_back({double(i), double(i % 7), 0});
+        Polyline* made = db.modelSpace()->addLwPolyline(points, false);
+        made->setXData("APP", std::vector<Tag>{tag(1000, "W1"), tag(1070, "3")});
+    }
+    db.modelSpace()
+        ->addLine({0, 0, 0}, {5, 5, 0})
+        ->setXData("OUTRA", std::vector<Tag>{tag(1000, "L")});
+    const std::unique_ptr<Database> again = reloaded(db);
+    for (Entity* entity : again->modelSpace()->entities()) {
+        const bool line = entity->isType("LINE");
+        const std::string_view app = line ? "OUTRA" : "APP";
+        ASSERT_TRUE(entity->hasXData(app));
+        EXPECT_EQ(entity->text(8), "0") << "a tag before the extended data";
+        // a tag added before the extended data moves it
+        entity->setColor(3);
+        EXPECT_EQ(entity->xdataItems(app).front().value, line ? "L" : "W1");
+        entity->setXData("MAIS", std::vector<Tag>{tag(1000, "M")});
+        EXPECT_EQ(entity->xdataApplications(), (std::vector<std::string_view>{app, "MAIS"}));
+        EXPECT_TRUE(entity->removeXData(app));
+        EXPECT_FALSE(entity->hasXData(app));
+        EXPECT_EQ(entity->xdataItems("MAIS").front().value, "M");
+        EXPECT_EQ(entity->color(), 3);
+    }
+    // A value written in place (the tags stay the file's) leaves the extended data be.
+    const std::unique_ptr<Database> third = reloaded(db);
+    for (Entity* entity : third->modelSpace()->entities()) {
+        entity->setLayer("OUTRO");
+        EXPECT_EQ(entity->layer(), "OUTRO");
+        EXPECT_EQ(entity->xdataApplications().size(), 1u);
+    }
+}
+
 TEST_F(DatabaseApi, DeepCloneBringsBlocksLayersAndTranslatesHandles) {
     Database source;
     source.createLayer("SYMBOLS")->setColor(3);
