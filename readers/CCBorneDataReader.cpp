@@ -345,8 +345,16 @@ const NomesBorne& Nomes() {
     return nomes;
 }
 
-// The first item of each strip and number, per language, for the jumper look-ups. A key is
-// the two texts as the items hold them, shared: no text is joined per terminal.
+}  // namespace
+
+uint qHash(const CCBorneDataReader::ChaveBorne& chave, uint semente) {
+    // The strip's hash seeds the number's.
+    return qHash(chave.numero, qHash(chave.regua, semente));
+}
+
+namespace {
+
+// The first item of each strip and number, per language, for the jumper look-ups.
 class IndiceBornes {
 public:
     explicit IndiceBornes(const VetorItens& itens) {
@@ -365,12 +373,9 @@ public:
     }
 
 private:
-    struct Chave {
-        QString regua, numero;
-        bool operator==(const Chave&) const = default;
-    };
+    using Chave = CCBorneDataReader::ChaveBorne;
     struct HashChave {
-        size_t operator()(const Chave& c) const { return qHash(c.numero, qHash(c.regua)); }
+        size_t operator()(const Chave& c) const { return qHash(c); }
     };
     // The item's value under the name's number; empty when it has none.
     static QString Valor(const CEItemLista& item, std::uint32_t nome) {

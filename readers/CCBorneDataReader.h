@@ -31,6 +31,12 @@ public:
     // The strip and number of a terminal: the first non-empty language.
     static QString Regua(const CEItemLista& item);
     static QString Numero(const CEItemLista& item);
+    // A terminal by strip name and number: the two texts as the items hold them, shared, not
+    // joined into a new text per terminal.
+    struct ChaveBorne {
+        QString regua, numero;
+        bool operator==(const ChaveBorne&) const = default;
+    };
 
     // One side of a terminal as any reader finds it: the element wired at the side's point
     // (the insertion point, or the cut point) and the wire there.
@@ -78,3 +84,5 @@ private:
     bool duplicado_ = false;
     QHash<QString, QString> jumperPorNumero_;
 };
+
+uint qHash(const CCBorneDataReader::ChaveBorne& chave, uint semente = 0);

@@ -107,11 +107,6 @@ CEModeloReguas::Parametros CEModeloReguas::Parametros::DoModelo(CETemplate& mode
     return p;
 }
 
-uint qHash(const CEModeloReguas::ChaveBorne& chave, uint semente) {
-    // The strip's hash seeds the number's.
-    return qHash(chave.numero, qHash(chave.regua, semente));
-}
-
 CEBorneDwg* CEModeloReguas::Borne(const QString& regua, const QString& numero) const {
     return bornesPorChave.value(ChaveBorne{regua, numero});
 }

@@ -7,6 +7,7 @@
 #include "CEPaginaDwg.h"
 #include "CEReguaDwg.h"
 #include "CESimboloDwg.h"
+#include "readers/CCBorneDataReader.h"
 
 #include <QHash>
 #include <QStringList>
@@ -46,12 +47,7 @@ public:
 
     // Symbols that no terminal of the drawing is wired to, in symbol order.
     std::vector<CESimboloDwg*> SimbolosSemBorne();
-    // A terminal by strip name and number: the two texts as they stand, shared, not joined
-    // into a new text per terminal.
-    struct ChaveBorne {
-        QString regua, numero;
-        bool operator==(const ChaveBorne&) const = default;
-    };
+    using ChaveBorne = CCBorneDataReader::ChaveBorne;
     CEBorneDwg* Borne(const QString& regua, const QString& numero) const;
 
     // The terminals and symbols live in blocks of a few, in the order they were made, and
@@ -72,5 +68,3 @@ private:
     size_t Corte(const CEReguaDwg& regua, int limite, const std::vector<std::uint32_t>& chaves,
                  bool& quebra) const;
 };
-
-uint qHash(const CEModeloReguas::ChaveBorne& chave, uint semente = 0);

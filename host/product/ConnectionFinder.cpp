@@ -352,7 +352,7 @@ std::size_t ConnectionFinder::slotOf(std::uint64_t cell) {
 const ConnectionFinder::CellRun* ConnectionFinder::run(std::int32_t layer,
                                                        std::uint64_t cell) const {
     const auto id = static_cast<std::size_t>(layer);
-    if (id >= layerCells_.size() || layerCells_[id].empty) return nullptr;
+    if (id >= layerCells_.size() || layerCells_[id].mask == 0) return nullptr;
     const LayerCells& table = layerCells_[id];
     for (std::size_t slot = slotOf(cell) & table.mask;; slot = (slot + 1) & table.mask) {
         const CellRun& run = grid_[table.first + slot];
@@ -391,8 +391,8 @@ void ConnectionFinder::buildGrid() {
     for (std::size_t layer = 0; layer < cells.size(); ++layer) {
         if (cells[layer] == 0) continue;
         const std::size_t own = std::bit_ceil(std::max<std::size_t>(4, cells[layer] * 2));
-        layerCells_[layer] = {static_cast<std::uint32_t>(size), static_cast<std::uint32_t>(own - 1),
-                              false};
+        layerCells_[layer] = {static_cast<std::uint32_t>(size),
+                              static_cast<std::uint32_t>(own - 1)};
         size += own;
     }
     grid_.assign(size, CellRun{0, 0, 0});
@@ -564,32 +564,41 @@ struct WireGroups {
     }
 };
 
+// Group by group, its polylines in their order and the touches `addTouches` gathers for
+// each of its lines into `touches`: each group's vectors are made to size once.
+template <class Line, class AddTouches>
+std::vector<WireConnections> connections(const WireGroups& groups, const std::vector<Line>& lines,
+                                         std::vector<Touch>& touches, AddTouches&& addTouches) {
+    std::vector<WireConnections> result(groups.numbers.size());
+    for (std::size_t g = 0; g < groups.numbers.size(); ++g) {
+        WireConnections& group = result[g];
+        group.number = groups.numbers[g];
+        group.polylines.reserve(groups.first[g + 1] - groups.first[g]);
+        touches.clear();
+        for (std::uint32_t k = groups.first[g]; k < groups.first[g + 1]; ++k) {
+            const Line& line = lines[groups.lines[k]];
+            group.polylines.push_back(line.handle);
+            addTouches(line);
+        }
+        group.touches.assign(touches.begin(), touches.end());
+    }
+    return result;
+}
+
 }  // namespace
 
-// Wire by wire, its polylines in their order: each wire's vectors are made to size once.
 std::vector<WireConnections> ConnectionFinder::wires() const {
     std::vector<std::string_view> lineNumbers(wireLines_.size());
     for (std::size_t i = 0; i < wireLines_.size(); ++i)
         lineNumbers[i] = wireLines_[i].number;
     const WireGroups groups(lineNumbers);
     lineNumbers = {};
-    std::vector<WireConnections> result(groups.numbers.size());
     Scratch scratch;
-    for (std::size_t w = 0; w < groups.numbers.size(); ++w) {
-        WireConnections& wire = result[w];
-        wire.number = groups.numbers[w];
-        wire.polylines.reserve(groups.first[w + 1] - groups.first[w]);
-        scratch.touches.clear();
-        for (std::uint32_t k = groups.first[w]; k < groups.first[w + 1]; ++k) {
-            const Line& line = wireLines_[groups.lines[k]];
-            wire.polylines.push_back(line.handle);
-            readVertices(*line.polyline, scratch.vertices);
-            for (const zvdb::Point3& vertex : scratch.vertices)
-                touchesAt(line.layer, vertex, tolerance_, scratch.touches, scratch);
-        }
-        wire.touches.assign(scratch.touches.begin(), scratch.touches.end());
-    }
-    return result;
+    return connections(groups, wireLines_, scratch.touches, [&](const Line& line) {
+        readVertices(*line.polyline, scratch.vertices);
+        for (const zvdb::Point3& vertex : scratch.vertices)
+            touchesAt(line.layer, vertex, tolerance_, scratch.touches, scratch);
+    });
 }
 
 std::vector<WireConnections> ConnectionFinder::cables() const {
@@ -618,24 +627,13 @@ std::vector<WireConnections> ConnectionFinder::cables() const {
         leadNumbers[i] = cableNumber(*leadLines_[i].polyline);
     const std::vector<std::string_view> views(leadNumbers.begin(), leadNumbers.end());
     const WireGroups groups(views);
-    std::vector<WireConnections> result(groups.numbers.size());
-    for (std::size_t c = 0; c < groups.numbers.size(); ++c) {
-        WireConnections& cable = result[c];
-        cable.number = groups.numbers[c];
-        cable.polylines.reserve(groups.first[c + 1] - groups.first[c]);
-        scratch.touches.clear();
-        for (std::uint32_t k = groups.first[c]; k < groups.first[c + 1]; ++k) {
-            const Line& lead = leadLines_[groups.lines[k]];
-            cable.polylines.push_back(lead.handle);
-            ends(lead, true);
-            auto own = std::lower_bound(blinds.begin(), blinds.end(),
-                                        std::pair<std::uint64_t, std::uint32_t>{lead.handle, 0});
-            for (; own != blinds.end() && own->first == lead.handle; ++own)
-                ends(blindLines_[own->second], false);
-        }
-        cable.touches.assign(scratch.touches.begin(), scratch.touches.end());
-    }
-    return result;
+    return connections(groups, leadLines_, scratch.touches, [&](const Line& lead) {
+        ends(lead, true);
+        auto own = std::lower_bound(blinds.begin(), blinds.end(),
+                                    std::pair<std::uint64_t, std::uint32_t>{lead.handle, 0});
+        for (; own != blinds.end() && own->first == lead.handle; ++own)
+            ends(blindLines_[own->second], false);
+    });
 }
 
 std::string ConnectionFinder::cableNumber(const zvdb::Polyline& lead) const {

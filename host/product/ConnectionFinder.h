@@ -87,8 +87,7 @@ private:
     // page by page, and a page's cells stay in the cache while it is read.
     struct LayerCells {
         std::uint32_t first = 0;
-        std::uint32_t mask = 0;  // its size - 1
-        bool empty = true;       // no spot on the layer, no table
+        std::uint32_t mask = 0;  // its size - 1; 0: no spot on the layer, no table
     };
     struct Scratch;
 
