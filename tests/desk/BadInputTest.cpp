@@ -24,6 +24,7 @@
 
 namespace {
 
+using zvtest::chooseFile;
 using zvtest::DeskTest;
 using zvtest::ModalAnswer;
 
@@ -182,8 +183,7 @@ TEST_F(BadInputTest, ADrawingFromAnotherFormatIsNeverWrittenOverItsOwnFile) {
         EXPECT_EQ(dialog->objectName(), "drawing");
         EXPECT_EQ(dialog->acceptMode(), QFileDialog::AcceptSave);
         proposed = dialog->selectedFiles().value(0);
-        dialog->selectFile(path("imported.dxf"));
-        static_cast<QDialog*>(dialog)->accept();
+        chooseFile(dialog, path("imported.dxf"));
     });
     EXPECT_TRUE(window_->save());
     EXPECT_EQ(QFileInfo(proposed).fileName(), "imported.dxf");

@@ -13,6 +13,12 @@
 #include <gtest/gtest.h>
 
 #include <QApplication>
+#include <QDialog>
+#include <QFileDialog>
+#include <QFileInfo>
+#include <QLineEdit>
+#include <QMessageBox>
+#include <QPointer>
 #include <QTextStream>
 #include <QTimer>
 
@@ -32,30 +38,74 @@ inline QApplication& desktopApplication() {
 }
 
 // Runs `answer` on the first modal window that comes up within `ms`, while the caller's
-// call shows it. The answer gets the window (null when none came) and closes it.
+// call shows it. The answer gets the window (null when none came) and closes it. A window
+// the answer left open (a refused accept, a message the window raised over itself) fails
+// the test and is closed after a while, so that the call returns instead of hanging.
 class ModalAnswer {
 public:
     explicit ModalAnswer(std::function<void(QWidget*)> answer, int ms = 20000)
         : answer_(std::move(answer)) {
-        timer_.setInterval(20);
-        QObject::connect(&timer_, &QTimer::timeout, [this, ms] {
-            QWidget* modal = QApplication::activeModalWidget();
-            waited_ += 20;
-            if (!modal && waited_ < ms) return;
-            timer_.stop();
-            seen_ = modal != nullptr;
-            answer_(modal);
-        });
+        timer_.setInterval(tick);
+        QObject::connect(&timer_, &QTimer::timeout, [this, ms] { poll(ms); });
         timer_.start();
     }
     bool seen() const { return seen_; }
 
 private:
+    static constexpr int tick = 20;
+    static constexpr int patience = 5000;
+
+    void poll(int ms) {
+        QWidget* modal = QApplication::activeModalWidget();
+        waited_ += tick;
+        if (answered_) return watch(modal);
+        if (!modal && waited_ < ms) return;
+        answered_ = true;
+        seen_ = modal != nullptr;
+        window_ = modal;
+        answer_(modal);
+        if (!modal) timer_.stop();
+    }
+
+    // Closes what stays up of the answered window, one modal window a tick.
+    void watch(QWidget* modal) {
+        const bool left = window_ && modal && (modal == window_ || window_->isAncestorOf(modal));
+        if (!window_ || !window_->isVisible()) return timer_.stop();
+        lingered_ = left ? lingered_ + tick : 0;
+        if (lingered_ < patience) return;
+        ADD_FAILURE() << "a window was left open: " << modal->metaObject()->className() << " \""
+                      << modal->windowTitle().toStdString() << "\" "
+                      << describe(modal).toStdString();
+        lingered_ = 0;
+        if (auto* dialog = qobject_cast<QDialog*>(modal))
+            dialog->reject();
+        else
+            modal->close();
+    }
+
+    static QString describe(QWidget* modal) {
+        auto* box = qobject_cast<QMessageBox*>(modal);
+        return box ? box->text() : QString();
+    }
+
     std::function<void(QWidget*)> answer_;
     QTimer timer_;
+    QPointer<QWidget> window_;
     int waited_ = 0;
+    int lingered_ = 0;
+    bool answered_ = false;
     bool seen_ = false;
 };
+
+// Chooses `file` in a file dialog by its whole path in the name field, then accepts. Typing
+// the path does not depend on the folder view having been read yet, nor on where the focus
+// is, as choosing an entry of the view does.
+inline void chooseFile(QFileDialog* dialog, const QString& file) {
+    auto* name = dialog->findChild<QLineEdit*>(QStringLiteral("fileNameEdit"));
+    ASSERT_NE(name, nullptr);
+    name->setText(QFileInfo(file).absoluteFilePath());
+    static_cast<QDialog*>(dialog)->accept();
+}
 
 // A product folder (catalogue, templates, configuration, a generated project) shared by a
 // suite, and an application with a main window for each test.

@@ -22,6 +22,7 @@
 
 namespace {
 
+using zvtest::chooseFile;
 using zvtest::DeskTest;
 using zvtest::ModalAnswer;
 
@@ -143,8 +144,7 @@ TEST_F(UserInterfaceTest, TheFileDialogGivesTheChosenFileOrNothing) {
         EXPECT_EQ(dialog->windowTitle(), "Terminal list template");
         EXPECT_EQ(QDir(dialog->directory()).absolutePath(), QDir(folder).absolutePath());
         filters = dialog->nameFilters();
-        dialog->selectFile(folder + "/bornes.grt");
-        static_cast<QDialog*>(dialog)->accept();
+        chooseFile(dialog, folder + "/bornes.grt");
     });
     const QString chosen =
         ui_->fileDialog("template", true, "Template ( *.grt );;", folder, "Terminal list template");
