@@ -35,6 +35,10 @@ public:
     // thread for it: `coisa` is then left as it was, for the caller to free.
     template <class T>
     bool Entregar(T&& coisa) noexcept;
+    // Empties `coisa` at once; what it held goes on the module's thread, or here when there
+    // is none.
+    template <class T>
+    static void Largar(T& coisa) noexcept;
     // Returns once everything handed over so far is destroyed.
     void Esperar();
 
@@ -77,4 +81,10 @@ bool Descarte::Entregar(T&& coisa) noexcept {
     if (!tarefa) return false;
     Enfileirar(tarefa);
     return true;
+}
+
+template <class T>
+void Descarte::Largar(T& coisa) noexcept {
+    T fora = std::exchange(coisa, T());
+    if (Descarte* descarte = DoModulo()) descarte->Entregar(std::move(fora));
 }

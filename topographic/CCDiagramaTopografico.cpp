@@ -9,6 +9,7 @@
 #include "readers/CEAtributo.h"
 #include "readers/CEListaAtributos.h"
 #include "readers/CamposItem.h"
+#include "readers/Descarte.h"
 #include "readers/ZVString.h"
 #include "settings/CIMensagens.h"
 
@@ -502,8 +503,8 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     VetorItens itensBornes = LeItens(bornes, modelo);
     // Everything is read: what the reading kept goes before the drawing grows.
     LiberaLeituras();
-    donos_.clear();
-    comAcessorios_.clear();
+    Descarte::Largar(donos_);
+    Descarte::Largar(comAcessorios_);
     progresso.Definir(40);
     struct Destroi {
         VetorItens& a;
@@ -561,24 +562,35 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
         paginasBornes = Paginas(linhas, extensoes_, retangulo.altura, p.margem, p.linhas);
         posicoesBornes = PosicoesBornes(paginasBornes, extensoes_, passos_, retangulo, p.margem);
     }
-    extensoes_ = {};
-    passos_ = {};
-    // From here each item is given back as its block goes in; those left go at the end.
+    Descarte::Largar(extensoes_);
+    Descarte::Largar(passos_);
+    // From here each item is given back as its block goes in; those left go at the end, with
+    // the table that finds them.
+    struct Restantes {
+        QHash<QString, Lido> itens;
+        explicit Restantes(QHash<QString, Lido>&& v) noexcept : itens(std::move(v)) {}
+        Restantes(Restantes&&) noexcept = default;
+        ~Restantes() {
+            for (Lido& lido : itens)
+                delete lido.item;
+        }
+    };
     struct Entrega {
         QHash<QString, Lido>& itens;
         ~Entrega() {
-            for (Lido& lido : itens) {
-                delete lido.item;
-                lido.item = nullptr;
-            }
+            Restantes restantes{std::exchange(itens, {})};
+            if (Descarte* descarte = Descarte::DoModulo()) descarte->Entregar(std::move(restantes));
         }
     } entrega{itensPorHandle_};
     itensComuns.clear();
     itensBornes.clear();
     if (!paginasComuns.empty()) Desenha(paginasComuns, posicoesComuns);
-    posicoesComuns = {};
+    Descarte::Largar(posicoesComuns);
+    Descarte::Largar(paginasComuns);
     progresso.Definir(75);
     if (!paginasBornes.empty()) Desenha(paginasBornes, posicoesBornes);
+    Descarte::Largar(posicoesBornes);
+    Descarte::Largar(paginasBornes);
     CICad::zvInvokeVoid("atualizaTopografico");
     progresso.Definir(100);
     progresso.Fechar();

@@ -9,6 +9,8 @@
 
 #include <gtest/gtest.h>
 
+#include <QHash>
+
 #include <chrono>
 #include <condition_variable>
 #include <mutex>
@@ -217,6 +219,34 @@ TEST(DescarteTest, WithoutTheModulesOwnerItemsGoInPlace) {
     EXPECT_FALSE(texto.isDetached());
     itens.destruirItens();
     EXPECT_TRUE(itens.empty());
+    EXPECT_TRUE(texto.isDetached());
+}
+
+TEST(DescarteTest, WhatIsLetGoIsEmptiedAtOnceAndFreedOnTheThreadOrInPlace) {
+    Registro registro;
+    Porteira porteira;
+    QHash<QString, QString> tabela;
+    const QString texto = QString::number(2718) + "-tabela";
+    tabela.insert("A", texto);
+    {
+        Descarte descarte;
+        const DoModulo modulo(descarte);
+        ASSERT_TRUE(descarte.Entregar(Marcado(registro, 1, &porteira)));
+        Descarte::Largar(tabela);
+        EXPECT_TRUE(tabela.isEmpty());
+        tabela.insert("B", "usable");
+        // Behind the first hand-over: the text's other owner is still held.
+        EXPECT_FALSE(texto.isDetached());
+        porteira.Abre();
+        descarte.Esperar();
+        EXPECT_TRUE(texto.isDetached());
+    }
+    EXPECT_EQ(tabela.value("B"), "usable");
+    // Without the module's owner it goes here and now.
+    tabela.insert("C", texto);
+    EXPECT_FALSE(texto.isDetached());
+    Descarte::Largar(tabela);
+    EXPECT_TRUE(tabela.isEmpty());
     EXPECT_TRUE(texto.isDetached());
 }
 
