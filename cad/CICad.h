@@ -242,6 +242,17 @@ public:
     // order, gathered in one walk.
     static std::vector<OdDbObjectId> GetEntidadesComXData(const QString& aplicacao,
                                                           zvdb::Database* database = nullptr);
+    // The block references of model space that carry the application's extended data, in
+    // drawing order, from one walk: each with its block's name as spelt and the first item
+    // of its data (code 0 when the data has no items).
+    struct ReferenciaComXData {
+        OdDbObjectId id;
+        QString bloco;
+        int codigo = 0;
+        QString texto;
+    };
+    static std::vector<ReferenciaComXData> GetReferenciasComXData(
+        const char* aplicacao, zvdb::Database* database = nullptr);
     // The entries of a dictionary below the named-objects dictionary; nothing when the
     // path does not exist (it is not made).
     static std::vector<std::pair<QString, OdDbObjectId>> GetEntradasDicionario(

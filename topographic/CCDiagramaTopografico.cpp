@@ -602,21 +602,8 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
 
 void CCDiagramaTopografico::ColetaCandidatos(Candidatos& candidatos) {
     zvdb::Database* db = CICad::GetDatabase();
-    // Symbols carry the key application: one walk of model space finds them all.
-    std::vector<OdDbObjectId> ids;
-    for (const OdDbObjectId& id : CICad::GetEntidadesComXData(kAppSimbolo, db)) {
-        if (!CICad::EhReferencia(id)) continue;
-        // Anonymous blocks and connector pins are never drawn.
-        const QString bloco = CICad::GetNomeBloco(id).toUpper();
-        if (!bloco.startsWith('*') && !bloco.startsWith(QLatin1String("PIN-"))) ids.push_back(id);
-    }
-    for (const auto& [nome, id] : CICad::GetEntradasDicionario({"ESQ_VIRTUAL_ZV"}, db))
-        if (CICad::TipoEntidade(id) == "XRECORD") ids.push_back(id);
-    for (const OdDbObjectId& id : ids) {
-        const CEListaXData dados = CICad::GetXData(id, kAppSimbolo);
-        if (dados.empty() || dados.front().codigo != 1000) continue;
-        // Key and standard: the first two parts of the text.
-        const QString& texto = dados.front().texto;
+    // The key and standard are the first two parts of the text.
+    const auto adiciona = [&candidatos](const OdDbObjectId& id, const QString& texto) {
         const int corte = texto.indexOf(CCDataReader::kSeparador);
         const int fim = corte < 0 ? -1 : texto.indexOf(CCDataReader::kSeparador, corte + 1);
         candidatos.emplace_back(
@@ -624,6 +611,19 @@ void CCDiagramaTopografico::ColetaCandidatos(Candidatos& candidatos) {
             Candidato{corte < 0 ? texto : texto.left(corte),
                       corte < 0 ? QString() : texto.mid(corte + 1, fim < 0 ? -1 : fim - corte - 1),
                       QString(), id, QString(), QString()});
+    };
+    // Symbols carry the key application: one walk of model space finds them all, with their
+    // block names and texts.
+    for (const CICad::ReferenciaComXData& ref : CICad::GetReferenciasComXData(kAppSimbolo, db)) {
+        // Anonymous blocks and connector pins are never drawn.
+        const QString bloco = ref.bloco.toUpper();
+        if (bloco.startsWith('*') || bloco.startsWith(QLatin1String("PIN-"))) continue;
+        if (ref.codigo == 1000) adiciona(ref.id, ref.texto);
+    }
+    for (const auto& [nome, id] : CICad::GetEntradasDicionario({"ESQ_VIRTUAL_ZV"}, db)) {
+        if (CICad::TipoEntidade(id) != "XRECORD") continue;
+        const CEListaXData dados = CICad::GetXData(id, kAppSimbolo);
+        if (!dados.empty() && dados.front().codigo == 1000) adiciona(id, dados.front().texto);
     }
     OrdenaPorChave(candidatos);
 }

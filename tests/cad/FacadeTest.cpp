@@ -770,3 +770,44 @@ TEST_F(FacadeFixture, ReferencesAreListedByTheUpperCaseNameOfTheirBlockInDrawing
     bornes.erase(lugar);
     EXPECT_EQ(bornes, esperados);
 }
+
+TEST_F(FacadeFixture, MarkedReferencesComeInDrawingOrderWithTheirBlockAndFirstItem) {
+    // Only model-space references that carry the application, as their block is spelt, with
+    // the first item of their data whatever its kind.
+    zvdb::BlockRecord* borne = db().createBlock("Borne1");
+    zvdb::BlockRecord* grupo = db().createBlock("GRUPO");
+    zvdb::BlockReference* texto = db().modelSpace()->addBlockReference(*borne, {0, 0, 0});
+    zvdb::BlockReference* sem = db().modelSpace()->addBlockReference(*borne, {10, 0, 0});
+    zvdb::BlockReference* ponto = db().modelSpace()->addBlockReference(*borne, {20, 0, 0});
+    zvdb::BlockReference* vazia = db().modelSpace()->addBlockReference(*grupo, {30, 0, 0});
+    zvdb::BlockReference* aninhada = grupo->addBlockReference(*borne, {0, 0, 0});
+    const auto id = [this](const zvdb::DbObject* o) { return OdDbObjectId(&db(), o->handle()); };
+    CICad::SetXData(id(texto), "KVR_ZV", {{1000, "K1"}});
+    CICad::SetXData(id(sem), "KVR_ZV_WIRE", {{1000, "W"}});
+    CEItemXData p;
+    p.codigo = 1010;
+    p.x = 1;
+    CICad::SetXData(id(ponto), "kvr_zv", {p, {1000, "depois"}});
+    CICad::SetXData(id(vazia), "KVR_ZV", {});
+    CICad::SetXData(id(aninhada), "KVR_ZV", {{1000, "dentro"}});
+    CICad::SetXData(id(db().modelSpace()->addLine({0, 0, 0}, {1, 1, 0})), "KVR_ZV", {{1000, "L"}});
+    const auto refs = CICad::GetReferenciasComXData("KVR_ZV", &db());
+    std::vector<OdDbObjectId> ids;
+    for (const auto& r : refs)
+        ids.push_back(r.id);
+    // An application with no items still marks its reference.
+    ASSERT_EQ(ids, (std::vector<OdDbObjectId>{id(texto), id(ponto), id(vazia)}));
+    EXPECT_EQ(refs[0].bloco, "Borne1");
+    EXPECT_EQ(refs[0].codigo, 1000);
+    EXPECT_EQ(refs[0].texto, "K1");
+    EXPECT_EQ(refs[1].codigo, 1010);
+    EXPECT_EQ(refs[2].bloco, "GRUPO");
+    EXPECT_EQ(refs[2].codigo, 0);
+    EXPECT_TRUE(refs[2].texto.isEmpty());
+    // The entity-by-entity reading agrees.
+    for (const auto& r : refs) {
+        const CEListaXData dados = CICad::GetXData(r.id, "KVR_ZV");
+        EXPECT_EQ(dados.empty() ? 0 : dados.front().codigo, r.codigo);
+        EXPECT_EQ(CICad::GetNomeBloco(r.id), r.bloco);
+    }
+}
