@@ -16,6 +16,8 @@ std::vector<WireConnections> ConnectionAnswers::answer(zvdb::Database& database,
     if (fresh) {
         finder.reset();  // before the new one is built: one index at a time
         finder = std::make_unique<ConnectionFinder>(database, tolerance);
+        if (!wireLayers_.current(database))
+            wireLayers_.adopt(database, finder->wiresAndLeadsByLayer());
     }
     std::vector<WireConnections> asked = kind == Kind::Wires ? finder->wires() : finder->cables();
     if (fresh && keepOther) {

@@ -8,6 +8,7 @@
 // to other things (see ConnectionChains) lets it go at once.
 #include "ConnectionFinder.h"
 #include "DrawingStamp.h"
+#include "WireLayerIndex.h"
 
 #include <memory>
 #include <string>
@@ -43,11 +44,15 @@ public:
     bool keepsIndex() const { return kept_ != nullptr; }
     // Lets go of a kept index: the caller has gone on to other things.
     void release() { kept_.reset(); }
+    // The wire and lead polylines by layer (getFiosPorLayer): an index walks the same
+    // drawing, so each new one hands them over as it stands.
+    WireLayerIndex& wireLayers() { return wireLayers_; }
 
 private:
     DrawingStamp stamp_;
     double tolerance_ = 0;
     std::unique_ptr<ConnectionFinder> kept_;
+    WireLayerIndex wireLayers_;
 };
 
 }  // namespace zvproduct

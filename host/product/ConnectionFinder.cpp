@@ -253,6 +253,24 @@ ConnectionFinder::ConnectionFinder(zvdb::Database& database, double tolerance)
     sortLines();
 }
 
+std::unordered_map<std::string, std::vector<std::uint64_t>> ConnectionFinder::wiresAndLeadsByLayer()
+    const {
+    std::vector<std::vector<std::uint64_t>> byId(layers_.size());
+    for (const std::vector<Line>* lines : {&wireLines_, &leadLines_})
+        for (const Line& line : *lines)
+            byId[static_cast<std::size_t>(line.layer)].push_back(line.handle);
+    std::unordered_map<std::string, std::vector<std::uint64_t>> byLayer;
+    for (const auto& [name, id] : layers_) {
+        std::vector<std::uint64_t>& handles = byId[static_cast<std::size_t>(id)];
+        if (handles.empty()) continue;
+        // A polyline that is both a wire and a lead came in both lists.
+        std::sort(handles.begin(), handles.end());
+        handles.erase(std::unique(handles.begin(), handles.end()), handles.end());
+        byLayer.emplace(std::string(name), std::move(handles));
+    }
+    return byLayer;
+}
+
 std::int32_t ConnectionFinder::layerId(std::string_view layer) {
     if (lastLayerId_ >= 0 && layer == lastLayer_) return lastLayerId_;
     lastLayer_ = layer;

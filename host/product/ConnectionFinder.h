@@ -46,6 +46,9 @@ public:
     // connections, leads in page order (tolerance 0.3).
     std::vector<WireConnections> cables() const;
     double tolerance() const { return tolerance_; }
+    // The wire and lead polylines (KVR_ZV_WIRE or KVR_ZV_CABO) of each layer, each once, in
+    // handle order: what the walk above saw, for those who ask by layer.
+    std::unordered_map<std::string, std::vector<std::uint64_t>> wiresAndLeadsByLayer() const;
 
     // The wire number of a KVR_ZV_WIRE polyline (FIO, WIRE, ALAMBRE or CABO item); empty. A
     // view into the drawing's storage.

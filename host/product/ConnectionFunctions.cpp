@@ -111,9 +111,9 @@ void installConnectionFunctions(Interpreter& lisp, const ProductContext& context
         0, 0);
     lisp.define(
         "getFiosPorLayer",
-        [context, index = std::make_shared<WireLayerIndex>()](Interpreter& in, Args a) {
+        [context, answers](Interpreter& in, Args a) {
             zvdb::Database& database = databaseOf(in, context);
-            return handleTexts(index->polylinesOn(database, stdText(in, a[0])));
+            return handleTexts(answers->wireLayers().polylinesOn(database, stdText(in, a[0])));
         },
         1, 1);
     // The wire reader, the ferrule reader and the material list ask in turn: one index.

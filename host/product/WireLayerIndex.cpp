@@ -20,6 +20,11 @@ void WireLayerIndex::rebuild(zvdb::Database& database) {
     stamp_ = DrawingStamp::of(database);
 }
 
+void WireLayerIndex::adopt(const zvdb::Database& database, ByLayer byLayer) {
+    byLayer_ = std::move(byLayer);
+    stamp_ = DrawingStamp::of(database);
+}
+
 const std::vector<std::uint64_t>& WireLayerIndex::polylinesOn(zvdb::Database& database,
                                                               const std::string& layer) {
     static const std::vector<std::uint64_t> none;

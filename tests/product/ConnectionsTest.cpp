@@ -1,7 +1,9 @@
 // Connection lists worked out from small drawings.
 #include "ProductFixture.h"
 
+#include "product/ConnectionAnswers.h"
 #include "product/ConnectionFinder.h"
+#include "product/WireLayerIndex.h"
 
 namespace zvproduct::testing {
 namespace {
@@ -215,6 +217,49 @@ TEST_F(ConnectionsTest, WireListsByPage) {
     oneOnTwo->erase();
     EXPECT_EQ(show("(getFiosPorLayer \"ESQ$0002$A\")"),
               "(\"" + hex(two) + "\" \"" + hex(three) + "\")");
+}
+
+TEST_F(ConnectionsTest, TheWiresByLayerThatAnIndexHandsOverAreThoseOfAWalkOfTheirOwn) {
+    wire("ESQ$0001$A", {{0, 0, 0}, {10, 0, 0}}, "1");
+    auto* both = wire("ESQ$0002$A", {{0, 5, 0}, {10, 5, 0}}, "2");
+    both->setXData("KVR_ZV_CABO", zvsample::XDataItems().text("20001\f1").tags());
+    auto* lower =
+        database->modelSpace()->addLwPolyline({{0, 9, 0}, {9, 9, 0}}, false, "ESQ$0002$A");
+    lower->setXData("kvr_zv_wire", zvsample::XDataItems().text("10006\f1").text("FIO\f3").tags());
+    auto* lead = database->modelSpace()->addLwPolyline({{0, 1, 0}, {9, 1, 0}}, false, "ESQ$0001$A");
+    lead->setXData("KVR_ZV_CABO", zvsample::XDataItems().text("20001\f1").tags());
+    auto* blind =
+        database->modelSpace()->addLwPolyline({{0, 2, 0}, {9, 2, 0}}, false, "ESQ$0001$A");
+    blind->setXData("KVR_ZV_CONEX_BLIND", zvsample::XDataItems().text("W1").tags());
+    database->modelSpace()->addLwPolyline({{0, 3, 0}, {9, 3, 0}}, false, "ESQ$0001$A");
+    wire("OFF", {{0, 0, 0}, {10, 0, 0}}, "4");
+    const std::vector<std::string> layers = {"ESQ$0001$A", "ESQ$0002$A", "OFF", "esq$0001$a",
+                                             "NONE"};
+    const auto compare = [&] {
+        ConnectionAnswers answers;
+        answers.answer(*database, 0.1, ConnectionAnswers::Kind::Wires);
+        // Handed over by the index, not walked again.
+        ASSERT_TRUE(answers.wireLayers().current(*database));
+        WireLayerIndex own;
+        for (const std::string& layer : layers)
+            EXPECT_EQ(answers.wireLayers().polylinesOn(*database, layer),
+                      own.polylinesOn(*database, layer))
+                << layer;
+    };
+    compare();
+    ConnectionAnswers answers;
+    answers.answer(*database, 0.1, ConnectionAnswers::Kind::Cables);
+    EXPECT_EQ(answers.wireLayers().polylinesOn(*database, "ESQ$0002$A"),
+              (std::vector<std::uint64_t>{both->handle(), lower->handle()}));
+    EXPECT_EQ(answers.wireLayers().polylinesOn(*database, "ESQ$0001$A").size(), 2u);
+    // A change since: the next question walks the drawing as it stands.
+    lead->erase();
+    both->setText(8, "OFF");
+    EXPECT_FALSE(answers.wireLayers().current(*database));
+    EXPECT_EQ(answers.wireLayers().polylinesOn(*database, "ESQ$0002$A"),
+              (std::vector<std::uint64_t>{lower->handle()}));
+    EXPECT_EQ(answers.wireLayers().polylinesOn(*database, "ESQ$0001$A").size(), 1u);
+    compare();
 }
 
 TEST_F(ConnectionsTest, WireListsOfLayersOffThePagesWhosePolylinesAlternate) {
