@@ -21,6 +21,7 @@
 
 #include <memory>
 #include <string_view>
+#include <typeinfo>
 #include <unordered_set>
 
 namespace zvproduct {
@@ -106,12 +107,14 @@ void refreshPageCounts(zvdb::Database& database) {
     for (const PageGroup& group : registry.groups())
         counts[group.name + "$DE"] = group.pages.size();
     for (zvdb::Entity* entity : database.modelSpace()->entities()) {
-        // Nearly every entity lies on a page: only a "$DE" layer's name is worth a copy.
+        // The kind first: it is read off the object, the layer off its tags. Nearly every
+        // entity lies on a page: only a "$DE" layer's name is worth a copy.
+        if (typeid(*entity) != typeid(zvdb::BlockReference)) continue;
         const std::string_view layer = entity->layer();
         if (!layer.ends_with("$DE")) continue;
         auto count = counts.find(std::string(layer));
-        auto* reference = dynamic_cast<zvdb::BlockReference*>(entity);
-        if (count == counts.end() || !reference) continue;
+        if (count == counts.end()) continue;
+        auto* reference = static_cast<zvdb::BlockReference*>(entity);
         // A count that stands is left alone: the title block is not changed for nothing.
         zvdb::Attribute* total = reference->attribute("TOTAL");
         const std::string text = std::to_string(count->second);
