@@ -11,8 +11,6 @@
 
 #include <QDateTime>
 
-#include <algorithm>
-
 namespace {
 
 bool Pergunta(int numero) {
@@ -155,11 +153,6 @@ CCListaPaginada::Grade CCListaPaginada::Grade::DoModelo(CETemplate& modelo) {
 
 void CCListaPaginada::Grade::Coloca(CEPaginaLista& pagina, CEItemLista* item,
                                     std::shared_ptr<CEItemLista> proprio) {
-    // A page's rows in one block: growing it row by row asks the heap for blocks large
-    // enough to make it tidy up its small free ones each time.
-    if (pagina.linhas.empty())
-        pagina.linhas.reserve(
-            size_t(std::clamp(static_cast<long long>(linhas) * std::max(colunas, 1), 1LL, 4096LL)));
     pagina.linhas.push_back(
         {item, double(CICad::Simples(x)), double(CICad::Simples(y)), {}, {}, std::move(proprio)});
     ++contagem;
