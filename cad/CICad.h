@@ -243,16 +243,19 @@ public:
     static std::vector<OdDbObjectId> GetEntidadesComXData(const QString& aplicacao,
                                                           zvdb::Database* database = nullptr);
     // The block references of model space that carry the application's extended data, in
-    // drawing order, from one walk: each with its block's name as spelt and the first item
-    // of its data (code 0 when the data has no items).
+    // drawing order, from one walk: each with its block's name as spelt, the first item of
+    // its data (code 0 when the data has no items) and the items of each of the `outras`
+    // applications, in their order, as GetXData reads them (none when absent).
     struct ReferenciaComXData {
         OdDbObjectId id;
         QString bloco;
         int codigo = 0;
         QString texto;
+        std::vector<CEListaXData> outras;
     };
     static std::vector<ReferenciaComXData> GetReferenciasComXData(
-        const char* aplicacao, zvdb::Database* database = nullptr);
+        const char* aplicacao, const std::vector<const char*>& outras = {},
+        zvdb::Database* database = nullptr);
     // The entries of a dictionary below the named-objects dictionary; nothing when the
     // path does not exist (it is not made).
     static std::vector<std::pair<QString, OdDbObjectId>> GetEntradasDicionario(

@@ -3,9 +3,11 @@
 #include "CICadInterno.h"
 
 #include "drawing/BlockRecord.h"
+#include "drawing/BlockReference.h"
 #include "drawing/Dictionary.h"
 #include "drawing/Entity.h"
 #include "drawing/SmallBuffer.h"
+#include "drawing/TagValues.h"
 #include "host/sdk/Document.h"
 #include "host/sdk/LispInterface.h"
 #include "readers/ZVString.h"
@@ -140,6 +142,57 @@ bool CICad::TemXData(const OdDbObjectId& id, const char* aplicacao) {
 
 CEListaXData CICad::GetXData(const OdDbObjectId& id, const QString& aplicacao) {
     return GetXData(id, U8(aplicacao).c_str());
+}
+
+namespace {
+
+// The items of the first group of each application named, from one pass over the object's
+// extended data (empty for one it lacks).
+void GruposXData(const zvdb::DbObject& objeto, std::span<const std::string_view> nomes,
+                 std::vector<std::span<const zvdb::Tag>>& grupos) {
+    grupos.assign(nomes.size(), {});
+    std::vector<bool> achados(nomes.size(), false);
+    const auto all = objeto.tags();
+    for (std::size_t i = objeto.xdataStart(); i < all.size(); ++i) {
+        if (all[i].code != 1001) continue;
+        std::size_t fim = i + 1;
+        while (fim < all.size() && all[fim].code != 1001)
+            ++fim;
+        for (std::size_t k = 0; k < nomes.size(); ++k)
+            if (!achados[k] && zvdb::TagValues::sameName(all[i].value, nomes[k])) {
+                achados[k] = true;
+                grupos[k] = all.subspan(i + 1, fim - i - 1);
+            }
+        i = fim - 1;
+    }
+}
+
+}  // namespace
+
+std::vector<CICad::ReferenciaComXData> CICad::GetReferenciasComXData(
+    const char* aplicacao, const std::vector<const char*>& outras, zvdb::Database* database) {
+    std::vector<ReferenciaComXData> referencias;
+    zvdb::Database* db = Db(database);
+    if (!db || !db->modelSpace()) return referencias;
+    std::vector<std::string_view> nomes{aplicacao};
+    nomes.insert(nomes.end(), outras.begin(), outras.end());
+    std::vector<std::span<const zvdb::Tag>> grupos;
+    db->modelSpace()->forEachEntity([&](zvdb::Entity& entidade) {
+        if (!entidade.hasXData(nomes.front())) return;
+        auto* ref = dynamic_cast<zvdb::BlockReference*>(&entidade);
+        if (!ref) return;
+        GruposXData(*ref, nomes, grupos);
+        ReferenciaComXData achada{Id(ref), Q(ref->blockName()), 0, QString(), {}};
+        if (!grupos.front().empty()) {
+            achada.codigo = grupos.front().front().code;
+            achada.texto = Q(grupos.front().front().value);
+        }
+        achada.outras.reserve(outras.size());
+        for (std::size_t k = 1; k < grupos.size(); ++k)
+            achada.outras.push_back(ConverteXData(grupos[k]));
+        referencias.push_back(std::move(achada));
+    });
+    return referencias;
 }
 
 CEListaXData CICad::GetXData(const OdDbObjectId& id, const char* aplicacao) {

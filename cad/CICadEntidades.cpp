@@ -178,27 +178,6 @@ std::vector<OdDbObjectId> CICad::GetEntidadesComXData(const QString& aplicacao,
     return ids;
 }
 
-std::vector<CICad::ReferenciaComXData> CICad::GetReferenciasComXData(const char* aplicacao,
-                                                                     zvdb::Database* database) {
-    std::vector<ReferenciaComXData> referencias;
-    zvdb::Database* db = Db(database);
-    if (!db || !db->modelSpace()) return referencias;
-    const std::string_view nome(aplicacao);
-    db->modelSpace()->forEachEntity([&](zvdb::Entity& entidade) {
-        if (!entidade.hasXData(nome)) return;
-        auto* ref = dynamic_cast<zvdb::BlockReference*>(&entidade);
-        if (!ref) return;
-        const std::span<const zvdb::Tag> itens = ref->xdataItems(nome);
-        ReferenciaComXData achada{Id(ref), Q(ref->blockName()), 0, QString()};
-        if (!itens.empty()) {
-            achada.codigo = itens.front().code;
-            achada.texto = Q(itens.front().value);
-        }
-        referencias.push_back(std::move(achada));
-    });
-    return referencias;
-}
-
 std::vector<std::pair<QString, OdDbObjectId>> CICad::GetEntradasDicionario(
     const QStringList& caminho, zvdb::Database* database) {
     std::vector<std::pair<QString, OdDbObjectId>> entradas;

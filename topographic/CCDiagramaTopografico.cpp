@@ -42,6 +42,8 @@ const char* const kAppRepresentacao = "KVR_ZV_REPRESENTACAO";
 const char* const kAppRepresentacaoEsq = "KVR_ZV_REPRESENTACAO_ESQ";
 const char* const kAppRepresentacaoAce = "KVR_ZV_REPRESENTACAO_ACE";
 const char* const kAppRepresentacaoAceEsq = "KVR_ZV_REPRESENTACAO_ACE_ESQ";
+const char* const kAppAditivo = "ZV_VINC_ADITIVO";
+const CEListaXData kSemDados;
 const char* const kPassoPadrao = "15";
 // The item's place as read, which the sort keeps among items that sort alike.
 const char* const kCampoSequencia = "ZV_TOPO_SEQUENCIA";
@@ -602,28 +604,43 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
 
 void CCDiagramaTopografico::ColetaCandidatos(Candidatos& candidatos) {
     zvdb::Database* db = CICad::GetDatabase();
+    const auto dadosDe = [](CEListaXData aditivos, CEListaXData ligacoes,
+                            CEListaXData ligacoesAce) -> std::shared_ptr<const DadosSimbolo> {
+        if (aditivos.empty() && ligacoes.empty() && ligacoesAce.empty()) return nullptr;
+        return std::make_shared<const DadosSimbolo>(
+            DadosSimbolo{std::move(aditivos), std::move(ligacoes), std::move(ligacoesAce)});
+    };
     // The key and standard are the first two parts of the text.
-    const auto adiciona = [&candidatos](const OdDbObjectId& id, const QString& texto) {
+    const auto adiciona = [&candidatos](const OdDbObjectId& id, const QString& texto,
+                                        std::shared_ptr<const DadosSimbolo> dados) {
         const int corte = texto.indexOf(CCDataReader::kSeparador);
         const int fim = corte < 0 ? -1 : texto.indexOf(CCDataReader::kSeparador, corte + 1);
         candidatos.emplace_back(
             ZVString::DeHandle(id.handle()),
             Candidato{corte < 0 ? texto : texto.left(corte),
                       corte < 0 ? QString() : texto.mid(corte + 1, fim < 0 ? -1 : fim - corte - 1),
-                      QString(), id, QString(), QString()});
+                      QString(), id, QString(), QString(), false, std::move(dados)});
     };
     // Symbols carry the key application: one walk of model space finds them all, with their
     // block names and texts.
-    for (const CICad::ReferenciaComXData& ref : CICad::GetReferenciasComXData(kAppSimbolo, db)) {
+    for (CICad::ReferenciaComXData& ref : CICad::GetReferenciasComXData(
+             kAppSimbolo, {kAppAditivo, kAppRepresentacaoEsq, kAppRepresentacaoAceEsq}, db)) {
         // Anonymous blocks and connector pins are never drawn.
         const QString bloco = ref.bloco.toUpper();
         if (bloco.startsWith('*') || bloco.startsWith(QLatin1String("PIN-"))) continue;
-        if (ref.codigo == 1000) adiciona(ref.id, ref.texto);
+        if (ref.codigo != 1000) continue;
+        adiciona(
+            ref.id, ref.texto,
+            dadosDe(std::move(ref.outras[0]), std::move(ref.outras[1]), std::move(ref.outras[2])));
     }
     for (const auto& [nome, id] : CICad::GetEntradasDicionario({"ESQ_VIRTUAL_ZV"}, db)) {
         if (CICad::TipoEntidade(id) != "XRECORD") continue;
         const CEListaXData dados = CICad::GetXData(id, kAppSimbolo);
-        if (!dados.empty() && dados.front().codigo == 1000) adiciona(id, dados.front().texto);
+        if (dados.empty() || dados.front().codigo != 1000) continue;
+        adiciona(
+            id, dados.front().texto,
+            dadosDe(CICad::GetXData(id, kAppAditivo), CICad::GetXData(id, kAppRepresentacaoEsq),
+                    CICad::GetXData(id, kAppRepresentacaoAceEsq)));
     }
     OrdenaPorChave(candidatos);
 }
@@ -644,17 +661,17 @@ void CCDiagramaTopografico::AdicionaAcessorios(Candidatos& candidatos) {
             doCatalogo = porChave.insert(simbolo.chave, std::move(cortados));
         }
         for (const auto& [i, acessorio] : *doCatalogo)
-            novos.push_back(
-                {"*" + QString::number(i) + "_" + chave,
-                 {acessorio, simbolo.norma, QString(), simbolo.simbolo, QString(), QString()}});
-        const CEListaXData aditivos = CICad::GetXData(simbolo.simbolo, "ZV_VINC_ADITIVO");
+            novos.push_back({"*" + QString::number(i) + "_" + chave,
+                             {acessorio, simbolo.norma, QString(), simbolo.simbolo, QString(),
+                              QString(), false, simbolo.dados}});
+        const CEListaXData& aditivos = simbolo.dados ? simbolo.dados->aditivos : kSemDados;
         int indice = 0;
         for (size_t i = 0; i + 1 < aditivos.size(); i += 2) {
             const int quantidade = ZVString(aditivos[i].texto).ParaInteiro();
             for (int n = 0; n < quantidade && n < 1000; ++n)
                 novos.push_back({"#" + QString::number(indice++) + "_" + chave,
                                  {aditivos[i + 1].texto, simbolo.norma, QString(), simbolo.simbolo,
-                                  QString(), QString()}});
+                                  QString(), QString(), false, simbolo.dados}});
         }
     }
     // A symbol's key never has a "_": the new keys join without meeting the old ones.
@@ -744,7 +761,8 @@ void CCDiagramaTopografico::DescartaDesenhados(Candidatos& candidatos) {
     const QString& representacao = parametros_.representacao;
     Filtra(candidatos, [&](Entrada& entrada) {
         if (entrada.first.contains('_')) return !AcessorioDesenhado(entrada.first, entrada.second);
-        const auto pares = Pares(CICad::GetXData(entrada.second.simbolo, kAppRepresentacaoEsq));
+        const Candidato& candidato = entrada.second;
+        const auto pares = Pares(candidato.dados ? candidato.dados->ligacoes : kSemDados);
         entrada.second.semLigacoes = pares.empty();
         for (const auto& [rep, handle] : pares)
             if (rep == representacao && !CICad::IdDoHandle(handle).isNull()) return false;
@@ -757,7 +775,7 @@ bool CCDiagramaTopografico::AcessorioDesenhado(const QString& chave, Candidato& 
     // symbol's list it shows and with which key (a changed catalogue draws the new one).
     const QString lugar = chave.section('_', 0, 0);
     const QString simbolo = chave.section('_', -1);
-    const auto pares = Pares(CICad::GetXData(candidato.simbolo, kAppRepresentacaoAceEsq));
+    const auto pares = Pares(candidato.dados ? candidato.dados->ligacoesAce : kSemDados);
     candidato.semLigacoes = pares.empty();
     for (const auto& [rep, handle] : pares) {
         if (rep != parametros_.representacao) continue;

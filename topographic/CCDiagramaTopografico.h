@@ -105,6 +105,12 @@ public:
         const Parametros& parametros, const std::vector<std::pair<QString, QString>>& blocos);
 
 private:
+    // What a symbol's extended data says of its extra accessories and of the blocks that
+    // earlier runs drew for it and for its accessories: read with the symbol, shared by its
+    // accessories' candidates.
+    struct DadosSimbolo {
+        CEListaXData aditivos, ligacoes, ligacoesAce;
+    };
     struct Candidato {
         QString chave, norma, bloco;
         OdDbObjectId simbolo;  // the symbol itself, or the one whose accessory it is
@@ -114,6 +120,8 @@ private:
         // The symbol had no link of this kind (its own block, or its accessories') when
         // the run began: the first link written needs no reading of the old ones.
         bool semLigacoes = false;
+        // Null when the symbol's data says none of these.
+        std::shared_ptr<const DadosSimbolo> dados;
     };
     // Candidates with their keys, in key order once gathered, each key once.
     using Entrada = std::pair<QString, Candidato>;

@@ -791,7 +791,8 @@ TEST_F(FacadeFixture, MarkedReferencesComeInDrawingOrderWithTheirBlockAndFirstIt
     CICad::SetXData(id(vazia), "KVR_ZV", {});
     CICad::SetXData(id(aninhada), "KVR_ZV", {{1000, "dentro"}});
     CICad::SetXData(id(db().modelSpace()->addLine({0, 0, 0}, {1, 1, 0})), "KVR_ZV", {{1000, "L"}});
-    const auto refs = CICad::GetReferenciasComXData("KVR_ZV", &db());
+    CICad::SetXData(id(texto), "OUTRA", {{1000, "a"}, {1000, "b"}});
+    const auto refs = CICad::GetReferenciasComXData("KVR_ZV", {"outra", "NENHUMA"}, &db());
     std::vector<OdDbObjectId> ids;
     for (const auto& r : refs)
         ids.push_back(r.id);
@@ -804,8 +805,18 @@ TEST_F(FacadeFixture, MarkedReferencesComeInDrawingOrderWithTheirBlockAndFirstIt
     EXPECT_EQ(refs[2].bloco, "GRUPO");
     EXPECT_EQ(refs[2].codigo, 0);
     EXPECT_TRUE(refs[2].texto.isEmpty());
+    // The other applications' items, each group as GetXData reads it.
+    ASSERT_EQ(refs[0].outras.size(), 2u);
+    ASSERT_EQ(refs[0].outras[0].size(), 2u);
+    EXPECT_EQ(refs[0].outras[0][1].texto, "b");
+    EXPECT_TRUE(refs[0].outras[1].empty());
+    EXPECT_TRUE(refs[1].outras[0].empty());
     // The entity-by-entity reading agrees.
     for (const auto& r : refs) {
+        const CEListaXData outra = CICad::GetXData(r.id, "OUTRA");
+        ASSERT_EQ(r.outras[0].size(), outra.size());
+        for (size_t i = 0; i < outra.size(); ++i)
+            EXPECT_EQ(r.outras[0][i].texto, outra[i].texto);
         const CEListaXData dados = CICad::GetXData(r.id, "KVR_ZV");
         EXPECT_EQ(dados.empty() ? 0 : dados.front().codigo, r.codigo);
         EXPECT_EQ(CICad::GetNomeBloco(r.id), r.bloco);
