@@ -147,11 +147,10 @@ CEListaXData CICad::GetXData(const OdDbObjectId& id, const QString& aplicacao) {
 namespace {
 
 // The items of the first group of each application named, from one pass over the object's
-// extended data (empty for one it lacks).
-void GruposXData(const zvdb::DbObject& objeto, std::span<const std::string_view> nomes,
+// extended data (a span with no data for one it lacks); whether it has the first.
+bool GruposXData(const zvdb::DbObject& objeto, std::span<const std::string_view> nomes,
                  std::vector<std::span<const zvdb::Tag>>& grupos) {
     grupos.assign(nomes.size(), {});
-    std::vector<bool> achados(nomes.size(), false);
     const auto all = objeto.tags();
     for (std::size_t i = objeto.xdataStart(); i < all.size(); ++i) {
         if (all[i].code != 1001) continue;
@@ -159,12 +158,11 @@ void GruposXData(const zvdb::DbObject& objeto, std::span<const std::string_view>
         while (fim < all.size() && all[fim].code != 1001)
             ++fim;
         for (std::size_t k = 0; k < nomes.size(); ++k)
-            if (!achados[k] && zvdb::TagValues::sameName(all[i].value, nomes[k])) {
-                achados[k] = true;
+            if (!grupos[k].data() && zvdb::TagValues::sameName(all[i].value, nomes[k]))
                 grupos[k] = all.subspan(i + 1, fim - i - 1);
-            }
         i = fim - 1;
     }
+    return grupos.front().data() != nullptr;
 }
 
 }  // namespace
@@ -178,10 +176,8 @@ std::vector<CICad::ReferenciaComXData> CICad::GetReferenciasComXData(
     nomes.insert(nomes.end(), outras.begin(), outras.end());
     std::vector<std::span<const zvdb::Tag>> grupos;
     db->modelSpace()->forEachEntity([&](zvdb::Entity& entidade) {
-        if (!entidade.hasXData(nomes.front())) return;
         auto* ref = dynamic_cast<zvdb::BlockReference*>(&entidade);
-        if (!ref) return;
-        GruposXData(*ref, nomes, grupos);
+        if (!ref || !GruposXData(*ref, nomes, grupos)) return;
         ReferenciaComXData achada{Id(ref), Q(ref->blockName()), 0, QString(), {}};
         if (!grupos.front().empty()) {
             achada.codigo = grupos.front().front().code;

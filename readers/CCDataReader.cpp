@@ -93,7 +93,7 @@ void CCDataReader::LiberaLeituras() {
     // It points into the catalogue answers just taken.
     semChave_.Esquece();
     // The module's commands go on while another thread frees them; elsewhere they go now.
-    if (Descarte* descarte = Descarte::DoModulo()) descarte->Entregar(std::move(leituras));
+    Descarte::Descartar(std::move(leituras));
 }
 
 // ---- connections

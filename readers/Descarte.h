@@ -35,8 +35,11 @@ public:
     // thread for it: `coisa` is then left as it was, for the caller to free.
     template <class T>
     bool Entregar(T&& coisa) noexcept;
-    // Empties `coisa` at once; what it held goes on the module's thread, or here when there
-    // is none.
+    // Hands `coisa` to the module's thread; without one, or when the hand-over fails, it is
+    // freed here.
+    template <class T>
+    static void Descartar(T&& coisa) noexcept;
+    // Empties `coisa` at once, and what it held goes as Descartar says.
     template <class T>
     static void Largar(T& coisa) noexcept;
     // Returns once everything handed over so far is destroyed.
@@ -84,7 +87,13 @@ bool Descarte::Entregar(T&& coisa) noexcept {
 }
 
 template <class T>
-void Descarte::Largar(T& coisa) noexcept {
-    T fora = std::exchange(coisa, T());
+void Descarte::Descartar(T&& coisa) noexcept {
+    static_assert(!std::is_lvalue_reference_v<T>, "hand things over with std::move");
+    T fora = std::move(coisa);
     if (Descarte* descarte = DoModulo()) descarte->Entregar(std::move(fora));
+}
+
+template <class T>
+void Descarte::Largar(T& coisa) noexcept {
+    Descartar(std::exchange(coisa, T()));
 }

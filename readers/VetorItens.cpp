@@ -238,7 +238,7 @@ struct ItensADestruir {
 }  // namespace
 
 void VetorItens::destruirItens() {
-    ItensADestruir feitos{std::exchange(static_cast<std::vector<CEItemLista*>&>(*this), {})};
     // The module's commands go on while another thread frees them; elsewhere they go now.
-    if (Descarte* descarte = Descarte::DoModulo()) descarte->Entregar(std::move(feitos));
+    Descarte::Descartar(
+        ItensADestruir{std::exchange(static_cast<std::vector<CEItemLista*>&>(*this), {})});
 }

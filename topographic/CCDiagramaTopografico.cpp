@@ -579,10 +579,7 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     };
     struct Entrega {
         QHash<QString, Lido>& itens;
-        ~Entrega() {
-            Restantes restantes{std::exchange(itens, {})};
-            if (Descarte* descarte = Descarte::DoModulo()) descarte->Entregar(std::move(restantes));
-        }
+        ~Entrega() { Descarte::Descartar(Restantes{std::exchange(itens, {})}); }
     } entrega{itensPorHandle_};
     itensComuns.clear();
     itensBornes.clear();
