@@ -226,8 +226,12 @@ void CCDataReader::LeBloco(const QString& s, CEItemLista& item, const OdDbObject
     chave.catalogo = &catalogo;
     lote_.clear();
     const std::vector<char>* lidos = CamposLidos;
-    auto poe = [this, lidos](std::uint32_t nome, const QString& valor) {
-        if (!lidos || (nome < lidos->size() && (*lidos)[nome])) lote_.push_back({nome, valor});
+    // A value no field will hold is not worked out: its name is still numbered in turn.
+    const auto quer = [lidos](std::uint32_t nome) {
+        return !lidos || (nome < lidos->size() && (*lidos)[nome]);
+    };
+    auto poe = [this, &quer](std::uint32_t nome, const QString& valor) {
+        if (quer(nome)) lote_.push_back({nome, valor});
     };
     for (const auto& [nome, valor] : catalogo.campos)
         poe(CamposItem::numeroComSufixo(nome, s), valor);
@@ -235,12 +239,14 @@ void CCDataReader::LeBloco(const QString& s, CEItemLista& item, const OdDbObject
     ligacoesLidas_.clear();
     for (const CESimboloLido::Atributo& atributo : lido.atributos) {
         TagLida& tag = TagDoTexto(atributo.tag);
-        const QString& valor = ValorDoTexto(atributo.valor);
         // A name is numbered when first written: under a suffix the whole name only, since
         // the bare tag may be the field of no item.
         if (s.isEmpty() && tag.numero == CamposItem::kSemNome)
             tag.numero = CamposItem::numero(tag.texto);
-        poe(s.isEmpty() ? tag.numero : CamposItem::numero(tag.texto + s), valor);
+        const std::uint32_t nome = s.isEmpty() ? tag.numero : CamposItem::numero(tag.texto + s);
+        if (!tag.ligacao && !quer(nome)) continue;
+        const QString& valor = ValorDoTexto(atributo.valor);
+        poe(nome, valor);
         if (tag.ligacao) ligacoesLidas_.push_back({tag.texto, valor, atributo.id});
     }
     atributosDe_ = referencia;
@@ -256,21 +262,25 @@ void CCDataReader::LeBloco(const QString& s, CEItemLista& item, const OdDbObject
     }
     poe(NumeroCampo<"HANDLE">(s), ZVString::DeHandle(referencia.handle()));
     // PAINEL and LOCAL hold the same value: templates use either name.
-    const Circuito& circuito = CircuitoDe(lido.temCircuito, lido.circuito);
-    poe(NumeroCampo<"PAINEL">(s), circuito.painel);
-    poe(NumeroCampo<"LOCAL">(s), circuito.painel);
-    poe(NumeroCampo<"CIRCUITO">(s), circuito.circuito);
+    const std::uint32_t painel = NumeroCampo<"PAINEL">(s), local = NumeroCampo<"LOCAL">(s),
+                        numeroCircuito = NumeroCampo<"CIRCUITO">(s);
+    if (quer(painel) || quer(local) || quer(numeroCircuito)) {
+        const Circuito& circuito = CircuitoDe(lido.temCircuito, lido.circuito);
+        poe(painel, circuito.painel);
+        poe(local, circuito.painel);
+        poe(numeroCircuito, circuito.circuito);
+    }
     poe(NumeroCampo<"ZV_LISTA">(s), catalogo.lista);
     poe(NumeroCampo<"ZV_KEY">(s), chave.chave);
     poe(NumeroCampo<"DESCRICAO">(s), catalogo.descricao);
     poe(NumeroCampo<"TP_DESCRI">(s), catalogo.descricao);
     const LayerLido& layer = LayerDoNome(lido.layer);
     // A reference's position is its insertion point; anything else is asked the long way.
-    const QString posicao = !lido.referencia        ? Posicao(referencia)
-                            : layer.grupo.isEmpty() ? QStringLiteral("??")
-                                                    : PosicaoNoPonto(referencia, layer.grupo,
-                                                                     layer.pagina, lido.posicao);
-    poe(NumeroCampo<"POSICAO">(s), posicao);
+    if (const std::uint32_t posicao = NumeroCampo<"POSICAO">(s); quer(posicao))
+        poe(posicao, !lido.referencia ? Posicao(referencia)
+                     : layer.grupo.isEmpty()
+                         ? QStringLiteral("??")
+                         : PosicaoNoPonto(referencia, layer.grupo, layer.pagina, lido.posicao));
     poe(NumeroCampo<"LAYER">(s), layer.nome);
     poe(NumeroCampo<"GRUPO">(s), layer.grupo);
     poe(NumeroCampo<"PAGINA">(s), layer.pagina);
