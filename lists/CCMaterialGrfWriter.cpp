@@ -138,6 +138,9 @@ void CCMaterialGrfWriter::SomaGrupos(VetorItens& itens, int digitos) {
             lote.begin(), lote.end(),
             [](const CamposItem::Campo& x, const CamposItem::Campo& y) { return x.nome < y.nome; });
         for (CEItemLista* m = item; m; m = m->ligado) {
+            // Room for exactly these: an array that doubled for them, in every item at
+            // once, would be new memory for the whole list.
+            m->campos.reservar(size_t(m->campos.size()) + lote.size());
             m->campos.juntarOrdenados(lote);
             if (m->ligado == item) break;
         }
