@@ -197,6 +197,7 @@ bool CCBorneDataReader::Aceita(CEItemLista* item, CETemplate& modelo, VetorItens
         return false;
     }
     PartilhaNomes(*item);
+    CamposPrevistos = size_t(item->campos.size());
     itens.push_back(item);
     RegistraNumero(*item);
     return true;

@@ -797,6 +797,7 @@ CEItemLista* CCDataReader::CriaItemBloco(const OdDbObjectId& referencia, CETempl
     if (ChaveDaEntidade(referencia).isEmpty()) return nullptr;
     auto* item = new CEItemLista;
     item->ids.push_back(referencia);
+    if (CamposPrevistos) item->campos.reservar(CamposPrevistos);
     if (GuardaSimbolos && CICad::EhReferencia(referencia))
         CopiaEntidade(QString(), *item, referencia, &modelo);
     else

@@ -163,6 +163,11 @@ protected:
     // CriaItemFio takes the wire's fields from its kept reading: set by a reader that copies
     // the same polylines again as the ends of its items (the bill of materials).
     bool FiosDasLeituras = false;
+    // Room for this many fields given to an item CriaItemBloco makes, before its first
+    // merge: a reader whose items are alike (a strip's terminals, each read with its two
+    // sides) sets the size of the last one, so that an item's fields move once, not at each
+    // doubling of its array.
+    std::size_t CamposPrevistos = 0;
     CECacheCatalogo& Catalogo() { return catalogo_; }
     // An item kept for the list shares its field names with the items kept before it.
     void PartilhaNomes(CEItemLista& item) { item.partilharNomes(); }
