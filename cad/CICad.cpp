@@ -34,6 +34,12 @@ ResultBuffer* LeSimbolo(const QString& nome, zvsdk::Document* documento = nullpt
     return valor;
 }
 
+// The first node of the symbol's value, without the chain; false when it is unbound.
+bool LePrimeiro(const QString& nome, ResultBuffer& primeiro, zvsdk::Document* documento = nullptr) {
+    zvsdk::LispInterface* lisp = LispDe(documento);
+    return lisp && lisp->lispGetSymbolFirst(nome, primeiro) == zvsdk::RTNORM;
+}
+
 void GravaSimbolo(const QString& nome, const ResultBuffer* valor,
                   zvsdk::Document* documento = nullptr) {
     if (zvsdk::LispInterface* lisp = LispDe(documento)) lisp->lispPutSymbol(nome, valor);
@@ -78,38 +84,36 @@ ResultBuffer* CICad::LeSimboloLisp(const QString& nome) {
     return LeSimbolo(nome);
 }
 
+short CICad::TipoSimboloLisp(const QString& nome) {
+    ResultBuffer valor;
+    return LePrimeiro(nome, valor) ? valor.restype : short(zvsdk::RTNONE);
+}
+
 QString CICad::GetStringLisp(const QString& nome, const QString& padrao) {
-    ResultBuffer* valor = LeSimbolo(nome);
-    if (!valor) return padrao;
+    ResultBuffer valor;
+    if (!LePrimeiro(nome, valor)) return padrao;
     // Any other type, nil included, reads as empty: callers test for emptiness.
-    const QString texto = valor->restype == zvsdk::RTSTR ? valor->rstring : QString();
-    zvsdk::releaseChain(valor);
-    return texto;
+    return valor.restype == zvsdk::RTSTR ? valor.rstring : QString();
 }
 
 double CICad::GetRealLisp(const QString& nome, double padrao) {
-    ResultBuffer* valor = LeSimbolo(nome);
-    double resultado = padrao;
-    if (valor && valor->restype == zvsdk::RTREAL) resultado = valor->rreal;
-    if (valor && valor->restype == zvsdk::RTSHORT) resultado = valor->rint;
-    zvsdk::releaseChain(valor);
-    return resultado;
+    ResultBuffer valor;
+    if (!LePrimeiro(nome, valor)) return padrao;
+    if (valor.restype == zvsdk::RTREAL) return valor.rreal;
+    if (valor.restype == zvsdk::RTSHORT) return valor.rint;
+    return padrao;
 }
 
 int CICad::GetIntLisp(const QString& nome, int padrao) {
-    ResultBuffer* valor = LeSimbolo(nome);
+    ResultBuffer valor;
     // Only 16-bit integers count; a 32-bit value gives the default.
-    const int resultado = valor && valor->restype == zvsdk::RTSHORT ? valor->rint : padrao;
-    zvsdk::releaseChain(valor);
-    return resultado;
+    return LePrimeiro(nome, valor) && valor.restype == zvsdk::RTSHORT ? valor.rint : padrao;
 }
 
 bool CICad::GetBoolLisp(const QString& nome, zvsdk::Document* documento) {
     if (!documento) return false;
-    ResultBuffer* valor = LeSimbolo(nome, documento);
-    const bool resultado = valor && valor->restype != zvsdk::RTNIL;
-    zvsdk::releaseChain(valor);
-    return resultado;
+    ResultBuffer valor;
+    return LePrimeiro(nome, valor, documento) && valor.restype != zvsdk::RTNIL;
 }
 
 bool CICad::GetBoolLisp(const QString& nome) {

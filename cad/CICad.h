@@ -333,6 +333,9 @@ public:
     // ---- reading LISP symbols
     // The symbol's raw chain (the caller frees it with LiberaLista); null when missing.
     static zvsdk::ResultBuffer* LeSimboloLisp(const QString& nome);
+    // The type of the first node LeSimboloLisp would give (RTNIL for nil, RTLB for a list),
+    // RTNONE when the symbol is unbound; no chain is made.
+    static short TipoSimboloLisp(const QString& nome);
     static QString GetStringLisp(const QString& nome, const QString& padrao = QString());
     static double GetRealLisp(const QString& nome, double padrao = 0.0);
     static int GetIntLisp(const QString& nome, int padrao = 0);

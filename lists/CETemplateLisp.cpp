@@ -55,12 +55,10 @@ bool CETemplateLisp::FiltraItem(const CEItemLista& item) {
     }
     item.paraLisp();
     CICad::AvaliaLisp(avaliacao_);
-    zvsdk::ResultBuffer* valor = CICad::LeSimboloLisp(simboloResposta);
+    const short tipo = CICad::TipoSimboloLisp(simboloResposta);
     CEItemLista::limparLisp();
     // Anything but nil passes, 0 and "" too.
-    const bool passa = valor && valor->restype != zvsdk::RTNIL && valor->restype != zvsdk::RTNONE;
-    CICad::LiberaLista(valor);
-    return passa;
+    return tipo != zvsdk::RTNIL && tipo != zvsdk::RTNONE;
 }
 
 double CETemplateLisp::TextoParaReal(const QString& texto) {

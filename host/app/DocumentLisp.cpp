@@ -82,6 +82,44 @@ int DocumentLisp::lispGetSymbol(const QString& name, zvsdk::ResultBuffer** value
     return zvsdk::RTNORM;
 }
 
+int DocumentLisp::lispGetSymbolFirst(const QString& name, zvsdk::ResultBuffer& first) {
+    const zvlisp::Symbol* symbol = knownSymbol(name);
+    if (!symbol || !symbol->assigned) return zvsdk::RTERROR;
+    // An atom as the chain's first node would hold it; a list, or anything printed, goes
+    // through the chain.
+    first = zvsdk::ResultBuffer();
+    try {
+        const Value value = zvlisp::Interpreter::valueOf(symbol);
+        switch (value.type()) {
+            case zvlisp::Type::Nil:
+                first.restype = zvsdk::RTNIL;
+                return zvsdk::RTNORM;
+            case zvlisp::Type::Int:
+                if (value.asInt() >= -32768 && value.asInt() <= 32767) {
+                    first.restype = zvsdk::RTSHORT;
+                    first.rint = short(value.asInt());
+                } else {
+                    first.restype = zvsdk::RTLONG;
+                    first.rlong = value.asInt();
+                }
+                return zvsdk::RTNORM;
+            case zvlisp::Type::Real:
+                first.restype = zvsdk::RTREAL;
+                first.rreal = value.asReal();
+                return zvsdk::RTNORM;
+            case zvlisp::Type::String:
+                first.restype = zvsdk::RTSTR;
+                first.rstring = value.asString();
+                return zvsdk::RTNORM;
+            default:
+                break;
+        }
+    } catch (const zvlisp::LispError&) {
+        return zvsdk::RTERROR;
+    }
+    return LispInterface::lispGetSymbolFirst(name, first);
+}
+
 int DocumentLisp::lispPutSymbol(const QString& name, const zvsdk::ResultBuffer* value) {
     if (name.isEmpty()) return zvsdk::RTERROR;
     zvlisp::Symbol* symbol = symbolOf(name);

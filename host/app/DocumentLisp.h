@@ -29,6 +29,7 @@ public:
     // texts are read until the symbol is set again (pairs or lispPutSymbol), or another
     // name gets pairs: then whatever else still holds the list gets it made whole.
     int lispPutStringPairs(const QString& name, const zvsdk::StringPair* pairs, int count) override;
+    int lispGetSymbolFirst(const QString& name, zvsdk::ResultBuffer& first) override;
     // Lets go of the pairs last published: their texts may be a module's own, gone with the
     // module, or gone after the command. What still holds them reads nil.
     void forgetPairs();

@@ -27,4 +27,15 @@ int LispInterface::lispPutStringPairs(const QString& name, const StringPair* pai
     return lispPutSymbol(name, nodes.data());
 }
 
+int LispInterface::lispGetSymbolFirst(const QString& name, ResultBuffer& first) {
+    ResultBuffer* chain = nullptr;
+    const int status = lispGetSymbol(name, &chain);
+    if (status == RTNORM && chain) {
+        first = *chain;
+        first.rbnext = nullptr;
+    }
+    releaseResultBuffer(chain);
+    return status == RTNORM && chain ? RTNORM : RTERROR;
+}
+
 }  // namespace zvsdk

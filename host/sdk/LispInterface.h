@@ -23,6 +23,11 @@ public:
     // lispPutSymbol. The caller keeps the texts alive and unchanged until it sets the
     // symbol again (pairs or lispPutSymbol) or publishes pairs under another name.
     virtual int lispPutStringPairs(const QString& name, const StringPair* pairs, int count);
+    // RTNORM and, in `first`, the first node of the chain lispGetSymbol would give (its
+    // rbnext null), or RTERROR as lispGetSymbol. A module reads template settings and
+    // answers this way, some once per item, so a host may skip making the chain; the default
+    // makes it.
+    virtual int lispGetSymbolFirst(const QString& name, ResultBuffer& first);
 };
 
 }  // namespace zvsdk

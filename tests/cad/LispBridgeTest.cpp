@@ -193,6 +193,52 @@ TEST_F(LispBridgeTest, StringPairsGiveTheSameListDirectlyAndThroughAChain) {
     EXPECT_EQ(documento_->lisp()->lispPutStringPairs("", pares.data(), 1), zvsdk::RTERROR);
 }
 
+// The first node the host gives without a chain is the chain's first node, for every kind
+// of value; a host that only makes chains gives the same.
+TEST_F(LispBridgeTest, TheFirstNodeOfASymbolIsTheChainsFirstNode) {
+    lisp(
+        "(setq n0 nil n1 \"abc\" n2 5 n3 40000 n4 -32768 n5 32768 n6 2.25 n7 T n8 'abc "
+        "n9 (list 1 \"b\") n10 \"\")");
+    CEItemLista item;
+    item.definirCampo("REGUA", "X2");
+    item.paraLisp();  // `reg`, published as pairs and made into a list when read
+    ChainOnlyLisp soCadeias(*documento_->lisp());
+    QStringList nomes{"reg", "nunca-definido"};
+    for (int i = 0; i <= 10; ++i)
+        nomes << "n" + QString::number(i);
+    for (const QString& nome : nomes) {
+        SCOPED_TRACE(nome.toStdString());
+        zvsdk::ResultBuffer* cadeia = nullptr;
+        const int esperado = documento_->lisp()->lispGetSymbol(nome, &cadeia);
+        for (zvsdk::LispInterface* lisp : {documento_->lisp(), (zvsdk::LispInterface*)&soCadeias}) {
+            zvsdk::ResultBuffer primeiro;
+            ASSERT_EQ(lisp->lispGetSymbolFirst(nome, primeiro), esperado);
+            if (esperado != zvsdk::RTNORM) continue;
+            ASSERT_NE(cadeia, nullptr);
+            EXPECT_EQ(primeiro.rbnext, nullptr);
+            EXPECT_EQ(primeiro.restype, cadeia->restype);
+            EXPECT_EQ(primeiro.rstring, cadeia->rstring);
+            if (cadeia->restype == zvsdk::RTSHORT) {
+                EXPECT_EQ(primeiro.rint, cadeia->rint);
+            }
+            if (cadeia->restype == zvsdk::RTLONG) {
+                EXPECT_EQ(primeiro.rlong, cadeia->rlong);
+            }
+            if (cadeia->restype == zvsdk::RTREAL) {
+                EXPECT_EQ(primeiro.rreal, cadeia->rreal);
+            }
+        }
+        zvsdk::releaseChain(cadeia);
+    }
+    CEItemLista::limparLisp();
+    EXPECT_EQ(CICad::TipoSimboloLisp("n9"), zvsdk::RTLB);
+    EXPECT_EQ(CICad::TipoSimboloLisp("n0"), zvsdk::RTNIL);
+    EXPECT_EQ(CICad::TipoSimboloLisp("n7"), zvsdk::RTT);
+    EXPECT_EQ(CICad::TipoSimboloLisp("nunca-definido"), zvsdk::RTNONE);
+    EXPECT_EQ(CICad::GetStringLisp("n8"), "ABC");  // a symbol reads as its name
+    EXPECT_DOUBLE_EQ(CICad::GetRealLisp("n6"), 2.25);
+}
+
 TEST_F(LispBridgeTest, HostCodeRegistersFunctionsThatUserCodeCanReplace) {
     auto* documentLisp = dynamic_cast<zvhost::DocumentLisp*>(documento_->lisp());
     ASSERT_NE(documentLisp, nullptr);
