@@ -92,16 +92,28 @@ CCBorneDataReader::LadoBorne CCBorneDataReader::AchaLado(CCDataReader& leitor,
     const CEPonto q = leitor.PontoDeCorte(borne);
     lado.ponto = insercao ? p : q;
     lado.outro = insercao ? q : p;
-    // The wire at the point is found once for both directions and the element's point.
+    // The wire at the point and its entries are found once for both directions, the
+    // element's handle and its point.
     const OdDbObjectId fio = leitor.FioNoPonto(leitor.LayerDe(borne), lado.ponto);
-    lado.vizinho = leitor.VizinhoNoFio(fio, borne, lado.ponto, !insercao);
-    if (lado.vizinho.isEmpty())
-        lado.vizinho = leitor.VizinhoNoFio(fio, borne, lado.ponto, insercao);
-    if (lado.vizinho.isEmpty()) return lado;
+    const auto entradas = leitor.EntradasDoFio(fio);
+    if (!entradas) return lado;
+    const TabelaConexoes::Textos& elementos = entradas->elementos;
+    // An entry with an empty text counts as none, as an empty handle would.
+    auto vizinho = [&](bool anterior) {
+        const int i = CCDataReader::LugarDoVizinho(*entradas, borne, lado.ponto, anterior);
+        return i >= 0 && !elementos.vista(i).isEmpty() ? i : -1;
+    };
+    int i = vizinho(!insercao);
+    if (i < 0) i = vizinho(insercao);
+    if (i < 0) return lado;
+    lado.vizinho = elementos.vista(i);
     // A stale handle in the connection answer: the element is null, the side stays blank.
-    lado.elemento = CICad::IdDoHandle(lado.vizinho, borne.database());
+    lado.elemento = CICad::IdDoHandle(lado.vizinho.toString(), borne.database());
     lado.fio = fio;
-    lado.pontoElemento = leitor.PontoDaConexao(leitor.NumeroDoFio(lado.fio), lado.vizinho);
+    // The point of the element's first entry on the wire.
+    const int j = elementos.indexOf(lado.vizinho);
+    if (j >= 0 && size_t(j) < entradas->pontos.size())
+        lado.pontoElemento = entradas->pontos[size_t(j)];
     return lado;
 }
 
@@ -147,7 +159,7 @@ void CCBorneDataReader::CompoeRelacaoBorne(const QString& sufixo, CEItemLista& i
     const QString rel = Primeiro<"RELACAO", "TAG", "ETIQUETA">(item, sufixo);
     const QString regua = Primeiro<"REGUA", "STRIP", "REGLETA">(item, sufixo);
     const QString num = Primeiro<"NUMERO", "NUMBER", "NUMERO">(item, sufixo);
-    const std::unique_ptr<zv::CEAtributo> ligacao = AtributoConexaoProximo(elemento, ponto);
+    const zv::CEAtributo* ligacao = ConexaoProxima(elemento, ponto);
     const QString lig = ligacao ? ligacao->GetValor() : QString();
     const Concatenacao& concatenacao = ConcatenacaoDo(modelo);
     const QString& sep = concatenacao.separador;

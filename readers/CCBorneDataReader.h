@@ -41,9 +41,11 @@ public:
     // One side of a terminal as any reader finds it: the element wired at the side's point
     // (the insertion point, or the cut point) and the wire there.
     struct LadoBorne {
-        CEPonto ponto;          // the side's point
-        CEPonto outro;          // the terminal's other point
-        QString vizinho;        // handle of the element wired there; empty when none
+        CEPonto ponto;  // the side's point
+        CEPonto outro;  // the terminal's other point
+        // Handle of the element wired there, empty when none: a view into the reader's
+        // connections, which holds until its reads are freed.
+        QStringView vizinho;
         OdDbObjectId elemento;  // that element, null when its handle is stale
         OdDbObjectId fio;       // the wire at the side's point, null when none
         CEPonto pontoElemento;  // where the wire meets the element

@@ -73,9 +73,18 @@ public:
     // The same along `fio`, the wire already found at the point (null: none).
     QString VizinhoNoFio(const OdDbObjectId& fio, const OdDbObjectId& entidade,
                          const CEPonto& ponto, bool anterior) const;
+    // The entries of the wire's connections (none when it has none) and the place among them
+    // of the element VizinhoNoFio gives (-1 when it gives none): a terminal's side reads the
+    // element's handle and point there, without texts made for them.
+    std::optional<TabelaConexoes::Entradas> EntradasDoFio(const OdDbObjectId& fio) const;
+    static int LugarDoVizinho(const TabelaConexoes::Entradas& c, const OdDbObjectId& entidade,
+                              const CEPonto& ponto, bool anterior);
     CEPonto PontoDeCorte(const OdDbObjectId& referencia) const;
     std::unique_ptr<zv::CEAtributo> AtributoConexaoProximo(const OdDbObjectId& elemento,
                                                            const CEPonto& ponto) const;
+    // The same, kept by the reader: valid until the next question of this kind. Every side
+    // of a list asks, and most only read the value.
+    const zv::CEAtributo* ConexaoProxima(const OdDbObjectId& elemento, const CEPonto& ponto) const;
     VetorItens* LeDicionarioCabos(zvdb::Database* database);
     bool EhEquipamento(const OdDbObjectId& id) const;
 
@@ -197,7 +206,7 @@ private:
     std::unordered_map<QString, std::unique_ptr<FiosDoLayer>> indicesFios_;
     std::uint64_t versaoIndices_ = 0;  // the drawing's version the indexes were read at
     // The first vertex of each wire the indexes read, for the wire's position.
-    std::unordered_map<OdDbObjectId, CEPonto> primeirosVertices_;
+    TabelaIds<CEPonto> primeirosVertices_;
     // Route records in store order, read on the first lookup; routes by wire key.
     struct Rota {
         QString chave, dados;
@@ -259,6 +268,8 @@ private:
         bool proprio = false;
     };
     mutable TabelaIds<NumeroFio> numerosFios_;
+    mutable std::vector<std::string_view> textosNumero_;  // the wire's items being searched
+    std::optional<QString> NumeroNoCampoFio(const OdDbObjectId& entidade) const;
     // Per cable record (by handle text): its CABO or CABLE attribute, shared by its cores.
     mutable QHash<QString, std::optional<QString>> numerosCabos_;
     QString NumeroNoCabo(const OdDbObjectId& entidade) const;
@@ -336,6 +347,8 @@ private:
     };
     mutable PorTexto<LayerLido> layers_;
     const LayerLido& LayerDoNome(std::string_view nome) const;
+    // Posicao of an entity of that layer.
+    QString PosicaoNoLayer(const OdDbObjectId& entidade, const LayerLido& layer) const;
     // The position text at a point of the entity's page.
     QString PosicaoNoPonto(const OdDbObjectId& entidade, const QString& grupo,
                            const QString& pagina, const CEPonto& p) const;
@@ -384,6 +397,9 @@ private:
     void PoeColunasFio(const QString& s, CEItemLista& item, const ChaveLida& chave);
     const std::pair<QString, QString>& ListaDescricaoFioDe(const ChaveLida& chave);
     std::vector<std::string_view> textosFio_;  // the items of the wire being read
+    // The numbers of wires' field names by the names as the drawing holds them.
+    PorTexto<std::uint32_t> nomesFio_;
+    std::uint32_t NumeroDoNomeFio(std::string_view nome);
     // The last symbol read, and the fields of one reading before they join the item (in
     // order of writing: a later one of the same name wins).
     CESimboloLido simbolo_;

@@ -355,6 +355,44 @@ TEST_F(NeighbourTest, AWireWithOneElementGivesNoNeighbour) {
     EXPECT_EQ(vizinho(s, {150, 200, 0}, true), "");
 }
 
+// A terminal's side takes the element the neighbour question gives (looking the other way
+// when it gives none), its object, the wire there and the element's first point on it.
+TEST_F(NeighbourTest, ATerminalsSideIsWhatTheNeighbourAndPointQueriesGive) {
+    zvdb::BlockReference* fora = simbolo("BORNE_1", {300, 300, 0});
+    int lados = 0;
+    for (const zvdb::BlockReference* borne : {t, u, v, b, w, d, s, fora}) {
+        for (const bool insercao : {true, false}) {
+            const CCBorneDataReader::LadoBorne lado =
+                CCBorneDataReader::AchaLado(*r, id(borne), insercao);
+            const CEPonto p = CICad::GetPosicao(id(borne));
+            const CEPonto q = r->PontoDeCorte(id(borne));
+            const CEPonto ponto = insercao ? p : q;
+            EXPECT_DOUBLE_EQ(lado.ponto.y, ponto.y);
+            EXPECT_DOUBLE_EQ(lado.outro.y, (insercao ? q : p).y);
+            QString esperado = r->VizinhoNaConexao(id(borne), ponto, !insercao);
+            if (esperado.isEmpty()) esperado = r->VizinhoNaConexao(id(borne), ponto, insercao);
+            const std::string onde = handle(borne).toStdString() + (insercao ? " ini" : " fim");
+            EXPECT_EQ(lado.vizinho.toString(), esperado) << onde;
+            if (esperado.isEmpty()) {
+                EXPECT_TRUE(lado.elemento.isNull()) << onde;
+                EXPECT_TRUE(lado.fio.isNull()) << onde;
+                continue;
+            }
+            ++lados;
+            EXPECT_EQ(lado.elemento, CICad::IdDoHandle(esperado)) << onde;
+            EXPECT_EQ(lado.fio, r->FioNoPonto(r->LayerDe(id(borne)), ponto)) << onde;
+            const CEPonto noFio = r->PontoDaConexao(r->NumeroDoFio(lado.fio), esperado);
+            EXPECT_DOUBLE_EQ(lado.pontoElemento.x, noFio.x) << onde;
+            EXPECT_DOUBLE_EQ(lado.pontoElemento.y, noFio.y) << onde;
+        }
+    }
+    EXPECT_EQ(lados, 8);
+    // W stands twice on wire 104: the element's point is its first entry's, at W's insertion.
+    const CCBorneDataReader::LadoBorne emD = CCBorneDataReader::AchaLado(*r, id(d), true);
+    EXPECT_EQ(emD.vizinho.toString(), handle(w));
+    EXPECT_DOUBLE_EQ(emD.pontoElemento.y, 150.0);
+}
+
 // A neighbour erased after the connections were loaded answers by a handle that no longer
 // opens: the terminal's side stays blank, with no placeholder fields of a missing block.
 TEST_F(NeighbourTest, ANeighbourThatDoesNotOpenLeavesTheSideBlank) {
@@ -475,6 +513,33 @@ TEST_F(ConnectionQueriesTest, AWireNumberComesFromItsNamedFieldInAnyLanguage) {
     EXPECT_EQ(r->NumeroDoFio(id(curto)), "");
     EXPECT_FALSE(r->EhFioNumerado(id(curto)));
     EXPECT_EQ(r->NumeroDoFio(id(fio({{0, 0, 0}, {1, 1, 0}}, "12"))), "12");
+}
+
+// The field texts are split as any other: empty parts skipped, a text of three parts is
+// no field; the name is upper-cased as Qt does it, also beyond ASCII.
+TEST_F(ConnectionQueriesTest, AWireNumberFieldIsSplitAndNamedAsAnyFieldText) {
+    auto numero = [&](std::vector<std::string> campos) {
+        zvsample::XDataItems itens;
+        itens.text("10006\f1").text("1");
+        for (const std::string& campo : campos)
+            itens.text(campo);
+        zvdb::Polyline* linha = db().modelSpace()->addLwPolyline({{0, 0, 0}, {1, 0, 0}}, false);
+        linha->setXData("KVR_ZV_WIRE", itens.tags());
+        auto r = leitor();
+        return r->EhFioNumerado(id(linha)) ? r->NumeroDoFio(id(linha)) : QString("none");
+    };
+    EXPECT_EQ(numero({"\f\fFio\f\f8B\f"}), "8B");
+    EXPECT_EQ(numero({"FIO\f1\f2", "Alambre\f3"}), "3");
+    EXPECT_EQ(numero({"CABO"}), "");
+    EXPECT_EQ(numero({"\f", "", "FIOS\f1", "FI\f1",
+                      "WIRE\f\xce\xa9"
+                      "1"}),
+              QString::fromUtf8("\xce\xa9"
+                                "1"));
+    // U+0131 (dotless i) upper-cases to I; U+00CD does not.
+    EXPECT_EQ(numero({"f\xc4\xb1o\f4"}), "4");
+    EXPECT_EQ(numero({"F\xc3\x8dO\f5"}), "none");
+    EXPECT_EQ(numero({"C\xc3\x81\x42O\f6", "cAbO\f7"}), "7");
 }
 
 TEST_F(ConnectionQueriesTest, TheCutPointIsTheStoredPointThatIsNotTheInsertion) {
