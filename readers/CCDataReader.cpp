@@ -363,6 +363,21 @@ bool EhNomeDoNumero(std::string_view nome) {
     return igual("CABO") || igual("FIO") || igual("WIRE") || igual("ALAMBRE");
 }
 
+// Whether the attribute's name, in upper case, is one of the cable number's.
+bool EhNomeDoCabo(std::string_view nome) {
+    if (std::any_of(nome.begin(), nome.end(), [](char c) { return c & 0x80; })) {
+        const QString maiusculo = QString::fromUtf8(nome.data(), int(nome.size())).toUpper();
+        return maiusculo == "CABO" || maiusculo == "CABLE";
+    }
+    const auto igual = [nome](std::string_view palavra) {
+        return nome.size() == palavra.size() &&
+               std::equal(nome.begin(), nome.end(), palavra.begin(), [](char a, char b) {
+                   return (a >= 'a' && a <= 'z' ? char(a - 'a' + 'A') : a) == b;
+               });
+    };
+    return igual("CABO") || igual("CABLE");
+}
+
 }  // namespace
 
 // The number in a wire's own field of KVR_ZV_WIRE, from its third item on. Every wire at a
@@ -377,6 +392,33 @@ std::optional<QString> CCDataReader::NumeroNoCampoFio(const OdDbObjectId& entida
     return std::nullopt;
 }
 
+// The value of the record's first virtual attribute named CABO or CABLE in any case; none
+// without one. Its texts are read where the drawing holds them, split as
+// CICad::GetAtributosVirtuais splits them: an empty field between two separators reads " ",
+// and only texts of three fields count. (Items other than texts never split in three.)
+std::optional<QString> CCDataReader::NumeroDoRegistroCabo(const OdDbObjectId& registro) const {
+    const char sep = char(kSeparador.unicode());
+    CICad::TextosXData(registro, "KVR_ZV_ATT_VIRTUAL", textosNumero_);
+    for (const std::string_view texto : textosNumero_) {
+        std::string_view campos[3];
+        int n = 0;
+        for (std::size_t i = 0; n <= 3;) {
+            const std::size_t fim = std::min(texto.find(sep, i), texto.size());
+            const std::string_view campo = texto.substr(i, fim - i);
+            const bool borda = i == 0 || fim == texto.size();
+            if (!campo.empty() || !borda) {
+                if (n < 3) campos[n] = campo.empty() ? std::string_view(" ") : campo;
+                ++n;
+            }
+            if (fim == texto.size()) break;
+            i = fim + 1;
+        }
+        if (n == 3 && EhNomeDoCabo(campos[0]))
+            return QString::fromUtf8(campos[1].data(), int(campos[1].size()));
+    }
+    return std::nullopt;
+}
+
 // A cable core's number: the cable's own number (a CABO or CABLE attribute of its record)
 // and the core, from KVR_ZV_CABO; empty when there is none.
 QString CCDataReader::NumeroNoCabo(const OdDbObjectId& entidade) const {
@@ -387,16 +429,9 @@ QString CCDataReader::NumeroNoCabo(const OdDbObjectId& entidade) const {
     for (size_t i = 2; i < cabo.size(); ++i) {
         if (!EhTexto(cabo[i])) continue;
         auto guardado = numerosCabos_.constFind(cabo[i].texto);
-        if (guardado == numerosCabos_.constEnd()) {
-            std::optional<QString> numero;
-            std::unique_ptr<zv::CEListaAtributos> atributos;
-            CICad::GetAtributosVirtuais(CICad::IdDoHandle(cabo[i].texto), atributos);
-            for (int a = 0; atributos && a < atributos->Quantidade() && !numero; ++a) {
-                const QString tag = (*atributos)[a].GetTag().toUpper();
-                if (tag == "CABO" || tag == "CABLE") numero = (*atributos)[a].GetValor();
-            }
-            guardado = numerosCabos_.insert(cabo[i].texto, numero);
-        }
+        if (guardado == numerosCabos_.constEnd())
+            guardado = numerosCabos_.insert(cabo[i].texto,
+                                            NumeroDoRegistroCabo(CICad::IdDoHandle(cabo[i].texto)));
         if (*guardado) return **guardado + CCDataReader::kSeparador + esquerda;
     }
     return {};

@@ -273,6 +273,7 @@ private:
     // Per cable record (by handle text): its CABO or CABLE attribute, shared by its cores.
     mutable QHash<QString, std::optional<QString>> numerosCabos_;
     QString NumeroNoCabo(const OdDbObjectId& entidade) const;
+    std::optional<QString> NumeroDoRegistroCabo(const OdDbObjectId& registro) const;
     // Per element, its connection attributes with the places of their texts.
     struct LigacaoGuardada {
         CEPonto posicao;

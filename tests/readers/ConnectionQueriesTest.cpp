@@ -12,6 +12,7 @@
 #include "readers/CCBorneDataReader.h"
 #include "readers/CCDataReader.h"
 #include "readers/CEAtributo.h"
+#include "readers/CEListaAtributos.h"
 #include "readers/LeitorBase.h"
 #include "readers/ZVString.h"
 #include "sample/XDataItems.h"
@@ -767,6 +768,47 @@ TEST_F(ConnectionQueriesTest, CoresOfACableTakeItsNumberAndFollowItsChange) {
     // A record without a cable number: the core has none either.
     registro->setXData("KVR_ZV_ATT_VIRTUAL", zvsample::XDataItems().text("COR\fAZUL\fN").tags());
     EXPECT_EQ(r->NumeroDoFio(id(um)), "");
+}
+
+// The record's texts are split as its virtual attributes are: the first of three fields
+// named CABO or CABLE in any case gives the cable's number.
+TEST_F(ConnectionQueriesTest, ACableNumberIsTheRecordsVirtualAttributeOfThatName) {
+    const std::string caminho[] = {"ZV_CABOS"};
+    zvdb::XRecord* registro = db().dictionaryAt(caminho, true)->getOrCreateXRecord("W2");
+    zvdb::Polyline* nucleo = db().modelSpace()->addLwPolyline({{0, 0, 0}, {9, 0, 0}}, false);
+    const std::string h = ZVString::DeHandle(registro->handle()).toStdString();
+    nucleo->setXData("KVR_ZV_CABO", zvsample::XDataItems().text("20101\f1").text(h).text(h).tags());
+    auto r = leitor();
+    const std::vector<std::pair<std::vector<std::string>, QString>> casos = {
+        {{"cable\fC9\fN"}, "C9"},
+        {{"\fCABO\f\fS"}, " "},
+        {{"CABO\fX\fN\fextra", "Cable\fY\fN"}, "Y"},
+        {{"CABO\fX\fN\f"}, "X"},
+        {{"CABO\fZ"}, ""},
+        {{"CABO\f\f\fN"}, ""},
+        {{"RELACAO\f-W\fN",
+          "C\xc3\x81"
+          "BO\fQ\fN",
+          "CABLE\f\xce\xa9\fS"},
+         QString::fromUtf8("\xce\xa9")},
+    };
+    for (const auto& [textos, numero] : casos) {
+        zvsample::XDataItems itens;
+        for (const std::string& texto : textos)
+            itens.text(texto);
+        registro->setXData("KVR_ZV_ATT_VIRTUAL", itens.tags());
+        // What the record's attributes say, as the facade lists them.
+        std::unique_ptr<zv::CEListaAtributos> atributos;
+        CICad::GetAtributosVirtuais(id(registro), atributos);
+        QString esperado;
+        for (int a = 0; atributos && a < atributos->Quantidade() && esperado.isEmpty(); ++a) {
+            const QString tag = (*atributos)[a].GetTag().toUpper();
+            if (tag == "CABO" || tag == "CABLE")
+                esperado = (*atributos)[a].GetValor() + QChar(0x0C) + "20101";
+        }
+        EXPECT_EQ(esperado, numero.isEmpty() ? QString() : numero + QChar(0x0C) + "20101");
+        EXPECT_EQ(r->NumeroDoFio(id(nucleo)), esperado) << textos.front();
+    }
 }
 
 // The key and standard come from the first of KVR_ZV, KVR_ZV_WIRE and KVR_ZV_CABO that has
