@@ -86,6 +86,8 @@ void CCDataReader::LiberaLeituras() {
                catalogoComp_, constantes_, ligacoesLidas_, chaves_, textosFio_, tags_, valores_,
                lote_, ordemLote_, basesAcessorio_, basesColunas_, nomesFio_, textosNumero_);
     versaoIndices_ = 0;
+    indiceAtual_ = nullptr;
+    layerDoUltimo_ = nullptr;
     rotasLidas_ = false;
     corteDe_ = OdDbObjectId();
     versaoLidas_ = 0;
@@ -183,6 +185,15 @@ struct CCDataReader::FiosDoLayer {
 };
 
 const CCDataReader::FiosDoLayer& CCDataReader::IndiceFios(const QString& layer) {
+    if (indiceAtual_ && versaoIndices_ == CICad::VersaoDesenho() && layer == layerIndice_)
+        return *indiceAtual_;
+    const FiosDoLayer& indice = LeIndiceFios(layer);
+    indiceAtual_ = &indice;
+    layerIndice_ = layer;
+    return indice;
+}
+
+const CCDataReader::FiosDoLayer& CCDataReader::LeIndiceFios(const QString& layer) {
     const std::uint64_t versao = CICad::VersaoDesenho();
     if (versao != versaoIndices_) {
         indicesFios_.clear();

@@ -184,6 +184,10 @@ private:
     // answers the wire-at-point question from the few wires near the point.
     struct FiosDoLayer;
     const FiosDoLayer& IndiceFios(const QString& layer);
+    const FiosDoLayer& LeIndiceFios(const QString& layer);
+    // The index asked for last and its layer: a terminal's sides ask for one layer in turn.
+    QString layerIndice_;
+    const FiosDoLayer* indiceAtual_ = nullptr;
     void LeCircuitoLocal(const QString& sufixo, CEItemLista& item, const OdDbObjectId& entidade);
     // The wire's fields without the look-up of its routes; false when the polyline is no
     // complete wire (the reading stops there).
@@ -348,6 +352,10 @@ private:
     };
     mutable PorTexto<LayerLido> layers_;
     const LayerLido& LayerDoNome(std::string_view nome) const;
+    // The entity LayerDe was asked for last, its layer's name and the drawing's version then.
+    mutable OdDbObjectId layerDe_;
+    mutable const QString* layerDoUltimo_ = nullptr;
+    mutable std::uint64_t layerVersao_ = 0;
     // Posicao of an entity of that layer.
     QString PosicaoNoLayer(const OdDbObjectId& entidade, const LayerLido& layer) const;
     // The position text at a point of the entity's page.

@@ -114,7 +114,13 @@ const CCDataReader::LayerLido& CCDataReader::LayerDoNome(std::string_view nome) 
 }
 
 const QString& CCDataReader::LayerDe(const OdDbObjectId& entidade) const {
-    return LayerDoNome(CICad::NomeLayerUtf8(entidade)).nome;
+    // Both sides of a terminal ask for its layer, each twice.
+    const std::uint64_t versao = CICad::VersaoDesenho(entidade.database());
+    if (layerDoUltimo_ && entidade == layerDe_ && versao == layerVersao_) return *layerDoUltimo_;
+    layerDoUltimo_ = &LayerDoNome(CICad::NomeLayerUtf8(entidade)).nome;
+    layerDe_ = entidade;
+    layerVersao_ = versao;
+    return *layerDoUltimo_;
 }
 
 QString CCDataReader::PosicaoNoPonto(const OdDbObjectId& entidade, const QString& grupo,
