@@ -3,7 +3,10 @@
 // each of its sides, the wires themselves, and the jumper chains of the strips.
 #include "CCDataReader.h"
 
+#include <array>
 #include <unordered_set>
+#include <utility>
+#include <vector>
 
 class CCBorneDataReader : public CCDataReader {
 public:
@@ -81,6 +84,10 @@ private:
     };
     Concatenacao concatenacao_;
     const Concatenacao& ConcatenacaoDo(CETemplate& modelo);
+    // Per suffix of a side, the numbers of the relation's, strip's and number's names in the
+    // three languages (kSemNome until first asked). Valid until the next suffix is added.
+    std::vector<std::pair<QString, std::array<std::uint32_t, 9>>> lugaresLado_;
+    std::uint32_t* LugaresDoLado(const QString& sufixo);
 
     bool avisouLista_ = false;
     bool duplicado_ = false;
