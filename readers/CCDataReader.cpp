@@ -20,8 +20,6 @@ const QChar CCDataReader::kSeparador = QChar(0x0C);
 
 namespace {
 
-const QLatin1String kPalavrasConexao[] = {QLatin1String("LIGACAO"), QLatin1String("CONNECTION"),
-                                          QLatin1String("CONEXION")};
 constexpr double kToleranciaElemento = 3.0;
 constexpr double kForaDoSegmento = 666.0;
 
@@ -562,15 +560,16 @@ const zv::CEAtributo* CCDataReader::ConexaoProxima(const OdDbObjectId& elemento,
                                         zv::CEAtributo(lida.tag, QString(), lida.valor, lida.id,
                                                        CICad::AtributoInvisivel(lida.id))});
             } else {
-                std::unique_ptr<zv::CEListaAtributos> atributos;
-                CICad::GetAtributos(elemento, atributos, false, false);
-                for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
-                    const zv::CEAtributo& atributo = (*atributos)[i];
-                    const QString tag = atributo.GetTag().toUpper();
-                    if (std::any_of(
-                            std::begin(kPalavrasConexao), std::end(kPalavrasConexao),
-                            [&tag](QLatin1String palavra) { return tag.startsWith(palavra); }))
-                        ligacoes.push_back({CICad::GetPosicaoTexto(atributo.GetId()), atributo});
+                // The attributes as the drawing holds them, with their tags and values trimmed
+                // as an attribute list gives them: no list and no texts made for the others.
+                CICad::LeituraSimbolo(elemento, simboloLigacoes_);
+                for (const CESimboloLido::Atributo& atributo : simboloLigacoes_.atributos) {
+                    const TagLida& tag = TagDoTexto(atributo.tag);
+                    if (!tag.ligacao) continue;
+                    ligacoes.push_back(
+                        {CICad::GetPosicaoTexto(atributo.id),
+                         zv::CEAtributo(tag.texto, QString(), ValorDoTexto(atributo.valor),
+                                        atributo.id, CICad::AtributoInvisivel(atributo.id))});
                 }
             }
         }

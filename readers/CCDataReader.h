@@ -340,6 +340,8 @@ private:
     mutable OdDbObjectId atributosDe_;
     mutable std::uint64_t atributosVersao_ = 0;
     mutable std::vector<LigacaoLida> ligacoesLidas_;
+    // An element read for its connection attributes alone.
+    mutable CESimboloLido simboloLigacoes_;
     // Per layer name, its group and page (empty unless the name has three parts); per catalogue
     // type, its text: items repeat a few of each.
     mutable QHash<QString, std::pair<QString, QString>> gruposPaginas_;
@@ -393,12 +395,12 @@ private:
         bool ligacao;
         QString texto;
     };
-    PorTexto<TagLida> tags_;
-    TagLida& TagDoTexto(std::string_view tag);
+    mutable PorTexto<TagLida> tags_;
+    TagLida& TagDoTexto(std::string_view tag) const;
     // Attribute values, trimmed, by their text in the drawing: symbols repeat theirs, and
     // their items share one text.
-    PorTexto<QString> valores_;
-    const QString& ValorDoTexto(std::string_view valor);
+    mutable PorTexto<QString> valores_;
+    const QString& ValorDoTexto(std::string_view valor) const;
     // The key text of an entity as ChaveENorma reads it; semChave_ without one.
     const ChaveLida& ChaveDaEntidadeLida(const OdDbObjectId& entidade) const;
     // A wire's catalogue columns under the suffix, and its list and description, asked of

@@ -82,7 +82,7 @@ const std::pair<QString, QString>& CCDataReader::ListaDescricaoFioDe(const Chave
     return *chave.listaDescricaoFio;
 }
 
-CCDataReader::TagLida& CCDataReader::TagDoTexto(std::string_view tag) {
+CCDataReader::TagLida& CCDataReader::TagDoTexto(std::string_view tag) const {
     auto it = tags_.find(tag);
     if (it != tags_.end()) return it->second;
     Limita(tags_);
@@ -95,7 +95,7 @@ CCDataReader::TagLida& CCDataReader::TagDoTexto(std::string_view tag) {
         .first->second;
 }
 
-const QString& CCDataReader::ValorDoTexto(std::string_view valor) {
+const QString& CCDataReader::ValorDoTexto(std::string_view valor) const {
     auto it = valores_.find(valor);
     if (it != valores_.end()) return it->second;
     Limita(valores_);

@@ -592,6 +592,38 @@ TEST_F(ConnectionQueriesTest, TheNearestConnectionAttributeOfAnyLanguageIsCopied
 
 }  // namespace
 
+// An element not read just before gives its connection attributes as an attribute list
+// would: tag and value trimmed, its object and visibility, an erased attribute left out.
+TEST_F(ConnectionQueriesTest, AConnectionAttributeReadAloneIsTheAttributeListsOne) {
+    auto* ref = db().modelSpace()->addBlockReference(bloco("BOBINA"), {0, 0, 0});
+    zvdb::Attribute* oculta = ref->addAttribute("  ligacao7 ", " B7  ", {0, 0, 0}, 2.5);
+    oculta->setInvisible(true);
+    ref->addAttribute("RELACAO", "-K7", {0, 1, 0}, 2.5);
+    zvdb::Attribute* apagada = ref->addAttribute("LIGACAO8", "B8", {0, 0, 0}, 2.5);
+    apagada->erase();
+    ref->addAttribute("CONEXION9", "", {50, 0, 0}, 2.5);
+    auto r = leitor();
+    std::unique_ptr<zv::CEListaAtributos> lista;
+    CICad::GetAtributos(id(ref), lista, false, false);
+    ASSERT_TRUE(lista);
+    ASSERT_EQ(lista->Quantidade(), 3);
+    for (const auto& [p, lugar] :
+         std::vector<std::pair<CEPonto, int>>{{{1, 0, 0}, 0}, {{49, 0, 0}, 2}}) {
+        const zv::CEAtributo* achado = r->ConexaoProxima(id(ref), p);
+        ASSERT_NE(achado, nullptr);
+        const zv::CEAtributo& esperado = (*lista)[lugar];
+        EXPECT_EQ(achado->GetTag(), esperado.GetTag());
+        EXPECT_EQ(achado->GetValor(), esperado.GetValor());
+        EXPECT_EQ(achado->GetId(), esperado.GetId());
+        EXPECT_EQ(achado->IsInvisivel(), esperado.IsInvisivel());
+    }
+    const zv::CEAtributo* primeira = r->ConexaoProxima(id(ref), {1, 0, 0});
+    EXPECT_EQ(primeira->GetTag().toUpper(), "LIGACAO7");
+    EXPECT_EQ(primeira->GetValor(), "B7");
+    EXPECT_TRUE(primeira->IsInvisivel());
+    EXPECT_EQ(primeira->GetId(), id(oculta));
+}
+
 // ---- what a reader keeps for the run
 
 // A wire's number and an entity's fields are read once; a change to the drawing is seen by
