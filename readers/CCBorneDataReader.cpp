@@ -23,6 +23,26 @@ QString Primeiro(const CEItemLista& item, const QString& sufixo = QString()) {
     return {};
 }
 
+// The name's number under the suffix, kept in `lugar` once asked: the same numbering as
+// NumeroCampo's, without its look-up at every side.
+template <NomeLiteral nome>
+std::uint32_t Lugar(std::uint32_t& lugar, const QString& sufixo) {
+    if (lugar == CamposItem::kSemNome) lugar = NumeroCampo<nome>(sufixo);
+    return lugar;
+}
+
+// Primeiro, with the names' numbers kept in `lugares` (three).
+template <NomeLiteral a, NomeLiteral b, NomeLiteral c>
+QString PrimeiroEm(const CEItemLista& item, const QString& sufixo, std::uint32_t* lugares) {
+    if (const QString* v = item.campos.procura(Lugar<a>(lugares[0], sufixo)); v && !v->isEmpty())
+        return *v;
+    if (const QString* v = item.campos.procura(Lugar<b>(lugares[1], sufixo)); v && !v->isEmpty())
+        return *v;
+    if (const QString* v = item.campos.procura(Lugar<c>(lugares[2], sufixo)); v && !v->isEmpty())
+        return *v;
+    return {};
+}
+
 // A blank row: the strip and the number in all three languages, one null object.
 CEItemLista* ItemEmBranco(const QString& regua, int numero) {
     auto* item = new CEItemLista;
@@ -92,16 +112,28 @@ CCBorneDataReader::LadoBorne CCBorneDataReader::AchaLado(CCDataReader& leitor,
     const CEPonto q = leitor.PontoDeCorte(borne);
     lado.ponto = insercao ? p : q;
     lado.outro = insercao ? q : p;
-    // The wire at the point is found once for both directions and the element's point.
+    // The wire at the point and its entries are found once for both directions, the
+    // element's handle and its point.
     const OdDbObjectId fio = leitor.FioNoPonto(leitor.LayerDe(borne), lado.ponto);
-    lado.vizinho = leitor.VizinhoNoFio(fio, borne, lado.ponto, !insercao);
-    if (lado.vizinho.isEmpty())
-        lado.vizinho = leitor.VizinhoNoFio(fio, borne, lado.ponto, insercao);
-    if (lado.vizinho.isEmpty()) return lado;
+    const auto entradas = leitor.EntradasDoFio(fio);
+    if (!entradas) return lado;
+    const TabelaConexoes::Textos& elementos = entradas->elementos;
+    // An entry with an empty text counts as none, as an empty handle would.
+    auto vizinho = [&](bool anterior) {
+        const int i = CCDataReader::LugarDoVizinho(*entradas, borne, lado.ponto, anterior);
+        return i >= 0 && !elementos.vista(i).isEmpty() ? i : -1;
+    };
+    int i = vizinho(!insercao);
+    if (i < 0) i = vizinho(insercao);
+    if (i < 0) return lado;
+    lado.vizinho = elementos.vista(i);
     // A stale handle in the connection answer: the element is null, the side stays blank.
-    lado.elemento = CICad::IdDoHandle(lado.vizinho, borne.database());
+    lado.elemento = CICad::IdDoHandle(lado.vizinho.toString(), borne.database());
     lado.fio = fio;
-    lado.pontoElemento = leitor.PontoDaConexao(leitor.NumeroDoFio(lado.fio), lado.vizinho);
+    // The point of the element's first entry on the wire.
+    const int j = elementos.indexOf(lado.vizinho);
+    if (j >= 0 && size_t(j) < entradas->pontos.size())
+        lado.pontoElemento = entradas->pontos[size_t(j)];
     return lado;
 }
 
@@ -144,23 +176,33 @@ void CCBorneDataReader::LeFiosLado(CCDataReader& leitor, CEItemLista& item,
 void CCBorneDataReader::CompoeRelacaoBorne(const QString& sufixo, CEItemLista& item,
                                            const OdDbObjectId& elemento, const CEPonto& ponto,
                                            CETemplate& modelo) {
-    const QString rel = Primeiro<"RELACAO", "TAG", "ETIQUETA">(item, sufixo);
-    const QString regua = Primeiro<"REGUA", "STRIP", "REGLETA">(item, sufixo);
-    const QString num = Primeiro<"NUMERO", "NUMBER", "NUMERO">(item, sufixo);
-    const std::unique_ptr<zv::CEAtributo> ligacao = AtributoConexaoProximo(elemento, ponto);
+    std::uint32_t* lugares = LugaresDoLado(sufixo);
+    const QString rel = PrimeiroEm<"RELACAO", "TAG", "ETIQUETA">(item, sufixo, lugares);
+    const QString regua = PrimeiroEm<"REGUA", "STRIP", "REGLETA">(item, sufixo, lugares + 3);
+    const QString num = PrimeiroEm<"NUMERO", "NUMBER", "NUMERO">(item, sufixo, lugares + 6);
+    const zv::CEAtributo* ligacao = ConexaoProxima(elemento, ponto);
     const QString lig = ligacao ? ligacao->GetValor() : QString();
     const Concatenacao& concatenacao = ConcatenacaoDo(modelo);
     const QString& sep = concatenacao.separador;
     const bool relacaoPrimeiro = concatenacao.relacaoPrimeiro;
     auto define = [&](const QString& texto) {
-        item.definirCampo(NumeroCampo<"RELACAO">(sufixo), texto);
-        item.definirCampo(NumeroCampo<"TAG">(sufixo), texto);
-        item.definirCampo(NumeroCampo<"ETIQUETA">(sufixo), texto);
+        item.definirCampo(Lugar<"RELACAO">(lugares[0], sufixo), texto);
+        item.definirCampo(Lugar<"TAG">(lugares[1], sufixo), texto);
+        item.definirCampo(Lugar<"ETIQUETA">(lugares[2], sufixo), texto);
     };
     if (!lig.isEmpty()) define(relacaoPrimeiro ? rel + sep + lig : lig + sep + rel);
     // A terminal as neighbour has no relation of its own: strip and number stand for it.
     if (!regua.isEmpty() && !num.isEmpty() && rel.isEmpty())
         define(relacaoPrimeiro ? regua + sep + num : num + sep + regua);
+}
+
+std::uint32_t* CCBorneDataReader::LugaresDoLado(const QString& sufixo) {
+    for (auto& [feito, lugares] : lugaresLado_)
+        if (feito == sufixo) return lugares.data();
+    std::array<std::uint32_t, 9> lugares;
+    lugares.fill(CamposItem::kSemNome);
+    lugaresLado_.emplace_back(sufixo, lugares);
+    return lugaresLado_.back().second.data();
 }
 
 const CCBorneDataReader::Concatenacao& CCBorneDataReader::ConcatenacaoDo(CETemplate& modelo) {

@@ -3,7 +3,10 @@
 // each of its sides, the wires themselves, and the jumper chains of the strips.
 #include "CCDataReader.h"
 
+#include <array>
 #include <unordered_set>
+#include <utility>
+#include <vector>
 
 class CCBorneDataReader : public CCDataReader {
 public:
@@ -41,9 +44,11 @@ public:
     // One side of a terminal as any reader finds it: the element wired at the side's point
     // (the insertion point, or the cut point) and the wire there.
     struct LadoBorne {
-        CEPonto ponto;          // the side's point
-        CEPonto outro;          // the terminal's other point
-        QString vizinho;        // handle of the element wired there; empty when none
+        CEPonto ponto;  // the side's point
+        CEPonto outro;  // the terminal's other point
+        // Handle of the element wired there, empty when none: a view into the reader's
+        // connections, which holds until its reads are freed.
+        QStringView vizinho;
         OdDbObjectId elemento;  // that element, null when its handle is stale
         OdDbObjectId fio;       // the wire at the side's point, null when none
         CEPonto pontoElemento;  // where the wire meets the element
@@ -79,6 +84,10 @@ private:
     };
     Concatenacao concatenacao_;
     const Concatenacao& ConcatenacaoDo(CETemplate& modelo);
+    // Per suffix of a side, the numbers of the relation's, strip's and number's names in the
+    // three languages (kSemNome until first asked). Valid until the next suffix is added.
+    std::vector<std::pair<QString, std::array<std::uint32_t, 9>>> lugaresLado_;
+    std::uint32_t* LugaresDoLado(const QString& sufixo);
 
     bool avisouLista_ = false;
     bool duplicado_ = false;

@@ -256,7 +256,7 @@ void CCCaboDataReader::LeLado(const QString& lado, const CEPonto& ponto, CEItemL
         if (!componente) continue;
         item.copiarCamposComSufixo(*componente, lado);
         // The component's own fields carry all its connections: LIG tells the one touched.
-        if (std::unique_ptr<zv::CEAtributo> ligacao = AtributoConexaoProximo(id, ponto))
+        if (const zv::CEAtributo* ligacao = ConexaoProxima(id, ponto))
             item.definirCampo("LIG_" + lado, ligacao->GetValor());
     }
 }

@@ -20,8 +20,6 @@ const QChar CCDataReader::kSeparador = QChar(0x0C);
 
 namespace {
 
-const QLatin1String kPalavrasConexao[] = {QLatin1String("LIGACAO"), QLatin1String("CONNECTION"),
-                                          QLatin1String("CONEXION")};
 constexpr double kToleranciaElemento = 3.0;
 constexpr double kForaDoSegmento = 666.0;
 
@@ -84,8 +82,10 @@ void CCDataReader::LiberaLeituras() {
                nomesLidos_, formas_, numerosFios_, numerosCabos_, ligacoesPorElemento_,
                ligacoesAntigas_, layers_, gruposPaginas_, textosTipo_, colunasDivididas_,
                catalogoComp_, constantes_, ligacoesLidas_, chaves_, textosFio_, tags_, valores_,
-               lote_, ordemLote_, basesAcessorio_, basesColunas_);
+               lote_, ordemLote_, basesAcessorio_, basesColunas_, nomesFio_, textosNumero_);
     versaoIndices_ = 0;
+    indiceAtual_ = nullptr;
+    layerDoUltimo_ = nullptr;
     rotasLidas_ = false;
     corteDe_ = OdDbObjectId();
     versaoLidas_ = 0;
@@ -183,10 +183,19 @@ struct CCDataReader::FiosDoLayer {
 };
 
 const CCDataReader::FiosDoLayer& CCDataReader::IndiceFios(const QString& layer) {
+    if (indiceAtual_ && versaoIndices_ == CICad::VersaoDesenho() && layer == layerIndice_)
+        return *indiceAtual_;
+    const FiosDoLayer& indice = LeIndiceFios(layer);
+    indiceAtual_ = &indice;
+    layerIndice_ = layer;
+    return indice;
+}
+
+const CCDataReader::FiosDoLayer& CCDataReader::LeIndiceFios(const QString& layer) {
     const std::uint64_t versao = CICad::VersaoDesenho();
     if (versao != versaoIndices_) {
         indicesFios_.clear();
-        primeirosVertices_.clear();
+        primeirosVertices_.limpa();
         versaoIndices_ = versao;
     }
     std::unique_ptr<FiosDoLayer>& indice = indicesFios_[layer];
@@ -209,7 +218,8 @@ const CCDataReader::FiosDoLayer& CCDataReader::IndiceFios(const QString& layer) 
         const OdDbObjectId fio = CICad::IdDoHandle(handle);
         if (!CICad::EhPolilinha(fio) || CICad::NomeLayerUtf8(fio) != nome) continue;
         const std::vector<CEPonto> vertices = CICad::GetVertices(fio);
-        if (!vertices.empty()) primeirosVertices_.emplace(fio, vertices.front());
+        if (!vertices.empty() && !primeirosVertices_.contains(fio))
+            primeirosVertices_.insere(fio, vertices.front());
         if (vertices.size() < 2) continue;
         f.fios.push_back(fio);
         f.pontos.insert(f.pontos.end(), vertices.begin(), vertices.end());
@@ -324,21 +334,99 @@ OdDbObjectId CCDataReader::FioNoPonto(const QString& layer, const CEPonto& ponto
 
 namespace {
 
-// The number in a wire's own field of KVR_ZV_WIRE, from its third item on.
-std::optional<QString> NumeroNoCampoFio(const OdDbObjectId& entidade) {
-    const CEListaXData fio = CICad::GetXData(entidade, "KVR_ZV_WIRE");
-    for (size_t i = 2; fio.size() >= 3 && i < fio.size(); ++i) {
-        QString nome, valor;
-        if (!ZVString(fio[i].texto).DivideEmDois(CCDataReader::kSeparador, nome, valor)) continue;
-        const QString maiusculo = nome.toUpper();
-        if (maiusculo == "CABO" || maiusculo == "FIO" || maiusculo == "WIRE" ||
-            maiusculo == "ALAMBRE")
-            return valor;
+// The name and value of a field text "NAME<sep>VALUE" as ZVString::DivideEmDois splits it
+// (empty parts are skipped); false when it holds no part or more than two.
+bool DivideCampo(std::string_view texto, std::string_view& nome, std::string_view& valor) {
+    const char sep = char(CCDataReader::kSeparador.unicode());
+    std::string_view partes[2];
+    int n = 0;
+    for (std::size_t i = 0; i < texto.size();) {
+        if (texto[i] == sep) {
+            ++i;
+            continue;
+        }
+        const std::size_t fim = std::min(texto.find(sep, i), texto.size());
+        if (n == 2) return false;
+        partes[n++] = texto.substr(i, fim - i);
+        i = fim;
+    }
+    nome = partes[0];
+    valor = partes[1];
+    return n > 0;
+}
+
+// Whether the field's name, in upper case, is one of the wire number's.
+bool EhNomeDoNumero(std::string_view nome) {
+    if (std::any_of(nome.begin(), nome.end(), [](char c) { return c & 0x80; })) {
+        // beyond ASCII, upper case as Qt makes it
+        const QString maiusculo = QString::fromUtf8(nome.data(), int(nome.size())).toUpper();
+        return maiusculo == "CABO" || maiusculo == "FIO" || maiusculo == "WIRE" ||
+               maiusculo == "ALAMBRE";
+    }
+    const auto igual = [nome](std::string_view palavra) {
+        return nome.size() == palavra.size() &&
+               std::equal(nome.begin(), nome.end(), palavra.begin(), [](char a, char b) {
+                   return (a >= 'a' && a <= 'z' ? char(a - 'a' + 'A') : a) == b;
+               });
+    };
+    return igual("CABO") || igual("FIO") || igual("WIRE") || igual("ALAMBRE");
+}
+
+// Whether the attribute's name, in upper case, is one of the cable number's.
+bool EhNomeDoCabo(std::string_view nome) {
+    if (std::any_of(nome.begin(), nome.end(), [](char c) { return c & 0x80; })) {
+        const QString maiusculo = QString::fromUtf8(nome.data(), int(nome.size())).toUpper();
+        return maiusculo == "CABO" || maiusculo == "CABLE";
+    }
+    const auto igual = [nome](std::string_view palavra) {
+        return nome.size() == palavra.size() &&
+               std::equal(nome.begin(), nome.end(), palavra.begin(), [](char a, char b) {
+                   return (a >= 'a' && a <= 'z' ? char(a - 'a' + 'A') : a) == b;
+               });
+    };
+    return igual("CABO") || igual("CABLE");
+}
+
+}  // namespace
+
+// The number in a wire's own field of KVR_ZV_WIRE, from its third item on. Every wire at a
+// side's point is asked: its texts are read where the drawing holds them.
+std::optional<QString> CCDataReader::NumeroNoCampoFio(const OdDbObjectId& entidade) const {
+    CICad::TextosXData(entidade, "KVR_ZV_WIRE", textosNumero_);
+    for (size_t i = 2; i < textosNumero_.size(); ++i) {
+        std::string_view nome, valor;
+        if (DivideCampo(textosNumero_[i], nome, valor) && EhNomeDoNumero(nome))
+            return QString::fromUtf8(valor.data(), int(valor.size()));
     }
     return std::nullopt;
 }
 
-}  // namespace
+// The value of the record's first virtual attribute named CABO or CABLE in any case; none
+// without one. Its texts are read where the drawing holds them, split as
+// CICad::GetAtributosVirtuais splits them: an empty field between two separators reads " ",
+// and only texts of three fields count. (Items other than texts never split in three.)
+std::optional<QString> CCDataReader::NumeroDoRegistroCabo(const OdDbObjectId& registro) const {
+    const char sep = char(kSeparador.unicode());
+    CICad::TextosXData(registro, "KVR_ZV_ATT_VIRTUAL", textosNumero_);
+    for (const std::string_view texto : textosNumero_) {
+        std::string_view campos[3];
+        int n = 0;
+        for (std::size_t i = 0; n <= 3;) {
+            const std::size_t fim = std::min(texto.find(sep, i), texto.size());
+            const std::string_view campo = texto.substr(i, fim - i);
+            const bool borda = i == 0 || fim == texto.size();
+            if (!campo.empty() || !borda) {
+                if (n < 3) campos[n] = campo.empty() ? std::string_view(" ") : campo;
+                ++n;
+            }
+            if (fim == texto.size()) break;
+            i = fim + 1;
+        }
+        if (n == 3 && EhNomeDoCabo(campos[0]))
+            return QString::fromUtf8(campos[1].data(), int(campos[1].size()));
+    }
+    return std::nullopt;
+}
 
 // A cable core's number: the cable's own number (a CABO or CABLE attribute of its record)
 // and the core, from KVR_ZV_CABO; empty when there is none.
@@ -350,16 +438,9 @@ QString CCDataReader::NumeroNoCabo(const OdDbObjectId& entidade) const {
     for (size_t i = 2; i < cabo.size(); ++i) {
         if (!EhTexto(cabo[i])) continue;
         auto guardado = numerosCabos_.constFind(cabo[i].texto);
-        if (guardado == numerosCabos_.constEnd()) {
-            std::optional<QString> numero;
-            std::unique_ptr<zv::CEListaAtributos> atributos;
-            CICad::GetAtributosVirtuais(CICad::IdDoHandle(cabo[i].texto), atributos);
-            for (int a = 0; atributos && a < atributos->Quantidade() && !numero; ++a) {
-                const QString tag = (*atributos)[a].GetTag().toUpper();
-                if (tag == "CABO" || tag == "CABLE") numero = (*atributos)[a].GetValor();
-            }
-            guardado = numerosCabos_.insert(cabo[i].texto, numero);
-        }
+        if (guardado == numerosCabos_.constEnd())
+            guardado = numerosCabos_.insert(cabo[i].texto,
+                                            NumeroDoRegistroCabo(CICad::IdDoHandle(cabo[i].texto)));
         if (*guardado) return **guardado + CCDataReader::kSeparador + esquerda;
     }
     return {};
@@ -407,25 +488,35 @@ QString CCDataReader::VizinhoNaConexao(const OdDbObjectId& entidade, const CEPon
 
 QString CCDataReader::VizinhoNoFio(const OdDbObjectId& fio, const OdDbObjectId& entidade,
                                    const CEPonto& ponto, bool anterior) const {
-    if (fio.isNull()) return {};
-    const auto c = conexoes_.DoFio(NumeroDoFio(fio));
+    const auto c = EntradasDoFio(fio);
     if (!c) return {};
-    const TabelaConexoes::Textos& elementos = c->elementos;
-    const std::span<const CEPonto> pontos = c->pontos;
-    if (elementos.size() < 2 || pontos.size() < 2) return {};
-    auto ehEntidade = [&](int i) { return c->handles[size_t(i)] == entidade.handle(); };
+    const int i = LugarDoVizinho(*c, entidade, ponto, anterior);
+    return i < 0 ? QString() : c->elementos.value(i);
+}
+
+std::optional<TabelaConexoes::Entradas> CCDataReader::EntradasDoFio(const OdDbObjectId& fio) const {
+    if (fio.isNull()) return std::nullopt;
+    return conexoes_.DoFio(NumeroDoFio(fio));
+}
+
+int CCDataReader::LugarDoVizinho(const TabelaConexoes::Entradas& c, const OdDbObjectId& entidade,
+                                 const CEPonto& ponto, bool anterior) {
+    const TabelaConexoes::Textos& elementos = c.elementos;
+    const std::span<const CEPonto> pontos = c.pontos;
+    if (elementos.size() < 2 || pontos.size() < 2) return -1;
+    auto ehEntidade = [&](int i) { return c.handles[size_t(i)] == entidade.handle(); };
     bool seguinte = false;
     for (int i = 0; i < elementos.size() && size_t(i) < pontos.size(); ++i) {
         const bool aqui =
             ehEntidade(i) && Distancia(pontos[size_t(i)], ponto) < kToleranciaElemento;
         if (anterior) {
-            if (aqui && i > 0 && !ehEntidade(i - 1)) return elementos[i - 1];
+            if (aqui && i > 0 && !ehEntidade(i - 1)) return i - 1;
             continue;
         }
-        if (seguinte && !ehEntidade(i)) return elementos[i];
+        if (seguinte && !ehEntidade(i)) return i;
         seguinte = aqui;
     }
-    return {};
+    return -1;
 }
 
 CEPonto CCDataReader::PontoDeCorte(const OdDbObjectId& referencia) const {
@@ -448,6 +539,12 @@ CEPonto CCDataReader::LePontoDeCorte(const OdDbObjectId& referencia) const {
 
 std::unique_ptr<zv::CEAtributo> CCDataReader::AtributoConexaoProximo(const OdDbObjectId& elemento,
                                                                      const CEPonto& ponto) const {
+    const zv::CEAtributo* atributo = ConexaoProxima(elemento, ponto);
+    return atributo ? std::make_unique<zv::CEAtributo>(*atributo) : nullptr;
+}
+
+const zv::CEAtributo* CCDataReader::ConexaoProxima(const OdDbObjectId& elemento,
+                                                   const CEPonto& ponto) const {
     // An element is asked at each of its connections: its connection attributes and their
     // places are read once.
     ConfereVersao();
@@ -463,15 +560,16 @@ std::unique_ptr<zv::CEAtributo> CCDataReader::AtributoConexaoProximo(const OdDbO
                                         zv::CEAtributo(lida.tag, QString(), lida.valor, lida.id,
                                                        CICad::AtributoInvisivel(lida.id))});
             } else {
-                std::unique_ptr<zv::CEListaAtributos> atributos;
-                CICad::GetAtributos(elemento, atributos, false, false);
-                for (int i = 0; atributos && i < atributos->Quantidade(); ++i) {
-                    const zv::CEAtributo& atributo = (*atributos)[i];
-                    const QString tag = atributo.GetTag().toUpper();
-                    if (std::any_of(
-                            std::begin(kPalavrasConexao), std::end(kPalavrasConexao),
-                            [&tag](QLatin1String palavra) { return tag.startsWith(palavra); }))
-                        ligacoes.push_back({CICad::GetPosicaoTexto(atributo.GetId()), atributo});
+                // The attributes as the drawing holds them, with their tags and values trimmed
+                // as an attribute list gives them: no list and no texts made for the others.
+                CICad::LeituraSimbolo(elemento, simboloLigacoes_);
+                for (const CESimboloLido::Atributo& atributo : simboloLigacoes_.atributos) {
+                    const TagLida& tag = TagDoTexto(atributo.tag);
+                    if (!tag.ligacao) continue;
+                    ligacoes.push_back(
+                        {CICad::GetPosicaoTexto(atributo.id),
+                         zv::CEAtributo(tag.texto, QString(), ValorDoTexto(atributo.valor),
+                                        atributo.id, CICad::AtributoInvisivel(atributo.id))});
                 }
             }
         }
@@ -489,7 +587,7 @@ std::unique_ptr<zv::CEAtributo> CCDataReader::AtributoConexaoProximo(const OdDbO
         const double d = Distancia(ligacao.posicao, ponto);
         if (!melhor || d < menor) melhor = &ligacao, menor = d;
     }
-    return melhor ? std::make_unique<zv::CEAtributo>(melhor->atributo) : nullptr;
+    return melhor ? &melhor->atributo : nullptr;
 }
 
 VetorItens* CCDataReader::LeDicionarioCabos(zvdb::Database* database) {
@@ -576,15 +674,18 @@ QString CCDataReader::TextoTipo(const QString& tipo) {
 }
 
 QString CCDataReader::Posicao(const OdDbObjectId& entidade) const {
+    return PosicaoNoLayer(entidade, LayerDoNome(CICad::NomeLayerUtf8(entidade)));
+}
+
+QString CCDataReader::PosicaoNoLayer(const OdDbObjectId& entidade, const LayerLido& layer) const {
     // Parts are never empty: a page's layer has a group exactly when it has three.
-    const LayerLido& layer = LayerDoNome(CICad::NomeLayerUtf8(entidade));
     if (layer.grupo.isEmpty()) return "??";
     CEPonto p;
     if (CICad::EhPolilinha(entidade)) {
         // the wires' indexes read it already, unless the drawing changed since
-        auto lido = primeirosVertices_.find(entidade);
-        if (lido != primeirosVertices_.end() && versaoIndices_ == CICad::VersaoDesenho()) {
-            p = lido->second;
+        const CEPonto* lido = primeirosVertices_.procura(entidade);
+        if (lido && versaoIndices_ == CICad::VersaoDesenho()) {
+            p = *lido;
         } else {
             const std::vector<CEPonto> vertices = CICad::GetVertices(entidade);
             if (vertices.empty()) return "??";
@@ -637,23 +738,26 @@ bool CCDataReader::LeCamposFio(const QString& s, CEItemLista& item, const OdDbOb
             textosFio_[1].empty())
             return false;
         item.definirCampo(NumeroCampo<"ZV_KEY">(s), chave->chave);
-        // Each wire has a number of its own: its field texts are split as they come.
+        // Each wire has a number of its own: its field texts are split as they come, where
+        // the drawing holds them; the names repeat and are numbered once.
         for (size_t i = 2; i < textosFio_.size(); ++i) {
-            QString nome, valor;
-            const std::string_view texto = textosFio_[i];
-            if (ZVString(QString::fromUtf8(texto.data(), int(texto.size())))
-                    .DivideEmDois(kSeparador, nome, valor) &&
-                !nome.isEmpty())
-                item.definirCampo(CamposItem::numero(s.isEmpty() ? nome : QString(nome + s)),
-                                  valor);
+            std::string_view nome, valor;
+            if (!DivideCampo(textosFio_[i], nome, valor)) continue;
+            const QString texto = QString::fromUtf8(valor.data(), int(valor.size()));
+            if (s.isEmpty())
+                item.definirCampo(NumeroDoNomeFio(nome), texto);
+            else
+                item.definirCampo(
+                    CamposItem::numero(QString::fromUtf8(nome.data(), int(nome.size())) + s),
+                    texto);
         }
     }
     const auto& [lista, descricao] = ListaDescricaoFioDe(*chave);
     item.definirCampo(NumeroCampo<"WIRE_LISTA">(s), lista);
     item.definirCampo(NumeroCampo<"DESCRICAO">(s), descricao);
     item.definirCampo(NumeroCampo<"TP_DESCRI">(s), descricao);
-    item.definirCampo(NumeroCampo<"POSICAO">(s), Posicao(polilinha));
     const LayerLido& layer = LayerDoNome(CICad::NomeLayerUtf8(polilinha));
+    item.definirCampo(NumeroCampo<"POSICAO">(s), PosicaoNoLayer(polilinha, layer));
     item.definirCampo(NumeroCampo<"LAYER">(s), layer.nome);
     item.definirCampo(NumeroCampo<"GRUPO">(s), layer.grupo);
     item.definirCampo(NumeroCampo<"PAGINA">(s), layer.pagina);
@@ -662,6 +766,17 @@ bool CCDataReader::LeCamposFio(const QString& s, CEItemLista& item, const OdDbOb
         item.definirCampo(qtd, QStringLiteral("1"));
     item.definirCampo(NumeroCampo<"SAP_MATERIAL">(s), QString());
     return true;
+}
+
+std::uint32_t CCDataReader::NumeroDoNomeFio(std::string_view nome) {
+    auto it = nomesFio_.find(nome);
+    if (it != nomesFio_.end()) return it->second;
+    // a drawing that makes up names keeps this bounded
+    if (nomesFio_.size() >= (std::size_t(1) << 16)) nomesFio_.clear();
+    const std::uint32_t numero =
+        CamposItem::numero(QString::fromUtf8(nome.data(), int(nome.size())));
+    nomesFio_.emplace(std::string(nome), numero);
+    return numero;
 }
 
 void CCDataReader::LeEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,

@@ -73,9 +73,18 @@ public:
     // The same along `fio`, the wire already found at the point (null: none).
     QString VizinhoNoFio(const OdDbObjectId& fio, const OdDbObjectId& entidade,
                          const CEPonto& ponto, bool anterior) const;
+    // The entries of the wire's connections (none when it has none) and the place among them
+    // of the element VizinhoNoFio gives (-1 when it gives none): a terminal's side reads the
+    // element's handle and point there, without texts made for them.
+    std::optional<TabelaConexoes::Entradas> EntradasDoFio(const OdDbObjectId& fio) const;
+    static int LugarDoVizinho(const TabelaConexoes::Entradas& c, const OdDbObjectId& entidade,
+                              const CEPonto& ponto, bool anterior);
     CEPonto PontoDeCorte(const OdDbObjectId& referencia) const;
     std::unique_ptr<zv::CEAtributo> AtributoConexaoProximo(const OdDbObjectId& elemento,
                                                            const CEPonto& ponto) const;
+    // The same, kept by the reader: valid until the next question of this kind. Every side
+    // of a list asks, and most only read the value.
+    const zv::CEAtributo* ConexaoProxima(const OdDbObjectId& elemento, const CEPonto& ponto) const;
     VetorItens* LeDicionarioCabos(zvdb::Database* database);
     bool EhEquipamento(const OdDbObjectId& id) const;
 
@@ -180,6 +189,10 @@ private:
     // answers the wire-at-point question from the few wires near the point.
     struct FiosDoLayer;
     const FiosDoLayer& IndiceFios(const QString& layer);
+    const FiosDoLayer& LeIndiceFios(const QString& layer);
+    // The index asked for last and its layer: a terminal's sides ask for one layer in turn.
+    QString layerIndice_;
+    const FiosDoLayer* indiceAtual_ = nullptr;
     void LeCircuitoLocal(const QString& sufixo, CEItemLista& item, const OdDbObjectId& entidade);
     // The wire's fields without the look-up of its routes; false when the polyline is no
     // complete wire (the reading stops there).
@@ -202,7 +215,7 @@ private:
     std::unordered_map<QString, std::unique_ptr<FiosDoLayer>> indicesFios_;
     std::uint64_t versaoIndices_ = 0;  // the drawing's version the indexes were read at
     // The first vertex of each wire the indexes read, for the wire's position.
-    std::unordered_map<OdDbObjectId, CEPonto> primeirosVertices_;
+    TabelaIds<CEPonto> primeirosVertices_;
     // Route records in store order, read on the first lookup; routes by wire key.
     struct Rota {
         QString chave, dados;
@@ -264,9 +277,12 @@ private:
         bool proprio = false;
     };
     mutable TabelaIds<NumeroFio> numerosFios_;
+    mutable std::vector<std::string_view> textosNumero_;  // the wire's items being searched
+    std::optional<QString> NumeroNoCampoFio(const OdDbObjectId& entidade) const;
     // Per cable record (by handle text): its CABO or CABLE attribute, shared by its cores.
     mutable QHash<QString, std::optional<QString>> numerosCabos_;
     QString NumeroNoCabo(const OdDbObjectId& entidade) const;
+    std::optional<QString> NumeroDoRegistroCabo(const OdDbObjectId& registro) const;
     // Per element, its connection attributes with the places of their texts.
     struct LigacaoGuardada {
         CEPonto posicao;
@@ -329,6 +345,8 @@ private:
     mutable OdDbObjectId atributosDe_;
     mutable std::uint64_t atributosVersao_ = 0;
     mutable std::vector<LigacaoLida> ligacoesLidas_;
+    // An element read for its connection attributes alone.
+    mutable CESimboloLido simboloLigacoes_;
     // Per layer name, its group and page (empty unless the name has three parts); per catalogue
     // type, its text: items repeat a few of each.
     mutable QHash<QString, std::pair<QString, QString>> gruposPaginas_;
@@ -341,6 +359,12 @@ private:
     };
     mutable PorTexto<LayerLido> layers_;
     const LayerLido& LayerDoNome(std::string_view nome) const;
+    // The entity LayerDe was asked for last, its layer's name and the drawing's version then.
+    mutable OdDbObjectId layerDe_;
+    mutable const QString* layerDoUltimo_ = nullptr;
+    mutable std::uint64_t layerVersao_ = 0;
+    // Posicao of an entity of that layer.
+    QString PosicaoNoLayer(const OdDbObjectId& entidade, const LayerLido& layer) const;
     // The position text at a point of the entity's page.
     QString PosicaoNoPonto(const OdDbObjectId& entidade, const QString& grupo,
                            const QString& pagina, const CEPonto& p) const;
@@ -376,12 +400,12 @@ private:
         bool ligacao;
         QString texto;
     };
-    PorTexto<TagLida> tags_;
-    TagLida& TagDoTexto(std::string_view tag);
+    mutable PorTexto<TagLida> tags_;
+    TagLida& TagDoTexto(std::string_view tag) const;
     // Attribute values, trimmed, by their text in the drawing: symbols repeat theirs, and
     // their items share one text.
-    PorTexto<QString> valores_;
-    const QString& ValorDoTexto(std::string_view valor);
+    mutable PorTexto<QString> valores_;
+    const QString& ValorDoTexto(std::string_view valor) const;
     // The key text of an entity as ChaveENorma reads it; semChave_ without one.
     const ChaveLida& ChaveDaEntidadeLida(const OdDbObjectId& entidade) const;
     // A wire's catalogue columns under the suffix, and its list and description, asked of
@@ -389,6 +413,9 @@ private:
     void PoeColunasFio(const QString& s, CEItemLista& item, const ChaveLida& chave);
     const std::pair<QString, QString>& ListaDescricaoFioDe(const ChaveLida& chave);
     std::vector<std::string_view> textosFio_;  // the items of the wire being read
+    // The numbers of wires' field names by the names as the drawing holds them.
+    PorTexto<std::uint32_t> nomesFio_;
+    std::uint32_t NumeroDoNomeFio(std::string_view nome);
     // The last symbol read, and the fields of one reading before they join the item (in
     // order of writing: a later one of the same name wins).
     CESimboloLido simbolo_;

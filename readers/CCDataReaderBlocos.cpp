@@ -82,7 +82,7 @@ const std::pair<QString, QString>& CCDataReader::ListaDescricaoFioDe(const Chave
     return *chave.listaDescricaoFio;
 }
 
-CCDataReader::TagLida& CCDataReader::TagDoTexto(std::string_view tag) {
+CCDataReader::TagLida& CCDataReader::TagDoTexto(std::string_view tag) const {
     auto it = tags_.find(tag);
     if (it != tags_.end()) return it->second;
     Limita(tags_);
@@ -95,7 +95,7 @@ CCDataReader::TagLida& CCDataReader::TagDoTexto(std::string_view tag) {
         .first->second;
 }
 
-const QString& CCDataReader::ValorDoTexto(std::string_view valor) {
+const QString& CCDataReader::ValorDoTexto(std::string_view valor) const {
     auto it = valores_.find(valor);
     if (it != valores_.end()) return it->second;
     Limita(valores_);
@@ -114,7 +114,13 @@ const CCDataReader::LayerLido& CCDataReader::LayerDoNome(std::string_view nome) 
 }
 
 const QString& CCDataReader::LayerDe(const OdDbObjectId& entidade) const {
-    return LayerDoNome(CICad::NomeLayerUtf8(entidade)).nome;
+    // Both sides of a terminal ask for its layer, each twice.
+    const std::uint64_t versao = CICad::VersaoDesenho(entidade.database());
+    if (layerDoUltimo_ && entidade == layerDe_ && versao == layerVersao_) return *layerDoUltimo_;
+    layerDoUltimo_ = &LayerDoNome(CICad::NomeLayerUtf8(entidade)).nome;
+    layerDe_ = entidade;
+    layerVersao_ = versao;
+    return *layerDoUltimo_;
 }
 
 QString CCDataReader::PosicaoNoPonto(const OdDbObjectId& entidade, const QString& grupo,

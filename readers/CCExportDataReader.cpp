@@ -337,7 +337,7 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
         ponto = lado->ponto;
         outro = lado->outro;
         fio = NumeroDoFio(lado->fio);
-        conectado = lado->vizinho;
+        conectado = lado->vizinho.toString();
     } else {
         // The terminal is met where this wire touches it, which may be its cut point.
         const QString campo = CampoFio(item);
@@ -356,7 +356,7 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
     // An equipment's points may lie closer together than a wire's catch: its connection
     // name tells which of its entries on the wire this end is.
     if (CICad::TemXData(entidade, kEquipo)) {
-        const std::unique_ptr<zv::CEAtributo> propria = AtributoConexaoProximo(entidade, ponto);
+        const zv::CEAtributo* propria = ConexaoProxima(entidade, ponto);
         if (propria && !propria->GetValor().isEmpty()) {
             const QString achado =
                 VizinhoPorLigacao(fio, proprio(), propria->GetValor(), doBorne ? !inicio : true);
@@ -374,8 +374,8 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
         CopiaAtributos(sufixo, item, conectado);
         // After the copy: an element it read for the first time lends its attributes to
         // the connection's question. A terminal's side found the element's point already.
-        const bool mesmoVizinho = lado && conectado == lado->vizinho;
-        const std::unique_ptr<zv::CEAtributo> atributo = AtributoConexaoProximo(
+        const bool mesmoVizinho = lado && TabelaConexoes::Iguais(conectado, lado->vizinho);
+        const zv::CEAtributo* atributo = ConexaoProxima(
             objeto, mesmoVizinho ? lado->pontoElemento : PontoDaConexao(fio, conectado));
         if (atributo) ligacao = atributo->GetValor();
     }

@@ -216,8 +216,8 @@ std::optional<QString> CCFioDataReader::Ligacao(const QString& numero, int indic
     }
     const size_t i = size_t(indice);
     if (!fio.ligacoesLidas[i]) {
-        const std::unique_ptr<zv::CEAtributo> atributo =
-            AtributoConexaoProximo(CICad::IdDoHandle((*elementos)[indice]), (*pontos)[i]);
+        const zv::CEAtributo* atributo =
+            ConexaoProxima(CICad::IdDoHandle((*elementos)[indice]), (*pontos)[i]);
         if (atributo) fio.ligacoes[i] = atributo->GetValor();
         fio.ligacoesLidas[i] = true;
     }
@@ -234,8 +234,7 @@ std::optional<QString> CCFioDataReader::LigacaoProxima(const QString& numero,
         TabelaConexoes::Iguais(elementos->vista(indice), elemento) &&
         MesmoPonto((*pontos)[size_t(indice)], ponto))
         return Ligacao(numero, indice);
-    const std::unique_ptr<zv::CEAtributo> atributo =
-        AtributoConexaoProximo(CICad::IdDoHandle(elemento), ponto);
+    const zv::CEAtributo* atributo = ConexaoProxima(CICad::IdDoHandle(elemento), ponto);
     return atributo ? std::optional<QString>(atributo->GetValor()) : std::nullopt;
 }
 

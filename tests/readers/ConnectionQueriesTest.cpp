@@ -12,6 +12,7 @@
 #include "readers/CCBorneDataReader.h"
 #include "readers/CCDataReader.h"
 #include "readers/CEAtributo.h"
+#include "readers/CEListaAtributos.h"
 #include "readers/LeitorBase.h"
 #include "readers/ZVString.h"
 #include "sample/XDataItems.h"
@@ -355,6 +356,44 @@ TEST_F(NeighbourTest, AWireWithOneElementGivesNoNeighbour) {
     EXPECT_EQ(vizinho(s, {150, 200, 0}, true), "");
 }
 
+// A terminal's side takes the element the neighbour question gives (looking the other way
+// when it gives none), its object, the wire there and the element's first point on it.
+TEST_F(NeighbourTest, ATerminalsSideIsWhatTheNeighbourAndPointQueriesGive) {
+    zvdb::BlockReference* fora = simbolo("BORNE_1", {300, 300, 0});
+    int lados = 0;
+    for (const zvdb::BlockReference* borne : {t, u, v, b, w, d, s, fora}) {
+        for (const bool insercao : {true, false}) {
+            const CCBorneDataReader::LadoBorne lado =
+                CCBorneDataReader::AchaLado(*r, id(borne), insercao);
+            const CEPonto p = CICad::GetPosicao(id(borne));
+            const CEPonto q = r->PontoDeCorte(id(borne));
+            const CEPonto ponto = insercao ? p : q;
+            EXPECT_DOUBLE_EQ(lado.ponto.y, ponto.y);
+            EXPECT_DOUBLE_EQ(lado.outro.y, (insercao ? q : p).y);
+            QString esperado = r->VizinhoNaConexao(id(borne), ponto, !insercao);
+            if (esperado.isEmpty()) esperado = r->VizinhoNaConexao(id(borne), ponto, insercao);
+            const std::string onde = handle(borne).toStdString() + (insercao ? " ini" : " fim");
+            EXPECT_EQ(lado.vizinho.toString(), esperado) << onde;
+            if (esperado.isEmpty()) {
+                EXPECT_TRUE(lado.elemento.isNull()) << onde;
+                EXPECT_TRUE(lado.fio.isNull()) << onde;
+                continue;
+            }
+            ++lados;
+            EXPECT_EQ(lado.elemento, CICad::IdDoHandle(esperado)) << onde;
+            EXPECT_EQ(lado.fio, r->FioNoPonto(r->LayerDe(id(borne)), ponto)) << onde;
+            const CEPonto noFio = r->PontoDaConexao(r->NumeroDoFio(lado.fio), esperado);
+            EXPECT_DOUBLE_EQ(lado.pontoElemento.x, noFio.x) << onde;
+            EXPECT_DOUBLE_EQ(lado.pontoElemento.y, noFio.y) << onde;
+        }
+    }
+    EXPECT_EQ(lados, 8);
+    // W stands twice on wire 104: the element's point is its first entry's, at W's insertion.
+    const CCBorneDataReader::LadoBorne emD = CCBorneDataReader::AchaLado(*r, id(d), true);
+    EXPECT_EQ(emD.vizinho.toString(), handle(w));
+    EXPECT_DOUBLE_EQ(emD.pontoElemento.y, 150.0);
+}
+
 // A neighbour erased after the connections were loaded answers by a handle that no longer
 // opens: the terminal's side stays blank, with no placeholder fields of a missing block.
 TEST_F(NeighbourTest, ANeighbourThatDoesNotOpenLeavesTheSideBlank) {
@@ -477,6 +516,33 @@ TEST_F(ConnectionQueriesTest, AWireNumberComesFromItsNamedFieldInAnyLanguage) {
     EXPECT_EQ(r->NumeroDoFio(id(fio({{0, 0, 0}, {1, 1, 0}}, "12"))), "12");
 }
 
+// The field texts are split as any other: empty parts skipped, a text of three parts is
+// no field; the name is upper-cased as Qt does it, also beyond ASCII.
+TEST_F(ConnectionQueriesTest, AWireNumberFieldIsSplitAndNamedAsAnyFieldText) {
+    auto numero = [&](std::vector<std::string> campos) {
+        zvsample::XDataItems itens;
+        itens.text("10006\f1").text("1");
+        for (const std::string& campo : campos)
+            itens.text(campo);
+        zvdb::Polyline* linha = db().modelSpace()->addLwPolyline({{0, 0, 0}, {1, 0, 0}}, false);
+        linha->setXData("KVR_ZV_WIRE", itens.tags());
+        auto r = leitor();
+        return r->EhFioNumerado(id(linha)) ? r->NumeroDoFio(id(linha)) : QString("none");
+    };
+    EXPECT_EQ(numero({"\f\fFio\f\f8B\f"}), "8B");
+    EXPECT_EQ(numero({"FIO\f1\f2", "Alambre\f3"}), "3");
+    EXPECT_EQ(numero({"CABO"}), "");
+    EXPECT_EQ(numero({"\f", "", "FIOS\f1", "FI\f1",
+                      "WIRE\f\xce\xa9"
+                      "1"}),
+              QString::fromUtf8("\xce\xa9"
+                                "1"));
+    // U+0131 (dotless i) upper-cases to I; U+00CD does not.
+    EXPECT_EQ(numero({"f\xc4\xb1o\f4"}), "4");
+    EXPECT_EQ(numero({"F\xc3\x8dO\f5"}), "none");
+    EXPECT_EQ(numero({"C\xc3\x81\x42O\f6", "cAbO\f7"}), "7");
+}
+
 TEST_F(ConnectionQueriesTest, TheCutPointIsTheStoredPointThatIsNotTheInsertion) {
     auto r = leitor();
     auto ponto = [&](const zvdb::DbObject* ref) {
@@ -525,6 +591,38 @@ TEST_F(ConnectionQueriesTest, TheNearestConnectionAttributeOfAnyLanguageIsCopied
 }
 
 }  // namespace
+
+// An element not read just before gives its connection attributes as an attribute list
+// would: tag and value trimmed, its object and visibility, an erased attribute left out.
+TEST_F(ConnectionQueriesTest, AConnectionAttributeReadAloneIsTheAttributeListsOne) {
+    auto* ref = db().modelSpace()->addBlockReference(bloco("BOBINA"), {0, 0, 0});
+    zvdb::Attribute* oculta = ref->addAttribute("  ligacao7 ", " B7  ", {0, 0, 0}, 2.5);
+    oculta->setInvisible(true);
+    ref->addAttribute("RELACAO", "-K7", {0, 1, 0}, 2.5);
+    zvdb::Attribute* apagada = ref->addAttribute("LIGACAO8", "B8", {0, 0, 0}, 2.5);
+    apagada->erase();
+    ref->addAttribute("CONEXION9", "", {50, 0, 0}, 2.5);
+    auto r = leitor();
+    std::unique_ptr<zv::CEListaAtributos> lista;
+    CICad::GetAtributos(id(ref), lista, false, false);
+    ASSERT_TRUE(lista);
+    ASSERT_EQ(lista->Quantidade(), 3);
+    for (const auto& [p, lugar] :
+         std::vector<std::pair<CEPonto, int>>{{{1, 0, 0}, 0}, {{49, 0, 0}, 2}}) {
+        const zv::CEAtributo* achado = r->ConexaoProxima(id(ref), p);
+        ASSERT_NE(achado, nullptr);
+        const zv::CEAtributo& esperado = (*lista)[lugar];
+        EXPECT_EQ(achado->GetTag(), esperado.GetTag());
+        EXPECT_EQ(achado->GetValor(), esperado.GetValor());
+        EXPECT_EQ(achado->GetId(), esperado.GetId());
+        EXPECT_EQ(achado->IsInvisivel(), esperado.IsInvisivel());
+    }
+    const zv::CEAtributo* primeira = r->ConexaoProxima(id(ref), {1, 0, 0});
+    EXPECT_EQ(primeira->GetTag().toUpper(), "LIGACAO7");
+    EXPECT_EQ(primeira->GetValor(), "B7");
+    EXPECT_TRUE(primeira->IsInvisivel());
+    EXPECT_EQ(primeira->GetId(), id(oculta));
+}
 
 // ---- what a reader keeps for the run
 
@@ -702,6 +800,47 @@ TEST_F(ConnectionQueriesTest, CoresOfACableTakeItsNumberAndFollowItsChange) {
     // A record without a cable number: the core has none either.
     registro->setXData("KVR_ZV_ATT_VIRTUAL", zvsample::XDataItems().text("COR\fAZUL\fN").tags());
     EXPECT_EQ(r->NumeroDoFio(id(um)), "");
+}
+
+// The record's texts are split as its virtual attributes are: the first of three fields
+// named CABO or CABLE in any case gives the cable's number.
+TEST_F(ConnectionQueriesTest, ACableNumberIsTheRecordsVirtualAttributeOfThatName) {
+    const std::string caminho[] = {"ZV_CABOS"};
+    zvdb::XRecord* registro = db().dictionaryAt(caminho, true)->getOrCreateXRecord("W2");
+    zvdb::Polyline* nucleo = db().modelSpace()->addLwPolyline({{0, 0, 0}, {9, 0, 0}}, false);
+    const std::string h = ZVString::DeHandle(registro->handle()).toStdString();
+    nucleo->setXData("KVR_ZV_CABO", zvsample::XDataItems().text("20101\f1").text(h).text(h).tags());
+    auto r = leitor();
+    const std::vector<std::pair<std::vector<std::string>, QString>> casos = {
+        {{"cable\fC9\fN"}, "C9"},
+        {{"\fCABO\f\fS"}, " "},
+        {{"CABO\fX\fN\fextra", "Cable\fY\fN"}, "Y"},
+        {{"CABO\fX\fN\f"}, "X"},
+        {{"CABO\fZ"}, ""},
+        {{"CABO\f\f\fN"}, ""},
+        {{"RELACAO\f-W\fN",
+          "C\xc3\x81"
+          "BO\fQ\fN",
+          "CABLE\f\xce\xa9\fS"},
+         QString::fromUtf8("\xce\xa9")},
+    };
+    for (const auto& [textos, numero] : casos) {
+        zvsample::XDataItems itens;
+        for (const std::string& texto : textos)
+            itens.text(texto);
+        registro->setXData("KVR_ZV_ATT_VIRTUAL", itens.tags());
+        // What the record's attributes say, as the facade lists them.
+        std::unique_ptr<zv::CEListaAtributos> atributos;
+        CICad::GetAtributosVirtuais(id(registro), atributos);
+        QString esperado;
+        for (int a = 0; atributos && a < atributos->Quantidade() && esperado.isEmpty(); ++a) {
+            const QString tag = (*atributos)[a].GetTag().toUpper();
+            if (tag == "CABO" || tag == "CABLE")
+                esperado = (*atributos)[a].GetValor() + QChar(0x0C) + "20101";
+        }
+        EXPECT_EQ(esperado, numero.isEmpty() ? QString() : numero + QChar(0x0C) + "20101");
+        EXPECT_EQ(r->NumeroDoFio(id(nucleo)), esperado) << textos.front();
+    }
 }
 
 // The key and standard come from the first of KVR_ZV, KVR_ZV_WIRE and KVR_ZV_CABO that has
