@@ -89,10 +89,10 @@ bool CICad::LeituraSimbolo(const OdDbObjectId& entidade, CESimboloLido& lido) {
     } else {
         lido.temCircuito = GetCircuitoLocal(entidade, lido.circuito);
     }
-    auto* entidadeDesenho = dynamic_cast<zvdb::Entity*>(objeto);
+    auto* entidadeDesenho = Classe<zvdb::Entity>(objeto);
     if (!entidadeDesenho) return true;
     lido.layer = entidadeDesenho->layer();
-    auto* ref = dynamic_cast<zvdb::BlockReference*>(entidadeDesenho);
+    auto* ref = Classe<zvdb::BlockReference>(entidadeDesenho);
     if (!ref) return true;
     lido.referencia = true;
     lido.bloco = ref->blockName();
@@ -100,7 +100,7 @@ bool CICad::LeituraSimbolo(const OdDbObjectId& entidade, CESimboloLido& lido) {
     lido.posicao = {p.x, p.y, p.z};
     for (zvdb::Entity* sub : ref->subEntities()) {
         if (sub->isErased()) continue;
-        if (auto* atributo = dynamic_cast<zvdb::Attribute*>(sub))
+        if (auto* atributo = Classe<zvdb::Attribute>(sub))
             lido.atributos.push_back({atributo->tag(), atributo->textValue(), Id(atributo)});
     }
     return true;

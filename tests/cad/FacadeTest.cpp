@@ -822,3 +822,50 @@ TEST_F(FacadeFixture, MarkedReferencesComeInDrawingOrderWithTheirBlockAndFirstIt
         EXPECT_EQ(CICad::GetNomeBloco(r.id), r.bloco);
     }
 }
+
+// The facade tells an object's kind from a few kinds it saw last: asked in turns of more
+// kinds than it keeps, each answer is still what the object is.
+TEST_F(FacadeFixture, EachObjectsKindIsToldRightWhateverWasAskedBefore) {
+    const QString caminho = arquivoBloco("BORNE_K", {"REGUA", "NUMERO"});
+    const OdDbObjectId ref = CICad::InsereBloco(caminho, "BORNE_K", "ESQ$0001$A", 1, 2, 0, 0);
+    ASSERT_FALSE(ref.isNull());
+    zvdb::BlockRecord* ms = db().modelSpace();
+    std::vector<zvdb::DbObject*> objetos = {db().objectByHandle(ref.handle()),
+                                            ms->addLine({0, 0, 0}, {1, 0, 0}, "FIOS"),
+                                            ms->addLwPolyline({{0, 0, 0}, {1, 1, 0}}, false),
+                                            ms->addText({0, 0, 0}, 1, "texto"),
+                                            ms->addPoint({2, 2, 0}),
+                                            ms->addCircle({3, 3, 0}, 1, "CIRC"),
+                                            db().layer("0"),
+                                            db().block("BORNE_K"),
+                                            db().namedObjects()};
+    for (const OdDbObjectId& atributo : CICad::GetIdsAtributos(ref))
+        objetos.push_back(db().objectByHandle(atributo.handle()));
+    ASSERT_EQ(objetos.size(), 11u);
+    EXPECT_TRUE(CICad::EhReferencia(ref));
+    EXPECT_FALSE(CICad::EhPolilinha(ref));
+    EXPECT_EQ(CICad::NomeLayerUtf8(ref), "ESQ$0001$A");
+    for (int volta = 0; volta < 4; ++volta) {
+        for (std::size_t k = 0; k < objetos.size(); ++k) {
+            // Forward, backward and in strides: the kinds come in ever other orders.
+            zvdb::DbObject* objeto = objetos[volta == 1   ? objetos.size() - 1 - k
+                                             : volta >= 2 ? (k * (volta + 1)) % objetos.size()
+                                                          : k];
+            ASSERT_NE(objeto, nullptr);
+            const OdDbObjectId id(&db(), objeto->handle());
+            const auto* entidade = dynamic_cast<zvdb::Entity*>(objeto);
+            EXPECT_EQ(CICad::EhReferencia(id),
+                      dynamic_cast<zvdb::BlockReference*>(objeto) != nullptr)
+                << objeto->type();
+            EXPECT_EQ(CICad::EhPolilinha(id), dynamic_cast<zvdb::Polyline*>(objeto) != nullptr)
+                << objeto->type();
+            EXPECT_EQ(CICad::NomeLayerUtf8(id), entidade ? entidade->layer() : std::string_view())
+                << objeto->type();
+            EXPECT_EQ(CICad::GetIdsAtributos(id).size(), objeto == objetos[0] ? 2u : 0u)
+                << objeto->type();
+        }
+    }
+    // An erased object is no kind at all.
+    objetos[2]->erase();
+    EXPECT_FALSE(CICad::EhPolilinha(OdDbObjectId(&db(), objetos[2]->handle())));
+}
