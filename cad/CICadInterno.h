@@ -58,9 +58,9 @@ template <class T>
 T* Classe(zvdb::DbObject* objeto) {
     static_assert(std::is_base_of_v<zvdb::DbObject, T> && alignof(std::type_info) > 1);
     if (!objeto) return nullptr;
-    static std::array<std::atomic<std::uintptr_t>, 4> vistos{};
+    static std::array<std::atomic<std::uintptr_t>, 8> vistos{};
     const std::uintptr_t tipo = TipoDe(*objeto);
-    std::atomic<std::uintptr_t>& visto = vistos[(tipo >> 4) % vistos.size()];
+    std::atomic<std::uintptr_t>& visto = vistos[(tipo >> 3) % vistos.size()];
     std::uintptr_t palavra = visto.load(std::memory_order_relaxed);
     if ((palavra & ~std::uintptr_t(1)) != tipo) {
         palavra = tipo | (dynamic_cast<T*>(objeto) ? 1 : 0);

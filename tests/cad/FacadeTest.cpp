@@ -823,13 +823,14 @@ TEST_F(FacadeFixture, MarkedReferencesComeInDrawingOrderWithTheirBlockAndFirstIt
     }
 }
 
-// The facade tells an object's kind from a few kinds it saw last: asked in turns of more
-// kinds than it keeps, each answer is still what the object is.
+// The facade tells an object's kind from the kinds it saw last: asked in turns of many
+// kinds, in ever other orders, each answer is still what the object is.
 TEST_F(FacadeFixture, EachObjectsKindIsToldRightWhateverWasAskedBefore) {
     const QString caminho = arquivoBloco("BORNE_K", {"REGUA", "NUMERO"});
     const OdDbObjectId ref = CICad::InsereBloco(caminho, "BORNE_K", "ESQ$0001$A", 1, 2, 0, 0);
     ASSERT_FALSE(ref.isNull());
     zvdb::BlockRecord* ms = db().modelSpace();
+    const std::vector<std::string> caminhoRegistro = {"ZV_TESTE", "R"};
     std::vector<zvdb::DbObject*> objetos = {db().objectByHandle(ref.handle()),
                                             ms->addLine({0, 0, 0}, {1, 0, 0}, "FIOS"),
                                             ms->addLwPolyline({{0, 0, 0}, {1, 1, 0}}, false),
@@ -838,10 +839,11 @@ TEST_F(FacadeFixture, EachObjectsKindIsToldRightWhateverWasAskedBefore) {
                                             ms->addCircle({3, 3, 0}, 1, "CIRC"),
                                             db().layer("0"),
                                             db().block("BORNE_K"),
-                                            db().namedObjects()};
+                                            db().namedObjects(),
+                                            db().xrecordAt(caminhoRegistro, true)};
     for (const OdDbObjectId& atributo : CICad::GetIdsAtributos(ref))
         objetos.push_back(db().objectByHandle(atributo.handle()));
-    ASSERT_EQ(objetos.size(), 11u);
+    ASSERT_EQ(objetos.size(), 12u);
     EXPECT_TRUE(CICad::EhReferencia(ref));
     EXPECT_FALSE(CICad::EhPolilinha(ref));
     EXPECT_EQ(CICad::NomeLayerUtf8(ref), "ESQ$0001$A");
@@ -849,7 +851,7 @@ TEST_F(FacadeFixture, EachObjectsKindIsToldRightWhateverWasAskedBefore) {
         for (std::size_t k = 0; k < objetos.size(); ++k) {
             // Forward, backward and in strides: the kinds come in ever other orders.
             zvdb::DbObject* objeto = objetos[volta == 1   ? objetos.size() - 1 - k
-                                             : volta >= 2 ? (k * (volta + 1)) % objetos.size()
+                                             : volta >= 2 ? (k * (2 * volta + 1)) % objetos.size()
                                                           : k];
             ASSERT_NE(objeto, nullptr);
             const OdDbObjectId id(&db(), objeto->handle());
