@@ -871,3 +871,68 @@ TEST_F(FacadeFixture, EachObjectsKindIsToldRightWhateverWasAskedBefore) {
     objetos[2]->erase();
     EXPECT_FALSE(CICad::EhPolilinha(OdDbObjectId(&db(), objetos[2]->handle())));
 }
+
+// A symbol's reading gives what the entity's own readers give: its layer and block, and each
+// attribute's tag and value, when application groups carry the same codes before them, when
+// a tag is missing, and for references just made or read from a file.
+TEST_F(FacadeFixture, ASymbolsReadingGivesWhatItsEntitiesSay) {
+    const QString caminho = arquivoBloco("BORNE_L", {"REGUA", "NUMERO"});
+    std::vector<zvdb::BlockReference*> refs;
+    for (int k = 0; k < 3; ++k) {
+        const OdDbObjectId id = CICad::InsereBloco(caminho, "BORNE_L", "ESQ$0001$A", k, 2, 0, 0);
+        ASSERT_FALSE(id.isNull());
+        refs.push_back(dynamic_cast<zvdb::BlockReference*>(db().objectByHandle(id.handle())));
+        ASSERT_NE(refs.back(), nullptr);
+    }
+    // The first with a group that holds a layer, a name, a tag and a value of its own, on the
+    // reference and on its first attribute; the second without its layer; the third as made.
+    const auto comGrupo = [](zvdb::DbObject& objeto) {
+        std::vector<zvdb::Tag> tags(objeto.tags().begin(), objeto.tags().end());
+        const zvdb::Tag grupo[] = {
+            {102, "{ZV_APP"}, {8, "OUTRO"}, {2, "FALSO"}, {1, "FALSO"}, {102, "}"}};
+        tags.insert(tags.begin() + 2, std::begin(grupo), std::end(grupo));
+        objeto.replaceTags(tags);
+        objeto.setXData("ZV_APP", std::vector<zvdb::Tag>{{1000, "x"}});
+    };
+    comGrupo(*refs[0]);
+    auto* primeiro = dynamic_cast<zvdb::Attribute*>(refs[0]->subEntities().front());
+    ASSERT_NE(primeiro, nullptr);
+    comGrupo(*primeiro);
+    primeiro->setTextValue("X1");
+    refs[1]->removeAll(8);
+    EXPECT_EQ(refs[1]->layer(), "0");
+
+    const auto confere = [](zvdb::Database& banco, const zvdb::BlockReference& ref) {
+        CESimboloLido lido;
+        ASSERT_TRUE(CICad::LeituraSimbolo(OdDbObjectId(&banco, ref.handle()), lido));
+        EXPECT_TRUE(lido.referencia);
+        EXPECT_EQ(lido.layer, ref.layer());
+        EXPECT_EQ(lido.bloco, "BORNE_L");
+        ASSERT_EQ(lido.atributos.size(), 2u);
+        for (std::size_t k = 0; k < 2; ++k) {
+            const auto* atributo =
+                dynamic_cast<zvdb::Attribute*>(banco.objectByHandle(lido.atributos[k].id.handle()));
+            ASSERT_NE(atributo, nullptr);
+            EXPECT_EQ(lido.atributos[k].tag, k == 0 ? "REGUA" : "NUMERO");
+            EXPECT_EQ(lido.atributos[k].tag, atributo->tag());
+            EXPECT_EQ(lido.atributos[k].valor, atributo->textValue());
+        }
+    };
+    for (zvdb::BlockReference* ref : refs)
+        confere(db(), *ref);
+    CESimboloLido lido;
+    ASSERT_TRUE(CICad::LeituraSimbolo(OdDbObjectId(&db(), refs[0]->handle()), lido));
+    EXPECT_EQ(lido.layer, "ESQ$0001$A");
+    EXPECT_EQ(lido.atributos[0].valor, "X1");
+    ASSERT_TRUE(CICad::LeituraSimbolo(OdDbObjectId(&db(), refs[1]->handle()), lido));
+    EXPECT_EQ(lido.layer, "0");
+
+    const std::unique_ptr<zvdb::Database> lido2 =
+        zvdb::DxfLoader::load(zvdb::DxfWriter::toText(db()));
+    for (zvdb::BlockReference* ref : refs) {
+        auto* lida = dynamic_cast<zvdb::BlockReference*>(lido2->objectByHandle(ref->handle()));
+        ASSERT_NE(lida, nullptr);
+        EXPECT_FALSE(lida->isPatterned());
+        confere(*lido2, *lida);
+    }
+}
