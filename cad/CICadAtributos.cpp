@@ -106,7 +106,7 @@ std::vector<OdDbObjectId> CICad::GetIdsAtributos(const OdDbObjectId& referencia)
     ids.reserve(ref->subEntities().size());
     for (zvdb::Entity* sub : ref->subEntities())
         if (!sub->isErased())
-            if (auto* atributo = dynamic_cast<zvdb::Attribute*>(sub)) ids.push_back(Id(atributo));
+            if (auto* atributo = Classe<zvdb::Attribute>(sub)) ids.push_back(Id(atributo));
     return ids;
 }
 

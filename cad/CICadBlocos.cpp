@@ -235,7 +235,7 @@ std::vector<bool> CICad::RecarregaBlocos(const std::vector<std::pair<QString, QS
     for (zvdb::BlockRecord* dono : db->blocks()) {
         if (dono->isErased()) continue;
         for (zvdb::Entity* entidade : dono->entities()) {
-            auto* ref = dynamic_cast<zvdb::BlockReference*>(entidade);
+            auto* ref = Classe<zvdb::BlockReference>(entidade);
             if (!ref) continue;
             const auto definicao = redefinidos.find(std::string(ref->blockName()));
             if (definicao == redefinidos.end()) continue;
@@ -316,7 +316,7 @@ OdDbObjectId CICad::GetReferenciaNoLayer(const QString& nome, const QString& lay
     if (!db || !db->modelSpace()) return {};
     const std::string camada = U8(layer);
     for (zvdb::Entity* entidade : db->modelSpace()->entities()) {
-        auto* ref = dynamic_cast<zvdb::BlockReference*>(entidade);
+        auto* ref = Classe<zvdb::BlockReference>(entidade);
         if (ref && ref->layer() == camada &&
             Q(ref->blockName()).compare(nome, Qt::CaseInsensitive) == 0)
             return Id(ref);

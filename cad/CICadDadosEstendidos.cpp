@@ -13,6 +13,8 @@
 #include "readers/ZVString.h"
 
 #include <span>
+#include <string_view>
+#include <unordered_map>
 
 using namespace cicad;
 
@@ -175,10 +177,14 @@ std::vector<CICad::ReferenciaComXData> CICad::GetReferenciasComXData(
     std::vector<std::string_view> nomes{aplicacao};
     nomes.insert(nomes.end(), outras.begin(), outras.end());
     std::vector<std::span<const zvdb::Tag>> grupos;
+    // Thousands of references name a few blocks: each name is made a QString once.
+    std::unordered_map<std::string_view, QString> nomesBlocos;
     db->modelSpace()->forEachEntity([&](zvdb::Entity& entidade) {
-        auto* ref = dynamic_cast<zvdb::BlockReference*>(&entidade);
+        auto* ref = Classe<zvdb::BlockReference>(&entidade);
         if (!ref || !GruposXData(*ref, nomes, grupos)) return;
-        ReferenciaComXData achada{Id(ref), Q(ref->blockName()), 0, QString(), {}};
+        const auto [nome, novo] = nomesBlocos.try_emplace(ref->blockName());
+        if (novo) nome->second = Q(nome->first);
+        ReferenciaComXData achada{Id(ref), nome->second, 0, QString(), {}};
         if (!grupos.front().empty()) {
             achada.codigo = grupos.front().front().code;
             achada.texto = Q(grupos.front().front().value);

@@ -44,7 +44,7 @@ bool CICad::GetExtensao(const OdDbObjectId& entidade, double& xMax, double& xMin
     const std::string_view tipo = e->type();
     if ((tipo == "TEXT" || tipo == "MTEXT") && !comAtributos) return false;
     zvdb::BoundingBox caixa;
-    if (auto* ref = dynamic_cast<zvdb::BlockReference*>(e)) {
+    if (auto* ref = Classe<zvdb::BlockReference>(e)) {
         caixa = ExtensaoReferencia(*ref, comAtributos);
     } else if (tipo == "ELLIPSE") {
         const zvdb::Point3 centro = e->point(10);
@@ -157,7 +157,7 @@ QHash<QString, std::vector<OdDbObjectId>> CICad::GetReferenciasPorBloco(zvdb::Da
     std::unordered_map<std::string_view, std::vector<OdDbObjectId>*> porNome;
     for (zvdb::BlockRecord* bloco : db->blocks())
         bloco->forEachEntity([&](zvdb::Entity& entidade) {
-            auto* ref = dynamic_cast<zvdb::BlockReference*>(&entidade);
+            auto* ref = Classe<zvdb::BlockReference>(&entidade);
             if (!ref) return;
             std::vector<OdDbObjectId>*& lista = porNome[ref->blockName()];
             if (!lista) lista = &referencias[Q(ref->blockName()).toUpper()];

@@ -9,10 +9,15 @@
 
 #include <QString>
 
+#include <array>
+#include <atomic>
+#include <cstdint>
 #include <exception>
 #include <optional>
 #include <string>
 #include <string_view>
+#include <type_traits>
+#include <typeinfo>
 #include <vector>
 
 namespace zvdb {
@@ -39,9 +44,38 @@ inline zvdb::DbObject* Objeto(const OdDbObjectId& id) {
     return objeto && !objeto->isErased() ? objeto : nullptr;
 }
 
+// The address of the object's own type. Asked outside the template below: in it, GCC 12
+// gave the type of the pointer instead of the object's.
+inline std::uintptr_t TipoDe(const zvdb::DbObject& objeto) {
+    return reinterpret_cast<std::uintptr_t>(&typeid(objeto));
+}
+
+// The object as a T, or null when it is none: as dynamic_cast answers, but the drawing's
+// classes derive singly and publicly, so the answer for a type holds for each object of it.
+// The last types asked of are kept, each in one word (the type's address, and in its low bit
+// whether it is a T), all in one cache line; the facade asks the same of many objects of a
+// few types.
+template <class T>
+T* Classe(zvdb::DbObject* objeto) {
+    static_assert(std::is_base_of_v<zvdb::DbObject, T> && alignof(std::type_info) > 1);
+    if (!objeto) return nullptr;
+    alignas(64) static std::array<std::atomic<std::uintptr_t>, 8> vistos{};
+    static std::atomic<unsigned> proximo{0};
+    const std::uintptr_t tipo = TipoDe(*objeto);
+    for (const std::atomic<std::uintptr_t>& visto : vistos) {
+        const std::uintptr_t palavra = visto.load(std::memory_order_relaxed);
+        if ((palavra & ~std::uintptr_t(1)) == tipo)
+            return (palavra & 1) ? static_cast<T*>(objeto) : nullptr;
+    }
+    const bool eh = dynamic_cast<T*>(objeto) != nullptr;
+    vistos[proximo.fetch_add(1, std::memory_order_relaxed) % vistos.size()].store(
+        tipo | (eh ? 1 : 0), std::memory_order_relaxed);
+    return eh ? static_cast<T*>(objeto) : nullptr;
+}
+
 template <class T>
 T* Como(const OdDbObjectId& id) {
-    return dynamic_cast<T*>(Objeto(id));
+    return Classe<T>(Objeto(id));
 }
 
 inline OdDbObjectId Id(const zvdb::DbObject* objeto) {

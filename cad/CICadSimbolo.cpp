@@ -4,6 +4,7 @@
 #include "drawing/Attribute.h"
 #include "drawing/BlockReference.h"
 #include "drawing/Entity.h"
+#include "drawing/TagList.h"
 #include "drawing/TagValues.h"
 
 #include <array>
@@ -56,6 +57,39 @@ bool Chave(const std::array<std::span<const zvdb::Tag>, kAplicacoes>& grupos,
     return false;
 }
 
+// The first value of each of two codes, where DbObject::text finds it (outside application
+// groups, before the extended data), in one walk of the object's tags; `fallback` for a code
+// that is absent.
+void DoisTextos(const zvdb::DbObject& objeto, const int (&codigos)[2],
+                const std::string_view (&fallback)[2], std::string_view (&textos)[2]) {
+    if (objeto.isPatterned()) {
+        // Its pattern answers without a walk.
+        for (int k = 0; k < 2; ++k)
+            textos[k] = objeto.text(codigos[k], fallback[k]);
+        return;
+    }
+    bool achado[2] = {false, false};
+    const std::span<const zvdb::Tag> todos = objeto.tags();
+    const std::size_t fim = zvdb::TagList::xdataStart(todos);
+    bool emGrupo = false;
+    for (std::size_t i = 1; i < fim && !(achado[0] && achado[1]); ++i) {
+        const zvdb::Tag& tag = todos[i];
+        if (zvdb::TagList::opensGroup(tag)) {
+            emGrupo = true;
+        } else if (zvdb::TagList::closesGroup(tag)) {
+            emGrupo = false;
+        } else if (!emGrupo) {
+            for (int k = 0; k < 2; ++k)
+                if (!achado[k] && tag.code == codigos[k]) {
+                    textos[k] = tag.value;
+                    achado[k] = true;
+                }
+        }
+    }
+    for (int k = 0; k < 2; ++k)
+        if (!achado[k]) textos[k] = fallback[k];
+}
+
 }  // namespace
 
 bool CICad::TextoChave(const OdDbObjectId& entidade, std::string_view& texto, bool& temTexto) {
@@ -89,19 +123,28 @@ bool CICad::LeituraSimbolo(const OdDbObjectId& entidade, CESimboloLido& lido) {
     } else {
         lido.temCircuito = GetCircuitoLocal(entidade, lido.circuito);
     }
-    auto* entidadeDesenho = dynamic_cast<zvdb::Entity*>(objeto);
+    auto* entidadeDesenho = Classe<zvdb::Entity>(objeto);
     if (!entidadeDesenho) return true;
-    lido.layer = entidadeDesenho->layer();
-    auto* ref = dynamic_cast<zvdb::BlockReference*>(entidadeDesenho);
-    if (!ref) return true;
+    auto* ref = Classe<zvdb::BlockReference>(entidadeDesenho);
+    if (!ref) {
+        lido.layer = entidadeDesenho->layer();
+        return true;
+    }
     lido.referencia = true;
-    lido.bloco = ref->blockName();
+    // The layer and block name (layer() and blockName()), and each attribute's tag and value
+    // (tag() and textValue()), each pair in one walk.
+    std::string_view textos[2];
+    DoisTextos(*ref, {8, 2}, {"0", {}}, textos);
+    lido.layer = textos[0];
+    lido.bloco = textos[1];
     const zvdb::Point3 p = ref->position();
     lido.posicao = {p.x, p.y, p.z};
     for (zvdb::Entity* sub : ref->subEntities()) {
         if (sub->isErased()) continue;
-        if (auto* atributo = dynamic_cast<zvdb::Attribute*>(sub))
-            lido.atributos.push_back({atributo->tag(), atributo->textValue(), Id(atributo)});
+        if (auto* atributo = Classe<zvdb::Attribute>(sub)) {
+            DoisTextos(*atributo, {2, 1}, {{}, {}}, textos);
+            lido.atributos.push_back({textos[0], textos[1], Id(atributo)});
+        }
     }
     return true;
 }

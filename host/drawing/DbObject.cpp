@@ -483,7 +483,15 @@ void DbObject::setXDataWith(std::string_view application, std::size_t count, Fil
     fill(group + 1);
     const auto current = tags();
     const auto [begin, end] = applicationGroup(current, xdataStart(), application);
-    // A file object's tags are copied once, at the size they will have.
+    if (end - begin == count + 1) {
+        // As many items as before: the new ones go where the old ones are.
+        noteEdit();
+        Tag* at = owned_ ? own_->data() : const_cast<Tag*>(fileTags_);
+        std::copy(group, group + count + 1, at + begin);
+        return;
+    }
+    // A file object's tags are copied once, at the size they will have. (Made in the arena
+    // instead, a symbol that gains groups link after link would leave a copy behind at each.)
     const std::size_t after = current.size() - (end - begin) + count + 1;
     auto& all = editTags(after > current.size() ? after - current.size() : 0);
     all.erase(all.begin() + static_cast<std::ptrdiff_t>(begin),

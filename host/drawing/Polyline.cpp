@@ -1,6 +1,7 @@
 #include "Polyline.h"
 
 #include "Database.h"
+#include "TagList.h"
 #include "TagValues.h"
 
 namespace zvdb {
@@ -12,13 +13,26 @@ std::vector<Point3> Polyline::vertices() const {
             if (!vertex->isErased()) points.push_back(vertex->point(10));
         return points;
     }
-    const double elevation = real(38);
     const auto all = tags();
     const std::size_t end = xdataStart();
-    // Counted first: the array is made once at its size.
+    // Counted first, so that the array is made once at its size; the same walk finds the
+    // elevation where real(38) would (outside application groups).
     std::size_t count = 0;
-    for (std::size_t i = 1; i < end; ++i)
-        count += all[i].code == 10;
+    const Tag* elevationTag = nullptr;
+    bool inGroup = false;
+    for (std::size_t i = 1; i < end; ++i) {
+        const Tag& tag = all[i];
+        if (tag.code == 10) {
+            ++count;
+        } else if (TagList::opensGroup(tag)) {
+            inGroup = true;
+        } else if (TagList::closesGroup(tag)) {
+            inGroup = false;
+        } else if (tag.code == 38 && !inGroup && !elevationTag) {
+            elevationTag = &tag;
+        }
+    }
+    const double elevation = elevationTag ? TagValues::toReal(elevationTag->value, 0.0) : 0.0;
     points.reserve(count);
     for (std::size_t i = 1; i < end; ++i) {
         if (all[i].code == 10)

@@ -14,24 +14,29 @@ std::size_t TagList::xdataStart(std::span<const Tag> all) {
 }
 
 int TagList::indexOf(std::span<const Tag> all, int code, std::size_t from) {
+    if (all.size() < 2) return -1;
     // The extended data's start is looked for only when a tag of 1000 or above is reached:
     // below the first such tag there is no extended data.
-    std::size_t end = all.size();
+    const Tag* const first = all.data();
+    const Tag* end = first + all.size();
     bool endKnown = code >= 1000;
     bool inGroup = false;
-    for (std::size_t i = 1; i < end; ++i) {
-        const Tag& tag = all[i];
-        if (!endKnown && tag.code >= 1000) {
-            end = xdataStart(all);
+    for (const Tag* tag = first + 1; tag < end; ++tag) {
+        // Most tags are none of the codes that ask for a look (the one searched, a group's
+        // bracket, extended data): passed over on the code alone.
+        const int at = tag->code;
+        if (at != code && at != 102 && at < 1000) continue;
+        if (!endKnown && at >= 1000) {
+            end = first + xdataStart(all);
             endKnown = true;
-            if (i >= end) break;
+            if (tag >= end) break;
         }
-        if (opensGroup(tag)) {
+        if (opensGroup(*tag)) {
             inGroup = true;
-        } else if (closesGroup(tag)) {
+        } else if (closesGroup(*tag)) {
             inGroup = false;
-        } else if (!inGroup && tag.code == code && i >= from) {
-            return static_cast<int>(i);
+        } else if (!inGroup && at == code && static_cast<std::size_t>(tag - first) >= from) {
+            return static_cast<int>(tag - first);
         }
     }
     return -1;

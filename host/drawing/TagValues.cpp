@@ -102,8 +102,10 @@ std::string TagValues::fromHandle(std::uint64_t handle) {
 
 bool TagValues::sameName(std::string_view a, std::string_view b) {
     if (a.size() != b.size()) return false;
+    // Names mostly come in the case they were registered in: a byte that matches as it is
+    // is not converted.
     for (std::size_t i = 0; i < a.size(); ++i)
-        if (upper(a[i]) != upper(b[i])) return false;
+        if (a[i] != b[i] && upper(a[i]) != upper(b[i])) return false;
     return true;
 }
 

@@ -822,3 +822,117 @@ TEST_F(FacadeFixture, MarkedReferencesComeInDrawingOrderWithTheirBlockAndFirstIt
         EXPECT_EQ(CICad::GetNomeBloco(r.id), r.bloco);
     }
 }
+
+// The facade tells an object's kind from the kinds it saw last: asked in turns of many
+// kinds, in ever other orders, each answer is still what the object is.
+TEST_F(FacadeFixture, EachObjectsKindIsToldRightWhateverWasAskedBefore) {
+    const QString caminho = arquivoBloco("BORNE_K", {"REGUA", "NUMERO"});
+    const OdDbObjectId ref = CICad::InsereBloco(caminho, "BORNE_K", "ESQ$0001$A", 1, 2, 0, 0);
+    ASSERT_FALSE(ref.isNull());
+    zvdb::BlockRecord* ms = db().modelSpace();
+    const std::vector<std::string> caminhoRegistro = {"ZV_TESTE", "R"};
+    std::vector<zvdb::DbObject*> objetos = {db().objectByHandle(ref.handle()),
+                                            ms->addLine({0, 0, 0}, {1, 0, 0}, "FIOS"),
+                                            ms->addLwPolyline({{0, 0, 0}, {1, 1, 0}}, false),
+                                            ms->addText({0, 0, 0}, 1, "texto"),
+                                            ms->addPoint({2, 2, 0}),
+                                            ms->addCircle({3, 3, 0}, 1, "CIRC"),
+                                            db().layer("0"),
+                                            db().block("BORNE_K"),
+                                            db().namedObjects(),
+                                            db().xrecordAt(caminhoRegistro, true)};
+    for (const OdDbObjectId& atributo : CICad::GetIdsAtributos(ref))
+        objetos.push_back(db().objectByHandle(atributo.handle()));
+    ASSERT_EQ(objetos.size(), 12u);
+    EXPECT_TRUE(CICad::EhReferencia(ref));
+    EXPECT_FALSE(CICad::EhPolilinha(ref));
+    EXPECT_EQ(CICad::NomeLayerUtf8(ref), "ESQ$0001$A");
+    for (int volta = 0; volta < 4; ++volta) {
+        for (std::size_t k = 0; k < objetos.size(); ++k) {
+            // Forward, backward and in strides: the kinds come in ever other orders.
+            zvdb::DbObject* objeto = objetos[volta == 1   ? objetos.size() - 1 - k
+                                             : volta >= 2 ? (k * (2 * volta + 1)) % objetos.size()
+                                                          : k];
+            ASSERT_NE(objeto, nullptr);
+            const OdDbObjectId id(&db(), objeto->handle());
+            const auto* entidade = dynamic_cast<zvdb::Entity*>(objeto);
+            EXPECT_EQ(CICad::EhReferencia(id),
+                      dynamic_cast<zvdb::BlockReference*>(objeto) != nullptr)
+                << objeto->type();
+            EXPECT_EQ(CICad::EhPolilinha(id), dynamic_cast<zvdb::Polyline*>(objeto) != nullptr)
+                << objeto->type();
+            EXPECT_EQ(CICad::NomeLayerUtf8(id), entidade ? entidade->layer() : std::string_view())
+                << objeto->type();
+            EXPECT_EQ(CICad::GetIdsAtributos(id).size(), objeto == objetos[0] ? 2u : 0u)
+                << objeto->type();
+        }
+    }
+    // An erased object is no kind at all.
+    objetos[2]->erase();
+    EXPECT_FALSE(CICad::EhPolilinha(OdDbObjectId(&db(), objetos[2]->handle())));
+}
+
+// A symbol's reading gives what the entity's own readers give: its layer and block, and each
+// attribute's tag and value, when application groups carry the same codes before them, when
+// a tag is missing, and for references just made or read from a file.
+TEST_F(FacadeFixture, ASymbolsReadingGivesWhatItsEntitiesSay) {
+    const QString caminho = arquivoBloco("BORNE_L", {"REGUA", "NUMERO"});
+    std::vector<zvdb::BlockReference*> refs;
+    for (int k = 0; k < 3; ++k) {
+        const OdDbObjectId id = CICad::InsereBloco(caminho, "BORNE_L", "ESQ$0001$A", k, 2, 0, 0);
+        ASSERT_FALSE(id.isNull());
+        refs.push_back(dynamic_cast<zvdb::BlockReference*>(db().objectByHandle(id.handle())));
+        ASSERT_NE(refs.back(), nullptr);
+    }
+    // The first with a group that holds a layer, a name, a tag and a value of its own, on the
+    // reference and on its first attribute; the second without its layer; the third as made.
+    const auto comGrupo = [](zvdb::DbObject& objeto) {
+        std::vector<zvdb::Tag> tags(objeto.tags().begin(), objeto.tags().end());
+        const zvdb::Tag grupo[] = {
+            {102, "{ZV_APP"}, {8, "OUTRO"}, {2, "FALSO"}, {1, "FALSO"}, {102, "}"}};
+        tags.insert(tags.begin() + 2, std::begin(grupo), std::end(grupo));
+        objeto.replaceTags(tags);
+        objeto.setXData("ZV_APP", std::vector<zvdb::Tag>{{1000, "x"}});
+    };
+    comGrupo(*refs[0]);
+    auto* primeiro = dynamic_cast<zvdb::Attribute*>(refs[0]->subEntities().front());
+    ASSERT_NE(primeiro, nullptr);
+    comGrupo(*primeiro);
+    primeiro->setTextValue("X1");
+    refs[1]->removeAll(8);
+    EXPECT_EQ(refs[1]->layer(), "0");
+
+    const auto confere = [](zvdb::Database& banco, const zvdb::BlockReference& ref) {
+        CESimboloLido lido;
+        ASSERT_TRUE(CICad::LeituraSimbolo(OdDbObjectId(&banco, ref.handle()), lido));
+        EXPECT_TRUE(lido.referencia);
+        EXPECT_EQ(lido.layer, ref.layer());
+        EXPECT_EQ(lido.bloco, "BORNE_L");
+        ASSERT_EQ(lido.atributos.size(), 2u);
+        for (std::size_t k = 0; k < 2; ++k) {
+            const auto* atributo =
+                dynamic_cast<zvdb::Attribute*>(banco.objectByHandle(lido.atributos[k].id.handle()));
+            ASSERT_NE(atributo, nullptr);
+            EXPECT_EQ(lido.atributos[k].tag, k == 0 ? "REGUA" : "NUMERO");
+            EXPECT_EQ(lido.atributos[k].tag, atributo->tag());
+            EXPECT_EQ(lido.atributos[k].valor, atributo->textValue());
+        }
+    };
+    for (zvdb::BlockReference* ref : refs)
+        confere(db(), *ref);
+    CESimboloLido lido;
+    ASSERT_TRUE(CICad::LeituraSimbolo(OdDbObjectId(&db(), refs[0]->handle()), lido));
+    EXPECT_EQ(lido.layer, "ESQ$0001$A");
+    EXPECT_EQ(lido.atributos[0].valor, "X1");
+    ASSERT_TRUE(CICad::LeituraSimbolo(OdDbObjectId(&db(), refs[1]->handle()), lido));
+    EXPECT_EQ(lido.layer, "0");
+
+    const std::unique_ptr<zvdb::Database> lido2 =
+        zvdb::DxfLoader::load(zvdb::DxfWriter::toText(db()));
+    for (zvdb::BlockReference* ref : refs) {
+        auto* lida = dynamic_cast<zvdb::BlockReference*>(lido2->objectByHandle(ref->handle()));
+        ASSERT_NE(lida, nullptr);
+        EXPECT_FALSE(lida->isPatterned());
+        confere(*lido2, *lida);
+    }
+}

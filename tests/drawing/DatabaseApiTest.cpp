@@ -385,6 +385,78 @@ TEST_F(DatabaseApi, ExtendedDataOfAFilesObjectsFollowsEveryEdit) {
     }
 }
 
+TEST_F(DatabaseApi, ReplacedExtendedDataOfAFilesObjectsFollowsEachEditAndLeavesNeighboursBe) {
+    // A group replaced by one of the same size is written where it is; one of another size
+    // moves the object's tags elsewhere. Either way the object's other groups and tags, and
+    // the objects read next to it, keep what they had.
+    for (const char* name : {"A", "B", "C"}) {
+        Entity* line = db.modelSpace()->addLine({0, 0, 0}, {1, 1, 0});
+        line->setXData("APP", std::vector<Tag>{tag(1000, name), tag(1000, "2")});
+        line->setXData("OUTRA", std::vector<Tag>{tag(1000, std::string(name) + "x")});
+    }
+    const std::unique_ptr<Database> again = reloaded(db);
+    const std::vector<Entity*> lines = again->modelSpace()->entities();
+    ASSERT_EQ(lines.size(), 3u);
+    Entity* middle = lines[1];
+    const auto texts = [](const Entity& entity, std::string_view app) {
+        std::vector<std::string_view> values;
+        for (const Tag& item : entity.xdataItems(app))
+            values.push_back(item.value);
+        return values;
+    };
+    using Texts = std::vector<std::string_view>;
+    const auto neighboursKept = [&] {
+        EXPECT_EQ(texts(*lines[0], "APP"), (Texts{"A", "2"}));
+        EXPECT_EQ(texts(*lines[0], "OUTRA"), (Texts{"Ax"}));
+        EXPECT_EQ(texts(*lines[2], "APP"), (Texts{"C", "2"}));
+        EXPECT_EQ(texts(*lines[2], "OUTRA"), (Texts{"Cx"}));
+    };
+    const std::string_view same[] = {"B2", "3"};
+    middle->setXDataTexts("APP", same);
+    EXPECT_EQ(texts(*middle, "app"), (Texts{"B2", "3"}));
+    EXPECT_EQ(texts(*middle, "OUTRA"), (Texts{"Bx"}));
+    EXPECT_EQ(middle->xdataApplications(), (Texts{"APP", "OUTRA"}));
+    neighboursKept();
+
+    const std::string_view shorter[] = {"B3"};
+    middle->setXDataTexts("APP", shorter);
+    EXPECT_EQ(texts(*middle, "APP"), (Texts{"B3"}));
+    EXPECT_EQ(texts(*middle, "OUTRA"), (Texts{"Bx"}));
+    EXPECT_EQ(middle->xdataApplications(), (Texts{"APP", "OUTRA"}));
+    neighboursKept();
+
+    // Its items given back to it, as a caller may do with what it read.
+    const std::vector<Tag> own = middle->xdata("OUTRA");
+    middle->setXData("OUTRA", own);
+    EXPECT_EQ(texts(*middle, "OUTRA"), (Texts{"Bx"}));
+    const std::span<const Tag> inPlace = middle->xdataItems("APP");
+    middle->setXData("APP", inPlace);
+    EXPECT_EQ(texts(*middle, "APP"), (Texts{"B3"}));
+
+    // Edits after the move find the tags where they are now.
+    middle->setColor(5);
+    middle->setLayer("OUTRO");
+    const std::string_view longer[] = {"B4", "5", "6"};
+    middle->setXDataTexts("APP", longer);
+    middle->setXDataTexts("NOVA", longer);
+    EXPECT_EQ(middle->color(), 5);
+    EXPECT_EQ(middle->layer(), "OUTRO");
+    EXPECT_EQ(texts(*middle, "APP"), (Texts{"B4", "5", "6"}));
+    EXPECT_EQ(texts(*middle, "NOVA"), (Texts{"B4", "5", "6"}));
+    EXPECT_EQ(middle->xdataApplications(), (Texts{"APP", "OUTRA", "NOVA"}));
+    neighboursKept();
+
+    // And so it is written.
+    const std::unique_ptr<Database> third = reloaded(*again);
+    Entity* read = third->entityByHandle(middle->handle());
+    ASSERT_NE(read, nullptr);
+    EXPECT_EQ(read->layer(), "OUTRO");
+    EXPECT_EQ(texts(*read, "APP"), (Texts{"B4", "5", "6"}));
+    EXPECT_EQ(texts(*read, "OUTRA"), (Texts{"Bx"}));
+    EXPECT_EQ(read->xdataApplications(), (Texts{"APP", "OUTRA", "NOVA"}));
+    EXPECT_EQ(texts(*third->entityByHandle(lines[2]->handle()), "APP"), (Texts{"C", "2"}));
+}
+
 TEST_F(DatabaseApi, DeepCloneBringsBlocksLayersAndTranslatesHandles) {
     Database source;
     source.createLayer("SYMBOLS")->setColor(3);
@@ -580,6 +652,32 @@ TEST_F(DatabaseApi, TextsPolylinesAndLongMText) {
     EXPECT_EQ(model[0].toObject()["text"].toString().toStdString(), longText);
     EXPECT_EQ(model[1].toObject()["text"].toString(), QString("Página 2"));
     EXPECT_EQ(model[2].toObject()["points"].toArray().size(), 3);
+}
+
+TEST_F(DatabaseApi, LightweightPolylineVerticesStandAtItsOwnElevation) {
+    BlockRecord* ms = db.modelSpace();
+    Polyline* flat = ms->addLwPolyline({{0, 0, 0}, {1, 2, 0}, {3, 4, 0}}, false);
+    Polyline* raised = ms->addLwPolyline({{0, 0, 0}, {1, 2, 0}}, false);
+    raised->setReal(38, 7.5, "AcDbPolyline");
+    EXPECT_EQ(raised->vertices()[1], (Point3{1, 2, 7.5}));
+    // A 38 of an application group is not the polyline's elevation.
+    std::vector<Tag> grouped(flat->tags().begin(), flat->tags().end());
+    const Tag group[] = {tag(102, "{ZV_APP"), tag(38, "9"), tag(102, "}")};
+    grouped.insert(grouped.begin() + 2, std::begin(group), std::end(group));
+    flat->replaceTags(grouped);
+    flat->setXData("APP", std::vector<Tag>{tag(1000, "x"), tag(1040, "8")});
+    EXPECT_EQ(flat->vertices(), (std::vector<Point3>{{0, 0, 0}, {1, 2, 0}, {3, 4, 0}}));
+    // An elevation after the group is.
+    flat->setReal(38, -2, "AcDbPolyline");
+    EXPECT_EQ(flat->vertices(), (std::vector<Point3>{{0, 0, -2}, {1, 2, -2}, {3, 4, -2}}));
+
+    const std::unique_ptr<Database> again = reloaded(db);
+    const auto* read = dynamic_cast<Polyline*>(again->entityByHandle(flat->handle()));
+    ASSERT_NE(read, nullptr);
+    EXPECT_EQ(read->vertices(), flat->vertices());
+    const auto* readRaised = dynamic_cast<Polyline*>(again->entityByHandle(raised->handle()));
+    ASSERT_NE(readRaised, nullptr);
+    EXPECT_EQ(readRaised->vertices(), (std::vector<Point3>{{0, 0, 7.5}, {1, 2, 7.5}}));
 }
 
 TEST_F(DatabaseApi, OldVersionsAreWrittenInTheirCodePage) {

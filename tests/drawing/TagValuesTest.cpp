@@ -98,3 +98,22 @@ TEST(TagValuesReals, BlanksAPlusSignAndTextThatIsNoNumber) {
 }
 
 }  // namespace
+
+namespace {
+
+TEST(TagValuesNames, NamesMatchWithoutRegardToTheCaseOfLettersOnly) {
+    EXPECT_TRUE(TagValues::sameName("KVR_ZV_WIRE", "KVR_ZV_WIRE"));
+    EXPECT_TRUE(TagValues::sameName("kvr_zv_wire", "KVR_ZV_WIRE"));
+    EXPECT_TRUE(TagValues::sameName("Kvr_Zv_Wire", "kVR_zV_wIRE"));
+    EXPECT_TRUE(TagValues::sameName("", ""));
+    EXPECT_FALSE(TagValues::sameName("KVR_ZV_WIRE", "KVR_ZV_CABO"));
+    EXPECT_FALSE(TagValues::sameName("KVR_ZV_WIRE", "KVR_ZV_WIRF"));
+    EXPECT_FALSE(TagValues::sameName("KVR_ZV", "KVR_ZV_WIRE"));
+    EXPECT_FALSE(TagValues::sameName("KVR_ZV_WIRE", "KVR_ZV"));
+    // Only letters fold: signs 32 apart stay apart.
+    EXPECT_FALSE(TagValues::sameName("A@", "A`"));
+    EXPECT_FALSE(TagValues::sameName("[", "{"));
+    EXPECT_FALSE(TagValues::sameName("a1", "A\x11"));
+}
+
+}  // namespace
