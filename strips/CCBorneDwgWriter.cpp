@@ -4,11 +4,14 @@
 #include "lists/CCListaPaginada.h"
 #include "lists/CETemplate.h"
 #include "readers/CEListaAtributos.h"
+#include "readers/Descarte.h"
 #include "readers/VetorItens.h"
 #include "readers/ZVString.h"
 #include "settings/CIMensagens.h"
 
 #include <limits>
+#include <memory>
+#include <new>
 #include <utility>
 
 namespace {
@@ -25,6 +28,16 @@ bool ComecaCom(const QString& tag, const char* a, const char* b) {
 CCBorneDwgWriter::CCBorneDwgWriter()
     : prefixo_(CICad::GetStringLisp("*ZV_PREFIX*")),
       pastaRede_(CICad::GetStringLisp("*DIRETORIO_REDE*")) {}
+
+CCBorneDwgWriter::~CCBorneDwgWriter() {
+    // Its terminals, symbols, strips and pages are many small pieces that point only at
+    // each other and at items nobody follows any more.
+    try {
+        Descarte::Descartar(std::make_unique<CEModeloReguas>(std::move(modelo_)));
+    } catch (const std::bad_alloc&) {
+        // No room to move it: it goes here, with the writer.
+    }
+}
 
 CCBorneDwgWriter::Bloco CCBorneDwgWriter::BlocoConfigurado(const QString& valor) const {
     if (valor.isEmpty()) return {};

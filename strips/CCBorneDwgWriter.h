@@ -22,6 +22,8 @@ class CCBorneDwgWriter : public CCDataWriter {
 public:
     // Reads the block-name prefix (*ZV_PREFIX*) and the shared folder (*DIRETORIO_REDE*).
     CCBorneDwgWriter();
+    // The model goes to the module's freeing thread.
+    ~CCBorneDwgWriter() override;
 
     void EscreverItens(VetorItens& itens, CETemplate& modelo) override { Escreve(itens, modelo); }
     // Throws message 150 with the path when a block file the template names is missing;
