@@ -461,7 +461,7 @@ void CCFioDataReader::LeSegmentoNoIndice(const QString& lado, CEItemLista& item,
                               ? (*pontos)[size_t(lugar)]
                               : CEPonto{};
     const OdDbObjectId fio = FioNoPonto(item.valorCampo(ini ? kLayerIni : kLayerFim), ponto);
-    if (!fio.isNull()) CopiaEntidade(ini ? kSegIni : kSegFim, item, fio, modelo);
+    if (!fio.isNull()) CopiaEntidade(ini ? kSegIni : kSegFim, item, fio, modelo, &numero);
 }
 
 void CCFioDataReader::CompoeExtremidade(const QString& sufixo, CEItemLista& item,

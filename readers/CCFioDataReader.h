@@ -119,7 +119,7 @@ private:
     // PontoDaConexaoCompleta finds it; -1 when it has none.
     int PrimeiroLugar(const QString& numero, int indice);
     // The fields of the wire polyline at the point of the entry at `indice`: what LeSegmento
-    // gives for that entry's full text.
+    // gives for that entry's full text. `numero` is the item's own wire number.
     void LeSegmentoNoIndice(const QString& lado, CEItemLista& item, const QString& numero,
                             int indice, CETemplate* modelo);
     // The value of the connection attribute of the wire's entry at `indice` nearest the

@@ -340,4 +340,22 @@ TEST_F(WireLengthTest, TheRouteTextOfTheManualLayoutGoesToCaminhofio) {
     }
 }
 
+TEST_F(WireLengthTest, AWiresCopyReadsTheRoutesOfTheNumberItsCallerGives) {
+    const zvdb::Polyline* doze = fio({{20, 150, 0}, {20, 100, 0}}, "12");
+    CELayoutRotasFios registro;
+    registro.strKeyFio = "13";
+    registro.strRotaData = QString("%1:A2-%2-C7").arg(handle(k1_), handle(x1_));
+    registro.Gravar();
+    CCFioDataReader leitor;
+    // Wire 12's polyline copied under a suffix into an item of wire 13: the routes read are
+    // those of 13, the item's number, not of the polyline's own.
+    CEItemLista item;
+    const QString treze = "13";
+    leitor.CopiaEntidade("_SEGINI", item, id(doze), &modelo_, &treze);
+    EXPECT_EQ(item.valorCampo("FIO_SEGINI"), "12");
+    ASSERT_NE(leitor.Caminhos("13"), nullptr);
+    EXPECT_EQ(leitor.Caminhos("13")->size(), 1);
+    EXPECT_EQ(leitor.Caminhos("12"), nullptr);
+}
+
 }  // namespace
