@@ -220,9 +220,28 @@ int CCFioDataReader::PrimeiroLugar(const QString& numero, int indice) {
     return primeiros[size_t(indice)];
 }
 
+void CCFioDataReader::Listas(const QString& numero,
+                             std::optional<TabelaConexoes::Textos>& elementos,
+                             std::optional<std::span<const CEPonto>>& pontos) {
+    if (!composicao_) {
+        elementos = ListaConexoes(numero);
+        pontos = PontosConexao(numero);
+        return;
+    }
+    FioAtual& fio = Fio(numero);
+    if (!fio.listasLidas) {
+        fio.elementos = ListaConexoes(numero);
+        fio.pontos = PontosConexao(numero);
+        fio.listasLidas = true;
+    }
+    elementos = fio.elementos;
+    pontos = fio.pontos;
+}
+
 std::optional<QString> CCFioDataReader::Ligacao(const QString& numero, int indice) {
-    const auto elementos = ListaConexoes(numero);
-    const auto pontos = PontosConexao(numero);
+    std::optional<TabelaConexoes::Textos> elementos;
+    std::optional<std::span<const CEPonto>> pontos;
+    Listas(numero, elementos, pontos);
     if (!elementos || !pontos || indice < 0 || indice >= elementos->size() ||
         size_t(indice) >= pontos->size())
         return std::nullopt;
@@ -245,8 +264,9 @@ std::optional<QString> CCFioDataReader::Ligacao(const QString& numero, int indic
 std::optional<QString> CCFioDataReader::LigacaoProxima(const QString& numero,
                                                        const QString& elemento, int indice,
                                                        const CEPonto& ponto) {
-    const auto elementos = ListaConexoes(numero);
-    const auto pontos = PontosConexao(numero);
+    std::optional<TabelaConexoes::Textos> elementos;
+    std::optional<std::span<const CEPonto>> pontos;
+    Listas(numero, elementos, pontos);
     if (elementos && pontos && indice >= 0 && indice < elementos->size() &&
         size_t(indice) < pontos->size() &&
         TabelaConexoes::Iguais(elementos->vista(indice), elemento) &&

@@ -10,6 +10,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <optional>
+#include <span>
 #include <unordered_map>
 #include <utility>
 #include <vector>
@@ -138,7 +139,15 @@ private:
         std::vector<int> primeiros;  // per entry, the first entry of the same full text
         std::vector<std::optional<QString>> ligacoes;
         std::vector<bool> ligacoesLidas;
+        // The wire's entries and their points, looked up once.
+        bool listasLidas = false;
+        std::optional<TabelaConexoes::Textos> elementos;
+        std::optional<std::span<const CEPonto>> pontos;
     };
+    // The entries and points of the wire `numero`: in a walk, whose table stays as the walk
+    // loaded it, looked up once per wire; each end asks for them several times.
+    void Listas(const QString& numero, std::optional<TabelaConexoes::Textos>& elementos,
+                std::optional<std::span<const CEPonto>>& pontos);
     FioAtual& Fio(const QString& numero);
     FioAtual fio_;
     // The relation's separators and order, read once for a walk with its template.

@@ -89,8 +89,9 @@ TEST_F(WireReaderTest, TwoDifferentEquipmentsAndAComponentTwiceBreakTheWire) {
 }
 
 TEST_F(WireReaderTest, EveryStretchHoldsTheFieldsOfItsOwnWireAndOfNoOther) {
-    // Two wires of three stretches each, the first with a field of its own, the second without: the
-    // later stretches start from their own wire's fields.
+    // Two wires of three stretches each, the first with a field of its own, the second
+    // without: the later stretches start from their own wire's fields, and each end's
+    // connection is its own wire's.
     borne("X1", "1", {20, 200, 0});
     componente("-K1", {{"A1", {20, 170, 0}}});
     componente("-K2", {{"A1", {20, 150, 0}}});
@@ -103,15 +104,15 @@ TEST_F(WireReaderTest, EveryStretchHoldsTheFieldsOfItsOwnWireAndOfNoOther) {
                                           .text("OBS_LOTE\fAZ")
                                           .tags());
     borne("X2", "1", {120, 200, 0});
-    componente("-K3", {{"A1", {120, 170, 0}}});
-    componente("-K4", {{"A1", {120, 150, 0}}});
+    componente("-K3", {{"A2", {120, 170, 0}}});
+    componente("-K4", {{"B1", {120, 150, 0}}});
     borne("X2", "2", {120, 100, 0});
     const zvdb::Polyline* simples =
         fio({{120, 190, 0}, {120, 170, 0}, {120, 150, 0}, {120, 100, 0}}, "41");
     CCFioDataReader leitor;
     ASSERT_EQ(le(leitor).size(), 6u);
     EXPECT_EQ(cadeias(), QStringList({"X1:1/>-K1:A1 -K1:A1>-K2:A1 -K2:A1>X1:2/",
-                                      "X2:1/>-K3:A1 -K3:A1>-K4:A1 -K4:A1>X2:2/"}));
+                                      "X2:1/>-K3:A2 -K3:A2>-K4:B1 -K4:B1>X2:2/"}));
     int porFio[2] = {0, 0};
     for (const CEItemLista* item : itens_) {
         const bool primeiro = item->valorCampo("FIO") == "40";
