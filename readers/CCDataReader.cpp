@@ -879,7 +879,7 @@ const CCDataReader::EntidadeLida& CCDataReader::EntidadeGuardada(const OdDbObjec
 }
 
 void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
-                                 CETemplate* modelo) {
+                                 CETemplate* modelo, const QString* numeroFio) {
     ConfereVersao();
     const EntidadeLida& lida = EntidadeGuardada(id, modelo);
     const bool rotas = lida.rotas;
@@ -905,7 +905,10 @@ void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const
     item.campos.juntarOrdenados(
         nomes.size(), [&nomes](size_t j) { return nomes[j]; },
         [&lugares, &valores](size_t j) -> const QString& { return valores[lugares[j]]; });
-    if (rotas) LeRotasDoItem(item, modelo);
+    if (rotas && numeroFio)
+        LeRotasFio(*numeroFio, modelo);
+    else if (rotas)
+        LeRotasDoItem(item, modelo);
 }
 
 CEItemLista* CCDataReader::CriaItemBloco(const OdDbObjectId& referencia, CETemplate& modelo) {

@@ -100,8 +100,10 @@ public:
                     CETemplate* modelo);
     // What LeEntidade gives, from the entity's fields read once for the run: an element or a
     // wire stands at the ends of many wires and sides, and its copies share their texts.
+    // `numeroFio`: the item's own wire number when the caller knows it; a wire's copy then
+    // reads the routes of that number without looking for it among the item's fields.
     void CopiaEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
-                       CETemplate* modelo);
+                       CETemplate* modelo, const QString* numeroFio = nullptr);
     // The entities CopiaEntidade keeps read, and the elements' connection attributes, are
     // bounded: past `n` (at least 1) kept since the
     // last turn, those not asked for again since the turn before go, and a later copy reads

@@ -72,6 +72,22 @@ const NomesExtremidade& Nomes(const QString& sufixo) {
     return porSufixo.insert(sufixo, n).value();
 }
 
+// A copy of `origem` whose field array has room for `lugares` fields from the start: a
+// copy made and then widened would allocate and move its fields twice.
+CEItemLista* CopiaComLugar(const CEItemLista& origem, std::size_t lugares) {
+    auto* copia = new CEItemLista;
+    const std::vector<CamposItem::Campo>& campos = origem.campos.todos();
+    copia->campos.reservar(std::max(lugares, campos.size()));
+    copia->campos.juntarOrdenados(
+        campos.size(), [&campos](std::size_t j) { return campos[j].nome; },
+        [&campos](std::size_t j) -> const QString& { return campos[j].valor; });
+    copia->ids = origem.ids;
+    copia->anterior = origem.anterior;
+    copia->proximo = origem.proximo;
+    copia->ligado = origem.ligado;
+    return copia;
+}
+
 bool MesmoPonto(const CEPonto& a, const CEPonto& b) {
     return a.x == b.x && a.y == b.y && a.z == b.z;
 }
@@ -83,8 +99,8 @@ constexpr int kEntradasSemIndice = 16;
 // a literal at each use costs an allocation.
 const QString kIni = QStringLiteral("INI"), kFim = QStringLiteral("FIM"),
               kWireLista = QStringLiteral("WIRE_LISTA"), kSim = QStringLiteral("S"),
-              kTipoLista = QStringLiteral("ZV_LISTA_TIPO"), kAnilha = QStringLiteral("ANILHA"),
-              kHandleIni = QStringLiteral("HANDLE_INI");
+              kTipoLista = QStringLiteral("ZV_LISTA_TIPO"), kTipoFio = QStringLiteral("FIO"),
+              kAnilha = QStringLiteral("ANILHA"), kHandleIni = QStringLiteral("HANDLE_INI");
 
 }  // namespace
 
@@ -157,10 +173,12 @@ std::vector<OdDbObjectId> CCFioDataReader::ListaFios(const QStringList& layers) 
     return fios;
 }
 
-CEItemLista* CCFioDataReader::ItemFio(const OdDbObjectId& polilinha, CETemplate* modelo) {
+CEItemLista* CCFioDataReader::ItemFio(const OdDbObjectId& polilinha, CETemplate* modelo,
+                                      std::size_t lugares) {
     if (ChaveDaEntidade(polilinha).isEmpty()) return nullptr;
     auto* item = new CEItemLista;
     item->ids.push_back(polilinha);
+    item->campos.reservar(lugares);
     CopiaEntidade(QString(), *item, polilinha, modelo);
     return item;
 }
@@ -202,9 +220,28 @@ int CCFioDataReader::PrimeiroLugar(const QString& numero, int indice) {
     return primeiros[size_t(indice)];
 }
 
+void CCFioDataReader::Listas(const QString& numero,
+                             std::optional<TabelaConexoes::Textos>& elementos,
+                             std::optional<std::span<const CEPonto>>& pontos) {
+    if (!composicao_) {
+        elementos = ListaConexoes(numero);
+        pontos = PontosConexao(numero);
+        return;
+    }
+    FioAtual& fio = Fio(numero);
+    if (!fio.listasLidas) {
+        fio.elementos = ListaConexoes(numero);
+        fio.pontos = PontosConexao(numero);
+        fio.listasLidas = true;
+    }
+    elementos = fio.elementos;
+    pontos = fio.pontos;
+}
+
 std::optional<QString> CCFioDataReader::Ligacao(const QString& numero, int indice) {
-    const auto elementos = ListaConexoes(numero);
-    const auto pontos = PontosConexao(numero);
+    std::optional<TabelaConexoes::Textos> elementos;
+    std::optional<std::span<const CEPonto>> pontos;
+    Listas(numero, elementos, pontos);
     if (!elementos || !pontos || indice < 0 || indice >= elementos->size() ||
         size_t(indice) >= pontos->size())
         return std::nullopt;
@@ -227,8 +264,9 @@ std::optional<QString> CCFioDataReader::Ligacao(const QString& numero, int indic
 std::optional<QString> CCFioDataReader::LigacaoProxima(const QString& numero,
                                                        const QString& elemento, int indice,
                                                        const CEPonto& ponto) {
-    const auto elementos = ListaConexoes(numero);
-    const auto pontos = PontosConexao(numero);
+    std::optional<TabelaConexoes::Textos> elementos;
+    std::optional<std::span<const CEPonto>> pontos;
+    Listas(numero, elementos, pontos);
     if (elementos && pontos && indice >= 0 && indice < elementos->size() &&
         size_t(indice) < pontos->size() &&
         TabelaConexoes::Iguais(elementos->vista(indice), elemento) &&
@@ -240,15 +278,12 @@ std::optional<QString> CCFioDataReader::LigacaoProxima(const QString& numero,
 
 void CCFioDataReader::PreencheExtremidade(const QString& lado, CEItemLista& item,
                                           const TabelaConexoes::Textos& elementos, int indice,
-                                          CETemplate* modelo) {
+                                          CETemplate* modelo, const QString& numero) {
     static const QString kSufixoIni = QStringLiteral("_INI"), kSufixoFim = QStringLiteral("_FIM");
     const QString& sufixo = lado == kIni ? kSufixoIni : kSufixoFim;
     CopiaEntidade(sufixo, item, CICad::IdDoHandle(elementos.value(indice)), modelo);
-    // The wire's number, asked by both parts below: an element's fields copied under the
-    // suffix never hold a field of the wire without one.
-    const QString campo = CampoFio(item);
-    if (campo.isEmpty()) return;
-    const QString numero = item.valorCampo(campo);
+    // The wire's number comes from the walk: an element's fields copied under the suffix
+    // never hold a field of the wire without one, so the item's number stays the wire's.
     LeSegmentoNoIndice(lado, item, numero, indice, modelo);
     CompoeExtremidade(sufixo, item, modelo, numero, indice);
 }
@@ -276,13 +311,16 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
         paginas ? QSet<QString>(paginas->begin(), paginas->end()) : QSet<QString>();
     QSet<QString> numeros;
     // The most fields a stretch of the wire before had: the next ones are given that room
-    // at once instead of growing at each end they copy (memory taken and left behind at
-    // each step is what costs at scale). The spare room goes back once the walk is done.
+    // at once, before their first copy, instead of growing at each end they copy (memory
+    // taken and left behind at each step is what costs at scale). The spare room goes back
+    // once the wire is done.
     int lugares = 0;
+    Trechos trechos;
+    CEItemLista padrao;
     for (const OdDbObjectId& fio : fios) {
         if (!CICad::EhPolilinha(fio)) continue;
         if (paginas && !escolhidas.contains(CICad::GetLayerEntidade(fio))) continue;
-        CEItemLista* item = ItemFio(fio, modelo);
+        CEItemLista* item = ItemFio(fio, modelo, size_t(lugares));
         if (!item) continue;
         const QString campo = CampoFio(*item);
         const QString numero = campo.isEmpty() ? QString() : item->valorCampo(campo);
@@ -292,22 +330,20 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
             delete item;
             continue;
         }
-        item->definirCampo(kTipoLista, QStringLiteral("FIO"));
+        item->definirCampo(NumeroCampo<"ZV_LISTA_TIPO">(), kTipoFio);
         numeros.insert(numero);
 
         const TabelaConexoes::Textos elementos =
             ListaConexoes(numero).value_or(TabelaConexoes::Textos());
-        Trechos trechos;
+        trechos.clear();
         if (!elementos.isEmpty()) {
             const int n = int(elementos.size());
             // Later stretches start from the wire's own fields; a wire of two entries has
-            // none.
-            std::optional<CEItemLista> padrao;
+            // none. The copy goes into the array of the wire before.
             if (n > 2) padrao = *item;
-            item->campos.reservar(size_t(lugares));
-            PreencheExtremidade(kIni, *item, elementos, 0, modelo);
+            PreencheExtremidade(kIni, *item, elementos, 0, modelo, numero);
             CEItemLista* atual = item;
-            trechos[atual] = {0, -1};
+            trechos.acrescenta(atual, {0, -1});
             for (int i = 1; i < n; ++i) {
                 const OdDbObjectId elemento = CICad::IdDoHandle(elementos[i]);
                 // An element that no longer exists leaves the stretch open.
@@ -315,17 +351,17 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
                 // A run of one equipment is one passage: the wire goes in and out of it.
                 const bool equipamento = EhEquipamento(elemento);
                 if (!elementos.MesmoTexto(i, i - 1) || !equipamento) {
-                    PreencheExtremidade(kFim, *atual, elementos, i, modelo);
-                    trechos[atual].fim = i;
+                    PreencheExtremidade(kFim, *atual, elementos, i, modelo, numero);
+                    // The stretch under work is always the last one made.
+                    trechos.procura(atual, trechos.tamanho() - 1)->fim = i;
                 }
                 if (i != n - 1 && (!elementos.MesmoTexto(i, i + 1) || !equipamento)) {
-                    auto* novo = new CEItemLista(*padrao);
-                    novo->campos.reservar(size_t(lugares));
-                    PreencheExtremidade(kIni, *novo, elementos, i, modelo);
+                    CEItemLista* novo = CopiaComLugar(padrao, size_t(lugares));
+                    PreencheExtremidade(kIni, *novo, elementos, i, modelo, numero);
                     atual->ligado = novo;
                     itens->push_back(novo);
                     atual = novo;
-                    trechos[atual] = {i, -1};
+                    trechos.acrescenta(atual, {i, -1});
                 }
             }
         }
@@ -359,6 +395,7 @@ VetorItens* CCFioDataReader::LeAnilhas(const QHash<QString, QString>& opcoes, CE
     const QSet<QString> escolhidas(paginas.begin(), paginas.end());
     auto* itens = new VetorItens;
     QSet<QString> numeros;
+    Trechos trechos;
     for (const OdDbObjectId& fio : fios) {
         if (!CICad::EhPolilinha(fio)) continue;
         if (!escolhidas.isEmpty() && !escolhidas.contains(CICad::GetLayerEntidade(fio))) continue;
@@ -380,11 +417,11 @@ VetorItens* CCFioDataReader::LeAnilhas(const QHash<QString, QString>& opcoes, CE
         const int n = int(elementos.size());
         // A ferrule on each conductor end: a stretch between every two elements.
         CEItemLista* atual = item;
-        Trechos trechos;
+        trechos.clear();
         for (int i = 0; n >= 2 && i + 1 < n; ++i) {
-            PreencheExtremidade(kIni, *atual, elementos, i, modelo);
-            PreencheExtremidade(kFim, *atual, elementos, i + 1, modelo);
-            trechos[atual] = {i, i + 1};
+            PreencheExtremidade(kIni, *atual, elementos, i, modelo, numero);
+            PreencheExtremidade(kFim, *atual, elementos, i + 1, modelo, numero);
+            trechos.acrescenta(atual, {i, i + 1});
             if (i + 2 == n) break;
             CEItemLista* novo = ItemFio(fio, modelo);
             if (!novo) break;
@@ -401,7 +438,7 @@ VetorItens* CCFioDataReader::LeAnilhas(const QHash<QString, QString>& opcoes, CE
             CEItemLista* antes = (*itens)[destino - 1];
             if (esta->valorCampo(kHandleIni) == antes->valorCampo(kHandleIni)) {
                 antes->ligado = esta->ligado;
-                trechos.erase(esta);
+                trechos.remove(esta);
                 delete esta;
             } else {
                 (*itens)[destino++] = esta;
@@ -444,7 +481,7 @@ void CCFioDataReader::LeSegmentoNoIndice(const QString& lado, CEItemLista& item,
                               ? (*pontos)[size_t(lugar)]
                               : CEPonto{};
     const OdDbObjectId fio = FioNoPonto(item.valorCampo(ini ? kLayerIni : kLayerFim), ponto);
-    if (!fio.isNull()) CopiaEntidade(ini ? kSegIni : kSegFim, item, fio, modelo);
+    if (!fio.isNull()) CopiaEntidade(ini ? kSegIni : kSegFim, item, fio, modelo, &numero);
 }
 
 void CCFioDataReader::CompoeExtremidade(const QString& sufixo, CEItemLista& item,

@@ -7,9 +7,13 @@
 #include <QSet>
 
 #include <array>
+#include <cstddef>
 #include <cstdint>
 #include <optional>
+#include <span>
 #include <unordered_map>
+#include <utility>
+#include <vector>
 
 class CCFioDataReader : public CCDataReader {
 public:
@@ -61,7 +65,26 @@ public:
     struct Trecho {
         int inicio = 0, fim = -1;
     };
-    using Trechos = std::unordered_map<const CEItemLista*, Trecho>;
+    // The stretches of one chain, kept in the chain's order as the walks make them: a
+    // stretch is looked for at its own place first. An array, not a map: a map costs two
+    // allocations a wire, and the walks reuse one array for all wires.
+    class Trechos {
+    public:
+        // A stretch not yet among them, after the others.
+        void acrescenta(const CEItemLista* item, Trecho trecho) {
+            trechos_.emplace_back(item, trecho);
+        }
+        Trecho* procura(const CEItemLista* item, std::size_t lugar);
+        const Trecho* procura(const CEItemLista* item, std::size_t lugar) const;
+        void remove(const CEItemLista* item);
+        void clear() { trechos_.clear(); }
+        std::size_t tamanho() const { return trechos_.size(); }
+        auto begin() const { return trechos_.begin(); }
+        auto end() const { return trechos_.end(); }
+
+    private:
+        std::vector<std::pair<const CEItemLista*, Trecho>> trechos_;
+    };
     // LENGTH and COMPRIMENTO of every stretch of the chain that starts at `primeiro`. Each
     // stretch is measured between the elements it joins: those `trechos` gives, else the
     // k-th and the next of the list for the k-th stretch; an open stretch to the element
@@ -79,13 +102,16 @@ public:
 
 private:
     // The wire's item from its polyline; null without a key.
-    CEItemLista* ItemFio(const OdDbObjectId& polilinha, CETemplate* modelo);
+    // `lugares`: room for that many fields, given before the first copy.
+    CEItemLista* ItemFio(const OdDbObjectId& polilinha, CETemplate* modelo,
+                         std::size_t lugares = 0);
     // The answer of getListaFios for the layers, as object ids.
     std::vector<OdDbObjectId> ListaFios(const QStringList& layers);
-    // One end of a stretch from the element at `indice` of the wire's lists.
+    // One end of a stretch from the element at `indice` of the lists of the wire `numero`
+    // (the item's own number).
     void PreencheExtremidade(const QString& lado, CEItemLista& item,
                              const TabelaConexoes::Textos& elementos, int indice,
-                             CETemplate* modelo);
+                             CETemplate* modelo, const QString& numero);
     void CarregaTransicoes();
     // What ComporRelacaoFio does, given the connection's value (empty without one).
     void ComporRelacao(const QString& sufixo, CEItemLista& item, CETemplate* modelo,
@@ -94,7 +120,7 @@ private:
     // PontoDaConexaoCompleta finds it; -1 when it has none.
     int PrimeiroLugar(const QString& numero, int indice);
     // The fields of the wire polyline at the point of the entry at `indice`: what LeSegmento
-    // gives for that entry's full text.
+    // gives for that entry's full text. `numero` is the item's own wire number.
     void LeSegmentoNoIndice(const QString& lado, CEItemLista& item, const QString& numero,
                             int indice, CETemplate* modelo);
     // The value of the connection attribute of the wire's entry at `indice` nearest the
@@ -113,7 +139,15 @@ private:
         std::vector<int> primeiros;  // per entry, the first entry of the same full text
         std::vector<std::optional<QString>> ligacoes;
         std::vector<bool> ligacoesLidas;
+        // The wire's entries and their points, looked up once.
+        bool listasLidas = false;
+        std::optional<TabelaConexoes::Textos> elementos;
+        std::optional<std::span<const CEPonto>> pontos;
     };
+    // The entries and points of the wire `numero`: in a walk, whose table stays as the walk
+    // loaded it, looked up once per wire; each end asks for them several times.
+    void Listas(const QString& numero, std::optional<TabelaConexoes::Textos>& elementos,
+                std::optional<std::span<const CEPonto>>& pontos);
     FioAtual& Fio(const QString& numero);
     FioAtual fio_;
     // The relation's separators and order, read once for a walk with its template.

@@ -227,6 +227,34 @@ QString CCFioDataReader::ComprimentoFio(const QString& chave, const CEPonto& ini
     return texto;
 }
 
+namespace {
+
+// The stretch of `item` in a chain's array, looked for at `lugar` first.
+template <class Vetor>
+auto ProcuraTrecho(Vetor& trechos, const CEItemLista* item, std::size_t lugar)
+    -> decltype(&trechos[0].second) {
+    if (lugar < trechos.size() && trechos[lugar].first == item) return &trechos[lugar].second;
+    for (auto& par : trechos)
+        if (par.first == item) return &par.second;
+    return nullptr;
+}
+
+}  // namespace
+
+CCFioDataReader::Trecho* CCFioDataReader::Trechos::procura(const CEItemLista* item,
+                                                           std::size_t lugar) {
+    return ProcuraTrecho(trechos_, item, lugar);
+}
+
+const CCFioDataReader::Trecho* CCFioDataReader::Trechos::procura(const CEItemLista* item,
+                                                                 std::size_t lugar) const {
+    return ProcuraTrecho(trechos_, item, lugar);
+}
+
+void CCFioDataReader::Trechos::remove(const CEItemLista* item) {
+    std::erase_if(trechos_, [item](const auto& trecho) { return trecho.first == item; });
+}
+
 template <class Lista>
 void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const Lista& elementos,
                                           const Trechos* trechos) {
@@ -262,8 +290,7 @@ void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const Lista& el
         CEItemLista& item = *cadeia[k];
         Trecho trecho{int(k), int(k) + 1};
         if (trechos) {
-            auto achado = trechos->find(&item);
-            if (achado != trechos->end()) trecho = achado->second;
+            if (const Trecho* achado = trechos->procura(&item, k)) trecho = *achado;
             if (trecho.fim < 0) trecho.fim = trecho.inicio + 1;
         }
         if (trecho.inicio < 0 || trecho.inicio >= n || trecho.fim >= n) continue;

@@ -82,9 +82,15 @@ namespace {
 // in one buffer, so sorting them reads contiguous memory and makes no text per value.
 class TextosDistintos {
 public:
-    // Room for up to `n` distinct texts.
+    // Room for up to `n` distinct texts, given at once: arrays grown step by step ask the
+    // allocator again at each doubling, and after a reader's walk each large request sifts
+    // through the many small blocks the walk gave back. Room never touched costs nothing.
     explicit TextosDistintos(size_t n) {
         tabela_.assign(std::bit_ceil(std::max<size_t>(16, 2 * n)), kLivre);
+        textos_.reserve(n);
+        inicios_.reserve(n);
+        // A short text with one number takes some twelve units in its natural form.
+        naturais_.reserve(12 * n);
     }
     // The number of the text, given a new one when first seen. The text must outlive this.
     std::uint32_t numero(const QString& texto) {

@@ -204,6 +204,71 @@ TEST_F(WireLengthTest, StretchesBetweenTheSamePointsShareOneAnswer) {
     EXPECT_EQ(leitor.ComprimentoFio("8", a, b), "0.000000");
 }
 
+TEST_F(WireLengthTest, EachStretchIsMeasuredBetweenTheEntriesItsOwnRecordGives) {
+    // Terminals with views along one route, gap k+1 being 10 * (k + 1) long.
+    CICad::SetRealLisp("PBLCOMPFIOPORCENTO", 0.0);
+    CICad::SetRealLisp("PBLCOMPFIOABSOLUTO", 0.0);
+    QStringList elementos;
+    std::vector<zvdb::Point3> vertices;
+    double x = 0;
+    for (int k = 0; k < 8; ++k) {
+        zvdb::BlockReference* b = borne("X9", std::to_string(k + 1), {400.0 + 20 * k, 400, 0});
+        vista(*b, {x, 0, 0}, {});
+        elementos << handle(b);
+        vertices.push_back({x, 0, 0});
+        x += 10 * (k + 1);
+    }
+    rota(vertices, "12");
+    CCFioDataReader leitor;
+    std::vector<std::unique_ptr<CEItemLista>> cadeia;
+    for (int k = 0; k < 4; ++k) {
+        cadeia.push_back(std::make_unique<CEItemLista>());
+        cadeia.back()->definirCampo("FIO", "12");
+        if (k > 0) cadeia[size_t(k - 1)]->ligado = cadeia.back().get();
+    }
+    // Records out of the chain's order, one stretch open and one without a record.
+    CCFioDataReader::Trechos trechos;
+    trechos.acrescenta(cadeia[2].get(), {5, -1});
+    trechos.acrescenta(cadeia[0].get(), {0, 2});
+    trechos.acrescenta(cadeia[1].get(), {2, 5});
+    leitor.CalculaComprimentos(cadeia.front().get(), elementos, &trechos);
+    EXPECT_EQ(cadeia[0]->valorCampo("COMPRIMENTO").toDouble(), 10.0 + 20.0);
+    EXPECT_EQ(cadeia[1]->valorCampo("COMPRIMENTO").toDouble(), 30.0 + 40.0 + 50.0);
+    EXPECT_EQ(cadeia[2]->valorCampo("COMPRIMENTO").toDouble(), 60.0);
+    // Without a record the fourth stretch is the fourth gap.
+    EXPECT_EQ(cadeia[3]->valorCampo("COMPRIMENTO").toDouble(), 40.0);
+}
+
+TEST(WireStretchesTest, AStretchIsFoundAtItsPlaceOrElsewhereAndRemovedKeepingTheOrder) {
+    CEItemLista a, b, c, fora;
+    CCFioDataReader::Trechos trechos;
+    trechos.acrescenta(&a, {0, -1});
+    trechos.acrescenta(&b, {1, 3});
+    trechos.acrescenta(&c, {3, 4});
+    ASSERT_NE(trechos.procura(&b, 1), nullptr);
+    EXPECT_EQ(trechos.procura(&b, 1)->fim, 3);
+    // A wrong place or one past the end still finds it.
+    ASSERT_NE(trechos.procura(&c, 0), nullptr);
+    EXPECT_EQ(trechos.procura(&c, 0)->inicio, 3);
+    ASSERT_NE(trechos.procura(&a, 9), nullptr);
+    EXPECT_EQ(trechos.procura(&a, 9)->inicio, 0);
+    EXPECT_EQ(trechos.procura(&fora, 0), nullptr);
+    trechos.procura(&a, 0)->fim = 1;
+    trechos.remove(&b);
+    EXPECT_EQ(trechos.tamanho(), 2u);
+    EXPECT_EQ(trechos.procura(&b, 1), nullptr);
+    const CCFioDataReader::Trechos& lidos = trechos;
+    ASSERT_NE(lidos.procura(&c, 1), nullptr);
+    EXPECT_EQ(lidos.procura(&c, 1)->inicio, 3);
+    EXPECT_EQ(lidos.procura(&a, 0)->fim, 1);
+    std::vector<const CEItemLista*> ordem;
+    for (const auto& [item, trecho] : lidos)
+        ordem.push_back(item);
+    EXPECT_EQ(ordem, (std::vector<const CEItemLista*>{&a, &c}));
+    trechos.clear();
+    EXPECT_EQ(trechos.procura(&a, 0), nullptr);
+}
+
 TEST_F(WireLengthTest, AChainThatComesBackOnItselfIsMeasuredOncePerStretch) {
     // Terminals with views along one route, each gap 10 longer than the one before, so the
     // length an item gets tells which stretch of the list it was measured as.
@@ -273,6 +338,24 @@ TEST_F(WireLengthTest, TheRouteTextOfTheManualLayoutGoesToCaminhofio) {
             EXPECT_FALSE(item->temCampo("CAMINHOFIO"));
         }
     }
+}
+
+TEST_F(WireLengthTest, AWiresCopyReadsTheRoutesOfTheNumberItsCallerGives) {
+    const zvdb::Polyline* doze = fio({{20, 150, 0}, {20, 100, 0}}, "12");
+    CELayoutRotasFios registro;
+    registro.strKeyFio = "13";
+    registro.strRotaData = QString("%1:A2-%2-C7").arg(handle(k1_), handle(x1_));
+    registro.Gravar();
+    CCFioDataReader leitor;
+    // Wire 12's polyline copied under a suffix into an item of wire 13: the routes read are
+    // those of 13, the item's number, not of the polyline's own.
+    CEItemLista item;
+    const QString treze = "13";
+    leitor.CopiaEntidade("_SEGINI", item, id(doze), &modelo_, &treze);
+    EXPECT_EQ(item.valorCampo("FIO_SEGINI"), "12");
+    ASSERT_NE(leitor.Caminhos("13"), nullptr);
+    EXPECT_EQ(leitor.Caminhos("13")->size(), 1);
+    EXPECT_EQ(leitor.Caminhos("12"), nullptr);
 }
 
 }  // namespace

@@ -88,6 +88,46 @@ TEST_F(WireReaderTest, TwoDifferentEquipmentsAndAComponentTwiceBreakTheWire) {
                                       "X3:1/>-K1:A1 -K1:A1>-K1:A2 -K1:A2>X3:2/"}));
 }
 
+TEST_F(WireReaderTest, EveryStretchHoldsTheFieldsOfItsOwnWireAndOfNoOther) {
+    // Two wires of three stretches each, the first with a field of its own, the second
+    // without: the later stretches start from their own wire's fields, and each end's
+    // connection is its own wire's.
+    borne("X1", "1", {20, 200, 0});
+    componente("-K1", {{"A1", {20, 170, 0}}});
+    componente("-K2", {{"A1", {20, 150, 0}}});
+    borne("X1", "2", {20, 100, 0});
+    zvdb::Polyline* comCampo = fio({{20, 190, 0}, {20, 170, 0}, {20, 150, 0}, {20, 100, 0}}, "40");
+    comCampo->setXData("KVR_ZV_WIRE", zvsample::XDataItems()
+                                          .text("10006\f1")
+                                          .text("1")
+                                          .text("FIO\f40")
+                                          .text("OBS_LOTE\fAZ")
+                                          .tags());
+    borne("X2", "1", {120, 200, 0});
+    componente("-K3", {{"A2", {120, 170, 0}}});
+    componente("-K4", {{"B1", {120, 150, 0}}});
+    borne("X2", "2", {120, 100, 0});
+    const zvdb::Polyline* simples =
+        fio({{120, 190, 0}, {120, 170, 0}, {120, 150, 0}, {120, 100, 0}}, "41");
+    CCFioDataReader leitor;
+    ASSERT_EQ(le(leitor).size(), 6u);
+    EXPECT_EQ(cadeias(), QStringList({"X1:1/>-K1:A1 -K1:A1>-K2:A1 -K2:A1>X1:2/",
+                                      "X2:1/>-K3:A2 -K3:A2>-K4:B1 -K4:B1>X2:2/"}));
+    int porFio[2] = {0, 0};
+    for (const CEItemLista* item : itens_) {
+        const bool primeiro = item->valorCampo("FIO") == "40";
+        ++porFio[primeiro ? 0 : 1];
+        EXPECT_EQ(item->valorCampo("OBS_LOTE"), primeiro ? "AZ" : "");
+        EXPECT_EQ(item->temCampo("OBS_LOTE"), primeiro);
+        EXPECT_EQ(item->valorCampo("ZV_LISTA_TIPO"), "FIO");
+        ASSERT_EQ(item->ids.size(), 1u);
+        EXPECT_EQ(item->ids.front(), id(primeiro ? comCampo : simples));
+        EXPECT_EQ(item->valorCampo("FIO_SEGINI"), item->valorCampo("FIO"));
+    }
+    EXPECT_EQ(porFio[0], 3);
+    EXPECT_EQ(porFio[1], 3);
+}
+
 TEST_F(WireReaderTest, AWireTouchingNothingIsOneItemWithoutEnds) {
     fio({{200, 200, 0}, {250, 200, 0}}, "30");
     CCFioDataReader leitor;
