@@ -10,6 +10,7 @@
 #include <algorithm>
 #include <cctype>
 #include <cmath>
+#include <initializer_list>
 #include <span>
 #include <tuple>
 #include <utility>
@@ -355,13 +356,14 @@ bool DivideCampo(std::string_view texto, std::string_view& nome, std::string_vie
     return n > 0;
 }
 
-// Whether the field's name, in upper case, is one of the wire number's.
-bool EhNomeDoNumero(std::string_view nome) {
+// Whether the name, in upper case as Qt makes it, is one of the words (plain upper-case
+// ASCII); a name in ASCII is compared without a text made for it.
+bool NomeEntre(std::string_view nome, std::initializer_list<std::string_view> palavras) {
     if (std::any_of(nome.begin(), nome.end(), [](char c) { return c & 0x80; })) {
-        // beyond ASCII, upper case as Qt makes it
         const QString maiusculo = QString::fromUtf8(nome.data(), int(nome.size())).toUpper();
-        return maiusculo == "CABO" || maiusculo == "FIO" || maiusculo == "WIRE" ||
-               maiusculo == "ALAMBRE";
+        return std::any_of(palavras.begin(), palavras.end(), [&maiusculo](std::string_view p) {
+            return maiusculo == QLatin1String(p.data(), int(p.size()));
+        });
     }
     const auto igual = [nome](std::string_view palavra) {
         return nome.size() == palavra.size() &&
@@ -369,22 +371,17 @@ bool EhNomeDoNumero(std::string_view nome) {
                    return (a >= 'a' && a <= 'z' ? char(a - 'a' + 'A') : a) == b;
                });
     };
-    return igual("CABO") || igual("FIO") || igual("WIRE") || igual("ALAMBRE");
+    return std::any_of(palavras.begin(), palavras.end(), igual);
 }
 
-// Whether the attribute's name, in upper case, is one of the cable number's.
+// Whether the field's name is one of the wire number's.
+bool EhNomeDoNumero(std::string_view nome) {
+    return NomeEntre(nome, {"CABO", "FIO", "WIRE", "ALAMBRE"});
+}
+
+// Whether the attribute's name is one of the cable number's.
 bool EhNomeDoCabo(std::string_view nome) {
-    if (std::any_of(nome.begin(), nome.end(), [](char c) { return c & 0x80; })) {
-        const QString maiusculo = QString::fromUtf8(nome.data(), int(nome.size())).toUpper();
-        return maiusculo == "CABO" || maiusculo == "CABLE";
-    }
-    const auto igual = [nome](std::string_view palavra) {
-        return nome.size() == palavra.size() &&
-               std::equal(nome.begin(), nome.end(), palavra.begin(), [](char a, char b) {
-                   return (a >= 'a' && a <= 'z' ? char(a - 'a' + 'A') : a) == b;
-               });
-    };
-    return igual("CABO") || igual("CABLE");
+    return NomeEntre(nome, {"CABO", "CABLE"});
 }
 
 }  // namespace
