@@ -7,7 +7,6 @@
 #include "drawing/Dictionary.h"
 #include "drawing/Entity.h"
 #include "drawing/SmallBuffer.h"
-#include "drawing/TagValues.h"
 #include "host/sdk/Document.h"
 #include "host/sdk/LispInterface.h"
 #include "readers/ZVString.h"
@@ -146,29 +145,6 @@ CEListaXData CICad::GetXData(const OdDbObjectId& id, const QString& aplicacao) {
     return GetXData(id, U8(aplicacao).c_str());
 }
 
-namespace {
-
-// The items of the first group of each application named, from one pass over the object's
-// extended data (a span with no data for one it lacks); whether it has the first.
-bool GruposXData(const zvdb::DbObject& objeto, std::span<const std::string_view> nomes,
-                 std::vector<std::span<const zvdb::Tag>>& grupos) {
-    grupos.assign(nomes.size(), {});
-    const auto all = objeto.tags();
-    for (std::size_t i = objeto.xdataStart(); i < all.size(); ++i) {
-        if (all[i].code != 1001) continue;
-        std::size_t fim = i + 1;
-        while (fim < all.size() && all[fim].code != 1001)
-            ++fim;
-        for (std::size_t k = 0; k < nomes.size(); ++k)
-            if (!grupos[k].data() && zvdb::TagValues::sameName(all[i].value, nomes[k]))
-                grupos[k] = all.subspan(i + 1, fim - i - 1);
-        i = fim - 1;
-    }
-    return grupos.front().data() != nullptr;
-}
-
-}  // namespace
-
 std::vector<CICad::ReferenciaComXData> CICad::GetReferenciasComXData(
     const char* aplicacao, const std::vector<const char*>& outras, zvdb::Database* database) {
     std::vector<ReferenciaComXData> referencias;
@@ -176,12 +152,14 @@ std::vector<CICad::ReferenciaComXData> CICad::GetReferenciasComXData(
     if (!db || !db->modelSpace()) return referencias;
     std::vector<std::string_view> nomes{aplicacao};
     nomes.insert(nomes.end(), outras.begin(), outras.end());
-    std::vector<std::span<const zvdb::Tag>> grupos;
+    std::vector<std::span<const zvdb::Tag>> grupos(nomes.size());
     // Thousands of references name a few blocks: each name is made a QString once.
     std::unordered_map<std::string_view, QString> nomesBlocos;
     db->modelSpace()->forEachEntity([&](zvdb::Entity& entidade) {
         auto* ref = Classe<zvdb::BlockReference>(&entidade);
-        if (!ref || !GruposXData(*ref, nomes, grupos)) return;
+        if (!ref) return;
+        ref->xdataItemsOf(nomes, grupos);
+        if (!grupos.front().data()) return;
         const auto [nome, novo] = nomesBlocos.try_emplace(ref->blockName());
         if (novo) nome->second = Q(nome->first);
         ReferenciaComXData achada{Id(ref), nome->second, 0, QString(), {}};

@@ -4,8 +4,6 @@
 #include "drawing/Attribute.h"
 #include "drawing/BlockReference.h"
 #include "drawing/Entity.h"
-#include "drawing/TagList.h"
-#include "drawing/TagValues.h"
 
 #include <array>
 #include <span>
@@ -23,20 +21,7 @@ constexpr std::array<std::string_view, kAplicacoes> kNomes = {
 // The items of the first group of each application, as DbObject::xdataItems gives them.
 std::array<std::span<const zvdb::Tag>, kAplicacoes> Grupos(const zvdb::DbObject& objeto) {
     std::array<std::span<const zvdb::Tag>, kAplicacoes> grupos{};
-    std::array<bool, kAplicacoes> achado{};
-    const std::span<const zvdb::Tag> todos = objeto.tags();
-    for (std::size_t i = objeto.xdataStart(); i < todos.size(); ++i) {
-        if (todos[i].code != 1001) continue;
-        for (int a = 0; a < kAplicacoes; ++a) {
-            if (achado[a] || !zvdb::TagValues::sameName(todos[i].value, kNomes[a])) continue;
-            std::size_t fim = i + 1;
-            while (fim < todos.size() && todos[fim].code != 1001)
-                ++fim;
-            grupos[a] = todos.subspan(i + 1, fim - i - 1);
-            achado[a] = true;
-            break;
-        }
-    }
+    objeto.xdataItemsOf(kNomes, grupos);
     return grupos;
 }
 
@@ -55,39 +40,6 @@ bool Chave(const std::array<std::span<const zvdb::Tag>, kAplicacoes>& grupos,
         return true;
     }
     return false;
-}
-
-// The first value of each of two codes, where DbObject::text finds it (outside application
-// groups, before the extended data), in one walk of the object's tags; `fallback` for a code
-// that is absent.
-void DoisTextos(const zvdb::DbObject& objeto, const int (&codigos)[2],
-                const std::string_view (&fallback)[2], std::string_view (&textos)[2]) {
-    if (objeto.isPatterned()) {
-        // Its pattern answers without a walk.
-        for (int k = 0; k < 2; ++k)
-            textos[k] = objeto.text(codigos[k], fallback[k]);
-        return;
-    }
-    bool achado[2] = {false, false};
-    const std::span<const zvdb::Tag> todos = objeto.tags();
-    const std::size_t fim = zvdb::TagList::xdataStart(todos);
-    bool emGrupo = false;
-    for (std::size_t i = 1; i < fim && !(achado[0] && achado[1]); ++i) {
-        const zvdb::Tag& tag = todos[i];
-        if (zvdb::TagList::opensGroup(tag)) {
-            emGrupo = true;
-        } else if (zvdb::TagList::closesGroup(tag)) {
-            emGrupo = false;
-        } else if (!emGrupo) {
-            for (int k = 0; k < 2; ++k)
-                if (!achado[k] && tag.code == codigos[k]) {
-                    textos[k] = tag.value;
-                    achado[k] = true;
-                }
-        }
-    }
-    for (int k = 0; k < 2; ++k)
-        if (!achado[k]) textos[k] = fallback[k];
 }
 
 }  // namespace
@@ -133,8 +85,10 @@ bool CICad::LeituraSimbolo(const OdDbObjectId& entidade, CESimboloLido& lido) {
     lido.referencia = true;
     // The layer and block name (layer() and blockName()), and each attribute's tag and value
     // (tag() and textValue()), each pair in one walk.
+    static constexpr int kLayerEBloco[] = {8, 2}, kTagEValor[] = {2, 1};
+    static constexpr std::string_view kPadraoLayerEBloco[] = {"0", {}}, kSemPadrao[2] = {};
     std::string_view textos[2];
-    DoisTextos(*ref, {8, 2}, {"0", {}}, textos);
+    ref->texts(kLayerEBloco, kPadraoLayerEBloco, textos);
     lido.layer = textos[0];
     lido.bloco = textos[1];
     const zvdb::Point3 p = ref->position();
@@ -142,7 +96,7 @@ bool CICad::LeituraSimbolo(const OdDbObjectId& entidade, CESimboloLido& lido) {
     for (zvdb::Entity* sub : ref->subEntities()) {
         if (sub->isErased()) continue;
         if (auto* atributo = Classe<zvdb::Attribute>(sub)) {
-            DoisTextos(*atributo, {2, 1}, {{}, {}}, textos);
+            atributo->texts(kTagEValor, kSemPadrao, textos);
             lido.atributos.push_back({textos[0], textos[1], Id(atributo)});
         }
     }

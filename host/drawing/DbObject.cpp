@@ -254,6 +254,21 @@ std::string_view DbObject::text(int code, std::string_view fallback) const {
     return i < 0 ? fallback : tags()[static_cast<std::size_t>(i)].value;
 }
 
+void DbObject::texts(std::span<const int> codes, std::span<const std::string_view> fallbacks,
+                     std::span<std::string_view> values) const {
+    if (patterned_) {
+        for (std::size_t k = 0; k < codes.size(); ++k)
+            values[k] = text(codes[k], fallbacks[k]);
+        return;
+    }
+    const auto all = tags();
+    SmallBuffer<int, 4> found(codes.size());
+    TagList::indexesOf(all, codes, {found.data(), codes.size()});
+    for (std::size_t k = 0; k < codes.size(); ++k)
+        values[k] = found.data()[k] < 0 ? fallbacks[k]
+                                        : all[static_cast<std::size_t>(found.data()[k])].value;
+}
+
 double DbObject::real(int code, double fallback) const {
     std::string_view value;
     bool absent = false;
@@ -429,6 +444,22 @@ std::span<const Tag> DbObject::xdataItems(std::string_view application) const {
         return all.subspan(i + 1, end - i - 1);
     }
     return {};
+}
+
+void DbObject::xdataItemsOf(std::span<const std::string_view> applications,
+                            std::span<std::span<const Tag>> items) const {
+    std::fill(items.begin(), items.end(), std::span<const Tag>());
+    const auto all = tags();
+    for (std::size_t i = xdataStart(); i < all.size(); ++i) {
+        if (all[i].code != 1001) continue;
+        std::size_t end = i + 1;
+        while (end < all.size() && all[end].code != 1001)
+            ++end;
+        for (std::size_t k = 0; k < applications.size(); ++k)
+            if (!items[k].data() && TagValues::sameName(all[i].value, applications[k]))
+                items[k] = all.subspan(i + 1, end - i - 1);
+        i = end - 1;
+    }
 }
 
 namespace {

@@ -75,6 +75,9 @@ public:
     int indexOf(int code, std::size_t from = 1) const;
     bool has(int code) const { return indexOf(code) >= 0; }
     std::string_view text(int code, std::string_view fallback = {}) const;
+    // text() for each of the codes, in one walk of the tags.
+    void texts(std::span<const int> codes, std::span<const std::string_view> fallbacks,
+               std::span<std::string_view> values) const;
     double real(int code, double fallback = 0.0) const;
     long long integer(int code, long long fallback = 0) const;
     // Whether the integer under `code` reads 1. A patterned object's paper-space (67) and
@@ -109,6 +112,10 @@ public:
     // The same items as they stand in the object's tags, without a copy; valid until the
     // object changes.
     std::span<const Tag> xdataItems(std::string_view application) const;
+    // xdataItems() for each of the applications, in one walk of the extended data; one that
+    // has no group gets a span with no data.
+    void xdataItemsOf(std::span<const std::string_view> applications,
+                      std::span<std::span<const Tag>> items) const;
     std::vector<std::vector<Tag>> xdataGroups(std::string_view application) const;
     // Replaces the application's first group (later groups stay) or appends one; the
     // application is registered in the APPID table.

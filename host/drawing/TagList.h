@@ -26,6 +26,9 @@ public:
     // Index of the first tag with the code, outside application groups and before the
     // extended data, from `from` on; -1 when absent.
     static int indexOf(std::span<const Tag> all, int code, std::size_t from = 1);
+    // indexOf for each of the codes, in one walk; -1 for a code that is absent.
+    static void indexesOf(std::span<const Tag> all, std::span<const int> codes,
+                          std::span<int> found);
     // Index after the last tag of `subclass` (a subclass marker, code 100); the start of the
     // extended data when the subclass is empty or absent.
     static std::size_t subclassEnd(std::span<const Tag> all, std::string_view subclass);

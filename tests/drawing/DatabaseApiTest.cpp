@@ -713,3 +713,46 @@ TEST_F(DatabaseApi, ALargeDrawingIsSavedAsTheSameTextInPieces) {
 }
 
 }  // namespace
+
+// Several codes or applications read in one walk answer as text() and xdataItems() do one
+// by one: a group's tags and the extended data are passed over, a code absent gives its
+// fallback, and an application named in another case or missing is told apart.
+TEST_F(DatabaseApi, TextsAndGroupsReadTogetherAnswerAsOneByOne) {
+    BlockRecord* ms = db.modelSpace();
+    Polyline* line = ms->addLwPolyline({{0, 0, 0}, {1, 2, 0}}, false);
+    line->setLayer("PAGE$0001$A");
+    std::vector<Tag> grouped(line->tags().begin(), line->tags().end());
+    const Tag group[] = {tag(102, "{ZV_APP"), tag(8, "IN_GROUP"), tag(6, "DASHED"), tag(102, "}")};
+    grouped.insert(grouped.begin() + 1, std::begin(group), std::end(group));
+    line->replaceTags(grouped);
+    line->setXData("FIRST", std::vector<Tag>{tag(1000, "a"), tag(1000, "b")});
+    line->setXData("EMPTY", std::vector<Tag>{});
+    line->setXData("LAST", std::vector<Tag>{tag(1040, "8")});
+
+    const std::unique_ptr<Database> again = reloaded(db);
+    for (const DbObject* object :
+         {static_cast<const DbObject*>(line),
+          static_cast<const DbObject*>(again->entityByHandle(line->handle()))}) {
+        ASSERT_NE(object, nullptr);
+        const int codes[] = {8, 6, 1000, 90};
+        const std::string_view fallbacks[] = {"0", "BYLAYER", "none", "x"};
+        std::string_view values[4];
+        object->texts(codes, fallbacks, values);
+        for (int k = 0; k < 4; ++k)
+            EXPECT_EQ(values[k], object->text(codes[k], fallbacks[k])) << codes[k];
+        EXPECT_EQ(values[0], "PAGE$0001$A");
+        EXPECT_EQ(values[1], "BYLAYER");
+
+        const std::string_view names[] = {"last", "MISSING", "FIRST", "EMPTY"};
+        std::span<const Tag> items[4];
+        object->xdataItemsOf(names, items);
+        for (int k = 0; k < 4; ++k) {
+            const std::span<const Tag> one = object->xdataItems(names[k]);
+            EXPECT_EQ(items[k].data(), one.data()) << names[k];
+            EXPECT_EQ(items[k].size(), one.size()) << names[k];
+        }
+        EXPECT_EQ(items[1].data(), nullptr);
+        EXPECT_NE(items[3].data(), nullptr);
+        EXPECT_EQ(items[2].size(), 2u);
+    }
+}
