@@ -49,13 +49,19 @@ void TagList::indexesOf(std::span<const Tag> all, std::span<const int> codes,
     std::fill(found.begin(), found.end(), -1);
     std::size_t missing = codes.size();
     // As indexOf: a code below 1000 is looked for before the extended data only, one of
-    // 1000 and above anywhere.
-    const std::size_t xdata = xdataStart(all);
+    // 1000 and above anywhere; the extended data's start is looked for only once a tag of
+    // 1000 or above is reached.
     const bool intoXData = std::any_of(codes.begin(), codes.end(), [](int c) { return c >= 1000; });
-    const std::size_t end = intoXData ? all.size() : xdata;
+    std::size_t xdata = all.size();
+    bool xdataKnown = false;
     bool inGroup = false;
-    for (std::size_t i = 1; i < end && missing > 0; ++i) {
+    for (std::size_t i = 1; i < all.size() && missing > 0; ++i) {
         const Tag& tag = all[i];
+        if (!xdataKnown && tag.code >= 1000) {
+            xdata = xdataStart(all);
+            xdataKnown = true;
+            if (!intoXData && i >= xdata) break;
+        }
         if (opensGroup(tag)) {
             inGroup = true;
         } else if (closesGroup(tag)) {
