@@ -254,21 +254,6 @@ std::string_view DbObject::text(int code, std::string_view fallback) const {
     return i < 0 ? fallback : tags()[static_cast<std::size_t>(i)].value;
 }
 
-void DbObject::texts(std::span<const int> codes, std::span<const std::string_view> fallbacks,
-                     std::span<std::string_view> values) const {
-    if (patterned_) {
-        for (std::size_t k = 0; k < codes.size(); ++k)
-            values[k] = text(codes[k], fallbacks[k]);
-        return;
-    }
-    const auto all = tags();
-    SmallBuffer<int, 4> found(codes.size());
-    TagList::indexesOf(all, codes, {found.data(), codes.size()});
-    for (std::size_t k = 0; k < codes.size(); ++k)
-        values[k] = found.data()[k] < 0 ? fallbacks[k]
-                                        : all[static_cast<std::size_t>(found.data()[k])].value;
-}
-
 double DbObject::real(int code, double fallback) const {
     std::string_view value;
     bool absent = false;

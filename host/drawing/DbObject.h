@@ -7,6 +7,7 @@
 // only their own values until their tags are asked for.
 #include "Geometry.h"
 #include "Tag.h"
+#include "TagList.h"
 #include "TagPattern.h"
 
 #include <cstdint>
@@ -76,8 +77,9 @@ public:
     bool has(int code) const { return indexOf(code) >= 0; }
     std::string_view text(int code, std::string_view fallback = {}) const;
     // text() for each of the codes, in one walk of the tags.
-    void texts(std::span<const int> codes, std::span<const std::string_view> fallbacks,
-               std::span<std::string_view> values) const;
+    template <std::size_t N>
+    void texts(const int (&codes)[N], const std::string_view (&fallbacks)[N],
+               std::string_view (&values)[N]) const;
     double real(int code, double fallback = 0.0) const;
     long long integer(int code, long long fallback = 0) const;
     // Whether the integer under `code` reads 1. A patterned object's paper-space (67) and
@@ -185,5 +187,20 @@ private:
     std::uint64_t handle_ = 0;
     std::uint64_t owner_ = 0;
 };
+
+template <std::size_t N>
+void DbObject::texts(const int (&codes)[N], const std::string_view (&fallbacks)[N],
+                     std::string_view (&values)[N]) const {
+    if (patterned_) {
+        for (std::size_t k = 0; k < N; ++k)
+            values[k] = text(codes[k], fallbacks[k]);
+        return;
+    }
+    const auto all = tags();
+    int found[N];
+    TagList::indexesOf(all, codes, found);
+    for (std::size_t k = 0; k < N; ++k)
+        values[k] = found[k] < 0 ? fallbacks[k] : all[static_cast<std::size_t>(found[k])].value;
+}
 
 }  // namespace zvdb

@@ -1,7 +1,5 @@
 #include "TagList.h"
 
-#include <algorithm>
-
 namespace zvdb {
 
 std::size_t TagList::xdataStart(std::span<const Tag> all) {
@@ -42,38 +40,6 @@ int TagList::indexOf(std::span<const Tag> all, int code, std::size_t from) {
         }
     }
     return -1;
-}
-
-void TagList::indexesOf(std::span<const Tag> all, std::span<const int> codes,
-                        std::span<int> found) {
-    std::fill(found.begin(), found.end(), -1);
-    std::size_t missing = codes.size();
-    // As indexOf: a code below 1000 is looked for before the extended data only, one of
-    // 1000 and above anywhere; the extended data's start is looked for only once a tag of
-    // 1000 or above is reached.
-    const bool intoXData = std::any_of(codes.begin(), codes.end(), [](int c) { return c >= 1000; });
-    std::size_t xdata = all.size();
-    bool xdataKnown = false;
-    bool inGroup = false;
-    for (std::size_t i = 1; i < all.size() && missing > 0; ++i) {
-        const Tag& tag = all[i];
-        if (!xdataKnown && tag.code >= 1000) {
-            xdata = xdataStart(all);
-            xdataKnown = true;
-            if (!intoXData && i >= xdata) break;
-        }
-        if (opensGroup(tag)) {
-            inGroup = true;
-        } else if (closesGroup(tag)) {
-            inGroup = false;
-        } else if (!inGroup) {
-            for (std::size_t k = 0; k < codes.size(); ++k)
-                if (found[k] < 0 && tag.code == codes[k] && (i < xdata || codes[k] >= 1000)) {
-                    found[k] = static_cast<int>(i);
-                    --missing;
-                }
-        }
-    }
 }
 
 std::size_t TagList::subclassEnd(std::span<const Tag> all, std::string_view subclass) {

@@ -26,9 +26,10 @@ public:
     // Index of the first tag with the code, outside application groups and before the
     // extended data, from `from` on; -1 when absent.
     static int indexOf(std::span<const Tag> all, int code, std::size_t from = 1);
-    // indexOf for each of the codes, in one walk; -1 for a code that is absent.
-    static void indexesOf(std::span<const Tag> all, std::span<const int> codes,
-                          std::span<int> found);
+    // indexOf for each of the codes, in one walk; -1 for a code that is absent. (A few
+    // codes, known where asked: the walk keeps them and the answers at hand.)
+    template <std::size_t N>
+    static void indexesOf(std::span<const Tag> all, const int (&codes)[N], int (&found)[N]);
     // Index after the last tag of `subclass` (a subclass marker, code 100); the start of the
     // extended data when the subclass is empty or absent.
     static std::size_t subclassEnd(std::span<const Tag> all, std::string_view subclass);
@@ -42,5 +43,40 @@ public:
     static void setPoint(std::vector<Tag>& all, int code, const std::string_view (&values)[3],
                          std::string_view subclass, bool withZ = true);
 };
+
+template <std::size_t N>
+void TagList::indexesOf(std::span<const Tag> all, const int (&codes)[N], int (&found)[N]) {
+    std::size_t missing = N;
+    bool intoXData = false;
+    for (std::size_t k = 0; k < N; ++k) {
+        found[k] = -1;
+        intoXData = intoXData || codes[k] >= 1000;
+    }
+    // As indexOf: a code below 1000 is looked for before the extended data only, one of
+    // 1000 and above anywhere; the extended data's start is looked for only once a tag of
+    // 1000 or above is reached.
+    std::size_t xdata = all.size();
+    bool xdataKnown = false;
+    bool inGroup = false;
+    for (std::size_t i = 1; i < all.size() && missing > 0; ++i) {
+        const Tag& tag = all[i];
+        if (!xdataKnown && tag.code >= 1000) {
+            xdata = xdataStart(all);
+            xdataKnown = true;
+            if (!intoXData && i >= xdata) break;
+        }
+        if (opensGroup(tag)) {
+            inGroup = true;
+        } else if (closesGroup(tag)) {
+            inGroup = false;
+        } else if (!inGroup) {
+            for (std::size_t k = 0; k < N; ++k)
+                if (found[k] < 0 && tag.code == codes[k] && (i < xdata || codes[k] >= 1000)) {
+                    found[k] = static_cast<int>(i);
+                    --missing;
+                }
+        }
+    }
+}
 
 }  // namespace zvdb
