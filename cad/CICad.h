@@ -11,6 +11,7 @@
 #include <functional>
 #include <memory>
 #include <optional>
+#include <span>
 #include <string_view>
 #include <vector>
 
@@ -242,6 +243,9 @@ public:
     // order, gathered in one walk.
     static std::vector<OdDbObjectId> GetEntidadesComXData(const QString& aplicacao,
                                                           zvdb::Database* database = nullptr);
+    // The same for several applications in one walk: one list per application, as given.
+    static std::vector<std::vector<OdDbObjectId>> GetEntidadesComXData(
+        std::span<const std::string_view> aplicacoes, zvdb::Database* database = nullptr);
     // The block references of model space that carry the application's extended data, in
     // drawing order, from one walk: each with its block's name as spelt, the first item of
     // its data (code 0 when the data has no items) and the items of each of the `outras`

@@ -178,6 +178,22 @@ std::vector<OdDbObjectId> CICad::GetEntidadesComXData(const QString& aplicacao,
     return ids;
 }
 
+std::vector<std::vector<OdDbObjectId>> CICad::GetEntidadesComXData(
+    std::span<const std::string_view> aplicacoes, zvdb::Database* database) {
+    std::vector<std::vector<OdDbObjectId>> ids(aplicacoes.size());
+    zvdb::Database* db = Db(database);
+    if (!db || !db->modelSpace() || aplicacoes.empty()) return ids;
+    // Each entity's extended data is walked once for all the names; a group found, even an
+    // empty one, counts, as it does for one name.
+    std::vector<std::span<const zvdb::Tag>> grupos(aplicacoes.size());
+    db->modelSpace()->forEachEntity([&](zvdb::Entity& entidade) {
+        entidade.xdataItemsOf(aplicacoes, grupos);
+        for (std::size_t k = 0; k < grupos.size(); ++k)
+            if (grupos[k].data()) ids[k].push_back(Id(&entidade));
+    });
+    return ids;
+}
+
 std::vector<std::pair<QString, OdDbObjectId>> CICad::GetEntradasDicionario(
     const QStringList& caminho, zvdb::Database* database) {
     std::vector<std::pair<QString, OdDbObjectId>> entradas;

@@ -113,6 +113,10 @@ private:
                              const TabelaConexoes::Textos& elementos, int indice,
                              CETemplate* modelo, const QString& numero);
     void CarregaTransicoes();
+    // The entities with each extended data the layout readings look for, from one walk of
+    // the drawing; a reading that comes after the drawing changed walks again.
+    enum ComXData { kRotas, kPaineis, kEsquemas, kTransicoes, kComXData };
+    std::vector<OdDbObjectId> EntidadesCom(ComXData qual);
     // What ComporRelacaoFio does, given the connection's value (empty without one).
     void ComporRelacao(const QString& sufixo, CEItemLista& item, CETemplate* modelo,
                        const QString& lig);
@@ -185,4 +189,6 @@ private:
     QHash<QString, QString> layoutPorRelacao_;
     std::vector<std::pair<OdDbObjectId, OdDbObjectId>> transicoes_;
     bool layoutCarregado_ = false, layoutMapeado_ = false, transicoesCarregadas_ = false;
+    std::vector<std::vector<OdDbObjectId>> comXData_;
+    std::uint64_t versaoComXData_ = 0;
 };

@@ -60,10 +60,23 @@ size_t CCFioDataReader::HashMedida::operator()(const Medida& m) const {
     return h;
 }
 
+std::vector<OdDbObjectId> CCFioDataReader::EntidadesCom(ComXData qual) {
+    // The routes, the panels, the schematic views and the transitions are each read once a
+    // run, in turn; one walk finds them all while nothing in the drawing changes.
+    static constexpr std::string_view kAplicacoes[kComXData] = {
+        "KVR_ZV_WIRE_LAYOUT", "KVR_LAYOUT_PAINEL", "KVR_LAYOUT_ESQUEMA", "KVR_ZV_TRANSITION"};
+    const std::uint64_t versao = CICad::VersaoDesenho();
+    if (comXData_.empty() || versao != versaoComXData_) {
+        comXData_ = CICad::GetEntidadesComXData(kAplicacoes);
+        versaoComXData_ = versao;
+    }
+    return comXData_[qual];
+}
+
 void CCFioDataReader::CarregaLayout() {
     if (layoutCarregado_) return;
     layoutCarregado_ = true;
-    for (const OdDbObjectId& id : CICad::GetEntidadesComXData("KVR_ZV_WIRE_LAYOUT")) {
+    for (const OdDbObjectId& id : EntidadesCom(kRotas)) {
         if (!CICad::EhPolilinha(id)) continue;
         const QString chave = PrimeiroTexto(id, "KVR_ZV_WIRE_LAYOUT");
         if (chave.isEmpty()) continue;
@@ -71,7 +84,7 @@ void CCFioDataReader::CarregaLayout() {
         rotasLayoutFio_.insert(rotasLayoutFio_.contains(chave) ? chave + "$" : chave,
                                ZVString::DeHandle(id.handle()));
     }
-    for (const OdDbObjectId& id : CICad::GetEntidadesComXData("KVR_LAYOUT_PAINEL")) {
+    for (const OdDbObjectId& id : EntidadesCom(kPaineis)) {
         if (!CICad::EhReferencia(id)) continue;
         const QString chave = PrimeiroTexto(id, "KVR_LAYOUT_PAINEL");
         if (!chave.isEmpty()) paineisLayout_.insert(chave, ZVString::DeHandle(id.handle()));
@@ -84,7 +97,7 @@ void CCFioDataReader::MapeiaLayout(CETemplate* modelo) {
     layoutMapeado_ = true;
     // Only the symbols with a layout view can enter the map, so only they are looked at.
     const OdDbObjectId modelSpace = CICad::GetModelSpace();
-    for (const OdDbObjectId& ref : CICad::GetEntidadesComXData("KVR_LAYOUT_ESQUEMA")) {
+    for (const OdDbObjectId& ref : EntidadesCom(kEsquemas)) {
         if (!CICad::EhReferencia(ref) || CICad::GetDono(ref) != modelSpace) continue;
         if (ChaveDaEntidade(ref).isEmpty()) continue;  // no item, no entry
         const QString bloco = CICad::GetNomeBloco(ref);
@@ -173,7 +186,7 @@ bool CCFioDataReader::PosicaoLayout(const QString& elemento, const QString& cone
 void CCFioDataReader::CarregaTransicoes() {
     if (transicoesCarregadas_) return;
     transicoesCarregadas_ = true;
-    for (const OdDbObjectId& id : CICad::GetEntidadesComXData("KVR_ZV_TRANSITION")) {
+    for (const OdDbObjectId& id : EntidadesCom(kTransicoes)) {
         if (!CICad::EhReferencia(id)) continue;
         if (PrimeiroTexto(id, "KVR_ZV_REPRESENTACAO") != "-50") continue;
         // A transition whose partner is gone pairs with nothing.

@@ -936,3 +936,34 @@ TEST_F(FacadeFixture, ASymbolsReadingGivesWhatItsEntitiesSay) {
         confere(*lido2, *lida);
     }
 }
+
+TEST_F(FacadeFixture, EntitiesWithSeveralApplicationsComeFromOneWalkAsFromOneEach) {
+    // References, a line and a nested reference; names that differ in case, one that is the
+    // start of another, an empty group, and a name nothing carries.
+    zvdb::BlockRecord* borne = db().createBlock("Borne1");
+    std::vector<zvdb::Entity*> feitas;
+    for (int i = 0; i < 5; ++i)
+        feitas.push_back(db().modelSpace()->addBlockReference(*borne, {10.0 * i, 0, 0}));
+    feitas.push_back(db().modelSpace()->addLine({0, 0, 0}, {1, 1, 0}));
+    zvdb::BlockReference* aninhada = db().createBlock("GRUPO")->addBlockReference(*borne, {});
+    const auto id = [this](const zvdb::DbObject* o) { return OdDbObjectId(&db(), o->handle()); };
+    CICad::SetXData(id(feitas[0]), "KVR_ZV_WIRE", {{1000, "W"}});
+    CICad::SetXData(id(feitas[1]), "kvr_zv", {{1000, "a"}});
+    CICad::SetXData(id(feitas[1]), "KVR_ZV_WIRE", {{1000, "b"}});
+    CICad::SetXData(id(feitas[2]), "OUTRA", {});
+    CICad::SetXData(id(feitas[3]), "KVR_ZV", {{1070, "3"}});
+    CICad::SetXData(id(feitas[5]), "KVR_ZV_WIRE", {{1000, "L"}});
+    CICad::SetXData(id(aninhada), "KVR_ZV", {{1000, "dentro"}});
+    const std::string_view nomes[] = {"KVR_ZV", "KVR_ZV_WIRE", "OUTRA", "NENHUMA"};
+    const auto juntas = CICad::GetEntidadesComXData(nomes, &db());
+    ASSERT_EQ(juntas.size(), 4u);
+    for (size_t k = 0; k < 4; ++k)
+        EXPECT_EQ(juntas[k], CICad::GetEntidadesComXData(
+                                 QString::fromLatin1(nomes[k].data(), int(nomes[k].size())), &db()))
+            << nomes[k];
+    EXPECT_EQ(juntas[0], (std::vector<OdDbObjectId>{id(feitas[1]), id(feitas[3])}));
+    EXPECT_EQ(juntas[1], (std::vector<OdDbObjectId>{id(feitas[0]), id(feitas[1]), id(feitas[5])}));
+    EXPECT_EQ(juntas[2], std::vector<OdDbObjectId>{id(feitas[2])});
+    EXPECT_TRUE(juntas[3].empty());
+    EXPECT_TRUE(CICad::GetEntidadesComXData(std::span<const std::string_view>(), &db()).empty());
+}
