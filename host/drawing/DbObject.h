@@ -59,6 +59,8 @@ public:
     std::span<const Tag> patternedXData() const {
         return patterned_ ? pattern_->xdata() : std::span<const Tag>();
     }
+    // A patterned object's pattern and values (null for others).
+    const TagPattern::Values* patternValues() const { return patterned_ ? pattern_ : nullptr; }
     // Each tag in order, as tags() would give them.
     template <class Visit>
     void forEachTag(Visit&& visit) const {

@@ -66,7 +66,8 @@ void DxfWriter::prepare() {
     codePage_ = std::string(db_.header_.text("$DWGCODEPAGE", "ANSI_1252"));
 }
 
-void DxfWriter::tag(int code, std::string_view value) {
+// Inlined: the writer calls these for every tag of the drawing.
+[[gnu::always_inline]] inline void DxfWriter::appendCode(std::string& out, int code) {
     char buffer[16];
     int n = 0;
     char digits[16];
@@ -82,13 +83,75 @@ void DxfWriter::tag(int code, std::string_view value) {
     while (n)
         buffer[len++] = digits[--n];
     buffer[len++] = '\n';
-    out_.append(buffer, static_cast<std::size_t>(len));
+    out.append(buffer, static_cast<std::size_t>(len));
+}
+
+[[gnu::always_inline]] inline void DxfWriter::appendValue(std::string& out,
+                                                          std::string_view value) const {
     if (legacyEncoding_ && !TextCodec::isAscii(value)) {
-        out_ += TextCodec::fromUtf8(value, codePage_);
+        out += TextCodec::fromUtf8(value, codePage_);
     } else {
-        out_.append(value);
+        out.append(value);
     }
+}
+
+void DxfWriter::tag(int code, std::string_view value) {
+    appendCode(out_, code);
+    appendValue(out_, value);
     out_ += '\n';
+    if (sink_ && out_.size() >= kChunk) flush();
+}
+
+const DxfWriter::PatternText& DxfWriter::patternText(const TagPattern& pattern) {
+    const auto [at, made] = patternTexts_.try_emplace(&pattern);
+    PatternText& rendered = at->second;
+    if (!made) return rendered;
+    std::size_t begin = 0;
+    pattern.forEachItem(
+        [&](int code, TagPattern::Kind kind, std::uint8_t hole, std::string_view value) {
+            appendCode(rendered.text, code);
+            if (kind == TagPattern::Kind::Fixed) {
+                appendValue(rendered.text, value);
+                rendered.text += '\n';
+                return;
+            }
+            const std::size_t end = rendered.text.size();
+            rendered.pieces.push_back({static_cast<std::uint32_t>(begin),
+                                       static_cast<std::uint32_t>(end - begin), kind, hole});
+            begin = end;
+        });
+    rendered.pieces.push_back({static_cast<std::uint32_t>(begin),
+                               static_cast<std::uint32_t>(rendered.text.size() - begin),
+                               TagPattern::Kind::Fixed, 0});
+    return rendered;
+}
+
+// The objects a command made are mostly patterned: their fixed tags go out as the runs of
+// text made once per pattern, and only their own values are written one by one.
+void DxfWriter::writePatterned(const DbObject& object, const TagPattern::Values& values) {
+    const TagPattern& pattern = *values.pattern;
+    const PatternText& rendered = patternText(pattern);
+    for (const PatternText::Piece& piece : rendered.pieces) {
+        out_.append(rendered.text, piece.begin, piece.size);
+        switch (piece.value) {
+            case TagPattern::Kind::Fixed:
+                continue;
+            case TagPattern::Kind::Hole:
+                appendValue(out_, pattern.holeValue(values, piece.hole));
+                break;
+            case TagPattern::Kind::Handle:
+            case TagPattern::Kind::Owner: {
+                char buffer[20];
+                const bool handle = piece.value == TagPattern::Kind::Handle;
+                out_.append(
+                    TagPattern::hexText(handle ? object.handle() : object.ownerHandle(), buffer));
+                break;
+            }
+        }
+        out_ += '\n';
+    }
+    for (const Tag& item : values.xdata())
+        tag(item.code, item.value);
     if (sink_ && out_.size() >= kChunk) flush();
 }
 
@@ -150,8 +213,8 @@ void DxfWriter::writeRaw(const std::string& name) {
 
 void DxfWriter::writeObject(const DbObject& object) {
     if (object.isErased()) return;
-    if (object.isPatterned()) {
-        object.forEachTag([this](int code, std::string_view value) { tag(code, value); });
+    if (const TagPattern::Values* values = object.patternValues()) {
+        writePatterned(object, *values);
         return;
     }
     const auto tags = object.tags();

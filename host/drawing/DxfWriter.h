@@ -3,9 +3,13 @@
 // $HANDSEED above all handles, every extended-data application registered, table counts
 // brought up to date. Files before R2007 are written in their code page, with \U+XXXX for
 // characters it lacks; R2007 and later in UTF-8.
+#include <cstdint>
 #include <string>
+#include <unordered_map>
+#include <vector>
 
 #include "Tag.h"
+#include "TagPattern.h"
 
 namespace zvsdk {
 class AtomicFile;
@@ -35,6 +39,22 @@ private:
     void writeObject(const class DbObject& object);
     void writeEntity(const class Entity& entity);
     void tag(int code, std::string_view value);
+    // A tag's code line, and a value in the file's encoding (without its line end).
+    static void appendCode(std::string& out, int code);
+    void appendValue(std::string& out, std::string_view value) const;
+    // A pattern's tags as text in the file's encoding, made at its first object: each run
+    // of fixed tags is one text, and an object's own values go between the runs.
+    struct PatternText {
+        struct Piece {
+            std::uint32_t begin, size;  // the run of text before the value
+            TagPattern::Kind value;     // Fixed: the run is the pattern's last
+            std::uint8_t hole;
+        };
+        std::string text;
+        std::vector<Piece> pieces;
+    };
+    const PatternText& patternText(const TagPattern& pattern);
+    void writePatterned(const DbObject& object, const TagPattern::Values& values);
     void flush();
     void writeTableHead(const class SymbolTable& table);
     bool isErasedObject(const Tag& pointer) const;
@@ -45,6 +65,7 @@ private:
     zvsdk::AtomicFile* sink_ = nullptr;
     bool legacyEncoding_ = false;
     std::string codePage_;
+    std::unordered_map<const TagPattern*, PatternText> patternTexts_;
 };
 
 }  // namespace zvdb

@@ -52,6 +52,23 @@ public:
     // Room for an object's values, every hole empty until the caller fills it in.
     Values* make(StringArena& arena) const;
 
+    // What a tag of the pattern holds: a value of its own, or one each object gives (a
+    // hole's, its handle, its owner).
+    enum class Kind : std::uint8_t { Fixed, Hole, Handle, Owner };
+    // Each tag of the pattern in order: its code, what it holds, the hole's number (for a
+    // hole) and the value (for a fixed tag).
+    template <class Visit>
+    void forEachItem(Visit&& visit) const {
+        for (const Item& item : items_)
+            visit(int(item.code), item.kind, item.hole, item.value);
+    }
+    // The value an object gives one of the pattern's holes.
+    std::string_view holeValue(const Values& values, std::size_t hole) const {
+        return (*texts_)[values.values()[hole]];
+    }
+    // Upper-case hexadecimal, as handles are written.
+    static std::string_view hexText(std::uint64_t value, char (&buffer)[20]);
+
     // Each tag with its holes filled, in order. Handle and owner text is made on the spot
     // and lives for the call only.
     template <class Visit>
@@ -94,16 +111,12 @@ public:
     int attributesFollowFlag() const { return attributesFollow_; }
 
 private:
-    enum class Kind : std::uint8_t { Fixed, Hole, Handle, Owner };
     struct Item {
         std::int16_t code;
         Kind kind;
         std::uint8_t hole;
         std::string_view value;
     };
-    // Upper-case hexadecimal, as handles are written.
-    static std::string_view hexText(std::uint64_t value, char (&buffer)[20]);
-
     // Where a Values' extended data is kept, after its numbers.
     std::size_t xdataOffset() const;
 

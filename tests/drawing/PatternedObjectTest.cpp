@@ -119,6 +119,30 @@ TEST(PatternedObjects, TheWriterGivesTheSameTextAsTheWholeTags) {
     EXPECT_EQ(DxfWriter::toText(db), patterned);
 }
 
+TEST(PatternedObjects, TheWriterGivesTheSameTextAsTheWholeTagsInEitherEncoding) {
+    // An older file writes texts outside ASCII in its code page: fixed tags (a tag name) and
+    // values given or taken from the definition, in the pattern's text and beside it.
+    for (const std::string version : {"AC1015", "AC1024"}) {
+        Database db;
+        db.setVersion(version);
+        BlockRecord* block = sampleBlock(db);
+        block->addAttributeDefinition("AÇÃO", "", "padrão", {0, 15, 0}, 1.0, "ATTS");
+        fill(db, *block);
+        const Made made =
+            insert(db, *block, {5, 5, 0}, {1, 1, 1}, 0, false, {"ação", "Ω", "", "ü", "€"});
+        made.attributes[1]->setXData("ZV_PATTERN_TEST", std::vector<Tag>{{1000, "café"}});
+        const std::string patterned = DxfWriter::toText(db);
+        EXPECT_GT(patternedCount(db), 25u);
+        expandAll(db);
+        EXPECT_EQ(patternedCount(db), 0u);
+        EXPECT_EQ(DxfWriter::toText(db), patterned) << version;
+        const bool legacy = version == "AC1015";
+        EXPECT_EQ(patterned.find("ação") != std::string::npos, !legacy) << version;
+        EXPECT_EQ(patterned.find("a\xE7\xE3o") != std::string::npos, legacy) << version;
+        EXPECT_EQ(patterned.find("A\xC7\xC3O") != std::string::npos, legacy) << version;
+    }
+}
+
 TEST(PatternedObjects, TagsAreThoseOfTheStepByStepAttribute) {
     Database db;
     BlockRecord* block = sampleBlock(db);
