@@ -36,6 +36,8 @@ constexpr int kMsgArquivoBloco = 974;
 constexpr int kMsgNadaADesenhar = 975;
 constexpr int kMsgDesenhado = 976;
 constexpr int kMsgJaDesenhados = 977;
+// Items freed per hand-over to the freeing thread once their blocks are in.
+constexpr std::size_t kLoteInseridos = 4096;
 
 const char* const kAppSimbolo = "KVR_ZV";
 const char* const kAppRepresentacao = "KVR_ZV_REPRESENTACAO";
@@ -588,6 +590,7 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     Descarte::Largar(paginasComuns);
     progresso.Definir(75);
     if (!paginasBornes.empty()) Desenha(paginasBornes, posicoesBornes);
+    EntregaInseridos();
     Descarte::Largar(posicoesBornes);
     Descarte::Largar(paginasBornes);
     CICad::zvInvokeVoid("atualizaTopografico");
@@ -1045,9 +1048,19 @@ void CCDiagramaTopografico::Insere(const QString& chave, PaginaFeita& pagina,
         semLigacoes = comAcessorioLigado_.insert(candidato->simbolo.handle()).second;
     char digitos[16];
     LigaSimbolo(candidato->simbolo, prefixo, TextoHandle(ref.handle(), digitos), semLigacoes);
-    // Each item goes in once: it gives its room to the blocks that follow.
+    // Each item goes in once: it gives its room to the blocks that follow, a batch at a time.
     lido->item = nullptr;
-    delete item;
+    itensInseridos_.itens.push_back(item);
+    if (itensInseridos_.itens.size() >= kLoteInseridos) EntregaInseridos();
+}
+
+CCDiagramaTopografico::Inseridos::~Inseridos() {
+    for (CEItemLista* item : itens)
+        delete item;
+}
+
+void CCDiagramaTopografico::EntregaInseridos() {
+    Descarte::Descartar(std::exchange(itensInseridos_, {}));
 }
 
 void CCDiagramaTopografico::LigaSimbolo(const OdDbObjectId& simbolo, const QString& lugar,

@@ -175,6 +175,16 @@ private:
     Extensoes extensoes_;
     QHash<QString, double> passos_;
     QHash<QString, Lido> itensPorHandle_;
+    // Items whose blocks went in, freed a batch at a time on the module's freeing thread.
+    struct Inseridos {
+        std::vector<CEItemLista*> itens;
+        Inseridos() = default;
+        Inseridos(Inseridos&&) noexcept = default;
+        Inseridos& operator=(Inseridos&&) noexcept = default;
+        ~Inseridos();
+    };
+    Inseridos itensInseridos_;
+    void EntregaInseridos();
     // The owners of accessories, read once each; null for one that gives no listed item.
     QHash<QString, std::shared_ptr<const CEItemLista>> donos_;
     // The symbols that have accessories among the candidates.
