@@ -3,6 +3,7 @@
 // (terminals, components, accessories, wires, ferrules, cables), each marked with its kind
 // in ZV_LISTA_TIPO; a wire's item also learns what stands at its two ends.
 #include "CCMaterialDataReader.h"
+#include "TabelaChaves.h"
 
 #include <optional>
 
@@ -48,7 +49,7 @@ protected:
                           VetorItens& itens);
 
     // Component relations to the handle whose fields stand for the component.
-    QHash<QString, QString> relacoesComponentes_;
+    TabelaChaves<QString, QString> relacoesComponentes_;
     // Whether the components' accessories follow them; a reader that keeps only components
     // and terminals leaves them unread.
     bool lerAcessorios_ = true;
