@@ -107,12 +107,18 @@ QString CCBorneDataReader::SufixoFio(const CEItemLista& borne, bool insercao) {
 // The insertion side looks forward first, the cut side backward first, so that the two
 // sides take different neighbours on a wire that passes straight through the terminal.
 CCBorneDataReader::LadoBorne CCBorneDataReader::AchaLado(CCDataReader& leitor,
-                                                         const OdDbObjectId& borne, bool insercao) {
+                                                         const OdDbObjectId& borne, bool insercao,
+                                                         const LadoBorne* oposto) {
     LadoBorne lado;
-    const CEPonto p = CICad::GetPosicao(borne);
-    const CEPonto q = leitor.PontoDeCorte(borne);
-    lado.ponto = insercao ? p : q;
-    lado.outro = insercao ? q : p;
+    if (oposto) {
+        lado.ponto = oposto->outro;
+        lado.outro = oposto->ponto;
+    } else {
+        const CEPonto p = CICad::GetPosicao(borne);
+        const CEPonto q = leitor.PontoDeCorte(borne);
+        lado.ponto = insercao ? p : q;
+        lado.outro = insercao ? q : p;
+    }
     // The wire at the point and its entries are found once for both directions, the
     // element's handle and its point.
     const OdDbObjectId fio = leitor.FioNoPonto(leitor.LayerDe(borne), lado.ponto);

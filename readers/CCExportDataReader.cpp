@@ -322,7 +322,7 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
                                  CETemplate* modelo, bool inicio) {
     // What the first side of a terminal left for its second side counts for the very next
     // call only.
-    const FiosLidos fiosLidos = std::exchange(fiosLidos_, FiosLidos{});
+    const PrimeiroLado primeiro = std::exchange(primeiroLado_, PrimeiroLado{});
     if (entidade.isNull() || !EhBorne(entidade)) return;
     // An inverted wire keeps its ends; any other wire has them the other way round.
     const QString* marca = item.campos.procura(NumeroCampo<"INVERTIDO">());
@@ -343,10 +343,16 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
     CEPonto ponto, outro;
     QString fio, conectado;
     std::optional<CCBorneDataReader::LadoBorne> lado;
+    // The second side of a terminal finds its points and kind where the first left them.
+    const bool segundoLado = doBorne && !inicio && primeiro.De(item, entidade);
+    bool equipamento = false;
     if (doBorne) {
         // The terminal's own side: the insertion point for the first hook, the cut point
         // for the second, looked at as the terminal list does.
-        lado = CCBorneDataReader::AchaLado(*this, entidade, inicio);
+        lado = CCBorneDataReader::AchaLado(*this, entidade, inicio,
+                                           segundoLado ? &*primeiro.lado : nullptr);
+        equipamento = segundoLado ? primeiro.equipamento : CICad::TemXData(entidade, kEquipo);
+        if (inicio) primeiroLado_ = PrimeiroLado{&item, entidade, lado, equipamento, false};
         if (lado->vizinho.isEmpty()) return;
         ponto = lado->ponto;
         outro = lado->outro;
@@ -366,10 +372,11 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
         outro = distancia(ponto, p) <= distancia(ponto, q) ? q : p;
         conectado = VizinhoNaConexao(entidade, ponto, true);
         if (conectado.isEmpty()) conectado = VizinhoNaConexao(entidade, ponto, false);
+        equipamento = CICad::TemXData(entidade, kEquipo);
     }
     // An equipment's points may lie closer together than a wire's catch: its connection
     // name tells which of its entries on the wire this end is.
-    if (CICad::TemXData(entidade, kEquipo)) {
+    if (equipamento) {
         const zv::CEAtributo* propria = ConexaoProxima(entidade, ponto);
         if (propria && !propria->GetValor().isEmpty()) {
             const QString achado =
@@ -398,9 +405,9 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
     if (lado) {
         // Both sides read the same two wires under the same suffixes: when the first side
         // read them, the second finds them on the item.
-        const bool lidos = !inicio && fiosLidos.item == &item && fiosLidos.borne == entidade;
+        const bool lidos = segundoLado && primeiro.fiosLidos;
         if (!lidos) CCBorneDataReader::LeFiosLado(*this, item, entidade, *lado, inicio, modelo);
-        if (inicio && EhFioNumerado(lado->fio)) fiosLidos_ = FiosLidos{&item, entidade};
+        if (inicio && EhFioNumerado(lado->fio)) primeiroLado_.fiosLidos = true;
     } else {
         const OdDbObjectId fioOutro = FioNoPonto(CICad::GetLayerEntidade(entidade), outro);
         if (!fioOutro.isNull())
