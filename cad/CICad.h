@@ -143,6 +143,9 @@ public:
     static bool GetBlocoId(const QString& nome, OdDbObjectId& id,
                            zvdb::Database* database = nullptr);
     static QString GetNomeBloco(const OdDbObjectId& referencia);
+    // The same name as the drawing holds it (UTF-8), valid until the reference changes; empty
+    // for what is no block reference.
+    static std::string_view NomeBlocoUtf8(const OdDbObjectId& referencia);
     static OdDbObjectId CarregaBloco(const QString& nome, const QString& arquivo);
     static bool RecarregaBloco(const QString& arquivo, const QString& nome);
     // RecarregaBloco for each (file, block name) pair in order, the references of all the

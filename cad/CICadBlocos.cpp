@@ -186,6 +186,11 @@ QString CICad::GetNomeBloco(const OdDbObjectId& referencia) {
     return ref ? Q(ref->blockName()) : QString();
 }
 
+std::string_view CICad::NomeBlocoUtf8(const OdDbObjectId& referencia) {
+    auto* ref = Como<zvdb::BlockReference>(referencia);
+    return ref ? ref->blockName() : std::string_view();
+}
+
 OdDbObjectId CICad::CarregaBloco(const QString& nome, const QString& arquivo) {
     zvdb::Database* db = GetDatabase();
     if (!db || !ExisteArquivo(arquivo)) return {};

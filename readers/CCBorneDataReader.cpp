@@ -1,6 +1,7 @@
 #include "CCBorneDataReader.h"
 
 #include "CEAtributo.h"
+#include "TabelaChaves.h"
 #include "lists/CETemplate.h"
 #include "module/CIProgress.h"
 
@@ -106,12 +107,18 @@ QString CCBorneDataReader::SufixoFio(const CEItemLista& borne, bool insercao) {
 // The insertion side looks forward first, the cut side backward first, so that the two
 // sides take different neighbours on a wire that passes straight through the terminal.
 CCBorneDataReader::LadoBorne CCBorneDataReader::AchaLado(CCDataReader& leitor,
-                                                         const OdDbObjectId& borne, bool insercao) {
+                                                         const OdDbObjectId& borne, bool insercao,
+                                                         const LadoBorne* oposto) {
     LadoBorne lado;
-    const CEPonto p = CICad::GetPosicao(borne);
-    const CEPonto q = leitor.PontoDeCorte(borne);
-    lado.ponto = insercao ? p : q;
-    lado.outro = insercao ? q : p;
+    if (oposto) {
+        lado.ponto = oposto->outro;
+        lado.outro = oposto->ponto;
+    } else {
+        const CEPonto p = CICad::GetPosicao(borne);
+        const CEPonto q = leitor.PontoDeCorte(borne);
+        lado.ponto = insercao ? p : q;
+        lado.outro = insercao ? q : p;
+    }
     // The wire at the point and its entries are found once for both directions, the
     // element's handle and its point.
     const OdDbObjectId fio = leitor.FioNoPonto(leitor.LayerDe(borne), lado.ponto);
@@ -406,27 +413,27 @@ public:
             numero_[i] = CamposItem::numeroSeHouver(Nomes().numeros[i]);
             indice_[i].reserve(itens.size());
         }
+        // The first item of a key keeps it.
         for (CEItemLista* item : itens)
-            for (int i = 0; item && i < 3; ++i)
-                indice_[i].insert({{Valor(*item, regua_[i]), Valor(*item, numero_[i])}, item});
+            for (int i = 0; item && i < 3; ++i) {
+                CEItemLista*& primeiro =
+                    indice_[i][{Valor(*item, regua_[i]), Valor(*item, numero_[i])}];
+                if (!primeiro) primeiro = item;
+            }
     }
     CEItemLista* Busca(const CEItemLista& de, int idioma, const QString& numero) const {
-        auto it = indice_[idioma].find({Valor(de, regua_[idioma]), numero});
-        return it == indice_[idioma].end() ? nullptr : it->second;
+        return indice_[idioma].value({Valor(de, regua_[idioma]), numero});
     }
 
 private:
     using Chave = CCBorneDataReader::ChaveBorne;
-    struct HashChave {
-        size_t operator()(const Chave& c) const { return qHash(c); }
-    };
     // The item's value under the name's number; empty when it has none.
     static QString Valor(const CEItemLista& item, std::uint32_t nome) {
         const QString* valor = nome == CamposItem::kSemNome ? nullptr : item.campos.procura(nome);
         return valor ? *valor : QString();
     }
     std::uint32_t regua_[3], numero_[3];
-    std::unordered_map<Chave, CEItemLista*, HashChave> indice_[3];
+    TabelaChaves<Chave, CEItemLista*> indice_[3];
 };
 
 // The terminals bridged to `inicio`, followed through their own jumper texts, depth first.

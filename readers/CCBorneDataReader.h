@@ -57,7 +57,10 @@ public:
     // the exports, which draw no jumpers, do not.
     bool AvisaNumerosRepetidos = true;
 
-    static LadoBorne AchaLado(CCDataReader& leitor, const OdDbObjectId& borne, bool insercao);
+    // The side at the insertion point, or at the cut point. `oposto`, the terminal's other
+    // side when it was found already, lends its two points.
+    static LadoBorne AchaLado(CCDataReader& leitor, const OdDbObjectId& borne, bool insercao,
+                              const LadoBorne* oposto = nullptr);
     // The wires at the terminal's two points under their suffixes, when the side's wire is
     // a numbered one.
     static void LeFiosLado(CCDataReader& leitor, CEItemLista& item, const OdDbObjectId& borne,

@@ -12,6 +12,7 @@
 #include <array>
 #include <cmath>
 #include <memory>
+#include <string_view>
 #include <utility>
 
 namespace {
@@ -76,9 +77,21 @@ NomesRelacao& Nomes(const QString& sufixo) {
     return porSufixo.insert(sufixo, n).value();
 }
 
-bool EhBorne(const QString& nomeBloco) {
-    return nomeBloco.startsWith(QLatin1String("BORNE"), Qt::CaseInsensitive) ||
-           nomeBloco.startsWith(QLatin1String("BOR-"), Qt::CaseInsensitive);
+// Whether the block name, as the drawing holds it, starts with the upper-case ASCII prefix in
+// any case: no text is made for the name, asked at every terminal's side and neighbour.
+bool ComecaCom(std::string_view nome, std::string_view prefixo) {
+    if (nome.size() < prefixo.size()) return false;
+    for (size_t i = 0; i < prefixo.size(); ++i) {
+        const char c = nome[i];
+        if ((c >= 'a' && c <= 'z' ? char(c - 'a' + 'A') : c) != prefixo[i]) return false;
+    }
+    return true;
+}
+
+// A terminal's reference: its block is BORNE... or BOR-...
+bool EhBorne(const OdDbObjectId& id) {
+    const std::string_view nome = CICad::NomeBlocoUtf8(id);
+    return ComecaCom(nome, "BORNE") || ComecaCom(nome, "BOR-");
 }
 
 // The exports read without a template: the readers they borrow ask it for separators,
@@ -206,12 +219,12 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
     static const QString kBorne = QStringLiteral("BORNE"), kComp = QStringLiteral("COMP");
     const std::uint32_t tipoCampo = NumeroCampo<"ZV_LISTA_TIPO">();
     const std::uint32_t handleCampo = NumeroCampo<"HANDLE">();
+    std::array<NomeCampo, 3>& relacoes = Nomes(QString()).relacoes;
     for (CEItemLista* item : resultado_) {
         if (!item) continue;
         const QString* tipo = item->campos.procura(tipoCampo);
         if (!tipo || tipo->isEmpty()) {
-            const bool borne = !item->ids.empty() && CICad::EhReferencia(item->ids.front()) &&
-                               EhBorne(CICad::GetNomeBloco(item->ids.front()));
+            const bool borne = !item->ids.empty() && EhBorne(item->ids.front());
             // An array made to measure when its item was kept grows by exactly the kind, its
             // fields moved once, not to twice its size and back; a terminal's grows with its
             // sides below.
@@ -225,11 +238,13 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
             tipo = item->campos.procura(tipoCampo);
         }
         if (*tipo == kComp) {
-            const QString relacao = Primeiro(*item, Nomes(QString()).relacoes);
+            const QString relacao = Primeiro(*item, relacoes);
             const QString* handle = item->campos.procura(handleCampo);
-            if (!relacao.isEmpty() && handle && !handle->isEmpty() &&
-                !relacoesComponentes_.contains(relacao))
-                relacoesComponentes_.insert(relacao, *handle);
+            // The first component of a relation keeps it.
+            if (!relacao.isEmpty() && handle && !handle->isEmpty()) {
+                QString& dono = relacoesComponentes_[relacao];
+                if (dono.isEmpty()) dono = *handle;
+            }
         }
         itens.push_back(item);
     }
@@ -307,9 +322,8 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
                                  CETemplate* modelo, bool inicio) {
     // What the first side of a terminal left for its second side counts for the very next
     // call only.
-    const FiosLidos fiosLidos = std::exchange(fiosLidos_, FiosLidos{});
-    if (entidade.isNull() || !CICad::EhReferencia(entidade)) return;
-    if (!EhBorne(CICad::GetNomeBloco(entidade))) return;
+    const PrimeiroLado primeiro = std::exchange(primeiroLado_, PrimeiroLado{});
+    if (entidade.isNull() || !EhBorne(entidade)) return;
     // An inverted wire keeps its ends; any other wire has them the other way round.
     const QString* marca = item.campos.procura(NumeroCampo<"INVERTIDO">());
     const bool invertido = marca && marca->toUpper() == QLatin1String("S");
@@ -329,10 +343,16 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
     CEPonto ponto, outro;
     QString fio, conectado;
     std::optional<CCBorneDataReader::LadoBorne> lado;
+    // The second side of a terminal finds its points and kind where the first left them.
+    const bool segundoLado = doBorne && !inicio && primeiro.De(item, entidade);
+    bool equipamento = false;
     if (doBorne) {
         // The terminal's own side: the insertion point for the first hook, the cut point
         // for the second, looked at as the terminal list does.
-        lado = CCBorneDataReader::AchaLado(*this, entidade, inicio);
+        lado = CCBorneDataReader::AchaLado(*this, entidade, inicio,
+                                           segundoLado ? &*primeiro.lado : nullptr);
+        equipamento = segundoLado ? primeiro.equipamento : CICad::TemXData(entidade, kEquipo);
+        if (inicio) primeiroLado_ = PrimeiroLado{&item, entidade, lado, equipamento, false};
         if (lado->vizinho.isEmpty()) return;
         ponto = lado->ponto;
         outro = lado->outro;
@@ -352,10 +372,11 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
         outro = distancia(ponto, p) <= distancia(ponto, q) ? q : p;
         conectado = VizinhoNaConexao(entidade, ponto, true);
         if (conectado.isEmpty()) conectado = VizinhoNaConexao(entidade, ponto, false);
+        equipamento = CICad::TemXData(entidade, kEquipo);
     }
     // An equipment's points may lie closer together than a wire's catch: its connection
     // name tells which of its entries on the wire this end is.
-    if (CICad::TemXData(entidade, kEquipo)) {
+    if (equipamento) {
         const zv::CEAtributo* propria = ConexaoProxima(entidade, ponto);
         if (propria && !propria->GetValor().isEmpty()) {
             const QString achado =
@@ -384,9 +405,9 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
     if (lado) {
         // Both sides read the same two wires under the same suffixes: when the first side
         // read them, the second finds them on the item.
-        const bool lidos = !inicio && fiosLidos.item == &item && fiosLidos.borne == entidade;
+        const bool lidos = segundoLado && primeiro.fiosLidos;
         if (!lidos) CCBorneDataReader::LeFiosLado(*this, item, entidade, *lado, inicio, modelo);
-        if (inicio && EhFioNumerado(lado->fio)) fiosLidos_ = FiosLidos{&item, entidade};
+        if (inicio && EhFioNumerado(lado->fio)) primeiroLado_.fiosLidos = true;
     } else {
         const OdDbObjectId fioOutro = FioNoPonto(CICad::GetLayerEntidade(entidade), outro);
         if (!fioOutro.isNull())
@@ -401,19 +422,17 @@ void CCExportDataReader::CopiaAtributos(const QString& sufixo, CEItemLista& item
     QString alvo = handle;
     const OdDbObjectId id = CICad::IdDoHandle(handle);
     if (id.isNull()) return;
-    const QString nome = CICad::GetNomeBloco(id);
+    const std::string_view nome = CICad::NomeBlocoUtf8(id);
     // A contact or a terminal speaks for its component, when the reader listed it.
-    static constexpr QLatin1String kContatos[] = {QLatin1String("NA-"), QLatin1String("NF-"),
-                                                  QLatin1String("BT-"), QLatin1String("NAF-"),
-                                                  QLatin1String("BOR-")};
-    for (const QLatin1String prefixo : kContatos) {
-        if (!nome.startsWith(prefixo, Qt::CaseInsensitive)) continue;
+    static constexpr std::string_view kContatos[] = {"NA-", "NF-", "BT-", "NAF-", "BOR-"};
+    for (const std::string_view prefixo : kContatos) {
+        if (!ComecaCom(nome, prefixo)) continue;
         for (int idioma = 1; idioma <= 3; ++idioma) {
             const std::unique_ptr<zv::CEAtributo> relacao =
                 CICad::GetAtributo(CICad::TagTraduzida(CampoTraduzido::Relacao, idioma), id);
             if (!relacao || relacao->GetValor().isEmpty()) continue;
-            const auto achado = relacoesComponentes_.constFind(relacao->GetValor());
-            if (achado != relacoesComponentes_.constEnd()) alvo = achado.value();
+            const QString dono = relacoesComponentes_.value(relacao->GetValor());
+            if (!dono.isEmpty()) alvo = dono;
             break;
         }
         break;

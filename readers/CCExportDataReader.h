@@ -2,7 +2,9 @@
 // The reader of the exports: in one pass every kind of item the export asked for
 // (terminals, components, accessories, wires, ferrules, cables), each marked with its kind
 // in ZV_LISTA_TIPO; a wire's item also learns what stands at its two ends.
+#include "CCBorneDataReader.h"
 #include "CCMaterialDataReader.h"
+#include "TabelaChaves.h"
 
 #include <optional>
 
@@ -48,7 +50,7 @@ protected:
                           VetorItens& itens);
 
     // Component relations to the handle whose fields stand for the component.
-    QHash<QString, QString> relacoesComponentes_;
+    TabelaChaves<QString, QString> relacoesComponentes_;
     // Whether the components' accessories follow them; a reader that keeps only components
     // and terminals leaves them unread.
     bool lerAcessorios_ = true;
@@ -62,12 +64,19 @@ private:
     // While components are read the sides wait: a contact names its component only once
     // every component is known.
     bool ladosAdiados_ = false;
-    // The terminal whose first side has just read the wires of both its points.
-    struct FiosLidos {
+    // What the first side of a terminal found for its second side: its points, whether it
+    // is an equipment, and whether it read the wires of both points.
+    struct PrimeiroLado {
         const CEItemLista* item = nullptr;
         OdDbObjectId borne;
+        std::optional<CCBorneDataReader::LadoBorne> lado;
+        bool equipamento = false;
+        bool fiosLidos = false;
+        bool De(const CEItemLista& i, const OdDbObjectId& b) const {
+            return lado && item == &i && borne == b;
+        }
     };
-    FiosLidos fiosLidos_;
+    PrimeiroLado primeiroLado_;
     QString PaginasOpcao() const;
     // The relation's separator and order, of the template or of the export settings.
     struct Composicao {

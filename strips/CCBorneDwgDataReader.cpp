@@ -4,8 +4,6 @@
 #include "module/CIProgress.h"
 #include "readers/CCBorneDataReader.h"
 
-#include <QSet>
-
 #include <algorithm>
 #include <array>
 #include <memory>
@@ -13,60 +11,48 @@
 
 namespace {
 
-// The strip and number fields of the three languages, made once: every terminal asks.
-struct CamposRegua {
-    std::array<QString, 3> reguas, numeros;
-};
-
-const CamposRegua& Campos() {
-    static const CamposRegua campos = [] {
-        CamposRegua c;
-        for (size_t i = 0; i < 3; ++i) {
-            c.reguas[i] = QString::fromLatin1(CCBorneDataReader::kCamposRegua[i]);
-            c.numeros[i] = QString::fromLatin1(CCBorneDataReader::kCamposNumero[i]);
-        }
-        return c;
-    }();
-    return campos;
-}
-
-// The item's value without a copy; empty when the item has none.
-const QString& Valor(const CEItemLista& item, const QString& campo) {
+// The item's value under the name's number without a copy; empty when it has none.
+const QString& Valor(const CEItemLista& item, std::uint32_t campo) {
     static const QString kVazio;
-    const QString* valor = item.campo(campo);
+    const QString* valor = campo == CamposItem::kSemNome ? nullptr : item.campos.procura(campo);
     return valor ? *valor : kVazio;
 }
 
 }  // namespace
 
-QSet<CEModeloReguas::ChaveBorne> CCBorneDwgDataReader::ChavesBornes(const VetorItens& bornes) {
-    const CamposRegua& campos = Campos();
-    QSet<CEModeloReguas::ChaveBorne> chaves;
-    chaves.reserve(int(bornes.size()));
+CCBorneDwgDataReader::Chaves CCBorneDwgDataReader::ChavesBornes(const VetorItens& bornes) {
+    Chaves chaves;
+    for (size_t i = 0; i < 3; ++i) {
+        chaves.reguas[i] =
+            CamposItem::numeroSeHouver(QString::fromLatin1(CCBorneDataReader::kCamposRegua[i]));
+        chaves.numeros[i] =
+            CamposItem::numeroSeHouver(QString::fromLatin1(CCBorneDataReader::kCamposNumero[i]));
+    }
+    chaves.relacaoIni = CamposItem::numeroSeHouver(QStringLiteral("RELACAO_INI"));
+    chaves.relacaoFim = CamposItem::numeroSeHouver(QStringLiteral("RELACAO_FIM"));
+    chaves.jumper = CamposItem::numeroSeHouver(QStringLiteral("JUMPER"));
+    chaves.bornes.reserve(bornes.size());
     for (const CEItemLista* borne : bornes)
         for (size_t i = 0; i < 3; ++i) {
-            const QString& regua = Valor(*borne, campos.reguas[i]);
-            const QString& numero = Valor(*borne, campos.numeros[i]);
-            if (!regua.isEmpty() && !numero.isEmpty()) chaves.insert({regua, numero});
+            const QString& regua = Valor(*borne, chaves.reguas[i]);
+            const QString& numero = Valor(*borne, chaves.numeros[i]);
+            if (!regua.isEmpty() && !numero.isEmpty()) chaves.bornes[{regua, numero}] = true;
         }
     return chaves;
 }
 
-bool CCBorneDwgDataReader::Ligado(const CEItemLista& borne,
-                                  const QSet<CEModeloReguas::ChaveBorne>& bornes) {
-    static const QString kRelacaoIni = QStringLiteral("RELACAO_INI"),
-                         kRelacaoFim = QStringLiteral("RELACAO_FIM"),
-                         kJumper = QStringLiteral("JUMPER");
-    if (!Valor(borne, kRelacaoIni).isEmpty() || !Valor(borne, kRelacaoFim).isEmpty()) return true;
-    const QString& jumper = Valor(borne, kJumper);
+bool CCBorneDwgDataReader::Ligado(const CEItemLista& borne, const Chaves& chaves) {
+    if (!Valor(borne, chaves.relacaoIni).isEmpty() || !Valor(borne, chaves.relacaoFim).isEmpty())
+        return true;
+    const QString& jumper = Valor(borne, chaves.jumper);
     if (jumper.isEmpty()) return false;
     const QStringList numeros = jumper.split(',', Qt::SkipEmptyParts);
-    const CamposRegua& campos = Campos();
     for (size_t i = 0; i < 3; ++i) {
-        const QString& regua = Valor(borne, campos.reguas[i]);
+        const QString& regua = Valor(borne, chaves.reguas[i]);
         if (regua.isEmpty()) continue;
         for (const QString& numero : numeros)
-            if (bornes.contains(CEModeloReguas::ChaveBorne{regua, numero.trimmed()})) return true;
+            if (chaves.bornes.value(CEModeloReguas::ChaveBorne{regua, numero.trimmed()}))
+                return true;
     }
     return false;
 }
@@ -104,7 +90,7 @@ VetorItens* CCBorneDwgDataReader::LerDados(zvdb::Database* database,
     if (CICad::GetBoolLisp("*SEL_REGUA_BORNE_CFG*"))
         bornes = CCBorneDataReader::SelecionaReguas(bornes);
     if (!CICad::GetBoolLisp("*BORNES_SEM_LIG_GRX*")) {
-        const QSet<CEModeloReguas::ChaveBorne> chaves = ChavesBornes(bornes);
+        const Chaves chaves = ChavesBornes(bornes);
         VetorItens ficam;
         for (CEItemLista* borne : bornes)
             if (Ligado(*borne, chaves)) ficam.push_back(borne);

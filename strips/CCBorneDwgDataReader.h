@@ -4,6 +4,10 @@
 // user did not pick, and terminals with nothing wired and no jumper on their strip go.
 #include "CEModeloReguas.h"
 #include "readers/CCExportDataReader.h"
+#include "readers/TabelaChaves.h"
+
+#include <array>
+#include <cstdint>
 
 class CCBorneDwgDataReader : public CCExportDataReader {
 public:
@@ -18,9 +22,15 @@ public:
     VetorItens* LerDados(zvdb::Database* database, const std::optional<QStringList>& paginas,
                          CETemplate& modelo, CIProgress& progresso) override;
 
+    // The strip and number of the terminals, one key for each language that gives both, and
+    // the numbers of the fields the terminals are asked for, looked up once.
+    struct Chaves {
+        TabelaChaves<CEModeloReguas::ChaveBorne, bool> bornes;
+        std::array<std::uint32_t, 3> reguas{}, numeros{};
+        std::uint32_t relacaoIni = 0, relacaoFim = 0, jumper = 0;
+    };
+    static Chaves ChavesBornes(const VetorItens& bornes);
     // True when the terminal has a wire on a side, or a jumper to a number of its strip
-    // among `bornes` (strip and number in any of the three languages).
-    static bool Ligado(const CEItemLista& borne, const QSet<CEModeloReguas::ChaveBorne>& bornes);
-    // The strip and number of the terminals, one key for each language that gives both.
-    static QSet<CEModeloReguas::ChaveBorne> ChavesBornes(const VetorItens& bornes);
+    // among the keys (strip and number in any of the three languages).
+    static bool Ligado(const CEItemLista& borne, const Chaves& chaves);
 };

@@ -135,13 +135,14 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
             terminais.push_back(item);
     }
     componentes.ordenar({"RELACAO", "TAG", "ETIQUETA"});
-    simbolosPorHandle.reserve(int(componentes.size()));
+    simbolosPorHandle.reserve(componentes.size());
     for (CEItemLista* item : componentes) {
         CESimboloDwg& simbolo = simbolos.emplace_back(item);
         // The first symbol of a handle keeps it.
         const QString* handle = item->campos.procura(NumeroCampo<"HANDLE">());
         const QString& texto = handle ? *handle : kSemValor;
-        if (!simbolosPorHandle.contains(texto)) simbolosPorHandle.insert(texto, &simbolo);
+        CESimboloDwg*& primeiro = simbolosPorHandle[texto];
+        if (!primeiro) primeiro = &simbolo;
     }
     // By strip, then number, in the three languages; Spanish shares the Portuguese number
     // field, which a second time would never decide a comparison.
@@ -150,9 +151,9 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
     std::vector<std::uint32_t> nomesLigacao;
     for (std::uint32_t nome = 0; nome < CamposItem::quantidadeNomes(); ++nome)
         if (PrefixoDoNome(nome) == kLigacoesDoBorne) nomesLigacao.push_back(nome);
-    QHash<QString, CEReguaDwg*> reguaPorNome;
+    TabelaChaves<QString, CEReguaDwg*> reguaPorNome;
     CEReguaDwg* ultima = nullptr;
-    bornesPorChave.reserve(int(terminais.size()));
+    bornesPorChave.reserve(terminais.size());
     for (CEItemLista* item : terminais) {
         const QString nome = CCBorneDataReader::Regua(*item);
         // The first of a strip and number wins.
@@ -252,12 +253,19 @@ void CEModeloReguas::OrdenaPorSimbolos(CEReguaDwg& regua) {
         char& marca = colocado[size_t(it - porEndereco.begin())];
         return !std::exchange(marca, char(1));
     };
-    std::unordered_set<const CESimboloDwg*> tratados;
-    tratados.reserve(regua.bornes.size());
+    // The symbols wired to the strip, each placing its terminals once: a flag beside each,
+    // the same way.
+    std::vector<const CEItemDwg*> simbolos;
+    for (const CEBorneDwg* borne : regua.bornes)
+        simbolos.insert(simbolos.end(), borne->ligados.begin(), borne->ligados.end());
+    std::sort(simbolos.begin(), simbolos.end());
+    simbolos.erase(std::unique(simbolos.begin(), simbolos.end()), simbolos.end());
+    std::vector<char> tratado(simbolos.size(), 0);
     for (CEBorneDwg* borne : regua.bornes) {
         for (CEItemDwg* ligado : borne->ligados) {
+            const auto it = std::lower_bound(simbolos.begin(), simbolos.end(), ligado);
+            if (std::exchange(tratado[size_t(it - simbolos.begin())], char(1))) continue;
             auto* simbolo = static_cast<CESimboloDwg*>(ligado);
-            if (!tratados.insert(simbolo).second) continue;
             for (CEBorneDwg* irmao : BornesDoSimbolo(*simbolo))
                 if (irmao->regua == &regua && coloca(irmao)) ordem.push_back(irmao);
         }

@@ -8,6 +8,7 @@
 #include "CEReguaDwg.h"
 #include "CESimboloDwg.h"
 #include "readers/CCBorneDataReader.h"
+#include "readers/TabelaChaves.h"
 
 #include <QHash>
 #include <QStringList>
@@ -53,9 +54,9 @@ public:
     // The terminals and symbols live in blocks of a few, in the order they were made, and
     // stay where they are as more are added: no allocation of their own.
     std::deque<CEBorneDwg> bornes;
-    QHash<ChaveBorne, CEBorneDwg*> bornesPorChave;
+    TabelaChaves<ChaveBorne, CEBorneDwg*> bornesPorChave;
     std::deque<CESimboloDwg> simbolos;
-    QHash<QString, CESimboloDwg*> simbolosPorHandle;
+    TabelaChaves<QString, CESimboloDwg*> simbolosPorHandle;
     std::vector<std::unique_ptr<CEPaginaDwg>> paginas;
     std::vector<std::unique_ptr<CEReguaDwg>> reguas;
 

@@ -562,6 +562,37 @@ TEST_F(ExportTerminalSidesTest, AContactOnATerminalNamesItsComponent) {
     EXPECT_EQ(um->valorCampo("REL_INI"), "-K1");
 }
 
+// The block names that make a terminal (BORNE..., BOR-...) and a contact (NA-...) count in
+// any case; a name that only starts alike does not.
+TEST_F(ExportTerminalSidesTest, TerminalAndContactBlockNamesCountInAnyCase) {
+    k1_ = componente("-K1", {{"A1", {200, 100, 0}}});
+    x1_ = simbolo("borne_1", {20, 200, 0},
+                  {{"REGUA", "X1", {24, 197, 0}}, {"NUMERO", "1", {24, 194, 0}}}, "1001");
+    x1_->setXData("KVR_ZV_PTS_CORTE",
+                  zvsample::XDataItems().point({20, 200, 0}).point({20, 190, 0}).tags());
+    x2_ = simbolo("Bor-2", {60, 200, 0},
+                  {{"REGUA", "X1", {64, 197, 0}}, {"NUMERO", "2", {64, 194, 0}}}, "1001");
+    const zvdb::BlockReference* quase =
+        simbolo("BORN_3", {100, 200, 0},
+                {{"REGUA", "X1", {104, 197, 0}}, {"NUMERO", "3", {104, 194, 0}}}, "1001");
+    const zvdb::BlockReference* contato = componente("-K1", {{"13", {20, 100, 0}}}, "nA-1");
+    fio({{20, 190, 0}, {20, 100, 0}}, "1");
+    le(3);
+    QMap<QString, QString> tipoPorHandle;
+    for (const CEItemLista* item : lidos_)
+        tipoPorHandle.insert(item->valorCampo("HANDLE"), item->valorCampo("ZV_LISTA_TIPO"));
+    EXPECT_EQ(tipoPorHandle.value(handle(x1_)), "BORNE");
+    EXPECT_EQ(tipoPorHandle.value(handle(x2_)), "BORNE");
+    EXPECT_EQ(tipoPorHandle.value(handle(quase)), "COMP");
+    EXPECT_EQ(tipoPorHandle.value(handle(k1_)), "COMP");
+    // The lower-case terminal's side is read, and its contact names the component.
+    const CEItemLista* um = borneLido("1");
+    ASSERT_TRUE(um);
+    EXPECT_EQ(um->valorCampo("HANDLE_INI"), handle(k1_));
+    EXPECT_NE(um->valorCampo("HANDLE_INI"), handle(contato));
+    EXPECT_EQ(um->valorCampo("RELACAO_INI"), "-K1:13");
+}
+
 TEST_F(ExportTerminalSidesTest, AnEquipmentsConnectionNameTellsItsEntryOnTheWire) {
     equipamento(true);
     le(3);

@@ -31,11 +31,11 @@ TEST(LeitorReguasTest, ATerminalStaysWithAWireOrAJumperToANumberOfItsOwnStrip) {
     c->definirCampo("JUMPER", "4");    // 4 is a number of another strip only
     d->definirCampo("JUMPER", "5");    // reaches 5 through its second-language strip
     VetorItens todos{a, b, c, d, e};
-    const QSet<CEModeloReguas::ChaveBorne> chaves = CCBorneDwgDataReader::ChavesBornes(todos);
+    const CCBorneDwgDataReader::Chaves chaves = CCBorneDwgDataReader::ChavesBornes(todos);
     // One key per language that gives both texts: a's, b's, c's, d's and e's second language.
-    EXPECT_EQ(chaves.size(), 5);
-    EXPECT_TRUE(chaves.contains(CEModeloReguas::ChaveBorne{"X2", "5"}));
-    EXPECT_FALSE(chaves.contains(CEModeloReguas::ChaveBorne{"X25", ""}));
+    EXPECT_EQ(chaves.bornes.size(), 5u);
+    EXPECT_TRUE(chaves.bornes.value(CEModeloReguas::ChaveBorne{"X2", "5"}));
+    EXPECT_FALSE(chaves.bornes.value(CEModeloReguas::ChaveBorne{"X25", ""}));
     EXPECT_TRUE(CCBorneDwgDataReader::Ligado(*a, chaves));
     EXPECT_TRUE(CCBorneDwgDataReader::Ligado(*b, chaves));
     EXPECT_FALSE(CCBorneDwgDataReader::Ligado(*c, chaves));
