@@ -15,8 +15,9 @@
 #include <vector>
 
 namespace zvsdk {
+class ConnectionReceiver;
 class Document;
-}
+}  // namespace zvsdk
 namespace zv {
 class CEAtributo;
 class CEListaAtributos;
@@ -359,6 +360,10 @@ public:
     static void zvInvokeVoid(const QString& funcao, const QStringList& args = {});
     // The raw result chain; the caller frees it with LiberaLista.
     static zvsdk::ResultBuffer* zvInvokeLista(const QString& funcao, const QStringList& args = {});
+    // A function without arguments that answers wires and their entries (the connections),
+    // its answer given to `receptor` without the chain; false when the host does not answer
+    // it so, and the chain of zvInvokeLista is the way.
+    static bool zvInvokeConexoes(const QString& funcao, zvsdk::ConnectionReceiver& receptor);
     static int zvInvokeInt(const QString& funcao, const QStringList& args = {});
     static bool zvInvokeBool(const QString& funcao, const QStringList& args = {});
     static QString zvInvokeString(const QString& funcao, const QStringList& args = {});

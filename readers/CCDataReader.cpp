@@ -108,6 +108,8 @@ void CCDataReader::CarregaConexoesCabos() {
 }
 
 void CCDataReader::CarregaConexoes(const QString& funcao, bool detalhes) {
+    // The whole drawing's answer: without a chain of nodes when the host can.
+    if (conexoes_.CarregaSemCadeia(funcao, detalhes, GuardaCompletas)) return;
     ResultBuffer* resposta = CICad::zvInvokeLista(funcao);
     conexoes_.Carrega(resposta, detalhes, GuardaCompletas);
     CICad::LiberaLista(resposta);

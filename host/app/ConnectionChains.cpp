@@ -110,17 +110,40 @@ ResultBuffer* ConnectionChains::toChain(const std::vector<zvproduct::WireConnect
     return owner.release();
 }
 
+void ConnectionChains::deliver(const std::vector<zvproduct::WireConnections>& wires, bool details,
+                               zvsdk::ConnectionReceiver& receiver) {
+    std::size_t entries = 0;
+    for (const zvproduct::WireConnections& wire : wires)
+        entries += wire.touches.size();
+    receiver.begin(wires.size(), entries);
+    std::string text;
+    for (const zvproduct::WireConnections& wire : wires) {
+        receiver.wire(qText(wire.number));
+        for (const zvproduct::Touch& touch : wire.touches)
+            receiver.entry(entryText(touch, details, text), touch.point.x, touch.point.y,
+                           touch.point.z);
+    }
+}
+
 void ConnectionChains::install(DocumentLisp& lisp, const zvproduct::ProductContext& context) {
     const std::shared_ptr<ConnectionAnswers> answers = context.connections;
     if (!answers) return;
     auto add = [&](const char* function, ConnectionAnswers::Kind kind, bool details) {
-        lisp.addChainAnswer(function, [context, answers, kind, details](zvlisp::Interpreter& in,
-                                                                        ResultBuffer** chain) {
-            // without a drawing the usual road fails as the LISP function does
-            if (!context.database || !context.database()) return false;
+        // without a drawing the usual road fails as the LISP function does
+        auto hasDrawing = [context] { return context.database && context.database(); };
+        lisp.addChainAnswer(function, [context, answers, kind, details, hasDrawing](
+                                          zvlisp::Interpreter& in, ResultBuffer** chain) {
+            if (!hasDrawing()) return false;
             *chain = toChain(answers->answer(in, context, kind, true), details);
             return true;
         });
+        lisp.addConnectionAnswer(
+            function, [context, answers, kind, details, hasDrawing](
+                          zvlisp::Interpreter& in, zvsdk::ConnectionReceiver& receiver) {
+                if (!hasDrawing()) return false;
+                deliver(answers->answer(in, context, kind, true), details, receiver);
+                return true;
+            });
     };
     add("getConexoesTodosFios", ConnectionAnswers::Kind::Wires, true);
     add("getConexoesTodosCabos", ConnectionAnswers::Kind::Cables, false);

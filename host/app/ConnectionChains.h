@@ -1,8 +1,10 @@
 #pragma once
 // The product's connection answers (getConexoesTodosFios, getConexoesTodosCabos) handed to a
 // module as chains built straight from the product's data: the very nodes that
-// LispChains::toChain makes of the functions' LISP lists, without making the lists.
+// LispChains::toChain makes of the functions' LISP lists, without making the lists; or, to
+// a module that asks so, as those nodes' values without the chain.
 #include "product/ConnectionFinder.h"
+#include "sdk/LispInterface.h"
 #include "sdk/ResultBuffer.h"
 
 #include <vector>
@@ -21,8 +23,12 @@ public:
     // of an entry is the symbol's handle, with "#CONNECTION#BLOCK" for `details`.
     static zvsdk::ResultBuffer* toChain(const std::vector<zvproduct::WireConnections>& wires,
                                         bool details);
-    // Lets the document's two connection functions answer the module as chains, from the
-    // same answers as their LISP side (the context's, which must be set).
+    // The values of toChain's chain, one after the other, into `receiver`.
+    static void deliver(const std::vector<zvproduct::WireConnections>& wires, bool details,
+                        zvsdk::ConnectionReceiver& receiver);
+    // Lets the document's two connection functions answer the module as chains, and
+    // without chains (DocumentLisp::addConnectionAnswer), from the same answers as their
+    // LISP side (the context's, which must be set).
     static void install(DocumentLisp& lisp, const zvproduct::ProductContext& context);
 };
 
