@@ -16,6 +16,7 @@
 #include <cmath>
 #include <span>
 #include <typeinfo>
+#include <utility>
 
 namespace zvproduct {
 
@@ -441,12 +442,35 @@ void ConnectionFinder::sortLines() {
         auto page = order.find(name);
         if (page != order.end()) rankOf[static_cast<std::size_t>(id)] = page->second;
     }
+    // The ranks are the pages, and off the pages last: the lines go to their rank's place in
+    // one pass, and then by handle within it, in which order most of them come already.
+    const auto offPages = static_cast<std::size_t>(index);
+    auto place = [offPages](std::int32_t rank) {
+        return rank == INT_MAX ? offPages : static_cast<std::size_t>(rank);
+    };
+    auto byHandle = [](const Line& a, const Line& b) { return a.handle < b.handle; };
+    std::vector<std::size_t> ends;
+    std::vector<Line> sorted;
     for (std::vector<Line>* lines : {&wireLines_, &leadLines_, &blindLines_}) {
-        for (Line& line : *lines)
+        ends.assign(offPages + 1, 0);
+        for (Line& line : *lines) {
             line.rank = rankOf[static_cast<std::size_t>(line.layer)];
-        std::sort(lines->begin(), lines->end(), [](const Line& a, const Line& b) {
-            return a.rank != b.rank ? a.rank < b.rank : a.handle < b.handle;
-        });
+            ++ends[place(line.rank)];
+        }
+        std::size_t next = 0;
+        for (std::size_t& end : ends)
+            next = std::exchange(end, next) + next;  // ends[r]: where rank r starts, for now
+        sorted.resize(lines->size());
+        for (const Line& line : *lines)
+            sorted[ends[place(line.rank)]++] = line;  // then where it ends
+        std::size_t begin = 0;
+        for (const std::size_t end : ends) {
+            const auto first = sorted.begin() + static_cast<std::ptrdiff_t>(begin);
+            const auto last = sorted.begin() + static_cast<std::ptrdiff_t>(end);
+            if (!std::is_sorted(first, last, byHandle)) std::sort(first, last, byHandle);
+            begin = end;
+        }
+        lines->swap(sorted);
     }
 }
 
