@@ -110,18 +110,18 @@ ResultBuffer* ConnectionChains::toChain(const std::vector<zvproduct::WireConnect
     return owner.release();
 }
 
-void ConnectionChains::deliver(const std::vector<zvproduct::WireConnections>& wires, bool details,
+void ConnectionChains::deliver(const zvproduct::ConnectionTable& table, bool details,
                                zvsdk::ConnectionReceiver& receiver) {
-    std::size_t entries = 0;
-    for (const zvproduct::WireConnections& wire : wires)
-        entries += wire.touches.size();
-    receiver.begin(wires.size(), entries);
+    receiver.begin(table.numbers.size(), table.touches.size());
     std::string text;
-    for (const zvproduct::WireConnections& wire : wires) {
-        receiver.wire(qText(wire.number));
-        for (const zvproduct::Touch& touch : wire.touches)
-            receiver.entry(entryText(touch, details, text), touch.point.x, touch.point.y,
-                           touch.point.z);
+    std::size_t touch = 0;
+    for (std::size_t w = 0; w < table.numbers.size(); ++w) {
+        receiver.wire(qText(table.numbers[w]));
+        for (; touch < table.ends[w]; ++touch) {
+            const zvproduct::Touch& entry = table.touches[touch];
+            receiver.entry(entryText(entry, details, text), entry.point.x, entry.point.y,
+                           entry.point.z);
+        }
     }
 }
 
@@ -141,7 +141,7 @@ void ConnectionChains::install(DocumentLisp& lisp, const zvproduct::ProductConte
             function, [context, answers, kind, details, hasDrawing](
                           zvlisp::Interpreter& in, zvsdk::ConnectionReceiver& receiver) {
                 if (!hasDrawing()) return false;
-                deliver(answers->answer(in, context, kind, true), details, receiver);
+                deliver(answers->table(in, context, kind, true), details, receiver);
                 return true;
             });
     };

@@ -23,8 +23,9 @@ public:
     // of an entry is the symbol's handle, with "#CONNECTION#BLOCK" for `details`.
     static zvsdk::ResultBuffer* toChain(const std::vector<zvproduct::WireConnections>& wires,
                                         bool details);
-    // The values of toChain's chain, one after the other, into `receiver`.
-    static void deliver(const std::vector<zvproduct::WireConnections>& wires, bool details,
+    // The values that toChain's chain of the same answer holds, one after the other, into
+    // `receiver`.
+    static void deliver(const zvproduct::ConnectionTable& table, bool details,
                         zvsdk::ConnectionReceiver& receiver);
     // Lets the document's two connection functions answer the module as chains, and
     // without chains (DocumentLisp::addConnectionAnswer), from the same answers as their
