@@ -60,6 +60,15 @@ QString entryText(const zvproduct::Touch& touch, bool details, std::string& scra
     return text;
 }
 
+// Handles as the product's LISP functions give them: upper-case hexadecimal texts.
+QString handleText(std::uint64_t handle) {
+    char digits[24];
+    const auto end = std::to_chars(digits, digits + sizeof digits, handle, 16).ptr;
+    for (char* c = digits; c != end; ++c)
+        if (*c >= 'a') *c = static_cast<char>(*c - 'a' + 'A');
+    return QString::fromLatin1(digits, static_cast<int>(end - digits));
+}
+
 // Fills in the nodes of a chain made beforehand, one after the other.
 class ChainFiller {
 public:
@@ -125,6 +134,17 @@ void ConnectionChains::deliver(const zvproduct::ConnectionTable& table, bool det
     }
 }
 
+ResultBuffer* ConnectionChains::handleChain(const std::vector<std::uint64_t>& handles) {
+    if (handles.empty()) return zvsdk::newNode(zvsdk::RTNIL);
+    ResultBuffer* chain = zvsdk::newChain(handles.size() + 2);
+    ChainFiller fill(chain);
+    fill.mark(zvsdk::RTLB);
+    for (std::uint64_t handle : handles)
+        fill.text(handleText(handle));
+    fill.mark(zvsdk::RTLE);
+    return chain;
+}
+
 void ConnectionChains::install(DocumentLisp& lisp, const zvproduct::ProductContext& context) {
     const std::shared_ptr<ConnectionAnswers> answers = context.connections;
     if (!answers) return;
@@ -147,6 +167,19 @@ void ConnectionChains::install(DocumentLisp& lisp, const zvproduct::ProductConte
     };
     add("getConexoesTodosFios", ConnectionAnswers::Kind::Wires, true);
     add("getConexoesTodosCabos", ConnectionAnswers::Kind::Cables, false);
+    // (getFiosPorLayer LAYER), asked page after page: the list of the handles' texts, or nil
+    lisp.addChainCall(
+        "getFiosPorLayer",
+        [context, answers](zvlisp::Interpreter&, const ResultBuffer* args, ResultBuffer** chain) {
+            // any other shape takes the usual road, with its errors
+            if (!args || args->rbnext || args->restype != zvsdk::RTSTR) return false;
+            zvdb::Database* database = context.database ? context.database() : nullptr;
+            if (!database) return false;
+            const std::vector<std::uint64_t>& handles =
+                answers->wireLayers().polylinesOn(*database, args->rstring.toStdString());
+            *chain = handleChain(handles);
+            return true;
+        });
     // A reader asks for the cables right after the wires or not at all: a call of anything
     // else lets the kept index go, so that it does not weigh on the rest of the run.
     lisp.addInvokeListener([answers](const QString& function) {

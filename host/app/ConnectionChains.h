@@ -7,6 +7,7 @@
 #include "sdk/LispInterface.h"
 #include "sdk/ResultBuffer.h"
 
+#include <cstdint>
 #include <vector>
 
 namespace zvproduct {
@@ -23,13 +24,15 @@ public:
     // of an entry is the symbol's handle, with "#CONNECTION#BLOCK" for `details`.
     static zvsdk::ResultBuffer* toChain(const std::vector<zvproduct::WireConnections>& wires,
                                         bool details);
+    // (HANDLE ...) of the handles' texts, as getFiosPorLayer answers; nil without any.
+    static zvsdk::ResultBuffer* handleChain(const std::vector<std::uint64_t>& handles);
     // The values that toChain's chain of the same answer holds, one after the other, into
     // `receiver`.
     static void deliver(const zvproduct::ConnectionTable& table, bool details,
                         zvsdk::ConnectionReceiver& receiver);
     // Lets the document's two connection functions answer the module as chains, and
     // without chains (DocumentLisp::addConnectionAnswer), from the same answers as their
-    // LISP side (the context's, which must be set).
+    // LISP side (the context's, which must be set); getFiosPorLayer with a layer's name too.
     static void install(DocumentLisp& lisp, const zvproduct::ProductContext& context);
 };
 

@@ -7,6 +7,7 @@
 #include "app/DocumentLisp.h"
 #include "app/LispChains.h"
 #include "drawing/Database.h"
+#include "drawing/LayerRecord.h"
 #include "product/ConnectionAnswers.h"
 #include "product/ProductContext.h"
 #include "product/ProductLisp.h"
@@ -154,6 +155,26 @@ TEST_F(ConnectionChainsTest, TheAnswersWithoutChainsAreTheChainsValues) {
               zvsdk::RTNORM);
     EXPECT_EQ(empty.chainText(), "5019\n");
     EXPECT_EQ(empty.wiresTold, 0u);
+}
+
+// A page's wires as the module asks for them, page after page: the LISP answer's nodes, nil
+// for a layer without any; another shape of call goes the LISP way.
+TEST_F(ConnectionChainsTest, APagesWiresAreTheNodesOfTheLispAnswer) {
+    int withWires = 0;
+    std::vector<std::string> layers{"NO SUCH LAYER"};
+    for (zvdb::LayerRecord* layer : project->database()->layers())
+        layers.emplace_back(layer->name());
+    for (const std::string& layer : layers) {
+        Chain call(zvsdk::newString("getFiosPorLayer"));
+        call.head->rbnext = zvsdk::newString(QString::fromStdString(layer));
+        const std::string chain = Chain(lisp().lispInvoke(call.head)).text();
+        EXPECT_EQ(chain, throughLisp(("getFiosPorLayer \"" + layer + "\"").c_str())) << layer;
+        withWires += chain != "5019\n";
+    }
+    EXPECT_GT(withWires, 3);
+    Chain numberCall(zvsdk::newString("getFiosPorLayer"));
+    numberCall.head->rbnext = zvsdk::newNode(zvsdk::RTSHORT);
+    EXPECT_EQ(lisp().lispInvoke(numberCall.head), nullptr);  // the LISP error: no answer
 }
 
 TEST(ConnectionChainTexts, NamesOutsideAsciiAreReadAsUtf8) {
