@@ -222,6 +222,11 @@ public:
     static std::string_view NomeLayerUtf8(const OdDbObjectId& id);
     // The vertices of a polyline, in the drawing's coordinates.
     static std::vector<CEPonto> GetVertices(const OdDbObjectId& polilinha);
+    // The polyline's vertices appended to `pontos` when it stands on the layer (its name as
+    // the drawing holds it), with one look-up of the polyline: how many; 0 when it is no
+    // polyline or on another layer.
+    static std::size_t AcrescentaVertices(const OdDbObjectId& polilinha, std::string_view layer,
+                                          std::vector<CEPonto>& pontos);
     // Grows with every change to the drawing: what was read from it before stays valid while
     // this number stays the same.
     static std::uint64_t VersaoDesenho(zvdb::Database* database = nullptr);
