@@ -189,6 +189,11 @@ ResultBuffer* CICad::zvInvokeLista(const QString& funcao, const QStringList& arg
     return resultado;
 }
 
+bool CICad::zvInvokeConexoes(const QString& funcao, zvsdk::ConnectionReceiver& receptor) {
+    zvsdk::LispInterface* lisp = LispDe(nullptr);
+    return lisp && lisp->lispInvokeConnections(funcao, receptor) != zvsdk::RTNONE;
+}
+
 void CICad::zvInvokeVoid(const QString& funcao, const QStringList& args) {
     zvsdk::releaseChain(zvInvokeLista(funcao, args));
 }

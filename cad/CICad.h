@@ -16,8 +16,9 @@
 #include <vector>
 
 namespace zvsdk {
+class ConnectionReceiver;
 class Document;
-}
+}  // namespace zvsdk
 namespace zv {
 class CEAtributo;
 class CEListaAtributos;
@@ -225,6 +226,11 @@ public:
     static std::string_view NomeLayerUtf8(const OdDbObjectId& id);
     // The vertices of a polyline, in the drawing's coordinates.
     static std::vector<CEPonto> GetVertices(const OdDbObjectId& polilinha);
+    // The polyline's vertices appended to `pontos` when it stands on the layer (its name as
+    // the drawing holds it), with one look-up of the polyline: how many; 0 when it is no
+    // polyline or on another layer.
+    static std::size_t AcrescentaVertices(const OdDbObjectId& polilinha, std::string_view layer,
+                                          std::vector<CEPonto>& pontos);
     // Grows with every change to the drawing: what was read from it before stays valid while
     // this number stays the same.
     static std::uint64_t VersaoDesenho(zvdb::Database* database = nullptr);
@@ -366,6 +372,10 @@ public:
     static void zvInvokeVoid(const QString& funcao, const QStringList& args = {});
     // The raw result chain; the caller frees it with LiberaLista.
     static zvsdk::ResultBuffer* zvInvokeLista(const QString& funcao, const QStringList& args = {});
+    // A function without arguments that answers wires and their entries (the connections),
+    // its answer given to `receptor` without the chain; false when the host does not answer
+    // it so, and the chain of zvInvokeLista is the way.
+    static bool zvInvokeConexoes(const QString& funcao, zvsdk::ConnectionReceiver& receptor);
     static int zvInvokeInt(const QString& funcao, const QStringList& args = {});
     static bool zvInvokeBool(const QString& funcao, const QStringList& args = {});
     static QString zvInvokeString(const QString& funcao, const QStringList& args = {});

@@ -106,6 +106,16 @@ std::vector<CEPonto> CICad::GetVertices(const OdDbObjectId& polilinha) {
     return pontos;
 }
 
+std::size_t CICad::AcrescentaVertices(const OdDbObjectId& polilinha, std::string_view layer,
+                                      std::vector<CEPonto>& pontos) {
+    auto* p = Como<zvdb::Polyline>(polilinha);
+    if (!p || p->layer() != layer) return 0;
+    const std::vector<zvdb::Point3> vertices = p->vertices();
+    for (const zvdb::Point3& v : vertices)
+        pontos.push_back({v.x, v.y, v.z});
+    return vertices.size();
+}
+
 std::uint64_t CICad::VersaoDesenho(zvdb::Database* database) {
     zvdb::Database* db = Db(database);
     return db ? db->changeCount() : 0;

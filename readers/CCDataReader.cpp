@@ -108,6 +108,8 @@ void CCDataReader::CarregaConexoesCabos() {
 }
 
 void CCDataReader::CarregaConexoes(const QString& funcao, bool detalhes) {
+    // The whole drawing's answer: without a chain of nodes when the host can.
+    if (conexoes_.CarregaSemCadeia(funcao, detalhes, GuardaCompletas)) return;
     ResultBuffer* resposta = CICad::zvInvokeLista(funcao);
     conexoes_.Carrega(resposta, detalhes, GuardaCompletas);
     CICad::LiberaLista(resposta);
@@ -217,13 +219,15 @@ const CCDataReader::FiosDoLayer& CCDataReader::LeIndiceFios(const QString& layer
     const std::string_view nome(nomeLayer.constData(), std::size_t(nomeLayer.size()));
     for (const QString& handle : *it) {
         const OdDbObjectId fio = CICad::IdDoHandle(handle);
-        if (!CICad::EhPolilinha(fio) || CICad::NomeLayerUtf8(fio) != nome) continue;
-        const std::vector<CEPonto> vertices = CICad::GetVertices(fio);
-        if (!vertices.empty() && !primeirosVertices_.contains(fio))
-            primeirosVertices_.insere(fio, vertices.front());
-        if (vertices.size() < 2) continue;
+        const std::size_t antes = f.pontos.size();
+        const std::size_t vertices = CICad::AcrescentaVertices(fio, nome, f.pontos);
+        if (vertices > 0 && !primeirosVertices_.contains(fio))
+            primeirosVertices_.insere(fio, f.pontos[antes]);
+        if (vertices < 2) {
+            f.pontos.resize(antes);
+            continue;
+        }
         f.fios.push_back(fio);
-        f.pontos.insert(f.pontos.end(), vertices.begin(), vertices.end());
         f.inicios.push_back(std::uint32_t(f.pontos.size()));
     }
     // Widened boxes of the segments; the grid spans the finite ones.

@@ -1,6 +1,7 @@
 #include "TabelaConexoes.h"
 
 #include "ZVString.h"
+#include "host/sdk/LispInterface.h"
 
 #include <algorithm>
 #include <bit>
@@ -116,6 +117,50 @@ const TabelaConexoes::Fio* TabelaConexoes::Procura(const QString& numero) const 
     }
 }
 
+void TabelaConexoes::ReservaResposta(std::size_t fios, std::size_t entradas) {
+    fios_.reserve(fios_.size() + fios);
+    Reserva(fios_.size() + fios);
+    textos_.reserve(textos_.size() + entradas);
+    cortes_.reserve(cortes_.size() + entradas);
+    pontos_.reserve(pontos_.size() + entradas);
+    handles_.reserve(handles_.size() + entradas);
+}
+
+TabelaConexoes::Fio TabelaConexoes::AbreFio(QString numero, bool detalhes) const {
+    Fio fio;
+    fio.numero = std::move(numero);
+    fio.primeiro = std::uint32_t(textos_.size());
+    fio.inteiros = !detalhes;
+    if (!detalhes) {
+        // a wire of the same number keeps its whole texts; nothing else of it is kept
+        if (const Fio* antes = Procura(fio.numero)) {
+            fio.primeiraCompleta = antes->primeiraCompleta;
+            fio.completas = antes->completas;
+        }
+    }
+    return fio;
+}
+
+void TabelaConexoes::Entrada(QString texto, bool detalhes, bool completas) {
+    const int corte = detalhes ? texto.indexOf(QLatin1Char('#')) : -1;
+    // Without the whole texts only the element is kept: the answer's longer texts go with it.
+    const bool soElemento = detalhes && !completas && corte >= 0;
+    textos_.push_back(soElemento ? texto.left(corte) : std::move(texto));
+    cortes_.push_back(corte < 0 || soElemento ? int(textos_.back().size()) : corte);
+    handles_.push_back(Handle(QStringView(textos_.back()).left(cortes_.back())));
+    pontos_.push_back({});
+}
+
+void TabelaConexoes::FechaFio(Fio&& fio, bool detalhes, bool completas) {
+    fio.total = std::uint32_t(textos_.size()) - fio.primeiro;
+    if (detalhes && completas) {
+        fio.primeiraCompleta = fio.primeiro;
+        fio.completas = fio.total;
+    }
+    fios_.push_back(std::move(fio));
+    Indexa(std::uint32_t(fios_.size() - 1));
+}
+
 void TabelaConexoes::Carrega(const ResultBuffer* resposta, bool detalhes, bool completas) {
     const ResultBuffer* no = resposta && resposta->restype != zvsdk::RTNIL ? resposta : nullptr;
     // the wires (the lists one level down) and the texts counted first: each array grows once
@@ -126,45 +171,20 @@ void TabelaConexoes::Carrega(const ResultBuffer* resposta, bool detalhes, bool c
         if (p->restype == zvsdk::RTLE) --nivel;
         entradas += p->restype == zvsdk::RTSTR;
     }
-    fios_.reserve(fios_.size() + fios);
-    Reserva(fios_.size() + fios);
-    textos_.reserve(textos_.size() + entradas);
-    cortes_.reserve(cortes_.size() + entradas);
-    pontos_.reserve(pontos_.size() + entradas);
-    handles_.reserve(handles_.size() + entradas);
+    ReservaResposta(fios, entradas);
     for (; no; no = no ? no->rbnext : nullptr) {
         if (no->restype == zvsdk::RTLB || no->restype == zvsdk::RTLE) continue;
-        Fio fio;
-        if (no->restype == zvsdk::RTSTR) fio.numero = no->rstring;
-        fio.primeiro = std::uint32_t(textos_.size());
-        fio.inteiros = !detalhes;
-        if (!detalhes) {
-            // a wire of the same number keeps its whole texts; nothing else of it is kept
-            if (const Fio* antes = Procura(fio.numero)) {
-                fio.primeiraCompleta = antes->primeiraCompleta;
-                fio.completas = antes->completas;
-            }
-        }
+        Fio fio = AbreFio(no->restype == zvsdk::RTSTR ? no->rstring : QString(), detalhes);
         // a number closed at once: a wire without entries
         if (no->rbnext && no->rbnext->restype == zvsdk::RTLE) {
-            fios_.push_back(std::move(fio));
-            Indexa(std::uint32_t(fios_.size() - 1));
+            FechaFio(std::move(fio), detalhes, completas);
             no = no->rbnext;
             continue;
         }
         int coordenada = 0;
         for (no = no->rbnext; no && !EhFimDeFio(no); no = no->rbnext) {
             if (no->restype == zvsdk::RTSTR) {
-                const QString& texto = no->rstring;
-                const int corte = detalhes ? texto.indexOf(QLatin1Char('#')) : -1;
-                // Without the whole texts only the element is kept: the answer's longer
-                // texts go with it.
-                const bool soElemento = detalhes && !completas && corte >= 0;
-                textos_.push_back(soElemento ? texto.left(corte) : texto);
-                cortes_.push_back(corte < 0 || soElemento ? int(textos_.back().size()) : corte);
-                const QStringView elemento = QStringView(texto).left(cortes_.back());
-                handles_.push_back(Handle(elemento));
-                pontos_.push_back({});
+                Entrada(no->rstring, detalhes, completas);
                 coordenada = 0;
             } else if (no->restype == zvsdk::RTREAL && textos_.size() > fio.primeiro &&
                        coordenada < 3) {
@@ -173,14 +193,45 @@ void TabelaConexoes::Carrega(const ResultBuffer* resposta, bool detalhes, bool c
                 ++coordenada;
             }
         }
-        fio.total = std::uint32_t(textos_.size()) - fio.primeiro;
-        if (detalhes && completas) {
-            fio.primeiraCompleta = fio.primeiro;
-            fio.completas = fio.total;
-        }
-        fios_.push_back(std::move(fio));
-        Indexa(std::uint32_t(fios_.size() - 1));
+        FechaFio(std::move(fio), detalhes, completas);
     }
+}
+
+// Takes the host's answer value by value, as Carrega reads its chain.
+class TabelaConexoes::Receptor final : public zvsdk::ConnectionReceiver {
+public:
+    Receptor(TabelaConexoes& tabela, bool detalhes, bool completas)
+        : tabela_(tabela), detalhes_(detalhes), completas_(completas) {}
+    void begin(std::size_t fios, std::size_t entradas) override {
+        tabela_.ReservaResposta(fios, entradas);
+    }
+    void wire(QString numero) override {
+        Fecha();
+        fio_ = tabela_.AbreFio(std::move(numero), detalhes_);
+        aberto_ = true;
+    }
+    void entry(QString texto, double x, double y, double z) override {
+        if (!aberto_) return;
+        tabela_.Entrada(std::move(texto), detalhes_, completas_);
+        tabela_.pontos_.back() = {x, y, z};
+    }
+    void Fecha() {
+        if (aberto_) tabela_.FechaFio(std::move(fio_), detalhes_, completas_);
+        aberto_ = false;
+    }
+
+private:
+    TabelaConexoes& tabela_;
+    const bool detalhes_, completas_;
+    Fio fio_;
+    bool aberto_ = false;
+};
+
+bool TabelaConexoes::CarregaSemCadeia(const QString& funcao, bool detalhes, bool completas) {
+    Receptor receptor(*this, detalhes, completas);
+    if (!CICad::zvInvokeConexoes(funcao, receptor)) return false;
+    receptor.Fecha();
+    return true;
 }
 
 std::optional<TabelaConexoes::Textos> TabelaConexoes::Elementos(const QString& fio) const {

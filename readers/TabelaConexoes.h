@@ -53,6 +53,10 @@ public:
     // wire of a number already there keeps that one's whole texts. A number given again
     // takes the place of the one before.
     void Carrega(const zvsdk::ResultBuffer* resposta, bool detalhes, bool completas);
+    // The same from the answer of the LISP function `funcao` (without arguments), when the
+    // host gives it without its chain (CICad::zvInvokeConexoes); false when it does not,
+    // and nothing was added.
+    bool CarregaSemCadeia(const QString& funcao, bool detalhes, bool completas);
 
     // Null when the wire is not there.
     std::optional<Textos> Elementos(const QString& fio) const;
@@ -86,6 +90,13 @@ private:
     const Fio* Procura(const QString& numero) const;
     void Indexa(std::uint32_t lugar);
     void Reserva(std::size_t fios);
+    // Both ways of loading go through these: a wire opened, its entries, the wire closed.
+    class Receptor;
+    void ReservaResposta(std::size_t fios, std::size_t entradas);
+    Fio AbreFio(QString numero, bool detalhes) const;
+    // Its point is pontos_.back(), the origin until the answer's reals come.
+    void Entrada(QString texto, bool detalhes, bool completas);
+    void FechaFio(Fio&& fio, bool detalhes, bool completas);
 
     std::vector<Fio> fios_;
     std::vector<QString> textos_;

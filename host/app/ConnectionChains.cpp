@@ -60,6 +60,15 @@ QString entryText(const zvproduct::Touch& touch, bool details, std::string& scra
     return text;
 }
 
+// Handles as the product's LISP functions give them: upper-case hexadecimal texts.
+QString handleText(std::uint64_t handle) {
+    char digits[24];
+    const auto end = std::to_chars(digits, digits + sizeof digits, handle, 16).ptr;
+    for (char* c = digits; c != end; ++c)
+        if (*c >= 'a') *c = static_cast<char>(*c - 'a' + 'A');
+    return QString::fromLatin1(digits, static_cast<int>(end - digits));
+}
+
 // Fills in the nodes of a chain made beforehand, one after the other.
 class ChainFiller {
 public:
@@ -110,20 +119,67 @@ ResultBuffer* ConnectionChains::toChain(const std::vector<zvproduct::WireConnect
     return owner.release();
 }
 
+void ConnectionChains::deliver(const zvproduct::ConnectionTable& table, bool details,
+                               zvsdk::ConnectionReceiver& receiver) {
+    receiver.begin(table.numbers.size(), table.touches.size());
+    std::string text;
+    std::size_t touch = 0;
+    for (std::size_t w = 0; w < table.numbers.size(); ++w) {
+        receiver.wire(qText(table.numbers[w]));
+        for (; touch < table.ends[w]; ++touch) {
+            const zvproduct::Touch& entry = table.touches[touch];
+            receiver.entry(entryText(entry, details, text), entry.point.x, entry.point.y,
+                           entry.point.z);
+        }
+    }
+}
+
+ResultBuffer* ConnectionChains::handleChain(const std::vector<std::uint64_t>& handles) {
+    if (handles.empty()) return zvsdk::newNode(zvsdk::RTNIL);
+    ResultBuffer* chain = zvsdk::newChain(handles.size() + 2);
+    ChainFiller fill(chain);
+    fill.mark(zvsdk::RTLB);
+    for (std::uint64_t handle : handles)
+        fill.text(handleText(handle));
+    fill.mark(zvsdk::RTLE);
+    return chain;
+}
+
 void ConnectionChains::install(DocumentLisp& lisp, const zvproduct::ProductContext& context) {
     const std::shared_ptr<ConnectionAnswers> answers = context.connections;
     if (!answers) return;
     auto add = [&](const char* function, ConnectionAnswers::Kind kind, bool details) {
-        lisp.addChainAnswer(function, [context, answers, kind, details](zvlisp::Interpreter& in,
-                                                                        ResultBuffer** chain) {
-            // without a drawing the usual road fails as the LISP function does
-            if (!context.database || !context.database()) return false;
+        // without a drawing the usual road fails as the LISP function does
+        auto hasDrawing = [context] { return context.database && context.database(); };
+        lisp.addChainAnswer(function, [context, answers, kind, details, hasDrawing](
+                                          zvlisp::Interpreter& in, ResultBuffer** chain) {
+            if (!hasDrawing()) return false;
             *chain = toChain(answers->answer(in, context, kind, true), details);
             return true;
         });
+        lisp.addConnectionAnswer(
+            function, [context, answers, kind, details, hasDrawing](
+                          zvlisp::Interpreter& in, zvsdk::ConnectionReceiver& receiver) {
+                if (!hasDrawing()) return false;
+                deliver(answers->table(in, context, kind, true), details, receiver);
+                return true;
+            });
     };
     add("getConexoesTodosFios", ConnectionAnswers::Kind::Wires, true);
     add("getConexoesTodosCabos", ConnectionAnswers::Kind::Cables, false);
+    // (getFiosPorLayer LAYER), asked page after page: the list of the handles' texts, or nil
+    lisp.addChainCall(
+        "getFiosPorLayer",
+        [context, answers](zvlisp::Interpreter&, const ResultBuffer* args, ResultBuffer** chain) {
+            // any other shape takes the usual road, with its errors
+            if (!args || args->rbnext || args->restype != zvsdk::RTSTR) return false;
+            zvdb::Database* database = context.database ? context.database() : nullptr;
+            if (!database) return false;
+            const std::vector<std::uint64_t>& handles =
+                answers->wireLayers().polylinesOn(*database, args->rstring.toStdString());
+            *chain = handleChain(handles);
+            return true;
+        });
     // A reader asks for the cables right after the wires or not at all: a call of anything
     // else lets the kept index go, so that it does not weigh on the rest of the run.
     lisp.addInvokeListener([answers](const QString& function) {

@@ -215,7 +215,38 @@ zvsdk::ResultBuffer* DocumentLisp::lispInvoke(const zvsdk::ResultBuffer* call) {
 
 void DocumentLisp::addChainAnswer(const QString& function, ChainAnswer answer) {
     zvlisp::Symbol* symbol = lisp_.intern(function);
-    chainAnswers_.insert(function, {symbol, symbol->value, std::move(answer), {}});
+    ChainSource& source = chainAnswers_[function];
+    source = {symbol, symbol->value, std::move(answer), {}, std::move(source.connections)};
+}
+
+void DocumentLisp::addConnectionAnswer(const QString& function, ConnectionAnswer answer) {
+    zvlisp::Symbol* symbol = lisp_.intern(function);
+    ChainSource& source = chainAnswers_[function];
+    source = {symbol, symbol->value, std::move(source.answer), {}, std::move(answer)};
+}
+
+int DocumentLisp::lispInvokeConnections(const QString& function,
+                                        zvsdk::ConnectionReceiver& receiver) {
+    const ChainSource* source = sourceOf(function);
+    if (!source || !source->connections) return zvsdk::RTNONE;
+    // what lispInvoke does before any call
+    if (interruptRequested()) return zvsdk::RTERROR;
+    for (const InvokeListener& listener : invokeListeners_)
+        listener(function);
+    try {
+        return source->connections(lisp_, receiver) ? zvsdk::RTNORM : zvsdk::RTNONE;
+    } catch (zvlisp::LispError& error) {
+        if (!error.handled) lisp_.report(error);
+        return zvsdk::RTERROR;
+    }
+}
+
+const DocumentLisp::ChainSource* DocumentLisp::sourceOf(const QString& function) const {
+    auto source = chainAnswers_.constFind(function);
+    if (source == chainAnswers_.constEnd() || !source->function.isFunction() ||
+        !source->symbol->value.same(source->function))
+        return nullptr;
+    return &*source;
 }
 
 void DocumentLisp::addInvokeListener(InvokeListener listener) {
@@ -224,15 +255,13 @@ void DocumentLisp::addInvokeListener(InvokeListener listener) {
 
 void DocumentLisp::addChainCall(const QString& function, ChainCall call) {
     zvlisp::Symbol* symbol = lisp_.intern(function);
-    chainAnswers_.insert(function, {symbol, symbol->value, {}, std::move(call)});
+    chainAnswers_.insert(function, {symbol, symbol->value, {}, std::move(call), {}});
 }
 
 bool DocumentLisp::answerAsChain(const zvsdk::ResultBuffer* call, zvsdk::ResultBuffer** chain) {
     if (chainAnswers_.isEmpty()) return false;
-    auto source = chainAnswers_.constFind(call->rstring);
-    if (source == chainAnswers_.constEnd() || !source->function.isFunction() ||
-        !source->symbol->value.same(source->function))
-        return false;
+    const ChainSource* source = sourceOf(call->rstring);
+    if (!source) return false;
     if (!source->call && (call->rbnext || !source->answer)) return false;
     try {
         return source->call ? source->call(lisp_, call->rbnext, chain)

@@ -51,6 +51,15 @@ public:
     using ChainCall = std::function<bool(zvlisp::Interpreter&, const zvsdk::ResultBuffer* args,
                                          zvsdk::ResultBuffer**)>;
     void addChainCall(const QString& function, ChainCall call);
+    // The same for a function without arguments that answers wires and their entries (see
+    // lispInvokeConnections): the answer goes value by value to the receiver, and must be
+    // the values of the chain the function's value would give. False leaves the call to
+    // lispInvoke.
+    using ConnectionAnswer =
+        std::function<bool(zvlisp::Interpreter&, zvsdk::ConnectionReceiver& receiver)>;
+    void addConnectionAnswer(const QString& function, ConnectionAnswer answer);
+    int lispInvokeConnections(const QString& function,
+                              zvsdk::ConnectionReceiver& receiver) override;
     // Told the name of every function the module calls, before the call.
     using InvokeListener = std::function<void(const QString& function)>;
     void addInvokeListener(InvokeListener listener);
@@ -61,7 +70,11 @@ private:
         zvlisp::Value function;
         ChainAnswer answer;
         ChainCall call;
+        ConnectionAnswer connections;
     };
+    // The source of a function's answers while its symbol holds the function it held when
+    // the source was added; null otherwise.
+    const ChainSource* sourceOf(const QString& function) const;
     // True when a chain answer took the call; `chain` is then its result.
     bool answerAsChain(const zvsdk::ResultBuffer* call, zvsdk::ResultBuffer** chain);
 

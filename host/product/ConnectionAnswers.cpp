@@ -8,8 +8,9 @@
 
 namespace zvproduct {
 
-std::vector<WireConnections> ConnectionAnswers::answer(zvdb::Database& database, double tolerance,
-                                                       Kind kind, bool keepOther) {
+template <class Ask>
+auto ConnectionAnswers::withFinder(zvdb::Database& database, double tolerance, bool keepOther,
+                                   Ask&& ask) {
     std::unique_ptr<ConnectionFinder> finder = std::move(kept_);
     // A kept index serves one call: the second of a pair.
     const bool fresh = !finder || stamp_ != DrawingStamp::of(database) || tolerance_ != tolerance;
@@ -19,7 +20,7 @@ std::vector<WireConnections> ConnectionAnswers::answer(zvdb::Database& database,
         if (!wireLayers_.current(database))
             wireLayers_.adopt(database, finder->wiresAndLeadsByLayer());
     }
-    std::vector<WireConnections> asked = kind == Kind::Wires ? finder->wires() : finder->cables();
+    auto asked = ask(*finder);
     if (fresh && keepOther) {
         kept_ = std::move(finder);
         stamp_ = DrawingStamp::of(database);
@@ -28,12 +29,36 @@ std::vector<WireConnections> ConnectionAnswers::answer(zvdb::Database& database,
     return asked;
 }
 
+std::vector<WireConnections> ConnectionAnswers::answer(zvdb::Database& database, double tolerance,
+                                                       Kind kind, bool keepOther) {
+    return withFinder(database, tolerance, keepOther, [kind](const ConnectionFinder& finder) {
+        return kind == Kind::Wires ? finder.wires() : finder.cables();
+    });
+}
+
+ConnectionTable ConnectionAnswers::table(zvdb::Database& database, double tolerance, Kind kind,
+                                         bool keepOther) {
+    return withFinder(database, tolerance, keepOther, [kind](const ConnectionFinder& finder) {
+        return kind == Kind::Wires ? finder.wireTable() : finder.cableTable();
+    });
+}
+
+zvdb::Database& ConnectionAnswers::databaseOf(zvlisp::Interpreter& lisp,
+                                              const ProductContext& context) {
+    zvdb::Database* database = context.database ? context.database() : nullptr;
+    if (!database) lisp.fail("no drawing");
+    return *database;
+}
+
 std::vector<WireConnections> ConnectionAnswers::answer(zvlisp::Interpreter& lisp,
                                                        const ProductContext& context, Kind kind,
                                                        bool keepOther) {
-    zvdb::Database* database = context.database ? context.database() : nullptr;
-    if (!database) lisp.fail("no drawing");
-    return answer(*database, tolerance(lisp), kind, keepOther);
+    return answer(databaseOf(lisp, context), tolerance(lisp), kind, keepOther);
+}
+
+ConnectionTable ConnectionAnswers::table(zvlisp::Interpreter& lisp, const ProductContext& context,
+                                         Kind kind, bool keepOther) {
+    return table(databaseOf(lisp, context), tolerance(lisp), kind, keepOther);
 }
 
 double ConnectionAnswers::tolerance(zvlisp::Interpreter& lisp) {

@@ -35,6 +35,12 @@ public:
     std::vector<WireConnections> answer(zvlisp::Interpreter& lisp, const ProductContext& context,
                                         Kind kind, bool keepOther);
 
+    // The same answers as tables (ConnectionFinder::wireTable), from the same kept index.
+    ConnectionTable table(zvdb::Database& database, double tolerance, Kind kind,
+                          bool keepOther = true);
+    ConnectionTable table(zvlisp::Interpreter& lisp, const ProductContext& context, Kind kind,
+                          bool keepOther);
+
     // The text of an entry: the symbol's handle in upper-case hexadecimal, with
     // "#CONNECTION#BLOCK" behind it for `details`; appended to `out`.
     static void appendEntryText(const Touch& touch, bool details, std::string& out);
@@ -49,6 +55,11 @@ public:
     WireLayerIndex& wireLayers() { return wireLayers_; }
 
 private:
+    // `ask(finder)` from the kept index or a new one, which is kept after for `keepOther`.
+    template <class Ask>
+    auto withFinder(zvdb::Database& database, double tolerance, bool keepOther, Ask&& ask);
+    static zvdb::Database& databaseOf(zvlisp::Interpreter& lisp, const ProductContext& context);
+
     DrawingStamp stamp_;
     double tolerance_ = 0;
     std::unique_ptr<ConnectionFinder> kept_;

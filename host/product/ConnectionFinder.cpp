@@ -15,7 +15,9 @@
 #include <climits>
 #include <cmath>
 #include <span>
+#include <type_traits>
 #include <typeinfo>
+#include <utility>
 
 namespace zvproduct {
 
@@ -441,12 +443,35 @@ void ConnectionFinder::sortLines() {
         auto page = order.find(name);
         if (page != order.end()) rankOf[static_cast<std::size_t>(id)] = page->second;
     }
+    // The ranks are the pages, and off the pages last: the lines go to their rank's place in
+    // one pass, and then by handle within it, in which order most of them come already.
+    const auto offPages = static_cast<std::size_t>(index);
+    auto place = [offPages](std::int32_t rank) {
+        return rank == INT_MAX ? offPages : static_cast<std::size_t>(rank);
+    };
+    auto byHandle = [](const Line& a, const Line& b) { return a.handle < b.handle; };
+    std::vector<std::size_t> ends;
+    std::vector<Line> sorted;
     for (std::vector<Line>* lines : {&wireLines_, &leadLines_, &blindLines_}) {
-        for (Line& line : *lines)
+        ends.assign(offPages + 1, 0);
+        for (Line& line : *lines) {
             line.rank = rankOf[static_cast<std::size_t>(line.layer)];
-        std::sort(lines->begin(), lines->end(), [](const Line& a, const Line& b) {
-            return a.rank != b.rank ? a.rank < b.rank : a.handle < b.handle;
-        });
+            ++ends[place(line.rank)];
+        }
+        std::size_t next = 0;
+        for (std::size_t& end : ends)
+            next = std::exchange(end, next) + next;  // ends[r]: where rank r starts, for now
+        sorted.resize(lines->size());
+        for (const Line& line : *lines)
+            sorted[ends[place(line.rank)]++] = line;  // then where it ends
+        std::size_t begin = 0;
+        for (const std::size_t end : ends) {
+            const auto first = sorted.begin() + static_cast<std::ptrdiff_t>(begin);
+            const auto last = sorted.begin() + static_cast<std::ptrdiff_t>(end);
+            if (!std::is_sorted(first, last, byHandle)) std::sort(first, last, byHandle);
+            begin = end;
+        }
+        lines->swap(sorted);
     }
 }
 
@@ -582,44 +607,77 @@ struct WireGroups {
     }
 };
 
-// Group by group, its polylines in their order and the touches `addTouches` gathers for
-// each of its lines into `touches`: each group's vectors are made to size once.
-template <class Line, class AddTouches>
-std::vector<WireConnections> connections(const WireGroups& groups, const std::vector<Line>& lines,
-                                         std::vector<Touch>& touches, AddTouches&& addTouches) {
-    std::vector<WireConnections> result(groups.numbers.size());
+// Group by group, the touches `addTouches` gathers for each of its lines, appended to
+// `touches`; `done(g)` after each group.
+template <class Line, class AddTouches, class Done>
+void eachGroup(const WireGroups& groups, const std::vector<Line>& lines, AddTouches&& addTouches,
+               Done&& done) {
     for (std::size_t g = 0; g < groups.numbers.size(); ++g) {
-        WireConnections& group = result[g];
-        group.number = groups.numbers[g];
-        group.polylines.reserve(groups.first[g + 1] - groups.first[g]);
-        touches.clear();
-        for (std::uint32_t k = groups.first[g]; k < groups.first[g + 1]; ++k) {
-            const Line& line = lines[groups.lines[k]];
-            group.polylines.push_back(line.handle);
-            addTouches(line);
-        }
-        group.touches.assign(touches.begin(), touches.end());
+        for (std::uint32_t k = groups.first[g]; k < groups.first[g + 1]; ++k)
+            addTouches(lines[groups.lines[k]]);
+        done(g);
     }
-    return result;
 }
+
+// Group by group, its polylines in their order and its touches: each group's vectors are
+// made to size once.
+struct MakeConnections {
+    template <class Line, class AddTouches>
+    std::vector<WireConnections> operator()(const WireGroups& groups,
+                                            const std::vector<Line>& lines,
+                                            std::vector<Touch>& touches,
+                                            AddTouches&& addTouches) const {
+        std::vector<WireConnections> result(groups.numbers.size());
+        touches.clear();
+        eachGroup(groups, lines, addTouches, [&](std::size_t g) {
+            WireConnections& group = result[g];
+            group.number = groups.numbers[g];
+            group.polylines.reserve(groups.first[g + 1] - groups.first[g]);
+            for (std::uint32_t k = groups.first[g]; k < groups.first[g + 1]; ++k)
+                group.polylines.push_back(lines[groups.lines[k]].handle);
+            group.touches.assign(touches.begin(), touches.end());
+            touches.clear();
+        });
+        return result;
+    }
+};
+
+// All groups' touches in one array.
+struct MakeTable {
+    template <class Line, class AddTouches>
+    ConnectionTable operator()(const WireGroups& groups, const std::vector<Line>& lines,
+                               std::vector<Touch>& touches, AddTouches&& addTouches) const {
+        ConnectionTable table;
+        table.numbers = groups.numbers;
+        table.ends.reserve(groups.numbers.size());
+        touches.clear();
+        eachGroup(groups, lines, addTouches, [&](std::size_t) {
+            table.ends.push_back(static_cast<std::uint32_t>(touches.size()));
+        });
+        table.touches = std::move(touches);
+        return table;
+    }
+};
 
 }  // namespace
 
-std::vector<WireConnections> ConnectionFinder::wires() const {
+template <class Make>
+auto ConnectionFinder::wiresWith(Make&& make) const {
     std::vector<std::string_view> lineNumbers(wireLines_.size());
     for (std::size_t i = 0; i < wireLines_.size(); ++i)
         lineNumbers[i] = wireLines_[i].number;
     const WireGroups groups(lineNumbers);
     lineNumbers = {};
     Scratch scratch;
-    return connections(groups, wireLines_, scratch.touches, [&](const Line& line) {
+    return make(groups, wireLines_, scratch.touches, [&](const Line& line) {
         readVertices(*line.polyline, scratch.vertices);
         for (const zvdb::Point3& vertex : scratch.vertices)
             touchesAt(line.layer, vertex, tolerance_, scratch.touches, scratch);
     });
 }
 
-std::vector<WireConnections> ConnectionFinder::cables() const {
+template <class Make>
+auto ConnectionFinder::cablesWith(Make&& make) const {
     // blind connections by the handle of their lead, in their order for each lead
     std::vector<std::pair<std::uint64_t, std::uint32_t>> blinds;
     for (std::size_t i = 0; i < blindLines_.size(); ++i) {
@@ -645,13 +703,36 @@ std::vector<WireConnections> ConnectionFinder::cables() const {
         leadNumbers[i] = cableNumber(*leadLines_[i].polyline);
     const std::vector<std::string_view> views(leadNumbers.begin(), leadNumbers.end());
     const WireGroups groups(views);
-    return connections(groups, leadLines_, scratch.touches, [&](const Line& lead) {
+    auto answer = make(groups, leadLines_, scratch.touches, [&](const Line& lead) {
         ends(lead, true);
         auto own = std::lower_bound(blinds.begin(), blinds.end(),
                                     std::pair<std::uint64_t, std::uint32_t>{lead.handle, 0});
         for (; own != blinds.end() && own->first == lead.handle; ++own)
             ends(blindLines_[own->second], false);
     });
+    if constexpr (std::is_same_v<decltype(answer), ConnectionTable>) {
+        // the numbers' texts go with the table, where its views point
+        answer.owned = std::move(leadNumbers);
+        for (std::size_t g = 0; g < answer.numbers.size(); ++g)
+            answer.numbers[g] = answer.owned[groups.lines[groups.first[g]]];
+    }
+    return answer;
+}
+
+std::vector<WireConnections> ConnectionFinder::wires() const {
+    return wiresWith(MakeConnections{});
+}
+
+std::vector<WireConnections> ConnectionFinder::cables() const {
+    return cablesWith(MakeConnections{});
+}
+
+ConnectionTable ConnectionFinder::wireTable() const {
+    return wiresWith(MakeTable{});
+}
+
+ConnectionTable ConnectionFinder::cableTable() const {
+    return cablesWith(MakeTable{});
 }
 
 std::string ConnectionFinder::cableNumber(const zvdb::Polyline& lead) const {

@@ -36,6 +36,16 @@ struct WireConnections {
     std::vector<std::uint64_t> polylines;  // page order, then handle order
 };
 
+// The same answer in a few arrays: wire w's touches are touches[ends[w - 1]] (0 for the
+// first wire) to touches[ends[w]]. The numbers are views into the drawing's storage, or
+// into `owned` (a cable's number is made of two texts): a table is moved, not copied.
+struct ConnectionTable {
+    std::vector<std::string_view> numbers;
+    std::vector<std::uint32_t> ends;
+    std::vector<Touch> touches;
+    std::vector<std::string> owned;
+};
+
 class ConnectionFinder {
 public:
     ConnectionFinder(zvdb::Database& database, double tolerance);
@@ -45,6 +55,9 @@ public:
     // Cables by "NAME\fKEY": the two ends of each lead and the ends of its blind
     // connections, leads in page order (tolerance 0.3).
     std::vector<WireConnections> cables() const;
+    // The same as tables, without the polylines: no arrays per wire.
+    ConnectionTable wireTable() const;
+    ConnectionTable cableTable() const;
     double tolerance() const { return tolerance_; }
     // The wire and lead polylines (KVR_ZV_WIRE or KVR_ZV_CABO) of each layer, each once, in
     // handle order: what the walk above saw, for those who ask by layer.
@@ -107,6 +120,12 @@ private:
     void touchesAt(std::int32_t layer, const zvdb::Point3& p, double radius,
                    std::vector<Touch>& out, Scratch& scratch) const;
     std::int32_t layerId(std::string_view layer);
+    // `make(groups, lines, touches, addTouches)` given what the wires' (the cables') answer
+    // is made of.
+    template <class Make>
+    auto wiresWith(Make&& make) const;
+    template <class Make>
+    auto cablesWith(Make&& make) const;
 
     zvdb::Database& database_;
     double tolerance_;

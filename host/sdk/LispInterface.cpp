@@ -38,4 +38,8 @@ int LispInterface::lispGetSymbolFirst(const QString& name, ResultBuffer& first) 
     return status == RTNORM && chain ? RTNORM : RTERROR;
 }
 
+int LispInterface::lispInvokeConnections(const QString&, ConnectionReceiver&) {
+    return RTNONE;
+}
+
 }  // namespace zvsdk

@@ -4,6 +4,18 @@
 
 namespace zvsdk {
 
+// Takes an answer of wires and their entries, ((NUMBER (TEXT x y z) ...) ...), as a host
+// hands it over without its chain (see LispInterface::lispInvokeConnections).
+class ConnectionReceiver {
+public:
+    virtual ~ConnectionReceiver() = default;
+    // Before anything else: how many wires and entries follow in all.
+    virtual void begin(std::size_t wires, std::size_t entries) = 0;
+    // A wire, its entries after it.
+    virtual void wire(QString number) = 0;
+    virtual void entry(QString text, double x, double y, double z) = 0;
+};
+
 class LispInterface {
 public:
     virtual ~LispInterface() = default;
@@ -28,6 +40,12 @@ public:
     // answers this way, some once per item, so a host may skip making the chain; the default
     // makes it.
     virtual int lispGetSymbolFirst(const QString& name, ResultBuffer& first);
+    // Calls a function without arguments that answers wires and their entries, the whole
+    // drawing's, and hands the answer to `receiver` as the values of its chain, in their
+    // order, without making the chain: RTNORM then, RTERROR when the call failed (as
+    // lispInvoke's null), RTNONE when the host does not answer the function so (the caller
+    // asks lispInvoke). The default answers RTNONE.
+    virtual int lispInvokeConnections(const QString& function, ConnectionReceiver& receiver);
 };
 
 }  // namespace zvsdk

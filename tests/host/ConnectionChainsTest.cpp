@@ -7,6 +7,7 @@
 #include "app/DocumentLisp.h"
 #include "app/LispChains.h"
 #include "drawing/Database.h"
+#include "drawing/LayerRecord.h"
 #include "product/ConnectionAnswers.h"
 #include "product/ProductContext.h"
 #include "product/ProductLisp.h"
@@ -91,6 +92,91 @@ TEST_F(ConnectionChainsTest, TheChainsAreTheNodesOfTheLispAnswers) {
         "5019\n");
 }
 
+// Writes the values it is given as `dump` writes the chain of the same answer.
+class Recorder : public zvsdk::ConnectionReceiver {
+public:
+    void begin(std::size_t wires, std::size_t entries) override {
+        ++begun;
+        wiresTold = wires;
+        entriesTold = entries;
+    }
+    void wire(QString number) override {
+        closeWire();
+        text += "5016\n5005 " + number.toStdString() + "\n";
+        ++wires;
+    }
+    void entry(QString entry, double x, double y, double z) override {
+        text += "5016\n5005 " + entry.toStdString() + "\n";
+        for (double v : {x, y, z})
+            text += "5001 " + std::to_string(v) + "\n";
+        text += "5017\n";
+        ++entries;
+    }
+    std::string chainText() {
+        closeWire();
+        return wires == 0 ? "5019\n" : "5016\n" + text + "5017\n";
+    }
+
+    std::string text;
+    int begun = 0;
+    std::size_t wiresTold = 0, entriesTold = 0, wires = 0, entries = 0;
+
+private:
+    void closeWire() {
+        if (wires > closed) text += "5017\n";
+        closed = wires;
+    }
+    std::size_t closed = 0;
+};
+
+// The module's other road: the same answers value by value, while the functions are the
+// product's own.
+TEST_F(ConnectionChainsTest, TheAnswersWithoutChainsAreTheChainsValues) {
+    for (const char* function : {"getConexoesTodosFios", "getConexoesTodosCabos"}) {
+        Recorder recorder;
+        ASSERT_EQ(lisp().lispInvokeConnections(function, recorder), zvsdk::RTNORM) << function;
+        EXPECT_EQ(recorder.begun, 1);
+        EXPECT_EQ(recorder.wiresTold, recorder.wires);
+        EXPECT_EQ(recorder.entriesTold, recorder.entries);
+        EXPECT_GT(recorder.entries, 20u) << function;
+        EXPECT_EQ(recorder.chainText(), invoked(function)) << function;
+    }
+    // a user's defun takes over: no answer this way, nothing given
+    lisp().interpreter().evalText("(defun getConexoesTodosFios () nil)");
+    Recorder taken;
+    EXPECT_EQ(lisp().lispInvokeConnections("getConexoesTodosFios", taken), zvsdk::RTNONE);
+    EXPECT_EQ(taken.begun, 0);
+    EXPECT_EQ(lisp().lispInvokeConnections("getFiosPorLayer", taken), zvsdk::RTNONE);
+    // an empty drawing: nothing, as its nil chain
+    app->setActiveDocument(document);
+    Recorder empty;
+    EXPECT_EQ(static_cast<zvhost::DocumentLisp*>(document->lisp())
+                  ->lispInvokeConnections("getConexoesTodosCabos", empty),
+              zvsdk::RTNORM);
+    EXPECT_EQ(empty.chainText(), "5019\n");
+    EXPECT_EQ(empty.wiresTold, 0u);
+}
+
+// A page's wires as the module asks for them, page after page: the LISP answer's nodes, nil
+// for a layer without any; another shape of call goes the LISP way.
+TEST_F(ConnectionChainsTest, APagesWiresAreTheNodesOfTheLispAnswer) {
+    int withWires = 0;
+    std::vector<std::string> layers{"NO SUCH LAYER"};
+    for (zvdb::LayerRecord* layer : project->database()->layers())
+        layers.emplace_back(layer->name());
+    for (const std::string& layer : layers) {
+        Chain call(zvsdk::newString("getFiosPorLayer"));
+        call.head->rbnext = zvsdk::newString(QString::fromStdString(layer));
+        const std::string chain = Chain(lisp().lispInvoke(call.head)).text();
+        EXPECT_EQ(chain, throughLisp(("getFiosPorLayer \"" + layer + "\"").c_str())) << layer;
+        withWires += chain != "5019\n";
+    }
+    EXPECT_GT(withWires, 3);
+    Chain numberCall(zvsdk::newString("getFiosPorLayer"));
+    numberCall.head->rbnext = zvsdk::newNode(zvsdk::RTSHORT);
+    EXPECT_EQ(lisp().lispInvoke(numberCall.head), nullptr);  // the LISP error: no answer
+}
+
 TEST(ConnectionChainTexts, NamesOutsideAsciiAreReadAsUtf8) {
     const std::string number =
         "F\xC3\x87"
@@ -153,6 +239,18 @@ TEST(ConnectionChainIndex, KeptForTheCablesRightAfterTheWiresAndLetGoAtAnyOtherC
     EXPECT_EQ(invoke("getConexoesTodosCabos"), cables);
     EXPECT_TRUE(answers->keepsIndex());
     EXPECT_EQ(invoke("getConexoesTodosFios"), wires);
+    EXPECT_FALSE(answers->keepsIndex());
+    // the same without chains, and a call of anything else lets the index go as well
+    Recorder viaWires, viaCables, again;
+    EXPECT_EQ(lisp.lispInvokeConnections("getConexoesTodosFios", viaWires), zvsdk::RTNORM);
+    EXPECT_TRUE(answers->keepsIndex());
+    EXPECT_EQ(lisp.lispInvokeConnections("getConexoesTodosCabos", viaCables), zvsdk::RTNORM);
+    EXPECT_FALSE(answers->keepsIndex());
+    EXPECT_EQ(viaWires.chainText(), wires);
+    EXPECT_EQ(viaCables.chainText(), cables);
+    EXPECT_EQ(lisp.lispInvokeConnections("getConexoesTodosFios", again), zvsdk::RTNORM);
+    EXPECT_TRUE(answers->keepsIndex());
+    invoke("getFiosPorLayer", "ESQ$0001$A");
     EXPECT_FALSE(answers->keepsIndex());
 }
 

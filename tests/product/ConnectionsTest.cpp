@@ -5,6 +5,11 @@
 #include "product/ConnectionFinder.h"
 #include "product/WireLayerIndex.h"
 
+#include "drawing/DxfLoader.h"
+#include "drawing/DxfWriter.h"
+
+#include <sstream>
+
 namespace zvproduct::testing {
 namespace {
 
@@ -187,6 +192,42 @@ TEST_F(ConnectionsTest, AWiresPolylinesAmongOtherWiresMakeOneEntryInPageOrder) {
     EXPECT_EQ(wires[0].touches[0].symbol, other->handle());
     EXPECT_EQ(wires[0].touches[0].point, (zvdb::Point3{200, 190, 0}));
     EXPECT_TRUE(wires[2].touches.empty());
+}
+
+// A drawing read from a file may hold a page's polylines out of their handles' order: the
+// wires still come by page, then by handle, and those off the pages last.
+TEST_F(ConnectionsTest, WiresByPageThenByHandleWhateverTheOrderOfTheDrawing) {
+    wire("OUTRO", {{0, 0, 0}, {10, 0, 0}}, "604");
+    wire("ESQ$0002$A", {{0, 0, 0}, {10, 0, 0}}, "603");
+    auto* a = wire("ESQ$0001$A", {{0, 0, 0}, {10, 0, 0}}, "601");
+    wire("ESQ$0001$A", {{0, 5, 0}, {10, 5, 0}}, "605");
+    auto* b = wire("ESQ$0001$A", {{0, 9, 0}, {10, 9, 0}}, "602");
+    EXPECT_EQ(show("(mapcar 'car (getConexoesTodosFios))"),
+              "(\"601\" \"605\" \"602\" \"603\" \"604\")");
+    // the file with the handles of 601 and 602 swapped: 602 now comes first on its page
+    std::vector<std::string> lines;
+    std::istringstream text(zvdb::DxfWriter::toText(*database));
+    for (std::string line; std::getline(text, line);)
+        lines.push_back(line);
+    int swapped = 0;
+    for (std::size_t i = 0; i + 1 < lines.size(); ++i) {
+        if (lines[i].find_first_not_of(' ') == std::string::npos ||
+            lines[i].substr(lines[i].find_first_not_of(' ')) != "5")
+            continue;
+        std::string& handle = lines[i + 1];
+        if (handle == hex(a) || handle == hex(b)) {
+            handle = handle == hex(a) ? hex(b) : hex(a);
+            ++swapped;
+        }
+    }
+    ASSERT_EQ(swapped, 2);
+    std::string swappedText;
+    for (const std::string& line : lines)
+        swappedText += line + "\n";
+    database = zvdb::DxfLoader::load(swappedText);
+    ASSERT_TRUE(database);
+    EXPECT_EQ(show("(mapcar 'car (getConexoesTodosFios))"),
+              "(\"602\" \"605\" \"601\" \"603\" \"604\")");
 }
 
 TEST_F(ConnectionsTest, PolylinesInPageOrderThenByHandleAndOffThePagesLast) {

@@ -1,9 +1,13 @@
 // The reader's maps from the connection answers: handle lists, full texts and points, from a
-// LISP function that a user's defun has replaced as much as from the product's own.
+// LISP function that a user's defun has replaced as much as from the product's own, whose
+// answers the host gives without their chains.
 #include "cad/CICad.h"
 #include "cad/FacadeFixture.h"
 #include "readers/CCBorneDataReader.h"
 #include "readers/LeitorBase.h"
+#include "readers/TabelaConexoes.h"
+#include "sample/ProjectGenerator.h"
+#include "sdk/NodeChains.h"
 
 namespace {
 
@@ -149,6 +153,86 @@ TEST_F(ConnectionLoadTest, FreedReadsForgetTheWiresAndALaterLoadFindsThemAgain) 
     EXPECT_EQ(leitor.PontoDaConexao("7", "1A").x, 0.0);
     leitor.CarregaConexoesFios();
     EXPECT_EQ(leitor.PontoDaConexao("7", "1A").z, 3.0);
+}
+
+// The wire numbers of an answer's chain, in its order: the texts that open its wires.
+QStringList NumerosDaCadeia(const zvsdk::ResultBuffer* cadeia) {
+    QStringList numeros;
+    int nivel = 0;
+    for (const zvsdk::ResultBuffer* no = cadeia; no; no = no->rbnext) {
+        if (no->restype == zvsdk::RTLB) ++nivel;
+        if (no->restype == zvsdk::RTLE) --nivel;
+        if (no->restype == zvsdk::RTSTR && nivel == 2) numeros << no->rstring;
+    }
+    return numeros;
+}
+
+// What the table holds of each number, in one text.
+std::string Conteudo(const TabelaConexoes& tabela, const QStringList& numeros) {
+    QString texto;
+    for (const QString& numero : numeros) {
+        const auto fio = tabela.DoFio(numero);
+        texto += numero + (fio ? ":\n" : " missing\n");
+        if (!fio) continue;
+        for (int i = 0; i < fio->elementos.size(); ++i) {
+            const CEPonto& p = fio->pontos[std::size_t(i)];
+            texto += QString(" %1 %2 %3 %4 %5\n")
+                         .arg(fio->elementos.value(i))
+                         .arg(fio->handles[std::size_t(i)])
+                         .arg(p.x, 0, 'g', 17)
+                         .arg(p.y, 0, 'g', 17)
+                         .arg(p.z, 0, 'g', 17);
+        }
+        for (int i = 0; i < fio->completas.size(); ++i)
+            texto += " = " + fio->completas.value(i) + "\n";
+    }
+    return texto.toStdString();
+}
+
+class ProductConnectionLoadTest : public ConnectionLoadTest {
+protected:
+    void SetUp() override {
+        ConnectionLoadTest::SetUp();
+        zvsample::ProjectGenerator gerador({3, 120, 6});
+        documento_ = app_->openDocument(arquivo("gerado.dxf"), gerador.generate());
+    }
+};
+
+// The wires then the cables, as a reader loads them, with and without the whole texts: the
+// same table from the chains as from the answers without them.
+TEST_F(ProductConnectionLoadTest, TheAnswersWithoutTheirChainsMakeTheSameTable) {
+    for (const bool completas : {true, false}) {
+        SCOPED_TRACE(completas);
+        TabelaConexoes semCadeia, pelaCadeia;
+        QStringList numeros;
+        for (const auto& [funcao, detalhes] :
+             {std::pair{"getConexoesTodosFios", true}, std::pair{"getConexoesTodosCabos", false}}) {
+            ASSERT_TRUE(semCadeia.CarregaSemCadeia(funcao, detalhes, completas)) << funcao;
+            zvsdk::ResultBuffer* cadeia = CICad::zvInvokeLista(funcao);
+            ASSERT_NE(cadeia, nullptr);
+            numeros << NumerosDaCadeia(cadeia);
+            pelaCadeia.Carrega(cadeia, detalhes, completas);
+            CICad::LiberaLista(cadeia);
+        }
+        EXPECT_GT(numeros.size(), 20);
+        EXPECT_EQ(semCadeia.Fios(), pelaCadeia.Fios());
+        const std::string esperado = Conteudo(pelaCadeia, numeros);
+        EXPECT_EQ(esperado.find("missing"), std::string::npos);
+        EXPECT_EQ(Conteudo(semCadeia, numeros), esperado);
+    }
+}
+
+// A user's function has no answer without a chain: the reader loads it from its chain.
+TEST_F(ProductConnectionLoadTest, AUsersFunctionIsLoadedFromItsChain) {
+    CICad::AvaliaLisp("(defun getConexoesTodosFios () '((\"7\" (\"1A#13#NA-1\" 1.0 2.0 3.0))))");
+    TabelaConexoes tabela;
+    EXPECT_FALSE(tabela.CarregaSemCadeia("getConexoesTodosFios", true, true));
+    EXPECT_EQ(tabela.Fios(), 0);
+    EXPECT_TRUE(tabela.CarregaSemCadeia("getConexoesTodosCabos", false, true));
+    EXPECT_GT(tabela.Fios(), 0);
+    LeitorBase leitor;
+    leitor.CarregaConexoesFios();
+    EXPECT_EQ(leitor.ListaConexoesCompletas("7")->ParaLista(), QStringList({"1A#13#NA-1"}));
 }
 
 }  // namespace

@@ -83,6 +83,24 @@ TEST_F(ConnectionQueriesTest, APointCatchesAWireWithinTheBusBarThicknessOnly) {
     EXPECT_TRUE(r->FioNoPonto("ESQ$0002$A", {50, 100, 0}).isNull());
 }
 
+// The layer's polylines as getFiosPorLayer gives them: one of another layer, a lone vertex
+// and what is no polyline are passed over, and the wires after them still found.
+TEST_F(ConnectionQueriesTest, APagesWiresAreOnlyItsPolylinesOfTwoVerticesOrMore) {
+    const zvdb::Polyline* outro = fio({{0, 100, 0}, {100, 100, 0}}, "1", "ESQ$0002$A");
+    const zvdb::Polyline* ponto = fio({{50, 100, 0}}, "2");
+    auto* ref = simbolo("NA-1", {50, 100, 0});
+    const zvdb::Polyline* w = fio({{0, 100, 0}, {100, 100, 0}}, "3");
+    const zvdb::Polyline* w2 = fio({{0, 200, 0}, {100, 200, 0}}, "4");
+    CICad::AvaliaLisp(QString("(defun getFiosPorLayer (layer) '(\"%1\" \"%2\" \"%3\" \"%4\" "
+                              "\"%5\"))")
+                          .arg(handle(outro), handle(ponto), handle(ref), handle(w), handle(w2)));
+    auto r = leitor(0.5);
+    const QString layer = QString::fromStdString(kPagina);
+    EXPECT_EQ(r->FioNoPonto(layer, {50, 100, 0}), id(w));
+    EXPECT_EQ(r->FioNoPonto(layer, {100, 200.2, 0}), id(w2));
+    EXPECT_TRUE(r->FioNoPonto(layer, {50, 150, 0}).isNull());
+}
+
 TEST_F(ConnectionQueriesTest, WithoutTheSymbolTheRadiusIsATenth) {
     const zvdb::Polyline* w = fio({{0, 100, 0}, {100, 100, 0}}, "1");
     auto r = leitor();
