@@ -29,12 +29,23 @@ void Conta(const QString& chave, int quantidade, QStringList& contados, QStringL
 
 }  // namespace
 
+const std::vector<std::pair<QString, int>>& CCDataReader::AcessoriosDoCatalogo(
+    const QString& chave) {
+    auto it = acessoriosCatalogo_.constFind(chave);
+    if (it != acessoriosCatalogo_.constEnd()) return *it;
+    std::vector<std::pair<QString, int>> pares;
+    for (const QString& texto : catalogo_.AcessoriosDe(chave)) {
+        const QStringList partes = texto.split('#');
+        pares.emplace_back(partes.value(0), ZVString(partes.value(1)).ParaInteiro());
+    }
+    return *acessoriosCatalogo_.insert(chave, std::move(pares));
+}
+
 VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaAtributos* atributos,
                                            CETemplate* modelo, QStringList caminho,
                                            const QString& normaDono) {
     Q_UNUSED(atributos);
     // Names as texts made once: this runs for every member of every listed material.
-    static const QString kAplicacao = QStringLiteral("ZV_VINC_ADITIVO");
     static const QString kRecursivo = QStringLiteral("PBLACERECUR");
     static const QString kRelacao = QStringLiteral("PBLACERELACAO");
     static const QString kAtributos = QStringLiteral("PBLADDATRIBACE");
@@ -47,7 +58,12 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
     };
     const OdDbObjectId primeiro = dono.ids.empty() ? OdDbObjectId() : dono.ids.front();
     QString norma = normaDono;
-    if (!primeiro.isNull()) {
+    // What the symbol's reading kept of it, or null: read here.
+    const AcessoriosLidos* lidos = primeiro.isNull() ? nullptr : AcessoriosGuardados(primeiro);
+    if (lidos) {
+        if (lidos->temChave) dono.definirCampo(campoChave, lidos->chave);
+        if (norma.isEmpty()) norma = lidos->norma;
+    } else if (!primeiro.isNull()) {
         QString chave, normaEntidade;
         if (ChaveENorma(primeiro, chave, normaEntidade)) dono.definirCampo(campoChave, chave);
         if (norma.isEmpty()) norma = normaEntidade;
@@ -57,16 +73,18 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
     caminho << chaveDono;
 
     QStringList contados, zerados;
-    for (const QString& texto : catalogo_.AcessoriosDe(chaveDono)) {
-        const QStringList partes = texto.split('#');
-        Conta(partes.value(0), ZVString(partes.value(1)).ParaInteiro(), contados, zerados);
-    }
+    for (const auto& [chave, quantidade] : AcessoriosDoCatalogo(chaveDono))
+        Conta(chave, quantidade, contados, zerados);
     if (!primeiro.isNull()) {
-        CICad::RegistraApp(kAplicacao, primeiro.database());
+        RegistraAppVinculos(primeiro.database());
         // Pairs of strings, quantity first; a string without its partner is left out.
         QStringList textos;
-        for (const CEItemXData& item : CICad::GetXData(primeiro, "ZV_VINC_ADITIVO"))
-            if (item.codigo == 1000) textos << item.texto;
+        if (lidos) {
+            textos = lidos->vinculos;
+        } else {
+            for (const CEItemXData& item : CICad::GetXData(primeiro, "ZV_VINC_ADITIVO"))
+                if (item.codigo == 1000) textos << item.texto;
+        }
         for (int i = 0; i + 1 < textos.size(); i += 2)
             Conta(textos[i + 1], ZVString(textos[i]).ParaInteiro(), contados, zerados);
     }

@@ -200,7 +200,7 @@ const CCDataReader::ConstantesBloco& CCDataReader::ConstantesDoBloco(const OdDbO
     return constantes;
 }
 
-void CCDataReader::JuntaLote(CEItemLista& item) {
+std::size_t CCDataReader::OrdenaLote() {
     // By name, and of one name the last written: sorted by name and place, the last of each
     // run of a name is kept.
     ordemLote_.clear();
@@ -211,6 +211,11 @@ void CCDataReader::JuntaLote(CEItemLista& item) {
     for (std::size_t i = 0; i < ordemLote_.size(); ++i)
         if (i + 1 == ordemLote_.size() || (ordemLote_[i + 1] >> 32) != (ordemLote_[i] >> 32))
             ordemLote_[n++] = ordemLote_[i];
+    return n;
+}
+
+void CCDataReader::JuntaLote(CEItemLista& item) {
+    const std::size_t n = OrdenaLote();
     item.campos.juntarOrdenados(
         n, [this](std::size_t j) { return std::uint32_t(ordemLote_[j] >> 32); },
         [this](std::size_t j) -> QString&& {
@@ -219,14 +224,64 @@ void CCDataReader::JuntaLote(CEItemLista& item) {
     lote_.clear();
 }
 
+bool CCDataReader::LeChaveDoSimbolo(const OdDbObjectId& referencia) {
+    // As ChaveDaEntidade tells it, from the walk of the extended data the reading makes.
+    return CICad::LeituraChaveSimbolo(referencia, simbolo_) && simbolo_.temTextoChave &&
+           !ChaveDoTexto(simbolo_.textoChave).chave.isEmpty();
+}
+
+void CCDataReader::GuardaAcessoriosDe(const OdDbObjectId& referencia, const ChaveLida& chave) {
+    const std::uint64_t versao = CICad::VersaoDesenho(referencia.database());
+    if (desenhoAcessorios_ != referencia.database() || versaoAcessorios_ != versao) {
+        acessoriosLidos_.limpa();
+        desenhoAcessorios_ = referencia.database();
+        versaoAcessorios_ = versao;
+    }
+    AcessoriosLidos lidos{simbolo_.temChave, chave.chave, chave.norma, {}};
+    for (const std::string_view texto : simbolo_.vinculos)
+        lidos.vinculos << Texto(texto);
+    acessoriosLidos_.insere(referencia, std::move(lidos));
+}
+
+const CCDataReader::AcessoriosLidos* CCDataReader::AcessoriosGuardados(
+    const OdDbObjectId& id) const {
+    if (acessoriosLidos_.empty() || desenhoAcessorios_ != id.database() ||
+        versaoAcessorios_ != CICad::VersaoDesenho(id.database()))
+        return nullptr;
+    return acessoriosLidos_.procura(id);
+}
+
+void CCDataReader::RegistraAppVinculos(zvdb::Database* database) {
+    const std::uint64_t antes = CICad::VersaoDesenho(database);
+    if (appVinculosEm_ == database && appVinculosVersao_ == antes) return;
+    CICad::RegistraApp(QStringLiteral("ZV_VINC_ADITIVO"), database);
+    const std::uint64_t depois = CICad::VersaoDesenho(database);
+    // A new application record changes no symbol: what was kept of them holds.
+    if (desenhoAcessorios_ == database && versaoAcessorios_ == antes) versaoAcessorios_ = depois;
+    appVinculosEm_ = database;
+    appVinculosVersao_ = depois;
+}
+
 void CCDataReader::LeBloco(const QString& s, CEItemLista& item, const OdDbObjectId& referencia,
                            CETemplate* modelo) {
     Q_UNUSED(modelo);
+    CICad::LeituraSimbolo(referencia, simbolo_);
+    LeSimboloLido(s, item, referencia);
+}
+
+void CCDataReader::LeSimboloLido(const QString& s, CEItemLista& item,
+                                 const OdDbObjectId& referencia) {
+    FazLote(s, item.campos, referencia);
+    JuntaLote(item);
+}
+
+void CCDataReader::FazLote(const QString& s, const CamposItem& campos,
+                           const OdDbObjectId& referencia) {
     // The names are numbered in the order the fields are written, as when each was set on
     // the item: the order of the fields in LISP depends on it.
-    CICad::LeituraSimbolo(referencia, simbolo_);
     const CESimboloLido& lido = simbolo_;
     const ChaveLida& chave = lido.temTextoChave ? ChaveDoTexto(lido.textoChave) : semChave_;
+    if (GuardaAcessorios) GuardaAcessoriosDe(referencia, chave);
     const CatalogoComp& catalogo =
         chave.catalogo ? *chave.catalogo : DadosCatalogoComp(chave.chave, chave.norma);
     chave.catalogo = &catalogo;
@@ -296,7 +351,7 @@ void CCDataReader::LeBloco(const QString& s, CEItemLista& item, const OdDbObject
     const QString* valorQtd = nullptr;
     for (auto it = lote_.rbegin(); it != lote_.rend() && !valorQtd; ++it)
         if (it->nome == qtd) valorQtd = &it->valor;
-    if (!valorQtd) valorQtd = item.campos.procura(qtd);
+    if (!valorQtd) valorQtd = campos.procura(qtd);
     if (!valorQtd || valorQtd->isEmpty()) poe(qtd, QStringLiteral("1"));
     poe(NumeroCampo<"SAP_MATERIAL">(s), catalogo.material);
     QString orientacao = QStringLiteral("0");
@@ -318,5 +373,4 @@ void CCDataReader::LeBloco(const QString& s, CEItemLista& item, const OdDbObject
         }
     }
     poe(NumeroCampo<"ORIENTACAO">(s), orientacao);
-    JuntaLote(item);
 }
