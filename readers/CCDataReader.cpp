@@ -959,7 +959,13 @@ CEItemLista* CCDataReader::CriaItemBloco(const OdDbObjectId& referencia, CETempl
 }
 
 CEItemLista* CCDataReader::CriaItemFio(const OdDbObjectId& polilinha, CETemplate& modelo) {
-    if (ChaveDaEntidade(polilinha).isEmpty()) return nullptr;
+    if (GuardaAcessorios) {
+        // What the accessories ask of the wire comes in the same walk as its key.
+        if (!LeChaveDoSimbolo(polilinha)) return nullptr;
+        GuardaAcessoriosDe(polilinha, ChaveDoTexto(simbolo_.textoChave));
+    } else if (ChaveDaEntidade(polilinha).isEmpty()) {
+        return nullptr;
+    }
     auto* item = new CEItemLista;
     item->ids.push_back(polilinha);
     if (FiosDasLeituras && GuardaFios && CICad::EhPolilinha(polilinha))

@@ -1,6 +1,7 @@
 // Accessories of a symbol: units as rows, zero rows, the symbol's own pairs, recursion and
 // its guard, and bad extended data.
 #include "ReaderFixture.h"
+#include "drawing/Polyline.h"
 #include "lists/TemplateDouble.h"
 #include "readers/CCMaterialDataReader.h"
 
@@ -117,6 +118,31 @@ TEST_F(AccessoriesTest, WhatASymbolsReadingKeptServesUntilTheDrawingChanges) {
     EXPECT_EQ(Textos(leitor.ExpandeAcessorios(*item, nullptr, &modelo, {}, QString())),
               QStringList({"Z0/1"}));
     EXPECT_EQ(item->valorCampo("ZV_KEY"), "SY");
+}
+
+TEST_F(AccessoriesTest, AWiresItemKeepsItsKeyAndAccessoriesFromTheWalkThatFoundItsKey) {
+    zvdb::Polyline* linha =
+        db().modelSpace()->addLwPolyline({{0, 0, 0}, {10, 0, 0}}, false, "ESQ$0001$A");
+    const OdDbObjectId fio = Id(linha);
+    CICad::SetXData(fio, "KVR_ZV_WIRE", {{1000, QString("SO") + QChar(0x0C) + "1"}});
+    CICad::SetXData(fio, "ZV_VINC_ADITIVO", {{1000, "3"}, {1000, "Z0"}});
+    LeitorQueGuarda leitor;
+    TemplateDouble modelo;
+    std::unique_ptr<CEItemLista> item(leitor.CriaItemFio(fio, modelo));
+    ASSERT_NE(item, nullptr);
+    item->definirCampo("ZV_KEY", "OUTRA");
+    EXPECT_EQ(Textos(leitor.ExpandeAcessorios(*item, nullptr, &modelo, {}, QString())),
+              QStringList({"Z0/1", "Z0/1", "Z0/1"}));
+    EXPECT_EQ(item->valorCampo("ZV_KEY"), "SO");
+    CICad::SetXData(fio, "ZV_VINC_ADITIVO", {{1000, "1"}, {1000, "SY"}});
+    EXPECT_EQ(Textos(leitor.ExpandeAcessorios(*item, nullptr, &modelo, {}, QString())),
+              QStringList({"SY/1"}));
+    // A polyline without a key, or with an empty key text, makes no item.
+    const OdDbObjectId semChave =
+        Id(db().modelSpace()->addLwPolyline({{0, 5, 0}, {10, 5, 0}}, false, "ESQ$0001$A"));
+    EXPECT_EQ(std::unique_ptr<CEItemLista>(leitor.CriaItemFio(semChave, modelo)), nullptr);
+    CICad::SetXData(semChave, "KVR_ZV_WIRE", {{1000, ""}});
+    EXPECT_EQ(std::unique_ptr<CEItemLista>(leitor.CriaItemFio(semChave, modelo)), nullptr);
 }
 
 TEST_F(AccessoriesTest, TheSymbolsAccessoryApplicationIsRegisteredByTheFirstExpansion) {
