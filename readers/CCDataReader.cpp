@@ -77,13 +77,14 @@ std::tuple<T...> Retira(T&... conteudos) {
 
 void CCDataReader::LiberaLeituras() {
     // Items share the texts of these; they keep theirs.
-    auto leituras = Retira(
-        circuitos_, conexoes_, fiosPorLayer_, indicesFios_, primeirosVertices_, rotas_,
-        rotasPorChave_, caminhos_, entidadesLidas_, entidadesAntigas_, avulsa_, leitura_,
-        nomesLidos_, formas_, numerosFios_, numerosCabos_, ligacoesPorElemento_, ligacoesAntigas_,
-        layers_, gruposPaginas_, textosTipo_, colunasDivididas_, catalogoComp_, constantes_,
-        ligacoesLidas_, chaves_, textosFio_, tags_, valores_, lote_, ordemLote_, basesAcessorio_,
-        basesColunas_, nomesFio_, textosNumero_, acessoriosLidos_, acessoriosCatalogo_);
+    auto leituras =
+        Retira(circuitos_, conexoes_, fiosPorLayer_, indicesFios_, primeirosVertices_, rotas_,
+               rotasPorChave_, caminhos_, entidadesLidas_, entidadesAntigas_, avulsa_, leitura_,
+               nomesLidos_, formas_, numerosFios_, numerosCabos_, ligacoesPorElemento_,
+               ligacoesAntigas_, layers_, gruposPaginas_, textosTipo_, colunasDivididas_,
+               catalogoComp_, constantes_, ligacoesLidas_, chaves_, textosFio_, tags_, valores_,
+               lote_, ordemLote_, basesAcessorio_, basesColunas_, nomesFio_, textosNumero_,
+               acessoriosLidos_, acessoriosCatalogo_, nomesLote_, ordensLote_);
     versaoIndices_ = 0;
     indiceAtual_ = nullptr;
     layerDoUltimo_ = nullptr;

@@ -431,6 +431,11 @@ private:
     CESimboloLido simbolo_;
     std::vector<CamposItem::Campo> lote_;
     std::vector<std::uint64_t> ordemLote_;
+    // OrdenaLote's answer by the batch's names in order of writing: the symbols of a kind
+    // write the same names, and their order is sorted out once.
+    std::vector<std::uint32_t> nomesLote_;
+    std::unordered_map<std::vector<std::uint32_t>, std::vector<std::uint64_t>, HashNomes>
+        ordensLote_;
     void JuntaLote(CEItemLista& item);
     // The places in `lote_` of the fields JuntaLote joins, sorted by name, in `ordemLote_`:
     // how many.

@@ -13,6 +13,8 @@ namespace {
 // Memories of texts seen in the drawing start over past this size: a drawing that makes up
 // texts keeps them bounded.
 constexpr std::size_t kMaxTextos = std::size_t(1) << 16;
+// The same for the orders of the symbols' batches, which are larger.
+constexpr std::size_t kMaxOrdens = 1024;
 
 const QLatin1String kPalavrasConexao[] = {QLatin1String("LIGACAO"), QLatin1String("CONNECTION"),
                                           QLatin1String("CONEXION")};
@@ -201,6 +203,13 @@ const CCDataReader::ConstantesBloco& CCDataReader::ConstantesDoBloco(const OdDbO
 }
 
 std::size_t CCDataReader::OrdenaLote() {
+    nomesLote_.clear();
+    for (const CamposItem::Campo& campo : lote_)
+        nomesLote_.push_back(campo.nome);
+    if (auto it = ordensLote_.find(nomesLote_); it != ordensLote_.end()) {
+        ordemLote_.assign(it->second.begin(), it->second.end());
+        return ordemLote_.size();
+    }
     // By name, and of one name the last written: sorted by name and place, the last of each
     // run of a name is kept.
     ordemLote_.clear();
@@ -211,6 +220,10 @@ std::size_t CCDataReader::OrdenaLote() {
     for (std::size_t i = 0; i < ordemLote_.size(); ++i)
         if (i + 1 == ordemLote_.size() || (ordemLote_[i + 1] >> 32) != (ordemLote_[i] >> 32))
             ordemLote_[n++] = ordemLote_[i];
+    ordemLote_.resize(n);
+    // A drawing of many kinds of symbols keeps this bounded.
+    if (ordensLote_.size() >= kMaxOrdens) ordensLote_.clear();
+    ordensLote_.emplace(nomesLote_, ordemLote_);
     return n;
 }
 
