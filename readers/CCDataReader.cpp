@@ -77,14 +77,13 @@ std::tuple<T...> Retira(T&... conteudos) {
 
 void CCDataReader::LiberaLeituras() {
     // Items share the texts of these; they keep theirs.
-    auto leituras =
-        Retira(circuitos_, conexoes_, fiosPorLayer_, indicesFios_, primeirosVertices_, rotas_,
-               rotasPorChave_, caminhos_, entidadesLidas_, entidadesAntigas_, avulsa_, leitura_,
-               nomesLidos_, formas_, numerosFios_, numerosCabos_, ligacoesPorElemento_,
-               ligacoesAntigas_, layers_, gruposPaginas_, textosTipo_, colunasDivididas_,
-               catalogoComp_, constantes_, ligacoesLidas_, chaves_, textosFio_, tags_, valores_,
-               lote_, ordemLote_, basesAcessorio_, basesColunas_, nomesFio_, textosNumero_,
-               acessoriosLidos_, acessoriosCatalogo_, nomesLote_, ordensLote_);
+    auto leituras = Retira(
+        circuitos_, conexoes_, fiosPorLayer_, indicesFios_, primeirosVertices_, rotas_,
+        rotasPorChave_, caminhos_, entidadesLidas_, entidadesAntigas_, avulsa_, leitura_,
+        nomesLidos_, formas_, numerosFios_, numerosCabos_, ligacoesPorElemento_, ligacoesAntigas_,
+        layers_, gruposPaginas_, textosTipo_, colunasDivididas_, catalogoComp_, constantes_,
+        ligacoesLidas_, chaves_, textosFio_, tags_, valores_, lote_, ordemLote_, basesAcessorio_,
+        nomesFio_, textosNumero_, acessoriosLidos_, acessoriosCatalogo_, nomesLote_, ordensLote_);
     versaoIndices_ = 0;
     indiceAtual_ = nullptr;
     layerDoUltimo_ = nullptr;
@@ -826,14 +825,18 @@ CCDataReader::EntidadeLida CCDataReader::LeEntidadeGuardada(const OdDbObjectId& 
     std::vector<std::uint32_t>& nomes = nomesLidos_;
     nomes.clear();
     bool marcada = false;
+    FormaCampos** formaDaOrdem = nullptr;
     if (CICad::EhReferencia(id)) {
         // The symbol's fields go from the batch into the kept form, with no item between.
         lido.definirCampo(qtd, kMarca);
         CICad::LeituraSimbolo(id, simbolo_);
         FazLote(QString(), lido.campos, id);
         lida.borne = EhBlocoDeBorne(simbolo_.bloco);
-        marcada = TiraLote(qtd, kMarca, nomes, lida.valores);
+        OrdemLote& ordem = OrdenaLote();
+        marcada = TiraLote(ordem.ordem, qtd, kMarca, nomes, lida.valores);
         lida.qtdPadrao = marcada;
+        // Unless its QTD was the mark, the batch keeps every name: the form is the order's.
+        if (nomes.size() == ordem.ordem.size()) formaDaOrdem = &ordem.forma;
     } else {
         bool completa = false;
         if (CICad::EhPolilinha(id)) {
@@ -856,23 +859,29 @@ CCDataReader::EntidadeLida CCDataReader::LeEntidadeGuardada(const OdDbObjectId& 
         lido.campos.reaproveitar(std::move(campos));
     }
     if (lida.qtdPadrao) lida.valores.push_back(QStringLiteral("1"));
+    if (formaDaOrdem && *formaDaOrdem) {
+        lida.forma = *formaDaOrdem;
+        return lida;
+    }
     auto forma = formas_.find(nomes);
     if (forma == formas_.end())
         forma = formas_.emplace(nomes, std::make_unique<FormaCampos>(FormaCampos{nomes, {}})).first;
     lida.forma = forma->second.get();
+    if (formaDaOrdem) *formaDaOrdem = lida.forma;
     return lida;
 }
 
-bool CCDataReader::TiraLote(std::uint32_t qtd, const QString& marca,
-                            std::vector<std::uint32_t>& nomes, std::vector<QString>& valores) {
+bool CCDataReader::TiraLote(const std::vector<std::uint64_t>& ordem, std::uint32_t qtd,
+                            const QString& marca, std::vector<std::uint32_t>& nomes,
+                            std::vector<QString>& valores) {
     // As the batch joined to an item holding the mark alone, and that item's fields taken
     // out: the mark stays unless the batch has a QTD.
-    const std::size_t n = OrdenaLote();
+    const std::size_t n = ordem.size();
     valores.reserve(n + 1);
     bool temQtd = false, marcada = false;
     for (std::size_t j = 0; j < n; ++j) {
-        const std::uint32_t nome = std::uint32_t(ordemLote_[j] >> 32);
-        QString& valor = lote_[std::uint32_t(ordemLote_[j])].valor;
+        const std::uint32_t nome = std::uint32_t(ordem[j] >> 32);
+        QString& valor = lote_[std::uint32_t(ordem[j])].valor;
         if (nome == qtd) {
             temQtd = true;
             if (valor == marca) {

@@ -432,18 +432,23 @@ private:
     std::vector<CamposItem::Campo> lote_;
     std::vector<std::uint64_t> ordemLote_;
     // OrdenaLote's answer by the batch's names in order of writing: the symbols of a kind
-    // write the same names, and their order is sorted out once.
+    // write the same names, and their order is sorted out once; with the kept form of a batch
+    // of those names once LeEntidadeGuardada found it (null before, and for a batch whose QTD
+    // was its mark).
+    struct OrdemLote {
+        std::vector<std::uint64_t> ordem;
+        FormaCampos* forma = nullptr;
+    };
     std::vector<std::uint32_t> nomesLote_;
-    std::unordered_map<std::vector<std::uint32_t>, std::vector<std::uint64_t>, HashNomes>
-        ordensLote_;
+    std::unordered_map<std::vector<std::uint32_t>, OrdemLote, HashNomes> ordensLote_;
     void JuntaLote(CEItemLista& item);
-    // The places in `lote_` of the fields JuntaLote joins, sorted by name, in `ordemLote_`:
-    // how many.
-    std::size_t OrdenaLote();
+    // The places in `lote_` of the fields JuntaLote joins, sorted by name (the name in the
+    // high half): the entry of the batch's names, valid until the next call.
+    OrdemLote& OrdenaLote();
     // The batch's fields in name order into `nomes` and `valores`, as LeEntidadeGuardada keeps
     // them, but for a QTD of `marca`: whether the batch has no QTD but that.
-    bool TiraLote(std::uint32_t qtd, const QString& marca, std::vector<std::uint32_t>& nomes,
-                  std::vector<QString>& valores);
+    bool TiraLote(const std::vector<std::uint64_t>& ordem, std::uint32_t qtd, const QString& marca,
+                  std::vector<std::uint32_t>& nomes, std::vector<QString>& valores);
     // The fields of the symbol read into `simbolo_` under the suffix, into `lote_`; `campos`:
     // the item's so far, for its QTD.
     void FazLote(const QString& s, const CamposItem& campos, const OdDbObjectId& referencia);
@@ -474,7 +479,10 @@ private:
     QHash<QString, std::vector<std::pair<QString, int>>> acessoriosCatalogo_;
     const std::vector<std::pair<QString, int>>& AcessoriosDoCatalogo(const QString& chave);
     // Per accessory key and standard: the fields of a unit, and its user columns.
-    QHash<QString, CEItemLista> basesAcessorio_, basesColunas_;
+    struct BaseAcessorio {
+        CEItemLista item, colunas;
+    };
+    std::unordered_map<std::pair<QString, QString>, BaseAcessorio, HashPar> basesAcessorio_;
     CECacheCatalogo catalogo_;
     double tolerancia_;
 };

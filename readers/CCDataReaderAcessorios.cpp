@@ -96,10 +96,8 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
         const CEItemLista* colunas;
     };
     auto base = [&](const QString& chave) -> Base {
-        const QString nome = chave + QChar(0x1F) + norma;
-        auto it = basesAcessorio_.constFind(nome);
-        if (it != basesAcessorio_.constEnd())
-            return {&it.value(), &basesColunas_.constFind(nome).value()};
+        auto it = basesAcessorio_.find({chave, norma});
+        if (it != basesAcessorio_.end()) return {&it->second.item, &it->second.colunas};
         CEItemLista item;
         item.definirCampo("ZV_LISTA_TIPO", "ACE");
         item.definirCampo("ZV_LISTA", catalogo_.ListaComp(chave, norma));
@@ -109,8 +107,11 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
         item.definirCampo("TP_DESCRI", descricao);
         CEItemLista colunas;
         LeColunasUsuario(QString(), colunas, catalogo_.ColunasComp(chave));
-        const auto novo = basesAcessorio_.insert(nome, item);
-        return {&novo.value(), &basesColunas_.insert(nome, colunas).value()};
+        BaseAcessorio& nova = basesAcessorio_
+                                  .emplace(std::pair(chave, norma),
+                                           BaseAcessorio{std::move(item), std::move(colunas)})
+                                  .first->second;
+        return {&nova.item, &nova.colunas};
     };
 
     VetorItens resultado;

@@ -202,14 +202,11 @@ const CCDataReader::ConstantesBloco& CCDataReader::ConstantesDoBloco(const OdDbO
     return constantes;
 }
 
-std::size_t CCDataReader::OrdenaLote() {
+CCDataReader::OrdemLote& CCDataReader::OrdenaLote() {
     nomesLote_.clear();
     for (const CamposItem::Campo& campo : lote_)
         nomesLote_.push_back(campo.nome);
-    if (auto it = ordensLote_.find(nomesLote_); it != ordensLote_.end()) {
-        ordemLote_.assign(it->second.begin(), it->second.end());
-        return ordemLote_.size();
-    }
+    if (auto it = ordensLote_.find(nomesLote_); it != ordensLote_.end()) return it->second;
     // By name, and of one name the last written: sorted by name and place, the last of each
     // run of a name is kept.
     ordemLote_.clear();
@@ -220,19 +217,19 @@ std::size_t CCDataReader::OrdenaLote() {
     for (std::size_t i = 0; i < ordemLote_.size(); ++i)
         if (i + 1 == ordemLote_.size() || (ordemLote_[i + 1] >> 32) != (ordemLote_[i] >> 32))
             ordemLote_[n++] = ordemLote_[i];
-    ordemLote_.resize(n);
     // A drawing of many kinds of symbols keeps this bounded.
     if (ordensLote_.size() >= kMaxOrdens) ordensLote_.clear();
-    ordensLote_.emplace(nomesLote_, ordemLote_);
-    return n;
+    OrdemLote nova;
+    nova.ordem.assign(ordemLote_.begin(), ordemLote_.begin() + std::ptrdiff_t(n));
+    return ordensLote_.emplace(nomesLote_, std::move(nova)).first->second;
 }
 
 void CCDataReader::JuntaLote(CEItemLista& item) {
-    const std::size_t n = OrdenaLote();
+    const std::vector<std::uint64_t>& ordem = OrdenaLote().ordem;
     item.campos.juntarOrdenados(
-        n, [this](std::size_t j) { return std::uint32_t(ordemLote_[j] >> 32); },
-        [this](std::size_t j) -> QString&& {
-            return std::move(lote_[std::uint32_t(ordemLote_[j])].valor);
+        ordem.size(), [&ordem](std::size_t j) { return std::uint32_t(ordem[j] >> 32); },
+        [this, &ordem](std::size_t j) -> QString&& {
+            return std::move(lote_[std::uint32_t(ordem[j])].valor);
         });
     lote_.clear();
 }
