@@ -481,7 +481,12 @@ private:
     // Per accessory key and standard: the fields of a unit, and its user columns.
     struct BaseAcessorio {
         CEItemLista item, colunas;
+        // The fields of a unit with nothing of its owner's, by the unit's quantity.
+        std::vector<std::pair<QString, CamposItem>> unidades;
     };
+    // The fields of a unit of the base with nothing of its owner's: the base's, the quantity
+    // and the user columns, joined once per quantity.
+    const CamposItem& CamposDaUnidade(BaseAcessorio& base, const QString& qtd);
     std::unordered_map<std::pair<QString, QString>, BaseAcessorio, HashPar> basesAcessorio_;
     CECacheCatalogo catalogo_;
     double tolerancia_;

@@ -41,6 +41,19 @@ const std::vector<std::pair<QString, int>>& CCDataReader::AcessoriosDoCatalogo(
     return *acessoriosCatalogo_.insert(chave, std::move(pares));
 }
 
+const CamposItem& CCDataReader::CamposDaUnidade(BaseAcessorio& base, const QString& qtd) {
+    for (const auto& [quantidade, campos] : base.unidades)
+        if (quantidade == qtd) return campos;
+    // Owners of many quantities keep this bounded: the oldest goes.
+    constexpr std::size_t kMaxUnidades = 16;
+    if (base.unidades.size() >= kMaxUnidades) base.unidades.erase(base.unidades.begin());
+    CEItemLista unidade;
+    unidade.campos = base.item.campos;
+    unidade.definirCampo(NumeroCampo<"QTD">(), qtd);
+    unidade.copiarCampos(base.colunas);
+    return base.unidades.emplace_back(qtd, std::move(unidade.campos)).second;
+}
+
 VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaAtributos* atributos,
                                            CETemplate* modelo, QStringList caminho,
                                            const QString& normaDono) {
@@ -91,13 +104,9 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
 
     // The fields every unit of an accessory key starts with, made once per key and standard
     // and shared by the units' copies until one of them changes; with the user columns.
-    struct Base {
-        const CEItemLista* item;
-        const CEItemLista* colunas;
-    };
-    auto base = [&](const QString& chave) -> Base {
+    auto base = [&](const QString& chave) -> BaseAcessorio& {
         auto it = basesAcessorio_.find({chave, norma});
-        if (it != basesAcessorio_.end()) return {&it->second.item, &it->second.colunas};
+        if (it != basesAcessorio_.end()) return it->second;
         CEItemLista item;
         item.definirCampo("ZV_LISTA_TIPO", "ACE");
         item.definirCampo("ZV_LISTA", catalogo_.ListaComp(chave, norma));
@@ -107,11 +116,10 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
         item.definirCampo("TP_DESCRI", descricao);
         CEItemLista colunas;
         LeColunasUsuario(QString(), colunas, catalogo_.ColunasComp(chave));
-        BaseAcessorio& nova = basesAcessorio_
-                                  .emplace(std::pair(chave, norma),
-                                           BaseAcessorio{std::move(item), std::move(colunas)})
-                                  .first->second;
-        return {&nova.item, &nova.colunas};
+        return basesAcessorio_
+            .emplace(std::pair(chave, norma),
+                     BaseAcessorio{std::move(item), std::move(colunas), {}})
+            .first->second;
     };
 
     VetorItens resultado;
@@ -137,13 +145,14 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
                     if (dono.obterCampo(nome, valor)) item->definirCampo(nome, valor);
                 }
         }
-        const Base b = base(chave);
-        if (item->campos.isEmpty())
-            item->campos = b.item->campos;
-        else
-            item->copiarCampos(*b.item);
-        item->definirCampo(campoQtd, qtd);
-        item->copiarCampos(*b.colunas);
+        BaseAcessorio& b = base(chave);
+        if (item->campos.isEmpty()) {
+            item->campos = CamposDaUnidade(b, qtd);
+        } else {
+            item->copiarCampos(b.item);
+            item->definirCampo(campoQtd, qtd);
+            item->copiarCampos(b.colunas);
+        }
         const bool listado = estaListado(*item);
         if (listado && modelo && !modelo->FiltraItem(*item)) {
             delete item;
@@ -160,10 +169,10 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
     }
     for (const QString& chave : zerados) {
         if (contados.contains(chave)) continue;
-        const Base b = base(chave);
-        auto* item = new CEItemLista(*b.item);
+        const BaseAcessorio& b = base(chave);
+        auto* item = new CEItemLista(b.item);
         item->definirCampo(campoQtd, QStringLiteral("0"));
-        item->copiarCampos(*b.colunas);
+        item->copiarCampos(b.colunas);
         if (estaListado(*item) && (!modelo || modelo->FiltraItem(*item)))
             resultado.push_back(item);
         else

@@ -145,6 +145,26 @@ TEST_F(AccessoriesTest, AWiresItemKeepsItsKeyAndAccessoriesFromTheWalkThatFoundI
     EXPECT_EQ(std::unique_ptr<CEItemLista>(leitor.CriaItemFio(semChave, modelo)), nullptr);
 }
 
+TEST_F(AccessoriesTest, EveryUnitHasItsOwnersQuantityWhateverOwnersCameBefore) {
+    const OdDbObjectId id = Simbolo("K", "A1", "ESQ$0001$A");
+    CCMaterialDataReader leitor;
+    TemplateDouble modelo;
+    // More quantities than a base keeps, and some of them again.
+    QStringList quantidades = {"2", "5", "2", "", "5"};
+    for (int q = 10; q < 30; ++q)
+        quantidades << QString::number(q);
+    quantidades << "2"
+                << "11"
+                << "29";
+    for (const QString& qtd : quantidades) {
+        CEItemLista dono = Dono(id, qtd);
+        const QString q = qtd.isEmpty() ? "1" : qtd;
+        EXPECT_EQ(Textos(leitor.ExpandeAcessorios(dono, nullptr, &modelo, {}, QString())),
+                  QStringList({"B3/" + q, "B3/" + q, "B3/" + q, "Z0/" + q, "Z0/" + q}))
+            << qtd.toStdString();
+    }
+}
+
 TEST_F(AccessoriesTest, TheSymbolsAccessoryApplicationIsRegisteredByTheFirstExpansion) {
     const OdDbObjectId id = Simbolo("K", "A1", "ESQ$0001$A");
     const OdDbObjectId outro = Simbolo("K", "SO", "ESQ$0001$A", {}, 10);
