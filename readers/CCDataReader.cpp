@@ -92,6 +92,7 @@ void CCDataReader::LiberaLeituras() {
     versaoLidas_ = 0;
     atributosDe_ = OdDbObjectId();
     desenhoAcessorios_ = appVinculosEm_ = nullptr;
+    appVinculosVersao_ = ~std::uint64_t(0);
     // It points into the catalogue answers just taken.
     semChave_.Esquece();
     // The module's commands go on while another thread frees them; elsewhere they go now.

@@ -23,6 +23,11 @@ QString Texto(std::string_view texto) {
     return QString::fromUtf8(texto.data(), int(texto.size()));
 }
 
+// The drawing an object is of: the facade's default one for an object that names none.
+const void* DesenhoDe(zvdb::Database* database) {
+    return database ? database : CICad::GetDatabase();
+}
+
 template <class Mapa>
 void Limita(Mapa& mapa) {
     if (mapa.size() >= kMaxTextos) mapa.clear();
@@ -242,9 +247,10 @@ bool CCDataReader::LeChaveDoSimbolo(const OdDbObjectId& referencia) {
 
 void CCDataReader::GuardaAcessoriosDe(const OdDbObjectId& referencia, const ChaveLida& chave) {
     const std::uint64_t versao = CICad::VersaoDesenho(referencia.database());
-    if (desenhoAcessorios_ != referencia.database() || versaoAcessorios_ != versao) {
+    const void* desenho = DesenhoDe(referencia.database());
+    if (desenhoAcessorios_ != desenho || versaoAcessorios_ != versao) {
         acessoriosLidos_.limpa();
-        desenhoAcessorios_ = referencia.database();
+        desenhoAcessorios_ = desenho;
         versaoAcessorios_ = versao;
     }
     AcessoriosLidos lidos{simbolo_.temChave, chave.chave, chave.norma, {}};
@@ -255,7 +261,7 @@ void CCDataReader::GuardaAcessoriosDe(const OdDbObjectId& referencia, const Chav
 
 const CCDataReader::AcessoriosLidos* CCDataReader::AcessoriosGuardados(
     const OdDbObjectId& id) const {
-    if (acessoriosLidos_.empty() || desenhoAcessorios_ != id.database() ||
+    if (acessoriosLidos_.empty() || desenhoAcessorios_ != DesenhoDe(id.database()) ||
         versaoAcessorios_ != CICad::VersaoDesenho(id.database()))
         return nullptr;
     return acessoriosLidos_.procura(id);
@@ -263,12 +269,13 @@ const CCDataReader::AcessoriosLidos* CCDataReader::AcessoriosGuardados(
 
 void CCDataReader::RegistraAppVinculos(zvdb::Database* database) {
     const std::uint64_t antes = CICad::VersaoDesenho(database);
-    if (appVinculosEm_ == database && appVinculosVersao_ == antes) return;
+    const void* desenho = DesenhoDe(database);
+    if (appVinculosEm_ == desenho && appVinculosVersao_ == antes) return;
     CICad::RegistraApp(QStringLiteral("ZV_VINC_ADITIVO"), database);
     const std::uint64_t depois = CICad::VersaoDesenho(database);
     // A new application record changes no symbol: what was kept of them holds.
-    if (desenhoAcessorios_ == database && versaoAcessorios_ == antes) versaoAcessorios_ = depois;
-    appVinculosEm_ = database;
+    if (desenhoAcessorios_ == desenho && versaoAcessorios_ == antes) versaoAcessorios_ = depois;
+    appVinculosEm_ = desenho;
     appVinculosVersao_ = depois;
 }
 
