@@ -59,6 +59,8 @@ struct CESimboloLido {
     bool temChave = false, temTextoChave = false;
     std::string_view textoChave;
     bool temLayout = false;  // items of KVR_LAYOUT_ESQUEMA
+    // The text items (code 1000) of ZV_VINC_ADITIVO, the symbol's own accessories.
+    std::vector<std::string_view> vinculos;
     // The local circuit, as GetCircuitoLocal answers it.
     bool temCircuito = false;
     int circuito = 1;
@@ -304,6 +306,11 @@ public:
     // A symbol's attributes, names, position, key text and local circuit in one visit;
     // false (and `lido` emptied) for what is no entity.
     static bool LeituraSimbolo(const OdDbObjectId& entidade, CESimboloLido& lido);
+    // The same in two steps: the extended data first (key text, layout, accessories), false
+    // when there is no such object; then the rest, for a symbol whose key is wanted. A reader
+    // that drops symbols without a key reads no more of them than their key.
+    static bool LeituraChaveSimbolo(const OdDbObjectId& entidade, CESimboloLido& lido);
+    static bool CompletaLeituraSimbolo(const OdDbObjectId& entidade, CESimboloLido& lido);
     // The key text alone, as LeituraSimbolo reads it: false when none of the key applications
     // has items.
     static bool TextoChave(const OdDbObjectId& entidade, std::string_view& texto, bool& temTexto);

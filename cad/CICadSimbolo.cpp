@@ -14,9 +14,10 @@ using namespace cicad;
 namespace {
 
 // The applications a symbol's reading looks at, found in one walk of its extended data.
-enum Aplicacao { kZv, kZvWire, kZvCabo, kLayout, kCircuito, kAplicacoes };
+enum Aplicacao { kZv, kZvWire, kZvCabo, kLayout, kCircuito, kVinculos, kAplicacoes };
 constexpr std::array<std::string_view, kAplicacoes> kNomes = {
-    "KVR_ZV", "KVR_ZV_WIRE", "KVR_ZV_CABO", "KVR_LAYOUT_ESQUEMA", "KVR_ZV_CIRCLOC"};
+    "KVR_ZV",         "KVR_ZV_WIRE",    "KVR_ZV_CABO", "KVR_LAYOUT_ESQUEMA",
+    "KVR_ZV_CIRCLOC", "ZV_VINC_ADITIVO"};
 
 // The items of the first group of each application, as DbObject::xdataItems gives them.
 std::array<std::span<const zvdb::Tag>, kAplicacoes> Grupos(const zvdb::DbObject& objeto) {
@@ -56,8 +57,13 @@ bool CICad::AtributoInvisivel(const OdDbObjectId& atributo) {
 }
 
 bool CICad::LeituraSimbolo(const OdDbObjectId& entidade, CESimboloLido& lido) {
+    return LeituraChaveSimbolo(entidade, lido) && CompletaLeituraSimbolo(entidade, lido);
+}
+
+bool CICad::LeituraChaveSimbolo(const OdDbObjectId& entidade, CESimboloLido& lido) {
     lido.referencia = false;
     lido.atributos.clear();
+    lido.vinculos.clear();
     lido.bloco = lido.layer = lido.textoChave = {};
     lido.posicao = {};
     lido.temChave = lido.temTextoChave = lido.temLayout = lido.temCircuito = false;
@@ -67,14 +73,22 @@ bool CICad::LeituraSimbolo(const OdDbObjectId& entidade, CESimboloLido& lido) {
     const auto grupos = Grupos(*objeto);
     lido.temChave = Chave(grupos, lido.textoChave, lido.temTextoChave);
     lido.temLayout = !grupos[kLayout].empty();
+    for (const zvdb::Tag& item : grupos[kVinculos])
+        if (item.code == 1000) lido.vinculos.push_back(item.value);
     if (!grupos[kZv].empty()) {
         // A symbol with its own key data is its own master: its circuit is on it.
         const std::span<const zvdb::Tag> circuito = grupos[kCircuito];
         lido.temCircuito = true;
         lido.circuito = circuito.empty() ? 1 : Q(circuito.front().value).toInt();
-    } else {
-        lido.temCircuito = GetCircuitoLocal(entidade, lido.circuito);
     }
+    return true;
+}
+
+bool CICad::CompletaLeituraSimbolo(const OdDbObjectId& entidade, CESimboloLido& lido) {
+    zvdb::DbObject* objeto = Objeto(entidade);
+    if (!objeto) return false;
+    // Without key data of its own the circuit is its master's.
+    if (!lido.temCircuito) lido.temCircuito = GetCircuitoLocal(entidade, lido.circuito);
     auto* entidadeDesenho = Classe<zvdb::Entity>(objeto);
     if (!entidadeDesenho) return true;
     auto* ref = Classe<zvdb::BlockReference>(entidadeDesenho);

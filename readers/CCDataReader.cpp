@@ -77,13 +77,13 @@ std::tuple<T...> Retira(T&... conteudos) {
 
 void CCDataReader::LiberaLeituras() {
     // Items share the texts of these; they keep theirs.
-    auto leituras =
-        Retira(circuitos_, conexoes_, fiosPorLayer_, indicesFios_, primeirosVertices_, rotas_,
-               rotasPorChave_, caminhos_, entidadesLidas_, entidadesAntigas_, avulsa_, leitura_,
-               nomesLidos_, formas_, numerosFios_, numerosCabos_, ligacoesPorElemento_,
-               ligacoesAntigas_, layers_, gruposPaginas_, textosTipo_, colunasDivididas_,
-               catalogoComp_, constantes_, ligacoesLidas_, chaves_, textosFio_, tags_, valores_,
-               lote_, ordemLote_, basesAcessorio_, basesColunas_, nomesFio_, textosNumero_);
+    auto leituras = Retira(
+        circuitos_, conexoes_, fiosPorLayer_, indicesFios_, primeirosVertices_, rotas_,
+        rotasPorChave_, caminhos_, entidadesLidas_, entidadesAntigas_, avulsa_, leitura_,
+        nomesLidos_, formas_, numerosFios_, numerosCabos_, ligacoesPorElemento_, ligacoesAntigas_,
+        layers_, gruposPaginas_, textosTipo_, colunasDivididas_, catalogoComp_, constantes_,
+        ligacoesLidas_, chaves_, textosFio_, tags_, valores_, lote_, ordemLote_, basesAcessorio_,
+        nomesFio_, textosNumero_, acessoriosLidos_, acessoriosCatalogo_, nomesLote_, ordensLote_);
     versaoIndices_ = 0;
     indiceAtual_ = nullptr;
     layerDoUltimo_ = nullptr;
@@ -91,6 +91,8 @@ void CCDataReader::LiberaLeituras() {
     corteDe_ = OdDbObjectId();
     versaoLidas_ = 0;
     atributosDe_ = OdDbObjectId();
+    desenhoAcessorios_ = appVinculosEm_ = nullptr;
+    appVinculosVersao_ = ~std::uint64_t(0);
     // It points into the catalogue answers just taken.
     semChave_.Esquece();
     // The module's commands go on while another thread frees them; elsewhere they go now.
@@ -818,45 +820,85 @@ CCDataReader::FormaCampos::ComSufixo& CCDataReader::FormaCampos::Com(const QStri
 
 CCDataReader::EntidadeLida CCDataReader::LeEntidadeGuardada(const OdDbObjectId& id,
                                                             CETemplate* modelo) {
+    Q_UNUSED(modelo);
     // A QTD of the entity's own replaces this mark; without one the mark stays.
     static const QString kMarca = QStringLiteral("\x01");
     const std::uint32_t qtd = NumeroCampo<"QTD">();
     CEItemLista& lido = leitura_;
     lido.campos.clear();
     EntidadeLida lida;
-    bool completa = false;
-    if (CICad::EhReferencia(id)) {
-        lido.definirCampo(qtd, kMarca);
-        LeBloco(QString(), lido, id, modelo);
-        completa = true;
-        lida.borne = EhBlocoDeBorne(simbolo_.bloco);
-    } else if (CICad::EhPolilinha(id)) {
-        lido.definirCampo(qtd, kMarca);
-        completa = lida.rotas = LeCamposFio(QString(), lido, id);
-        lida.fio = true;
-    }
-    // The reading is made apart: its values move into the kept form, none is copied.
-    std::vector<CamposItem::Campo> campos = lido.campos.retirar();
-    bool marcada = false;
     std::vector<std::uint32_t>& nomes = nomesLidos_;
     nomes.clear();
-    lida.valores.reserve(campos.size() + 1);
-    for (CamposItem::Campo& campo : campos) {
-        if (campo.nome == qtd && campo.valor == kMarca) {
-            marcada = true;
-            continue;
+    bool marcada = false;
+    FormaCampos** formaDaOrdem = nullptr;
+    if (CICad::EhReferencia(id)) {
+        // The symbol's fields go from the batch into the kept form, with no item between.
+        lido.definirCampo(qtd, kMarca);
+        CICad::LeituraSimbolo(id, simbolo_);
+        FazLote(QString(), lido.campos, id);
+        lida.borne = EhBlocoDeBorne(simbolo_.bloco);
+        OrdemLote& ordem = OrdenaLote();
+        marcada = TiraLote(ordem.ordem, qtd, kMarca, nomes, lida.valores);
+        lida.qtdPadrao = marcada;
+        // Unless its QTD was the mark, the batch keeps every name: the form is the order's.
+        if (nomes.size() == ordem.ordem.size()) formaDaOrdem = &ordem.forma;
+    } else {
+        bool completa = false;
+        if (CICad::EhPolilinha(id)) {
+            lido.definirCampo(qtd, kMarca);
+            completa = lida.rotas = LeCamposFio(QString(), lido, id);
+            lida.fio = true;
         }
-        nomes.push_back(campo.nome);
-        lida.valores.push_back(std::move(campo.valor));
+        // The reading is made apart: its values move into the kept form, none is copied.
+        std::vector<CamposItem::Campo> campos = lido.campos.retirar();
+        lida.valores.reserve(campos.size() + 1);
+        for (CamposItem::Campo& campo : campos) {
+            if (campo.nome == qtd && campo.valor == kMarca) {
+                marcada = true;
+                continue;
+            }
+            nomes.push_back(campo.nome);
+            lida.valores.push_back(std::move(campo.valor));
+        }
+        lida.qtdPadrao = marcada && completa;
+        lido.campos.reaproveitar(std::move(campos));
     }
-    lida.qtdPadrao = marcada && completa;
     if (lida.qtdPadrao) lida.valores.push_back(QStringLiteral("1"));
+    if (formaDaOrdem && *formaDaOrdem) {
+        lida.forma = *formaDaOrdem;
+        return lida;
+    }
     auto forma = formas_.find(nomes);
     if (forma == formas_.end())
         forma = formas_.emplace(nomes, std::make_unique<FormaCampos>(FormaCampos{nomes, {}})).first;
     lida.forma = forma->second.get();
-    lido.campos.reaproveitar(std::move(campos));
+    if (formaDaOrdem) *formaDaOrdem = lida.forma;
     return lida;
+}
+
+bool CCDataReader::TiraLote(const std::vector<std::uint64_t>& ordem, std::uint32_t qtd,
+                            const QString& marca, std::vector<std::uint32_t>& nomes,
+                            std::vector<QString>& valores) {
+    // As the batch joined to an item holding the mark alone, and that item's fields taken
+    // out: the mark stays unless the batch has a QTD.
+    const std::size_t n = ordem.size();
+    valores.reserve(n + 1);
+    bool temQtd = false, marcada = false;
+    for (std::size_t j = 0; j < n; ++j) {
+        const std::uint32_t nome = std::uint32_t(ordem[j] >> 32);
+        QString& valor = lote_[std::uint32_t(ordem[j])].valor;
+        if (nome == qtd) {
+            temQtd = true;
+            if (valor == marca) {
+                marcada = true;
+                continue;
+            }
+        }
+        nomes.push_back(nome);
+        valores.push_back(std::move(valor));
+    }
+    lote_.clear();
+    return marcada || !temQtd;
 }
 
 const CCDataReader::EntidadeLida& CCDataReader::EntidadeGuardada(const OdDbObjectId& id,
@@ -913,21 +955,32 @@ void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const
 }
 
 CEItemLista* CCDataReader::CriaItemBloco(const OdDbObjectId& referencia, CETemplate& modelo) {
-    if (ChaveDaEntidade(referencia).isEmpty()) return nullptr;
+    // A symbol read here is read once: its key is told by the first part of the reading.
+    const bool copia = GuardaSimbolos && CICad::EhReferencia(referencia);
+    if (copia ? ChaveDaEntidade(referencia).isEmpty() : !LeChaveDoSimbolo(referencia))
+        return nullptr;
     auto* item = new CEItemLista;
     item->ids.push_back(referencia);
     if (CamposPrevistos) item->campos.reservar(CamposPrevistos);
-    if (GuardaSimbolos && CICad::EhReferencia(referencia))
+    if (copia) {
         CopiaEntidade(QString(), *item, referencia, &modelo);
-    else
-        LeBloco(QString(), *item, referencia, &modelo);
+    } else {
+        CICad::CompletaLeituraSimbolo(referencia, simbolo_);
+        LeSimboloLido(QString(), *item, referencia);
+    }
     LerLadoIni(*item, referencia, modelo);
     LerLadoFim(*item, referencia, modelo);
     return item;
 }
 
 CEItemLista* CCDataReader::CriaItemFio(const OdDbObjectId& polilinha, CETemplate& modelo) {
-    if (ChaveDaEntidade(polilinha).isEmpty()) return nullptr;
+    if (GuardaAcessorios) {
+        // What the accessories ask of the wire comes in the same walk as its key.
+        if (!LeChaveDoSimbolo(polilinha)) return nullptr;
+        GuardaAcessoriosDe(polilinha, ChaveDoTexto(simbolo_.textoChave));
+    } else if (ChaveDaEntidade(polilinha).isEmpty()) {
+        return nullptr;
+    }
     auto* item = new CEItemLista;
     item->ids.push_back(polilinha);
     if (FiosDasLeituras && GuardaFios && CICad::EhPolilinha(polilinha))

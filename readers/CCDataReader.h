@@ -174,6 +174,10 @@ protected:
     // CriaItemFio takes the wire's fields from its kept reading: set by a reader that copies
     // the same polylines again as the ends of its items (the bill of materials).
     bool FiosDasLeituras = false;
+    // What ExpandeAcessorios reads of a symbol (its key text and its own accessories) is kept
+    // from the symbol's reading: set by a reader that expands the symbols' accessories after
+    // reading them all, when their drawing objects are long out of the cache.
+    bool GuardaAcessorios = false;
     // Room for this many fields given to an item CriaItemBloco makes, before its first
     // merge: a reader whose items are alike (a strip's terminals, each read with its two
     // sides) sets the size of the last one, so that an item's fields move once, not at each
@@ -203,6 +207,10 @@ private:
     void LeRotasDoItem(const CEItemLista& item, CETemplate* modelo);
     // The key text's two parts; false when no key application is there.
     bool ChaveENorma(const OdDbObjectId& entidade, QString& chave, QString& norma) const;
+    // The symbol read so far (its extended data) into `simbolo_`, with a key of its own.
+    bool LeChaveDoSimbolo(const OdDbObjectId& referencia);
+    // LeBloco's work on the symbol read into `simbolo_`.
+    void LeSimboloLido(const QString& s, CEItemLista& item, const OdDbObjectId& referencia);
 
     // Local circuits by number: the LISP side is asked once per circuit and run.
     struct Circuito {
@@ -423,12 +431,63 @@ private:
     CESimboloLido simbolo_;
     std::vector<CamposItem::Campo> lote_;
     std::vector<std::uint64_t> ordemLote_;
+    // OrdenaLote's answer by the batch's names in order of writing: the symbols of a kind
+    // write the same names, and their order is sorted out once; with the kept form of a batch
+    // of those names once LeEntidadeGuardada found it (null before, and for a batch whose QTD
+    // was its mark).
+    struct OrdemLote {
+        std::vector<std::uint64_t> ordem;
+        FormaCampos* forma = nullptr;
+    };
+    std::vector<std::uint32_t> nomesLote_;
+    std::unordered_map<std::vector<std::uint32_t>, OrdemLote, HashNomes> ordensLote_;
     void JuntaLote(CEItemLista& item);
+    // The places in `lote_` of the fields JuntaLote joins, sorted by name (the name in the
+    // high half): the entry of the batch's names, valid until the next call.
+    OrdemLote& OrdenaLote();
+    // The batch's fields in name order into `nomes` and `valores`, as LeEntidadeGuardada keeps
+    // them, but for a QTD of `marca`: whether the batch has no QTD but that.
+    bool TiraLote(const std::vector<std::uint64_t>& ordem, std::uint32_t qtd, const QString& marca,
+                  std::vector<std::uint32_t>& nomes, std::vector<QString>& valores);
+    // The fields of the symbol read into `simbolo_` under the suffix, into `lote_`; `campos`:
+    // the item's so far, for its QTD.
+    void FazLote(const QString& s, const CamposItem& campos, const OdDbObjectId& referencia);
+
+    // Per symbol read while GuardaAcessorios is set, what ChaveENorma gives of it (`temChave`:
+    // what it answers) and the texts of its ZV_VINC_ADITIVO; kept while the drawing is the
+    // same, apart from the registration of that application.
+    struct AcessoriosLidos {
+        bool temChave = false;
+        QString chave, norma;
+        QStringList vinculos;
+    };
+    TabelaIds<AcessoriosLidos> acessoriosLidos_;
+    const void* desenhoAcessorios_ = nullptr;
+    std::uint64_t versaoAcessorios_ = 0;
+    void GuardaAcessoriosDe(const OdDbObjectId& referencia, const ChaveLida& chave);
+    const AcessoriosLidos* AcessoriosGuardados(const OdDbObjectId& id) const;
+    // ZV_VINC_ADITIVO is registered once per drawing and version.
+    void RegistraAppVinculos(zvdb::Database* database);
+    const void* appVinculosEm_ = nullptr;
+    std::uint64_t appVinculosVersao_ = ~std::uint64_t(0);
+
     // The drawing and its version where KVR_ZV_WIRE was last registered.
     const void* appFioEm_ = nullptr;
     std::uint64_t appFioVersao_ = 0;
+    // Per owner key, its catalogue accessories as keys and quantities: every owner of a key
+    // asks, and the catalogue's texts are split once.
+    QHash<QString, std::vector<std::pair<QString, int>>> acessoriosCatalogo_;
+    const std::vector<std::pair<QString, int>>& AcessoriosDoCatalogo(const QString& chave);
     // Per accessory key and standard: the fields of a unit, and its user columns.
-    QHash<QString, CEItemLista> basesAcessorio_, basesColunas_;
+    struct BaseAcessorio {
+        CEItemLista item, colunas;
+        // The fields of a unit with nothing of its owner's, by the unit's quantity.
+        std::vector<std::pair<QString, CamposItem>> unidades;
+    };
+    // The fields of a unit of the base with nothing of its owner's: the base's, the quantity
+    // and the user columns, joined once per quantity.
+    const CamposItem& CamposDaUnidade(BaseAcessorio& base, const QString& qtd);
+    std::unordered_map<std::pair<QString, QString>, BaseAcessorio, HashPar> basesAcessorio_;
     CECacheCatalogo catalogo_;
     double tolerancia_;
 };

@@ -29,12 +29,36 @@ void Conta(const QString& chave, int quantidade, QStringList& contados, QStringL
 
 }  // namespace
 
+const std::vector<std::pair<QString, int>>& CCDataReader::AcessoriosDoCatalogo(
+    const QString& chave) {
+    auto it = acessoriosCatalogo_.constFind(chave);
+    if (it != acessoriosCatalogo_.constEnd()) return *it;
+    std::vector<std::pair<QString, int>> pares;
+    for (const QString& texto : catalogo_.AcessoriosDe(chave)) {
+        const QStringList partes = texto.split('#');
+        pares.emplace_back(partes.value(0), ZVString(partes.value(1)).ParaInteiro());
+    }
+    return *acessoriosCatalogo_.insert(chave, std::move(pares));
+}
+
+const CamposItem& CCDataReader::CamposDaUnidade(BaseAcessorio& base, const QString& qtd) {
+    for (const auto& [quantidade, campos] : base.unidades)
+        if (quantidade == qtd) return campos;
+    // Owners of many quantities keep this bounded: the oldest goes.
+    constexpr std::size_t kMaxUnidades = 16;
+    if (base.unidades.size() >= kMaxUnidades) base.unidades.erase(base.unidades.begin());
+    CEItemLista unidade;
+    unidade.campos = base.item.campos;
+    unidade.definirCampo(NumeroCampo<"QTD">(), qtd);
+    unidade.copiarCampos(base.colunas);
+    return base.unidades.emplace_back(qtd, std::move(unidade.campos)).second;
+}
+
 VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaAtributos* atributos,
                                            CETemplate* modelo, QStringList caminho,
                                            const QString& normaDono) {
     Q_UNUSED(atributos);
     // Names as texts made once: this runs for every member of every listed material.
-    static const QString kAplicacao = QStringLiteral("ZV_VINC_ADITIVO");
     static const QString kRecursivo = QStringLiteral("PBLACERECUR");
     static const QString kRelacao = QStringLiteral("PBLACERELACAO");
     static const QString kAtributos = QStringLiteral("PBLADDATRIBACE");
@@ -47,7 +71,12 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
     };
     const OdDbObjectId primeiro = dono.ids.empty() ? OdDbObjectId() : dono.ids.front();
     QString norma = normaDono;
-    if (!primeiro.isNull()) {
+    // What the symbol's reading kept of it, or null: read here.
+    const AcessoriosLidos* lidos = primeiro.isNull() ? nullptr : AcessoriosGuardados(primeiro);
+    if (lidos) {
+        if (lidos->temChave) dono.definirCampo(campoChave, lidos->chave);
+        if (norma.isEmpty()) norma = lidos->norma;
+    } else if (!primeiro.isNull()) {
         QString chave, normaEntidade;
         if (ChaveENorma(primeiro, chave, normaEntidade)) dono.definirCampo(campoChave, chave);
         if (norma.isEmpty()) norma = normaEntidade;
@@ -57,31 +86,27 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
     caminho << chaveDono;
 
     QStringList contados, zerados;
-    for (const QString& texto : catalogo_.AcessoriosDe(chaveDono)) {
-        const QStringList partes = texto.split('#');
-        Conta(partes.value(0), ZVString(partes.value(1)).ParaInteiro(), contados, zerados);
-    }
+    for (const auto& [chave, quantidade] : AcessoriosDoCatalogo(chaveDono))
+        Conta(chave, quantidade, contados, zerados);
     if (!primeiro.isNull()) {
-        CICad::RegistraApp(kAplicacao, primeiro.database());
+        RegistraAppVinculos(primeiro.database());
         // Pairs of strings, quantity first; a string without its partner is left out.
         QStringList textos;
-        for (const CEItemXData& item : CICad::GetXData(primeiro, "ZV_VINC_ADITIVO"))
-            if (item.codigo == 1000) textos << item.texto;
+        if (lidos) {
+            textos = lidos->vinculos;
+        } else {
+            for (const CEItemXData& item : CICad::GetXData(primeiro, "ZV_VINC_ADITIVO"))
+                if (item.codigo == 1000) textos << item.texto;
+        }
         for (int i = 0; i + 1 < textos.size(); i += 2)
             Conta(textos[i + 1], ZVString(textos[i]).ParaInteiro(), contados, zerados);
     }
 
     // The fields every unit of an accessory key starts with, made once per key and standard
     // and shared by the units' copies until one of them changes; with the user columns.
-    struct Base {
-        const CEItemLista* item;
-        const CEItemLista* colunas;
-    };
-    auto base = [&](const QString& chave) -> Base {
-        const QString nome = chave + QChar(0x1F) + norma;
-        auto it = basesAcessorio_.constFind(nome);
-        if (it != basesAcessorio_.constEnd())
-            return {&it.value(), &basesColunas_.constFind(nome).value()};
+    auto base = [&](const QString& chave) -> BaseAcessorio& {
+        auto it = basesAcessorio_.find({chave, norma});
+        if (it != basesAcessorio_.end()) return it->second;
         CEItemLista item;
         item.definirCampo("ZV_LISTA_TIPO", "ACE");
         item.definirCampo("ZV_LISTA", catalogo_.ListaComp(chave, norma));
@@ -91,8 +116,10 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
         item.definirCampo("TP_DESCRI", descricao);
         CEItemLista colunas;
         LeColunasUsuario(QString(), colunas, catalogo_.ColunasComp(chave));
-        const auto novo = basesAcessorio_.insert(nome, item);
-        return {&novo.value(), &basesColunas_.insert(nome, colunas).value()};
+        return basesAcessorio_
+            .emplace(std::pair(chave, norma),
+                     BaseAcessorio{std::move(item), std::move(colunas), {}})
+            .first->second;
     };
 
     VetorItens resultado;
@@ -118,13 +145,14 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
                     if (dono.obterCampo(nome, valor)) item->definirCampo(nome, valor);
                 }
         }
-        const Base b = base(chave);
-        if (item->campos.isEmpty())
-            item->campos = b.item->campos;
-        else
-            item->copiarCampos(*b.item);
-        item->definirCampo(campoQtd, qtd);
-        item->copiarCampos(*b.colunas);
+        BaseAcessorio& b = base(chave);
+        if (item->campos.isEmpty()) {
+            item->campos = CamposDaUnidade(b, qtd);
+        } else {
+            item->copiarCampos(b.item);
+            item->definirCampo(campoQtd, qtd);
+            item->copiarCampos(b.colunas);
+        }
         const bool listado = estaListado(*item);
         if (listado && modelo && !modelo->FiltraItem(*item)) {
             delete item;
@@ -141,10 +169,10 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
     }
     for (const QString& chave : zerados) {
         if (contados.contains(chave)) continue;
-        const Base b = base(chave);
-        auto* item = new CEItemLista(*b.item);
+        const BaseAcessorio& b = base(chave);
+        auto* item = new CEItemLista(b.item);
         item->definirCampo(campoQtd, QStringLiteral("0"));
-        item->copiarCampos(*b.colunas);
+        item->copiarCampos(b.colunas);
         if (estaListado(*item) && (!modelo || modelo->FiltraItem(*item)))
             resultado.push_back(item);
         else

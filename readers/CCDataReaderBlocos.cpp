@@ -13,12 +13,19 @@ namespace {
 // Memories of texts seen in the drawing start over past this size: a drawing that makes up
 // texts keeps them bounded.
 constexpr std::size_t kMaxTextos = std::size_t(1) << 16;
+// The same for the orders of the symbols' batches, which are larger.
+constexpr std::size_t kMaxOrdens = 1024;
 
 const QLatin1String kPalavrasConexao[] = {QLatin1String("LIGACAO"), QLatin1String("CONNECTION"),
                                           QLatin1String("CONEXION")};
 
 QString Texto(std::string_view texto) {
     return QString::fromUtf8(texto.data(), int(texto.size()));
+}
+
+// The drawing an object is of: the facade's default one for an object that names none.
+const void* DesenhoDe(zvdb::Database* database) {
+    return database ? database : CICad::GetDatabase();
 }
 
 template <class Mapa>
@@ -200,7 +207,11 @@ const CCDataReader::ConstantesBloco& CCDataReader::ConstantesDoBloco(const OdDbO
     return constantes;
 }
 
-void CCDataReader::JuntaLote(CEItemLista& item) {
+CCDataReader::OrdemLote& CCDataReader::OrdenaLote() {
+    nomesLote_.clear();
+    for (const CamposItem::Campo& campo : lote_)
+        nomesLote_.push_back(campo.nome);
+    if (auto it = ordensLote_.find(nomesLote_); it != ordensLote_.end()) return it->second;
     // By name, and of one name the last written: sorted by name and place, the last of each
     // run of a name is kept.
     ordemLote_.clear();
@@ -211,22 +222,83 @@ void CCDataReader::JuntaLote(CEItemLista& item) {
     for (std::size_t i = 0; i < ordemLote_.size(); ++i)
         if (i + 1 == ordemLote_.size() || (ordemLote_[i + 1] >> 32) != (ordemLote_[i] >> 32))
             ordemLote_[n++] = ordemLote_[i];
+    // A drawing of many kinds of symbols keeps this bounded.
+    if (ordensLote_.size() >= kMaxOrdens) ordensLote_.clear();
+    OrdemLote nova;
+    nova.ordem.assign(ordemLote_.begin(), ordemLote_.begin() + std::ptrdiff_t(n));
+    return ordensLote_.emplace(nomesLote_, std::move(nova)).first->second;
+}
+
+void CCDataReader::JuntaLote(CEItemLista& item) {
+    const std::vector<std::uint64_t>& ordem = OrdenaLote().ordem;
     item.campos.juntarOrdenados(
-        n, [this](std::size_t j) { return std::uint32_t(ordemLote_[j] >> 32); },
-        [this](std::size_t j) -> QString&& {
-            return std::move(lote_[std::uint32_t(ordemLote_[j])].valor);
+        ordem.size(), [&ordem](std::size_t j) { return std::uint32_t(ordem[j] >> 32); },
+        [this, &ordem](std::size_t j) -> QString&& {
+            return std::move(lote_[std::uint32_t(ordem[j])].valor);
         });
     lote_.clear();
+}
+
+bool CCDataReader::LeChaveDoSimbolo(const OdDbObjectId& referencia) {
+    // As ChaveDaEntidade tells it, from the walk of the extended data the reading makes.
+    return CICad::LeituraChaveSimbolo(referencia, simbolo_) && simbolo_.temTextoChave &&
+           !ChaveDoTexto(simbolo_.textoChave).chave.isEmpty();
+}
+
+void CCDataReader::GuardaAcessoriosDe(const OdDbObjectId& referencia, const ChaveLida& chave) {
+    const std::uint64_t versao = CICad::VersaoDesenho(referencia.database());
+    const void* desenho = DesenhoDe(referencia.database());
+    if (desenhoAcessorios_ != desenho || versaoAcessorios_ != versao) {
+        acessoriosLidos_.limpa();
+        desenhoAcessorios_ = desenho;
+        versaoAcessorios_ = versao;
+    }
+    AcessoriosLidos lidos{simbolo_.temChave, chave.chave, chave.norma, {}};
+    for (const std::string_view texto : simbolo_.vinculos)
+        lidos.vinculos << Texto(texto);
+    acessoriosLidos_.insere(referencia, std::move(lidos));
+}
+
+const CCDataReader::AcessoriosLidos* CCDataReader::AcessoriosGuardados(
+    const OdDbObjectId& id) const {
+    if (acessoriosLidos_.empty() || desenhoAcessorios_ != DesenhoDe(id.database()) ||
+        versaoAcessorios_ != CICad::VersaoDesenho(id.database()))
+        return nullptr;
+    return acessoriosLidos_.procura(id);
+}
+
+void CCDataReader::RegistraAppVinculos(zvdb::Database* database) {
+    const std::uint64_t antes = CICad::VersaoDesenho(database);
+    const void* desenho = DesenhoDe(database);
+    if (appVinculosEm_ == desenho && appVinculosVersao_ == antes) return;
+    CICad::RegistraApp(QStringLiteral("ZV_VINC_ADITIVO"), database);
+    const std::uint64_t depois = CICad::VersaoDesenho(database);
+    // A new application record changes no symbol: what was kept of them holds.
+    if (desenhoAcessorios_ == desenho && versaoAcessorios_ == antes) versaoAcessorios_ = depois;
+    appVinculosEm_ = desenho;
+    appVinculosVersao_ = depois;
 }
 
 void CCDataReader::LeBloco(const QString& s, CEItemLista& item, const OdDbObjectId& referencia,
                            CETemplate* modelo) {
     Q_UNUSED(modelo);
+    CICad::LeituraSimbolo(referencia, simbolo_);
+    LeSimboloLido(s, item, referencia);
+}
+
+void CCDataReader::LeSimboloLido(const QString& s, CEItemLista& item,
+                                 const OdDbObjectId& referencia) {
+    FazLote(s, item.campos, referencia);
+    JuntaLote(item);
+}
+
+void CCDataReader::FazLote(const QString& s, const CamposItem& campos,
+                           const OdDbObjectId& referencia) {
     // The names are numbered in the order the fields are written, as when each was set on
     // the item: the order of the fields in LISP depends on it.
-    CICad::LeituraSimbolo(referencia, simbolo_);
     const CESimboloLido& lido = simbolo_;
     const ChaveLida& chave = lido.temTextoChave ? ChaveDoTexto(lido.textoChave) : semChave_;
+    if (GuardaAcessorios) GuardaAcessoriosDe(referencia, chave);
     const CatalogoComp& catalogo =
         chave.catalogo ? *chave.catalogo : DadosCatalogoComp(chave.chave, chave.norma);
     chave.catalogo = &catalogo;
@@ -296,7 +368,7 @@ void CCDataReader::LeBloco(const QString& s, CEItemLista& item, const OdDbObject
     const QString* valorQtd = nullptr;
     for (auto it = lote_.rbegin(); it != lote_.rend() && !valorQtd; ++it)
         if (it->nome == qtd) valorQtd = &it->valor;
-    if (!valorQtd) valorQtd = item.campos.procura(qtd);
+    if (!valorQtd) valorQtd = campos.procura(qtd);
     if (!valorQtd || valorQtd->isEmpty()) poe(qtd, QStringLiteral("1"));
     poe(NumeroCampo<"SAP_MATERIAL">(s), catalogo.material);
     QString orientacao = QStringLiteral("0");
@@ -318,5 +390,4 @@ void CCDataReader::LeBloco(const QString& s, CEItemLista& item, const OdDbObject
         }
     }
     poe(NumeroCampo<"ORIENTACAO">(s), orientacao);
-    JuntaLote(item);
 }

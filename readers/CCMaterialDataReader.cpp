@@ -103,6 +103,8 @@ VetorItens* CCMaterialDataReader::LerDados(zvdb::Database* database,
     conectores_.clear();
     progresso.Definir(10);
     simbolos_ = LeSimbolos(modelo);
+    // Accessories are expanded from what each symbol's reading kept.
+    GuardaAcessorios = simbolos_.vinculos != 0;
     const QString& f = simbolos_.fontes;
     if (f == "1" || f == "3") {
         LeBlocos(database, paginas, modelo, progresso);

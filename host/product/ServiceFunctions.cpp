@@ -73,7 +73,8 @@ Value gridPosition(Interpreter& lisp, const ProductContext& context, SheetGridIn
 // The first panel named on the project settings point (KVR_ZV_PAINEL); empty.
 QString findFirstPanel(zvdb::Database& database) {
     for (zvdb::Entity* entity : database.modelSpace()->entities()) {
-        if (entity->layer() != "ZV_FREEZE" || !entity->isType("POINT")) continue;
+        // The type stands first among the tags; the layer is looked for among them.
+        if (!entity->isType("POINT") || entity->layer() != "ZV_FREEZE") continue;
         const auto items = entity->xdata("KVR_ZV_PAINEL");
         if (!items.empty())
             return QString::fromUtf8(items.front().value.data(),

@@ -599,6 +599,66 @@ TEST_F(FacadeFixture, VirtualAttributesFillEmptyFieldsWithABlank) {
     EXPECT_EQ(CICad::GetAtributosVirtuais(OdDbObjectId(), lista), 1);
 }
 
+// Read in two steps, a symbol gives what the whole reading gives: the first step its key
+// text, its accessory texts and, on a symbol with key data of its own, its circuit; the
+// second the rest, with the circuit of its master otherwise.
+TEST_F(FacadeFixture, ASymbolReadInTwoStepsGivesTheWholeReading) {
+    const QString caminho = arquivoBloco("BORNE_L", {"REGUA", "NUMERO"});
+    const OdDbObjectId mestre = CICad::InsereBloco(caminho, "BORNE_L", "ESQ$0001$A", 1, 2, 0, 0);
+    const OdDbObjectId outro = CICad::InsereBloco(caminho, "BORNE_L", "ESQ$0002$A", 5, 6, 0, 0);
+    ASSERT_FALSE(mestre.isNull());
+    ASSERT_FALSE(outro.isNull());
+    CICad::SetXData(mestre, "KVR_ZV", {{1000, QString("SO") + QChar(0x0C) + "1"}});
+    CICad::SetXData(mestre, "ZV_VINC_ADITIVO", {{1000, "2"}, {1070, "5"}, {1000, "SY"}});
+    CICad::SetXData(mestre, "KVR_ZV_CIRCLOC", {{1071, "4"}});
+    CICad::SetXData(outro, "KVR_ZV_REPRESENTACAO",
+                    {{1000, "-50"}, {1000, ZVString::DeHandle(mestre.handle())}});
+
+    CESimboloLido chave;
+    ASSERT_TRUE(CICad::LeituraChaveSimbolo(mestre, chave));
+    EXPECT_TRUE(chave.temChave);
+    EXPECT_TRUE(chave.temTextoChave);
+    EXPECT_EQ(chave.textoChave,
+              "SO\x0c"
+              "1");
+    EXPECT_EQ(chave.vinculos, (std::vector<std::string_view>{"2", "SY"}));
+    EXPECT_TRUE(chave.temCircuito);
+    EXPECT_EQ(chave.circuito, 4);
+    EXPECT_FALSE(chave.referencia);
+    EXPECT_TRUE(chave.atributos.empty());
+    ASSERT_TRUE(CICad::LeituraChaveSimbolo(outro, chave));
+    EXPECT_FALSE(chave.temChave);
+    EXPECT_TRUE(chave.vinculos.empty());
+    EXPECT_FALSE(chave.temCircuito);
+
+    for (const OdDbObjectId& id : {mestre, outro}) {
+        CESimboloLido inteiro, passos;
+        ASSERT_TRUE(CICad::LeituraSimbolo(id, inteiro));
+        // What the first reading left is emptied by the next.
+        ASSERT_TRUE(CICad::LeituraChaveSimbolo(id == mestre ? outro : mestre, passos));
+        ASSERT_TRUE(CICad::CompletaLeituraSimbolo(id == mestre ? outro : mestre, passos));
+        ASSERT_TRUE(CICad::LeituraChaveSimbolo(id, passos));
+        ASSERT_TRUE(CICad::CompletaLeituraSimbolo(id, passos));
+        EXPECT_TRUE(passos.referencia);
+        EXPECT_EQ(passos.bloco, inteiro.bloco);
+        EXPECT_EQ(passos.layer, inteiro.layer);
+        EXPECT_EQ(passos.posicao.x, inteiro.posicao.x);
+        EXPECT_EQ(passos.textoChave, inteiro.textoChave);
+        EXPECT_EQ(passos.temChave, inteiro.temChave);
+        EXPECT_EQ(passos.vinculos, inteiro.vinculos);
+        EXPECT_TRUE(passos.temCircuito);
+        EXPECT_EQ(passos.circuito, 4);
+        EXPECT_EQ(passos.circuito, inteiro.circuito);
+        ASSERT_EQ(passos.atributos.size(), 2u);
+        ASSERT_EQ(inteiro.atributos.size(), 2u);
+        for (std::size_t k = 0; k < 2; ++k) {
+            EXPECT_EQ(passos.atributos[k].tag, inteiro.atributos[k].tag);
+            EXPECT_EQ(passos.atributos[k].valor, inteiro.atributos[k].valor);
+        }
+    }
+    EXPECT_FALSE(CICad::LeituraChaveSimbolo(OdDbObjectId(&db(), 0xFFFFFF), chave));
+}
+
 TEST_F(FacadeFixture, MastersResolveThroughEachApplication) {
     zvdb::BlockRecord* ms = db().modelSpace();
     auto id = [this](zvdb::DbObject* o) { return OdDbObjectId(&db(), o->handle()); };

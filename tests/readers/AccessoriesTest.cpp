@@ -1,6 +1,7 @@
 // Accessories of a symbol: units as rows, zero rows, the symbol's own pairs, recursion and
 // its guard, and bad extended data.
 #include "ReaderFixture.h"
+#include "drawing/Polyline.h"
 #include "lists/TemplateDouble.h"
 #include "readers/CCMaterialDataReader.h"
 
@@ -83,6 +84,106 @@ TEST_F(AccessoriesTest, AHugeQuantityIsCutInsteadOfExhaustingMemory) {
     const QStringList textos = Expande(dono, nullptr);
     EXPECT_EQ(textos.size(), 100000);
     EXPECT_EQ(textos.front(), "SY/1");
+}
+
+// A material reader that keeps what the accessories ask of the symbols it reads.
+class LeitorQueGuarda : public CCMaterialDataReader {
+public:
+    LeitorQueGuarda() { GuardaAcessorios = true; }
+};
+
+QStringList Textos(VetorItens itens) {
+    QStringList textos;
+    for (CEItemLista* item : itens)
+        textos << item->valorCampo("ZV_KEY") + "/" + item->valorCampo("QTD");
+    itens.destruirItens();
+    return textos;
+}
+
+TEST_F(AccessoriesTest, WhatASymbolsReadingKeptServesUntilTheDrawingChanges) {
+    const OdDbObjectId id = Simbolo("K", "SO", "ESQ$0001$A");
+    CICad::SetXData(id, "ZV_VINC_ADITIVO", {{1000, "2"}, {1000, "SY"}});
+    LeitorQueGuarda leitor;
+    TemplateDouble modelo;
+    std::unique_ptr<CEItemLista> item(leitor.CriaItemBloco(id, modelo));
+    ASSERT_NE(item, nullptr);
+    // The owner's key is the symbol's, whatever the item says.
+    item->definirCampo("ZV_KEY", "OUTRA");
+    EXPECT_EQ(Textos(leitor.ExpandeAcessorios(*item, nullptr, &modelo, {}, QString())),
+              QStringList({"SY/1", "SY/1"}));
+    EXPECT_EQ(item->valorCampo("ZV_KEY"), "SO");
+    // Changed since the reading: the symbol is read again.
+    CICad::SetXData(id, "ZV_VINC_ADITIVO", {{1000, "1"}, {1000, "Z0"}});
+    CICad::SetXData(id, "KVR_ZV", {{1000, QString("SY") + QChar(0x0C) + "1"}});
+    EXPECT_EQ(Textos(leitor.ExpandeAcessorios(*item, nullptr, &modelo, {}, QString())),
+              QStringList({"Z0/1"}));
+    EXPECT_EQ(item->valorCampo("ZV_KEY"), "SY");
+}
+
+TEST_F(AccessoriesTest, AWiresItemKeepsItsKeyAndAccessoriesFromTheWalkThatFoundItsKey) {
+    zvdb::Polyline* linha =
+        db().modelSpace()->addLwPolyline({{0, 0, 0}, {10, 0, 0}}, false, "ESQ$0001$A");
+    const OdDbObjectId fio = Id(linha);
+    CICad::SetXData(fio, "KVR_ZV_WIRE", {{1000, QString("SO") + QChar(0x0C) + "1"}});
+    CICad::SetXData(fio, "ZV_VINC_ADITIVO", {{1000, "3"}, {1000, "Z0"}});
+    LeitorQueGuarda leitor;
+    TemplateDouble modelo;
+    std::unique_ptr<CEItemLista> item(leitor.CriaItemFio(fio, modelo));
+    ASSERT_NE(item, nullptr);
+    item->definirCampo("ZV_KEY", "OUTRA");
+    EXPECT_EQ(Textos(leitor.ExpandeAcessorios(*item, nullptr, &modelo, {}, QString())),
+              QStringList({"Z0/1", "Z0/1", "Z0/1"}));
+    EXPECT_EQ(item->valorCampo("ZV_KEY"), "SO");
+    CICad::SetXData(fio, "ZV_VINC_ADITIVO", {{1000, "1"}, {1000, "SY"}});
+    EXPECT_EQ(Textos(leitor.ExpandeAcessorios(*item, nullptr, &modelo, {}, QString())),
+              QStringList({"SY/1"}));
+    // A polyline without a key, or with an empty key text, makes no item.
+    const OdDbObjectId semChave =
+        Id(db().modelSpace()->addLwPolyline({{0, 5, 0}, {10, 5, 0}}, false, "ESQ$0001$A"));
+    EXPECT_EQ(std::unique_ptr<CEItemLista>(leitor.CriaItemFio(semChave, modelo)), nullptr);
+    CICad::SetXData(semChave, "KVR_ZV_WIRE", {{1000, ""}});
+    EXPECT_EQ(std::unique_ptr<CEItemLista>(leitor.CriaItemFio(semChave, modelo)), nullptr);
+}
+
+TEST_F(AccessoriesTest, EveryUnitHasItsOwnersQuantityWhateverOwnersCameBefore) {
+    const OdDbObjectId id = Simbolo("K", "A1", "ESQ$0001$A");
+    CCMaterialDataReader leitor;
+    TemplateDouble modelo;
+    // More quantities than a base keeps, and some of them again.
+    QStringList quantidades = {"2", "5", "2", "", "5"};
+    for (int q = 10; q < 30; ++q)
+        quantidades << QString::number(q);
+    quantidades << "2"
+                << "11"
+                << "29";
+    for (const QString& qtd : quantidades) {
+        CEItemLista dono = Dono(id, qtd);
+        const QString q = qtd.isEmpty() ? "1" : qtd;
+        EXPECT_EQ(Textos(leitor.ExpandeAcessorios(dono, nullptr, &modelo, {}, QString())),
+                  QStringList({"B3/" + q, "B3/" + q, "B3/" + q, "Z0/" + q, "Z0/" + q}))
+            << qtd.toStdString();
+    }
+}
+
+TEST_F(AccessoriesTest, TheSymbolsAccessoryApplicationIsRegisteredByTheFirstExpansion) {
+    const OdDbObjectId id = Simbolo("K", "A1", "ESQ$0001$A");
+    const OdDbObjectId outro = Simbolo("K", "SO", "ESQ$0001$A", {}, 10);
+    LeitorQueGuarda leitor;
+    TemplateDouble modelo;
+    std::unique_ptr<CEItemLista> item(leitor.CriaItemBloco(id, modelo));
+    std::unique_ptr<CEItemLista> segundo(leitor.CriaItemBloco(outro, modelo));
+    ASSERT_NE(item, nullptr);
+    ASSERT_NE(segundo, nullptr);
+    EXPECT_FALSE(db().isApplicationRegistered("ZV_VINC_ADITIVO"));
+    EXPECT_EQ(Textos(leitor.ExpandeAcessorios(*item, nullptr, &modelo, {}, QString())),
+              QStringList({"B3/1", "B3/1", "B3/1", "Z0/1", "Z0/1"}));
+    EXPECT_TRUE(db().isApplicationRegistered("ZV_VINC_ADITIVO"));
+    // What the second symbol's reading kept still holds; pairs given to it now are read.
+    EXPECT_EQ(Textos(leitor.ExpandeAcessorios(*segundo, nullptr, &modelo, {}, QString())),
+              QStringList());
+    CICad::SetXData(outro, "ZV_VINC_ADITIVO", {{1000, "1"}, {1000, "SY"}});
+    EXPECT_EQ(Textos(leitor.ExpandeAcessorios(*segundo, nullptr, &modelo, {}, QString())),
+              QStringList({"SY/1"}));
 }
 
 }  // namespace

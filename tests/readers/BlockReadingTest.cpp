@@ -204,3 +204,35 @@ TEST_F(BlockReadingTest, NewFieldNamesAreNumberedInTheOrderOfWriting) {
     EXPECT_EQ(lado.valorCampo(c + "_FIM"), "3");
     EXPECT_EQ(CamposItem::numeroSeHouver(c), CamposItem::kSemNome);
 }
+
+// Of a name written twice the later value counts, whatever the order of the other names; the
+// symbols whose batches name the same fields in another order are read as the first of them
+// was not, and a copy of a kept reading gives what a reading gives.
+TEST_F(BlockReadingTest, ALaterFieldOfANameWinsForSymbolsOfAnyOrderOfNames) {
+    const OdDbObjectId k1 =
+        Simbolo("NA-1", "A1", "ESQ$0001$A", {{"REGUA", "X1"}, {"NUMERO", "5"}, {"REGUA", "X2"}}, 0);
+    const OdDbObjectId k2 = Simbolo("NA-1", "A1", "ESQ$0001$A",
+                                    {{"NUMERO", "7"}, {"REGUA", "Y1"}, {"REGUA", "Y0"}}, 10);
+    const OdDbObjectId k3 = Simbolo("NA-1", "A1", "ESQ$0001$A",
+                                    {{"REGUA", "Z1"}, {"NUMERO", "9"}, {"REGUA", "Z2"}}, 20);
+    LeitorBase leitor;
+    for (int vez = 0; vez < 2; ++vez) {
+        const CEItemLista um = Le(leitor, k1), dois = Le(leitor, k2), tres = Le(leitor, k3);
+        EXPECT_EQ(um.valorCampo("REGUA"), "X2");
+        EXPECT_EQ(um.valorCampo("NUMERO"), "5");
+        EXPECT_EQ(dois.valorCampo("REGUA"), "Y0");
+        EXPECT_EQ(dois.valorCampo("NUMERO"), "7");
+        EXPECT_EQ(tres.valorCampo("REGUA"), "Z2");
+        EXPECT_EQ(tres.valorCampo("NUMERO"), "9");
+        EXPECT_EQ(dois.campos.keys(), um.campos.keys());
+        EXPECT_EQ(tres.valorCampo("QTD"), "1");
+    }
+    for (const OdDbObjectId& id : {k1, k2, k3, k2}) {
+        LeitorBase novo;
+        const CEItemLista lido = Le(novo, id);
+        CEItemLista copia;
+        leitor.CopiaEntidade(QString(), copia, id, nullptr);
+        EXPECT_EQ(copia.campos.keys(), lido.campos.keys());
+        EXPECT_EQ(copia.campos.values(), lido.campos.values());
+    }
+}
