@@ -199,6 +199,36 @@ struct FirstTags {
     }
 };
 
+// `items` by rank (0 to `pages` - 1, INT_MAX off the pages, last), then by handle: the
+// items go to their rank's place in one pass, and then by handle within it, in which order
+// most of them come already. `sorted` is where they are put, reused between calls.
+template <class T, class Rank, class Handle>
+void byRankThenHandle(std::vector<T>& items, std::size_t pages, std::vector<T>& sorted, Rank rank,
+                      Handle handle) {
+    auto place = [&](const T& item) {
+        const std::int32_t r = rank(item);
+        return r == INT_MAX ? pages : static_cast<std::size_t>(r);
+    };
+    std::vector<std::size_t> ends(pages + 1, 0);
+    for (const T& item : items)
+        ++ends[place(item)];
+    std::size_t next = 0;
+    for (std::size_t& end : ends)
+        next = std::exchange(end, next) + next;  // ends[r]: where rank r starts, for now
+    sorted.resize(items.size());
+    for (const T& item : items)
+        sorted[ends[place(item)]++] = item;  // then where it ends
+    auto byHandle = [&](const T& a, const T& b) { return handle(a) < handle(b); };
+    std::size_t begin = 0;
+    for (const std::size_t end : ends) {
+        const auto first = sorted.begin() + static_cast<std::ptrdiff_t>(begin);
+        const auto last = sorted.begin() + static_cast<std::ptrdiff_t>(end);
+        if (!std::is_sorted(first, last, byHandle)) std::sort(first, last, byHandle);
+        begin = end;
+    }
+    items.swap(sorted);
+}
+
 }  // namespace
 
 // What one vertex query needs, kept between queries so that they allocate nothing.
@@ -381,31 +411,56 @@ const ConnectionFinder::CellRun* ConnectionFinder::run(std::int32_t layer,
     }
 }
 
-// One sort puts each page's spots together, cell by cell (the order they came in kept
-// within a cell): a vertex then finds its cells' spots in a run each.
+// Spot i goes to where `order` puts it: spots_[i] becomes spots_[order[i].index], one cycle
+// of the permutation at a time (an index pointing at its own place is done).
+template <class Key>
+void ConnectionFinder::placeSpots(std::vector<Key>& order) {
+    for (std::uint32_t i = 0; i < order.size(); ++i) {
+        if (order[i].index == i) continue;
+        const Spot held = spots_[i];
+        std::uint32_t at = i;
+        for (;;) {
+            const std::uint32_t from = std::exchange(order[at].index, at);
+            if (from == i) {
+                spots_[at] = held;
+                break;
+            }
+            spots_[at] = spots_[from];
+            at = from;
+        }
+    }
+}
+
+// The spots go to their layer's place in one counting pass, and each layer's are sorted by
+// cell (the order they came in kept within a cell): a vertex then finds its cells' spots in
+// a run each. The spots are moved in place, without a second array of them.
 void ConnectionFinder::buildGrid() {
     struct Key {
-        std::int32_t layer;
-        std::uint32_t index;
         std::uint64_t cell;
+        std::uint32_t index;
     };
+    std::vector<std::uint32_t> starts(layers_.size() + 1, 0);
+    for (const Spot& spot : spots_)
+        ++starts[static_cast<std::size_t>(spot.layer) + 1];
+    for (std::size_t layer = 1; layer < starts.size(); ++layer)
+        starts[layer] += starts[layer - 1];
     std::vector<Key> keys(spots_.size());
-    for (std::uint32_t i = 0; i < spots_.size(); ++i)
-        keys[i] = {spots_[i].layer, i, spots_[i].cell};
-    std::sort(keys.begin(), keys.end(), [](const Key& a, const Key& b) {
-        if (a.layer != b.layer) return a.layer < b.layer;
-        return a.cell != b.cell ? a.cell < b.cell : a.index < b.index;
-    });
-    std::vector<Spot> sorted;
-    sorted.reserve(spots_.size());
+    {
+        std::vector<std::uint32_t> next(starts.begin(), starts.end() - 1);
+        for (std::uint32_t i = 0; i < spots_.size(); ++i)
+            keys[next[static_cast<std::size_t>(spots_[i].layer)]++] = {spots_[i].cell, i};
+    }
     // the cells of each layer counted on the way
     std::vector<std::uint32_t> cells(layers_.size(), 0);
-    for (std::size_t i = 0; i < keys.size(); ++i) {
-        sorted.push_back(spots_[keys[i].index]);
-        if (i == 0 || keys[i].layer != keys[i - 1].layer || keys[i].cell != keys[i - 1].cell)
-            ++cells[static_cast<std::size_t>(keys[i].layer)];
+    for (std::size_t layer = 0; layer < cells.size(); ++layer) {
+        const auto first = keys.begin() + starts[layer], last = keys.begin() + starts[layer + 1];
+        std::sort(first, last, [](const Key& a, const Key& b) {
+            return a.cell != b.cell ? a.cell < b.cell : a.index < b.index;
+        });
+        for (auto key = first; key != last; ++key)
+            if (key == first || key->cell != (key - 1)->cell) ++cells[layer];
     }
-    spots_ = std::move(sorted);
+    placeSpots(keys);
     layerCells_.assign(layers_.size(), LayerCells{});
     std::size_t size = 0;
     for (std::size_t layer = 0; layer < cells.size(); ++layer) {
@@ -443,35 +498,14 @@ void ConnectionFinder::sortLines() {
         auto page = order.find(name);
         if (page != order.end()) rankOf[static_cast<std::size_t>(id)] = page->second;
     }
-    // The ranks are the pages, and off the pages last: the lines go to their rank's place in
-    // one pass, and then by handle within it, in which order most of them come already.
-    const auto offPages = static_cast<std::size_t>(index);
-    auto place = [offPages](std::int32_t rank) {
-        return rank == INT_MAX ? offPages : static_cast<std::size_t>(rank);
-    };
-    auto byHandle = [](const Line& a, const Line& b) { return a.handle < b.handle; };
-    std::vector<std::size_t> ends;
     std::vector<Line> sorted;
     for (std::vector<Line>* lines : {&wireLines_, &leadLines_, &blindLines_}) {
-        ends.assign(offPages + 1, 0);
-        for (Line& line : *lines) {
+        for (Line& line : *lines)
             line.rank = rankOf[static_cast<std::size_t>(line.layer)];
-            ++ends[place(line.rank)];
-        }
-        std::size_t next = 0;
-        for (std::size_t& end : ends)
-            next = std::exchange(end, next) + next;  // ends[r]: where rank r starts, for now
-        sorted.resize(lines->size());
-        for (const Line& line : *lines)
-            sorted[ends[place(line.rank)]++] = line;  // then where it ends
-        std::size_t begin = 0;
-        for (const std::size_t end : ends) {
-            const auto first = sorted.begin() + static_cast<std::ptrdiff_t>(begin);
-            const auto last = sorted.begin() + static_cast<std::ptrdiff_t>(end);
-            if (!std::is_sorted(first, last, byHandle)) std::sort(first, last, byHandle);
-            begin = end;
-        }
-        lines->swap(sorted);
+        byRankThenHandle(
+            *lines, static_cast<std::size_t>(index), sorted,
+            [](const Line& line) { return line.rank; },
+            [](const Line& line) { return line.handle; });
     }
 }
 
@@ -554,8 +588,10 @@ std::vector<zvdb::Polyline*> ConnectionFinder::polylinesInPageOrder(zvdb::Databa
         }
         found.push_back({{lastRank, polyline->handle()}, polyline});
     }
-    std::sort(found.begin(), found.end(),
-              [](const auto& a, const auto& b) { return a.first < b.first; });
+    decltype(found) sorted;
+    byRankThenHandle(
+        found, pages.size(), sorted, [](const auto& item) { return item.first.first; },
+        [](const auto& item) { return item.first.second; });
     std::vector<zvdb::Polyline*> result;
     result.reserve(found.size());
     for (const auto& item : found)

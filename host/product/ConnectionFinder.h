@@ -116,6 +116,8 @@ private:
     static std::size_t slotOf(std::uint64_t cell);
     const CellRun* run(std::int32_t layer, std::uint64_t cell) const;
     void buildGrid();
+    template <class Key>
+    void placeSpots(std::vector<Key>& order);
     void sortLines();
     void touchesAt(std::int32_t layer, const zvdb::Point3& p, double radius,
                    std::vector<Touch>& out, Scratch& scratch) const;

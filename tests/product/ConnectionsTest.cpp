@@ -27,6 +27,31 @@ protected:
         reference->addAttribute("LIGACAO2", "14", {at.x, at.y - 10, 0}, 2.5);
         return reference;
     }
+
+    // The drawing read again from its file with the handles of `a` and `b` swapped.
+    void reloadWithHandlesSwapped(const zvdb::DbObject* a, const zvdb::DbObject* b) {
+        std::vector<std::string> lines;
+        std::istringstream text(zvdb::DxfWriter::toText(*database));
+        for (std::string line; std::getline(text, line);)
+            lines.push_back(line);
+        int swapped = 0;
+        for (std::size_t i = 0; i + 1 < lines.size(); ++i) {
+            if (lines[i].find_first_not_of(' ') == std::string::npos ||
+                lines[i].substr(lines[i].find_first_not_of(' ')) != "5")
+                continue;
+            std::string& handle = lines[i + 1];
+            if (handle == hex(a) || handle == hex(b)) {
+                handle = handle == hex(a) ? hex(b) : hex(a);
+                ++swapped;
+            }
+        }
+        ASSERT_EQ(swapped, 2);
+        std::string swappedText;
+        for (const std::string& line : lines)
+            swappedText += line + "\n";
+        database = zvdb::DxfLoader::load(swappedText);
+        ASSERT_TRUE(database);
+    }
 };
 
 TEST_F(ConnectionsTest, WireThroughTerminalContactAndSecondTerminal) {
@@ -205,27 +230,7 @@ TEST_F(ConnectionsTest, WiresByPageThenByHandleWhateverTheOrderOfTheDrawing) {
     EXPECT_EQ(show("(mapcar 'car (getConexoesTodosFios))"),
               "(\"601\" \"605\" \"602\" \"603\" \"604\")");
     // the file with the handles of 601 and 602 swapped: 602 now comes first on its page
-    std::vector<std::string> lines;
-    std::istringstream text(zvdb::DxfWriter::toText(*database));
-    for (std::string line; std::getline(text, line);)
-        lines.push_back(line);
-    int swapped = 0;
-    for (std::size_t i = 0; i + 1 < lines.size(); ++i) {
-        if (lines[i].find_first_not_of(' ') == std::string::npos ||
-            lines[i].substr(lines[i].find_first_not_of(' ')) != "5")
-            continue;
-        std::string& handle = lines[i + 1];
-        if (handle == hex(a) || handle == hex(b)) {
-            handle = handle == hex(a) ? hex(b) : hex(a);
-            ++swapped;
-        }
-    }
-    ASSERT_EQ(swapped, 2);
-    std::string swappedText;
-    for (const std::string& line : lines)
-        swappedText += line + "\n";
-    database = zvdb::DxfLoader::load(swappedText);
-    ASSERT_TRUE(database);
+    reloadWithHandlesSwapped(a, b);
     EXPECT_EQ(show("(mapcar 'car (getConexoesTodosFios))"),
               "(\"602\" \"605\" \"601\" \"603\" \"604\")");
 }
@@ -239,6 +244,56 @@ TEST_F(ConnectionsTest, PolylinesInPageOrderThenByHandleAndOffThePagesLast) {
     auto* firstToo = wire("ESQ$0001$A", {{0, 5, 0}, {10, 5, 0}}, "505");
     const std::vector<zvdb::Polyline*> expected = {first, firstToo, second, secondToo, off};
     EXPECT_EQ(ConnectionFinder::polylinesInPageOrder(*database, "KVR_ZV_WIRE"), expected);
+}
+
+TEST_F(ConnectionsTest, PolylinesOfAPageComeByHandleWhateverTheOrderOfTheDrawing) {
+    wire("ESQ$0002$A", {{0, 0, 0}, {10, 0, 0}}, "511");
+    auto* early = wire("ESQ$0001$A", {{0, 0, 0}, {10, 0, 0}}, "512");
+    wire("OUTRO", {{0, 0, 0}, {10, 0, 0}}, "513");
+    wire("ESQ$0001$A", {{0, 5, 0}, {10, 5, 0}}, "514");
+    wire("ESQ$0002$A", {{0, 5, 0}, {10, 5, 0}}, "515");
+    auto* late = wire("ESQ$0001$A", {{0, 9, 0}, {10, 9, 0}}, "516");
+    auto numbers = [&] {
+        std::vector<std::string_view> found;
+        for (const zvdb::Polyline* line :
+             ConnectionFinder::polylinesInPageOrder(*database, "KVR_ZV_WIRE"))
+            found.push_back(ConnectionFinder::wireNumber(*line));
+        return found;
+    };
+    EXPECT_EQ(numbers(), (std::vector<std::string_view>{"512", "514", "516", "511", "515", "513"}));
+    reloadWithHandlesSwapped(early, late);
+    EXPECT_EQ(numbers(), (std::vector<std::string_view>{"516", "514", "512", "511", "515", "513"}));
+}
+
+TEST_F(ConnectionsTest, SymbolsDrawnAcrossPagesAndCellsInAnyOrderTouchTheirOwnWires) {
+    // drawn right to left, the pages in turn: the index reorders them by page and cell
+    std::vector<std::uint64_t> onFirst(5), onSecond(5);
+    for (int i = 4; i >= 0; --i) {
+        const double x = 100.0 + 50 * i;
+        onSecond[static_cast<std::size_t>(i)] = contact("ESQ$0002$A", {x, 200, 0})->handle();
+        onFirst[static_cast<std::size_t>(i)] = contact("ESQ$0001$A", {x, 300, 0})->handle();
+        contact("OUTRO", {x, 300, 0});
+    }
+    wire("ESQ$0002$A", {{100, 190, 0}, {300, 190, 0}}, "702");
+    wire("ESQ$0001$A", {{100, 300, 0}, {150, 300, 0}, {200, 300, 0}, {250, 300, 0}, {300, 300, 0}},
+         "701");
+    const auto wires = ConnectionFinder(*database, 0.1).wires();
+    ASSERT_EQ(wires.size(), 2u);
+    auto touched = [](const WireConnections& wire) {
+        std::vector<std::uint64_t> symbols;
+        for (const Touch& touch : wire.touches)
+            symbols.push_back(touch.symbol);
+        return symbols;
+    };
+    EXPECT_EQ(wires[0].number, "701");
+    EXPECT_EQ(touched(wires[0]), onFirst);
+    for (const Touch& touch : wires[0].touches)
+        EXPECT_EQ(touch.connection, "13");
+    // the second page's wire runs on the lower connections, and only its two ends touch
+    EXPECT_EQ(wires[1].number, "702");
+    EXPECT_EQ(touched(wires[1]), (std::vector<std::uint64_t>{onSecond[0], onSecond[4]}));
+    for (const Touch& touch : wires[1].touches)
+        EXPECT_EQ(touch.connection, "14");
 }
 
 TEST_F(ConnectionsTest, WireListsByPage) {
