@@ -52,31 +52,6 @@ QString Primeiro(const CEItemLista& item, std::array<NomeCampo, 3>& nomes) {
     return {};
 }
 
-// The names an end's relation reads and writes under one suffix, made once: every terminal
-// side and wire end composes one.
-struct NomesRelacao {
-    NomeCampo rel, lig, handle;
-    std::array<NomeCampo, 3> relacoes, reguas, numeros;
-};
-
-NomesRelacao& Nomes(const QString& sufixo) {
-    static QHash<QString, NomesRelacao> porSufixo;
-    auto achado = porSufixo.find(sufixo);
-    if (achado != porSufixo.end()) return achado.value();
-    NomesRelacao n{NomeCampo("REL" + sufixo),
-                   NomeCampo("LIG" + sufixo),
-                   NomeCampo("HANDLE" + sufixo),
-                   {},
-                   {},
-                   {}};
-    for (size_t i = 0; i < 3; ++i) {
-        n.relacoes[i] = NomeCampo(kRelacoes[i] + sufixo);
-        n.reguas[i] = NomeCampo(kReguas[i] + sufixo);
-        n.numeros[i] = NomeCampo(kNumeros[i] + sufixo);
-    }
-    return porSufixo.insert(sufixo, n).value();
-}
-
 // Whether the block name, as the drawing holds it, starts with the upper-case ASCII prefix in
 // any case: no text is made for the name, asked at every terminal's side and neighbour.
 bool ComecaCom(std::string_view nome, std::string_view prefixo) {
@@ -127,6 +102,31 @@ void Junta(VetorItens& destino, VetorItens* origem) {
 
 QString CCExportDataReader::PaginasOpcao() const {
     return Exportacao ? Exportacao->GetOpcao("PAGINAS") : QString();
+}
+
+// The names an end's relation reads and writes under one suffix, made once: every terminal
+// side and wire end composes one.
+struct CCExportDataReader::NomesRelacao {
+    NomeCampo rel, lig, handle;
+    std::array<NomeCampo, 3> relacoes, reguas, numeros;
+};
+
+CCExportDataReader::NomesRelacao& CCExportDataReader::Nomes(const QString& sufixo) {
+    static QHash<QString, NomesRelacao> porSufixo;
+    auto achado = porSufixo.find(sufixo);
+    if (achado != porSufixo.end()) return achado.value();
+    NomesRelacao n{NomeCampo("REL" + sufixo),
+                   NomeCampo("LIG" + sufixo),
+                   NomeCampo("HANDLE" + sufixo),
+                   {},
+                   {},
+                   {}};
+    for (size_t i = 0; i < 3; ++i) {
+        n.relacoes[i] = NomeCampo(kRelacoes[i] + sufixo);
+        n.reguas[i] = NomeCampo(kReguas[i] + sufixo);
+        n.numeros[i] = NomeCampo(kNumeros[i] + sufixo);
+    }
+    return porSufixo.insert(sufixo, n).value();
 }
 
 VetorItens* CCExportDataReader::Le(zvdb::Database* database, CETemplate* modelo, bool flag,
@@ -387,10 +387,11 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
     const OdDbObjectId objeto = CICad::IdDoHandle(conectado);
     if (doBorne && objeto.isNull()) return;
     QString ligacao;
+    NomesRelacao& nomes = Nomes(sufixo);
     if (!objeto.isNull()) {
         // The relation the wire reader composed for this end is no field of the object:
         // a terminal, which has no relation, is told by its strip and number instead.
-        for (NomeCampo& nome : Nomes(sufixo).relacoes)
+        for (NomeCampo& nome : nomes.relacoes)
             item.definirCampo(nome.ParaDefinir(), QString());
         CopiaAtributos(sufixo, item, conectado);
         // After the copy: an element it read for the first time lends its attributes to
@@ -414,7 +415,7 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
             CopiaAtributos(segundo, item, ZVString::DeHandle(fioOutro.handle()));
     }
     // The terminal's side names the element by the handle its fields came from.
-    CompoeRelacao(sufixo, item, modelo, ligacao, doBorne ? QString() : proprio());
+    CompoeRelacao(nomes, item, modelo, ligacao, doBorne ? QString() : proprio());
 }
 
 void CCExportDataReader::CopiaAtributos(const QString& sufixo, CEItemLista& item,
@@ -455,7 +456,11 @@ CCExportDataReader::Composicao CCExportDataReader::LeComposicao(CETemplate* mode
 
 void CCExportDataReader::CompoeRelacao(const QString& sufixo, CEItemLista& item, CETemplate* modelo,
                                        const QString& ligacao, const QString& handle) {
-    NomesRelacao& nomes = Nomes(sufixo);
+    CompoeRelacao(Nomes(sufixo), item, modelo, ligacao, handle);
+}
+
+void CCExportDataReader::CompoeRelacao(NomesRelacao& nomes, CEItemLista& item, CETemplate* modelo,
+                                       const QString& ligacao, const QString& handle) {
     const QString r = Primeiro(item, nomes.relacoes);
     const QString a = Primeiro(item, nomes.reguas);
     const QString n = Primeiro(item, nomes.numeros);
@@ -468,19 +473,22 @@ void CCExportDataReader::CompoeRelacao(const QString& sufixo, CEItemLista& item,
     const Composicao composicao = lendo_ ? *composicao_ : LeComposicao(modelo);
     const QString& sep = composicao.sep;
     const bool relacaoPrimeiro = composicao.relacaoPrimeiro;
-    item.definirCampo(nomes.rel.ParaDefinir(), !r.isEmpty() ? r : a + sep + n);
+    // Strip before number is both REL of a terminal and, in that order, its relation: the
+    // text is made once.
+    const QString reguaNumero = r.isEmpty() ? a + sep + n : QString();
+    item.definirCampo(nomes.rel.ParaDefinir(), r.isEmpty() ? reguaNumero : r);
     item.definirCampo(nomes.lig.ParaDefinir(), g);
     if (!handle.isEmpty()) item.definirCampo(nomes.handle.ParaDefinir(), handle);
-    // The texts are made once for the three names.
-    std::optional<QString> comLigacao, comRegua;
-    if (!g.isEmpty()) comLigacao = relacaoPrimeiro ? r + sep + g : g + sep + r;
+    // A terminal has no relation of its own: strip and number stand for it, over the one
+    // with the connection.
+    std::optional<QString> relacao;
     if (!a.isEmpty() && !n.isEmpty() && r.isEmpty())
-        comRegua = relacaoPrimeiro ? a + sep + n : n + sep + a;
-    for (NomeCampo& campo : nomes.relacoes) {
-        if (comLigacao) item.definirCampo(campo.ParaDefinir(), *comLigacao);
-        // A terminal has no relation of its own: strip and number stand for it.
-        if (comRegua) item.definirCampo(campo.ParaDefinir(), *comRegua);
-    }
+        relacao = relacaoPrimeiro ? reguaNumero : n + sep + a;
+    else if (!g.isEmpty())
+        relacao = relacaoPrimeiro ? r + sep + g : g + sep + r;
+    if (!relacao) return;
+    for (NomeCampo& campo : nomes.relacoes)
+        item.definirCampo(campo.ParaDefinir(), *relacao);
 }
 
 QString CCExportDataReader::PromptCampo(const QString& tag, bool web) {

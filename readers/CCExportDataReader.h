@@ -56,6 +56,11 @@ protected:
     bool lerAcessorios_ = true;
 
 private:
+    // The names an end's relation reads and writes under one suffix.
+    struct NomesRelacao;
+    static NomesRelacao& Nomes(const QString& sufixo);
+    void CompoeRelacao(NomesRelacao& nomes, CEItemLista& item, CETemplate* modelo,
+                       const QString& ligacao, const QString& handle);
     void AoLigar(CEItemLista& item, const OdDbObjectId& entidade, CETemplate* modelo, bool inicio);
     // The element next to an equipment's own entry of the connection (its handle and
     // connection name) in the wire's full connection list; empty when there is none.

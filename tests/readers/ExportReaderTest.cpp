@@ -286,6 +286,16 @@ TEST_F(ExportRelationTest, StripAndNumberStandForAMissingRelation) {
     leitor.CompoeRelacao("_F", outro, nullptr, "C", "");
     EXPECT_EQ(outro.valorCampo("ETIQUETA_F"), "X4:8:C");
     EXPECT_EQ(outro.valorCampo("REL_F"), "X4:8");
+    // The other order turns the relation round, not REL; a connection changes neither.
+    ASSERT_TRUE(lisp("(setq *EXPORT_ORDEM_REL* \"2\" *EXPORT_CHAR_SEP* \"/\")"));
+    CEItemLista terceiro;
+    terceiro.definirCampo("STRIP_F", "X5");
+    terceiro.definirCampo("NUMBER_F", "9");
+    leitor.CompoeRelacao("_F", terceiro, nullptr, "D", "");
+    EXPECT_EQ(terceiro.valorCampo("REL_F"), "X5/9");
+    EXPECT_EQ(terceiro.valorCampo("LIG_F"), "D");
+    for (const char* campo : {"RELACAO_F", "TAG_F", "ETIQUETA_F"})
+        EXPECT_EQ(terceiro.valorCampo(campo), "9/X5") << campo;
 }
 
 TEST_F(ExportRelationTest, AStripWithoutNumberAndNothingElseLeavesTheRelationFields) {
