@@ -178,14 +178,9 @@ QHash<QString, std::vector<OdDbObjectId>> CICad::GetReferenciasPorBloco(zvdb::Da
 
 std::vector<OdDbObjectId> CICad::GetEntidadesComXData(const QString& aplicacao,
                                                       zvdb::Database* database) {
-    std::vector<OdDbObjectId> ids;
-    zvdb::Database* db = Db(database);
-    if (!db || !db->modelSpace()) return ids;
     const std::string nome = U8(aplicacao);
-    db->modelSpace()->forEachEntity([&](zvdb::Entity& entidade) {
-        if (entidade.hasXData(nome)) ids.push_back(Id(&entidade));
-    });
-    return ids;
+    const std::string_view nomes[] = {nome};
+    return std::move(GetEntidadesComXData(nomes, database).front());
 }
 
 std::vector<std::vector<OdDbObjectId>> CICad::GetEntidadesComXData(

@@ -240,37 +240,49 @@ std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& sim
     return ordem;
 }
 
+namespace {
+
+// A flag for each of some objects, found by address in one sorted array, with no node per
+// object.
+template <class T>
+class Marcas {
+public:
+    explicit Marcas(std::vector<const T*> objetos) : objetos_(std::move(objetos)) {
+        std::sort(objetos_.begin(), objetos_.end());
+        objetos_.erase(std::unique(objetos_.begin(), objetos_.end()), objetos_.end());
+        marcado_.assign(objetos_.size(), 0);
+    }
+    // True the first time one of the objects is marked.
+    bool Marca(const T* objeto) {
+        const auto it = std::lower_bound(objetos_.begin(), objetos_.end(), objeto);
+        return !std::exchange(marcado_[size_t(it - objetos_.begin())], char(1));
+    }
+
+private:
+    std::vector<const T*> objetos_;
+    std::vector<char> marcado_;
+};
+
+}  // namespace
+
 void CEModeloReguas::OrdenaPorSimbolos(CEReguaDwg& regua) {
     std::vector<CEBorneDwg*> ordem;
     ordem.reserve(regua.bornes.size());
-    // Which of the strip's terminals are placed: a flag beside each, found by address in
-    // one sorted array, with no node per terminal.
-    std::vector<const CEBorneDwg*> porEndereco(regua.bornes.begin(), regua.bornes.end());
-    std::sort(porEndereco.begin(), porEndereco.end());
-    std::vector<char> colocado(porEndereco.size(), 0);
-    auto coloca = [&](const CEBorneDwg* borne) {
-        const auto it = std::lower_bound(porEndereco.begin(), porEndereco.end(), borne);
-        char& marca = colocado[size_t(it - porEndereco.begin())];
-        return !std::exchange(marca, char(1));
-    };
-    // The symbols wired to the strip, each placing its terminals once: a flag beside each,
-    // the same way.
-    std::vector<const CEItemDwg*> simbolos;
+    // Which of the strip's terminals are placed, and which symbols wired to it placed theirs.
+    Marcas<CEBorneDwg> colocados({regua.bornes.begin(), regua.bornes.end()});
+    std::vector<const CEItemDwg*> ligados;
     for (const CEBorneDwg* borne : regua.bornes)
-        simbolos.insert(simbolos.end(), borne->ligados.begin(), borne->ligados.end());
-    std::sort(simbolos.begin(), simbolos.end());
-    simbolos.erase(std::unique(simbolos.begin(), simbolos.end()), simbolos.end());
-    std::vector<char> tratado(simbolos.size(), 0);
+        ligados.insert(ligados.end(), borne->ligados.begin(), borne->ligados.end());
+    Marcas<CEItemDwg> tratados(std::move(ligados));
     for (CEBorneDwg* borne : regua.bornes) {
         for (CEItemDwg* ligado : borne->ligados) {
-            const auto it = std::lower_bound(simbolos.begin(), simbolos.end(), ligado);
-            if (std::exchange(tratado[size_t(it - simbolos.begin())], char(1))) continue;
+            if (!tratados.Marca(ligado)) continue;
             auto* simbolo = static_cast<CESimboloDwg*>(ligado);
             for (CEBorneDwg* irmao : BornesDoSimbolo(*simbolo))
-                if (irmao->regua == &regua && coloca(irmao)) ordem.push_back(irmao);
+                if (irmao->regua == &regua && colocados.Marca(irmao)) ordem.push_back(irmao);
         }
         // A terminal its symbols did not place keeps its turn: none is lost.
-        if (coloca(borne)) ordem.push_back(borne);
+        if (colocados.Marca(borne)) ordem.push_back(borne);
     }
     regua.bornes = std::move(ordem);
 }
