@@ -4,6 +4,7 @@
 #include "ConsoleUserInterface.h"
 #include "DocumentLisp.h"
 #include "DrawingFiles.h"
+#include "HeapTuning.h"
 #include "HostDocument.h"
 #include "HugePages.h"
 #include "Interrupts.h"
@@ -187,6 +188,7 @@ int commandStatus(const QString& command, zvsdk::CommandResult result, QTextStre
 
 int runDrawing(const Options& options, QTextStream& out, QTextStream& err) {
     restartWithHugePages(options.drawing);
+    keepFreedHeapBlocks();
     const bool terminal = !options.quiet && isatty(STDOUT_FILENO);
     auto ui = std::make_unique<ConsoleUserInterface>(out, err, terminal);
     for (const QString& answer : options.answers)
