@@ -173,13 +173,13 @@ std::string_view Ascii(QStringView texto, std::array<char, 24>& espaco, QByteArr
 
 // A handle's text as the drawing writes it: upper-case hexadecimal digits without leading
 // zeros, in `digitos`.
-std::string_view TextoHandle(std::uint64_t handle, char (&digitos)[16]) {
+std::string_view TextoHandle(std::uint64_t handle, std::array<char, 16>& digitos) {
     int n = 0;
     do {
         digitos[15 - n++] = "0123456789ABCDEF"[handle & 15];
         handle >>= 4;
     } while (handle != 0);
-    return {digitos + 16 - n, std::size_t(n)};
+    return {digitos.data() + 16 - n, std::size_t(n)};
 }
 
 // The entries of a pass's pages, to size what is kept per key.
@@ -799,16 +799,20 @@ VetorItens CCDiagramaTopografico::LeItens(const std::vector<const Entrada*>& ent
         std::unique_ptr<CEItemLista> item;
         if (chave.contains('_')) {
             item.reset(LeItemAcessorio(chave, candidato, modelo));
-        } else if (const auto dono = donos_.constFind(chave); dono != donos_.constEnd()) {
-            // Read already for its accessories.
-            if (dono.value()) item = std::make_unique<CEItemLista>(*dono.value());
+        } else if (const auto dono = donos_.find(chave); dono != donos_.end()) {
+            // Read already for its accessories: that reading becomes its item, where its
+            // accessories still to come find it.
+            if (dono->lido) {
+                item = std::make_unique<CEItemLista>(std::move(*dono->lido));
+                dono->lido.reset();
+                dono->item = item.get();
+            }
         } else {
             item.reset(CriaItemEntidade(candidato.simbolo, modelo));
             if (item && !Listado(*item)) item.reset();
             if (item) Retem(*item);
             // Its accessories come next and take their owner's fields from this same read.
-            if (comAcessorios_.contains(chave))
-                donos_.insert(chave, item ? std::make_shared<const CEItemLista>(*item) : nullptr);
+            if (comAcessorios_.contains(chave)) donos_.insert(chave, {item.get(), nullptr});
         }
         if (!item) continue;
         static const std::uint32_t kNumeroHandle = CamposItem::numero(kHandle),
@@ -831,11 +835,11 @@ CEItemLista* CCDiagramaTopografico::LeItemAcessorio(const QString& chave,
         std::shared_ptr<CEItemLista> lido(CriaItemEntidade(candidato.simbolo, modelo));
         if (lido && !Listado(*lido)) lido.reset();
         if (lido) Retem(*lido);
-        dono = donos_.insert(simbolo, lido);
+        dono = donos_.insert(simbolo, {lido.get(), lido});
     }
     // The accessory of a symbol that is not on the lists is not in the panel either.
-    if (!dono.value()) return nullptr;
-    const CEItemLista& origem = *dono.value();
+    if (!dono->item) return nullptr;
+    const CEItemLista& origem = *dono->item;
     auto item = std::make_unique<CEItemLista>();
     item->ids = origem.ids;
     // It sits with its owner: the owner's tag, strip, number and page, in every language.
@@ -1000,6 +1004,7 @@ void CCDiagramaTopografico::Desenha(const std::vector<Pagina>& paginas,
         if (progresso_) progresso_->Definir(progresso_->Percentual());
     }
     if (anterior) Insere(*anterior, feitas[paginaAnterior], posicoes.value(*anterior));
+    LigaSimbolos();
 }
 
 void CCDiagramaTopografico::Insere(const QString& chave, PaginaFeita& pagina,
@@ -1031,7 +1036,7 @@ void CCDiagramaTopografico::Insere(const QString& chave, PaginaFeita& pagina,
     // The item's handle field is its candidate's key.
     const int corte = chave.indexOf('_');
     const bool acessorio = corte >= 0;
-    const QString prefixo = acessorio ? chave.left(corte) : QString();
+    const QStringView prefixo = acessorio ? QStringView(chave).left(corte) : QStringView();
     std::array<char, 24> handleA, prefixoA;
     QByteArray handleU8, prefixoU8, chaveU8;
     std::vector<std::string_view> link{Vista(representacaoU8_),
@@ -1042,12 +1047,10 @@ void CCDiagramaTopografico::Insere(const QString& chave, PaginaFeita& pagina,
         link.push_back(Vista(chaveU8));
     }
     CICad::SetXDataTextos(ref, acessorio ? kAppRepresentacaoAce : kAppRepresentacao, link);
-    // A symbol's own block is linked once a run; its accessories' blocks share one chain.
-    bool semLigacoes = candidato->semLigacoes;
-    if (acessorio && semLigacoes)
-        semLigacoes = comAcessorioLigado_.insert(candidato->simbolo.handle()).second;
-    char digitos[16];
-    LigaSimbolo(candidato->simbolo, prefixo, TextoHandle(ref.handle(), digitos), semLigacoes);
+    // The symbol names the block when the pass is over (the key outlives the pass); a block
+    // whose symbol is gone stays unlinked, and the next run adds it again.
+    if (!candidato->simbolo.isNull())
+        ligacoes_.push_back({candidato->simbolo.handle(), candidato, prefixo, ref.handle()});
     // Each item goes in once: it gives its room to the blocks that follow, a batch at a time.
     lido->item = nullptr;
     itensInseridos_.itens.push_back(item);
@@ -1063,34 +1066,91 @@ void CCDiagramaTopografico::EntregaInseridos() {
     Descarte::Descartar(std::exchange(itensInseridos_, {}));
 }
 
-void CCDiagramaTopografico::LigaSimbolo(const OdDbObjectId& simbolo, const QString& lugar,
-                                        std::string_view bloco, bool semLigacoes) {
-    if (simbolo.isNull()) return;  // the block stays unlinked; the next run adds it again
-    const bool acessorio = !lugar.isEmpty();
+void CCDiagramaTopografico::LigaSimbolos() {
+    // By symbol; a symbol's links stay in the order its blocks went in.
+    std::stable_sort(ligacoes_.begin(), ligacoes_.end(),
+                     [](const Ligacao& a, const Ligacao& b) { return a.simbolo < b.simbolo; });
+    Cadeia propria, acessorios;
+    for (size_t i = 0, fim = 0; i < ligacoes_.size(); i = fim) {
+        fim = i + 1;
+        while (fim < ligacoes_.size() && ligacoes_[fim].simbolo == ligacoes_[i].simbolo)
+            ++fim;
+        LigaSimbolo(ligacoes_.data() + i, ligacoes_.data() + fim, propria, acessorios);
+    }
+    ligacoes_.clear();
+}
+
+void CCDiagramaTopografico::LigaSimbolo(const Ligacao* inicio, const Ligacao* fim, Cadeia& propria,
+                                        Cadeia& acessorios) {
+    const OdDbObjectId& simbolo = inicio->candidato->simbolo;
+    for (Cadeia* cadeia : {&propria, &acessorios}) {
+        cadeia->pares.clear();
+        cadeia->lida = false;
+    }
+    // A chain that the symbol lacks is added after its others: the one linked first first.
+    Cadeia* ordem[2] = {nullptr, nullptr};
+    for (const Ligacao* ligacao = inicio; ligacao != fim; ++ligacao) {
+        const bool acessorio = !ligacao->lugar.isEmpty();
+        Cadeia& cadeia = acessorio ? acessorios : propria;
+        if (!cadeia.lida) {
+            // A symbol's own block is linked once a run; its accessories' blocks share one
+            // chain, empty at the start when the run found it so and no pass linked it yet.
+            bool semLigacoes = ligacao->candidato->semLigacoes;
+            if (acessorio && semLigacoes)
+                semLigacoes = comAcessorioLigado_.insert(ligacao->simbolo).second;
+            if (!semLigacoes) LeCadeia(simbolo, acessorio, cadeia);
+            cadeia.lida = true;
+            *(ordem[0] ? &ordem[1] : &ordem[0]) = &cadeia;
+        }
+        // At most one block per representation, and for accessories one per place in the
+        // symbol's list: the old block of the same one goes.
+        std::vector<Par>& pares = cadeia.pares;
+        pares.erase(std::remove_if(pares.begin(), pares.end(),
+                                   [&](const Par& par) {
+                                       return par.mesmaRep &&
+                                              (!acessorio || par.Lugar() == ligacao->lugar);
+                                   }),
+                    pares.end());
+        Par novo;
+        novo.lugar = ligacao->lugar;
+        novo.bloco = ligacao->bloco;
+        novo.mesmaRep = true;
+        pares.push_back(std::move(novo));
+    }
+    for (const Cadeia* cadeia : ordem)
+        if (cadeia) GravaCadeia(simbolo, cadeia == &acessorios, *cadeia);
+}
+
+void CCDiagramaTopografico::LeCadeia(const OdDbObjectId& simbolo, bool acessorio,
+                                     Cadeia& cadeia) const {
     static const QString kEsq(kAppRepresentacaoEsq), kAceEsq(kAppRepresentacaoAceEsq);
-    const QString& aplicacao = acessorio ? kAceEsq : kEsq;
-    // At most one block per representation, and for accessories one per place in the
-    // symbol's list: a stale pair, or the old block of the same one, goes.
-    std::vector<QByteArray> ficam;
-    const auto pares = semLigacoes ? std::vector<std::pair<QString, QString>>()
-                                   : Pares(CICad::GetXData(simbolo, aplicacao));
-    for (const auto& [rep, ligado] : pares) {
+    for (const auto& [rep, ligado] : Pares(CICad::GetXData(simbolo, acessorio ? kAceEsq : kEsq))) {
+        // A stale pair goes, and so does an accessory's block that says no place.
         const OdDbObjectId id = CICad::IdDoHandle(ligado);
         if (id.isNull()) continue;
-        if (rep == parametros_.representacao) {
-            if (!acessorio) continue;
+        Par par;
+        par.mesmaRep = rep == parametros_.representacao;
+        if (par.mesmaRep && acessorio) {
             const CEListaXData link = CICad::GetXData(id, kAppRepresentacaoAce);
-            if (link.size() < 3 || link[2].texto == lugar) continue;
+            if (link.size() < 3) continue;
+            par.lugarLido = link[2].texto;
         }
-        ficam.push_back(rep.toUtf8());
-        ficam.push_back(ligado.toUtf8());
+        par.rep = rep.toUtf8();
+        par.ligado = ligado.toUtf8();
+        cadeia.pares.push_back(std::move(par));
     }
-    std::vector<std::string_view> cadeia;
-    cadeia.reserve(ficam.size() + 2);
-    for (const QByteArray& texto : ficam)
-        cadeia.push_back(Vista(texto));
-    cadeia.push_back(Vista(representacaoU8_));
-    cadeia.push_back(bloco);
+}
+
+void CCDiagramaTopografico::GravaCadeia(const OdDbObjectId& simbolo, bool acessorio,
+                                        const Cadeia& cadeia) const {
+    std::vector<std::array<char, 16>> digitos(cadeia.pares.size());
+    std::vector<std::string_view> textos;
+    textos.reserve(2 * cadeia.pares.size());
+    for (size_t i = 0; i < cadeia.pares.size(); ++i) {
+        const Par& par = cadeia.pares[i];
+        textos.push_back(par.bloco ? Vista(representacaoU8_) : Vista(par.rep));
+        textos.push_back(par.bloco ? TextoHandle(par.bloco, digitos[i]) : Vista(par.ligado));
+    }
     CICad::SetXDataTextos(simbolo, acessorio ? kAppRepresentacaoAceEsq : kAppRepresentacaoEsq,
-                          cadeia);
+                          textos);
 }

@@ -12,6 +12,7 @@
 #include <QSet>
 #include <QString>
 #include <QStringList>
+#include <QStringView>
 
 #include <cstdint>
 #include <map>
@@ -164,10 +165,35 @@ private:
         bool pronta = false;
     };
     void Insere(const QString& chave, PaginaFeita& pagina, const CEPonto& ponto);
-    // `lugar` is an accessory's place ("*0", "#1"), empty for the symbol's own block;
-    // `semLigacoes`: the symbol is known to have no links of that kind yet.
-    void LigaSimbolo(const OdDbObjectId& simbolo, const QString& lugar, std::string_view bloco,
-                     bool semLigacoes);
+    // A block that went in, to be named in its symbol's chain when the pass is over: a
+    // symbol's chains are then read and written once, however many of its blocks the pass
+    // drew.
+    struct Ligacao {
+        std::uint64_t simbolo = 0;
+        const Candidato* candidato = nullptr;
+        QStringView lugar;  // an accessory's place ("*0", "#1"); empty for the symbol's block
+        std::uint64_t bloco = 0;
+    };
+    // A pair of a symbol's chain: a representation and a block of it.
+    struct Par {
+        QByteArray rep, ligado;   // as read, for a pair made before this pass
+        QString lugarLido;        // the place an accessory's block of this representation shows
+        QStringView lugar;        // the place of a block of this pass
+        std::uint64_t bloco = 0;  // a block of this pass (its texts are made when written)
+        bool mesmaRep = false;    // of the run's representation
+        QStringView Lugar() const { return bloco ? lugar : QStringView(lugarLido); }
+    };
+    struct Cadeia {
+        std::vector<Par> pares;
+        bool lida = false;
+    };
+    void LigaSimbolos();
+    // One symbol's links, in the order its blocks went in.
+    void LigaSimbolo(const Ligacao* inicio, const Ligacao* fim, Cadeia& propria,
+                     Cadeia& acessorios);
+    // The chain as the symbol has it now, less the pairs no link keeps (gone blocks).
+    void LeCadeia(const OdDbObjectId& simbolo, bool acessorio, Cadeia& cadeia) const;
+    void GravaCadeia(const OdDbObjectId& simbolo, bool acessorio, const Cadeia& cadeia) const;
 
     Parametros parametros_;
     QString diretorio_;
@@ -185,8 +211,14 @@ private:
     };
     Inseridos itensInseridos_;
     void EntregaInseridos();
-    // The owners of accessories, read once each; null for one that gives no listed item.
-    QHash<QString, std::shared_ptr<const CEItemLista>> donos_;
+    // The owners of accessories, read once each: null for one that gives no listed item.
+    // An owner that is a candidate itself is its own item among those read; one read first
+    // for an accessory is kept here until its own turn (or for good, when it has none).
+    struct Dono {
+        const CEItemLista* item = nullptr;
+        std::shared_ptr<CEItemLista> lido;
+    };
+    QHash<QString, Dono> donos_;
     // The symbols that have accessories among the candidates.
     QSet<QString> comAcessorios_;
     // By name number, the fields kept of items read; empty: all of them.
@@ -197,6 +229,8 @@ private:
     QHash<QString, OdDbObjectId> definicoes_;
     // The symbols given an accessory's link in this run: their chains are no longer empty.
     std::unordered_set<std::uint64_t> comAcessorioLigado_;
+    // The links of the pass being drawn.
+    std::vector<Ligacao> ligacoes_;
     CIProgress* progresso_ = nullptr;
     int inseridos_ = 0;
     int paginasCriadas_ = 0;

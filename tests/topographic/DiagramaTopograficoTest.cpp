@@ -631,6 +631,41 @@ TEST_F(AcessoriosTopograficos, ChainsThatNameAnotherRepresentationsBlocksKeepThe
     EXPECT_EQ(aceEsq_[k2], QStringList({"1", acessorios.at("*0_" + k2).handle}));
 }
 
+TEST_F(AcessoriosTopograficos, ChainsGrowOverBothPassesInTheOrderTheirBlocksWentIn) {
+    // -K1 adds a terminal too, drawn in the terminals' pass after its other accessories; the
+    // terminal -X1:1 adds a side contact, drawn with the ordinary blocks before the terminal.
+    k1_->setXData("ZV_VINC_ADITIVO",
+                  XDataItems().text("1").text("3006").text("1").text("1001").tags());
+    x11_->setXData("ZV_VINC_ADITIVO", XDataItems().text("1").text("3006").tags());
+    ASSERT_EQ(Executa(), zvsdk::CommandResult::Succeeded) << Saida().toStdString();
+    const auto todas = Salvo();
+    const auto blocos = PorSimbolo(todas);
+    const auto acessorios = PorAcessorio(todas);
+    const QString k1 = H(k1_), x11 = H(x11_);
+    ASSERT_EQ(acessorios.count("#1_" + k1), 1u);
+    ASSERT_EQ(acessorios.count("#0_" + x11), 1u);
+    EXPECT_EQ(acessorios.at("#1_" + k1).nome, "TOPO_BX2_5_GY_1");
+    // The terminal's pass adds to the chain the ordinary pass made.
+    EXPECT_EQ(aceEsq_[k1], QStringList({"1", acessorios.at("#0_" + k1).handle, "1",
+                                        acessorios.at("*0_" + k1).handle, "1",
+                                        acessorios.at("#1_" + k1).handle}));
+    EXPECT_EQ(esq_[k1], QStringList({"1", blocos.at(k1).handle}));
+    EXPECT_EQ(aceEsq_[x11], QStringList({"1", acessorios.at("#0_" + x11).handle}));
+    EXPECT_EQ(esq_[x11], QStringList({"1", blocos.at(x11).handle}));
+    // A symbol's chains follow its other data in the order they were first linked.
+    const auto ordem = [](const zvdb::DbObject* simbolo) {
+        QStringList nomes;
+        for (const std::string_view nome : simbolo->xdataApplications())
+            if (nome.starts_with("KVR_ZV_REPRESENTACAO"))
+                nomes << QString::fromUtf8(nome.data(), int(nome.size()));
+        return nomes;
+    };
+    EXPECT_EQ(ordem(k1_),
+              QStringList({"KVR_ZV_REPRESENTACAO_ESQ", "KVR_ZV_REPRESENTACAO_ACE_ESQ"}));
+    EXPECT_EQ(ordem(x11_),
+              QStringList({"KVR_ZV_REPRESENTACAO_ACE_ESQ", "KVR_ZV_REPRESENTACAO_ESQ"}));
+}
+
 TEST_F(AcessoriosTopograficos, AnAccessoryWhoseSymbolIsNotListedIsLeftOutWithIt) {
     // A duct, not on the lists, that adds a side contact: neither is drawn.
     Simbolo("CANALETA", "8503\f1", {{"RELACAO", "-W2"}})
