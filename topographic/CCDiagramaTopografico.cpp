@@ -191,6 +191,22 @@ int Quantidade(const std::vector<CCDiagramaTopografico::Pagina>& paginas) {
     return int(n);
 }
 
+// Where each item was read in its pass, as its sequence field says, in the items' order;
+// an item with no place among the `lidos` read falls out.
+std::vector<std::uint32_t> Lugares(const VetorItens& itens, std::size_t lidos) {
+    static const std::uint32_t kSequencia =
+        CamposItem::numero(QString::fromLatin1(kCampoSequencia));
+    std::vector<std::uint32_t> lugares;
+    lugares.reserve(itens.size());
+    for (const CEItemLista* item : itens) {
+        bool ok = false;
+        const QString* valor = item->campos.procura(kSequencia);
+        const std::uint32_t lugar = valor ? valor->toUInt(&ok) : 0;
+        if (ok && lugar < lidos) lugares.push_back(lugar);
+    }
+    return lugares;
+}
+
 }  // namespace
 
 // ---- extents and the rectangle
@@ -236,16 +252,24 @@ CCDiagramaTopografico::Retangulo CCDiagramaTopografico::RetanguloDe(const CEPont
 
 // ---- rows and pages
 
-std::vector<CCDiagramaTopografico::Linha> CCDiagramaTopografico::LinhasBlocos(
-    const std::vector<QString>& chaves, const Extensoes& extensoes, double largura, double margem,
-    int colunas) {
-    std::vector<Linha> linhas;
+// The layout works on any key: the candidates' keys, or the places of the items read, with
+// what a key's block measures given by `extensao` (and `passo`), and each point handed to
+// `poe`.
+namespace {
+
+using D = CCDiagramaTopografico;
+
+template <class Chave, class ExtensaoDe>
+std::vector<std::vector<Chave>> LinhasDeBlocos(const std::vector<Chave>& chaves,
+                                               const ExtensaoDe& extensao, double largura,
+                                               double margem, int colunas) {
+    std::vector<std::vector<Chave>> linhas;
     size_t i = 0;
     while (i < chaves.size()) {
-        Linha linha;
+        std::vector<Chave> linha;
         double t = 0.0;
         do {
-            const double w = extensoes.value(chaves[i]).Largura() + margem;
+            const double w = extensao(chaves[i]).Largura() + margem;
             t += w;
             // A block wider than the rectangle gets a row of its own and sticks out.
             if (!(t < largura || (linha.empty() && w >= largura))) break;
@@ -258,13 +282,15 @@ std::vector<CCDiagramaTopografico::Linha> CCDiagramaTopografico::LinhasBlocos(
     return linhas;
 }
 
-std::vector<CCDiagramaTopografico::Linha> CCDiagramaTopografico::LinhasBornes(
-    const std::vector<Borne>& bornes, double largura, double margem) {
-    std::vector<Linha> linhas;
+// `Borne` has a key, a step and a strip name.
+template <class Borne, class Chave = decltype(Borne::chave)>
+std::vector<std::vector<Chave>> LinhasDeBornes(const std::vector<Borne>& bornes, double largura,
+                                               double margem) {
+    std::vector<std::vector<Chave>> linhas;
     QString ultimaRegua;
     size_t i = 0;
     while (i < bornes.size()) {
-        Linha linha;
+        std::vector<Chave> linha;
         double t = 0.0;
         while (t < largura && i < bornes.size()) {
             const Borne& borne = bornes[i];
@@ -290,27 +316,102 @@ std::vector<CCDiagramaTopografico::Linha> CCDiagramaTopografico::LinhasBornes(
     return linhas;
 }
 
-std::vector<CCDiagramaTopografico::Pagina> CCDiagramaTopografico::Paginas(
-    const std::vector<Linha>& linhas, const Extensoes& extensoes, double altura, double margem,
-    int maxLinhas) {
-    std::vector<Pagina> paginas;
+template <class Chave, class ExtensaoDe>
+std::vector<std::vector<std::vector<Chave>>> PaginasDe(std::vector<std::vector<Chave>> linhas,
+                                                       const ExtensaoDe& extensao, double altura,
+                                                       double margem, int maxLinhas) {
+    std::vector<std::vector<std::vector<Chave>>> paginas;
     if (linhas.empty()) return paginas;
     paginas.emplace_back();
     double u = 0.0;
-    for (const Linha& linha : linhas) {
+    for (std::vector<Chave>& linha : linhas) {
         double h = 0.0;
-        for (const QString& chave : linha)
-            h = std::max(h, extensoes.value(chave).Altura());
-        Pagina& atual = paginas.back();
+        for (const Chave& chave : linha)
+            h = std::max(h, extensao(chave).Altura());
+        std::vector<std::vector<Chave>>& atual = paginas.back();
         if ((u + h > altura && !atual.empty()) ||
             (maxLinhas > 0 && atual.size() >= size_t(maxLinhas))) {
             paginas.emplace_back();
             u = 0.0;
         }
-        paginas.back().push_back(linha);
+        paginas.back().push_back(std::move(linha));
         u += h + margem;
     }
     return paginas;
+}
+
+template <class Chave, class ExtensaoDe, class Poe>
+void PosicoesDeBlocos(const std::vector<std::vector<std::vector<Chave>>>& paginas,
+                      const ExtensaoDe& extensao, const D::Retangulo& retangulo, double margem,
+                      const Poe& poe) {
+    for (const auto& pagina : paginas) {
+        double y = retangulo.topo;
+        for (const std::vector<Chave>& linha : pagina) {
+            double soma = 0.0, h = 0.0;
+            for (const Chave& chave : linha) {
+                const D::Extensao e = extensao(chave);
+                if (e.xMin >= 0 && e.xMax >= 0) soma += e.Largura();
+                h = std::max(h, e.Altura());
+            }
+            // The row fills the whole width, with equal gaps between its blocks.
+            const double folga = retangulo.largura - soma;
+            const double n = double(linha.size());
+            double c = retangulo.esquerda;
+            for (const Chave& chave : linha) {
+                const D::Extensao e = extensao(chave);
+                poe(chave, CEPonto{c - e.MenorX(), (h - e.Altura()) * 0.5 + y - h, 0.0});
+                if (linha.size() > 1) c += e.Largura() + folga / (n - 1);
+            }
+            y -= h + margem;
+        }
+    }
+}
+
+template <class Chave, class ExtensaoDe, class PassoDe, class Poe>
+void PosicoesDeBornes(const std::vector<std::vector<std::vector<Chave>>>& paginas,
+                      const ExtensaoDe& extensao, const PassoDe& passo,
+                      const D::Retangulo& retangulo, double margem, const Poe& poe) {
+    for (const auto& pagina : paginas) {
+        double y = retangulo.topo;
+        for (const std::vector<Chave>& linha : pagina) {
+            double h = 0.0;
+            for (const Chave& chave : linha)
+                h = std::max(h, extensao(chave).Altura());
+            double c = retangulo.esquerda;
+            for (const Chave& chave : linha) {
+                const double d = passo(chave);
+                // A doubled entry gives two points: the later, further one stays.
+                poe(chave, CEPonto{c - d, (h - extensao(chave).Altura()) * 0.5 + y - h, 0.0});
+                c += d;
+            }
+            y -= h + margem;
+        }
+    }
+}
+
+// A key's block as the table of extents has it (nothing for a key it lacks).
+struct ExtensaoNaTabela {
+    const D::Extensoes& extensoes;
+    D::Extensao operator()(const QString& chave) const { return extensoes.value(chave); }
+};
+
+}  // namespace
+
+std::vector<CCDiagramaTopografico::Linha> CCDiagramaTopografico::LinhasBlocos(
+    const std::vector<QString>& chaves, const Extensoes& extensoes, double largura, double margem,
+    int colunas) {
+    return LinhasDeBlocos(chaves, ExtensaoNaTabela{extensoes}, largura, margem, colunas);
+}
+
+std::vector<CCDiagramaTopografico::Linha> CCDiagramaTopografico::LinhasBornes(
+    const std::vector<Borne>& bornes, double largura, double margem) {
+    return LinhasDeBornes(bornes, largura, margem);
+}
+
+std::vector<CCDiagramaTopografico::Pagina> CCDiagramaTopografico::Paginas(
+    const std::vector<Linha>& linhas, const Extensoes& extensoes, double altura, double margem,
+    int maxLinhas) {
+    return PaginasDe(linhas, ExtensaoNaTabela{extensoes}, altura, margem, maxLinhas);
 }
 
 QHash<QString, CEPonto> CCDiagramaTopografico::PosicoesBlocos(const std::vector<Pagina>& paginas,
@@ -319,27 +420,9 @@ QHash<QString, CEPonto> CCDiagramaTopografico::PosicoesBlocos(const std::vector<
                                                               double margem) {
     QHash<QString, CEPonto> posicoes;
     posicoes.reserve(Quantidade(paginas));
-    for (const Pagina& pagina : paginas) {
-        double y = retangulo.topo;
-        for (const Linha& linha : pagina) {
-            double soma = 0.0, h = 0.0;
-            for (const QString& chave : linha) {
-                const Extensao e = extensoes.value(chave);
-                if (e.xMin >= 0 && e.xMax >= 0) soma += e.Largura();
-                h = std::max(h, e.Altura());
-            }
-            // The row fills the whole width, with equal gaps between its blocks.
-            const double folga = retangulo.largura - soma;
-            const double n = double(linha.size());
-            double c = retangulo.esquerda;
-            for (const QString& chave : linha) {
-                const Extensao e = extensoes.value(chave);
-                posicoes[chave] = {c - e.MenorX(), (h - e.Altura()) * 0.5 + y - h, 0.0};
-                if (linha.size() > 1) c += e.Largura() + folga / (n - 1);
-            }
-            y -= h + margem;
-        }
-    }
+    PosicoesDeBlocos(
+        paginas, ExtensaoNaTabela{extensoes}, retangulo, margem,
+        [&posicoes](const QString& chave, const CEPonto& ponto) { posicoes[chave] = ponto; });
     return posicoes;
 }
 
@@ -350,23 +433,10 @@ QHash<QString, CEPonto> CCDiagramaTopografico::PosicoesBornes(const std::vector<
                                                               double margem) {
     QHash<QString, CEPonto> posicoes;
     posicoes.reserve(Quantidade(paginas));
-    for (const Pagina& pagina : paginas) {
-        double y = retangulo.topo;
-        for (const Linha& linha : pagina) {
-            double h = 0.0;
-            for (const QString& chave : linha)
-                h = std::max(h, extensoes.value(chave).Altura());
-            double c = retangulo.esquerda;
-            for (const QString& chave : linha) {
-                const double d = passos.value(chave);
-                const Extensao e = extensoes.value(chave);
-                // A doubled entry writes twice: the later, further point stays.
-                posicoes[chave] = {c - d, (h - e.Altura()) * 0.5 + y - h, 0.0};
-                c += d;
-            }
-            y -= h + margem;
-        }
-    }
+    PosicoesDeBornes(
+        paginas, ExtensaoNaTabela{extensoes},
+        [&passos](const QString& chave) { return passos.value(chave); }, retangulo, margem,
+        [&posicoes](const QString& chave, const CEPonto& ponto) { posicoes[chave] = ponto; });
     return posicoes;
 }
 
@@ -428,7 +498,6 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
         CCDiagramaTopografico& d;
         ~Fim() {
             d.progresso_ = nullptr;
-            d.itensPorHandle_.clear();
             d.camposUsados_.clear();
             d.CamposLidos = nullptr;
             d.definicoes_.clear();
@@ -502,9 +571,9 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     // Each symbol is read once (an accessory's owner is kept in donos_) and never again as a
     // neighbour: its reading need not be kept.
     GuardaSimbolos = false;
-    itensPorHandle_.reserve(int(comuns.size() + bornes.size()));
-    VetorItens itensComuns = LeItens(comuns, modelo);
-    VetorItens itensBornes = LeItens(bornes, modelo);
+    Lidos lidosComuns, lidosBornes;
+    VetorItens itensComuns = LeItens(comuns, modelo, lidosComuns);
+    VetorItens itensBornes = LeItens(bornes, modelo, lidosBornes);
     // Everything is read: what the reading kept goes before the drawing grows.
     LiberaLeituras();
     Descarte::Largar(donos_);
@@ -529,11 +598,15 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
         progresso.Fechar();
         return;
     }
-    LePassos(itensBornes);
+    LePassos(itensBornes, lidosBornes);
     // Items that sort alike keep the order above.
     itensComuns.ordenarEstavel(p.ordenacao);
     itensBornes.ordenarEstavel(p.ordenacao);
-    LeExtensoes();
+    {
+        QHash<QString, Extensao> porBloco;
+        LeExtensoes(lidosComuns, porBloco);
+        LeExtensoes(lidosBornes, porBloco);
+    }
     progresso.Definir(50);
 
     CICad::RegistraApp(kAppRepresentacao);
@@ -541,57 +614,35 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     CICad::RegistraApp(kAppRepresentacaoAce);
     CICad::RegistraApp(kAppRepresentacaoAceEsq);
 
-    // Both passes are laid out first: the blocks' extents and the steps then go before the
-    // drawing grows.
-    std::vector<Pagina> paginasComuns, paginasBornes;
-    QHash<QString, CEPonto> posicoesComuns, posicoesBornes;
-    if (!itensComuns.empty()) {
-        std::vector<QString> chaves;
-        chaves.reserve(itensComuns.size());
-        for (const CEItemLista* item : itensComuns)
-            chaves.push_back(item->valorCampo(kHandle));
-        const auto linhas =
-            LinhasBlocos(chaves, extensoes_, retangulo.largura, p.margem, p.colunas);
-        paginasComuns = Paginas(linhas, extensoes_, retangulo.altura, p.margem, p.linhas);
-        posicoesComuns = PosicoesBlocos(paginasComuns, extensoes_, retangulo, p.margem);
-    }
-    if (!itensBornes.empty()) {
-        std::vector<Borne> lista;
-        lista.reserve(itensBornes.size());
-        for (const CEItemLista* item : itensBornes) {
-            const QString chave = item->valorCampo(kHandle);
-            lista.push_back({chave, passos_.value(chave), ReguaDe(*item)});
-        }
-        const auto linhas = LinhasBornes(lista, retangulo.largura, p.margem);
-        paginasBornes = Paginas(linhas, extensoes_, retangulo.altura, p.margem, p.linhas);
-        posicoesBornes = PosicoesBornes(paginasBornes, extensoes_, passos_, retangulo, p.margem);
-    }
-    Descarte::Largar(extensoes_);
-    Descarte::Largar(passos_);
+    // Both passes are laid out first: the readings of the sort go before the drawing grows.
+    std::vector<PaginaLida> paginasComuns = PaginasComuns(itensComuns, lidosComuns, retangulo);
+    std::vector<PaginaLida> paginasBornes = PaginasBornes(itensBornes, lidosBornes, retangulo);
     // From here each item is given back as its block goes in; those left go at the end, with
-    // the table that finds them.
+    // the readings that hold them.
     struct Restantes {
-        QHash<QString, Lido> itens;
-        explicit Restantes(QHash<QString, Lido>&& v) noexcept : itens(std::move(v)) {}
+        Lidos comuns, bornes;
+        Restantes(Lidos&& c, Lidos&& b) noexcept : comuns(std::move(c)), bornes(std::move(b)) {}
         Restantes(Restantes&&) noexcept = default;
         ~Restantes() {
-            for (Lido& lido : itens)
-                delete lido.item;
+            for (Lidos* lidos : {&comuns, &bornes})
+                for (Lido& lido : *lidos)
+                    delete lido.item;
         }
     };
     struct Entrega {
-        QHash<QString, Lido>& itens;
-        ~Entrega() { Descarte::Descartar(Restantes{std::exchange(itens, {})}); }
-    } entrega{itensPorHandle_};
+        Lidos& comuns;
+        Lidos& bornes;
+        ~Entrega() {
+            Descarte::Descartar(Restantes{std::exchange(comuns, {}), std::exchange(bornes, {})});
+        }
+    } entrega{lidosComuns, lidosBornes};
     itensComuns.clear();
     itensBornes.clear();
-    if (!paginasComuns.empty()) Desenha(paginasComuns, posicoesComuns);
-    Descarte::Largar(posicoesComuns);
+    if (!paginasComuns.empty()) Desenha(paginasComuns, lidosComuns);
     Descarte::Largar(paginasComuns);
     progresso.Definir(75);
-    if (!paginasBornes.empty()) Desenha(paginasBornes, posicoesBornes);
+    if (!paginasBornes.empty()) Desenha(paginasBornes, lidosBornes);
     EntregaInseridos();
-    Descarte::Largar(posicoesBornes);
     Descarte::Largar(paginasBornes);
     CICad::zvInvokeVoid("atualizaTopografico");
     progresso.Definir(100);
@@ -790,8 +841,9 @@ bool CCDiagramaTopografico::AcessorioDesenhado(const QString& chave, Candidato& 
 }
 
 VetorItens CCDiagramaTopografico::LeItens(const std::vector<const Entrada*>& entradas,
-                                          CETemplate& modelo) {
+                                          CETemplate& modelo, Lidos& lidos) {
     VetorItens itens;
+    lidos.reserve(entradas.size());
     for (const Entrada* entrada : entradas) {
         const QString& chave = entrada->first;
         const Candidato& candidato = entrada->second;
@@ -820,7 +872,7 @@ VetorItens CCDiagramaTopografico::LeItens(const std::vector<const Entrada*>& ent
                                        CamposItem::numero(QString::fromLatin1(kCampoSequencia));
         item->definirCampo(kNumeroHandle, chave);
         item->definirCampo(kNumeroSequencia, QString::number(itens.size()));
-        itensPorHandle_.insert(chave, {item.get(), &candidato});
+        lidos.push_back({item.get(), &candidato, &chave, {}, 0.0, {}});
         itens.push_back(item.release());
     }
     return itens;
@@ -930,14 +982,14 @@ void CCDiagramaTopografico::Retem(CEItemLista& item) const {
         [&usados](std::uint32_t nome) { return nome < usados.size() && usados[nome]; });
 }
 
-void CCDiagramaTopografico::LePassos(const VetorItens& bornes) {
+void CCDiagramaTopografico::LePassos(const VetorItens& bornes, Lidos& lidos) const {
     // The step is the default text of the block's attribute named by PBLTOPO_BORNEDIST.
+    // The items are still in the order they were read.
     QHash<QString, QString> porBloco;
-    passos_.reserve(int(bornes.size()));
     const QString& tag = parametros_.borneDist;
-    for (CEItemLista* item : bornes) {
-        const QString chave = item->valorCampo(kHandle);
-        const Candidato* candidato = itensPorHandle_.value(chave).candidato;
+    for (size_t lugar = 0; lugar < bornes.size() && lugar < lidos.size(); ++lugar) {
+        CEItemLista* item = bornes[lugar];
+        const Candidato* candidato = lidos[lugar].candidato;
         if (!candidato) continue;
         const QString& nome = candidato->nome;
         auto achado = porBloco.constFind(nome);
@@ -952,17 +1004,14 @@ void CCDiagramaTopografico::LePassos(const VetorItens& bornes) {
             achado = porBloco.insert(nome, passo.isEmpty() ? QString(kPassoPadrao) : passo);
         }
         if (!tag.isEmpty()) item->definirCampo(tag, achado.value());
-        passos_.insert(chave, CETemplateLisp::TextoParaReal(achado.value()));
+        lidos[lugar].passo = CETemplateLisp::TextoParaReal(achado.value());
     }
 }
 
-void CCDiagramaTopografico::LeExtensoes() {
+void CCDiagramaTopografico::LeExtensoes(Lidos& lidos, QHash<QString, Extensao>& porBloco) {
     // Once per block, for the candidates that have an item: only those are laid out.
-    QHash<QString, Extensao> porBloco;
-    extensoes_.reserve(itensPorHandle_.size());
-    for (auto it = itensPorHandle_.constBegin(); it != itensPorHandle_.constEnd(); ++it) {
-        const QString& chave = it.key();
-        const QString& nome = it->candidato->nome;
+    for (Lido& lido : lidos) {
+        const QString& nome = lido.candidato->nome;
         auto achado = porBloco.constFind(nome);
         if (achado == porBloco.constEnd()) {
             Extensao extensao;
@@ -973,14 +1022,50 @@ void CCDiagramaTopografico::LeExtensoes() {
                 extensao = ExtensaoAbsoluta(xMin, xMax, yMin, yMax);
             achado = porBloco.insert(nome, extensao);
         }
-        extensoes_.insert(chave, achado.value());
+        lido.extensao = achado.value();
     }
+}
+
+// ---- the passes' layout
+
+std::vector<CCDiagramaTopografico::PaginaLida> CCDiagramaTopografico::PaginasComuns(
+    const VetorItens& itens, Lidos& lidos, const Retangulo& retangulo) const {
+    const Parametros& p = parametros_;
+    const auto extensao = [&lidos](std::uint32_t lugar) { return lidos[lugar].extensao; };
+    auto paginas = PaginasDe(LinhasDeBlocos(Lugares(itens, lidos.size()), extensao,
+                                            retangulo.largura, p.margem, p.colunas),
+                             extensao, retangulo.altura, p.margem, p.linhas);
+    PosicoesDeBlocos(
+        paginas, extensao, retangulo, p.margem,
+        [&lidos](std::uint32_t lugar, const CEPonto& ponto) { lidos[lugar].ponto = ponto; });
+    return paginas;
+}
+
+std::vector<CCDiagramaTopografico::PaginaLida> CCDiagramaTopografico::PaginasBornes(
+    const VetorItens& itens, Lidos& lidos, const Retangulo& retangulo) const {
+    struct BorneLido {
+        std::uint32_t chave;
+        double passo;
+        QString regua;
+    };
+    std::vector<BorneLido> bornes;
+    bornes.reserve(itens.size());
+    for (const std::uint32_t lugar : Lugares(itens, lidos.size()))
+        bornes.push_back({lugar, lidos[lugar].passo, ReguaDe(*lidos[lugar].item)});
+    const Parametros& p = parametros_;
+    const auto extensao = [&lidos](std::uint32_t lugar) { return lidos[lugar].extensao; };
+    auto paginas = PaginasDe(LinhasDeBornes(bornes, retangulo.largura, p.margem), extensao,
+                             retangulo.altura, p.margem, p.linhas);
+    PosicoesDeBornes(
+        paginas, extensao, [&lidos](std::uint32_t lugar) { return lidos[lugar].passo; }, retangulo,
+        p.margem,
+        [&lidos](std::uint32_t lugar, const CEPonto& ponto) { lidos[lugar].ponto = ponto; });
+    return paginas;
 }
 
 // ---- pages and insertion
 
-void CCDiagramaTopografico::Desenha(const std::vector<Pagina>& paginas,
-                                    const QHash<QString, CEPonto>& posicoes) {
+void CCDiagramaTopografico::Desenha(const std::vector<PaginaLida>& paginas, Lidos& lidos) {
     // Every page first, so that no page change happens while blocks go in.
     std::vector<PaginaFeita> feitas(paginas.size());
     for (PaginaFeita& feita : feitas) {
@@ -990,30 +1075,29 @@ void CCDiagramaTopografico::Desenha(const std::vector<Pagina>& paginas,
     paginasCriadas_ += int(paginas.size());
     // A terminal that starts a strip stands twice, its two entries side by side in the pass
     // (in one row, or ending one row and starting the next): it goes in once, at its later
-    // entry, where its point was left. Every other key stands once.
-    const QString* anterior = nullptr;
+    // entry, where its point was left. Every other item stands once.
+    const std::uint32_t* anterior = nullptr;
     size_t paginaAnterior = 0;
     for (size_t i = 0; i < paginas.size(); ++i) {
-        for (const Linha& linha : paginas[i])
-            for (const QString& chave : linha) {
-                if (anterior && *anterior != chave)
-                    Insere(*anterior, feitas[paginaAnterior], posicoes.value(*anterior));
-                anterior = &chave;
+        for (const LinhaLida& linha : paginas[i])
+            for (const std::uint32_t& lugar : linha) {
+                if (anterior && *anterior != lugar)
+                    Insere(lidos[*anterior], feitas[paginaAnterior]);
+                anterior = &lugar;
                 paginaAnterior = i;
             }
         if (progresso_) progresso_->Definir(progresso_->Percentual());
     }
-    if (anterior) Insere(*anterior, feitas[paginaAnterior], posicoes.value(*anterior));
+    if (anterior) Insere(lidos[*anterior], feitas[paginaAnterior]);
     LigaSimbolos();
 }
 
-void CCDiagramaTopografico::Insere(const QString& chave, PaginaFeita& pagina,
-                                   const CEPonto& ponto) {
-    const auto lido = itensPorHandle_.find(chave);
-    if (lido == itensPorHandle_.end()) return;
-    CEItemLista* item = lido->item;
-    const Candidato* candidato = lido->candidato;
+void CCDiagramaTopografico::Insere(Lido& lido, PaginaFeita& pagina) {
+    CEItemLista* item = lido.item;
+    const Candidato* candidato = lido.candidato;
     if (!item || !candidato) return;
+    const QString& chave = *lido.chave;
+    const CEPonto& ponto = lido.ponto;
     // Every attribute takes the item's field of its tag (blank when the item has none).
     const auto valores = [item](const QString& tag, const QString&) -> std::optional<QString> {
         const QString* valor = item->campo(tag);
@@ -1052,7 +1136,7 @@ void CCDiagramaTopografico::Insere(const QString& chave, PaginaFeita& pagina,
     if (!candidato->simbolo.isNull())
         ligacoes_.push_back({candidato->simbolo.handle(), candidato, prefixo, ref.handle()});
     // Each item goes in once: it gives its room to the blocks that follow, a batch at a time.
-    lido->item = nullptr;
+    lido.item = nullptr;
     itensInseridos_.itens.push_back(item);
     if (itensInseridos_.itens.size() >= kLoteInseridos) EntregaInseridos();
 }

@@ -127,11 +127,21 @@ private:
     // Candidates with their keys, in key order once gathered, each key once.
     using Entrada = std::pair<QString, Candidato>;
     using Candidatos = std::vector<Entrada>;
-    // An item read for the layout, with the candidate it was read for.
+    // An item read for the layout, with the candidate it was read for and its key; the
+    // extents and step of its block and its insertion point, as the layout finds them.
     struct Lido {
         CEItemLista* item = nullptr;
         const Candidato* candidato = nullptr;
+        const QString* chave = nullptr;
+        Extensao extensao;
+        double passo = 0.0;
+        CEPonto ponto;
     };
+    // A pass's items by the place each was read in (its sequence field); the layout works
+    // on those places.
+    using Lidos = std::vector<Lido>;
+    using LinhaLida = std::vector<std::uint32_t>;
+    using PaginaLida = std::vector<LinhaLida>;
 
     void ColetaCandidatos(Candidatos& candidatos);
     void AdicionaAcessorios(Candidatos& candidatos);
@@ -141,7 +151,8 @@ private:
     void DescartaDesenhados(Candidatos& candidatos);
     // The items of the candidates, in their order; those that give none or are not listed
     // fall out.
-    VetorItens LeItens(const std::vector<const Entrada*>& entradas, CETemplate& modelo);
+    VetorItens LeItens(const std::vector<const Entrada*>& entradas, CETemplate& modelo,
+                       Lidos& lidos);
     // An accessory's item: its own catalogue fields under its owner's relation, strip,
     // number and page; none when the owner or the accessory is not listed.
     CEItemLista* LeItemAcessorio(const QString& chave, const Candidato& candidato,
@@ -153,10 +164,15 @@ private:
     void PreparaLeitura(const Candidatos& candidatos);
     // Leaves a read item only the fields the run uses.
     void Retem(CEItemLista& item) const;
-    void LePassos(const VetorItens& bornes);
-    void LeExtensoes();
+    void LePassos(const VetorItens& bornes, Lidos& lidos) const;
+    static void LeExtensoes(Lidos& lidos, QHash<QString, Extensao>& porBloco);
+    // The pages of each pass, the insertion points left in the items read.
+    std::vector<PaginaLida> PaginasComuns(const VetorItens& itens, Lidos& lidos,
+                                          const Retangulo& retangulo) const;
+    std::vector<PaginaLida> PaginasBornes(const VetorItens& itens, Lidos& lidos,
+                                          const Retangulo& retangulo) const;
     // Makes the pages of one pass and inserts its blocks.
-    void Desenha(const std::vector<Pagina>& paginas, const QHash<QString, CEPonto>& posicoes);
+    void Desenha(const std::vector<PaginaLida>& paginas, Lidos& lidos);
     // A page of the pass: its layer, whose record is made (when missing) before its first
     // block goes in.
     struct PaginaFeita {
@@ -164,7 +180,7 @@ private:
         QByteArray layerU8;
         bool pronta = false;
     };
-    void Insere(const QString& chave, PaginaFeita& pagina, const CEPonto& ponto);
+    void Insere(Lido& lido, PaginaFeita& pagina);
     // A block that went in, to be named in its symbol's chain when the pass is over: a
     // symbol's chains are then read and written once, however many of its blocks the pass
     // drew.
@@ -198,9 +214,6 @@ private:
     Parametros parametros_;
     QString diretorio_;
     Candidatos candidatos_;
-    Extensoes extensoes_;
-    QHash<QString, double> passos_;
-    QHash<QString, Lido> itensPorHandle_;
     // Items whose blocks went in, freed a batch at a time on the module's freeing thread.
     struct Inseridos {
         std::vector<CEItemLista*> itens;
