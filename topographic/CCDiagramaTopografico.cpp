@@ -60,6 +60,21 @@ bool Listado(const CEItemLista& item) {
     return valor && *valor == QLatin1String("S");
 }
 
+// The symbol's handle in an accessory's key: what follows its last "_".
+QStringView SimboloDoAcessorio(const QString& chave) {
+    return QStringView(chave).mid(chave.lastIndexOf('_') + 1);
+}
+
+// Anonymous blocks and connector pins, by the block's name in upper case. A name that
+// starts with ASCII needs no upper-case copy to tell.
+bool NuncaDesenhado(const QString& bloco) {
+    const QLatin1String pino("PIN-");
+    if (bloco.startsWith('*')) return true;
+    for (int i = 0; i < std::min(bloco.size(), pino.size()); ++i)
+        if (bloco[i].unicode() >= 0x80) return bloco.toUpper().startsWith(pino);
+    return bloco.startsWith(pino, Qt::CaseInsensitive);
+}
+
 // The catalogue type of terminal blocks.
 const char* const kTipoBorne = "5";
 
@@ -527,7 +542,7 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     candidatos_ = std::move(candidatos);
     comAcessorios_.clear();
     for (const auto& [chave, candidato] : candidatos_)
-        if (chave.contains('_')) comAcessorios_.insert(chave.section('_', -1));
+        if (chave.contains('_')) comAcessorios_.insert(SimboloDoAcessorio(chave).toString());
 
     // Terminals apart when asked; a handle that is no object joins neither list.
     std::vector<const Entrada*> comuns, bornes;
@@ -676,9 +691,7 @@ void CCDiagramaTopografico::ColetaCandidatos(Candidatos& candidatos) {
     // block names and texts.
     for (CICad::ReferenciaComXData& ref : CICad::GetReferenciasComXData(
              kAppSimbolo, {kAppAditivo, kAppRepresentacaoEsq, kAppRepresentacaoAceEsq}, db)) {
-        // Anonymous blocks and connector pins are never drawn.
-        const QString bloco = ref.bloco.toUpper();
-        if (bloco.startsWith('*') || bloco.startsWith(QLatin1String("PIN-"))) continue;
+        if (NuncaDesenhado(ref.bloco)) continue;
         if (ref.codigo != 1000) continue;
         adiciona(
             ref.id, ref.texto,
@@ -824,8 +837,9 @@ void CCDiagramaTopografico::DescartaDesenhados(Candidatos& candidatos) {
 bool CCDiagramaTopografico::AcessorioDesenhado(const QString& chave, Candidato& candidato) const {
     // The symbol's chain names its accessories' blocks; each block says which place of the
     // symbol's list it shows and with which key (a changed catalogue draws the new one).
-    const QString lugar = chave.section('_', 0, 0);
-    const QString simbolo = chave.section('_', -1);
+    const int corte = chave.indexOf('_');
+    const QStringView lugar = corte < 0 ? QStringView(chave) : QStringView(chave).left(corte);
+    const QStringView simbolo = SimboloDoAcessorio(chave);
     const auto pares = Pares(candidato.dados ? candidato.dados->ligacoesAce : kSemDados);
     candidato.semLigacoes = pares.empty();
     for (const auto& [rep, handle] : pares) {
@@ -833,8 +847,8 @@ bool CCDiagramaTopografico::AcessorioDesenhado(const QString& chave, Candidato& 
         const OdDbObjectId bloco = CICad::IdDoHandle(handle);
         if (bloco.isNull()) continue;
         const CEListaXData link = CICad::GetXData(bloco, kAppRepresentacaoAce);
-        if (link.size() >= 4 && link[0].texto == rep && link[1].texto == simbolo &&
-            link[2].texto == lugar && link[3].texto == candidato.chave)
+        if (link.size() >= 4 && link[0].texto == rep && QStringView(link[1].texto) == simbolo &&
+            QStringView(link[2].texto) == lugar && link[3].texto == candidato.chave)
             return true;
     }
     return false;
@@ -881,7 +895,7 @@ VetorItens CCDiagramaTopografico::LeItens(const std::vector<const Entrada*>& ent
 CEItemLista* CCDiagramaTopografico::LeItemAcessorio(const QString& chave,
                                                     const Candidato& candidato,
                                                     CETemplate& modelo) {
-    const QString simbolo = chave.section('_', -1);
+    const QString simbolo = SimboloDoAcessorio(chave).toString();
     auto dono = donos_.constFind(simbolo);
     if (dono == donos_.constEnd()) {
         std::shared_ptr<CEItemLista> lido(CriaItemEntidade(candidato.simbolo, modelo));

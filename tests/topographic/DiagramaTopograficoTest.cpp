@@ -253,6 +253,9 @@ protected:
 QTemporaryDir* DiagramaTopograficoTest::pasta_ = nullptr;
 
 TEST_F(DiagramaTopograficoTest, ListedSymbolsWithAFrontViewFileAreDrawnEachOnce) {
+    // A pin is told by its block's name in any case; a terminal's key doesn't make it one.
+    Simbolo("pin-borne", "1001\f1", {{"REGUA", "X9"}, {"NUMERO", "1"}});
+    Simbolo("Pin-Borne", "1001\f1", {{"REGUA", "X9"}, {"NUMERO", "2"}});
     ASSERT_EQ(Executa(), zvsdk::CommandResult::Succeeded) << Saida().toStdString();
     const auto todas = Salvo();
     const auto blocos = PorSimbolo(todas);
