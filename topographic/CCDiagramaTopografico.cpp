@@ -135,16 +135,21 @@ void Filtra(Entradas& entradas, Fica fica) {
 // each entry, large beside its key, moves once.
 template <class Entradas>
 void OrdenaPorChave(Entradas& entradas) {
-    std::vector<std::size_t> ordem(entradas.size());
-    std::iota(ordem.begin(), ordem.end(), std::size_t(0));
-    std::stable_sort(ordem.begin(), ordem.end(), [&entradas](std::size_t a, std::size_t b) {
-        return entradas[a].first < entradas[b].first;
-    });
+    struct Lugar {
+        CCDiagramaTopografico::ChaveDeOrdem chave;
+        std::size_t indice;
+    };
+    std::vector<Lugar> ordem;
+    ordem.reserve(entradas.size());
+    for (std::size_t i = 0; i < entradas.size(); ++i)
+        ordem.push_back({CCDiagramaTopografico::ChaveDeOrdem(entradas[i].first), i});
+    std::stable_sort(ordem.begin(), ordem.end(),
+                     [](const Lugar& a, const Lugar& b) { return a.chave < b.chave; });
     Entradas ordenadas;
     ordenadas.reserve(entradas.size());
-    for (const std::size_t i : ordem)
-        if (ordenadas.empty() || ordenadas.back().first != entradas[i].first)
-            ordenadas.push_back(std::move(entradas[i]));
+    for (const Lugar& lugar : ordem)
+        if (ordenadas.empty() || ordenadas.back().first != entradas[lugar.indice].first)
+            ordenadas.push_back(std::move(entradas[lugar.indice]));
     entradas = std::move(ordenadas);
 }
 
@@ -223,6 +228,23 @@ std::vector<std::uint32_t> Lugares(const VetorItens& itens, std::size_t lidos) {
 }
 
 }  // namespace
+
+CCDiagramaTopografico::ChaveDeOrdem::ChaveDeOrdem(QStringView texto) : texto_(texto) {
+    for (qsizetype i = 0; i < 8; ++i) {
+        const char16_t c = i < texto.size() ? texto[i].unicode() : u'\0';
+        if (i < texto.size() && (c == 0 || c >= 0x80)) {
+            ascii_ = false;
+            break;
+        }
+        prefixo_ = prefixo_ << 8 | c;
+    }
+}
+
+bool operator<(const CCDiagramaTopografico::ChaveDeOrdem& a,
+               const CCDiagramaTopografico::ChaveDeOrdem& b) {
+    if (a.ascii_ && b.ascii_ && a.prefixo_ != b.prefixo_) return a.prefixo_ < b.prefixo_;
+    return a.texto_ < b.texto_;
+}
 
 // ---- extents and the rectangle
 
@@ -563,13 +585,14 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
         // the accessories of one symbol: only the accessories are sorted, by their symbol's
         // handle, and each group joins the symbols behind its own.
         struct Ordem {
-            QString simbolo;
+            ChaveDeOrdem simbolo;
             const Entrada* entrada;
         };
         std::vector<Ordem> simbolos, acessorios;
         for (const Entrada* entrada : entradas) {
             const int corte = entrada->first.lastIndexOf('_');
-            (corte < 0 ? simbolos : acessorios).push_back({entrada->first.mid(corte + 1), entrada});
+            (corte < 0 ? simbolos : acessorios)
+                .push_back({ChaveDeOrdem(QStringView(entrada->first).mid(corte + 1)), entrada});
         }
         const auto porHandle = [](const Ordem& a, const Ordem& b) { return a.simbolo < b.simbolo; };
         std::stable_sort(acessorios.begin(), acessorios.end(), porHandle);

@@ -61,6 +61,20 @@ public:
     using Pagina = std::vector<Linha>;
     using Extensoes = QHash<QString, Extensao>;
 
+    // A key to sort candidates by, in the order of QString's operator<. Its first eight
+    // characters are packed beside it when they are ASCII: most keys then part without their
+    // texts being read. It views the text, which must outlive it.
+    class ChaveDeOrdem {
+    public:
+        explicit ChaveDeOrdem(QStringView texto);
+        friend bool operator<(const ChaveDeOrdem& a, const ChaveDeOrdem& b);
+
+    private:
+        QStringView texto_;
+        std::uint64_t prefixo_ = 0;
+        bool ascii_ = true;
+    };
+
     // ---- the layout, on candidate keys
     // "x,y,z" or "x,y" (z 0), single precision; false, and zeros, for anything else.
     static bool LeCanto(const QString& texto, CEPonto& canto);
