@@ -615,6 +615,7 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     // Everything is read: what the reading kept goes before the drawing grows.
     LiberaLeituras();
     Descarte::Largar(donos_);
+    Descarte::Largar(doCatalogo_);
     Descarte::Largar(comAcessorios_);
     progresso.Definir(40);
     struct Destroi {
@@ -929,32 +930,55 @@ CEItemLista* CCDiagramaTopografico::LeItemAcessorio(const QString& chave,
     // The accessory of a symbol that is not on the lists is not in the panel either.
     if (!dono->item) return nullptr;
     const CEItemLista& origem = *dono->item;
+    const DoCatalogo& proprio = DoCatalogoDe(candidato);
+    if (!proprio.listado) return nullptr;
     auto item = std::make_unique<CEItemLista>();
     item->ids = origem.ids;
-    // It sits with its owner: the owner's tag, strip, number and page, in every language.
-    for (const std::uint32_t nome : NomesDoDono())
+    item->campos.reservar(NomesDoDono().size() + 1 + proprio.campos.size());
+    // It sits with its owner: the owner's tag, strip, number and page, in every language,
+    // and its quantity unless a column of its own says one.
+    static const std::vector<std::uint32_t> kNomesDoDono = [] {
+        std::vector<std::uint32_t> nomes = NomesDoDono();
+        std::sort(nomes.begin(), nomes.end());
+        return nomes;
+    }();
+    for (const std::uint32_t nome : kNomesDoDono)
         if (const QString* valor = origem.campos.procura(nome)) item->definirCampo(nome, *valor);
+    static const std::uint32_t kQtd = CamposItem::numero("QTD");
+    static const QString kUm("1");
+    const QString* qtd = origem.campos.procura(kQtd);
+    item->definirCampo(kQtd, qtd && !qtd->isEmpty() ? *qtd : kUm);
     // Everything else is the accessory's own.
+    item->campos.juntarOrdenados(proprio.campos);
+    return item.release();
+}
+
+const CCDiagramaTopografico::DoCatalogo& CCDiagramaTopografico::DoCatalogoDe(
+    const Candidato& candidato) {
+    const std::pair<QString, QString> chaveNorma{candidato.chave, candidato.norma};
+    auto achado = doCatalogo_.constFind(chaveNorma);
+    if (achado != doCatalogo_.constEnd()) return **achado;
     static const std::uint32_t kTipo = CamposItem::numero("ZV_LISTA_TIPO"),
                                kLista = CamposItem::numero("ZV_LISTA"),
                                kChave = CamposItem::numero("ZV_KEY"),
                                kDescricao = CamposItem::numero("DESCRICAO"),
-                               kTpDescri = CamposItem::numero("TP_DESCRI"),
-                               kQtd = CamposItem::numero("QTD");
-    static const QString kAce("ACE"), kUm("1");
-    item->definirCampo(kTipo, kAce);
-    item->definirCampo(kLista, Catalogo().ListaComp(candidato.chave, candidato.norma));
-    item->definirCampo(kChave, candidato.chave);
+                               kTpDescri = CamposItem::numero("TP_DESCRI");
+    static const QString kAce("ACE");
+    CEItemLista proprio;
+    proprio.definirCampo(kTipo, kAce);
+    proprio.definirCampo(kLista, Catalogo().ListaComp(candidato.chave, candidato.norma));
+    proprio.definirCampo(kChave, candidato.chave);
     const QString descricao = Catalogo().DescricaoComp(candidato.chave);
-    item->definirCampo(kDescricao, descricao);
-    item->definirCampo(kTpDescri, descricao);
-    const QString* qtd = origem.campos.procura(kQtd);
-    item->definirCampo(kQtd, qtd && !qtd->isEmpty() ? *qtd : kUm);
-    LeColunasUsuario(QString(), *item, Catalogo().ColunasComp(candidato.chave));
-    const QString* listado = item->campos.procura(kLista);
-    if (!listado || *listado != QLatin1String("S")) return nullptr;
-    Retem(*item);
-    return item.release();
+    proprio.definirCampo(kDescricao, descricao);
+    proprio.definirCampo(kTpDescri, descricao);
+    // The columns come last and may say any of these again.
+    LeColunasUsuario(QString(), proprio, Catalogo().ColunasComp(candidato.chave));
+    auto feito = std::make_shared<DoCatalogo>();
+    const QString* listado = proprio.campos.procura(kLista);
+    feito->listado = listado && *listado == QLatin1String("S");
+    Retem(proprio);
+    feito->campos = proprio.campos.todos();
+    return **doCatalogo_.insert(chaveNorma, std::move(feito));
 }
 
 // ---- what is read of items

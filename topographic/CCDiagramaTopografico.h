@@ -171,6 +171,13 @@ private:
     // number and page; none when the owner or the accessory is not listed.
     CEItemLista* LeItemAcessorio(const QString& chave, const Candidato& candidato,
                                  CETemplate& modelo);
+    // What an accessory takes of the catalogue for its key and standard, worked out once per
+    // key: whether it is listed, and its own fields that the run uses, user columns included.
+    struct DoCatalogo {
+        bool listado = false;
+        std::vector<CamposItem::Campo> campos;
+    };
+    const DoCatalogo& DoCatalogoDe(const Candidato& candidato);
     // Is an accessory's block of this representation, for this place in the symbol's list,
     // still in the drawing?
     bool AcessorioDesenhado(const QString& chave, Candidato& candidato) const;
@@ -246,6 +253,7 @@ private:
         std::shared_ptr<CEItemLista> lido;
     };
     QHash<QString, Dono> donos_;
+    QHash<std::pair<QString, QString>, std::shared_ptr<const DoCatalogo>> doCatalogo_;
     // The symbols that have accessories among the candidates.
     QSet<QString> comAcessorios_;
     // By name number, the fields kept of items read; empty: all of them.

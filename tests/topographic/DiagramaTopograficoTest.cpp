@@ -552,6 +552,9 @@ TEST_F(AcessoriosTopograficos, EachAccessoryBlockAndItsSymbolNameEachOther) {
     // Its attributes: the accessory's own key under its symbol's tag.
     EXPECT_EQ(auxiliar.atributos["RELACAO"].toString(), "-K1");
     EXPECT_EQ(auxiliar.atributos["ZV_KEY"].toString(), "2101");
+    // The same key on another symbol: its own symbol's tag, the key's own fields alike.
+    EXPECT_EQ(acessorios.at("*0_" + k2).atributos["RELACAO"].toString(), "-K2");
+    EXPECT_EQ(acessorios.at("*0_" + k2).atributos["ZV_KEY"].toString(), "2101");
     EXPECT_EQ(acessorios.at("#0_" + k1).atributos["ZV_KEY"].toString(), "3006");
     // The symbol: its own block in its chain, its accessories' blocks in the other.
     EXPECT_EQ(esq_[k1], QStringList({"1", blocos.at(k1).handle}));
