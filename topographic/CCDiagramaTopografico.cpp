@@ -211,22 +211,6 @@ int Quantidade(const std::vector<CCDiagramaTopografico::Pagina>& paginas) {
     return int(n);
 }
 
-// Where each item was read in its pass, as its sequence field says, in the items' order;
-// an item with no place among the `lidos` read falls out.
-std::vector<std::uint32_t> Lugares(const VetorItens& itens, std::size_t lidos) {
-    static const std::uint32_t kSequencia =
-        CamposItem::numero(QString::fromLatin1(kCampoSequencia));
-    std::vector<std::uint32_t> lugares;
-    lugares.reserve(itens.size());
-    for (const CEItemLista* item : itens) {
-        bool ok = false;
-        const QString* valor = item->campos.procura(kSequencia);
-        const std::uint32_t lugar = valor ? valor->toUInt(&ok) : 0;
-        if (ok && lugar < lidos) lugares.push_back(lugar);
-    }
-    return lugares;
-}
-
 }  // namespace
 
 CCDiagramaTopografico::ChaveDeOrdem::ChaveDeOrdem(QStringView texto) : texto_(texto) {
@@ -567,13 +551,18 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
         if (chave.contains('_')) comAcessorios_.insert(SimboloDoAcessorio(chave).toString());
 
     // Terminals apart when asked; a handle that is no object joins neither list.
+    // The catalogue is asked once per key.
     std::vector<const Entrada*> comuns, bornes;
+    QHash<QString, bool> ehBorne;
     for (const Entrada& entrada : candidatos_) {
         const Candidato& candidato = entrada.second;
         if (p.borne) {
             if (candidato.simbolo.isNull()) continue;
-            (Catalogo().TipoComp(candidato.chave).trimmed() == kTipoBorne ? bornes : comuns)
-                .push_back(&entrada);
+            auto tipo = ehBorne.constFind(candidato.chave);
+            if (tipo == ehBorne.constEnd())
+                tipo = ehBorne.insert(candidato.chave,
+                                      Catalogo().TipoComp(candidato.chave).trimmed() == kTipoBorne);
+            (*tipo ? bornes : comuns).push_back(&entrada);
         } else {
             comuns.push_back(&entrada);
         }
@@ -905,11 +894,10 @@ VetorItens CCDiagramaTopografico::LeItens(const std::vector<const Entrada*>& ent
             if (comAcessorios_.contains(chave)) donos_.insert(chave, {item.get(), nullptr});
         }
         if (!item) continue;
-        static const std::uint32_t kNumeroHandle = CamposItem::numero(kHandle),
-                                   kNumeroSequencia =
-                                       CamposItem::numero(QString::fromLatin1(kCampoSequencia));
-        item->definirCampo(kNumeroHandle, chave);
-        item->definirCampo(kNumeroSequencia, QString::number(itens.size()));
+        if (escreveChave_) item->definirCampo(CamposItem::numero(kHandle), chave);
+        if (escreveLugar_)
+            item->definirCampo(CamposItem::numero(QString::fromLatin1(kCampoSequencia)),
+                               QString::number(itens.size()));
         lidos.push_back({item.get(), &candidato, &chave, {}, 0.0, {}});
         itens.push_back(item.release());
     }
@@ -995,9 +983,8 @@ std::optional<std::vector<std::uint32_t>> CCDiagramaTopografico::CamposUsados(
     const auto poe = [&campos](const QString& nome) {
         if (!nome.isEmpty()) campos.push_back(CamposItem::numero(nome));
     };
-    for (const char* nome : {"HANDLE", "ZV_LISTA", "QTD", "REGUA", "STRIP", "REGLETA"})
+    for (const char* nome : {"ZV_LISTA", "QTD", "REGUA", "STRIP", "REGLETA"})
         poe(QString::fromLatin1(nome));
-    poe(QString::fromLatin1(kCampoSequencia));
     poe(parametros.borneDist);
     for (const QString& nome : parametros.ordenacao)
         poe(nome);
@@ -1028,12 +1015,20 @@ void CCDiagramaTopografico::PreparaLeitura(const Candidatos& candidatos) {
             blocos.emplace_back(candidato.arquivo, candidato.nome);
         }
     const auto campos = CamposUsados(parametros_, blocos);
+    escreveChave_ = escreveLugar_ = true;
     if (!campos) return;
     camposUsados_.assign(campos->empty() ? 0 : campos->back() + 1, 0);
     for (const std::uint32_t campo : *campos)
         camposUsados_[campo] = 1;
     // The symbols' readings write only these: nothing to trim afterwards.
     if (!camposUsados_.empty()) CamposLidos = &camposUsados_;
+    // An item's key and its place as read go in for a block or a sort that shows them.
+    const auto usado = [this](const QString& nome) {
+        const std::uint32_t numero = CamposItem::numero(nome);
+        return camposUsados_.empty() || (numero < camposUsados_.size() && camposUsados_[numero]);
+    };
+    escreveChave_ = usado(kHandle);
+    escreveLugar_ = usado(QString::fromLatin1(kCampoSequencia));
 }
 
 void CCDiagramaTopografico::Retem(CEItemLista& item) const {
@@ -1089,13 +1084,33 @@ void CCDiagramaTopografico::LeExtensoes(Lidos& lidos, QHash<QString, Extensao>& 
 
 // ---- the passes' layout
 
+std::vector<std::uint32_t> CCDiagramaTopografico::Lugares(const VetorItens& itens,
+                                                          const Lidos& lidos) {
+    // By the items' addresses, found without reading the items.
+    using Endereco = std::pair<std::uintptr_t, std::uint32_t>;
+    std::vector<Endereco> porEndereco;
+    porEndereco.reserve(lidos.size());
+    for (std::size_t i = 0; i < lidos.size(); ++i)
+        porEndereco.emplace_back(reinterpret_cast<std::uintptr_t>(lidos[i].item), std::uint32_t(i));
+    std::sort(porEndereco.begin(), porEndereco.end());
+    std::vector<std::uint32_t> lugares;
+    lugares.reserve(itens.size());
+    for (const CEItemLista* item : itens) {
+        const Endereco procurado{reinterpret_cast<std::uintptr_t>(item), 0};
+        const auto achado = std::lower_bound(porEndereco.begin(), porEndereco.end(), procurado);
+        if (achado != porEndereco.end() && achado->first == procurado.first)
+            lugares.push_back(achado->second);
+    }
+    return lugares;
+}
+
 std::vector<CCDiagramaTopografico::PaginaLida> CCDiagramaTopografico::PaginasComuns(
     const VetorItens& itens, Lidos& lidos, const Retangulo& retangulo) const {
     const Parametros& p = parametros_;
     const auto extensao = [&lidos](std::uint32_t lugar) { return lidos[lugar].extensao; };
-    auto paginas = PaginasDe(LinhasDeBlocos(Lugares(itens, lidos.size()), extensao,
-                                            retangulo.largura, p.margem, p.colunas),
-                             extensao, retangulo.altura, p.margem, p.linhas);
+    auto paginas = PaginasDe(
+        LinhasDeBlocos(Lugares(itens, lidos), extensao, retangulo.largura, p.margem, p.colunas),
+        extensao, retangulo.altura, p.margem, p.linhas);
     PosicoesDeBlocos(
         paginas, extensao, retangulo, p.margem,
         [&lidos](std::uint32_t lugar, const CEPonto& ponto) { lidos[lugar].ponto = ponto; });
@@ -1111,7 +1126,7 @@ std::vector<CCDiagramaTopografico::PaginaLida> CCDiagramaTopografico::PaginasBor
     };
     std::vector<BorneLido> bornes;
     bornes.reserve(itens.size());
-    for (const std::uint32_t lugar : Lugares(itens, lidos.size()))
+    for (const std::uint32_t lugar : Lugares(itens, lidos))
         bornes.push_back({lugar, lidos[lugar].passo, ReguaDe(*lidos[lugar].item)});
     const Parametros& p = parametros_;
     const auto extensao = [&lidos](std::uint32_t lugar) { return lidos[lugar].extensao; };

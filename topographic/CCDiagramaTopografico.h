@@ -188,6 +188,8 @@ private:
     void LePassos(const VetorItens& bornes, Lidos& lidos) const;
     static void LeExtensoes(Lidos& lidos, QHash<QString, Extensao>& porBloco);
     // The pages of each pass, the insertion points left in the items read.
+    // Where each of the items was read in its pass, in the items' order.
+    static std::vector<std::uint32_t> Lugares(const VetorItens& itens, const Lidos& lidos);
     std::vector<PaginaLida> PaginasComuns(const VetorItens& itens, Lidos& lidos,
                                           const Retangulo& retangulo) const;
     std::vector<PaginaLida> PaginasBornes(const VetorItens& itens, Lidos& lidos,
@@ -258,6 +260,9 @@ private:
     QSet<QString> comAcessorios_;
     // By name number, the fields kept of items read; empty: all of them.
     std::vector<char> camposUsados_;
+    // Whether items read take their candidate's key (HANDLE) and their place as read: only
+    // when a block's attribute or the sort may show them.
+    bool escreveChave_ = true, escreveLugar_ = true;
     // The representation key as the links write it, and the blocks' definitions by name,
     // found at their first insertion.
     QByteArray representacaoU8_;

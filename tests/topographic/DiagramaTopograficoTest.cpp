@@ -456,6 +456,38 @@ TEST_F(DiagramaTopograficoTest, ARectangleSmallerThanEveryBlockGivesEachItsRowAn
     EXPECT_EQ(blocos.at(H(k1_)).y, 1.0 - 40.0);
 }
 
+// ---- a contactor's view that shows the key its item is drawn for and its place as read
+
+class VistaComChave : public DiagramaTopograficoTest {
+protected:
+    static void SetUpTestSuite() {
+        DiagramaTopograficoTest::SetUpTestSuite();
+        Vista("TOPO_CT09_10_24DC", 20, 40,
+              {{"RELACAO", "?"}, {"HANDLE", ""}, {"ZV_TOPO_SEQUENCIA", ""}});
+        Vista("TOPO_BA11", 10, 40, {{"HANDLE", ""}});  // 2101, with each contactor
+    }
+};
+
+TEST_F(VistaComChave, AViewThatAsksForTheKeyOrThePlaceAsReadGetsThem) {
+    ASSERT_EQ(Executa(), zvsdk::CommandResult::Succeeded) << Saida().toStdString();
+    const auto blocos = PorSimbolo(Salvo());
+    const QString k1 = H(k1_), k2 = H(k2_);
+    EXPECT_EQ(blocos.at(k1).atributos["HANDLE"].toString(), k1);
+    EXPECT_EQ(blocos.at(k2).atributos["HANDLE"].toString(), k2);
+    // An accessory's item is its candidate's: its place and its symbol.
+    QStringList acessorios;
+    for (const Insercao& i : Salvo())
+        if (i.ace.size() == 4) acessorios << i.atributos["HANDLE"].toString();
+    acessorios.sort();
+    EXPECT_EQ(acessorios, QStringList({"*0_" + k1, "*0_" + k2}));
+    // The contactors are read in their keys' order, each followed by its accessory.
+    bool ok1 = false, ok2 = false;
+    const int lugar1 = blocos.at(k1).atributos["ZV_TOPO_SEQUENCIA"].toString().toInt(&ok1);
+    const int lugar2 = blocos.at(k2).atributos["ZV_TOPO_SEQUENCIA"].toString().toInt(&ok2);
+    ASSERT_TRUE(ok1 && ok2);
+    EXPECT_EQ(lugar2, lugar1 + 2);
+}
+
 // ---- accessories: the catalogue's (2101 goes with 2001) and those a symbol adds
 
 class AcessoriosTopograficos : public DiagramaTopograficoTest {
