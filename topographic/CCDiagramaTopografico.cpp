@@ -907,6 +907,9 @@ VetorItens CCDiagramaTopografico::LeItens(const std::vector<const Entrada*>& ent
 CEItemLista* CCDiagramaTopografico::LeItemAcessorio(const QString& chave,
                                                     const Candidato& candidato,
                                                     CETemplate& modelo) {
+    // An accessory the lists leave out needs no reading of its owner.
+    const DoCatalogo& proprio = DoCatalogoDe(candidato);
+    if (!proprio.listado) return nullptr;
     const QString simbolo = SimboloDoAcessorio(chave).toString();
     auto dono = donos_.constFind(simbolo);
     if (dono == donos_.constEnd()) {
@@ -918,8 +921,6 @@ CEItemLista* CCDiagramaTopografico::LeItemAcessorio(const QString& chave,
     // The accessory of a symbol that is not on the lists is not in the panel either.
     if (!dono->item) return nullptr;
     const CEItemLista& origem = *dono->item;
-    const DoCatalogo& proprio = DoCatalogoDe(candidato);
-    if (!proprio.listado) return nullptr;
     auto item = std::make_unique<CEItemLista>();
     item->ids = origem.ids;
     item->campos.reservar(NomesDoDono().size() + 1 + proprio.campos.size());
