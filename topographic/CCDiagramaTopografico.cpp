@@ -106,8 +106,12 @@ QString CriaPagina(const QString& grupo) {
 
 // The strip of a terminal, in the first language that names one.
 QString ReguaDe(const CEItemLista& item) {
-    for (const char* campo : {"REGUA", "STRIP", "REGLETA"})
-        if (const QString* valor = item.campo(campo); valor && !valor->isEmpty()) return *valor;
+    static const std::uint32_t kNomes[] = {CamposItem::numero(QStringLiteral("REGUA")),
+                                           CamposItem::numero(QStringLiteral("STRIP")),
+                                           CamposItem::numero(QStringLiteral("REGLETA"))};
+    for (const std::uint32_t campo : kNomes)
+        if (const QString* valor = item.campos.procura(campo); valor && !valor->isEmpty())
+            return *valor;
     return QString();
 }
 
@@ -522,6 +526,7 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
             d.camposUsados_.clear();
             d.CamposLidos = nullptr;
             d.definicoes_.clear();
+            d.passosPorBloco_.clear();
             d.comAcessorioLigado_.clear();
         }
     } fim{*this};
@@ -599,8 +604,9 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     // neighbour: its reading need not be kept.
     GuardaSimbolos = false;
     Lidos lidosComuns, lidosBornes;
-    VetorItens itensComuns = LeItens(comuns, modelo, lidosComuns);
-    VetorItens itensBornes = LeItens(bornes, modelo, lidosBornes);
+    VetorItens itensComuns = LeItens(comuns, modelo, lidosComuns, false);
+    VetorItens itensBornes = LeItens(bornes, modelo, lidosBornes, true);
+    Descarte::Largar(passosPorBloco_);
     // Everything is read: what the reading kept goes before the drawing grows.
     LiberaLeituras();
     Descarte::Largar(donos_);
@@ -626,7 +632,6 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
         progresso.Fechar();
         return;
     }
-    LePassos(itensBornes, lidosBornes);
     // Items that sort alike keep the order above.
     itensComuns.ordenarEstavel(p.ordenacao);
     itensBornes.ordenarEstavel(p.ordenacao);
@@ -868,7 +873,13 @@ bool CCDiagramaTopografico::AcessorioDesenhado(const QString& chave, Candidato& 
 }
 
 VetorItens CCDiagramaTopografico::LeItens(const std::vector<const Entrada*>& entradas,
-                                          CETemplate& modelo, Lidos& lidos) {
+                                          CETemplate& modelo, Lidos& lidos, bool bornes) {
+    // A terminal takes its step, under the name PBLTOPO_BORNEDIST gives, as it is read.
+    const QString& tag = parametros_.borneDist;
+    const bool comPasso = bornes && !tag.isEmpty();
+    const std::uint32_t nomePasso = comPasso ? CamposItem::numero(tag) : 0;
+    const std::size_t novos =
+        std::size_t(escreveChave_) + std::size_t(escreveLugar_) + std::size_t(comPasso);
     VetorItens itens;
     lidos.reserve(entradas.size());
     for (const Entrada* entrada : entradas) {
@@ -894,11 +905,18 @@ VetorItens CCDiagramaTopografico::LeItens(const std::vector<const Entrada*>& ent
             if (comAcessorios_.contains(chave)) donos_.insert(chave, {item.get(), nullptr});
         }
         if (!item) continue;
+        if (novos) item->campos.reservar(std::size_t(item->campos.size()) + novos);
         if (escreveChave_) item->definirCampo(CamposItem::numero(kHandle), chave);
         if (escreveLugar_)
             item->definirCampo(CamposItem::numero(QString::fromLatin1(kCampoSequencia)),
                                QString::number(itens.size()));
-        lidos.push_back({item.get(), &candidato, &chave, {}, 0.0, {}});
+        double passo = 0.0;
+        if (bornes) {
+            const auto& [texto, valor] = PassoDe(candidato);
+            if (comPasso) item->definirCampo(nomePasso, texto);
+            passo = valor;
+        }
+        lidos.push_back({item.get(), &candidato, &chave, {}, passo, {}});
         itens.push_back(item.release());
     }
     return itens;
@@ -1039,30 +1057,23 @@ void CCDiagramaTopografico::Retem(CEItemLista& item) const {
         [&usados](std::uint32_t nome) { return nome < usados.size() && usados[nome]; });
 }
 
-void CCDiagramaTopografico::LePassos(const VetorItens& bornes, Lidos& lidos) const {
+const std::pair<QString, double>& CCDiagramaTopografico::PassoDe(const Candidato& candidato) {
     // The step is the default text of the block's attribute named by PBLTOPO_BORNEDIST.
-    // The items are still in the order they were read.
-    QHash<QString, QString> porBloco;
-    const QString& tag = parametros_.borneDist;
-    for (size_t lugar = 0; lugar < bornes.size() && lugar < lidos.size(); ++lugar) {
-        CEItemLista* item = bornes[lugar];
-        const Candidato* candidato = lidos[lugar].candidato;
-        if (!candidato) continue;
-        const QString& nome = candidato->nome;
-        auto achado = porBloco.constFind(nome);
-        if (achado == porBloco.constEnd()) {
-            QString passo;
-            const auto definicoes = CICad::GetDefinicoesAtributos(candidato->arquivo, nome);
-            for (int i = 0; definicoes && !tag.isEmpty() && i < definicoes->Quantidade(); ++i)
-                if ((*definicoes)[i].GetTag() == tag) {
-                    passo = (*definicoes)[i].GetValor();
-                    break;
-                }
-            achado = porBloco.insert(nome, passo.isEmpty() ? QString(kPassoPadrao) : passo);
-        }
-        if (!tag.isEmpty()) item->definirCampo(tag, achado.value());
-        lidos[lugar].passo = CETemplateLisp::TextoParaReal(achado.value());
+    const QString& nome = candidato.nome;
+    auto achado = passosPorBloco_.constFind(nome);
+    if (achado == passosPorBloco_.constEnd()) {
+        const QString& tag = parametros_.borneDist;
+        QString passo;
+        const auto definicoes = CICad::GetDefinicoesAtributos(candidato.arquivo, nome);
+        for (int i = 0; definicoes && !tag.isEmpty() && i < definicoes->Quantidade(); ++i)
+            if ((*definicoes)[i].GetTag() == tag) {
+                passo = (*definicoes)[i].GetValor();
+                break;
+            }
+        if (passo.isEmpty()) passo = QString(kPassoPadrao);
+        achado = passosPorBloco_.insert(nome, {passo, CETemplateLisp::TextoParaReal(passo)});
     }
+    return *achado;
 }
 
 void CCDiagramaTopografico::LeExtensoes(Lidos& lidos, QHash<QString, Extensao>& porBloco) {

@@ -164,9 +164,9 @@ private:
     void RenovaBlocos(Candidatos& candidatos);
     void DescartaDesenhados(Candidatos& candidatos);
     // The items of the candidates, in their order; those that give none or are not listed
-    // fall out.
+    // fall out. Terminals (`bornes`) also take their steps.
     VetorItens LeItens(const std::vector<const Entrada*>& entradas, CETemplate& modelo,
-                       Lidos& lidos);
+                       Lidos& lidos, bool bornes);
     // An accessory's item: its own catalogue fields under its owner's relation, strip,
     // number and page; none when the owner or the accessory is not listed.
     CEItemLista* LeItemAcessorio(const QString& chave, const Candidato& candidato,
@@ -185,7 +185,9 @@ private:
     void PreparaLeitura(const Candidatos& candidatos);
     // Leaves a read item only the fields the run uses.
     void Retem(CEItemLista& item) const;
-    void LePassos(const VetorItens& bornes, Lidos& lidos) const;
+    // A terminal block's step, as text and as a number, found once per block.
+    const std::pair<QString, double>& PassoDe(const Candidato& candidato);
+    QHash<QString, std::pair<QString, double>> passosPorBloco_;
     static void LeExtensoes(Lidos& lidos, QHash<QString, Extensao>& porBloco);
     // The pages of each pass, the insertion points left in the items read.
     // Where each of the items was read in its pass, in the items' order.
