@@ -527,6 +527,8 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
             d.CamposLidos = nullptr;
             d.definicoes_.clear();
             d.passosPorBloco_.clear();
+            d.textos_ = {};
+            d.digitos_ = {};
             d.comAcessorioLigado_.clear();
         }
     } fim{*this};
@@ -1209,14 +1211,15 @@ void CCDiagramaTopografico::Insere(Lido& lido, PaginaFeita& pagina) {
     const int corte = chave.indexOf('_');
     const bool acessorio = corte >= 0;
     const QStringView prefixo = acessorio ? QStringView(chave).left(corte) : QStringView();
-    std::array<char, 24> handleA, prefixoA;
+    std::array<char, 24> handleA, prefixoA, chaveA;
     QByteArray handleU8, prefixoU8, chaveU8;
-    std::vector<std::string_view> link{Vista(representacaoU8_),
-                                       Ascii(QStringView(chave).mid(corte + 1), handleA, handleU8)};
+    std::vector<std::string_view>& link = textos_;
+    link.clear();
+    link.push_back(Vista(representacaoU8_));
+    link.push_back(Ascii(QStringView(chave).mid(corte + 1), handleA, handleU8));
     if (acessorio) {
-        chaveU8 = candidato->chave.toUtf8();
         link.push_back(Ascii(prefixo, prefixoA, prefixoU8));
-        link.push_back(Vista(chaveU8));
+        link.push_back(Ascii(candidato->chave, chaveA, chaveU8));
     }
     CICad::SetXDataTextos(ref, acessorio ? kAppRepresentacaoAce : kAppRepresentacao, link);
     // The symbol names the block when the pass is over (the key outlives the pass); a block
@@ -1314,10 +1317,11 @@ void CCDiagramaTopografico::LeCadeia(const OdDbObjectId& simbolo, bool acessorio
 }
 
 void CCDiagramaTopografico::GravaCadeia(const OdDbObjectId& simbolo, bool acessorio,
-                                        const Cadeia& cadeia) const {
-    std::vector<std::array<char, 16>> digitos(cadeia.pares.size());
-    std::vector<std::string_view> textos;
-    textos.reserve(2 * cadeia.pares.size());
+                                        const Cadeia& cadeia) {
+    std::vector<std::array<char, 16>>& digitos = digitos_;
+    digitos.resize(cadeia.pares.size());
+    std::vector<std::string_view>& textos = textos_;
+    textos.clear();
     for (size_t i = 0; i < cadeia.pares.size(); ++i) {
         const Par& par = cadeia.pares[i];
         textos.push_back(par.bloco ? Vista(representacaoU8_) : Vista(par.rep));

@@ -14,6 +14,7 @@
 #include <QStringList>
 #include <QStringView>
 
+#include <array>
 #include <cstdint>
 #include <map>
 #include <memory>
@@ -234,7 +235,10 @@ private:
                      Cadeia& acessorios);
     // The chain as the symbol has it now, less the pairs no link keeps (gone blocks).
     void LeCadeia(const OdDbObjectId& simbolo, bool acessorio, Cadeia& cadeia) const;
-    void GravaCadeia(const OdDbObjectId& simbolo, bool acessorio, const Cadeia& cadeia) const;
+    void GravaCadeia(const OdDbObjectId& simbolo, bool acessorio, const Cadeia& cadeia);
+    // The texts of the link being written and a chain's handles, room kept from link to link.
+    std::vector<std::string_view> textos_;
+    std::vector<std::array<char, 16>> digitos_;
 
     Parametros parametros_;
     QString diretorio_;
