@@ -731,21 +731,21 @@ void CCDiagramaTopografico::ColetaCandidatos(Candidatos& candidatos) {
 
 void CCDiagramaTopografico::AdicionaAcessorios(Candidatos& candidatos) {
     std::vector<std::pair<QString, Candidato>> novos;
-    // A catalogue key's accessories are cut out once, and their keys shared by the symbols
-    // of that key: a project has few keys and many symbols.
-    QHash<QString, std::vector<std::pair<int, QString>>> porChave;
+    // A catalogue key's accessories are cut out once, with their places' marks ("*0_"), and
+    // shared by the symbols of that key: a project has few keys and many symbols.
+    QHash<QString, std::vector<std::pair<QString, QString>>> porChave;
     for (const auto& [chave, simbolo] : candidatos) {
         auto doCatalogo = porChave.constFind(simbolo.chave);
         if (doCatalogo == porChave.constEnd()) {
-            std::vector<std::pair<int, QString>> cortados;
+            std::vector<std::pair<QString, QString>> cortados;
             const QStringList acessorios = Catalogo().AcessoriosDe(simbolo.chave);
             for (int i = 0; i < acessorios.size(); ++i)
                 if (QString acessorio = acessorios[i].section('#', 0, 0); !acessorio.isEmpty())
-                    cortados.emplace_back(i, std::move(acessorio));
+                    cortados.emplace_back("*" + QString::number(i) + "_", std::move(acessorio));
             doCatalogo = porChave.insert(simbolo.chave, std::move(cortados));
         }
-        for (const auto& [i, acessorio] : *doCatalogo)
-            novos.push_back({"*" + QString::number(i) + "_" + chave,
+        for (const auto& [lugar, acessorio] : *doCatalogo)
+            novos.push_back({lugar + chave,
                              {acessorio, simbolo.norma, QString(), simbolo.simbolo, QString(),
                               QString(), false, simbolo.dados}});
         const CEListaXData& aditivos = simbolo.dados ? simbolo.dados->aditivos : kSemDados;
