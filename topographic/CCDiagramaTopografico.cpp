@@ -22,7 +22,6 @@
 #include <cstdint>
 #include <iterator>
 #include <memory>
-#include <numeric>
 
 namespace {
 
