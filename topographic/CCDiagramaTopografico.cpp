@@ -1245,17 +1245,23 @@ void CCDiagramaTopografico::LigaSimbolos() {
     std::stable_sort(ligacoes_.begin(), ligacoes_.end(),
                      [](const Ligacao& a, const Ligacao& b) { return a.simbolo < b.simbolo; });
     Cadeia propria, acessorios;
+    // Each symbol comes once a pass: those of earlier passes are looked up, this pass's join
+    // them, in order, when it is over.
+    const std::size_t antes = comAcessorioLigado_.size();
     for (size_t i = 0, fim = 0; i < ligacoes_.size(); i = fim) {
         fim = i + 1;
         while (fim < ligacoes_.size() && ligacoes_[fim].simbolo == ligacoes_[i].simbolo)
             ++fim;
-        LigaSimbolo(ligacoes_.data() + i, ligacoes_.data() + fim, propria, acessorios);
+        LigaSimbolo(ligacoes_.data() + i, ligacoes_.data() + fim, propria, acessorios, antes);
     }
+    std::inplace_merge(comAcessorioLigado_.begin(),
+                       comAcessorioLigado_.begin() + std::ptrdiff_t(antes),
+                       comAcessorioLigado_.end());
     ligacoes_.clear();
 }
 
 void CCDiagramaTopografico::LigaSimbolo(const Ligacao* inicio, const Ligacao* fim, Cadeia& propria,
-                                        Cadeia& acessorios) {
+                                        Cadeia& acessorios, std::size_t ligadosAntes) {
     const OdDbObjectId& simbolo = inicio->candidato->simbolo;
     for (Cadeia* cadeia : {&propria, &acessorios}) {
         cadeia->pares.clear();
@@ -1270,8 +1276,12 @@ void CCDiagramaTopografico::LigaSimbolo(const Ligacao* inicio, const Ligacao* fi
             // A symbol's own block is linked once a run; its accessories' blocks share one
             // chain, empty at the start when the run found it so and no pass linked it yet.
             bool semLigacoes = ligacao->candidato->semLigacoes;
-            if (acessorio && semLigacoes)
-                semLigacoes = comAcessorioLigado_.insert(ligacao->simbolo).second;
+            if (acessorio && semLigacoes) {
+                const auto fimAntes = comAcessorioLigado_.begin() + std::ptrdiff_t(ligadosAntes);
+                semLigacoes =
+                    !std::binary_search(comAcessorioLigado_.begin(), fimAntes, ligacao->simbolo);
+                if (semLigacoes) comAcessorioLigado_.push_back(ligacao->simbolo);
+            }
             if (!semLigacoes) LeCadeia(simbolo, acessorio, cadeia);
             cadeia.lida = true;
             *(ordem[0] ? &ordem[1] : &ordem[0]) = &cadeia;

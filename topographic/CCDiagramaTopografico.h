@@ -20,7 +20,6 @@
 #include <memory>
 #include <optional>
 #include <string_view>
-#include <unordered_set>
 #include <vector>
 
 class CETemplate;
@@ -230,9 +229,10 @@ private:
         bool lida = false;
     };
     void LigaSimbolos();
-    // One symbol's links, in the order its blocks went in.
-    void LigaSimbolo(const Ligacao* inicio, const Ligacao* fim, Cadeia& propria,
-                     Cadeia& acessorios);
+    // One symbol's links, in the order its blocks went in; `ligadosAntes`: how many symbols
+    // earlier passes gave accessories' links (the first of comAcessorioLigado_, in order).
+    void LigaSimbolo(const Ligacao* inicio, const Ligacao* fim, Cadeia& propria, Cadeia& acessorios,
+                     std::size_t ligadosAntes);
     // The chain as the symbol has it now, less the pairs no link keeps (gone blocks).
     void LeCadeia(const OdDbObjectId& simbolo, bool acessorio, Cadeia& cadeia) const;
     void GravaCadeia(const OdDbObjectId& simbolo, bool acessorio, const Cadeia& cadeia);
@@ -273,8 +273,9 @@ private:
     // found at their first insertion.
     QByteArray representacaoU8_;
     QHash<QString, OdDbObjectId> definicoes_;
-    // The symbols given an accessory's link in this run: their chains are no longer empty.
-    std::unordered_set<std::uint64_t> comAcessorioLigado_;
+    // The symbols given an accessory's link in this run, by handle in order: their chains
+    // are no longer empty.
+    std::vector<std::uint64_t> comAcessorioLigado_;
     // The links of the pass being drawn.
     std::vector<Ligacao> ligacoes_;
     CIProgress* progresso_ = nullptr;
