@@ -22,7 +22,6 @@
 #include <cstdint>
 #include <iterator>
 #include <memory>
-#include <numeric>
 
 namespace {
 
@@ -60,6 +59,21 @@ bool Listado(const CEItemLista& item) {
     return valor && *valor == QLatin1String("S");
 }
 
+// The symbol's handle in an accessory's key: what follows its last "_".
+QStringView SimboloDoAcessorio(const QString& chave) {
+    return QStringView(chave).mid(chave.lastIndexOf('_') + 1);
+}
+
+// Anonymous blocks and connector pins, by the block's name in upper case. A name that
+// starts with ASCII needs no upper-case copy to tell.
+bool NuncaDesenhado(const QString& bloco) {
+    const QLatin1String pino("PIN-");
+    if (bloco.startsWith('*')) return true;
+    for (int i = 0; i < std::min(bloco.size(), pino.size()); ++i)
+        if (bloco[i].unicode() >= 0x80) return bloco.toUpper().startsWith(pino);
+    return bloco.startsWith(pino, Qt::CaseInsensitive);
+}
+
 // The catalogue type of terminal blocks.
 const char* const kTipoBorne = "5";
 
@@ -91,8 +105,12 @@ QString CriaPagina(const QString& grupo) {
 
 // The strip of a terminal, in the first language that names one.
 QString ReguaDe(const CEItemLista& item) {
-    for (const char* campo : {"REGUA", "STRIP", "REGLETA"})
-        if (const QString* valor = item.campo(campo); valor && !valor->isEmpty()) return *valor;
+    static const std::uint32_t kNomes[] = {CamposItem::numero(QStringLiteral("REGUA")),
+                                           CamposItem::numero(QStringLiteral("STRIP")),
+                                           CamposItem::numero(QStringLiteral("REGLETA"))};
+    for (const std::uint32_t campo : kNomes)
+        if (const QString* valor = item.campos.procura(campo); valor && !valor->isEmpty())
+            return *valor;
     return QString();
 }
 
@@ -120,16 +138,21 @@ void Filtra(Entradas& entradas, Fica fica) {
 // each entry, large beside its key, moves once.
 template <class Entradas>
 void OrdenaPorChave(Entradas& entradas) {
-    std::vector<std::size_t> ordem(entradas.size());
-    std::iota(ordem.begin(), ordem.end(), std::size_t(0));
-    std::stable_sort(ordem.begin(), ordem.end(), [&entradas](std::size_t a, std::size_t b) {
-        return entradas[a].first < entradas[b].first;
-    });
+    struct Lugar {
+        CCDiagramaTopografico::ChaveDeOrdem chave;
+        std::size_t indice;
+    };
+    std::vector<Lugar> ordem;
+    ordem.reserve(entradas.size());
+    for (std::size_t i = 0; i < entradas.size(); ++i)
+        ordem.push_back({CCDiagramaTopografico::ChaveDeOrdem(entradas[i].first), i});
+    std::stable_sort(ordem.begin(), ordem.end(),
+                     [](const Lugar& a, const Lugar& b) { return a.chave < b.chave; });
     Entradas ordenadas;
     ordenadas.reserve(entradas.size());
-    for (const std::size_t i : ordem)
-        if (ordenadas.empty() || ordenadas.back().first != entradas[i].first)
-            ordenadas.push_back(std::move(entradas[i]));
+    for (const Lugar& lugar : ordem)
+        if (ordenadas.empty() || ordenadas.back().first != entradas[lugar.indice].first)
+            ordenadas.push_back(std::move(entradas[lugar.indice]));
     entradas = std::move(ordenadas);
 }
 
@@ -173,13 +196,13 @@ std::string_view Ascii(QStringView texto, std::array<char, 24>& espaco, QByteArr
 
 // A handle's text as the drawing writes it: upper-case hexadecimal digits without leading
 // zeros, in `digitos`.
-std::string_view TextoHandle(std::uint64_t handle, char (&digitos)[16]) {
+std::string_view TextoHandle(std::uint64_t handle, std::array<char, 16>& digitos) {
     int n = 0;
     do {
         digitos[15 - n++] = "0123456789ABCDEF"[handle & 15];
         handle >>= 4;
     } while (handle != 0);
-    return {digitos + 16 - n, std::size_t(n)};
+    return {digitos.data() + 16 - n, std::size_t(n)};
 }
 
 // The entries of a pass's pages, to size what is kept per key.
@@ -192,6 +215,23 @@ int Quantidade(const std::vector<CCDiagramaTopografico::Pagina>& paginas) {
 }
 
 }  // namespace
+
+CCDiagramaTopografico::ChaveDeOrdem::ChaveDeOrdem(QStringView texto) : texto_(texto) {
+    for (qsizetype i = 0; i < 8; ++i) {
+        const char16_t c = i < texto.size() ? texto[i].unicode() : u'\0';
+        if (i < texto.size() && (c == 0 || c >= 0x80)) {
+            ascii_ = false;
+            break;
+        }
+        prefixo_ = prefixo_ << 8 | c;
+    }
+}
+
+bool operator<(const CCDiagramaTopografico::ChaveDeOrdem& a,
+               const CCDiagramaTopografico::ChaveDeOrdem& b) {
+    if (a.ascii_ && b.ascii_ && a.prefixo_ != b.prefixo_) return a.prefixo_ < b.prefixo_;
+    return a.texto_ < b.texto_;
+}
 
 // ---- extents and the rectangle
 
@@ -236,16 +276,24 @@ CCDiagramaTopografico::Retangulo CCDiagramaTopografico::RetanguloDe(const CEPont
 
 // ---- rows and pages
 
-std::vector<CCDiagramaTopografico::Linha> CCDiagramaTopografico::LinhasBlocos(
-    const std::vector<QString>& chaves, const Extensoes& extensoes, double largura, double margem,
-    int colunas) {
-    std::vector<Linha> linhas;
+// The layout works on any key: the candidates' keys, or the places of the items read, with
+// what a key's block measures given by `extensao` (and `passo`), and each point handed to
+// `poe`.
+namespace {
+
+using D = CCDiagramaTopografico;
+
+template <class Chave, class ExtensaoDe>
+std::vector<std::vector<Chave>> LinhasDeBlocos(const std::vector<Chave>& chaves,
+                                               const ExtensaoDe& extensao, double largura,
+                                               double margem, int colunas) {
+    std::vector<std::vector<Chave>> linhas;
     size_t i = 0;
     while (i < chaves.size()) {
-        Linha linha;
+        std::vector<Chave> linha;
         double t = 0.0;
         do {
-            const double w = extensoes.value(chaves[i]).Largura() + margem;
+            const double w = extensao(chaves[i]).Largura() + margem;
             t += w;
             // A block wider than the rectangle gets a row of its own and sticks out.
             if (!(t < largura || (linha.empty() && w >= largura))) break;
@@ -258,13 +306,15 @@ std::vector<CCDiagramaTopografico::Linha> CCDiagramaTopografico::LinhasBlocos(
     return linhas;
 }
 
-std::vector<CCDiagramaTopografico::Linha> CCDiagramaTopografico::LinhasBornes(
-    const std::vector<Borne>& bornes, double largura, double margem) {
-    std::vector<Linha> linhas;
+// `Borne` has a key, a step and a strip name.
+template <class Borne, class Chave = decltype(Borne::chave)>
+std::vector<std::vector<Chave>> LinhasDeBornes(const std::vector<Borne>& bornes, double largura,
+                                               double margem) {
+    std::vector<std::vector<Chave>> linhas;
     QString ultimaRegua;
     size_t i = 0;
     while (i < bornes.size()) {
-        Linha linha;
+        std::vector<Chave> linha;
         double t = 0.0;
         while (t < largura && i < bornes.size()) {
             const Borne& borne = bornes[i];
@@ -290,27 +340,102 @@ std::vector<CCDiagramaTopografico::Linha> CCDiagramaTopografico::LinhasBornes(
     return linhas;
 }
 
-std::vector<CCDiagramaTopografico::Pagina> CCDiagramaTopografico::Paginas(
-    const std::vector<Linha>& linhas, const Extensoes& extensoes, double altura, double margem,
-    int maxLinhas) {
-    std::vector<Pagina> paginas;
+template <class Chave, class ExtensaoDe>
+std::vector<std::vector<std::vector<Chave>>> PaginasDe(std::vector<std::vector<Chave>> linhas,
+                                                       const ExtensaoDe& extensao, double altura,
+                                                       double margem, int maxLinhas) {
+    std::vector<std::vector<std::vector<Chave>>> paginas;
     if (linhas.empty()) return paginas;
     paginas.emplace_back();
     double u = 0.0;
-    for (const Linha& linha : linhas) {
+    for (std::vector<Chave>& linha : linhas) {
         double h = 0.0;
-        for (const QString& chave : linha)
-            h = std::max(h, extensoes.value(chave).Altura());
-        Pagina& atual = paginas.back();
+        for (const Chave& chave : linha)
+            h = std::max(h, extensao(chave).Altura());
+        std::vector<std::vector<Chave>>& atual = paginas.back();
         if ((u + h > altura && !atual.empty()) ||
             (maxLinhas > 0 && atual.size() >= size_t(maxLinhas))) {
             paginas.emplace_back();
             u = 0.0;
         }
-        paginas.back().push_back(linha);
+        paginas.back().push_back(std::move(linha));
         u += h + margem;
     }
     return paginas;
+}
+
+template <class Chave, class ExtensaoDe, class Poe>
+void PosicoesDeBlocos(const std::vector<std::vector<std::vector<Chave>>>& paginas,
+                      const ExtensaoDe& extensao, const D::Retangulo& retangulo, double margem,
+                      const Poe& poe) {
+    for (const auto& pagina : paginas) {
+        double y = retangulo.topo;
+        for (const std::vector<Chave>& linha : pagina) {
+            double soma = 0.0, h = 0.0;
+            for (const Chave& chave : linha) {
+                const D::Extensao e = extensao(chave);
+                if (e.xMin >= 0 && e.xMax >= 0) soma += e.Largura();
+                h = std::max(h, e.Altura());
+            }
+            // The row fills the whole width, with equal gaps between its blocks.
+            const double folga = retangulo.largura - soma;
+            const double n = double(linha.size());
+            double c = retangulo.esquerda;
+            for (const Chave& chave : linha) {
+                const D::Extensao e = extensao(chave);
+                poe(chave, CEPonto{c - e.MenorX(), (h - e.Altura()) * 0.5 + y - h, 0.0});
+                if (linha.size() > 1) c += e.Largura() + folga / (n - 1);
+            }
+            y -= h + margem;
+        }
+    }
+}
+
+template <class Chave, class ExtensaoDe, class PassoDe, class Poe>
+void PosicoesDeBornes(const std::vector<std::vector<std::vector<Chave>>>& paginas,
+                      const ExtensaoDe& extensao, const PassoDe& passo,
+                      const D::Retangulo& retangulo, double margem, const Poe& poe) {
+    for (const auto& pagina : paginas) {
+        double y = retangulo.topo;
+        for (const std::vector<Chave>& linha : pagina) {
+            double h = 0.0;
+            for (const Chave& chave : linha)
+                h = std::max(h, extensao(chave).Altura());
+            double c = retangulo.esquerda;
+            for (const Chave& chave : linha) {
+                const double d = passo(chave);
+                // A doubled entry gives two points: the later, further one stays.
+                poe(chave, CEPonto{c - d, (h - extensao(chave).Altura()) * 0.5 + y - h, 0.0});
+                c += d;
+            }
+            y -= h + margem;
+        }
+    }
+}
+
+// A key's block as the table of extents has it (nothing for a key it lacks).
+struct ExtensaoNaTabela {
+    const D::Extensoes& extensoes;
+    D::Extensao operator()(const QString& chave) const { return extensoes.value(chave); }
+};
+
+}  // namespace
+
+std::vector<CCDiagramaTopografico::Linha> CCDiagramaTopografico::LinhasBlocos(
+    const std::vector<QString>& chaves, const Extensoes& extensoes, double largura, double margem,
+    int colunas) {
+    return LinhasDeBlocos(chaves, ExtensaoNaTabela{extensoes}, largura, margem, colunas);
+}
+
+std::vector<CCDiagramaTopografico::Linha> CCDiagramaTopografico::LinhasBornes(
+    const std::vector<Borne>& bornes, double largura, double margem) {
+    return LinhasDeBornes(bornes, largura, margem);
+}
+
+std::vector<CCDiagramaTopografico::Pagina> CCDiagramaTopografico::Paginas(
+    const std::vector<Linha>& linhas, const Extensoes& extensoes, double altura, double margem,
+    int maxLinhas) {
+    return PaginasDe(linhas, ExtensaoNaTabela{extensoes}, altura, margem, maxLinhas);
 }
 
 QHash<QString, CEPonto> CCDiagramaTopografico::PosicoesBlocos(const std::vector<Pagina>& paginas,
@@ -319,27 +444,9 @@ QHash<QString, CEPonto> CCDiagramaTopografico::PosicoesBlocos(const std::vector<
                                                               double margem) {
     QHash<QString, CEPonto> posicoes;
     posicoes.reserve(Quantidade(paginas));
-    for (const Pagina& pagina : paginas) {
-        double y = retangulo.topo;
-        for (const Linha& linha : pagina) {
-            double soma = 0.0, h = 0.0;
-            for (const QString& chave : linha) {
-                const Extensao e = extensoes.value(chave);
-                if (e.xMin >= 0 && e.xMax >= 0) soma += e.Largura();
-                h = std::max(h, e.Altura());
-            }
-            // The row fills the whole width, with equal gaps between its blocks.
-            const double folga = retangulo.largura - soma;
-            const double n = double(linha.size());
-            double c = retangulo.esquerda;
-            for (const QString& chave : linha) {
-                const Extensao e = extensoes.value(chave);
-                posicoes[chave] = {c - e.MenorX(), (h - e.Altura()) * 0.5 + y - h, 0.0};
-                if (linha.size() > 1) c += e.Largura() + folga / (n - 1);
-            }
-            y -= h + margem;
-        }
-    }
+    PosicoesDeBlocos(
+        paginas, ExtensaoNaTabela{extensoes}, retangulo, margem,
+        [&posicoes](const QString& chave, const CEPonto& ponto) { posicoes[chave] = ponto; });
     return posicoes;
 }
 
@@ -350,23 +457,10 @@ QHash<QString, CEPonto> CCDiagramaTopografico::PosicoesBornes(const std::vector<
                                                               double margem) {
     QHash<QString, CEPonto> posicoes;
     posicoes.reserve(Quantidade(paginas));
-    for (const Pagina& pagina : paginas) {
-        double y = retangulo.topo;
-        for (const Linha& linha : pagina) {
-            double h = 0.0;
-            for (const QString& chave : linha)
-                h = std::max(h, extensoes.value(chave).Altura());
-            double c = retangulo.esquerda;
-            for (const QString& chave : linha) {
-                const double d = passos.value(chave);
-                const Extensao e = extensoes.value(chave);
-                // A doubled entry writes twice: the later, further point stays.
-                posicoes[chave] = {c - d, (h - e.Altura()) * 0.5 + y - h, 0.0};
-                c += d;
-            }
-            y -= h + margem;
-        }
-    }
+    PosicoesDeBornes(
+        paginas, ExtensaoNaTabela{extensoes},
+        [&passos](const QString& chave) { return passos.value(chave); }, retangulo, margem,
+        [&posicoes](const QString& chave, const CEPonto& ponto) { posicoes[chave] = ponto; });
     return posicoes;
 }
 
@@ -428,10 +522,12 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
         CCDiagramaTopografico& d;
         ~Fim() {
             d.progresso_ = nullptr;
-            d.itensPorHandle_.clear();
             d.camposUsados_.clear();
             d.CamposLidos = nullptr;
             d.definicoes_.clear();
+            d.passosPorBloco_.clear();
+            d.textos_ = {};
+            d.digitos_ = {};
             d.comAcessorioLigado_.clear();
         }
     } fim{*this};
@@ -458,16 +554,21 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     candidatos_ = std::move(candidatos);
     comAcessorios_.clear();
     for (const auto& [chave, candidato] : candidatos_)
-        if (chave.contains('_')) comAcessorios_.insert(chave.section('_', -1));
+        if (chave.contains('_')) comAcessorios_.insert(SimboloDoAcessorio(chave).toString());
 
     // Terminals apart when asked; a handle that is no object joins neither list.
+    // The catalogue is asked once per key.
     std::vector<const Entrada*> comuns, bornes;
+    QHash<QString, bool> ehBorne;
     for (const Entrada& entrada : candidatos_) {
         const Candidato& candidato = entrada.second;
         if (p.borne) {
             if (candidato.simbolo.isNull()) continue;
-            (Catalogo().TipoComp(candidato.chave).trimmed() == kTipoBorne ? bornes : comuns)
-                .push_back(&entrada);
+            auto tipo = ehBorne.constFind(candidato.chave);
+            if (tipo == ehBorne.constEnd())
+                tipo = ehBorne.insert(candidato.chave,
+                                      Catalogo().TipoComp(candidato.chave).trimmed() == kTipoBorne);
+            (*tipo ? bornes : comuns).push_back(&entrada);
         } else {
             comuns.push_back(&entrada);
         }
@@ -479,13 +580,14 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
         // the accessories of one symbol: only the accessories are sorted, by their symbol's
         // handle, and each group joins the symbols behind its own.
         struct Ordem {
-            QString simbolo;
+            ChaveDeOrdem simbolo;
             const Entrada* entrada;
         };
         std::vector<Ordem> simbolos, acessorios;
         for (const Entrada* entrada : entradas) {
             const int corte = entrada->first.lastIndexOf('_');
-            (corte < 0 ? simbolos : acessorios).push_back({entrada->first.mid(corte + 1), entrada});
+            (corte < 0 ? simbolos : acessorios)
+                .push_back({ChaveDeOrdem(QStringView(entrada->first).mid(corte + 1)), entrada});
         }
         const auto porHandle = [](const Ordem& a, const Ordem& b) { return a.simbolo < b.simbolo; };
         std::stable_sort(acessorios.begin(), acessorios.end(), porHandle);
@@ -502,12 +604,14 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     // Each symbol is read once (an accessory's owner is kept in donos_) and never again as a
     // neighbour: its reading need not be kept.
     GuardaSimbolos = false;
-    itensPorHandle_.reserve(int(comuns.size() + bornes.size()));
-    VetorItens itensComuns = LeItens(comuns, modelo);
-    VetorItens itensBornes = LeItens(bornes, modelo);
+    Lidos lidosComuns, lidosBornes;
+    VetorItens itensComuns = LeItens(comuns, modelo, lidosComuns, false);
+    VetorItens itensBornes = LeItens(bornes, modelo, lidosBornes, true);
+    Descarte::Largar(passosPorBloco_);
     // Everything is read: what the reading kept goes before the drawing grows.
     LiberaLeituras();
     Descarte::Largar(donos_);
+    Descarte::Largar(doCatalogo_);
     Descarte::Largar(comAcessorios_);
     progresso.Definir(40);
     struct Destroi {
@@ -529,11 +633,14 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
         progresso.Fechar();
         return;
     }
-    LePassos(itensBornes);
     // Items that sort alike keep the order above.
     itensComuns.ordenarEstavel(p.ordenacao);
     itensBornes.ordenarEstavel(p.ordenacao);
-    LeExtensoes();
+    {
+        QHash<QString, Extensao> porBloco;
+        LeExtensoes(lidosComuns, porBloco);
+        LeExtensoes(lidosBornes, porBloco);
+    }
     progresso.Definir(50);
 
     CICad::RegistraApp(kAppRepresentacao);
@@ -541,57 +648,35 @@ void CCDiagramaTopografico::Executar(const QString& caminhoModelo) {
     CICad::RegistraApp(kAppRepresentacaoAce);
     CICad::RegistraApp(kAppRepresentacaoAceEsq);
 
-    // Both passes are laid out first: the blocks' extents and the steps then go before the
-    // drawing grows.
-    std::vector<Pagina> paginasComuns, paginasBornes;
-    QHash<QString, CEPonto> posicoesComuns, posicoesBornes;
-    if (!itensComuns.empty()) {
-        std::vector<QString> chaves;
-        chaves.reserve(itensComuns.size());
-        for (const CEItemLista* item : itensComuns)
-            chaves.push_back(item->valorCampo(kHandle));
-        const auto linhas =
-            LinhasBlocos(chaves, extensoes_, retangulo.largura, p.margem, p.colunas);
-        paginasComuns = Paginas(linhas, extensoes_, retangulo.altura, p.margem, p.linhas);
-        posicoesComuns = PosicoesBlocos(paginasComuns, extensoes_, retangulo, p.margem);
-    }
-    if (!itensBornes.empty()) {
-        std::vector<Borne> lista;
-        lista.reserve(itensBornes.size());
-        for (const CEItemLista* item : itensBornes) {
-            const QString chave = item->valorCampo(kHandle);
-            lista.push_back({chave, passos_.value(chave), ReguaDe(*item)});
-        }
-        const auto linhas = LinhasBornes(lista, retangulo.largura, p.margem);
-        paginasBornes = Paginas(linhas, extensoes_, retangulo.altura, p.margem, p.linhas);
-        posicoesBornes = PosicoesBornes(paginasBornes, extensoes_, passos_, retangulo, p.margem);
-    }
-    Descarte::Largar(extensoes_);
-    Descarte::Largar(passos_);
+    // Both passes are laid out first: the readings of the sort go before the drawing grows.
+    std::vector<PaginaLida> paginasComuns = PaginasComuns(itensComuns, lidosComuns, retangulo);
+    std::vector<PaginaLida> paginasBornes = PaginasBornes(itensBornes, lidosBornes, retangulo);
     // From here each item is given back as its block goes in; those left go at the end, with
-    // the table that finds them.
+    // the readings that hold them.
     struct Restantes {
-        QHash<QString, Lido> itens;
-        explicit Restantes(QHash<QString, Lido>&& v) noexcept : itens(std::move(v)) {}
+        Lidos comuns, bornes;
+        Restantes(Lidos&& c, Lidos&& b) noexcept : comuns(std::move(c)), bornes(std::move(b)) {}
         Restantes(Restantes&&) noexcept = default;
         ~Restantes() {
-            for (Lido& lido : itens)
-                delete lido.item;
+            for (Lidos* lidos : {&comuns, &bornes})
+                for (Lido& lido : *lidos)
+                    delete lido.item;
         }
     };
     struct Entrega {
-        QHash<QString, Lido>& itens;
-        ~Entrega() { Descarte::Descartar(Restantes{std::exchange(itens, {})}); }
-    } entrega{itensPorHandle_};
+        Lidos& comuns;
+        Lidos& bornes;
+        ~Entrega() {
+            Descarte::Descartar(Restantes{std::exchange(comuns, {}), std::exchange(bornes, {})});
+        }
+    } entrega{lidosComuns, lidosBornes};
     itensComuns.clear();
     itensBornes.clear();
-    if (!paginasComuns.empty()) Desenha(paginasComuns, posicoesComuns);
-    Descarte::Largar(posicoesComuns);
+    if (!paginasComuns.empty()) Desenha(paginasComuns, lidosComuns);
     Descarte::Largar(paginasComuns);
     progresso.Definir(75);
-    if (!paginasBornes.empty()) Desenha(paginasBornes, posicoesBornes);
+    if (!paginasBornes.empty()) Desenha(paginasBornes, lidosBornes);
     EntregaInseridos();
-    Descarte::Largar(posicoesBornes);
     Descarte::Largar(paginasBornes);
     CICad::zvInvokeVoid("atualizaTopografico");
     progresso.Definir(100);
@@ -625,9 +710,7 @@ void CCDiagramaTopografico::ColetaCandidatos(Candidatos& candidatos) {
     // block names and texts.
     for (CICad::ReferenciaComXData& ref : CICad::GetReferenciasComXData(
              kAppSimbolo, {kAppAditivo, kAppRepresentacaoEsq, kAppRepresentacaoAceEsq}, db)) {
-        // Anonymous blocks and connector pins are never drawn.
-        const QString bloco = ref.bloco.toUpper();
-        if (bloco.startsWith('*') || bloco.startsWith(QLatin1String("PIN-"))) continue;
+        if (NuncaDesenhado(ref.bloco)) continue;
         if (ref.codigo != 1000) continue;
         adiciona(
             ref.id, ref.texto,
@@ -647,21 +730,21 @@ void CCDiagramaTopografico::ColetaCandidatos(Candidatos& candidatos) {
 
 void CCDiagramaTopografico::AdicionaAcessorios(Candidatos& candidatos) {
     std::vector<std::pair<QString, Candidato>> novos;
-    // A catalogue key's accessories are cut out once, and their keys shared by the symbols
-    // of that key: a project has few keys and many symbols.
-    QHash<QString, std::vector<std::pair<int, QString>>> porChave;
+    // A catalogue key's accessories are cut out once, with their places' marks ("*0_"), and
+    // shared by the symbols of that key: a project has few keys and many symbols.
+    QHash<QString, std::vector<std::pair<QString, QString>>> porChave;
     for (const auto& [chave, simbolo] : candidatos) {
         auto doCatalogo = porChave.constFind(simbolo.chave);
         if (doCatalogo == porChave.constEnd()) {
-            std::vector<std::pair<int, QString>> cortados;
+            std::vector<std::pair<QString, QString>> cortados;
             const QStringList acessorios = Catalogo().AcessoriosDe(simbolo.chave);
             for (int i = 0; i < acessorios.size(); ++i)
                 if (QString acessorio = acessorios[i].section('#', 0, 0); !acessorio.isEmpty())
-                    cortados.emplace_back(i, std::move(acessorio));
+                    cortados.emplace_back("*" + QString::number(i) + "_", std::move(acessorio));
             doCatalogo = porChave.insert(simbolo.chave, std::move(cortados));
         }
-        for (const auto& [i, acessorio] : *doCatalogo)
-            novos.push_back({"*" + QString::number(i) + "_" + chave,
+        for (const auto& [lugar, acessorio] : *doCatalogo)
+            novos.push_back({lugar + chave,
                              {acessorio, simbolo.norma, QString(), simbolo.simbolo, QString(),
                               QString(), false, simbolo.dados}});
         const CEListaXData& aditivos = simbolo.dados ? simbolo.dados->aditivos : kSemDados;
@@ -773,8 +856,9 @@ void CCDiagramaTopografico::DescartaDesenhados(Candidatos& candidatos) {
 bool CCDiagramaTopografico::AcessorioDesenhado(const QString& chave, Candidato& candidato) const {
     // The symbol's chain names its accessories' blocks; each block says which place of the
     // symbol's list it shows and with which key (a changed catalogue draws the new one).
-    const QString lugar = chave.section('_', 0, 0);
-    const QString simbolo = chave.section('_', -1);
+    const int corte = chave.indexOf('_');
+    const QStringView lugar = corte < 0 ? QStringView(chave) : QStringView(chave).left(corte);
+    const QStringView simbolo = SimboloDoAcessorio(chave);
     const auto pares = Pares(candidato.dados ? candidato.dados->ligacoesAce : kSemDados);
     candidato.semLigacoes = pares.empty();
     for (const auto& [rep, handle] : pares) {
@@ -782,16 +866,23 @@ bool CCDiagramaTopografico::AcessorioDesenhado(const QString& chave, Candidato& 
         const OdDbObjectId bloco = CICad::IdDoHandle(handle);
         if (bloco.isNull()) continue;
         const CEListaXData link = CICad::GetXData(bloco, kAppRepresentacaoAce);
-        if (link.size() >= 4 && link[0].texto == rep && link[1].texto == simbolo &&
-            link[2].texto == lugar && link[3].texto == candidato.chave)
+        if (link.size() >= 4 && link[0].texto == rep && QStringView(link[1].texto) == simbolo &&
+            QStringView(link[2].texto) == lugar && link[3].texto == candidato.chave)
             return true;
     }
     return false;
 }
 
 VetorItens CCDiagramaTopografico::LeItens(const std::vector<const Entrada*>& entradas,
-                                          CETemplate& modelo) {
+                                          CETemplate& modelo, Lidos& lidos, bool bornes) {
+    // A terminal takes its step, under the name PBLTOPO_BORNEDIST gives, as it is read.
+    const QString& tag = parametros_.borneDist;
+    const bool comPasso = bornes && !tag.isEmpty();
+    const std::uint32_t nomePasso = comPasso ? CamposItem::numero(tag) : 0;
+    const std::size_t novos =
+        std::size_t(escreveChave_) + std::size_t(escreveLugar_) + std::size_t(comPasso);
     VetorItens itens;
+    lidos.reserve(entradas.size());
     for (const Entrada* entrada : entradas) {
         const QString& chave = entrada->first;
         const Candidato& candidato = entrada->second;
@@ -799,24 +890,34 @@ VetorItens CCDiagramaTopografico::LeItens(const std::vector<const Entrada*>& ent
         std::unique_ptr<CEItemLista> item;
         if (chave.contains('_')) {
             item.reset(LeItemAcessorio(chave, candidato, modelo));
-        } else if (const auto dono = donos_.constFind(chave); dono != donos_.constEnd()) {
-            // Read already for its accessories.
-            if (dono.value()) item = std::make_unique<CEItemLista>(*dono.value());
+        } else if (const auto dono = donos_.find(chave); dono != donos_.end()) {
+            // Read already for its accessories: that reading becomes its item, where its
+            // accessories still to come find it.
+            if (dono->lido) {
+                item = std::make_unique<CEItemLista>(std::move(*dono->lido));
+                dono->lido.reset();
+                dono->item = item.get();
+            }
         } else {
             item.reset(CriaItemEntidade(candidato.simbolo, modelo));
             if (item && !Listado(*item)) item.reset();
             if (item) Retem(*item);
             // Its accessories come next and take their owner's fields from this same read.
-            if (comAcessorios_.contains(chave))
-                donos_.insert(chave, item ? std::make_shared<const CEItemLista>(*item) : nullptr);
+            if (comAcessorios_.contains(chave)) donos_.insert(chave, {item.get(), nullptr});
         }
         if (!item) continue;
-        static const std::uint32_t kNumeroHandle = CamposItem::numero(kHandle),
-                                   kNumeroSequencia =
-                                       CamposItem::numero(QString::fromLatin1(kCampoSequencia));
-        item->definirCampo(kNumeroHandle, chave);
-        item->definirCampo(kNumeroSequencia, QString::number(itens.size()));
-        itensPorHandle_.insert(chave, {item.get(), &candidato});
+        if (novos) item->campos.reservar(std::size_t(item->campos.size()) + novos);
+        if (escreveChave_) item->definirCampo(CamposItem::numero(kHandle), chave);
+        if (escreveLugar_)
+            item->definirCampo(CamposItem::numero(QString::fromLatin1(kCampoSequencia)),
+                               QString::number(itens.size()));
+        double passo = 0.0;
+        if (bornes) {
+            const auto& [texto, valor] = PassoDe(candidato);
+            if (comPasso) item->definirCampo(nomePasso, texto);
+            passo = valor;
+        }
+        lidos.push_back({item.get(), &candidato, &chave, {}, passo, {}});
         itens.push_back(item.release());
     }
     return itens;
@@ -825,43 +926,67 @@ VetorItens CCDiagramaTopografico::LeItens(const std::vector<const Entrada*>& ent
 CEItemLista* CCDiagramaTopografico::LeItemAcessorio(const QString& chave,
                                                     const Candidato& candidato,
                                                     CETemplate& modelo) {
-    const QString simbolo = chave.section('_', -1);
+    // An accessory the lists leave out needs no reading of its owner.
+    const DoCatalogo& proprio = DoCatalogoDe(candidato);
+    if (!proprio.listado) return nullptr;
+    const QString simbolo = SimboloDoAcessorio(chave).toString();
     auto dono = donos_.constFind(simbolo);
     if (dono == donos_.constEnd()) {
         std::shared_ptr<CEItemLista> lido(CriaItemEntidade(candidato.simbolo, modelo));
         if (lido && !Listado(*lido)) lido.reset();
         if (lido) Retem(*lido);
-        dono = donos_.insert(simbolo, lido);
+        dono = donos_.insert(simbolo, {lido.get(), lido});
     }
     // The accessory of a symbol that is not on the lists is not in the panel either.
-    if (!dono.value()) return nullptr;
-    const CEItemLista& origem = *dono.value();
+    if (!dono->item) return nullptr;
+    const CEItemLista& origem = *dono->item;
     auto item = std::make_unique<CEItemLista>();
     item->ids = origem.ids;
-    // It sits with its owner: the owner's tag, strip, number and page, in every language.
-    for (const std::uint32_t nome : NomesDoDono())
+    item->campos.reservar(NomesDoDono().size() + 1 + proprio.campos.size());
+    // It sits with its owner: the owner's tag, strip, number and page, in every language,
+    // and its quantity unless a column of its own says one.
+    static const std::vector<std::uint32_t> kNomesDoDono = [] {
+        std::vector<std::uint32_t> nomes = NomesDoDono();
+        std::sort(nomes.begin(), nomes.end());
+        return nomes;
+    }();
+    for (const std::uint32_t nome : kNomesDoDono)
         if (const QString* valor = origem.campos.procura(nome)) item->definirCampo(nome, *valor);
+    static const std::uint32_t kQtd = CamposItem::numero("QTD");
+    static const QString kUm("1");
+    const QString* qtd = origem.campos.procura(kQtd);
+    item->definirCampo(kQtd, qtd && !qtd->isEmpty() ? *qtd : kUm);
     // Everything else is the accessory's own.
+    item->campos.juntarOrdenados(proprio.campos);
+    return item.release();
+}
+
+const CCDiagramaTopografico::DoCatalogo& CCDiagramaTopografico::DoCatalogoDe(
+    const Candidato& candidato) {
+    const std::pair<QString, QString> chaveNorma{candidato.chave, candidato.norma};
+    auto achado = doCatalogo_.constFind(chaveNorma);
+    if (achado != doCatalogo_.constEnd()) return **achado;
     static const std::uint32_t kTipo = CamposItem::numero("ZV_LISTA_TIPO"),
                                kLista = CamposItem::numero("ZV_LISTA"),
                                kChave = CamposItem::numero("ZV_KEY"),
                                kDescricao = CamposItem::numero("DESCRICAO"),
-                               kTpDescri = CamposItem::numero("TP_DESCRI"),
-                               kQtd = CamposItem::numero("QTD");
-    static const QString kAce("ACE"), kUm("1");
-    item->definirCampo(kTipo, kAce);
-    item->definirCampo(kLista, Catalogo().ListaComp(candidato.chave, candidato.norma));
-    item->definirCampo(kChave, candidato.chave);
+                               kTpDescri = CamposItem::numero("TP_DESCRI");
+    static const QString kAce("ACE");
+    CEItemLista proprio;
+    proprio.definirCampo(kTipo, kAce);
+    proprio.definirCampo(kLista, Catalogo().ListaComp(candidato.chave, candidato.norma));
+    proprio.definirCampo(kChave, candidato.chave);
     const QString descricao = Catalogo().DescricaoComp(candidato.chave);
-    item->definirCampo(kDescricao, descricao);
-    item->definirCampo(kTpDescri, descricao);
-    const QString* qtd = origem.campos.procura(kQtd);
-    item->definirCampo(kQtd, qtd && !qtd->isEmpty() ? *qtd : kUm);
-    LeColunasUsuario(QString(), *item, Catalogo().ColunasComp(candidato.chave));
-    const QString* listado = item->campos.procura(kLista);
-    if (!listado || *listado != QLatin1String("S")) return nullptr;
-    Retem(*item);
-    return item.release();
+    proprio.definirCampo(kDescricao, descricao);
+    proprio.definirCampo(kTpDescri, descricao);
+    // The columns come last and may say any of these again.
+    LeColunasUsuario(QString(), proprio, Catalogo().ColunasComp(candidato.chave));
+    auto feito = std::make_shared<DoCatalogo>();
+    const QString* listado = proprio.campos.procura(kLista);
+    feito->listado = listado && *listado == QLatin1String("S");
+    Retem(proprio);
+    feito->campos = proprio.campos.todos();
+    return **doCatalogo_.insert(chaveNorma, std::move(feito));
 }
 
 // ---- what is read of items
@@ -878,9 +1003,8 @@ std::optional<std::vector<std::uint32_t>> CCDiagramaTopografico::CamposUsados(
     const auto poe = [&campos](const QString& nome) {
         if (!nome.isEmpty()) campos.push_back(CamposItem::numero(nome));
     };
-    for (const char* nome : {"HANDLE", "ZV_LISTA", "QTD", "REGUA", "STRIP", "REGLETA"})
+    for (const char* nome : {"ZV_LISTA", "QTD", "REGUA", "STRIP", "REGLETA"})
         poe(QString::fromLatin1(nome));
-    poe(QString::fromLatin1(kCampoSequencia));
     poe(parametros.borneDist);
     for (const QString& nome : parametros.ordenacao)
         poe(nome);
@@ -911,12 +1035,20 @@ void CCDiagramaTopografico::PreparaLeitura(const Candidatos& candidatos) {
             blocos.emplace_back(candidato.arquivo, candidato.nome);
         }
     const auto campos = CamposUsados(parametros_, blocos);
+    escreveChave_ = escreveLugar_ = true;
     if (!campos) return;
     camposUsados_.assign(campos->empty() ? 0 : campos->back() + 1, 0);
     for (const std::uint32_t campo : *campos)
         camposUsados_[campo] = 1;
     // The symbols' readings write only these: nothing to trim afterwards.
     if (!camposUsados_.empty()) CamposLidos = &camposUsados_;
+    // An item's key and its place as read go in for a block or a sort that shows them.
+    const auto usado = [this](const QString& nome) {
+        const std::uint32_t numero = CamposItem::numero(nome);
+        return camposUsados_.empty() || (numero < camposUsados_.size() && camposUsados_[numero]);
+    };
+    escreveChave_ = usado(kHandle);
+    escreveLugar_ = usado(QString::fromLatin1(kCampoSequencia));
 }
 
 void CCDiagramaTopografico::Retem(CEItemLista& item) const {
@@ -926,39 +1058,29 @@ void CCDiagramaTopografico::Retem(CEItemLista& item) const {
         [&usados](std::uint32_t nome) { return nome < usados.size() && usados[nome]; });
 }
 
-void CCDiagramaTopografico::LePassos(const VetorItens& bornes) {
+const std::pair<QString, double>& CCDiagramaTopografico::PassoDe(const Candidato& candidato) {
     // The step is the default text of the block's attribute named by PBLTOPO_BORNEDIST.
-    QHash<QString, QString> porBloco;
-    passos_.reserve(int(bornes.size()));
-    const QString& tag = parametros_.borneDist;
-    for (CEItemLista* item : bornes) {
-        const QString chave = item->valorCampo(kHandle);
-        const Candidato* candidato = itensPorHandle_.value(chave).candidato;
-        if (!candidato) continue;
-        const QString& nome = candidato->nome;
-        auto achado = porBloco.constFind(nome);
-        if (achado == porBloco.constEnd()) {
-            QString passo;
-            const auto definicoes = CICad::GetDefinicoesAtributos(candidato->arquivo, nome);
-            for (int i = 0; definicoes && !tag.isEmpty() && i < definicoes->Quantidade(); ++i)
-                if ((*definicoes)[i].GetTag() == tag) {
-                    passo = (*definicoes)[i].GetValor();
-                    break;
-                }
-            achado = porBloco.insert(nome, passo.isEmpty() ? QString(kPassoPadrao) : passo);
-        }
-        if (!tag.isEmpty()) item->definirCampo(tag, achado.value());
-        passos_.insert(chave, CETemplateLisp::TextoParaReal(achado.value()));
+    const QString& nome = candidato.nome;
+    auto achado = passosPorBloco_.constFind(nome);
+    if (achado == passosPorBloco_.constEnd()) {
+        const QString& tag = parametros_.borneDist;
+        QString passo;
+        const auto definicoes = CICad::GetDefinicoesAtributos(candidato.arquivo, nome);
+        for (int i = 0; definicoes && !tag.isEmpty() && i < definicoes->Quantidade(); ++i)
+            if ((*definicoes)[i].GetTag() == tag) {
+                passo = (*definicoes)[i].GetValor();
+                break;
+            }
+        if (passo.isEmpty()) passo = QString(kPassoPadrao);
+        achado = passosPorBloco_.insert(nome, {passo, CETemplateLisp::TextoParaReal(passo)});
     }
+    return *achado;
 }
 
-void CCDiagramaTopografico::LeExtensoes() {
+void CCDiagramaTopografico::LeExtensoes(Lidos& lidos, QHash<QString, Extensao>& porBloco) {
     // Once per block, for the candidates that have an item: only those are laid out.
-    QHash<QString, Extensao> porBloco;
-    extensoes_.reserve(itensPorHandle_.size());
-    for (auto it = itensPorHandle_.constBegin(); it != itensPorHandle_.constEnd(); ++it) {
-        const QString& chave = it.key();
-        const QString& nome = it->candidato->nome;
+    for (Lido& lido : lidos) {
+        const QString& nome = lido.candidato->nome;
         auto achado = porBloco.constFind(nome);
         if (achado == porBloco.constEnd()) {
             Extensao extensao;
@@ -969,14 +1091,70 @@ void CCDiagramaTopografico::LeExtensoes() {
                 extensao = ExtensaoAbsoluta(xMin, xMax, yMin, yMax);
             achado = porBloco.insert(nome, extensao);
         }
-        extensoes_.insert(chave, achado.value());
+        lido.extensao = achado.value();
     }
+}
+
+// ---- the passes' layout
+
+std::vector<std::uint32_t> CCDiagramaTopografico::Lugares(const VetorItens& itens,
+                                                          const Lidos& lidos) {
+    // By the items' addresses, found without reading the items.
+    using Endereco = std::pair<std::uintptr_t, std::uint32_t>;
+    std::vector<Endereco> porEndereco;
+    porEndereco.reserve(lidos.size());
+    for (std::size_t i = 0; i < lidos.size(); ++i)
+        porEndereco.emplace_back(reinterpret_cast<std::uintptr_t>(lidos[i].item), std::uint32_t(i));
+    std::sort(porEndereco.begin(), porEndereco.end());
+    std::vector<std::uint32_t> lugares;
+    lugares.reserve(itens.size());
+    for (const CEItemLista* item : itens) {
+        const Endereco procurado{reinterpret_cast<std::uintptr_t>(item), 0};
+        const auto achado = std::lower_bound(porEndereco.begin(), porEndereco.end(), procurado);
+        if (achado != porEndereco.end() && achado->first == procurado.first)
+            lugares.push_back(achado->second);
+    }
+    return lugares;
+}
+
+std::vector<CCDiagramaTopografico::PaginaLida> CCDiagramaTopografico::PaginasComuns(
+    const VetorItens& itens, Lidos& lidos, const Retangulo& retangulo) const {
+    const Parametros& p = parametros_;
+    const auto extensao = [&lidos](std::uint32_t lugar) { return lidos[lugar].extensao; };
+    auto paginas = PaginasDe(
+        LinhasDeBlocos(Lugares(itens, lidos), extensao, retangulo.largura, p.margem, p.colunas),
+        extensao, retangulo.altura, p.margem, p.linhas);
+    PosicoesDeBlocos(
+        paginas, extensao, retangulo, p.margem,
+        [&lidos](std::uint32_t lugar, const CEPonto& ponto) { lidos[lugar].ponto = ponto; });
+    return paginas;
+}
+
+std::vector<CCDiagramaTopografico::PaginaLida> CCDiagramaTopografico::PaginasBornes(
+    const VetorItens& itens, Lidos& lidos, const Retangulo& retangulo) const {
+    struct BorneLido {
+        std::uint32_t chave;
+        double passo;
+        QString regua;
+    };
+    std::vector<BorneLido> bornes;
+    bornes.reserve(itens.size());
+    for (const std::uint32_t lugar : Lugares(itens, lidos))
+        bornes.push_back({lugar, lidos[lugar].passo, ReguaDe(*lidos[lugar].item)});
+    const Parametros& p = parametros_;
+    const auto extensao = [&lidos](std::uint32_t lugar) { return lidos[lugar].extensao; };
+    auto paginas = PaginasDe(LinhasDeBornes(bornes, retangulo.largura, p.margem), extensao,
+                             retangulo.altura, p.margem, p.linhas);
+    PosicoesDeBornes(
+        paginas, extensao, [&lidos](std::uint32_t lugar) { return lidos[lugar].passo; }, retangulo,
+        p.margem,
+        [&lidos](std::uint32_t lugar, const CEPonto& ponto) { lidos[lugar].ponto = ponto; });
+    return paginas;
 }
 
 // ---- pages and insertion
 
-void CCDiagramaTopografico::Desenha(const std::vector<Pagina>& paginas,
-                                    const QHash<QString, CEPonto>& posicoes) {
+void CCDiagramaTopografico::Desenha(const std::vector<PaginaLida>& paginas, Lidos& lidos) {
     // Every page first, so that no page change happens while blocks go in.
     std::vector<PaginaFeita> feitas(paginas.size());
     for (PaginaFeita& feita : feitas) {
@@ -986,29 +1164,29 @@ void CCDiagramaTopografico::Desenha(const std::vector<Pagina>& paginas,
     paginasCriadas_ += int(paginas.size());
     // A terminal that starts a strip stands twice, its two entries side by side in the pass
     // (in one row, or ending one row and starting the next): it goes in once, at its later
-    // entry, where its point was left. Every other key stands once.
-    const QString* anterior = nullptr;
+    // entry, where its point was left. Every other item stands once.
+    const std::uint32_t* anterior = nullptr;
     size_t paginaAnterior = 0;
     for (size_t i = 0; i < paginas.size(); ++i) {
-        for (const Linha& linha : paginas[i])
-            for (const QString& chave : linha) {
-                if (anterior && *anterior != chave)
-                    Insere(*anterior, feitas[paginaAnterior], posicoes.value(*anterior));
-                anterior = &chave;
+        for (const LinhaLida& linha : paginas[i])
+            for (const std::uint32_t& lugar : linha) {
+                if (anterior && *anterior != lugar)
+                    Insere(lidos[*anterior], feitas[paginaAnterior]);
+                anterior = &lugar;
                 paginaAnterior = i;
             }
         if (progresso_) progresso_->Definir(progresso_->Percentual());
     }
-    if (anterior) Insere(*anterior, feitas[paginaAnterior], posicoes.value(*anterior));
+    if (anterior) Insere(lidos[*anterior], feitas[paginaAnterior]);
+    LigaSimbolos();
 }
 
-void CCDiagramaTopografico::Insere(const QString& chave, PaginaFeita& pagina,
-                                   const CEPonto& ponto) {
-    const auto lido = itensPorHandle_.find(chave);
-    if (lido == itensPorHandle_.end()) return;
-    CEItemLista* item = lido->item;
-    const Candidato* candidato = lido->candidato;
+void CCDiagramaTopografico::Insere(Lido& lido, PaginaFeita& pagina) {
+    CEItemLista* item = lido.item;
+    const Candidato* candidato = lido.candidato;
     if (!item || !candidato) return;
+    const QString& chave = *lido.chave;
+    const CEPonto& ponto = lido.ponto;
     // Every attribute takes the item's field of its tag (blank when the item has none).
     const auto valores = [item](const QString& tag, const QString&) -> std::optional<QString> {
         const QString* valor = item->campo(tag);
@@ -1031,25 +1209,24 @@ void CCDiagramaTopografico::Insere(const QString& chave, PaginaFeita& pagina,
     // The item's handle field is its candidate's key.
     const int corte = chave.indexOf('_');
     const bool acessorio = corte >= 0;
-    const QString prefixo = acessorio ? chave.left(corte) : QString();
-    std::array<char, 24> handleA, prefixoA;
+    const QStringView prefixo = acessorio ? QStringView(chave).left(corte) : QStringView();
+    std::array<char, 24> handleA, prefixoA, chaveA;
     QByteArray handleU8, prefixoU8, chaveU8;
-    std::vector<std::string_view> link{Vista(representacaoU8_),
-                                       Ascii(QStringView(chave).mid(corte + 1), handleA, handleU8)};
+    std::vector<std::string_view>& link = textos_;
+    link.clear();
+    link.push_back(Vista(representacaoU8_));
+    link.push_back(Ascii(QStringView(chave).mid(corte + 1), handleA, handleU8));
     if (acessorio) {
-        chaveU8 = candidato->chave.toUtf8();
         link.push_back(Ascii(prefixo, prefixoA, prefixoU8));
-        link.push_back(Vista(chaveU8));
+        link.push_back(Ascii(candidato->chave, chaveA, chaveU8));
     }
     CICad::SetXDataTextos(ref, acessorio ? kAppRepresentacaoAce : kAppRepresentacao, link);
-    // A symbol's own block is linked once a run; its accessories' blocks share one chain.
-    bool semLigacoes = candidato->semLigacoes;
-    if (acessorio && semLigacoes)
-        semLigacoes = comAcessorioLigado_.insert(candidato->simbolo.handle()).second;
-    char digitos[16];
-    LigaSimbolo(candidato->simbolo, prefixo, TextoHandle(ref.handle(), digitos), semLigacoes);
+    // The symbol names the block when the pass is over (the key outlives the pass); a block
+    // whose symbol is gone stays unlinked, and the next run adds it again.
+    if (!candidato->simbolo.isNull())
+        ligacoes_.push_back({candidato->simbolo.handle(), candidato, prefixo, ref.handle()});
     // Each item goes in once: it gives its room to the blocks that follow, a batch at a time.
-    lido->item = nullptr;
+    lido.item = nullptr;
     itensInseridos_.itens.push_back(item);
     if (itensInseridos_.itens.size() >= kLoteInseridos) EntregaInseridos();
 }
@@ -1063,34 +1240,102 @@ void CCDiagramaTopografico::EntregaInseridos() {
     Descarte::Descartar(std::exchange(itensInseridos_, {}));
 }
 
-void CCDiagramaTopografico::LigaSimbolo(const OdDbObjectId& simbolo, const QString& lugar,
-                                        std::string_view bloco, bool semLigacoes) {
-    if (simbolo.isNull()) return;  // the block stays unlinked; the next run adds it again
-    const bool acessorio = !lugar.isEmpty();
+void CCDiagramaTopografico::LigaSimbolos() {
+    // By symbol; a symbol's links stay in the order its blocks went in.
+    std::stable_sort(ligacoes_.begin(), ligacoes_.end(),
+                     [](const Ligacao& a, const Ligacao& b) { return a.simbolo < b.simbolo; });
+    Cadeia propria, acessorios;
+    // Each symbol comes once a pass: those of earlier passes are looked up, this pass's join
+    // them, in order, when it is over.
+    const std::size_t antes = comAcessorioLigado_.size();
+    for (size_t i = 0, fim = 0; i < ligacoes_.size(); i = fim) {
+        fim = i + 1;
+        while (fim < ligacoes_.size() && ligacoes_[fim].simbolo == ligacoes_[i].simbolo)
+            ++fim;
+        LigaSimbolo(ligacoes_.data() + i, ligacoes_.data() + fim, propria, acessorios, antes);
+    }
+    std::inplace_merge(comAcessorioLigado_.begin(),
+                       comAcessorioLigado_.begin() + std::ptrdiff_t(antes),
+                       comAcessorioLigado_.end());
+    ligacoes_.clear();
+}
+
+void CCDiagramaTopografico::LigaSimbolo(const Ligacao* inicio, const Ligacao* fim, Cadeia& propria,
+                                        Cadeia& acessorios, std::size_t ligadosAntes) {
+    const OdDbObjectId& simbolo = inicio->candidato->simbolo;
+    for (Cadeia* cadeia : {&propria, &acessorios}) {
+        cadeia->pares.clear();
+        cadeia->lida = false;
+    }
+    // A chain that the symbol lacks is added after its others: the one linked first first.
+    Cadeia* ordem[2] = {nullptr, nullptr};
+    for (const Ligacao* ligacao = inicio; ligacao != fim; ++ligacao) {
+        const bool acessorio = !ligacao->lugar.isEmpty();
+        Cadeia& cadeia = acessorio ? acessorios : propria;
+        if (!cadeia.lida) {
+            // A symbol's own block is linked once a run; its accessories' blocks share one
+            // chain, empty at the start when the run found it so and no pass linked it yet.
+            bool semLigacoes = ligacao->candidato->semLigacoes;
+            if (acessorio && semLigacoes) {
+                const auto fimAntes = comAcessorioLigado_.begin() + std::ptrdiff_t(ligadosAntes);
+                semLigacoes =
+                    !std::binary_search(comAcessorioLigado_.begin(), fimAntes, ligacao->simbolo);
+                if (semLigacoes) comAcessorioLigado_.push_back(ligacao->simbolo);
+            }
+            if (!semLigacoes) LeCadeia(simbolo, acessorio, cadeia);
+            cadeia.lida = true;
+            *(ordem[0] ? &ordem[1] : &ordem[0]) = &cadeia;
+        }
+        // At most one block per representation, and for accessories one per place in the
+        // symbol's list: the old block of the same one goes.
+        std::vector<Par>& pares = cadeia.pares;
+        pares.erase(std::remove_if(pares.begin(), pares.end(),
+                                   [&](const Par& par) {
+                                       return par.mesmaRep &&
+                                              (!acessorio || par.Lugar() == ligacao->lugar);
+                                   }),
+                    pares.end());
+        Par novo;
+        novo.lugar = ligacao->lugar;
+        novo.bloco = ligacao->bloco;
+        novo.mesmaRep = true;
+        pares.push_back(std::move(novo));
+    }
+    for (const Cadeia* cadeia : ordem)
+        if (cadeia) GravaCadeia(simbolo, cadeia == &acessorios, *cadeia);
+}
+
+void CCDiagramaTopografico::LeCadeia(const OdDbObjectId& simbolo, bool acessorio,
+                                     Cadeia& cadeia) const {
     static const QString kEsq(kAppRepresentacaoEsq), kAceEsq(kAppRepresentacaoAceEsq);
-    const QString& aplicacao = acessorio ? kAceEsq : kEsq;
-    // At most one block per representation, and for accessories one per place in the
-    // symbol's list: a stale pair, or the old block of the same one, goes.
-    std::vector<QByteArray> ficam;
-    const auto pares = semLigacoes ? std::vector<std::pair<QString, QString>>()
-                                   : Pares(CICad::GetXData(simbolo, aplicacao));
-    for (const auto& [rep, ligado] : pares) {
+    for (const auto& [rep, ligado] : Pares(CICad::GetXData(simbolo, acessorio ? kAceEsq : kEsq))) {
+        // A stale pair goes, and so does an accessory's block that says no place.
         const OdDbObjectId id = CICad::IdDoHandle(ligado);
         if (id.isNull()) continue;
-        if (rep == parametros_.representacao) {
-            if (!acessorio) continue;
+        Par par;
+        par.mesmaRep = rep == parametros_.representacao;
+        if (par.mesmaRep && acessorio) {
             const CEListaXData link = CICad::GetXData(id, kAppRepresentacaoAce);
-            if (link.size() < 3 || link[2].texto == lugar) continue;
+            if (link.size() < 3) continue;
+            par.lugarLido = link[2].texto;
         }
-        ficam.push_back(rep.toUtf8());
-        ficam.push_back(ligado.toUtf8());
+        par.rep = rep.toUtf8();
+        par.ligado = ligado.toUtf8();
+        cadeia.pares.push_back(std::move(par));
     }
-    std::vector<std::string_view> cadeia;
-    cadeia.reserve(ficam.size() + 2);
-    for (const QByteArray& texto : ficam)
-        cadeia.push_back(Vista(texto));
-    cadeia.push_back(Vista(representacaoU8_));
-    cadeia.push_back(bloco);
+}
+
+void CCDiagramaTopografico::GravaCadeia(const OdDbObjectId& simbolo, bool acessorio,
+                                        const Cadeia& cadeia) {
+    std::vector<std::array<char, 16>>& digitos = digitos_;
+    digitos.resize(cadeia.pares.size());
+    std::vector<std::string_view>& textos = textos_;
+    textos.clear();
+    for (size_t i = 0; i < cadeia.pares.size(); ++i) {
+        const Par& par = cadeia.pares[i];
+        textos.push_back(par.bloco ? Vista(representacaoU8_) : Vista(par.rep));
+        textos.push_back(par.bloco ? TextoHandle(par.bloco, digitos[i]) : Vista(par.ligado));
+    }
     CICad::SetXDataTextos(simbolo, acessorio ? kAppRepresentacaoAceEsq : kAppRepresentacaoEsq,
-                          cadeia);
+                          textos);
 }

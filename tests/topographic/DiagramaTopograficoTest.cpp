@@ -253,6 +253,9 @@ protected:
 QTemporaryDir* DiagramaTopograficoTest::pasta_ = nullptr;
 
 TEST_F(DiagramaTopograficoTest, ListedSymbolsWithAFrontViewFileAreDrawnEachOnce) {
+    // A pin is told by its block's name in any case; a terminal's key doesn't make it one.
+    Simbolo("pin-borne", "1001\f1", {{"REGUA", "X9"}, {"NUMERO", "1"}});
+    Simbolo("Pin-Borne", "1001\f1", {{"REGUA", "X9"}, {"NUMERO", "2"}});
     ASSERT_EQ(Executa(), zvsdk::CommandResult::Succeeded) << Saida().toStdString();
     const auto todas = Salvo();
     const auto blocos = PorSimbolo(todas);
@@ -453,6 +456,38 @@ TEST_F(DiagramaTopograficoTest, ARectangleSmallerThanEveryBlockGivesEachItsRowAn
     EXPECT_EQ(blocos.at(H(k1_)).y, 1.0 - 40.0);
 }
 
+// ---- a contactor's view that shows the key its item is drawn for and its place as read
+
+class VistaComChave : public DiagramaTopograficoTest {
+protected:
+    static void SetUpTestSuite() {
+        DiagramaTopograficoTest::SetUpTestSuite();
+        Vista("TOPO_CT09_10_24DC", 20, 40,
+              {{"RELACAO", "?"}, {"HANDLE", ""}, {"ZV_TOPO_SEQUENCIA", ""}});
+        Vista("TOPO_BA11", 10, 40, {{"HANDLE", ""}});  // 2101, with each contactor
+    }
+};
+
+TEST_F(VistaComChave, AViewThatAsksForTheKeyOrThePlaceAsReadGetsThem) {
+    ASSERT_EQ(Executa(), zvsdk::CommandResult::Succeeded) << Saida().toStdString();
+    const auto blocos = PorSimbolo(Salvo());
+    const QString k1 = H(k1_), k2 = H(k2_);
+    EXPECT_EQ(blocos.at(k1).atributos["HANDLE"].toString(), k1);
+    EXPECT_EQ(blocos.at(k2).atributos["HANDLE"].toString(), k2);
+    // An accessory's item is its candidate's: its place and its symbol.
+    QStringList acessorios;
+    for (const Insercao& i : Salvo())
+        if (i.ace.size() == 4) acessorios << i.atributos["HANDLE"].toString();
+    acessorios.sort();
+    EXPECT_EQ(acessorios, QStringList({"*0_" + k1, "*0_" + k2}));
+    // The contactors are read in their keys' order, each followed by its accessory.
+    bool ok1 = false, ok2 = false;
+    const int lugar1 = blocos.at(k1).atributos["ZV_TOPO_SEQUENCIA"].toString().toInt(&ok1);
+    const int lugar2 = blocos.at(k2).atributos["ZV_TOPO_SEQUENCIA"].toString().toInt(&ok2);
+    ASSERT_TRUE(ok1 && ok2);
+    EXPECT_EQ(lugar2, lugar1 + 2);
+}
+
 // ---- accessories: the catalogue's (2101 goes with 2001) and those a symbol adds
 
 class AcessoriosTopograficos : public DiagramaTopograficoTest {
@@ -549,6 +584,9 @@ TEST_F(AcessoriosTopograficos, EachAccessoryBlockAndItsSymbolNameEachOther) {
     // Its attributes: the accessory's own key under its symbol's tag.
     EXPECT_EQ(auxiliar.atributos["RELACAO"].toString(), "-K1");
     EXPECT_EQ(auxiliar.atributos["ZV_KEY"].toString(), "2101");
+    // The same key on another symbol: its own symbol's tag, the key's own fields alike.
+    EXPECT_EQ(acessorios.at("*0_" + k2).atributos["RELACAO"].toString(), "-K2");
+    EXPECT_EQ(acessorios.at("*0_" + k2).atributos["ZV_KEY"].toString(), "2101");
     EXPECT_EQ(acessorios.at("#0_" + k1).atributos["ZV_KEY"].toString(), "3006");
     // The symbol: its own block in its chain, its accessories' blocks in the other.
     EXPECT_EQ(esq_[k1], QStringList({"1", blocos.at(k1).handle}));
@@ -629,6 +667,41 @@ TEST_F(AcessoriosTopograficos, ChainsThatNameAnotherRepresentationsBlocksKeepThe
                                         acessorios.at("*0_" + k1).handle}));
     EXPECT_EQ(esq_[k2], QStringList({"1", blocos.at(k2).handle}));
     EXPECT_EQ(aceEsq_[k2], QStringList({"1", acessorios.at("*0_" + k2).handle}));
+}
+
+TEST_F(AcessoriosTopograficos, ChainsGrowOverBothPassesInTheOrderTheirBlocksWentIn) {
+    // -K1 adds a terminal too, drawn in the terminals' pass after its other accessories; the
+    // terminal -X1:1 adds a side contact, drawn with the ordinary blocks before the terminal.
+    k1_->setXData("ZV_VINC_ADITIVO",
+                  XDataItems().text("1").text("3006").text("1").text("1001").tags());
+    x11_->setXData("ZV_VINC_ADITIVO", XDataItems().text("1").text("3006").tags());
+    ASSERT_EQ(Executa(), zvsdk::CommandResult::Succeeded) << Saida().toStdString();
+    const auto todas = Salvo();
+    const auto blocos = PorSimbolo(todas);
+    const auto acessorios = PorAcessorio(todas);
+    const QString k1 = H(k1_), x11 = H(x11_);
+    ASSERT_EQ(acessorios.count("#1_" + k1), 1u);
+    ASSERT_EQ(acessorios.count("#0_" + x11), 1u);
+    EXPECT_EQ(acessorios.at("#1_" + k1).nome, "TOPO_BX2_5_GY_1");
+    // The terminal's pass adds to the chain the ordinary pass made.
+    EXPECT_EQ(aceEsq_[k1], QStringList({"1", acessorios.at("#0_" + k1).handle, "1",
+                                        acessorios.at("*0_" + k1).handle, "1",
+                                        acessorios.at("#1_" + k1).handle}));
+    EXPECT_EQ(esq_[k1], QStringList({"1", blocos.at(k1).handle}));
+    EXPECT_EQ(aceEsq_[x11], QStringList({"1", acessorios.at("#0_" + x11).handle}));
+    EXPECT_EQ(esq_[x11], QStringList({"1", blocos.at(x11).handle}));
+    // A symbol's chains follow its other data in the order they were first linked.
+    const auto ordem = [](const zvdb::DbObject* simbolo) {
+        QStringList nomes;
+        for (const std::string_view nome : simbolo->xdataApplications())
+            if (nome.starts_with("KVR_ZV_REPRESENTACAO"))
+                nomes << QString::fromUtf8(nome.data(), int(nome.size()));
+        return nomes;
+    };
+    EXPECT_EQ(ordem(k1_),
+              QStringList({"KVR_ZV_REPRESENTACAO_ESQ", "KVR_ZV_REPRESENTACAO_ACE_ESQ"}));
+    EXPECT_EQ(ordem(x11_),
+              QStringList({"KVR_ZV_REPRESENTACAO_ACE_ESQ", "KVR_ZV_REPRESENTACAO_ESQ"}));
 }
 
 TEST_F(AcessoriosTopograficos, AnAccessoryWhoseSymbolIsNotListedIsLeftOutWithIt) {

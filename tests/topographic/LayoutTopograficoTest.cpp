@@ -38,6 +38,39 @@ D::Retangulo Retangulo(double esquerda, double base, double largura, double altu
 
 }  // namespace
 
+TEST(ChavesTopograficas, KeysSortAsTheirTextsWhateverTheirLengthsAndCharacters) {
+    QString comNulo("1A");
+    comNulo.append(QChar(0)).append("2");
+    // Handles and accessories' keys, texts that share their first eight characters or are
+    // shorter than eight, and texts with characters past ASCII or a null among them.
+    const QStringList textos = {"",
+                                "1",
+                                "1A",
+                                "1A2",
+                                "1A2B3C4",
+                                "1A2B3C4D",
+                                "1A2B3C4D5",
+                                "1A2B3C4D6",
+                                "1A2B3C4E",
+                                "*0_1A2B",
+                                "*0_1A2B3C4D",
+                                "*1_1A2B",
+                                "#10_1A2B",
+                                "#1_1A2B",
+                                "a",
+                                "A",
+                                "\x7f",
+                                QString::fromUtf8("1A2B\u00e9"),
+                                QString::fromUtf8("1A2B\u00e93C4D"),
+                                QString::fromUtf8("\u0100"),
+                                comNulo,
+                                "1A"};
+    for (const QString& a : textos)
+        for (const QString& b : textos)
+            EXPECT_EQ(D::ChaveDeOrdem(a) < D::ChaveDeOrdem(b), a < b)
+                << a.toStdString() << " / " << b.toStdString();
+}
+
 TEST(CantosTopograficos, TwoOrThreeNumbersAreAPointAnythingElseIsNot) {
     CEPonto p;
     ASSERT_TRUE(D::LeCanto("20,30", p));
