@@ -4,11 +4,13 @@
 #include "CCCaboDataReader.h"
 #include "CCFioDataReader.h"
 #include "CEAtributo.h"
+#include "Descarte.h"
 #include "catalogue/CEConexaoCatalogo.h"
 #include "export/CEExportacao.h"
 #include "lists/CETemplate.h"
 #include "module/CIProgress.h"
 
+#include <algorithm>
 #include <array>
 #include <cmath>
 #include <memory>
@@ -209,32 +211,43 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
     // Accessories are read with their owner and follow it.
     simbolos_.vinculos = lerAcessorios_ ? 2 : 0;
     CIProgress progresso;
+    ReservaVistos(database);
+    bornesLidos_.clear();
+    ladosVistos_ = false;
     ladosAdiados_ = true;
     LeBlocos(database, std::nullopt, modelo, progresso);
     LeVirtuais(database, modelo);
     LePinos(database, modelo);
     LiberaReferencias();
     ladosAdiados_ = false;
+    // The handles seen were for this walk only: a node each, freed on the freeing thread.
+    Descarte::Largar(vistos_);
     std::vector<CEItemLista*> bornes;
     static const QString kBorne = QStringLiteral("BORNE"), kComp = QStringLiteral("COMP");
     const std::uint32_t tipoCampo = NumeroCampo<"ZV_LISTA_TIPO">();
     const std::uint32_t handleCampo = NumeroCampo<"HANDLE">();
     std::array<NomeCampo, 3>& relacoes = Nomes(QString()).relacoes;
-    for (CEItemLista* item : resultado_) {
+    std::size_t proximoBorne = 0;
+    // At most a relation per item: the table is not made again as it grows.
+    relacoesComponentes_.reserve(relacoesComponentes_.size() + resultado_.size());
+    for (std::size_t lugar = 0; lugar < resultado_.size(); ++lugar) {
+        CEItemLista* item = resultado_[lugar];
         if (!item) continue;
         const QString* tipo = item->campos.procura(tipoCampo);
         if (!tipo || tipo->isEmpty()) {
-            const bool borne = !item->ids.empty() && EhBorne(item->ids.front());
-            // An array made to measure when its item was kept grows by exactly the kind, its
-            // fields moved once, not to twice its size and back; a terminal's grows with its
-            // sides below.
-            if (!tipo) item->campos.reservar(size_t(item->campos.size()) + 1);
-            item->definirCampo(tipoCampo, borne ? kBorne : kComp);
-            // A component is complete with its kind: the room the kind's field grew goes.
-            if (borne)
+            // A terminal takes its kind with its sides below, where its array grows once
+            // for both.
+            if (BorneLido(lugar, *item, proximoBorne)) {
                 bornes.push_back(item);
-            else
-                PartilhaNomes(*item);
+                itens.push_back(item);
+                continue;
+            }
+            // An array made to measure when its item was kept grows by exactly the kind, its
+            // fields moved once, not to twice its size and back.
+            if (!tipo) item->campos.reservar(size_t(item->campos.size()) + 1);
+            item->definirCampo(tipoCampo, kComp);
+            // A component is complete with its kind: the room the kind's field grew goes.
+            PartilhaNomes(*item);
             tipo = item->campos.procura(tipoCampo);
         }
         if (*tipo == kComp) {
@@ -249,17 +262,30 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
         itens.push_back(item);
     }
     resultado_.clear();
+    std::vector<TerminalLido>().swap(bornesLidos_);
     // Terminals read alike hold about as many fields once their sides are read: room for as
     // many as the terminal before held moves a terminal's fields once, not at each doubling.
     size_t medida = 0;
     for (CEItemLista* borne : bornes) {
-        if (size_t(borne->campos.size()) < medida) borne->campos.reservar(medida);
-        AoLigarInicio(*borne, borne->ids.front(), &modelo);
-        AoLigarFim(*borne, borne->ids.front(), &modelo);
+        borne->campos.reservar(std::max(medida, size_t(borne->campos.size()) + 1));
+        borne->definirCampo(tipoCampo, kBorne);
+        AoLigar(*borne, borne->ids.front(), &modelo, true, true);
+        AoLigar(*borne, borne->ids.front(), &modelo, false, true);
         medida = size_t(borne->campos.size());
         // The sides were the terminal's last fields: the room their growth left goes.
         PartilhaNomes(*borne);
     }
+}
+
+void CCExportDataReader::ReservaVistos(zvdb::Database* database) {
+    // Room for every symbol the walk may list, so that the set of handles seen grows
+    // without rehashing its nodes: the references of the blocks it looks at.
+    std::size_t referencias = 0;
+    const auto& porBloco = ReferenciasPorBloco(database);
+    for (auto it = porBloco.constBegin(); it != porBloco.constEnd(); ++it)
+        if (!it.key().startsWith('*') && !it.key().startsWith(QLatin1String("PIN-")))
+            referencias += it.value().size();
+    vistos_.reserve(referencias);
 }
 
 void CCExportDataReader::LeFiosExportacao(const std::optional<QStringList>& paginas,
@@ -281,7 +307,27 @@ void CCExportDataReader::LeFiosExportacao(const std::optional<QStringList>& pagi
 
 void CCExportDataReader::LerLadoIni(CEItemLista& item, const OdDbObjectId& entidade,
                                     CETemplate& modelo) {
-    if (!ladosAdiados_) AoLigarInicio(item, entidade, &modelo);
+    if (!ladosAdiados_) return AoLigarInicio(item, entidade, &modelo);
+    // The reference was just read: its block name is at hand now, not when the kinds are
+    // told after the walk.
+    ladosVistos_ = true;
+    if (!entidade.isNull() && EhBorne(entidade))
+        bornesLidos_.push_back({resultado_.size(), &item, entidade});
+}
+
+bool CCExportDataReader::BorneLido(std::size_t lugar, const CEItemLista& item,
+                                   std::size_t& proximo) const {
+    if (item.ids.empty()) return false;
+    // A reader whose hooks told nothing asks the block name.
+    if (!ladosVistos_) return EhBorne(item.ids.front());
+    // Only a block reference read by the walk can be a terminal, and the walk kept its items
+    // in the order it read them. The records before this place are of items that went; one
+    // at this place may be too, even at the same address, but then of another entity.
+    while (proximo < bornesLidos_.size() && bornesLidos_[proximo].lugar < lugar)
+        ++proximo;
+    for (std::size_t k = proximo; k < bornesLidos_.size() && bornesLidos_[k].lugar == lugar; ++k)
+        if (bornesLidos_[k].item == &item && bornesLidos_[k].id == item.ids.front()) return true;
+    return false;
 }
 
 void CCExportDataReader::LerLadoFim(CEItemLista& item, const OdDbObjectId& entidade,
@@ -319,11 +365,11 @@ QString CCExportDataReader::VizinhoPorLigacao(const QString& fio, const QString&
 // element wired there under the first suffix, the wire at the terminal's other point under
 // the second, and the relation of the end composed.
 void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade,
-                                 CETemplate* modelo, bool inicio) {
+                                 CETemplate* modelo, bool inicio, bool borne) {
     // What the first side of a terminal left for its second side counts for the very next
     // call only.
     const PrimeiroLado primeiro = std::exchange(primeiroLado_, PrimeiroLado{});
-    if (entidade.isNull() || !EhBorne(entidade)) return;
+    if (entidade.isNull() || !(borne || EhBorne(entidade))) return;
     // An inverted wire keeps its ends; any other wire has them the other way round.
     const QString* marca = item.campos.procura(NumeroCampo<"INVERTIDO">());
     const bool invertido = marca && marca->toUpper() == QLatin1String("S");

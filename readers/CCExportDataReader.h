@@ -6,7 +6,9 @@
 #include "CCMaterialDataReader.h"
 #include "TabelaChaves.h"
 
+#include <cstddef>
 #include <optional>
+#include <vector>
 
 class CEExportacao;
 
@@ -45,6 +47,8 @@ protected:
     void LeBornes(zvdb::Database* database, CETemplate& modelo, VetorItens& itens);
     // Components, terminals and accessories as the material reader finds them.
     void LeComponentes(zvdb::Database* database, CETemplate& modelo, VetorItens& itens);
+    // Room in the set of handles seen for every reference the components' walk looks at.
+    void ReservaVistos(zvdb::Database* database);
     // The wire stretches with both ends told by the hooks.
     void LeFiosExportacao(const std::optional<QStringList>& paginas, CETemplate* modelo,
                           VetorItens& itens);
@@ -61,7 +65,9 @@ private:
     static NomesRelacao& Nomes(const QString& sufixo);
     void CompoeRelacao(NomesRelacao& nomes, CEItemLista& item, CETemplate* modelo,
                        const QString& ligacao, const QString& handle);
-    void AoLigar(CEItemLista& item, const OdDbObjectId& entidade, CETemplate* modelo, bool inicio);
+    // `borne`: the entity is known to be a terminal.
+    void AoLigar(CEItemLista& item, const OdDbObjectId& entidade, CETemplate* modelo, bool inicio,
+                 bool borne = false);
     // The element next to an equipment's own entry of the connection (its handle and
     // connection name) in the wire's full connection list; empty when there is none.
     QString VizinhoPorLigacao(const QString& fio, const QString& proprio, const QString& ligacao,
@@ -69,6 +75,19 @@ private:
     // While components are read the sides wait: a contact names its component only once
     // every component is known.
     bool ladosAdiados_ = false;
+    // The terminals the walk read, told by the first hook while the reference is at hand:
+    // the place the item takes in the result if kept, the item and its entity.
+    struct TerminalLido {
+        std::size_t lugar;
+        const CEItemLista* item;
+        OdDbObjectId id;
+    };
+    std::vector<TerminalLido> bornesLidos_;
+    // Whether the walk's hooks ran at all (a reader may have hooks of its own).
+    bool ladosVistos_ = false;
+    // Whether the item at that place of the result is a terminal; `proximo` walks the
+    // records along with the places.
+    bool BorneLido(std::size_t lugar, const CEItemLista& item, std::size_t& proximo) const;
     // What the first side of a terminal found for its second side: its points, whether it
     // is an equipment, and whether it read the wires of both points.
     struct PrimeiroLado {

@@ -113,6 +113,49 @@ TEST_F(ExportReaderTest, ComponentsTellTerminalsFromOtherSymbols) {
         }
 }
 
+// Kinds by handle, as "handle=kind", sorted.
+QStringList TiposPorHandle(const VetorItens& itens) {
+    QStringList texto;
+    for (const CEItemLista* item : itens)
+        texto << item->valorCampo("HANDLE") + "=" + item->valorCampo("ZV_LISTA_TIPO");
+    texto.sort();
+    return texto;
+}
+
+// The walk tells each terminal as it reads it; the symbols it drops on the way (a terminal
+// that is not listed, read right before a component that takes its place) tell nothing of
+// those kept after them. A reader with hooks of its own is told by the block names.
+TEST_F(ExportReaderTest, TerminalsAreToldAmongSymbolsTheWalkDrops) {
+    projeto();
+    zvdb::BlockReference* fora = borne("X9", "1", {100, 200, 0});
+    fora->setXData("KVR_ZV", zvsample::XDataItems().text("1106\f1").tags());
+    // A block of its own, made after the terminals' and named after it.
+    zvdb::BlockReference* k2 = componente("-K2", {{"A1", {140, 100, 0}}}, "RELE");
+    le(3);
+    const QStringList esperado = QStringList({handle(x1_) + "=BORNE", handle(x2_) + "=BORNE",
+                                              handle(k1_) + "=COMP", handle(k2) + "=COMP"});
+    QStringList ordenado = esperado;
+    ordenado.sort();
+    EXPECT_EQ(TiposPorHandle(lidos_), ordenado);
+    // Both terminals read their sides.
+    for (const CEItemLista* item : lidos_)
+        if (item->valorCampo("ZV_LISTA_TIPO") == "BORNE")
+            EXPECT_FALSE(item->valorCampo("FIO_SEGINI").isEmpty())
+                << item->valorCampo("NUMERO").toStdString();
+    lidos_.destruirItens();
+
+    struct ComLados : CCExportDataReader {
+        int lados = 0;
+        void LerLadoIni(CEItemLista&, const OdDbObjectId&, CETemplate&) override { ++lados; }
+    };
+    ComLados proprio;
+    std::unique_ptr<VetorItens> itens(proprio.Le(&db(), nullptr, true, std::nullopt));
+    ASSERT_TRUE(itens);
+    EXPECT_GT(proprio.lados, 0);
+    EXPECT_EQ(TiposPorHandle(*itens), ordenado);
+    itens->destruirItens();
+}
+
 TEST_F(ExportReaderTest, WiresAloneForTwoAndWiresWithComponentsWhenUnset) {
     projeto();
     le(2);
