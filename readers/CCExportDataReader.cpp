@@ -212,7 +212,7 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
     simbolos_.vinculos = lerAcessorios_ ? 2 : 0;
     CIProgress progresso;
     ReservaVistos(database);
-    bornesLidos_.clear();
+    bornesLidos_.Limpa();
     ladosVistos_ = false;
     ladosAdiados_ = true;
     LeBlocos(database, std::nullopt, modelo, progresso);
@@ -227,7 +227,6 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
     const std::uint32_t tipoCampo = NumeroCampo<"ZV_LISTA_TIPO">();
     const std::uint32_t handleCampo = NumeroCampo<"HANDLE">();
     std::array<NomeCampo, 3>& relacoes = Nomes(QString()).relacoes;
-    std::size_t proximoBorne = 0;
     // At most a relation per item: the table is not made again as it grows.
     relacoesComponentes_.reserve(relacoesComponentes_.size() + resultado_.size());
     for (std::size_t lugar = 0; lugar < resultado_.size(); ++lugar) {
@@ -237,7 +236,7 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
         if (!tipo || tipo->isEmpty()) {
             // A terminal takes its kind with its sides below, where its array grows once
             // for both.
-            if (BorneLido(lugar, *item, proximoBorne)) {
+            if (BorneLido(lugar, *item)) {
                 bornes.push_back(item);
                 itens.push_back(item);
                 continue;
@@ -262,7 +261,7 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
         itens.push_back(item);
     }
     resultado_.clear();
-    std::vector<TerminalLido>().swap(bornesLidos_);
+    bornesLidos_.Libera();
     // Terminals read alike hold about as many fields once their sides are read: room for as
     // many as the terminal before held moves a terminal's fields once, not at each doubling.
     size_t medida = 0;
@@ -312,22 +311,14 @@ void CCExportDataReader::LerLadoIni(CEItemLista& item, const OdDbObjectId& entid
     // told after the walk.
     ladosVistos_ = true;
     if (!entidade.isNull() && EhBorne(entidade))
-        bornesLidos_.push_back({resultado_.size(), &item, entidade});
+        bornesLidos_.Anota(resultado_.size(), item, entidade);
 }
 
-bool CCExportDataReader::BorneLido(std::size_t lugar, const CEItemLista& item,
-                                   std::size_t& proximo) const {
+bool CCExportDataReader::BorneLido(std::size_t lugar, const CEItemLista& item) {
     if (item.ids.empty()) return false;
-    // A reader whose hooks told nothing asks the block name.
-    if (!ladosVistos_) return EhBorne(item.ids.front());
-    // Only a block reference read by the walk can be a terminal, and the walk kept its items
-    // in the order it read them. The records before this place are of items that went; one
-    // at this place may be too, even at the same address, but then of another entity.
-    while (proximo < bornesLidos_.size() && bornesLidos_[proximo].lugar < lugar)
-        ++proximo;
-    for (std::size_t k = proximo; k < bornesLidos_.size() && bornesLidos_[k].lugar == lugar; ++k)
-        if (bornesLidos_[k].item == &item && bornesLidos_[k].id == item.ids.front()) return true;
-    return false;
+    // A reader whose hooks told nothing asks the block name. Else only a block reference
+    // the walk read can be a terminal.
+    return ladosVistos_ ? bornesLidos_.Eh(lugar, item) : EhBorne(item.ids.front());
 }
 
 void CCExportDataReader::LerLadoFim(CEItemLista& item, const OdDbObjectId& entidade,

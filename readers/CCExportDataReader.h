@@ -2,13 +2,13 @@
 // The reader of the exports: in one pass every kind of item the export asked for
 // (terminals, components, accessories, wires, ferrules, cables), each marked with its kind
 // in ZV_LISTA_TIPO; a wire's item also learns what stands at its two ends.
+#include "BornesLidos.h"
 #include "CCBorneDataReader.h"
 #include "CCMaterialDataReader.h"
 #include "TabelaChaves.h"
 
 #include <cstddef>
 #include <optional>
-#include <vector>
 
 class CEExportacao;
 
@@ -75,19 +75,12 @@ private:
     // While components are read the sides wait: a contact names its component only once
     // every component is known.
     bool ladosAdiados_ = false;
-    // The terminals the walk read, told by the first hook while the reference is at hand:
-    // the place the item takes in the result if kept, the item and its entity.
-    struct TerminalLido {
-        std::size_t lugar;
-        const CEItemLista* item;
-        OdDbObjectId id;
-    };
-    std::vector<TerminalLido> bornesLidos_;
+    // The terminals the walk read, told by the first hook while the reference is at hand.
+    BornesLidos bornesLidos_;
     // Whether the walk's hooks ran at all (a reader may have hooks of its own).
     bool ladosVistos_ = false;
-    // Whether the item at that place of the result is a terminal; `proximo` walks the
-    // records along with the places.
-    bool BorneLido(std::size_t lugar, const CEItemLista& item, std::size_t& proximo) const;
+    // Whether the item at that place of the result is a terminal; asked in ascending places.
+    bool BorneLido(std::size_t lugar, const CEItemLista& item);
     // What the first side of a terminal found for its second side: its points, whether it
     // is an equipment, and whether it read the wires of both points.
     struct PrimeiroLado {

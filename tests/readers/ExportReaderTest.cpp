@@ -1,5 +1,6 @@
 // The export reader on small schematics: the kinds it reads for each EXPORTA value, each
 // marked in ZV_LISTA_TIPO, and what a wire's item learns about a terminal at its ends.
+#include "readers/BornesLidos.h"
 #include "readers/CCBorneDataReader.h"
 #include "readers/CCExportDataReader.h"
 #include "readers/FioFixture.h"
@@ -113,11 +114,12 @@ TEST_F(ExportReaderTest, ComponentsTellTerminalsFromOtherSymbols) {
         }
 }
 
-// Kinds by handle, as "handle=kind", sorted.
+// The symbols' kinds by handle, as "handle=kind", sorted; accessories are left out.
 QStringList TiposPorHandle(const VetorItens& itens) {
     QStringList texto;
     for (const CEItemLista* item : itens)
-        texto << item->valorCampo("HANDLE") + "=" + item->valorCampo("ZV_LISTA_TIPO");
+        if (item->valorCampo("ZV_LISTA_TIPO") != "ACE")
+            texto << item->valorCampo("HANDLE") + "=" + item->valorCampo("ZV_LISTA_TIPO");
     texto.sort();
     return texto;
 }
@@ -154,6 +156,35 @@ TEST_F(ExportReaderTest, TerminalsAreToldAmongSymbolsTheWalkDrops) {
     EXPECT_GT(proprio.lados, 0);
     EXPECT_EQ(TiposPorHandle(*itens), ordenado);
     itens->destruirItens();
+}
+
+// The records of a walk: items kept in the order read; the dropped leave records behind,
+// at the place the next kept item takes, maybe at the very address it gets.
+TEST(BornesLidosTest, OnlyTheKeptTerminalsAnswerAtTheirPlaces) {
+    const auto id = [](std::uint64_t handle) { return OdDbObjectId(nullptr, handle); };
+    CEItemLista a, b, c, d;
+    a.ids = {id(0xA)};
+    b.ids = {id(0xB)};
+    c.ids = {id(0xC)};
+    d.ids = {id(0xD)};
+    BornesLidos lidos;
+    lidos.Anota(0, a, id(0xA));
+    // A terminal dropped at place 1, then one kept there; a dropped one at place 2 whose
+    // item's address the component kept there got.
+    lidos.Anota(1, d, id(0x1D));
+    lidos.Anota(1, b, id(0xB));
+    lidos.Anota(2, c, id(0x2C));
+    lidos.Anota(4, d, id(0xD));
+    EXPECT_TRUE(lidos.Eh(0, a));
+    EXPECT_TRUE(lidos.Eh(1, b));
+    EXPECT_FALSE(lidos.Eh(2, c));
+    // A place without records, and an item of no entity.
+    EXPECT_FALSE(lidos.Eh(3, a));
+    CEItemLista vazio;
+    EXPECT_FALSE(lidos.Eh(4, vazio));
+    EXPECT_TRUE(lidos.Eh(4, d));
+    lidos.Limpa();
+    EXPECT_FALSE(lidos.Eh(0, a));
 }
 
 TEST_F(ExportReaderTest, WiresAloneForTwoAndWiresWithComponentsWhenUnset) {
