@@ -113,6 +113,7 @@ CCBorneDataReader::LadoBorne CCBorneDataReader::AchaLado(CCDataReader& leitor,
     if (oposto) {
         lado.ponto = oposto->outro;
         lado.outro = oposto->ponto;
+        lado.layer = oposto->layer;
     } else {
         const CEPonto p = CICad::GetPosicao(borne);
         const CEPonto q = leitor.PontoDeCorte(borne);
@@ -121,7 +122,8 @@ CCBorneDataReader::LadoBorne CCBorneDataReader::AchaLado(CCDataReader& leitor,
     }
     // The wire at the point and its entries are found once for both directions, the
     // element's handle and its point.
-    const OdDbObjectId fio = leitor.FioNoPonto(leitor.LayerDe(borne), lado.ponto);
+    if (lado.layer.isNull()) lado.layer = leitor.LayerDe(borne);
+    const OdDbObjectId fio = leitor.FioNoPonto(lado.layer, lado.ponto);
     const auto entradas = leitor.EntradasDoFio(fio);
     if (!entradas) return lado;
     const TabelaConexoes::Textos& elementos = entradas->elementos;
@@ -165,7 +167,8 @@ void CCBorneDataReader::LeFiosLado(CCDataReader& leitor, CEItemLista& item,
     if (!leitor.EhFioNumerado(lado.fio)) return;
     // AchaLado found the wire at the side's point already.
     const OdDbObjectId& fioAqui = lado.fio;
-    const OdDbObjectId fioOutro = leitor.FioNoPonto(leitor.LayerDe(borne), lado.outro);
+    const OdDbObjectId fioOutro =
+        leitor.FioNoPonto(lado.layer.isNull() ? leitor.LayerDe(borne) : lado.layer, lado.outro);
     // The cut point's wire is read first on the insertion side, last on the cut side.
     const OdDbObjectId& fioP = insercao ? fioAqui : fioOutro;
     const OdDbObjectId& fioQ = insercao ? fioOutro : fioAqui;

@@ -222,7 +222,8 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
     ladosAdiados_ = false;
     // The handles seen were for this walk only: a node each, freed on the freeing thread.
     Descarte::Largar(vistos_);
-    std::vector<CEItemLista*> bornes;
+    // The terminals, each with what the walk read of its reference.
+    std::vector<std::pair<CEItemLista*, const BornesLidos::Referencia*>> bornes;
     static const QString kBorne = QStringLiteral("BORNE"), kComp = QStringLiteral("COMP");
     const std::uint32_t tipoCampo = NumeroCampo<"ZV_LISTA_TIPO">();
     const std::uint32_t handleCampo = NumeroCampo<"HANDLE">();
@@ -236,8 +237,9 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
         if (!tipo || tipo->isEmpty()) {
             // A terminal takes its kind with its sides below, where its array grows once
             // for both.
-            if (BorneLido(lugar, *item)) {
-                bornes.push_back(item);
+            if (const BornesLidos::Referencia* referencia = nullptr;
+                BorneLido(lugar, *item, referencia)) {
+                bornes.emplace_back(item, referencia);
                 itens.push_back(item);
                 continue;
             }
@@ -261,19 +263,19 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
         itens.push_back(item);
     }
     resultado_.clear();
-    bornesLidos_.Libera();
     // Terminals read alike hold about as many fields once their sides are read: room for as
     // many as the terminal before held moves a terminal's fields once, not at each doubling.
     size_t medida = 0;
-    for (CEItemLista* borne : bornes) {
+    for (const auto& [borne, referencia] : bornes) {
         borne->campos.reservar(std::max(medida, size_t(borne->campos.size()) + 1));
         borne->definirCampo(tipoCampo, kBorne);
-        AoLigar(*borne, borne->ids.front(), &modelo, true, true);
-        AoLigar(*borne, borne->ids.front(), &modelo, false, true);
+        AoLigar(*borne, borne->ids.front(), &modelo, true, true, referencia);
+        AoLigar(*borne, borne->ids.front(), &modelo, false, true, referencia);
         medida = size_t(borne->campos.size());
         // The sides were the terminal's last fields: the room their growth left goes.
         PartilhaNomes(*borne);
     }
+    bornesLidos_.Libera();
 }
 
 void CCExportDataReader::ReservaVistos(zvdb::Database* database) {
@@ -307,18 +309,27 @@ void CCExportDataReader::LeFiosExportacao(const std::optional<QStringList>& pagi
 void CCExportDataReader::LerLadoIni(CEItemLista& item, const OdDbObjectId& entidade,
                                     CETemplate& modelo) {
     if (!ladosAdiados_) return AoLigarInicio(item, entidade, &modelo);
-    // The reference was just read: its block name is at hand now, not when the kinds are
-    // told after the walk.
+    // The reference was just read: its block name, and what its sides ask of it, are at
+    // hand now, not when the sides are read after the walk.
     ladosVistos_ = true;
-    if (!entidade.isNull() && EhBorne(entidade))
-        bornesLidos_.Anota(resultado_.size(), item, entidade);
+    if (entidade.isNull() || !EhBorne(entidade)) return;
+    BornesLidos::Referencia referencia;
+    referencia.insercao = CICad::GetPosicao(entidade);
+    referencia.corte = PontoDeCorte(entidade);
+    referencia.layer = LayerDe(entidade);
+    referencia.equipamento = CICad::TemXData(entidade, "KVR_ZV_EQUIPO");
+    bornesLidos_.Anota(resultado_.size(), item, entidade, std::move(referencia));
 }
 
-bool CCExportDataReader::BorneLido(std::size_t lugar, const CEItemLista& item) {
+bool CCExportDataReader::BorneLido(std::size_t lugar, const CEItemLista& item,
+                                   const BornesLidos::Referencia*& referencia) {
+    referencia = nullptr;
     if (item.ids.empty()) return false;
     // A reader whose hooks told nothing asks the block name. Else only a block reference
     // the walk read can be a terminal.
-    return ladosVistos_ ? bornesLidos_.Eh(lugar, item) : EhBorne(item.ids.front());
+    if (!ladosVistos_) return EhBorne(item.ids.front());
+    referencia = bornesLidos_.Eh(lugar, item);
+    return referencia != nullptr;
 }
 
 void CCExportDataReader::LerLadoFim(CEItemLista& item, const OdDbObjectId& entidade,
@@ -356,7 +367,8 @@ QString CCExportDataReader::VizinhoPorLigacao(const QString& fio, const QString&
 // element wired there under the first suffix, the wire at the terminal's other point under
 // the second, and the relation of the end composed.
 void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade,
-                                 CETemplate* modelo, bool inicio, bool borne) {
+                                 CETemplate* modelo, bool inicio, bool borne,
+                                 const BornesLidos::Referencia* referencia) {
     // What the first side of a terminal left for its second side counts for the very next
     // call only.
     const PrimeiroLado primeiro = std::exchange(primeiroLado_, PrimeiroLado{});
@@ -386,9 +398,22 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
     if (doBorne) {
         // The terminal's own side: the insertion point for the first hook, the cut point
         // for the second, looked at as the terminal list does.
+        // The first side takes the points and layer the walk read, as the second side
+        // takes them from the first.
+        std::optional<CCBorneDataReader::LadoBorne> lido;
+        if (!segundoLado && referencia) {
+            lido.emplace();
+            lido->ponto = inicio ? referencia->corte : referencia->insercao;
+            lido->outro = inicio ? referencia->insercao : referencia->corte;
+            lido->layer = referencia->layer;
+        }
         lado = CCBorneDataReader::AchaLado(*this, entidade, inicio,
-                                           segundoLado ? &*primeiro.lado : nullptr);
-        equipamento = segundoLado ? primeiro.equipamento : CICad::TemXData(entidade, kEquipo);
+                                           segundoLado ? &*primeiro.lado
+                                           : lido      ? &*lido
+                                                       : nullptr);
+        equipamento = segundoLado  ? primeiro.equipamento
+                      : referencia ? referencia->equipamento
+                                   : CICad::TemXData(entidade, kEquipo);
         if (inicio) primeiroLado_ = PrimeiroLado{&item, entidade, lado, equipamento, false};
         if (lado->vizinho.isEmpty()) return;
         ponto = lado->ponto;

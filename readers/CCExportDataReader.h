@@ -65,9 +65,10 @@ private:
     static NomesRelacao& Nomes(const QString& sufixo);
     void CompoeRelacao(NomesRelacao& nomes, CEItemLista& item, CETemplate* modelo,
                        const QString& ligacao, const QString& handle);
-    // `borne`: the entity is known to be a terminal.
+    // `borne`: the entity is known to be a terminal; `referencia`, what the walk read of it
+    // then, when it did.
     void AoLigar(CEItemLista& item, const OdDbObjectId& entidade, CETemplate* modelo, bool inicio,
-                 bool borne = false);
+                 bool borne = false, const BornesLidos::Referencia* referencia = nullptr);
     // The element next to an equipment's own entry of the connection (its handle and
     // connection name) in the wire's full connection list; empty when there is none.
     QString VizinhoPorLigacao(const QString& fio, const QString& proprio, const QString& ligacao,
@@ -79,8 +80,10 @@ private:
     BornesLidos bornesLidos_;
     // Whether the walk's hooks ran at all (a reader may have hooks of its own).
     bool ladosVistos_ = false;
-    // Whether the item at that place of the result is a terminal; asked in ascending places.
-    bool BorneLido(std::size_t lugar, const CEItemLista& item);
+    // Whether the item at that place of the result is a terminal, with what the walk read of
+    // its reference when it did; asked in ascending places.
+    bool BorneLido(std::size_t lugar, const CEItemLista& item,
+                   const BornesLidos::Referencia*& referencia);
     // What the first side of a terminal found for its second side: its points, whether it
     // is an equipment, and whether it read the wires of both points.
     struct PrimeiroLado {

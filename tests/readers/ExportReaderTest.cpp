@@ -139,11 +139,16 @@ TEST_F(ExportReaderTest, TerminalsAreToldAmongSymbolsTheWalkDrops) {
     QStringList ordenado = esperado;
     ordenado.sort();
     EXPECT_EQ(TiposPorHandle(lidos_), ordenado);
-    // Both terminals read their sides.
-    for (const CEItemLista* item : lidos_)
-        if (item->valorCampo("ZV_LISTA_TIPO") == "BORNE")
-            EXPECT_FALSE(item->valorCampo("FIO_SEGINI").isEmpty())
-                << item->valorCampo("NUMERO").toStdString();
+    // Both terminals read their sides from the points the walk read: the element and the
+    // wire at the cut point under _INI, nothing at the insertion point.
+    QStringList lados;
+    for (const CEItemLista* item : lidos_) {
+        if (item->valorCampo("ZV_LISTA_TIPO") != "BORNE") continue;
+        lados << item->valorCampo("NUMERO") + ">" + item->valorCampo("RELACAO_INI") + "/" +
+                     item->valorCampo("FIO_SEGINI") + "|" + item->valorCampo("RELACAO_FIM");
+    }
+    lados.sort();
+    EXPECT_EQ(lados, QStringList({"1>-K1:A1/1|", "2>-K1:A2/2|"}));
     lidos_.destruirItens();
 
     struct ComLados : CCExportDataReader {
@@ -168,13 +173,13 @@ TEST(BornesLidosTest, OnlyTheKeptTerminalsAnswerAtTheirPlaces) {
     c.ids = {id(0xC)};
     d.ids = {id(0xD)};
     BornesLidos lidos;
-    lidos.Anota(0, a, id(0xA));
+    lidos.Anota(0, a, id(0xA), {});
     // A terminal dropped at place 1, then one kept there; a dropped one at place 2 whose
     // item's address the component kept there got.
-    lidos.Anota(1, d, id(0x1D));
-    lidos.Anota(1, b, id(0xB));
-    lidos.Anota(2, c, id(0x2C));
-    lidos.Anota(4, d, id(0xD));
+    lidos.Anota(1, d, id(0x1D), {});
+    lidos.Anota(1, b, id(0xB), {});
+    lidos.Anota(2, c, id(0x2C), {});
+    lidos.Anota(4, d, id(0xD), {});
     EXPECT_TRUE(lidos.Eh(0, a));
     EXPECT_TRUE(lidos.Eh(1, b));
     EXPECT_FALSE(lidos.Eh(2, c));
