@@ -455,7 +455,7 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
         // a terminal, which has no relation, is told by its strip and number instead.
         for (NomeCampo& nome : nomes.relacoes)
             item.definirCampo(nome.ParaDefinir(), QString());
-        CopiaAtributos(sufixo, item, conectado);
+        CopiaAtributos(sufixo, item, conectado, objeto);
         // After the copy: an element it read for the first time lends its attributes to
         // the connection's question. A terminal's side found the element's point already.
         const bool mesmoVizinho = lado && TabelaConexoes::Iguais(conectado, lado->vizinho);
@@ -482,8 +482,12 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
 
 void CCExportDataReader::CopiaAtributos(const QString& sufixo, CEItemLista& item,
                                         const QString& handle) {
+    CopiaAtributos(sufixo, item, handle, CICad::IdDoHandle(handle));
+}
+
+void CCExportDataReader::CopiaAtributos(const QString& sufixo, CEItemLista& item,
+                                        const QString& handle, const OdDbObjectId& id) {
     QString alvo = handle;
-    const OdDbObjectId id = CICad::IdDoHandle(handle);
     if (id.isNull()) return;
     const std::string_view nome = CICad::NomeBlocoUtf8(id);
     // A contact or a terminal speaks for its component, when the reader listed it.

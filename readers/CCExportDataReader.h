@@ -67,6 +67,9 @@ private:
                        const QString& ligacao, const QString& handle);
     // `borne`: the entity is known to be a terminal; `referencia`, what the walk read of it
     // then, when it did.
+    // CopiaAtributos with the entity of the handle found already.
+    void CopiaAtributos(const QString& sufixo, CEItemLista& item, const QString& handle,
+                        const OdDbObjectId& id);
     void AoLigar(CEItemLista& item, const OdDbObjectId& entidade, CETemplate* modelo, bool inicio,
                  bool borne = false, const BornesLidos::Referencia* referencia = nullptr);
     // The element next to an equipment's own entry of the connection (its handle and
