@@ -407,7 +407,8 @@ uint qHash(const CCBorneDataReader::ChaveBorne& chave, uint semente) {
 
 namespace {
 
-// The first item of each strip and number, per language, for the jumper look-ups.
+// The first item of each strip and number, per language, for the jumper look-ups; and each
+// item's jumper text, read in the same pass while the item's fields are at hand.
 class IndiceBornes {
 public:
     explicit IndiceBornes(const VetorItens& itens) {
@@ -416,14 +417,21 @@ public:
             numero_[i] = CamposItem::numeroSeHouver(Nomes().numeros[i]);
             indice_[i].reserve(itens.size());
         }
+        const std::uint32_t jumper = CamposItem::numeroSeHouver(Nomes().jumper);
+        jumpers_.reserve(itens.size());
         // The first item of a key keeps it.
-        for (CEItemLista* item : itens)
+        for (CEItemLista* item : itens) {
+            jumpers_.push_back(item && jumper != CamposItem::kSemNome ? item->campos.procura(jumper)
+                                                                      : nullptr);
             for (int i = 0; item && i < 3; ++i) {
                 CEItemLista*& primeiro =
                     indice_[i][{Valor(*item, regua_[i]), Valor(*item, numero_[i])}];
                 if (!primeiro) primeiro = item;
             }
+        }
     }
+    // The jumper text of the k-th item, null when it has none; valid while its fields stay.
+    const QString* Jumper(std::size_t k) const { return jumpers_[k]; }
     CEItemLista* Busca(const CEItemLista& de, int idioma, const QString& numero) const {
         return indice_[idioma].value({Valor(de, regua_[idioma]), numero});
     }
@@ -437,6 +445,7 @@ private:
     }
     std::uint32_t regua_[3], numero_[3];
     TabelaChaves<Chave, CEItemLista*> indice_[3];
+    std::vector<const QString*> jumpers_;
 };
 
 // The terminals bridged to `inicio`, followed through their own jumper texts, depth first.
@@ -481,9 +490,10 @@ void EstendeCadeia(VetorItens& cadeia) {
 void CCBorneDataReader::LigaJumpers(VetorItens& itens) {
     const IndiceBornes indice(itens);
     std::unordered_set<CEItemLista*> visitados;
-    for (CEItemLista* item : itens) {
+    for (std::size_t k = 0; k < itens.size(); ++k) {
+        CEItemLista* item = itens[k];
         if (!item) continue;
-        const QString* jumper = item->campo(Nomes().jumper);
+        const QString* jumper = indice.Jumper(k);
         if (!jumper || jumper->trimmed().isEmpty()) continue;
         if (!visitados.insert(item).second) continue;
         VetorItens cadeia = ColetaJumper(item, indice, visitados);
