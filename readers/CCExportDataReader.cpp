@@ -397,9 +397,8 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
     bool equipamento = false;
     if (doBorne) {
         // The terminal's own side: the insertion point for the first hook, the cut point
-        // for the second, looked at as the terminal list does.
-        // The first side takes the points and layer the walk read, as the second side
-        // takes them from the first.
+        // for the second, looked at as the terminal list does. The first side takes the
+        // points and layer the walk read, as the second side takes them from the first.
         std::optional<CCBorneDataReader::LadoBorne> lido;
         if (!segundoLado && referencia) {
             lido.emplace();
