@@ -113,6 +113,7 @@ CCBorneDataReader::LadoBorne CCBorneDataReader::AchaLado(CCDataReader& leitor,
     if (oposto) {
         lado.ponto = oposto->outro;
         lado.outro = oposto->ponto;
+        lado.layer = oposto->layer;
     } else {
         const CEPonto p = CICad::GetPosicao(borne);
         const CEPonto q = leitor.PontoDeCorte(borne);
@@ -121,7 +122,8 @@ CCBorneDataReader::LadoBorne CCBorneDataReader::AchaLado(CCDataReader& leitor,
     }
     // The wire at the point and its entries are found once for both directions, the
     // element's handle and its point.
-    const OdDbObjectId fio = leitor.FioNoPonto(leitor.LayerDe(borne), lado.ponto);
+    if (lado.layer.isNull()) lado.layer = leitor.LayerDe(borne);
+    const OdDbObjectId fio = leitor.FioNoPonto(lado.layer, lado.ponto);
     const auto entradas = leitor.EntradasDoFio(fio);
     if (!entradas) return lado;
     const TabelaConexoes::Textos& elementos = entradas->elementos;
@@ -165,7 +167,8 @@ void CCBorneDataReader::LeFiosLado(CCDataReader& leitor, CEItemLista& item,
     if (!leitor.EhFioNumerado(lado.fio)) return;
     // AchaLado found the wire at the side's point already.
     const OdDbObjectId& fioAqui = lado.fio;
-    const OdDbObjectId fioOutro = leitor.FioNoPonto(leitor.LayerDe(borne), lado.outro);
+    const OdDbObjectId fioOutro =
+        leitor.FioNoPonto(lado.layer.isNull() ? leitor.LayerDe(borne) : lado.layer, lado.outro);
     // The cut point's wire is read first on the insertion side, last on the cut side.
     const OdDbObjectId& fioP = insercao ? fioAqui : fioOutro;
     const OdDbObjectId& fioQ = insercao ? fioOutro : fioAqui;
@@ -404,7 +407,8 @@ uint qHash(const CCBorneDataReader::ChaveBorne& chave, uint semente) {
 
 namespace {
 
-// The first item of each strip and number, per language, for the jumper look-ups.
+// The first item of each strip and number, per language, for the jumper look-ups; and each
+// item's jumper text, read in the same pass while the item's fields are at hand.
 class IndiceBornes {
 public:
     explicit IndiceBornes(const VetorItens& itens) {
@@ -413,14 +417,21 @@ public:
             numero_[i] = CamposItem::numeroSeHouver(Nomes().numeros[i]);
             indice_[i].reserve(itens.size());
         }
+        const std::uint32_t jumper = CamposItem::numeroSeHouver(Nomes().jumper);
+        jumpers_.reserve(itens.size());
         // The first item of a key keeps it.
-        for (CEItemLista* item : itens)
+        for (CEItemLista* item : itens) {
+            jumpers_.push_back(item && jumper != CamposItem::kSemNome ? item->campos.procura(jumper)
+                                                                      : nullptr);
             for (int i = 0; item && i < 3; ++i) {
                 CEItemLista*& primeiro =
                     indice_[i][{Valor(*item, regua_[i]), Valor(*item, numero_[i])}];
                 if (!primeiro) primeiro = item;
             }
+        }
     }
+    // The jumper text of the k-th item, null when it has none; valid while its fields stay.
+    const QString* Jumper(std::size_t k) const { return jumpers_[k]; }
     CEItemLista* Busca(const CEItemLista& de, int idioma, const QString& numero) const {
         return indice_[idioma].value({Valor(de, regua_[idioma]), numero});
     }
@@ -434,6 +445,7 @@ private:
     }
     std::uint32_t regua_[3], numero_[3];
     TabelaChaves<Chave, CEItemLista*> indice_[3];
+    std::vector<const QString*> jumpers_;
 };
 
 // The terminals bridged to `inicio`, followed through their own jumper texts, depth first.
@@ -478,9 +490,10 @@ void EstendeCadeia(VetorItens& cadeia) {
 void CCBorneDataReader::LigaJumpers(VetorItens& itens) {
     const IndiceBornes indice(itens);
     std::unordered_set<CEItemLista*> visitados;
-    for (CEItemLista* item : itens) {
+    for (std::size_t k = 0; k < itens.size(); ++k) {
+        CEItemLista* item = itens[k];
         if (!item) continue;
-        const QString* jumper = item->campo(Nomes().jumper);
+        const QString* jumper = indice.Jumper(k);
         if (!jumper || jumper->trimmed().isEmpty()) continue;
         if (!visitados.insert(item).second) continue;
         VetorItens cadeia = ColetaJumper(item, indice, visitados);

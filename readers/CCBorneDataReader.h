@@ -52,13 +52,14 @@ public:
         OdDbObjectId elemento;  // that element, null when its handle is stale
         OdDbObjectId fio;       // the wire at the side's point, null when none
         CEPonto pontoElemento;  // where the wire meets the element
+        QString layer;          // the terminal's layer, as the reader names it
     };
     // Repeated numbers leave the jumpers unlinked; the terminal list says so (message 329),
     // the exports, which draw no jumpers, do not.
     bool AvisaNumerosRepetidos = true;
 
     // The side at the insertion point, or at the cut point. `oposto`, the terminal's other
-    // side when it was found already, lends its two points.
+    // side when it was found already, lends its two points, and its layer when it has one.
     static LadoBorne AchaLado(CCDataReader& leitor, const OdDbObjectId& borne, bool insercao,
                               const LadoBorne* oposto = nullptr);
     // The wires at the terminal's two points under their suffixes, when the side's wire is

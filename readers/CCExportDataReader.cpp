@@ -4,11 +4,13 @@
 #include "CCCaboDataReader.h"
 #include "CCFioDataReader.h"
 #include "CEAtributo.h"
+#include "Descarte.h"
 #include "catalogue/CEConexaoCatalogo.h"
 #include "export/CEExportacao.h"
 #include "lists/CETemplate.h"
 #include "module/CIProgress.h"
 
+#include <algorithm>
 #include <array>
 #include <cmath>
 #include <memory>
@@ -209,32 +211,44 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
     // Accessories are read with their owner and follow it.
     simbolos_.vinculos = lerAcessorios_ ? 2 : 0;
     CIProgress progresso;
+    ReservaVistos(database);
+    bornesLidos_.Limpa();
+    ladosVistos_ = false;
     ladosAdiados_ = true;
     LeBlocos(database, std::nullopt, modelo, progresso);
     LeVirtuais(database, modelo);
     LePinos(database, modelo);
     LiberaReferencias();
     ladosAdiados_ = false;
-    std::vector<CEItemLista*> bornes;
+    // The handles seen were for this walk only: a node each, freed on the freeing thread.
+    Descarte::Largar(vistos_);
+    // The terminals, each with what the walk read of its reference.
+    std::vector<std::pair<CEItemLista*, const BornesLidos::Referencia*>> bornes;
     static const QString kBorne = QStringLiteral("BORNE"), kComp = QStringLiteral("COMP");
     const std::uint32_t tipoCampo = NumeroCampo<"ZV_LISTA_TIPO">();
     const std::uint32_t handleCampo = NumeroCampo<"HANDLE">();
     std::array<NomeCampo, 3>& relacoes = Nomes(QString()).relacoes;
-    for (CEItemLista* item : resultado_) {
+    // At most a relation per item: the table is not made again as it grows.
+    relacoesComponentes_.reserve(relacoesComponentes_.size() + resultado_.size());
+    for (std::size_t lugar = 0; lugar < resultado_.size(); ++lugar) {
+        CEItemLista* item = resultado_[lugar];
         if (!item) continue;
         const QString* tipo = item->campos.procura(tipoCampo);
         if (!tipo || tipo->isEmpty()) {
-            const bool borne = !item->ids.empty() && EhBorne(item->ids.front());
+            // A terminal takes its kind with its sides below, where its array grows once
+            // for both.
+            if (const BornesLidos::Referencia* referencia = nullptr;
+                BorneLido(lugar, *item, referencia)) {
+                bornes.emplace_back(item, referencia);
+                itens.push_back(item);
+                continue;
+            }
             // An array made to measure when its item was kept grows by exactly the kind, its
-            // fields moved once, not to twice its size and back; a terminal's grows with its
-            // sides below.
+            // fields moved once, not to twice its size and back.
             if (!tipo) item->campos.reservar(size_t(item->campos.size()) + 1);
-            item->definirCampo(tipoCampo, borne ? kBorne : kComp);
+            item->definirCampo(tipoCampo, kComp);
             // A component is complete with its kind: the room the kind's field grew goes.
-            if (borne)
-                bornes.push_back(item);
-            else
-                PartilhaNomes(*item);
+            PartilhaNomes(*item);
             tipo = item->campos.procura(tipoCampo);
         }
         if (*tipo == kComp) {
@@ -252,14 +266,27 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
     // Terminals read alike hold about as many fields once their sides are read: room for as
     // many as the terminal before held moves a terminal's fields once, not at each doubling.
     size_t medida = 0;
-    for (CEItemLista* borne : bornes) {
-        if (size_t(borne->campos.size()) < medida) borne->campos.reservar(medida);
-        AoLigarInicio(*borne, borne->ids.front(), &modelo);
-        AoLigarFim(*borne, borne->ids.front(), &modelo);
+    for (const auto& [borne, referencia] : bornes) {
+        borne->campos.reservar(std::max(medida, size_t(borne->campos.size()) + 1));
+        borne->definirCampo(tipoCampo, kBorne);
+        AoLigar(*borne, borne->ids.front(), &modelo, true, true, referencia);
+        AoLigar(*borne, borne->ids.front(), &modelo, false, true, referencia);
         medida = size_t(borne->campos.size());
         // The sides were the terminal's last fields: the room their growth left goes.
         PartilhaNomes(*borne);
     }
+    bornesLidos_.Libera();
+}
+
+void CCExportDataReader::ReservaVistos(zvdb::Database* database) {
+    // Room for every symbol the walk may list, so that the set of handles seen grows
+    // without rehashing its nodes: the references of the blocks it looks at.
+    std::size_t referencias = 0;
+    const auto& porBloco = ReferenciasPorBloco(database);
+    for (auto it = porBloco.constBegin(); it != porBloco.constEnd(); ++it)
+        if (!it.key().startsWith('*') && !it.key().startsWith(QLatin1String("PIN-")))
+            referencias += it.value().size();
+    vistos_.reserve(referencias);
 }
 
 void CCExportDataReader::LeFiosExportacao(const std::optional<QStringList>& paginas,
@@ -281,7 +308,28 @@ void CCExportDataReader::LeFiosExportacao(const std::optional<QStringList>& pagi
 
 void CCExportDataReader::LerLadoIni(CEItemLista& item, const OdDbObjectId& entidade,
                                     CETemplate& modelo) {
-    if (!ladosAdiados_) AoLigarInicio(item, entidade, &modelo);
+    if (!ladosAdiados_) return AoLigarInicio(item, entidade, &modelo);
+    // The reference was just read: its block name, and what its sides ask of it, are at
+    // hand now, not when the sides are read after the walk.
+    ladosVistos_ = true;
+    if (entidade.isNull() || !EhBorne(entidade)) return;
+    BornesLidos::Referencia referencia;
+    referencia.insercao = CICad::GetPosicao(entidade);
+    referencia.corte = PontoDeCorte(entidade);
+    referencia.layer = LayerDe(entidade);
+    referencia.equipamento = CICad::TemXData(entidade, "KVR_ZV_EQUIPO");
+    bornesLidos_.Anota(resultado_.size(), item, entidade, std::move(referencia));
+}
+
+bool CCExportDataReader::BorneLido(std::size_t lugar, const CEItemLista& item,
+                                   const BornesLidos::Referencia*& referencia) {
+    referencia = nullptr;
+    if (item.ids.empty()) return false;
+    // A reader whose hooks told nothing asks the block name. Else only a block reference
+    // the walk read can be a terminal.
+    if (!ladosVistos_) return EhBorne(item.ids.front());
+    referencia = bornesLidos_.Eh(lugar, item);
+    return referencia != nullptr;
 }
 
 void CCExportDataReader::LerLadoFim(CEItemLista& item, const OdDbObjectId& entidade,
@@ -319,11 +367,12 @@ QString CCExportDataReader::VizinhoPorLigacao(const QString& fio, const QString&
 // element wired there under the first suffix, the wire at the terminal's other point under
 // the second, and the relation of the end composed.
 void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade,
-                                 CETemplate* modelo, bool inicio) {
+                                 CETemplate* modelo, bool inicio, bool borne,
+                                 const BornesLidos::Referencia* referencia) {
     // What the first side of a terminal left for its second side counts for the very next
     // call only.
     const PrimeiroLado primeiro = std::exchange(primeiroLado_, PrimeiroLado{});
-    if (entidade.isNull() || !EhBorne(entidade)) return;
+    if (entidade.isNull() || !(borne || EhBorne(entidade))) return;
     // An inverted wire keeps its ends; any other wire has them the other way round.
     const QString* marca = item.campos.procura(NumeroCampo<"INVERTIDO">());
     const bool invertido = marca && marca->toUpper() == QLatin1String("S");
@@ -348,10 +397,22 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
     bool equipamento = false;
     if (doBorne) {
         // The terminal's own side: the insertion point for the first hook, the cut point
-        // for the second, looked at as the terminal list does.
+        // for the second, looked at as the terminal list does. The first side takes the
+        // points and layer the walk read, as the second side takes them from the first.
+        std::optional<CCBorneDataReader::LadoBorne> lido;
+        if (!segundoLado && referencia) {
+            lido.emplace();
+            lido->ponto = inicio ? referencia->corte : referencia->insercao;
+            lido->outro = inicio ? referencia->insercao : referencia->corte;
+            lido->layer = referencia->layer;
+        }
         lado = CCBorneDataReader::AchaLado(*this, entidade, inicio,
-                                           segundoLado ? &*primeiro.lado : nullptr);
-        equipamento = segundoLado ? primeiro.equipamento : CICad::TemXData(entidade, kEquipo);
+                                           segundoLado ? &*primeiro.lado
+                                           : lido      ? &*lido
+                                                       : nullptr);
+        equipamento = segundoLado  ? primeiro.equipamento
+                      : referencia ? referencia->equipamento
+                                   : CICad::TemXData(entidade, kEquipo);
         if (inicio) primeiroLado_ = PrimeiroLado{&item, entidade, lado, equipamento, false};
         if (lado->vizinho.isEmpty()) return;
         ponto = lado->ponto;
@@ -393,7 +454,7 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
         // a terminal, which has no relation, is told by its strip and number instead.
         for (NomeCampo& nome : nomes.relacoes)
             item.definirCampo(nome.ParaDefinir(), QString());
-        CopiaAtributos(sufixo, item, conectado);
+        CopiaAtributos(sufixo, item, conectado, objeto);
         // After the copy: an element it read for the first time lends its attributes to
         // the connection's question. A terminal's side found the element's point already.
         const bool mesmoVizinho = lado && TabelaConexoes::Iguais(conectado, lado->vizinho);
@@ -420,8 +481,12 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
 
 void CCExportDataReader::CopiaAtributos(const QString& sufixo, CEItemLista& item,
                                         const QString& handle) {
+    CopiaAtributos(sufixo, item, handle, CICad::IdDoHandle(handle));
+}
+
+void CCExportDataReader::CopiaAtributos(const QString& sufixo, CEItemLista& item,
+                                        const QString& handle, const OdDbObjectId& id) {
     QString alvo = handle;
-    const OdDbObjectId id = CICad::IdDoHandle(handle);
     if (id.isNull()) return;
     const std::string_view nome = CICad::NomeBlocoUtf8(id);
     // A contact or a terminal speaks for its component, when the reader listed it.

@@ -2,10 +2,12 @@
 // The reader of the exports: in one pass every kind of item the export asked for
 // (terminals, components, accessories, wires, ferrules, cables), each marked with its kind
 // in ZV_LISTA_TIPO; a wire's item also learns what stands at its two ends.
+#include "BornesLidos.h"
 #include "CCBorneDataReader.h"
 #include "CCMaterialDataReader.h"
 #include "TabelaChaves.h"
 
+#include <cstddef>
 #include <optional>
 
 class CEExportacao;
@@ -45,6 +47,8 @@ protected:
     void LeBornes(zvdb::Database* database, CETemplate& modelo, VetorItens& itens);
     // Components, terminals and accessories as the material reader finds them.
     void LeComponentes(zvdb::Database* database, CETemplate& modelo, VetorItens& itens);
+    // Room in the set of handles seen for every reference the components' walk looks at.
+    void ReservaVistos(zvdb::Database* database);
     // The wire stretches with both ends told by the hooks.
     void LeFiosExportacao(const std::optional<QStringList>& paginas, CETemplate* modelo,
                           VetorItens& itens);
@@ -61,7 +65,13 @@ private:
     static NomesRelacao& Nomes(const QString& sufixo);
     void CompoeRelacao(NomesRelacao& nomes, CEItemLista& item, CETemplate* modelo,
                        const QString& ligacao, const QString& handle);
-    void AoLigar(CEItemLista& item, const OdDbObjectId& entidade, CETemplate* modelo, bool inicio);
+    // `borne`: the entity is known to be a terminal; `referencia`, what the walk read of it
+    // then, when it did.
+    // CopiaAtributos with the entity of the handle found already.
+    void CopiaAtributos(const QString& sufixo, CEItemLista& item, const QString& handle,
+                        const OdDbObjectId& id);
+    void AoLigar(CEItemLista& item, const OdDbObjectId& entidade, CETemplate* modelo, bool inicio,
+                 bool borne = false, const BornesLidos::Referencia* referencia = nullptr);
     // The element next to an equipment's own entry of the connection (its handle and
     // connection name) in the wire's full connection list; empty when there is none.
     QString VizinhoPorLigacao(const QString& fio, const QString& proprio, const QString& ligacao,
@@ -69,6 +79,14 @@ private:
     // While components are read the sides wait: a contact names its component only once
     // every component is known.
     bool ladosAdiados_ = false;
+    // The terminals the walk read, told by the first hook while the reference is at hand.
+    BornesLidos bornesLidos_;
+    // Whether the walk's hooks ran at all (a reader may have hooks of its own).
+    bool ladosVistos_ = false;
+    // Whether the item at that place of the result is a terminal, with what the walk read of
+    // its reference when it did; asked in ascending places.
+    bool BorneLido(std::size_t lugar, const CEItemLista& item,
+                   const BornesLidos::Referencia*& referencia);
     // What the first side of a terminal found for its second side: its points, whether it
     // is an equipment, and whether it read the wires of both points.
     struct PrimeiroLado {

@@ -18,6 +18,11 @@ const QString& Valor(const CEItemLista& item, std::uint32_t campo) {
     return valor ? *valor : kVazio;
 }
 
+// Whether the terminal has a wire on a side.
+bool ComFio(const CEItemLista& borne, const CCBorneDwgDataReader::Chaves& chaves) {
+    return !Valor(borne, chaves.relacaoIni).isEmpty() || !Valor(borne, chaves.relacaoFim).isEmpty();
+}
+
 }  // namespace
 
 CCBorneDwgDataReader::Chaves CCBorneDwgDataReader::ChavesBornes(const VetorItens& bornes) {
@@ -32,18 +37,20 @@ CCBorneDwgDataReader::Chaves CCBorneDwgDataReader::ChavesBornes(const VetorItens
     chaves.relacaoFim = CamposItem::numeroSeHouver(QStringLiteral("RELACAO_FIM"));
     chaves.jumper = CamposItem::numeroSeHouver(QStringLiteral("JUMPER"));
     chaves.bornes.reserve(bornes.size());
-    for (const CEItemLista* borne : bornes)
+    chaves.comFio.reserve(bornes.size());
+    for (const CEItemLista* borne : bornes) {
         for (size_t i = 0; i < 3; ++i) {
             const QString& regua = Valor(*borne, chaves.reguas[i]);
             const QString& numero = Valor(*borne, chaves.numeros[i]);
             if (!regua.isEmpty() && !numero.isEmpty()) chaves.bornes[{regua, numero}] = true;
         }
+        chaves.comFio.push_back(char(ComFio(*borne, chaves)));
+    }
     return chaves;
 }
 
 bool CCBorneDwgDataReader::Ligado(const CEItemLista& borne, const Chaves& chaves) {
-    if (!Valor(borne, chaves.relacaoIni).isEmpty() || !Valor(borne, chaves.relacaoFim).isEmpty())
-        return true;
+    if (ComFio(borne, chaves)) return true;
     const QString& jumper = Valor(borne, chaves.jumper);
     if (jumper.isEmpty()) return false;
     const QStringList numeros = jumper.split(',', Qt::SkipEmptyParts);
@@ -92,8 +99,8 @@ VetorItens* CCBorneDwgDataReader::LerDados(zvdb::Database* database,
     if (!CICad::GetBoolLisp("*BORNES_SEM_LIG_GRX*")) {
         const Chaves chaves = ChavesBornes(bornes);
         VetorItens ficam;
-        for (CEItemLista* borne : bornes)
-            if (Ligado(*borne, chaves)) ficam.push_back(borne);
+        for (size_t k = 0; k < bornes.size(); ++k)
+            if (chaves.comFio[k] || Ligado(*bornes[k], chaves)) ficam.push_back(bornes[k]);
         bornes = std::move(ficam);
     }
     // Links the terminal reader made may point at terminals that went: they are made again

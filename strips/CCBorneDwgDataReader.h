@@ -8,6 +8,7 @@
 
 #include <array>
 #include <cstdint>
+#include <vector>
 
 class CCBorneDwgDataReader : public CCExportDataReader {
 public:
@@ -28,6 +29,9 @@ public:
         TabelaChaves<CEModeloReguas::ChaveBorne, bool> bornes;
         std::array<std::uint32_t, 3> reguas{}, numeros{};
         std::uint32_t relacaoIni = 0, relacaoFim = 0, jumper = 0;
+        // Whether each terminal given has a wire on a side, read in the keys' pass while its
+        // fields are at hand: those need no second look.
+        std::vector<char> comFio;
     };
     static Chaves ChavesBornes(const VetorItens& bornes);
     // True when the terminal has a wire on a side, or a jumper to a number of its strip

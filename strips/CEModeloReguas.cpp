@@ -7,6 +7,7 @@
 #include <algorithm>
 #include <array>
 #include <cstdint>
+#include <initializer_list>
 #include <iterator>
 #include <limits>
 #include <unordered_set>
@@ -22,6 +23,19 @@ std::vector<std::uint32_t> Numeros(const QStringList& campos) {
     for (const QString& campo : campos)
         numeros.push_back(CamposItem::numeroSeHouver(campo));
     return numeros;
+}
+
+// The names some item holds, in their order: a name none holds reads empty for every item,
+// so it never decides a comparison and sorting by it would only cost its tables. When none
+// is held, all stay: the sort still runs, and moves equal items as it did.
+QStringList Presentes(std::initializer_list<const char*> nomes) {
+    QStringList todos, presentes;
+    for (const char* nome : nomes) {
+        todos << QString::fromLatin1(nome);
+        if (CamposItem::numeroSeHouver(todos.back()) != CamposItem::kSemNome)
+            presentes << todos.back();
+    }
+    return presentes.isEmpty() ? todos : presentes;
 }
 
 // Whether the items differ in one of the fields; a field an item lacks reads as empty.
@@ -78,18 +92,23 @@ int PrefixoDoNome(std::uint32_t numero) {
 }
 
 // The item's values under the names, ascending: a terminal holds many fields and few side
-// connections, so each name is looked for from where the one before stood.
+// connections, so each name is looked for from where the one before stood. They are
+// gathered in `achados` first, so that each terminal's array is made once, to measure.
 void LeLigacoes(const CEItemLista& item, const std::vector<std::uint32_t>& nomes,
-                std::vector<QString>& valores) {
+                std::vector<const QString*>& achados, std::vector<QString>& valores) {
     const std::vector<CamposItem::Campo>& campos = item.campos.todos();
+    achados.clear();
     auto lugar = campos.begin();
     for (const std::uint32_t nome : nomes) {
         lugar = std::lower_bound(
             lugar, campos.end(), nome,
             [](const CamposItem::Campo& c, std::uint32_t n) { return c.nome < n; });
         if (lugar == campos.end()) break;
-        if (lugar->nome == nome) valores.push_back(lugar->valor);
+        if (lugar->nome == nome) achados.push_back(&lugar->valor);
     }
+    valores.reserve(valores.size() + achados.size());
+    for (const QString* valor : achados)
+        valores.push_back(*valor);
 }
 
 }  // namespace
@@ -134,7 +153,7 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
         else if (*tipo == kBorne)
             terminais.push_back(item);
     }
-    componentes.ordenar({"RELACAO", "TAG", "ETIQUETA"});
+    componentes.ordenar(Presentes({"RELACAO", "TAG", "ETIQUETA"}));
     simbolosPorHandle.reserve(componentes.size());
     for (CEItemLista* item : componentes) {
         CESimboloDwg& simbolo = simbolos.emplace_back(item);
@@ -146,11 +165,12 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
     }
     // By strip, then number, in the three languages; Spanish shares the Portuguese number
     // field, which a second time would never decide a comparison.
-    terminais.ordenar({"REGUA", "STRIP", "REGLETA", "NUMERO", "NUMBER"});
+    terminais.ordenar(Presentes({"REGUA", "STRIP", "REGLETA", "NUMERO", "NUMBER"}));
     // The names of side connections: each terminal's values are read as it is built.
     std::vector<std::uint32_t> nomesLigacao;
     for (std::uint32_t nome = 0; nome < CamposItem::quantidadeNomes(); ++nome)
         if (PrefixoDoNome(nome) == kLigacoesDoBorne) nomesLigacao.push_back(nome);
+    std::vector<const QString*> ligacoesAchadas;
     TabelaChaves<QString, CEReguaDwg*> reguaPorNome;
     CEReguaDwg* ultima = nullptr;
     bornesPorChave.reserve(terminais.size());
@@ -176,16 +196,22 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
         const std::pair<std::uint32_t, std::uint32_t> lados[] = {
             {NumeroCampo<"REL_INI">(), NumeroCampo<"HANDLE_INI">()},
             {NumeroCampo<"REL_FIM">(), NumeroCampo<"HANDLE_FIM">()}};
+        // The symbols of both sides first: the terminal's array is made once, to measure.
+        CESimboloDwg* doLado[2] = {nullptr, nullptr};
+        int nLados = 0;
         for (const auto& [rel, handle] : lados) {
             const QString* relacao = item->campos.procura(rel);
             if (!relacao || relacao->isEmpty()) continue;
             const QString* deQuem = item->campos.procura(handle);
-            if (CESimboloDwg* simbolo = simbolosPorHandle.value(deQuem ? *deQuem : kSemValor)) {
-                borne->ligados.push_back(simbolo);
-                simbolo->Liga(borne);
-            }
+            if (CESimboloDwg* simbolo = simbolosPorHandle.value(deQuem ? *deQuem : kSemValor))
+                doLado[nLados++] = simbolo;
         }
-        LeLigacoes(*item, nomesLigacao, borne->ligacoes);
+        borne->ligados.reserve(size_t(nLados));
+        for (int i = 0; i < nLados; ++i) {
+            borne->ligados.push_back(doLado[i]);
+            doLado[i]->Liga(borne);
+        }
+        LeLigacoes(*item, nomesLigacao, ligacoesAchadas, borne->ligacoes);
     }
     // Jumper links by strip and number, so a duplicate's link lands on the terminal kept.
     auto busca = [this](const CEItemLista* ligado) -> CEBorneDwg* {

@@ -1,5 +1,6 @@
 // The export reader on small schematics: the kinds it reads for each EXPORTA value, each
 // marked in ZV_LISTA_TIPO, and what a wire's item learns about a terminal at its ends.
+#include "readers/BornesLidos.h"
 #include "readers/CCBorneDataReader.h"
 #include "readers/CCExportDataReader.h"
 #include "readers/FioFixture.h"
@@ -111,6 +112,84 @@ TEST_F(ExportReaderTest, ComponentsTellTerminalsFromOtherSymbols) {
             EXPECT_EQ(item->valorCampo("RELACAO"), "-K1");
             EXPECT_EQ(item->valorCampo("HANDLE"), handle(k1_));
         }
+}
+
+// The symbols' kinds by handle, as "handle=kind", sorted; accessories are left out.
+QStringList TiposPorHandle(const VetorItens& itens) {
+    QStringList texto;
+    for (const CEItemLista* item : itens)
+        if (item->valorCampo("ZV_LISTA_TIPO") != "ACE")
+            texto << item->valorCampo("HANDLE") + "=" + item->valorCampo("ZV_LISTA_TIPO");
+    texto.sort();
+    return texto;
+}
+
+// The walk tells each terminal as it reads it; the symbols it drops on the way (a terminal
+// that is not listed, read right before a component that takes its place) tell nothing of
+// those kept after them. A reader with hooks of its own is told by the block names.
+TEST_F(ExportReaderTest, TerminalsAreToldAmongSymbolsTheWalkDrops) {
+    projeto();
+    zvdb::BlockReference* fora = borne("X9", "1", {100, 200, 0});
+    fora->setXData("KVR_ZV", zvsample::XDataItems().text("1106\f1").tags());
+    // A block of its own, made after the terminals' and named after it.
+    zvdb::BlockReference* k2 = componente("-K2", {{"A1", {140, 100, 0}}}, "RELE");
+    le(3);
+    const QStringList esperado = QStringList({handle(x1_) + "=BORNE", handle(x2_) + "=BORNE",
+                                              handle(k1_) + "=COMP", handle(k2) + "=COMP"});
+    QStringList ordenado = esperado;
+    ordenado.sort();
+    EXPECT_EQ(TiposPorHandle(lidos_), ordenado);
+    // Both terminals read their sides from the points the walk read: the element and the
+    // wire at the cut point under _INI, nothing at the insertion point.
+    QStringList lados;
+    for (const CEItemLista* item : lidos_) {
+        if (item->valorCampo("ZV_LISTA_TIPO") != "BORNE") continue;
+        lados << item->valorCampo("NUMERO") + ">" + item->valorCampo("RELACAO_INI") + "/" +
+                     item->valorCampo("FIO_SEGINI") + "|" + item->valorCampo("RELACAO_FIM");
+    }
+    lados.sort();
+    EXPECT_EQ(lados, QStringList({"1>-K1:A1/1|", "2>-K1:A2/2|"}));
+    lidos_.destruirItens();
+
+    struct ComLados : CCExportDataReader {
+        int lados = 0;
+        void LerLadoIni(CEItemLista&, const OdDbObjectId&, CETemplate&) override { ++lados; }
+    };
+    ComLados proprio;
+    std::unique_ptr<VetorItens> itens(proprio.Le(&db(), nullptr, true, std::nullopt));
+    ASSERT_TRUE(itens);
+    EXPECT_GT(proprio.lados, 0);
+    EXPECT_EQ(TiposPorHandle(*itens), ordenado);
+    itens->destruirItens();
+}
+
+// The records of a walk: items kept in the order read; the dropped leave records behind,
+// at the place the next kept item takes, maybe at the very address it gets.
+TEST(BornesLidosTest, OnlyTheKeptTerminalsAnswerAtTheirPlaces) {
+    const auto id = [](std::uint64_t handle) { return OdDbObjectId(nullptr, handle); };
+    CEItemLista a, b, c, d;
+    a.ids = {id(0xA)};
+    b.ids = {id(0xB)};
+    c.ids = {id(0xC)};
+    d.ids = {id(0xD)};
+    BornesLidos lidos;
+    lidos.Anota(0, a, id(0xA), {});
+    // A terminal dropped at place 1, then one kept there; a dropped one at place 2 whose
+    // item's address the component kept there got.
+    lidos.Anota(1, d, id(0x1D), {});
+    lidos.Anota(1, b, id(0xB), {});
+    lidos.Anota(2, c, id(0x2C), {});
+    lidos.Anota(4, d, id(0xD), {});
+    EXPECT_TRUE(lidos.Eh(0, a));
+    EXPECT_TRUE(lidos.Eh(1, b));
+    EXPECT_FALSE(lidos.Eh(2, c));
+    // A place without records, and an item of no entity.
+    EXPECT_FALSE(lidos.Eh(3, a));
+    CEItemLista vazio;
+    EXPECT_FALSE(lidos.Eh(4, vazio));
+    EXPECT_TRUE(lidos.Eh(4, d));
+    lidos.Limpa();
+    EXPECT_FALSE(lidos.Eh(0, a));
 }
 
 TEST_F(ExportReaderTest, WiresAloneForTwoAndWiresWithComponentsWhenUnset) {

@@ -36,6 +36,8 @@ TEST(LeitorReguasTest, ATerminalStaysWithAWireOrAJumperToANumberOfItsOwnStrip) {
     EXPECT_EQ(chaves.bornes.size(), 5u);
     EXPECT_TRUE(chaves.bornes.value(CEModeloReguas::ChaveBorne{"X2", "5"}));
     EXPECT_FALSE(chaves.bornes.value(CEModeloReguas::ChaveBorne{"X25", ""}));
+    // Only a is wired; the others stay by their jumpers or go.
+    EXPECT_EQ(chaves.comFio, std::vector<char>({1, 0, 0, 0, 0}));
     EXPECT_TRUE(CCBorneDwgDataReader::Ligado(*a, chaves));
     EXPECT_TRUE(CCBorneDwgDataReader::Ligado(*b, chaves));
     EXPECT_FALSE(CCBorneDwgDataReader::Ligado(*c, chaves));
