@@ -297,12 +297,13 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
         Define(progresso, 100);
         return itens;
     }
+    // The connections first: the host's walk of the drawing for them lists the wires too.
+    CarregaConexoesFios();
     // With pages the drawing is asked for the wires that have a polyline on them, so a wire
     // whose first polyline lies on another page still enters through one on a chosen page.
     const std::vector<OdDbObjectId> fios = ListaFios(paginas ? *paginas : CICad::GetLayers());
     Define(progresso, 30);
     CarregaLayout();
-    CarregaConexoesFios();
     MapeiaLayout(modelo);
     Define(progresso, 50);
 
@@ -383,10 +384,10 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
 VetorItens* CCFioDataReader::LeAnilhas(const QHash<QString, QString>& opcoes, CETemplate* modelo,
                                        CIProgress* progresso) {
     Define(progresso, 20);
+    CarregaConexoesFios();
     const std::vector<OdDbObjectId> fios = ListaFios(CICad::GetLayers());
     Define(progresso, 40);
     CarregaLayout();
-    CarregaConexoesFios();
     MapeiaLayout(modelo);
     Define(progresso, 50);
 

@@ -9,6 +9,22 @@
 namespace zvproduct {
 
 void WireListIndex::rebuild(zvdb::Database& database) {
+    std::vector<WireLine> lines;
+    for (zvdb::Polyline* polyline : ConnectionFinder::polylinesInPageOrder(database, "KVR_ZV_WIRE"))
+        lines.push_back(
+            {polyline->handle(), ConnectionFinder::wireNumber(*polyline), polyline->layer()});
+    build(lines);
+    stamp_ = DrawingStamp::of(database);
+}
+
+void WireListIndex::adopt(const zvdb::Database& database, std::vector<WireLine> lines) {
+    firsts_.clear();
+    byLayer_.clear();
+    handedOver_ = std::move(lines);
+    stamp_ = DrawingStamp::of(database);
+}
+
+void WireListIndex::build(std::span<const WireLine> lines) {
     firsts_.clear();
     byLayer_.clear();
     // numbers and layers as views into the drawing, which holds still while this runs
@@ -17,26 +33,23 @@ void WireListIndex::rebuild(zvdb::Database& database) {
     // polylines come page by page: the last layer's entries serve the next polyline
     std::string_view lastLayer;
     std::vector<OnLayer>* onLayer = nullptr;
-    for (zvdb::Polyline* polyline :
-         ConnectionFinder::polylinesInPageOrder(database, "KVR_ZV_WIRE")) {
-        const std::string_view number = ConnectionFinder::wireNumber(*polyline);
-        if (number.empty()) continue;  // an unnumbered wire is no wire of the lists
+    for (const WireLine& line : lines) {
+        if (line.number.empty()) continue;  // an unnumbered wire is no wire of the lists
         const auto [it, added] =
-            rankOf.try_emplace(number, static_cast<std::uint32_t>(firsts_.size()));
+            rankOf.try_emplace(line.number, static_cast<std::uint32_t>(firsts_.size()));
         if (added) {
-            firsts_.push_back(polyline->handle());
+            firsts_.push_back(line.handle);
             placesSeen.push_back(0);
         }
         const std::uint32_t wire = it->second;
         const std::uint32_t place = placesSeen[wire]++;
-        const std::string_view layer = polyline->layer();
-        if (!onLayer || layer != lastLayer) {
-            onLayer = &byLayer_[std::string(layer)];
-            lastLayer = layer;
+        if (!onLayer || line.layer != lastLayer) {
+            onLayer = &byLayer_[std::string(line.layer)];
+            lastLayer = line.layer;
         }
         // polylines come in page order, so a wire's first one on this layer is the one kept
         if (onLayer->empty() || onLayer->back().wire != wire)
-            onLayer->push_back({wire, place, polyline->handle()});
+            onLayer->push_back({wire, place, line.handle});
     }
     // within a layer a wire can come back after others; the later entries only repeat it
     for (auto& [layer, entries] : byLayer_) {
@@ -47,12 +60,17 @@ void WireListIndex::rebuild(zvdb::Database& database) {
                         [](const OnLayer& a, const OnLayer& b) { return a.wire == b.wire; }),
             entries.end());
     }
-    stamp_ = DrawingStamp::of(database);
 }
 
 std::vector<std::uint64_t> WireListIndex::firstPolylines(
     zvdb::Database& database, const std::unordered_set<std::string>& layers) {
-    if (!(stamp_ == DrawingStamp::of(database))) rebuild(database);
+    if (!current(database)) {
+        handedOver_ = {};
+        rebuild(database);
+    } else if (!handedOver_.empty()) {
+        build(handedOver_);
+        handedOver_ = {};
+    }
     if (layers.empty()) return firsts_;
     std::vector<const std::vector<OnLayer>*> asked;
     for (const std::string& layer : layers) {
