@@ -185,6 +185,7 @@ private:
     // the same element, and a text that is no handle names none.
     std::unordered_map<std::uint64_t, VistaLayout> vistas_;
     QHash<QString, QString> rotasLayoutFio_;  // wire key (and key + "$") to route handle
+    QSet<QString> fiosComRota_;               // the wire keys that have a route
     QHash<QString, QString> paineisLayout_;   // panel key to view handle
     QHash<QString, QString> layoutPorRelacao_;
     std::vector<std::pair<OdDbObjectId, OdDbObjectId>> transicoes_;
