@@ -183,13 +183,40 @@ CEItemLista* CCFioDataReader::ItemFio(const OdDbObjectId& polilinha, CETemplate*
     return item;
 }
 
+void CCFioDataReader::FioAtual::Recomeca(const QString& outro) {
+    numero = outro;
+    valido = true;
+    primeiros.clear();
+    ligacoes.clear();
+    ligacoesLidas.clear();
+    ids.clear();
+    idsLidos.clear();
+    listasLidas = false;
+    elementos.reset();
+    pontos.reset();
+}
+
 CCFioDataReader::FioAtual& CCFioDataReader::Fio(const QString& numero) {
-    if (!fio_.valido || fio_.numero != numero) {
-        fio_ = FioAtual();
-        fio_.numero = numero;
-        fio_.valido = true;
-    }
+    if (!fio_.valido || fio_.numero != numero) fio_.Recomeca(numero);
     return fio_;
+}
+
+OdDbObjectId CCFioDataReader::Elemento(const QString& numero,
+                                       const TabelaConexoes::Textos& elementos, int indice) {
+    if (!composicao_ || indice < 0 || indice >= elementos.size())
+        return CICad::IdDoHandle(elementos.value(indice));
+    FioAtual& fio = Fio(numero);
+    const size_t n = size_t(elementos.size());
+    if (fio.ids.size() != n) {
+        fio.ids.assign(n, OdDbObjectId());
+        fio.idsLidos.assign(n, false);
+    }
+    const size_t i = size_t(indice);
+    if (!fio.idsLidos[i]) {
+        fio.ids[i] = CICad::IdDoHandle(elementos.value(indice));
+        fio.idsLidos[i] = true;
+    }
+    return fio.ids[i];
 }
 
 int CCFioDataReader::PrimeiroLugar(const QString& numero, int indice) {
@@ -254,7 +281,7 @@ std::optional<QString> CCFioDataReader::Ligacao(const QString& numero, int indic
     const size_t i = size_t(indice);
     if (!fio.ligacoesLidas[i]) {
         const zv::CEAtributo* atributo =
-            ConexaoProxima(CICad::IdDoHandle((*elementos)[indice]), (*pontos)[i]);
+            ConexaoProxima(Elemento(numero, *elementos, indice), (*pontos)[i]);
         if (atributo) fio.ligacoes[i] = atributo->GetValor();
         fio.ligacoesLidas[i] = true;
     }
@@ -281,7 +308,7 @@ void CCFioDataReader::PreencheExtremidade(const QString& lado, CEItemLista& item
                                           CETemplate* modelo, const QString& numero) {
     static const QString kSufixoIni = QStringLiteral("_INI"), kSufixoFim = QStringLiteral("_FIM");
     const QString& sufixo = lado == kIni ? kSufixoIni : kSufixoFim;
-    CopiaEntidade(sufixo, item, CICad::IdDoHandle(elementos.value(indice)), modelo);
+    CopiaEntidade(sufixo, item, Elemento(numero, elementos, indice), modelo);
     // The wire's number comes from the walk: an element's fields copied under the suffix
     // never hold a field of the wire without one, so the item's number stays the wire's.
     LeSegmentoNoIndice(lado, item, numero, indice, modelo);
@@ -346,7 +373,7 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
             CEItemLista* atual = item;
             trechos.acrescenta(atual, {0, -1});
             for (int i = 1; i < n; ++i) {
-                const OdDbObjectId elemento = CICad::IdDoHandle(elementos[i]);
+                const OdDbObjectId elemento = Elemento(numero, elementos, i);
                 // An element that no longer exists leaves the stretch open.
                 if (elemento.isNull()) break;
                 // A run of one equipment is one passage: the wire goes in and out of it.

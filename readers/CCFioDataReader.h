@@ -135,18 +135,24 @@ private:
     std::optional<QString> LigacaoProxima(const QString& numero, const QString& elemento,
                                           int indice, const CEPonto& ponto);
 
-    // What a walk knows of the wire under work, made anew for the next wire: a wire's ends
-    // ask for the same entries, and nothing is kept for wires done.
+    // What a walk knows of the wire under work, emptied for the next wire: a wire's ends ask
+    // for the same entries, and nothing is kept for wires done but the arrays' room, which
+    // goes when the walk ends.
     struct FioAtual {
         QString numero;
         bool valido = false;
         std::vector<int> primeiros;  // per entry, the first entry of the same full text
         std::vector<std::optional<QString>> ligacoes;
         std::vector<bool> ligacoesLidas;
+        // Per entry, its element once found (an entry's two ends and its connection ask).
+        std::vector<OdDbObjectId> ids;
+        std::vector<bool> idsLidos;
         // The wire's entries and their points, looked up once.
         bool listasLidas = false;
         std::optional<TabelaConexoes::Textos> elementos;
         std::optional<std::span<const CEPonto>> pontos;
+        // Starts on the wire `outro`: the arrays keep their room for the next wires.
+        void Recomeca(const QString& outro);
     };
     // The entries and points of the wire `numero`: in a walk, whose table stays as the walk
     // loaded it, looked up once per wire; each end asks for them several times.
@@ -154,6 +160,10 @@ private:
                 std::optional<std::span<const CEPonto>>& pontos);
     FioAtual& Fio(const QString& numero);
     FioAtual fio_;
+    // The element of the entry at `indice` of `elementos`, the entries of the wire `numero`;
+    // null when it no longer exists. In a walk each entry's is looked up once.
+    OdDbObjectId Elemento(const QString& numero, const TabelaConexoes::Textos& elementos,
+                          int indice);
     // The relation's separators and order, read once for a walk with its template.
     struct Composicao {
         QString sep, sepLig;
