@@ -194,6 +194,8 @@ void CCFioDataReader::FioAtual::Recomeca(const QString& outro) {
     listasLidas = false;
     elementos.reset();
     pontos.reset();
+    completasLidas = false;
+    completas.reset();
 }
 
 CCFioDataReader::FioAtual& CCFioDataReader::Fio(const QString& numero) {
@@ -203,8 +205,9 @@ CCFioDataReader::FioAtual& CCFioDataReader::Fio(const QString& numero) {
 
 OdDbObjectId CCFioDataReader::Elemento(const QString& numero,
                                        const TabelaConexoes::Textos& elementos, int indice) {
-    if (!composicao_ || indice < 0 || indice >= elementos.size())
-        return CICad::IdDoHandle(elementos.value(indice));
+    if (indice < 0 || indice >= elementos.size()) return CICad::IdDoHandle(QString());
+    // The table read each element's handle already: no text is made for it.
+    if (!composicao_) return CICad::IdDoHandleNumero(elementos.handle(indice));
     FioAtual& fio = Fio(numero);
     const size_t n = size_t(elementos.size());
     if (fio.ids.size() != n) {
@@ -213,14 +216,24 @@ OdDbObjectId CCFioDataReader::Elemento(const QString& numero,
     }
     const size_t i = size_t(indice);
     if (!fio.idsLidos[i]) {
-        fio.ids[i] = CICad::IdDoHandle(elementos.value(indice));
+        fio.ids[i] = CICad::IdDoHandleNumero(elementos.handle(indice));
         fio.idsLidos[i] = true;
     }
     return fio.ids[i];
 }
 
 int CCFioDataReader::PrimeiroLugar(const QString& numero, int indice) {
-    const auto completas = ListaConexoesCompletas(numero);
+    std::optional<TabelaConexoes::Textos> lidas;
+    if (composicao_) {
+        FioAtual& fio = Fio(numero);
+        if (!fio.completasLidas) {
+            fio.completas = ListaConexoesCompletas(numero);
+            fio.completasLidas = true;
+        }
+    } else {
+        lidas = ListaConexoesCompletas(numero);
+    }
+    const std::optional<TabelaConexoes::Textos>& completas = composicao_ ? fio_.completas : lidas;
     if (!completas) return -1;
     const int n = int(completas->size());
     // An entry past the list's end has the empty text.
@@ -499,16 +512,19 @@ void CCFioDataReader::LeSegmento(const QString& lado, CEItemLista& item, const Q
 
 void CCFioDataReader::LeSegmentoNoIndice(const QString& lado, CEItemLista& item,
                                          const QString& numero, int indice, CETemplate* modelo) {
-    static const QString kLayerIni = QStringLiteral("LAYER_INI"),
-                         kLayerFim = QStringLiteral("LAYER_FIM"),
-                         kSegIni = QStringLiteral("_SEGINI"), kSegFim = QStringLiteral("_SEGFIM");
+    static const QString kSegIni = QStringLiteral("_SEGINI"), kSegFim = QStringLiteral("_SEGFIM");
+    static const NomeCampo kLayerIni(QStringLiteral("LAYER_INI")),
+        kLayerFim(QStringLiteral("LAYER_FIM"));
     const bool ini = lado == kIni;
     const int lugar = PrimeiroLugar(numero, indice);
-    const auto pontos = PontosConexao(numero);
+    std::optional<TabelaConexoes::Textos> elementos;
+    std::optional<std::span<const CEPonto>> pontos;
+    Listas(numero, elementos, pontos);
     const CEPonto ponto = pontos && lugar >= 0 && size_t(lugar) < pontos->size()
                               ? (*pontos)[size_t(lugar)]
                               : CEPonto{};
-    const OdDbObjectId fio = FioNoPonto(item.valorCampo(ini ? kLayerIni : kLayerFim), ponto);
+    const QString* layer = (ini ? kLayerIni : kLayerFim).Em(item);
+    const OdDbObjectId fio = FioNoPonto(layer ? *layer : QString(), ponto);
     if (!fio.isNull()) CopiaEntidade(ini ? kSegIni : kSegFim, item, fio, modelo, &numero);
 }
 

@@ -151,6 +151,9 @@ private:
         bool listasLidas = false;
         std::optional<TabelaConexoes::Textos> elementos;
         std::optional<std::span<const CEPonto>> pontos;
+        // Its whole texts, looked up once.
+        bool completasLidas = false;
+        std::optional<TabelaConexoes::Textos> completas;
         // Starts on the wire `outro`: the arrays keep their room for the next wires.
         void Recomeca(const QString& outro);
     };
