@@ -406,7 +406,7 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
                 }
             }
         }
-        CalculaComprimentos(item, elementos, &trechos);
+        CalculaComprimentos(item, elementos, &trechos, &campo);
         lugares = 0;
         for (const auto& trecho : trechos)
             lugares = std::max(lugares, trecho.first->campos.size());
@@ -486,7 +486,7 @@ VetorItens* CCFioDataReader::LeAnilhas(const QHash<QString, QString>& opcoes, CE
             }
         }
         itens->resize(destino);
-        CalculaComprimentos(item, elementos, &trechos);
+        CalculaComprimentos(item, elementos, &trechos, &campo);
     }
     for (CEItemLista* item : *itens)
         PartilhaNomes(*item);
@@ -586,12 +586,14 @@ void CCFioDataReader::ComporRelacao(const QString& s, CEItemLista& item, CETempl
         return;
     }
 
-    auto ehBorne = [&](size_t idioma) {
-        return tem(nomes.regua[idioma]) && tem(nomes.numero[idioma]);
-    };
+    // Per language, whether it names a terminal: asked again for the text below, and the
+    // fields written in between are none of these.
+    std::array<bool, 3> ehBorne{};
+    for (size_t i = 0; i < 3; ++i)
+        ehBorne[i] = tem(nomes.regua[i]) && tem(nomes.numero[i]);
     bool borne = false;
     for (size_t i = 0; i < 3 && !borne; ++i) {
-        if (!ehBorne(i)) continue;
+        if (!ehBorne[i]) continue;
         borne = true;
         define(nomes.rel, campo(nomes.regua[i]) + sep + campo(nomes.numero[i]));
     }
@@ -606,7 +608,7 @@ void CCFioDataReader::ComporRelacao(const QString& s, CEItemLista& item, CETempl
     QString texto;
     for (size_t i = 0; i < 3; ++i) {
         if (borne) {
-            if (!ehBorne(i)) continue;
+            if (!ehBorne[i]) continue;
             const QString regua = campo(nomes.regua[i]);
             const QString numero = campo(nomes.numero[i]);
             texto = relacaoPrimeiro ? regua + sep + numero + sepLig + lig

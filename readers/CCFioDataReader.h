@@ -89,10 +89,11 @@ public:
     // stretch is measured between the elements it joins: those `trechos` gives, else the
     // k-th and the next of the list for the k-th stretch; an open stretch to the element
     // after its start.
-    // `elementos`: a QStringList or the loaded table's TabelaConexoes::Textos.
+    // `elementos`: a QStringList or the loaded table's TabelaConexoes::Textos. `campoFio`:
+    // what CampoFio gives for `primeiro`, when the caller has it already.
     template <class Lista>
     void CalculaComprimentos(CEItemLista* primeiro, const Lista& elementos,
-                             const Trechos* trechos = nullptr);
+                             const Trechos* trechos = nullptr, const QString* campoFio = nullptr);
     // CAMINHOFIO and PATHWIRE of each item from the routes read for its wire.
     void AplicaCaminhos(VetorItens& itens);
     // Transitions between ducts: pairs of a transition block and its partner.

@@ -274,7 +274,7 @@ void CCFioDataReader::Trechos::remove(const CEItemLista* item) {
 
 template <class Lista>
 void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const Lista& elementos,
-                                          const Trechos* trechos) {
+                                          const Trechos* trechos, const QString* campoFio) {
     if (!primeiro || elementos.isEmpty()) return;
     // The chain up to its first repeat. Most wires have a few stretches: those are looked
     // for in the chain itself, and only a long chain gets a set.
@@ -289,7 +289,7 @@ void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const Lista& el
         }
         cadeia.push_back(item);
     }
-    const QString campo = CampoFio(*primeiro);
+    const QString campo = campoFio ? *campoFio : CampoFio(*primeiro);
     if (campo.isEmpty()) return;
     const QString chave = primeiro->valorCampo(campo);
     const int n = int(elementos.size());
@@ -347,10 +347,10 @@ void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const Lista& el
     }
 }
 
-template void CCFioDataReader::CalculaComprimentos(CEItemLista*, const QStringList&,
-                                                   const Trechos*);
+template void CCFioDataReader::CalculaComprimentos(CEItemLista*, const QStringList&, const Trechos*,
+                                                   const QString*);
 template void CCFioDataReader::CalculaComprimentos(CEItemLista*, const TabelaConexoes::Textos&,
-                                                   const Trechos*);
+                                                   const Trechos*, const QString*);
 
 void CCFioDataReader::AplicaCaminhos(VetorItens& itens) {
     for (CEItemLista* item : itens) {
