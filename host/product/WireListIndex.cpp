@@ -5,6 +5,8 @@
 #include "drawing/Polyline.h"
 
 #include <algorithm>
+#include <bit>
+#include <functional>
 
 namespace zvproduct {
 
@@ -27,21 +29,27 @@ void WireListIndex::adopt(const zvdb::Database& database, std::vector<WireLine> 
 void WireListIndex::build(std::span<const WireLine> lines) {
     firsts_.clear();
     byLayer_.clear();
-    // numbers and layers as views into the drawing, which holds still while this runs
-    std::unordered_map<std::string_view, std::uint32_t> rankOf;
+    // numbers and layers as views into the drawing, which holds still while this runs; the
+    // ranks by number in an open-addressed table of rank + 1 (0 a free slot), no node a wire
+    const std::size_t mask = std::bit_ceil(std::max<std::size_t>(16, lines.size() * 2)) - 1;
+    std::vector<std::uint32_t> slots(mask + 1, 0);
+    std::vector<std::string_view> numbers;  // by wire rank
     std::vector<std::uint32_t> placesSeen;  // polylines met so far, by wire rank
     // polylines come page by page: the last layer's entries serve the next polyline
     std::string_view lastLayer;
     std::vector<OnLayer>* onLayer = nullptr;
     for (const WireLine& line : lines) {
         if (line.number.empty()) continue;  // an unnumbered wire is no wire of the lists
-        const auto [it, added] =
-            rankOf.try_emplace(line.number, static_cast<std::uint32_t>(firsts_.size()));
-        if (added) {
+        std::size_t slot = std::hash<std::string_view>{}(line.number) & mask;
+        while (slots[slot] != 0 && numbers[slots[slot] - 1] != line.number)
+            slot = (slot + 1) & mask;
+        if (slots[slot] == 0) {
+            numbers.push_back(line.number);
             firsts_.push_back(line.handle);
             placesSeen.push_back(0);
+            slots[slot] = static_cast<std::uint32_t>(numbers.size());
         }
-        const std::uint32_t wire = it->second;
+        const std::uint32_t wire = slots[slot] - 1;
         const std::uint32_t place = placesSeen[wire]++;
         if (!onLayer || line.layer != lastLayer) {
             onLayer = &byLayer_[std::string(line.layer)];
