@@ -325,6 +325,8 @@ public:
     static bool GetCircuitoLocal(const OdDbObjectId& entidade, int& numero);
     static bool GetCircuitoLocalInfo(int numero, QString& a, QString& b, QString& c);
     static OdDbObjectId IdDoHandle(const QString& handle, zvdb::Database* database = nullptr);
+    // The same for a handle as a number (0 names nothing).
+    static OdDbObjectId IdDoHandleNumero(std::uint64_t handle, zvdb::Database* database = nullptr);
 
     static int GetOrdemGrupos();
     static void SetOrdemGrupos(int ordem);

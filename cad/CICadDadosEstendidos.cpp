@@ -223,9 +223,12 @@ void CICad::SetXDataTextos(const OdDbObjectId& id, std::string_view aplicacao,
 }
 
 OdDbObjectId CICad::IdDoHandle(const QString& handle, zvdb::Database* database) {
+    return IdDoHandleNumero(ZVString(handle).ParaHandle(), database);
+}
+
+OdDbObjectId CICad::IdDoHandleNumero(std::uint64_t handle, zvdb::Database* database) {
     zvdb::Database* db = Db(database);
-    const std::uint64_t h = ZVString(handle).ParaHandle();
-    zvdb::DbObject* objeto = db && h ? db->objectByHandle(h) : nullptr;
+    zvdb::DbObject* objeto = db && handle ? db->objectByHandle(handle) : nullptr;
     return objeto && !objeto->isErased() ? Id(objeto) : OdDbObjectId();
 }
 

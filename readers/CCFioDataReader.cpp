@@ -183,17 +183,57 @@ CEItemLista* CCFioDataReader::ItemFio(const OdDbObjectId& polilinha, CETemplate*
     return item;
 }
 
+void CCFioDataReader::FioAtual::Recomeca(const QString& outro) {
+    numero = outro;
+    valido = true;
+    primeiros.clear();
+    ligacoes.clear();
+    ligacoesLidas.clear();
+    ids.clear();
+    idsLidos.clear();
+    listasLidas = false;
+    elementos.reset();
+    pontos.reset();
+    completasLidas = false;
+    completas.reset();
+}
+
 CCFioDataReader::FioAtual& CCFioDataReader::Fio(const QString& numero) {
-    if (!fio_.valido || fio_.numero != numero) {
-        fio_ = FioAtual();
-        fio_.numero = numero;
-        fio_.valido = true;
-    }
+    if (!fio_.valido || fio_.numero != numero) fio_.Recomeca(numero);
     return fio_;
 }
 
+OdDbObjectId CCFioDataReader::Elemento(const QString& numero,
+                                       const TabelaConexoes::Textos& elementos, int indice) {
+    if (indice < 0 || indice >= elementos.size()) return CICad::IdDoHandle(QString());
+    // The table read each element's handle already: no text is made for it.
+    if (!composicao_) return CICad::IdDoHandleNumero(elementos.handle(indice));
+    FioAtual& fio = Fio(numero);
+    const size_t n = size_t(elementos.size());
+    if (fio.ids.size() != n) {
+        fio.ids.assign(n, OdDbObjectId());
+        fio.idsLidos.assign(n, false);
+    }
+    const size_t i = size_t(indice);
+    if (!fio.idsLidos[i]) {
+        fio.ids[i] = CICad::IdDoHandleNumero(elementos.handle(indice));
+        fio.idsLidos[i] = true;
+    }
+    return fio.ids[i];
+}
+
 int CCFioDataReader::PrimeiroLugar(const QString& numero, int indice) {
-    const auto completas = ListaConexoesCompletas(numero);
+    std::optional<TabelaConexoes::Textos> lidas;
+    if (composicao_) {
+        FioAtual& fio = Fio(numero);
+        if (!fio.completasLidas) {
+            fio.completas = ListaConexoesCompletas(numero);
+            fio.completasLidas = true;
+        }
+    } else {
+        lidas = ListaConexoesCompletas(numero);
+    }
+    const std::optional<TabelaConexoes::Textos>& completas = composicao_ ? fio_.completas : lidas;
     if (!completas) return -1;
     const int n = int(completas->size());
     // An entry past the list's end has the empty text.
@@ -254,7 +294,7 @@ std::optional<QString> CCFioDataReader::Ligacao(const QString& numero, int indic
     const size_t i = size_t(indice);
     if (!fio.ligacoesLidas[i]) {
         const zv::CEAtributo* atributo =
-            ConexaoProxima(CICad::IdDoHandle((*elementos)[indice]), (*pontos)[i]);
+            ConexaoProxima(Elemento(numero, *elementos, indice), (*pontos)[i]);
         if (atributo) fio.ligacoes[i] = atributo->GetValor();
         fio.ligacoesLidas[i] = true;
     }
@@ -281,7 +321,7 @@ void CCFioDataReader::PreencheExtremidade(const QString& lado, CEItemLista& item
                                           CETemplate* modelo, const QString& numero) {
     static const QString kSufixoIni = QStringLiteral("_INI"), kSufixoFim = QStringLiteral("_FIM");
     const QString& sufixo = lado == kIni ? kSufixoIni : kSufixoFim;
-    CopiaEntidade(sufixo, item, CICad::IdDoHandle(elementos.value(indice)), modelo);
+    CopiaEntidade(sufixo, item, Elemento(numero, elementos, indice), modelo);
     // The wire's number comes from the walk: an element's fields copied under the suffix
     // never hold a field of the wire without one, so the item's number stays the wire's.
     LeSegmentoNoIndice(lado, item, numero, indice, modelo);
@@ -297,12 +337,13 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
         Define(progresso, 100);
         return itens;
     }
+    // The connections first: the host's walk of the drawing for them lists the wires too.
+    CarregaConexoesFios();
     // With pages the drawing is asked for the wires that have a polyline on them, so a wire
     // whose first polyline lies on another page still enters through one on a chosen page.
     const std::vector<OdDbObjectId> fios = ListaFios(paginas ? *paginas : CICad::GetLayers());
     Define(progresso, 30);
     CarregaLayout();
-    CarregaConexoesFios();
     MapeiaLayout(modelo);
     Define(progresso, 50);
 
@@ -345,7 +386,7 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
             CEItemLista* atual = item;
             trechos.acrescenta(atual, {0, -1});
             for (int i = 1; i < n; ++i) {
-                const OdDbObjectId elemento = CICad::IdDoHandle(elementos[i]);
+                const OdDbObjectId elemento = Elemento(numero, elementos, i);
                 // An element that no longer exists leaves the stretch open.
                 if (elemento.isNull()) break;
                 // A run of one equipment is one passage: the wire goes in and out of it.
@@ -365,7 +406,7 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
                 }
             }
         }
-        CalculaComprimentos(item, elementos, &trechos);
+        CalculaComprimentos(item, elementos, &trechos, &campo);
         lugares = 0;
         for (const auto& trecho : trechos)
             lugares = std::max(lugares, trecho.first->campos.size());
@@ -383,10 +424,10 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
 VetorItens* CCFioDataReader::LeAnilhas(const QHash<QString, QString>& opcoes, CETemplate* modelo,
                                        CIProgress* progresso) {
     Define(progresso, 20);
+    CarregaConexoesFios();
     const std::vector<OdDbObjectId> fios = ListaFios(CICad::GetLayers());
     Define(progresso, 40);
     CarregaLayout();
-    CarregaConexoesFios();
     MapeiaLayout(modelo);
     Define(progresso, 50);
 
@@ -445,7 +486,7 @@ VetorItens* CCFioDataReader::LeAnilhas(const QHash<QString, QString>& opcoes, CE
             }
         }
         itens->resize(destino);
-        CalculaComprimentos(item, elementos, &trechos);
+        CalculaComprimentos(item, elementos, &trechos, &campo);
     }
     for (CEItemLista* item : *itens)
         PartilhaNomes(*item);
@@ -471,16 +512,19 @@ void CCFioDataReader::LeSegmento(const QString& lado, CEItemLista& item, const Q
 
 void CCFioDataReader::LeSegmentoNoIndice(const QString& lado, CEItemLista& item,
                                          const QString& numero, int indice, CETemplate* modelo) {
-    static const QString kLayerIni = QStringLiteral("LAYER_INI"),
-                         kLayerFim = QStringLiteral("LAYER_FIM"),
-                         kSegIni = QStringLiteral("_SEGINI"), kSegFim = QStringLiteral("_SEGFIM");
+    static const QString kSegIni = QStringLiteral("_SEGINI"), kSegFim = QStringLiteral("_SEGFIM");
+    static const NomeCampo kLayerIni(QStringLiteral("LAYER_INI")),
+        kLayerFim(QStringLiteral("LAYER_FIM"));
     const bool ini = lado == kIni;
     const int lugar = PrimeiroLugar(numero, indice);
-    const auto pontos = PontosConexao(numero);
+    std::optional<TabelaConexoes::Textos> elementos;
+    std::optional<std::span<const CEPonto>> pontos;
+    Listas(numero, elementos, pontos);
     const CEPonto ponto = pontos && lugar >= 0 && size_t(lugar) < pontos->size()
                               ? (*pontos)[size_t(lugar)]
                               : CEPonto{};
-    const OdDbObjectId fio = FioNoPonto(item.valorCampo(ini ? kLayerIni : kLayerFim), ponto);
+    const QString* layer = (ini ? kLayerIni : kLayerFim).Em(item);
+    const OdDbObjectId fio = FioNoPonto(layer ? *layer : QString(), ponto);
     if (!fio.isNull()) CopiaEntidade(ini ? kSegIni : kSegFim, item, fio, modelo, &numero);
 }
 
@@ -542,12 +586,14 @@ void CCFioDataReader::ComporRelacao(const QString& s, CEItemLista& item, CETempl
         return;
     }
 
-    auto ehBorne = [&](size_t idioma) {
-        return tem(nomes.regua[idioma]) && tem(nomes.numero[idioma]);
-    };
+    // Per language, whether it names a terminal: asked again for the text below, and the
+    // fields written in between are none of these.
+    std::array<bool, 3> ehBorne{};
+    for (size_t i = 0; i < 3; ++i)
+        ehBorne[i] = tem(nomes.regua[i]) && tem(nomes.numero[i]);
     bool borne = false;
     for (size_t i = 0; i < 3 && !borne; ++i) {
-        if (!ehBorne(i)) continue;
+        if (!ehBorne[i]) continue;
         borne = true;
         define(nomes.rel, campo(nomes.regua[i]) + sep + campo(nomes.numero[i]));
     }
@@ -562,7 +608,7 @@ void CCFioDataReader::ComporRelacao(const QString& s, CEItemLista& item, CETempl
     QString texto;
     for (size_t i = 0; i < 3; ++i) {
         if (borne) {
-            if (!ehBorne(i)) continue;
+            if (!ehBorne[i]) continue;
             const QString regua = campo(nomes.regua[i]);
             const QString numero = campo(nomes.numero[i]);
             texto = relacaoPrimeiro ? regua + sep + numero + sepLig + lig

@@ -89,10 +89,11 @@ public:
     // stretch is measured between the elements it joins: those `trechos` gives, else the
     // k-th and the next of the list for the k-th stretch; an open stretch to the element
     // after its start.
-    // `elementos`: a QStringList or the loaded table's TabelaConexoes::Textos.
+    // `elementos`: a QStringList or the loaded table's TabelaConexoes::Textos. `campoFio`:
+    // what CampoFio gives for `primeiro`, when the caller has it already.
     template <class Lista>
     void CalculaComprimentos(CEItemLista* primeiro, const Lista& elementos,
-                             const Trechos* trechos = nullptr);
+                             const Trechos* trechos = nullptr, const QString* campoFio = nullptr);
     // CAMINHOFIO and PATHWIRE of each item from the routes read for its wire.
     void AplicaCaminhos(VetorItens& itens);
     // Transitions between ducts: pairs of a transition block and its partner.
@@ -135,18 +136,27 @@ private:
     std::optional<QString> LigacaoProxima(const QString& numero, const QString& elemento,
                                           int indice, const CEPonto& ponto);
 
-    // What a walk knows of the wire under work, made anew for the next wire: a wire's ends
-    // ask for the same entries, and nothing is kept for wires done.
+    // What a walk knows of the wire under work, emptied for the next wire: a wire's ends ask
+    // for the same entries, and nothing is kept for wires done but the arrays' room, which
+    // goes when the walk ends.
     struct FioAtual {
         QString numero;
         bool valido = false;
         std::vector<int> primeiros;  // per entry, the first entry of the same full text
         std::vector<std::optional<QString>> ligacoes;
         std::vector<bool> ligacoesLidas;
+        // Per entry, its element once found (an entry's two ends and its connection ask).
+        std::vector<OdDbObjectId> ids;
+        std::vector<bool> idsLidos;
         // The wire's entries and their points, looked up once.
         bool listasLidas = false;
         std::optional<TabelaConexoes::Textos> elementos;
         std::optional<std::span<const CEPonto>> pontos;
+        // Its whole texts, looked up once.
+        bool completasLidas = false;
+        std::optional<TabelaConexoes::Textos> completas;
+        // Starts on the wire `outro`: the arrays keep their room for the next wires.
+        void Recomeca(const QString& outro);
     };
     // The entries and points of the wire `numero`: in a walk, whose table stays as the walk
     // loaded it, looked up once per wire; each end asks for them several times.
@@ -154,6 +164,10 @@ private:
                 std::optional<std::span<const CEPonto>>& pontos);
     FioAtual& Fio(const QString& numero);
     FioAtual fio_;
+    // The element of the entry at `indice` of `elementos`, the entries of the wire `numero`;
+    // null when it no longer exists. In a walk each entry's is looked up once.
+    OdDbObjectId Elemento(const QString& numero, const TabelaConexoes::Textos& elementos,
+                          int indice);
     // The relation's separators and order, read once for a walk with its template.
     struct Composicao {
         QString sep, sepLig;
@@ -185,6 +199,7 @@ private:
     // the same element, and a text that is no handle names none.
     std::unordered_map<std::uint64_t, VistaLayout> vistas_;
     QHash<QString, QString> rotasLayoutFio_;  // wire key (and key + "$") to route handle
+    QSet<QString> fiosComRota_;               // the wire keys that have a route
     QHash<QString, QString> paineisLayout_;   // panel key to view handle
     QHash<QString, QString> layoutPorRelacao_;
     std::vector<std::pair<OdDbObjectId, OdDbObjectId>> transicoes_;

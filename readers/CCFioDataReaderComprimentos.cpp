@@ -10,6 +10,7 @@
 #include <cmath>
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <unordered_set>
 
 namespace {
@@ -81,8 +82,11 @@ void CCFioDataReader::CarregaLayout() {
         const QString chave = PrimeiroTexto(id, "KVR_ZV_WIRE_LAYOUT");
         if (chave.isEmpty()) continue;
         // A wire may have a second route; it is kept under the key and "$".
-        rotasLayoutFio_.insert(rotasLayoutFio_.contains(chave) ? chave + "$" : chave,
-                               ZVString::DeHandle(id.handle()));
+        const QString nome = rotasLayoutFio_.contains(chave) ? chave + "$" : chave;
+        rotasLayoutFio_.insert(nome, ZVString::DeHandle(id.handle()));
+        // ComprimentoFio looks for a wire's routes under its key and under the key and "$".
+        fiosComRota_.insert(nome);
+        if (nome.endsWith('$')) fiosComRota_.insert(nome.chopped(1));
     }
     for (const OdDbObjectId& id : EntidadesCom(kPaineis)) {
         if (!CICad::EhReferencia(id)) continue;
@@ -270,7 +274,7 @@ void CCFioDataReader::Trechos::remove(const CEItemLista* item) {
 
 template <class Lista>
 void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const Lista& elementos,
-                                          const Trechos* trechos) {
+                                          const Trechos* trechos, const QString* campoFio) {
     if (!primeiro || elementos.isEmpty()) return;
     // The chain up to its first repeat. Most wires have a few stretches: those are looked
     // for in the chain itself, and only a long chain gets a set.
@@ -285,9 +289,31 @@ void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const Lista& el
         }
         cadeia.push_back(item);
     }
-    const QString campo = CampoFio(*primeiro);
+    const QString campo = campoFio ? *campoFio : CampoFio(*primeiro);
     if (campo.isEmpty()) return;
     const QString chave = primeiro->valorCampo(campo);
+    const int n = int(elementos.size());
+    // Where the k-th stretch of the chain starts and ends; none out of the list.
+    auto trechoDe = [&](size_t k) -> std::optional<Trecho> {
+        Trecho trecho{int(k), int(k) + 1};
+        if (trechos) {
+            if (const Trecho* achado = trechos->procura(cadeia[k], k)) trecho = *achado;
+            if (trecho.fim < 0) trecho.fim = trecho.inicio + 1;
+        }
+        if (trecho.inicio < 0 || trecho.inicio >= n || trecho.fim >= n) return std::nullopt;
+        return trecho;
+    };
+    // Most wires have no route: their length is 0 wherever their ends stand in the layout.
+    CarregaLayout();
+    if (!chave.isEmpty() && !fiosComRota_.contains(chave)) {
+        static const QString kZero = ZVString::DeReal(0.0);
+        for (size_t k = 0; k < cadeia.size(); ++k) {
+            if (!trechoDe(k) || !cadeia[k]->temCampo(campo)) continue;
+            cadeia[k]->definirCampo(NumeroCampo<"LENGTH">(), kZero);
+            cadeia[k]->definirCampo(NumeroCampo<"COMPRIMENTO">(), kZero);
+        }
+        return;
+    }
     const auto pontos = PontosConexao(chave);
     auto pontoDe = [pontos](int i) {
         return pontos && size_t(i) < pontos->size() ? (*pontos)[size_t(i)] : CEPonto{};
@@ -298,15 +324,11 @@ void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const Lista& el
         const QString handle = layoutPorRelacao_.value(relacao);
         if (!handle.isEmpty()) PosicaoLayout(handle, conexao, ponto);
     };
-    const int n = int(elementos.size());
     for (size_t k = 0; k < cadeia.size(); ++k) {
         CEItemLista& item = *cadeia[k];
-        Trecho trecho{int(k), int(k) + 1};
-        if (trechos) {
-            if (const Trecho* achado = trechos->procura(&item, k)) trecho = *achado;
-            if (trecho.fim < 0) trecho.fim = trecho.inicio + 1;
-        }
-        if (trecho.inicio < 0 || trecho.inicio >= n || trecho.fim >= n) continue;
+        const std::optional<Trecho> achado = trechoDe(k);
+        if (!achado) continue;
+        const Trecho trecho = *achado;
         const QString& a1 = elementos[trecho.inicio];
         const QString& a2 = elementos[trecho.fim];
         const QString r1 =
@@ -314,23 +336,21 @@ void CCFioDataReader::CalculaComprimentos(CEItemLista* primeiro, const Lista& el
         const QString r2 =
             LigacaoProxima(chave, a2, trecho.fim, pontoDe(trecho.fim)).value_or(QString());
         static const QString kRelIni = QStringLiteral("REL_INI"),
-                             kRelFim = QStringLiteral("REL_FIM"),
-                             kLength = QStringLiteral("LENGTH"),
-                             kComprimento = QStringLiteral("COMPRIMENTO");
+                             kRelFim = QStringLiteral("REL_FIM");
         CEPonto inicio, fim;
         posicao(a1, r1, item.valorCampo(kRelIni), inicio);
         posicao(a2, r2, item.valorCampo(kRelFim), fim);
         if (!item.temCampo(campo)) continue;
         const QString comprimento = ComprimentoFio(chave, inicio, fim);
-        item.definirCampo(kLength, comprimento);
-        item.definirCampo(kComprimento, comprimento);
+        item.definirCampo(NumeroCampo<"LENGTH">(), comprimento);
+        item.definirCampo(NumeroCampo<"COMPRIMENTO">(), comprimento);
     }
 }
 
-template void CCFioDataReader::CalculaComprimentos(CEItemLista*, const QStringList&,
-                                                   const Trechos*);
+template void CCFioDataReader::CalculaComprimentos(CEItemLista*, const QStringList&, const Trechos*,
+                                                   const QString*);
 template void CCFioDataReader::CalculaComprimentos(CEItemLista*, const TabelaConexoes::Textos&,
-                                                   const Trechos*);
+                                                   const Trechos*, const QString*);
 
 void CCFioDataReader::AplicaCaminhos(VetorItens& itens) {
     for (CEItemLista* item : itens) {

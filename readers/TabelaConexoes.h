@@ -32,6 +32,9 @@ public:
         QString value(int i) const;
         QString at(int i) const { return value(i); }
         QString operator[](int i) const { return value(i); }
+        // The handle the element's text names, as a number (ZVString::ParaHandle); 0 out of
+        // range. No text is made for it.
+        std::uint64_t handle(int i) const;
         int indexOf(QStringView texto) const;
         bool contains(QStringView texto) const { return indexOf(texto) >= 0; }
         QStringList ParaLista() const;
@@ -113,6 +116,10 @@ private:
     static std::size_t Espalha(std::uint32_t hash, std::size_t mascara);
     std::vector<Vaga> indice_;  // a power of two long
 };
+
+inline std::uint64_t TabelaConexoes::Textos::handle(int i) const {
+    return i < 0 || i >= total_ ? 0 : tabela_->handles_[primeiro_ + std::size_t(i)];
+}
 
 inline QStringView TabelaConexoes::Textos::vista(int i) const {
     if (i < 0 || i >= total_) return {};

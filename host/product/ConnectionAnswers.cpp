@@ -19,6 +19,7 @@ auto ConnectionAnswers::withFinder(zvdb::Database& database, double tolerance, b
         finder = std::make_unique<ConnectionFinder>(database, tolerance);
         if (!wireLayers_.current(database))
             wireLayers_.adopt(database, finder->wiresAndLeadsByLayer());
+        if (!wireList_.current(database)) wireList_.adopt(database, finder->wireLinesInPageOrder());
     }
     auto asked = ask(*finder);
     if (fresh && keepOther) {

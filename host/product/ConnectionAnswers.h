@@ -9,6 +9,7 @@
 #include "ConnectionFinder.h"
 #include "DrawingStamp.h"
 #include "WireLayerIndex.h"
+#include "WireListIndex.h"
 
 #include <memory>
 #include <string>
@@ -53,6 +54,9 @@ public:
     // The wire and lead polylines by layer (getFiosPorLayer): an index walks the same
     // drawing, so each new one hands them over as it stands.
     WireLayerIndex& wireLayers() { return wireLayers_; }
+    // The numbered wires in page order (getListaFios, getListaFiosProj), handed over the
+    // same way: a reader loads the connections before it lists the wires.
+    WireListIndex& wireList() { return wireList_; }
 
 private:
     // `ask(finder)` from the kept index or a new one, which is kept after for `keepOther`.
@@ -64,6 +68,7 @@ private:
     double tolerance_ = 0;
     std::unique_ptr<ConnectionFinder> kept_;
     WireLayerIndex wireLayers_;
+    WireListIndex wireList_;
 };
 
 }  // namespace zvproduct

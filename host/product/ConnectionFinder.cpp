@@ -303,6 +303,17 @@ std::unordered_map<std::string, std::vector<std::uint64_t>> ConnectionFinder::wi
     return byLayer;
 }
 
+std::vector<WireLine> ConnectionFinder::wireLinesInPageOrder() const {
+    std::vector<std::string_view> names(layers_.size());
+    for (const auto& [name, id] : layers_)
+        names[static_cast<std::size_t>(id)] = name;
+    std::vector<WireLine> lines;
+    lines.reserve(wireLines_.size());
+    for (const Line& line : wireLines_)
+        lines.push_back({line.handle, line.number, names[static_cast<std::size_t>(line.layer)]});
+    return lines;
+}
+
 std::int32_t ConnectionFinder::layerId(std::string_view layer) {
     if (lastLayerId_ >= 0 && layer == lastLayer_) return lastLayerId_;
     lastLayer_ = layer;

@@ -39,6 +39,14 @@ struct WireConnections {
 // The same answer in a few arrays: wire w's touches are touches[ends[w - 1]] (0 for the
 // first wire) to touches[ends[w]]. The numbers are views into the drawing's storage, or
 // into `owned` (a cable's number is made of two texts): a table is moved, not copied.
+// A wire polyline with its number (empty when it has none) and its layer: views into the
+// drawing's storage.
+struct WireLine {
+    std::uint64_t handle = 0;
+    std::string_view number, layer;
+    bool operator==(const WireLine&) const = default;
+};
+
 struct ConnectionTable {
     std::vector<std::string_view> numbers;
     std::vector<std::uint32_t> ends;
@@ -62,6 +70,9 @@ public:
     // The wire and lead polylines (KVR_ZV_WIRE or KVR_ZV_CABO) of each layer, each once, in
     // handle order: what the walk above saw, for those who ask by layer.
     std::unordered_map<std::string, std::vector<std::uint64_t>> wiresAndLeadsByLayer() const;
+    // The KVR_ZV_WIRE polylines as polylinesInPageOrder gives them, with their numbers as
+    // wireNumber reads them: what the walk above saw, for the lists of wires.
+    std::vector<WireLine> wireLinesInPageOrder() const;
 
     // The wire number of a KVR_ZV_WIRE polyline (FIO, WIRE, ALAMBRE or CABO item); empty. A
     // view into the drawing's storage.

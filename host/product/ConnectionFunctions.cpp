@@ -116,18 +116,18 @@ void installConnectionFunctions(Interpreter& lisp, const ProductContext& context
             return handleTexts(answers->wireLayers().polylinesOn(database, stdText(in, a[0])));
         },
         1, 1);
-    // The wire reader, the ferrule reader and the material list ask in turn: one index.
-    auto wires = std::make_shared<WireListIndex>();
-    lisp.define("getListaFios", [context, wires](Interpreter& in, Args a) {
+    // The wire reader, the ferrule reader and the material list ask in turn: one index, which
+    // the connection answers' index hands over when it walked the drawing as it stands.
+    lisp.define("getListaFios", [context, answers](Interpreter& in, Args a) {
         zvdb::Database& database = databaseOf(in, context);
         zvlisp::ListBuilder list;
-        for (std::uint64_t handle : wires->firstPolylines(database, layerNames(a, 0)))
+        for (std::uint64_t handle : answers->wireList().firstPolylines(database, layerNames(a, 0)))
             list.add(ename(database, handle));
         return list.take();
     });
-    lisp.define("getListaFiosProj", [context, wires](Interpreter& in, Args a) {
+    lisp.define("getListaFiosProj", [context, answers](Interpreter& in, Args a) {
         zvdb::Database& database = databaseOf(in, context);
-        return handleTexts(wires->firstPolylines(database, layerNames(a, 1)));
+        return handleTexts(answers->wireList().firstPolylines(database, layerNames(a, 1)));
     });
 }
 

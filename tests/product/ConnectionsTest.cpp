@@ -4,6 +4,7 @@
 #include "product/ConnectionAnswers.h"
 #include "product/ConnectionFinder.h"
 #include "product/WireLayerIndex.h"
+#include "product/WireListIndex.h"
 
 #include "drawing/DxfLoader.h"
 #include "drawing/DxfWriter.h"
@@ -356,6 +357,64 @@ TEST_F(ConnectionsTest, TheWiresByLayerThatAnIndexHandsOverAreThoseOfAWalkOfThei
               (std::vector<std::uint64_t>{lower->handle()}));
     EXPECT_EQ(answers.wireLayers().polylinesOn(*database, "ESQ$0001$A").size(), 1u);
     compare();
+}
+
+TEST_F(ConnectionsTest, TheWireListThatAnIndexHandsOverIsThatOfAWalkOfItsOwn) {
+    auto* late = wire("ESQ$0002$A", {{0, 0, 0}, {10, 0, 0}}, "701");
+    auto* off = wire("OFF", {{0, 0, 0}, {10, 0, 0}}, "702");
+    auto* early = wire("ESQ$0001$A", {{0, 0, 0}, {10, 0, 0}}, "701");
+    wire("ESQ$0001$A", {{0, 5, 0}, {10, 5, 0}}, "");  // no number
+    auto* lower =
+        database->modelSpace()->addLwPolyline({{0, 9, 0}, {9, 9, 0}}, false, "ESQ$0002$A");
+    // the application named in another case, the number as its third item
+    lower->setXData("kvr_zv_wire",
+                    zvsample::XDataItems().text("10006\f1").text("1").text("FIO\f703").tags());
+    auto* lead = database->modelSpace()->addLwPolyline({{0, 1, 0}, {9, 1, 0}}, false, "ESQ$0001$A");
+    lead->setXData("KVR_ZV_CABO", zvsample::XDataItems().text("20001\f1").tags());
+    auto* onPage = wire("ESQ$0002$A", {{0, 7, 0}, {10, 7, 0}}, "702");
+    terminal("ESQ$0001$A", {0, 0, 0}, "X1", "1");
+
+    // What the finder saw is what the walk of the lists sees.
+    const ConnectionFinder finder(*database, 0.1);
+    std::vector<WireLine> walked;
+    for (zvdb::Polyline* line : ConnectionFinder::polylinesInPageOrder(*database, "KVR_ZV_WIRE"))
+        walked.push_back({line->handle(), ConnectionFinder::wireNumber(*line), line->layer()});
+    EXPECT_EQ(finder.wireLinesInPageOrder(), walked);
+    ASSERT_EQ(walked.size(), 6u);
+    EXPECT_EQ(walked.front().handle, early->handle());
+
+    const std::vector<std::unordered_set<std::string>> asked = {
+        {}, {"ESQ$0001$A"}, {"ESQ$0002$A"}, {"OFF", "ESQ$0002$A"}, {"NONE"}, {"esq$0001$a"}};
+    const auto compare = [&] {
+        ConnectionAnswers answers;
+        answers.table(*database, 0.1, ConnectionAnswers::Kind::Wires);
+        // Handed over by the index, not walked again.
+        ASSERT_TRUE(answers.wireList().current(*database));
+        for (const auto& layers : asked) {
+            WireListIndex own;
+            EXPECT_EQ(answers.wireList().firstPolylines(*database, layers),
+                      own.firstPolylines(*database, layers))
+                << layers.size();
+        }
+    };
+    compare();
+    ConnectionAnswers answers;
+    answers.answer(*database, 0.1, ConnectionAnswers::Kind::Cables);
+    EXPECT_EQ(answers.wireList().firstPolylines(*database, {}),
+              (std::vector<std::uint64_t>{early->handle(), lower->handle(), onPage->handle()}));
+    EXPECT_EQ(answers.wireList().firstPolylines(*database, {"ESQ$0002$A"}).front(), late->handle());
+    // A change since: the next question walks the drawing as it stands.
+    early->erase();
+    EXPECT_FALSE(answers.wireList().current(*database));
+    EXPECT_EQ(answers.wireList().firstPolylines(*database, {}).front(), late->handle());
+    compare();
+    // The LISP functions share the index their connection answer handed over.
+    const std::string all =
+        "(\"" + hex(late) + "\" \"" + hex(lower) + "\" \"" + hex(onPage) + "\")";
+    EXPECT_EQ(show("(getListaFiosProj \"proj.dxf\" nil)"), all);
+    show("(getConexoesTodosFios)");
+    EXPECT_EQ(show("(getListaFiosProj \"proj.dxf\" nil)"), all);
+    EXPECT_EQ(show("(getListaFiosProj \"proj.dxf\" \"OFF\")"), "(\"" + hex(off) + "\")");
 }
 
 TEST_F(ConnectionsTest, WireListsOfLayersOffThePagesWhosePolylinesAlternate) {

@@ -3,9 +3,11 @@
 // answers the host gives without their chains.
 #include "cad/CICad.h"
 #include "cad/FacadeFixture.h"
+#include "drawing/Polyline.h"
 #include "readers/CCBorneDataReader.h"
 #include "readers/LeitorBase.h"
 #include "readers/TabelaConexoes.h"
+#include "readers/ZVString.h"
 #include "sample/ProjectGenerator.h"
 #include "sdk/NodeChains.h"
 
@@ -35,6 +37,37 @@ TEST_F(ConnectionLoadTest, EntriesGiveTheirHandleTheirWholeTextAndTheirPoint) {
     // a cable's entries go whole into the handle list
     EXPECT_EQ(leitor.ListaConexoes("W1")->ParaLista(), QStringList({"3C#K"}));
     EXPECT_EQ(leitor.PontoDaConexao("W1", "3C#K").x, 1.0);
+}
+
+TEST_F(ConnectionLoadTest, AnEntrysHandleIsTheNumberItsElementsTextNamesAndFindsItsObject) {
+    auto* linha = db().modelSpace()->addLwPolyline({{0, 0, 0}, {1, 0, 0}}, false, "0");
+    auto* apagada = db().modelSpace()->addLwPolyline({{0, 1, 0}, {1, 1, 0}}, false, "0");
+    apagada->erase();
+    const QString existe = QString::number(linha->handle(), 16).toUpper();
+    const QString foi = QString::number(apagada->handle(), 16);
+    CICad::AvaliaLisp(QString("(defun getConexoesTodosFios () '((\"7\" (\"%1#13#NA-1\" 1.0 2.0)"
+                              " (\"%2\" 4.0 5.0) (\" 1A\" 1.0 1.0) (\"XYZ#1\" 6.0 7.0)"
+                              " (\"#X#Y\" 6.0 7.0))))")
+                          .arg(existe, foi));
+    LeitorBase leitor;
+    leitor.CarregaConexoesFios();
+    const auto elementos = leitor.ListaConexoes("7");
+    ASSERT_TRUE(elementos);
+    ASSERT_EQ(elementos->size(), 5);
+    for (int i = 0; i < elementos->size(); ++i)
+        EXPECT_EQ(elementos->handle(i), ZVString(elementos->value(i)).ParaHandle()) << i;
+    EXPECT_EQ(elementos->handle(0), linha->handle());
+    EXPECT_EQ(elementos->handle(2), 0x1Au);  // read the long way, as the text would be
+    EXPECT_EQ(elementos->handle(5), 0u);
+    EXPECT_EQ(elementos->handle(-1), 0u);
+    // The object of a number as that of its text: none for 0 or an erased one.
+    for (int i = 0; i < elementos->size(); ++i)
+        EXPECT_EQ(CICad::IdDoHandleNumero(elementos->handle(i)),
+                  CICad::IdDoHandle(elementos->value(i)))
+            << i;
+    EXPECT_EQ(CICad::IdDoHandleNumero(linha->handle()).handle(), linha->handle());
+    EXPECT_TRUE(CICad::IdDoHandleNumero(apagada->handle()).isNull());
+    EXPECT_TRUE(CICad::IdDoHandleNumero(0).isNull());
 }
 
 TEST_F(ConnectionLoadTest, TheTerminalReaderKeepsHandlesAndPointsButNotTheWholeTexts) {

@@ -100,6 +100,17 @@ TEST_F(WireLengthTest, AWireWithoutARouteIsZeroAndOneWithoutEndsHasNoLength) {
     EXPECT_EQ(c.value("13"), "");
 }
 
+TEST_F(WireLengthTest, AWireWhoseOnlyRouteIsKeptAsItsSecondIsMeasuredBesideOneWithout) {
+    fio({{20, 150, 0}, {20, 100, 0}}, "12");
+    fio({{20, 170, 0}, {60, 170, 0}, {60, 100, 0}}, "13");
+    // A route whose own key ends in "$" is found as the second route of "12".
+    rota({{100, 190, 0}, {100, -10, 0}, {900, -10, 0}}, "12$");
+    rota({{0, 0, 0}, {10, 0, 0}}, "99");
+    const QHash<QString, QString> c = comprimentos();
+    EXPECT_EQ(c.value("12"), "1150.000000");
+    EXPECT_EQ(c.value("13"), "0.000000");
+}
+
 TEST_F(WireLengthTest, ARouteFartherThan999FromBothEndsGivesZero) {
     fio({{20, 150, 0}, {20, 100, 0}}, "12");
     rota({{5000, 5000, 0}, {6000, 5000, 0}}, "12");
