@@ -944,10 +944,20 @@ void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const
     }
     const std::vector<std::uint32_t>& nomes = poeQtd ? com.nomesQtd : com.nomes;
     const std::vector<std::uint32_t>& lugares = poeQtd ? com.lugaresQtd : com.lugares;
-    const std::vector<QString>& valores = lida.valores;
-    item.campos.juntarOrdenados(
-        nomes.size(), [&nomes](size_t j) { return nomes[j]; },
-        [&lugares, &valores](size_t j) -> const QString& { return valores[lugares[j]]; });
+    const auto nome = [&nomes](size_t j) { return nomes[j]; };
+    if (&lida == &avulsa_) {
+        // A reading kept for no other copy gives its values up: no count is raised, nor the
+        // values' texts visited.
+        std::vector<QString>& soltos = avulsa_.valores;
+        item.campos.juntarOrdenados(nomes.size(), nome, [&lugares, &soltos](size_t j) -> QString&& {
+            return std::move(soltos[lugares[j]]);
+        });
+    } else {
+        const std::vector<QString>& valores = lida.valores;
+        item.campos.juntarOrdenados(
+            nomes.size(), nome,
+            [&lugares, &valores](size_t j) -> const QString& { return valores[lugares[j]]; });
+    }
     if (rotas && numeroFio)
         LeRotasFio(*numeroFio, modelo);
     else if (rotas)

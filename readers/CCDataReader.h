@@ -273,7 +273,7 @@ private:
     // many again.
     std::size_t limiteLidas_ = SIZE_MAX;
     // The entity's kept reading, read now when none is kept; a wire's or terminal's reading
-    // that is not to be kept waits in `avulsa_` for the copy that asked.
+    // that is not to be kept waits in `avulsa_` for the copy that asked, which takes its values.
     const EntidadeLida& EntidadeGuardada(const OdDbObjectId& id, CETemplate* modelo);
     EntidadeLida avulsa_;
     // The entity read apart into the form CopiaEntidade keeps.
