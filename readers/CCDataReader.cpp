@@ -798,6 +798,9 @@ size_t CCDataReader::HashNomes::operator()(const std::vector<std::uint32_t>& nom
 }
 
 CCDataReader::FormaCampos::ComSufixo& CCDataReader::FormaCampos::Com(const QString& sufixo) {
+    // The callers pass the same few texts again and again: the same text is known at once.
+    for (ComSufixo& feito : sufixos)
+        if (feito.sufixo.isSharedWith(sufixo)) return feito;
     for (ComSufixo& feito : sufixos)
         if (feito.sufixo == sufixo) return feito;
     // The names under the suffix enter the name table in the order of the plain names, as
