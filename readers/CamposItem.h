@@ -123,13 +123,17 @@ private:
 
 template <class Nome, class Valor>
 void CamposItem::juntarOrdenados(std::size_t n, Nome nome, Valor valor) {
-    if (campos_.empty()) {
-        campos_.reserve(n);
+    if (n == 0) return;
+    if (campos_.empty() || campos_.back().nome < nome(0)) {
+        // The batch's names all come after the fields there are (a first merge, or fields of
+        // names numbered later, as a suffix's are): appended, each value made in its place.
+        // The room grows as a resize would make it.
+        const std::size_t tamanho = campos_.size();
+        if (campos_.capacity() < tamanho + n) campos_.reserve(tamanho + std::max(tamanho, n));
         for (std::size_t j = 0; j < n; ++j)
-            campos_.push_back(Campo{nome(j), valor(j)});
+            campos_.emplace_back(nome(j), valor(j));
         return;
     }
-    if (n == 0) return;
     // Both are sorted: one merge in place from the back, the batch winning on equal names,
     // after counting the names both hold from the batch's first name on (the fields before
     // it stay where they are).
