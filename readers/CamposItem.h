@@ -111,10 +111,15 @@ public:
     static std::size_t quantidadeNomes();
     // The number of the name followed by the suffix: readers copy the fields of one entity
     // under a few suffixes into many items, and the joined names are made once.
-    static std::uint32_t numeroComSufixo(std::uint32_t numero, const QString& sufixo);
+    static std::uint32_t numeroComSufixo(std::uint32_t numero, const QString& sufixo) {
+        // Most callers pass none: answered here, without a call.
+        return sufixo.isEmpty() ? numero : numeroComSufixoNaoVazio(numero, sufixo);
+    }
 
 private:
     std::vector<Campo>::const_iterator lugar(std::uint32_t numero) const;
+    // numeroComSufixo for a suffix that is not empty.
+    static std::uint32_t numeroComSufixoNaoVazio(std::uint32_t numero, const QString& sufixo);
     static std::uint32_t numeroNoSufixo(std::vector<std::uint32_t>& numeros, std::uint32_t numero,
                                         const QString& sufixo);
 
