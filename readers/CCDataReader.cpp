@@ -798,6 +798,9 @@ size_t CCDataReader::HashNomes::operator()(const std::vector<std::uint32_t>& nom
 }
 
 CCDataReader::FormaCampos::ComSufixo& CCDataReader::FormaCampos::Com(const QString& sufixo) {
+    // The callers pass the same few texts again and again: the same text is known at once.
+    for (ComSufixo& feito : sufixos)
+        if (feito.sufixo.isSharedWith(sufixo)) return feito;
     for (ComSufixo& feito : sufixos)
         if (feito.sufixo == sufixo) return feito;
     // The names under the suffix enter the name table in the order of the plain names, as
@@ -944,10 +947,20 @@ void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const
     }
     const std::vector<std::uint32_t>& nomes = poeQtd ? com.nomesQtd : com.nomes;
     const std::vector<std::uint32_t>& lugares = poeQtd ? com.lugaresQtd : com.lugares;
-    const std::vector<QString>& valores = lida.valores;
-    item.campos.juntarOrdenados(
-        nomes.size(), [&nomes](size_t j) { return nomes[j]; },
-        [&lugares, &valores](size_t j) -> const QString& { return valores[lugares[j]]; });
+    const auto nome = [&nomes](size_t j) { return nomes[j]; };
+    if (&lida == &avulsa_) {
+        // A reading kept for no other copy gives its values up: no count is raised, nor the
+        // values' texts visited.
+        std::vector<QString>& soltos = avulsa_.valores;
+        item.campos.juntarOrdenados(nomes.size(), nome, [&lugares, &soltos](size_t j) -> QString&& {
+            return std::move(soltos[lugares[j]]);
+        });
+    } else {
+        const std::vector<QString>& valores = lida.valores;
+        item.campos.juntarOrdenados(
+            nomes.size(), nome,
+            [&lugares, &valores](size_t j) -> const QString& { return valores[lugares[j]]; });
+    }
     if (rotas && numeroFio)
         LeRotasFio(*numeroFio, modelo);
     else if (rotas)

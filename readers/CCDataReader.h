@@ -3,6 +3,7 @@
 // it, kept in maps for one run, with point and neighbour queries on it; and the building of
 // items from drawing entities, their attributes, extended data and catalogue data.
 #include "CEAtributo.h"
+#include "TabelaChaves.h"
 #include "TabelaConexoes.h"
 #include "TabelaIds.h"
 #include "VetorItens.h"
@@ -272,7 +273,7 @@ private:
     // many again.
     std::size_t limiteLidas_ = SIZE_MAX;
     // The entity's kept reading, read now when none is kept; a wire's or terminal's reading
-    // that is not to be kept waits in `avulsa_` for the copy that asked.
+    // that is not to be kept waits in `avulsa_` for the copy that asked, which takes its values.
     const EntidadeLida& EntidadeGuardada(const OdDbObjectId& id, CETemplate* modelo);
     EntidadeLida avulsa_;
     // The entity read apart into the form CopiaEntidade keeps.
@@ -410,11 +411,15 @@ private:
         bool ligacao;
         QString texto;
     };
-    mutable PorTexto<TagLida> tags_;
+    // By the drawing's text: every attribute of every symbol read asks both, and a node
+    // map would cost a few cache misses more per attribute.
+    template <class Valor>
+    using TabelaTextos = TabelaChaves<std::string, Valor, std::string_view>;
+    mutable TabelaTextos<TagLida> tags_;
     TagLida& TagDoTexto(std::string_view tag) const;
     // Attribute values, trimmed, by their text in the drawing: symbols repeat theirs, and
     // their items share one text.
-    mutable PorTexto<QString> valores_;
+    mutable TabelaTextos<QString> valores_;
     const QString& ValorDoTexto(std::string_view valor) const;
     // The key text of an entity as ChaveENorma reads it; semChave_ without one.
     const ChaveLida& ChaveDaEntidadeLida(const OdDbObjectId& entidade) const;

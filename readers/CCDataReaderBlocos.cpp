@@ -90,23 +90,20 @@ const std::pair<QString, QString>& CCDataReader::ListaDescricaoFioDe(const Chave
 }
 
 CCDataReader::TagLida& CCDataReader::TagDoTexto(std::string_view tag) const {
-    auto it = tags_.find(tag);
-    if (it != tags_.end()) return it->second;
     Limita(tags_);
-    const QString texto = Texto(tag).trimmed();
-    const QString maiusculas = texto.toUpper();
-    const bool ligacao = std::any_of(
-        std::begin(kPalavrasConexao), std::end(kPalavrasConexao),
-        [&maiusculas](QLatin1String palavra) { return maiusculas.startsWith(palavra); });
-    return tags_.emplace(std::string(tag), TagLida{CamposItem::kSemNome, ligacao, texto})
-        .first->second;
+    return tags_.obtem(tag, [tag] {
+        QString texto = Texto(tag).trimmed();
+        const QString maiusculas = texto.toUpper();
+        const bool ligacao = std::any_of(
+            std::begin(kPalavrasConexao), std::end(kPalavrasConexao),
+            [&maiusculas](QLatin1String palavra) { return maiusculas.startsWith(palavra); });
+        return TagLida{CamposItem::kSemNome, ligacao, std::move(texto)};
+    });
 }
 
 const QString& CCDataReader::ValorDoTexto(std::string_view valor) const {
-    auto it = valores_.find(valor);
-    if (it != valores_.end()) return it->second;
     Limita(valores_);
-    return valores_.emplace(std::string(valor), Texto(valor).trimmed()).first->second;
+    return valores_.obtem(valor, [valor] { return Texto(valor).trimmed(); });
 }
 
 const CCDataReader::LayerLido& CCDataReader::LayerDoNome(std::string_view nome) const {

@@ -99,8 +99,8 @@ std::uint32_t CamposItem::numeroNoSufixo(std::vector<std::uint32_t>& numeros, st
     return numeros[numero];
 }
 
-std::uint32_t CamposItem::numeroComSufixo(std::uint32_t numero, const QString& sufixo) {
-    return sufixo.isEmpty() ? numero : numeroNoSufixo(Tabela().numerosCom(sufixo), numero, sufixo);
+std::uint32_t CamposItem::numeroComSufixoNaoVazio(std::uint32_t numero, const QString& sufixo) {
+    return numeroNoSufixo(Tabela().numerosCom(sufixo), numero, sufixo);
 }
 
 const QString* CamposItem::procura(std::uint32_t numero) const {

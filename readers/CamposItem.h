@@ -111,10 +111,15 @@ public:
     static std::size_t quantidadeNomes();
     // The number of the name followed by the suffix: readers copy the fields of one entity
     // under a few suffixes into many items, and the joined names are made once.
-    static std::uint32_t numeroComSufixo(std::uint32_t numero, const QString& sufixo);
+    static std::uint32_t numeroComSufixo(std::uint32_t numero, const QString& sufixo) {
+        // Most callers pass none: answered here, without a call.
+        return sufixo.isEmpty() ? numero : numeroComSufixoNaoVazio(numero, sufixo);
+    }
 
 private:
     std::vector<Campo>::const_iterator lugar(std::uint32_t numero) const;
+    // numeroComSufixo for a suffix that is not empty.
+    static std::uint32_t numeroComSufixoNaoVazio(std::uint32_t numero, const QString& sufixo);
     static std::uint32_t numeroNoSufixo(std::vector<std::uint32_t>& numeros, std::uint32_t numero,
                                         const QString& sufixo);
 
@@ -123,13 +128,17 @@ private:
 
 template <class Nome, class Valor>
 void CamposItem::juntarOrdenados(std::size_t n, Nome nome, Valor valor) {
-    if (campos_.empty()) {
-        campos_.reserve(n);
+    if (n == 0) return;
+    if (campos_.empty() || campos_.back().nome < nome(0)) {
+        // The batch's names all come after the fields there are (a first merge, or fields of
+        // names numbered later, as a suffix's are): appended, each value made in its place.
+        // The room grows as a resize would make it.
+        const std::size_t tamanho = campos_.size();
+        if (campos_.capacity() < tamanho + n) campos_.reserve(tamanho + std::max(tamanho, n));
         for (std::size_t j = 0; j < n; ++j)
-            campos_.push_back(Campo{nome(j), valor(j)});
+            campos_.emplace_back(nome(j), valor(j));
         return;
     }
-    if (n == 0) return;
     // Both are sorted: one merge in place from the back, the batch winning on equal names,
     // after counting the names both hold from the batch's first name on (the fields before
     // it stay where they are).

@@ -236,3 +236,48 @@ TEST_F(BlockReadingTest, ALaterFieldOfANameWinsForSymbolsOfAnyOrderOfNames) {
         EXPECT_EQ(copia.campos.values(), lido.campos.values());
     }
 }
+
+namespace {
+
+// A reader that keeps no terminal's reading, as the strip's and the wires' sides do.
+class LeitorSemBornes : public LeitorBase {
+public:
+    LeitorSemBornes() { GuardaBornes = false; }
+};
+
+}  // namespace
+
+// A terminal's reading that is not kept goes into the item that asked for it; the next copy
+// of the same terminal reads it again and gets every value as well.
+TEST_F(BlockReadingTest, ATerminalReadForOneCopyGivesEachCopyTheWholeReading) {
+    const OdDbObjectId x1 =
+        Simbolo("BORNE-1", "A1", "ESQ$0001$A", {{"REGUA", "X1"}, {"NUMERO", "5"}, {"QTD", "2"}}, 0);
+    const OdDbObjectId x2 =
+        Simbolo("BORNE-1", "A1", "ESQ$0001$A", {{"REGUA", "X1"}, {"NUMERO", "6"}}, 10);
+    LeitorBase direto;
+    LeitorSemBornes leitor;
+    for (const QString& sufixo : {QString(), QStringLiteral("_INI"), QStringLiteral("_INI")}) {
+        for (const OdDbObjectId& id : {x1, x2, x1}) {
+            const CEItemLista lido = Le(direto, id);
+            CEItemLista copia, outra;
+            leitor.CopiaEntidade(sufixo, copia, id, nullptr);
+            EXPECT_FALSE(leitor.LeituraGuardada(id));
+            leitor.CopiaEntidade(sufixo, outra, id, nullptr);
+            ASSERT_EQ(copia.campos.size(), lido.campos.size());
+            EXPECT_EQ(outra.campos.values(), copia.campos.values());
+            EXPECT_EQ(outra.campos.keys(), copia.campos.keys());
+            for (auto it = lido.campos.begin(); it != lido.campos.end(); ++it)
+                EXPECT_EQ(copia.valorCampo(it.key() + sufixo), it.value())
+                    << it.key().toStdString();
+        }
+    }
+    // Joined to an item with fields of its own, the copy wins on its names and leaves the rest.
+    CEItemLista item;
+    item.definirCampo(QStringLiteral("NUMERO"), QStringLiteral("antes"));
+    item.definirCampo(QStringLiteral("ZZ_PROPRIO"), QStringLiteral("meu"));
+    leitor.CopiaEntidade(QString(), item, x2, nullptr);
+    EXPECT_EQ(item.valorCampo("NUMERO"), "6");
+    EXPECT_EQ(item.valorCampo("ZZ_PROPRIO"), "meu");
+    EXPECT_EQ(item.valorCampo("QTD"), "1");
+    EXPECT_EQ(item.valorCampo("REGUA"), "X1");
+}

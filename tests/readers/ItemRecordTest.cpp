@@ -12,7 +12,9 @@
 #include <algorithm>
 #include <cstdint>
 #include <cstdio>
+#include <map>
 #include <memory>
+#include <random>
 #include <vector>
 
 namespace {
@@ -290,6 +292,59 @@ TEST(ItemRecordTest, ABatchOfNamesAndValuesKeptApartMergesInPlace) {
     EXPECT_EQ(item.campos.size(), 6);
     for (std::size_t i = 1; i < item.campos.todos().size(); ++i)
         EXPECT_LT(item.campos.todos()[i - 1].nome, item.campos.todos()[i].nome);
+}
+
+// Batches merged one after another, some with names all after the item's (appended), some
+// among them, some starting at the item's last name, given by copy or handed over: the item
+// follows a map in which the batch's values win, in name order.
+TEST(ItemRecordTest, BatchesAfterAmongAndOnTheItemsNamesMergeAsAMapWould) {
+    std::vector<std::uint32_t> nomes;
+    for (int i = 0; i < 40; ++i)
+        nomes.push_back(CamposItem::numero(QString("JUNTA_%1").arg(i)));
+    std::sort(nomes.begin(), nomes.end());
+    std::mt19937 sorteio(3);
+    for (int rodada = 0; rodada < 300; ++rodada) {
+        CEItemLista item;
+        std::map<std::uint32_t, QString> ref;
+        const int inicio = int(sorteio() % 10);
+        for (int i = 0; i < inicio; ++i) {
+            const std::uint32_t nome = nomes[sorteio() % 20];
+            item.definirCampo(nome, "i" + QString::number(i));
+            ref[nome] = "i" + QString::number(i);
+        }
+        for (int lote = 0; lote < 4; ++lote) {
+            // From the item's last name on, from past it, or from anywhere.
+            const std::uint32_t ultimo = ref.empty() ? 0 : ref.rbegin()->first;
+            const auto depois = std::upper_bound(nomes.begin(), nomes.end(), ultimo);
+            const auto noUltimo = std::lower_bound(nomes.begin(), nomes.end(), ultimo);
+            const auto desde = lote % 3 == 0 ? nomes.begin() : lote % 3 == 1 ? depois : noUltimo;
+            std::vector<std::uint32_t> escolhidos;
+            for (auto it = desde; it != nomes.end(); ++it)
+                if (sorteio() % 3 == 0 || it == desde) escolhidos.push_back(*it);
+            if (desde == nomes.end()) escolhidos.clear();
+            std::vector<QString> valores;
+            for (const std::uint32_t nome : escolhidos) {
+                valores.push_back(QString("r%1l%2n%3").arg(rodada).arg(lote).arg(nome));
+                ref[nome] = valores.back();
+            }
+            const auto nome = [&](std::size_t j) { return escolhidos[j]; };
+            if (rodada % 2)
+                item.campos.juntarOrdenados(
+                    escolhidos.size(), nome,
+                    [&](std::size_t j) -> QString&& { return std::move(valores[j]); });
+            else
+                item.campos.juntarOrdenados(
+                    escolhidos.size(), nome,
+                    [&](std::size_t j) -> const QString& { return valores[j]; });
+            ASSERT_EQ(item.campos.size(), int(ref.size()));
+            auto esperado = ref.begin();
+            for (const CamposItem::Campo& campo : item.campos.todos()) {
+                EXPECT_EQ(campo.nome, esperado->first);
+                EXPECT_EQ(campo.valor, esperado->second);
+                ++esperado;
+            }
+        }
+    }
 }
 
 // A batch merged into an item: new names go in their place, equal names take the batch's

@@ -10,6 +10,9 @@
 #include <QString>
 
 #include <random>
+#include <string>
+#include <string_view>
+#include <unordered_map>
 
 namespace {
 
@@ -56,6 +59,51 @@ TEST(TabelaChavesTest, AnEmptyTableAnswersDefaultsAndTextValuesStayShared) {
     EXPECT_TRUE(outro.isSharedWith(dono));
     EXPECT_EQ(tabela.size(), 1u);
     EXPECT_EQ(tabela.value("-K2"), QString());
+    EXPECT_EQ(tabela.size(), 1u);
+}
+
+}  // namespace
+
+namespace {
+
+TEST(TabelaChavesTest, TextsAreAskedForByTheirViewAndMadeOnceEach) {
+    TabelaChaves<std::string, QString, std::string_view> tabela;
+    std::unordered_map<std::string, QString> ref;
+    int feitos = 0;
+    std::mt19937 sorteio(5);
+    std::uniform_int_distribution<int> numero(0, 2999);
+    for (int i = 0; i < 20000; ++i) {
+        // Short texts and long ones (past the string's own room), from a buffer of their own:
+        // the table keeps a copy, not the view.
+        std::string texto = "-K" + std::to_string(numero(sorteio));
+        if (i % 3 == 0) texto += std::string(20, 'x');
+        const std::string_view vista(texto);
+        const QString& valor = tabela.obtem(vista, [&] {
+            ++feitos;
+            return QString::fromStdString(texto).toLower();
+        });
+        const QString esperado = ref.try_emplace(texto, valor).first->second;
+        EXPECT_EQ(valor, esperado);
+        EXPECT_EQ(valor, QString::fromStdString(texto).toLower());
+    }
+    EXPECT_EQ(feitos, int(ref.size()));
+    EXPECT_EQ(tabela.size(), ref.size());
+    for (const auto& [texto, valor] : ref)
+        EXPECT_EQ(tabela.value(texto), valor);
+    EXPECT_EQ(tabela.value("-K"), QString());
+    EXPECT_EQ(tabela.value(""), QString());
+
+    // Emptied, it answers none and makes each text again.
+    tabela.clear();
+    EXPECT_TRUE(tabela.empty());
+    EXPECT_EQ(tabela.value(ref.begin()->first), QString());
+    feitos = 0;
+    tabela.obtem(ref.begin()->first, [&] {
+        ++feitos;
+        return QStringLiteral("de novo");
+    });
+    EXPECT_EQ(feitos, 1);
+    EXPECT_EQ(tabela.value(ref.begin()->first), QStringLiteral("de novo"));
     EXPECT_EQ(tabela.size(), 1u);
 }
 
