@@ -11,6 +11,8 @@
 
 #include <QDateTime>
 
+#include <algorithm>
+
 namespace {
 
 bool Pergunta(int numero) {
@@ -153,6 +155,11 @@ CCListaPaginada::Grade CCListaPaginada::Grade::DoModelo(CETemplate& modelo) {
 
 void CCListaPaginada::Grade::Coloca(CEPaginaLista& pagina, CEItemLista* item,
                                     std::shared_ptr<CEItemLista> proprio) {
+    // A page's rows take their room at once: a list of a thousand pages would otherwise
+    // ask the allocator again at each doubling of each page.
+    if (pagina.linhas.capacity() == 0)
+        pagina.linhas.reserve(size_t(std::clamp(linhas, 1, kMaxLinhas)) *
+                              size_t(std::clamp(colunas, 1, kMaxColunas)));
     pagina.linhas.push_back(
         {item, double(CICad::Simples(x)), double(CICad::Simples(y)), {}, {}, std::move(proprio)});
     ++contagem;
