@@ -27,6 +27,12 @@ void NovaPagina(std::vector<CEPaginaLista>& paginas, Grade& grade, int indice) {
     paginas.push_back(std::move(pagina));
 }
 
+// Two fields' values as texts; a missing field reads empty.
+bool Igual(const QString* a, const QString* b) {
+    static const QString kVazio;
+    return (a ? *a : kVazio) == (b ? *b : kVazio);
+}
+
 bool ComecaCom(const QString& tag, const char* a, const char* b) {
     const QString maiuscula = tag.toUpper();
     return maiuscula.startsWith(QLatin1String(a)) || maiuscula.startsWith(QLatin1String(b));
@@ -73,23 +79,32 @@ std::vector<CEPaginaLista> CCFioGrfWriter::Diagrama(VetorItens& itens, CETemplat
     const bool comBranco = QuebraComBranco(modelo);
 
     std::vector<double> somas(size_t(totais.size()), 0.0);
+    // The fields summed and the break keys by their numbers, found once for all the rows.
+    std::vector<CECampoPorNumero> somados, quebras;
+    for (const QString& total : totais)
+        somados.push_back(CECampoPorNumero::De(total));
+    for (const QString& chave : chaves)
+        quebras.push_back(CECampoPorNumero::De(chave));
     // Rows repeat a few texts (a length, a quantity): each is read as a number once.
     QHash<QString, double> numeros;
     for (int i = 0; i < n; ++i) {
         CEItemLista& item = *presentes[size_t(i)];
         for (int t = 0; t < totais.size(); ++t) {
-            QString valor;
-            if (!item.obterCampo(totais[t], valor)) continue;
-            auto numero = numeros.constFind(valor);
+            const QString* valor = somados[size_t(t)].Procura(item.campos, totais[t]);
+            if (!valor) continue;
+            auto numero = numeros.constFind(*valor);
             if (numero == numeros.constEnd())
-                numero = numeros.insert(valor, CETemplateLisp::TextoParaReal(valor));
+                numero = numeros.insert(*valor, CETemplateLisp::TextoParaReal(*valor));
             somas[size_t(t)] += numero.value();
         }
         grade.Coloca(paginas.back(), &item);
         if (i + 1 < n) {
             const CEItemLista& proximo = *presentes[size_t(i + 1)];
-            for (const QString& chave : chaves) {
-                if (proximo.valorCampo(chave) == item.valorCampo(chave)) continue;
+            for (int c = 0; c < chaves.size(); ++c) {
+                CECampoPorNumero& chave = quebras[size_t(c)];
+                if (Igual(chave.Procura(proximo.campos, chaves[c]),
+                          chave.Procura(item.campos, chaves[c])))
+                    continue;
                 if (!comBranco) {
                     NovaPagina(paginas, grade, i + 1);
                 } else {
@@ -166,7 +181,7 @@ void CCFioGrfWriter::InsereLinha(const CCListaPaginada::Bloco& bloco, const QStr
     const CEItemLista& item = *linha.item;
     // What ValorVariavel gives, with the length's text and its printed form found once for
     // the row's cells.
-    const QString comprimento = item.valorCampo(kComprimento);
+    const QString comprimento = comprimento_.Valor(item.campos, kComprimento);
     std::optional<QString> impresso;
     // A cell's value from its role and its default text; none leaves the cell as it is.
     const auto celula = [this](const QString& tag, const QString& padrao) {
@@ -222,6 +237,7 @@ void CCFioGrfWriter::EscreverItens(VetorItens& itens, CETemplate& modelo) {
     preenchidos_.Reinicia();
     celulas_.Reinicia();
     impressos_.clear();
+    comprimento_ = {};
     grupo_ = modelo.LerTexto("FUNCAO_LSTGRW");
     variasColunas_ = modelo.LerLogico("*COLUNA_SN*");
     digitos_ = CICad::GetIntLisp("PBLINTFIODGTSAFTERDOT", 0);

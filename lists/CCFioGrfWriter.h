@@ -55,4 +55,6 @@ protected:
     // A length's printed form with the run's digits; rows repeat a few lengths.
     const QString& Impresso(const QString& comprimento);
     QHash<QString, QString> impressos_;
+    // The length's field, by its number.
+    CECampoPorNumero comprimento_;
 };
