@@ -373,9 +373,10 @@ TEST_F(FacadeFixture, RepeatedInsertionsFindAnErasedBlockOrLayerAgain) {
 
 // The tag and default asked about are those of the definition as it stands at each
 // insertion: a definition edited, or a block redefined from its file, between two rows.
-// Values of every kind reach their attributes as UTF-8: plain, accented, empty, longer than
-// a row's values together, and for more attributes than a row has; read back from the
-// drawing and from the saved file alike.
+// Values of every kind reach their attributes as UTF-8: plain, accented, of two and three
+// bytes a letter, beyond the basic plane, empty, longer than a row's values together (plain
+// or not), and for more attributes than a row has; read back from the drawing and from the
+// saved file alike.
 TEST_F(FacadeFixture, EveryValueReachesItsAttributeWhateverItsTextAndTheirNumber) {
     QStringList tags;
     for (int i = 0; i < 20; ++i)
@@ -386,6 +387,9 @@ TEST_F(FacadeFixture, EveryValueReachesItsAttributeWhateverItsTextAndTheirNumber
         const int i = tag.mid(6).toInt();
         if (i == 3) return std::nullopt;
         if (i == 5) return longo;
+        if (i == 7) return QString::fromUtf8("2,5mm² € \xF0\x9F\x98\x80 ") + tag;
+        if (i == 8) return QString::fromUtf8("é").repeated(600);
+        if (i == 10) return QString::fromUtf8("中文 € ²") + tag;
         if (i % 4 == 1) return QString::fromUtf8("ação Ø ") + tag;
         if (i == 6) return QString();
         return tag.toLower();
@@ -414,6 +418,11 @@ TEST_F(FacadeFixture, EveryValueReachesItsAttributeWhateverItsTextAndTheirNumber
     EXPECT_EQ(lidos(*ref), esperados);
     EXPECT_EQ(esperados[9], "ação Ø CAMPO_9");
     EXPECT_EQ(esperados[5].size(), 1500u);
+    EXPECT_EQ(esperados[7], "2,5mm\xC2\xB2 \xE2\x82\xAC \xF0\x9F\x98\x80 CAMPO_7");
+    EXPECT_EQ(esperados[8].size(), 1200u);
+    EXPECT_EQ(esperados[10],
+              "\xE4\xB8\xAD\xE6\x96\x87 \xE2\x82\xAC \xC2\xB2"
+              "CAMPO_10");
     const auto salvo = zvdb::DxfLoader::load(zvdb::DxfWriter::toText(db()));
     auto* lido = dynamic_cast<zvdb::BlockReference*>(salvo->objectByHandle(id.handle()));
     ASSERT_TRUE(lido);
