@@ -11,6 +11,7 @@
 
 #include "sdk/AtomicFile.h"
 
+#include <cstring>
 #include <unordered_set>
 
 namespace zvdb {
@@ -103,9 +104,14 @@ void DxfWriter::tag(int code, std::string_view value) {
 }
 
 const DxfWriter::PatternText& DxfWriter::patternText(const TagPattern& pattern) {
-    const auto [at, made] = patternTexts_.try_emplace(&pattern);
-    PatternText& rendered = at->second;
-    if (!made) return rendered;
+    // A reference's objects go through a few patterns by turns: those are answered here
+    // without a look-up in the map (whose texts stay where they are).
+    const auto at = reinterpret_cast<std::uintptr_t>(&pattern) * 0x9E3779B97F4A7C15ull;
+    KnownPattern& known = knownPatterns_[at >> (64 - kKnownBits)];
+    if (known.pattern == &pattern) return *known.text;
+    PatternText& rendered = patternTexts_[&pattern];
+    known = {&pattern, &rendered};
+    if (!rendered.pieces.empty()) return rendered;
     std::size_t begin = 0;
     pattern.forEachItem(
         [&](int code, TagPattern::Kind kind, std::uint8_t hole, std::string_view value) {
@@ -131,6 +137,70 @@ const DxfWriter::PatternText& DxfWriter::patternText(const TagPattern& pattern) 
 void DxfWriter::writePatterned(const DbObject& object, const TagPattern::Values& values) {
     const TagPattern& pattern = *values.pattern;
     const PatternText& rendered = patternText(pattern);
+    if (!writeWhole(object, values, rendered)) writePieces(object, values, rendered);
+    for (const Tag& item : values.xdata())
+        tag(item.code, item.value);
+    if (sink_ && out_.size() >= kChunk) flush();
+}
+
+// The object's text put in place at once, its size known beforehand: one growth of the
+// text and plain copies instead of an append, with its checks, for each run and value.
+// False, with nothing written, when a value needs the code page or the pattern has more
+// values than are kept here.
+bool DxfWriter::writeWhole(const DbObject& object, const TagPattern::Values& values,
+                           const PatternText& rendered) {
+    constexpr std::size_t kMaxPieces = 32;
+    constexpr std::size_t kHexDigits = 16;
+    const std::size_t count = rendered.pieces.size();
+    if (count > kMaxPieces) return false;
+    std::string_view own[kMaxPieces];
+    const TagPattern& pattern = *values.pattern;
+    std::size_t size = rendered.text.size() + count;
+    for (std::size_t i = 0; i < count; ++i) {
+        const PatternText::Piece& piece = rendered.pieces[i];
+        if (piece.value == TagPattern::Kind::Hole) {
+            own[i] = pattern.holeValue(values, piece.hole);
+            if (legacyEncoding_ && !TextCodec::isAscii(own[i])) return false;
+            size += own[i].size();
+        } else if (piece.value != TagPattern::Kind::Fixed) {
+            size += kHexDigits;
+        }
+    }
+    const std::size_t start = out_.size();
+    out_.resize(start + size);
+    char* at = out_.data() + start;
+    const char* text = rendered.text.data();
+    for (std::size_t i = 0; i < count; ++i) {
+        const PatternText::Piece& piece = rendered.pieces[i];
+        std::memcpy(at, text + piece.begin, piece.size);
+        at += piece.size;
+        switch (piece.value) {
+            case TagPattern::Kind::Fixed:
+                continue;
+            case TagPattern::Kind::Hole:
+                std::memcpy(at, own[i].data(), own[i].size());
+                at += own[i].size();
+                break;
+            case TagPattern::Kind::Handle:
+            case TagPattern::Kind::Owner: {
+                char buffer[20];
+                const bool handle = piece.value == TagPattern::Kind::Handle;
+                const std::string_view hex =
+                    TagPattern::hexText(handle ? object.handle() : object.ownerHandle(), buffer);
+                std::memcpy(at, hex.data(), hex.size());
+                at += hex.size();
+                break;
+            }
+        }
+        *at++ = '\n';
+    }
+    out_.resize(static_cast<std::size_t>(at - out_.data()));
+    return true;
+}
+
+void DxfWriter::writePieces(const DbObject& object, const TagPattern::Values& values,
+                            const PatternText& rendered) {
+    const TagPattern& pattern = *values.pattern;
     for (const PatternText::Piece& piece : rendered.pieces) {
         out_.append(rendered.text, piece.begin, piece.size);
         switch (piece.value) {
@@ -150,9 +220,6 @@ void DxfWriter::writePatterned(const DbObject& object, const TagPattern::Values&
         }
         out_ += '\n';
     }
-    for (const Tag& item : values.xdata())
-        tag(item.code, item.value);
-    if (sink_ && out_.size() >= kChunk) flush();
 }
 
 void DxfWriter::flush() {
