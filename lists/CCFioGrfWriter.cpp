@@ -9,6 +9,7 @@
 
 #include <cstdint>
 #include <optional>
+#include <span>
 #include <string_view>
 
 namespace {
@@ -174,37 +175,41 @@ CCFioGrfWriter::Papel CCFioGrfWriter::PapelDoTag(const QString& tag) {
     return papel;
 }
 
+CCFioGrfWriter::CelulaLinha CCFioGrfWriter::NovaCelula(const QString& tag, const QString& padrao) {
+    const Papel papel = PapelDoTag(tag);
+    const bool campo = papel == Papel::Variavel || papel == Papel::Total;
+    return CelulaLinha{papel, campo ? CECampoPorNumero::De(padrao) : CECampoPorNumero{}};
+}
+
+std::optional<QString> CCFioGrfWriter::ValorCelula(Linha& linha, const QString& tag,
+                                                   const QString& padrao) {
+    CelulaLinha& esta = celulas_.Proxima(
+        tag, padrao, [this](const QString& t, const QString& p) { return NovaCelula(t, p); });
+    switch (esta.papel) {
+        case Papel::Variavel: {
+            QString texto = esta.campo.Valor(linha.item.campos, padrao);
+            if (linha.comprimento.isEmpty() || texto != linha.comprimento) return texto;
+            if (!linha.impresso) linha.impresso = Impresso(linha.comprimento);
+            return *linha.impresso;
+        }
+        case Papel::Total:
+            return esta.campo.Valor(linha.item.campos, padrao);
+        case Papel::Funcao:
+        case Papel::Outro:
+            break;
+    }
+    return std::nullopt;
+}
+
 void CCFioGrfWriter::InsereLinha(const CCListaPaginada::Bloco& bloco, const QString& layer,
                                  const CELinhaLista& linha) {
     if (!bloco.existe() || !linha.item) return;
     static const QString kComprimento = QStringLiteral("COMPRIMENTO");
     const CEItemLista& item = *linha.item;
-    // What ValorVariavel gives, with the length's text and its printed form found once for
-    // the row's cells.
-    const QString comprimento = comprimento_.Valor(item.campos, kComprimento);
-    std::optional<QString> impresso;
-    // A cell's value from its role and its default text; none leaves the cell as it is.
-    const auto celula = [this](const QString& tag, const QString& padrao) {
-        const Papel papel = PapelDoTag(tag);
-        const bool campo = papel == Papel::Variavel || papel == Papel::Total;
-        return CelulaLinha{papel, campo ? CECampoPorNumero::De(padrao) : CECampoPorNumero{}};
-    };
-    const auto valor = [&](const QString& tag, const QString& padrao) -> std::optional<QString> {
-        CelulaLinha& esta = celulas_.Proxima(tag, padrao, celula);
-        switch (esta.papel) {
-            case Papel::Variavel: {
-                QString texto = esta.campo.Valor(item.campos, padrao);
-                if (comprimento.isEmpty() || texto != comprimento) return texto;
-                if (!impresso) impresso = Impresso(comprimento);
-                return *impresso;
-            }
-            case Papel::Total:
-                return esta.campo.Valor(item.campos, padrao);
-            case Papel::Funcao:
-            case Papel::Outro:
-                break;
-        }
-        return std::nullopt;
+    Linha esta{item, comprimento_.Valor(item.campos, kComprimento), std::nullopt};
+    // Two captures: the function object holds them in place, without a copy on the heap.
+    const auto valor = [this, &esta](const QString& tag, const QString& padrao) {
+        return ValorCelula(esta, tag, padrao);
     };
     celulas_.Inicia(bloco.nome);
     const OdDbObjectId ref =
@@ -216,7 +221,8 @@ void CCFioGrfWriter::InsereLinha(const CCListaPaginada::Bloco& bloco, const QStr
         int n = 0;
         for (std::uint64_t h = item.ids.front().handle(); n == 0 || h; h >>= 4)
             digitos[15 - n++] = "0123456789ABCDEF"[h & 15];
-        CICad::SetXDataTextos(ref, "KVR_ZV_LINK", {std::string_view(digitos + 16 - n, size_t(n))});
+        const std::string_view texto(digitos + 16 - n, size_t(n));
+        CICad::SetXDataTextos(ref, "KVR_ZV_LINK", std::span<const std::string_view>(&texto, 1));
     }
 }
 

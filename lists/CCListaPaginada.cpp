@@ -97,6 +97,14 @@ bool EhVariavel(const QString& tag) {
     return tag.startsWith(QLatin1String("VARIAVEL")) || tag.startsWith(QLatin1String("VARIABLE"));
 }
 
+CCListaPaginada::CelulaDetalhe NovaCelulaDetalhe(const QString& tag, const QString& padrao) {
+    using Celula = CCListaPaginada::CelulaDetalhe;
+    const QString maiuscula = tag.toUpper();
+    if (EhVariavel(maiuscula)) return Celula{Celula::Tipo::Variavel, CECampoPorNumero::De(padrao)};
+    if (CCListaPaginada::EhFuncao(maiuscula)) return Celula{Celula::Tipo::Funcao, {}};
+    return Celula{};
+}
+
 }  // namespace
 
 void CCListaPaginada::InsereDetalhe(Detalhes& detalhes, const Bloco& bloco, const QString& layer,
@@ -105,23 +113,23 @@ void CCListaPaginada::InsereDetalhe(Detalhes& detalhes, const Bloco& bloco, cons
     // A field named by the default value is the attribute's value from the start; functions
     // (their place among the attributes and their text) are worked out in LISP once the
     // reference is whole.
-    std::vector<std::pair<size_t, QString>> funcoes;
-    size_t indice = 0;
-    const auto celula = [](const QString& tag, const QString& padrao) {
-        const QString maiuscula = tag.toUpper();
-        if (EhVariavel(maiuscula))
-            return CelulaDetalhe{CelulaDetalhe::Tipo::Variavel, CECampoPorNumero::De(padrao)};
-        if (EhFuncao(maiuscula)) return CelulaDetalhe{CelulaDetalhe::Tipo::Funcao, {}};
-        return CelulaDetalhe{};
-    };
-    const auto valores = [&](const QString& tag, const QString& padrao) -> std::optional<QString> {
-        CelulaDetalhe& esta = detalhes.celulas.Proxima(tag, padrao, celula);
-        const size_t este = indice++;
+    struct Estado {
+        Detalhes& detalhes;
+        const CEItemLista& item;
+        std::vector<std::pair<size_t, QString>> funcoes;
+        size_t indice = 0;
+    } estado{detalhes, *linha.item, {}};
+    // One capture: the function object holds it in place, without a copy on the heap.
+    const auto valores = [&estado](const QString& tag,
+                                   const QString& padrao) -> std::optional<QString> {
+        CelulaDetalhe& esta = estado.detalhes.celulas.Proxima(tag, padrao, NovaCelulaDetalhe);
+        const size_t este = estado.indice++;
         if (esta.tipo == CelulaDetalhe::Tipo::Variavel)
-            return esta.campo.Valor(linha.item->campos, padrao);
-        if (esta.tipo == CelulaDetalhe::Tipo::Funcao) funcoes.emplace_back(este, padrao);
+            return esta.campo.Valor(estado.item.campos, padrao);
+        if (esta.tipo == CelulaDetalhe::Tipo::Funcao) estado.funcoes.emplace_back(este, padrao);
         return std::nullopt;
     };
+    const auto& funcoes = estado.funcoes;
     detalhes.celulas.Inicia(bloco.nome);
     const OdDbObjectId ref =
         detalhes.insercoes.Insere(bloco.arquivo, bloco.nome, layer, linha.x, linha.y, valores);
