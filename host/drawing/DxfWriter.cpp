@@ -11,7 +11,9 @@
 
 #include "sdk/AtomicFile.h"
 
+#include <bit>
 #include <cstring>
+#include <span>
 #include <unordered_set>
 
 namespace zvdb {
@@ -137,16 +139,48 @@ const DxfWriter::PatternText& DxfWriter::patternText(const TagPattern& pattern) 
 void DxfWriter::writePatterned(const DbObject& object, const TagPattern::Values& values) {
     const TagPattern& pattern = *values.pattern;
     const PatternText& rendered = patternText(pattern);
-    if (!writeWhole(object, values, rendered)) writePieces(object, values, rendered);
-    for (const Tag& item : values.xdata())
-        tag(item.code, item.value);
+    if (!writeWhole(object, values, rendered)) {
+        writePieces(object, values, rendered);
+        for (const Tag& item : values.xdata())
+            tag(item.code, item.value);
+    }
     if (sink_ && out_.size() >= kChunk) flush();
 }
 
-// The object's text put in place at once, its size known beforehand: one growth of the
-// text and plain copies instead of an append, with its checks, for each run and value.
-// False, with nothing written, when a value needs the code page or the pattern has more
-// values than are kept here.
+namespace {
+
+// A group code's line as appendCode writes it (right-aligned in three), at `at`; its end.
+char* putCode(char* at, int code) {
+    char digits[16];
+    int n = 0;
+    int c = code < 0 ? -code : code;
+    do {
+        digits[n++] = static_cast<char>('0' + c % 10);
+        c /= 10;
+    } while (c);
+    if (code < 0) digits[n++] = '-';
+    for (int pad = n; pad < 3; ++pad)
+        *at++ = ' ';
+    while (n)
+        *at++ = digits[--n];
+    *at++ = '\n';
+    return at;
+}
+
+// Upper-case hexadecimal as TagPattern::hexText gives it, at `at`; its end.
+char* putHex(char* at, std::uint64_t value) {
+    const int digits = value == 0 ? 1 : (std::bit_width(value) + 3) / 4;
+    for (int i = digits - 1; i >= 0; --i, value >>= 4)
+        at[i] = "0123456789ABCDEF"[value & 15];
+    return at + digits;
+}
+
+}  // namespace
+
+// The object's text and its extended data put in place at once, their size known
+// beforehand: one growth of the text and plain copies instead of an append, with its checks,
+// for each run and value. False, with nothing written, when a value needs the code page or
+// the pattern has more values than are kept here.
 bool DxfWriter::writeWhole(const DbObject& object, const TagPattern::Values& values,
                            const PatternText& rendered) {
     constexpr std::size_t kMaxPieces = 32;
@@ -166,6 +200,13 @@ bool DxfWriter::writeWhole(const DbObject& object, const TagPattern::Values& val
             size += kHexDigits;
         }
     }
+    // A code takes at most six characters and its line end.
+    constexpr std::size_t kCodeLine = 7;
+    const std::span<const Tag> xdata = values.xdata();
+    for (const Tag& item : xdata) {
+        if (legacyEncoding_ && !TextCodec::isAscii(item.value)) return false;
+        size += kCodeLine + item.value.size() + 1;
+    }
     const std::size_t start = out_.size();
     out_.resize(start + size);
     char* at = out_.data() + start;
@@ -183,15 +224,17 @@ bool DxfWriter::writeWhole(const DbObject& object, const TagPattern::Values& val
                 break;
             case TagPattern::Kind::Handle:
             case TagPattern::Kind::Owner: {
-                char buffer[20];
                 const bool handle = piece.value == TagPattern::Kind::Handle;
-                const std::string_view hex =
-                    TagPattern::hexText(handle ? object.handle() : object.ownerHandle(), buffer);
-                std::memcpy(at, hex.data(), hex.size());
-                at += hex.size();
+                at = putHex(at, handle ? object.handle() : object.ownerHandle());
                 break;
             }
         }
+        *at++ = '\n';
+    }
+    for (const Tag& item : xdata) {
+        at = putCode(at, item.code);
+        std::memcpy(at, item.value.data(), item.value.size());
+        at += item.value.size();
         *at++ = '\n';
     }
     out_.resize(static_cast<std::size_t>(at - out_.data()));
