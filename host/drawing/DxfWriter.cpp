@@ -167,6 +167,12 @@ char* putCode(char* at, int code) {
     return at;
 }
 
+// The text at `at`; its end. An empty value may have no memory at all.
+char* putText(char* at, std::string_view text) {
+    if (!text.empty()) std::memcpy(at, text.data(), text.size());
+    return at + text.size();
+}
+
 // Upper-case hexadecimal as TagPattern::hexText gives it, at `at`; its end.
 char* putHex(char* at, std::uint64_t value) {
     const int digits = value == 0 ? 1 : (std::bit_width(value) + 3) / 4;
@@ -219,8 +225,7 @@ bool DxfWriter::writeWhole(const DbObject& object, const TagPattern::Values& val
             case TagPattern::Kind::Fixed:
                 continue;
             case TagPattern::Kind::Hole:
-                std::memcpy(at, own[i].data(), own[i].size());
-                at += own[i].size();
+                at = putText(at, own[i]);
                 break;
             case TagPattern::Kind::Handle:
             case TagPattern::Kind::Owner: {
@@ -232,9 +237,7 @@ bool DxfWriter::writeWhole(const DbObject& object, const TagPattern::Values& val
         *at++ = '\n';
     }
     for (const Tag& item : xdata) {
-        at = putCode(at, item.code);
-        std::memcpy(at, item.value.data(), item.value.size());
-        at += item.value.size();
+        at = putText(putCode(at, item.code), item.value);
         *at++ = '\n';
     }
     out_.resize(static_cast<std::size_t>(at - out_.data()));
