@@ -184,9 +184,14 @@ OdDbObjectId CCListaPaginada::BlocosPreenchidos::Insere(const QString& arquivo, 
                                                         const CEItemLista& item,
                                                         const Valor& valor) {
     if (arquivo.isEmpty()) return {};
-    const auto conhecido = comFuncao_.constFind(nome);
-    if (conhecido != comFuncao_.constEnd() && !conhecido.value())
-        return insercoes_.Insere(arquivo, nome, layer, x, y, valor);
+    // The row before's block, named by the very same text, is known to have no functions.
+    bool semFuncoes = !nome.isEmpty() && nome.isSharedWith(semFuncoes_);
+    if (!semFuncoes) {
+        const auto conhecido = comFuncao_.constFind(nome);
+        semFuncoes = conhecido != comFuncao_.constEnd() && !conhecido.value();
+        if (semFuncoes) semFuncoes_ = nome;
+    }
+    if (semFuncoes) return insercoes_.Insere(arquivo, nome, layer, x, y, valor);
     const OdDbObjectId referencia = insercoes_.Insere(arquivo, nome, layer, x, y);
     if (referencia.isNull()) return referencia;
     std::unique_ptr<zv::CEListaAtributos> atributos;

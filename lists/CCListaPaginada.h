@@ -84,11 +84,13 @@ public:
                             double x, double y, const CEItemLista& item, const Valor& valor);
         void Reinicia() {
             comFuncao_.clear();
+            semFuncoes_ = QString();
             insercoes_.Reinicia();
         }
 
     private:
         QHash<QString, bool> comFuncao_;
+        QString semFuncoes_;
         CEInsercoesBlocos insercoes_;
     };
 

@@ -336,8 +336,10 @@ TEST_F(FacadeFixture, InsertingAFoundDefinitionAndWritingTextsGiveWhatTheLongWay
 
 // A writer's run of insertions finds each block and page once: a reference lands on the
 // layer of its own call, and a definition or a layer erased between two calls is loaded or
-// made again, as the name-and-file insertion would.
+// made again, as the name-and-file insertion would; so too when the calls pass the very
+// same texts, as writers do row after row.
 TEST_F(FacadeFixture, RepeatedInsertionsFindAnErasedBlockOrLayerAgain) {
+    const QString nome = "REPETIDO", pag2 = "PAG2";
     const QString caminho = arquivoBloco("REPETIDO", {"VARIAVEL_1"});
     const CEValoresAtributos valores = [](const QString& tag,
                                           const QString&) -> std::optional<QString> {
@@ -348,7 +350,7 @@ TEST_F(FacadeFixture, RepeatedInsertionsFindAnErasedBlockOrLayerAgain) {
         return dynamic_cast<zvdb::BlockReference*>(db().objectByHandle(id.handle()));
     };
     const OdDbObjectId primeira = insercoes.Insere(caminho, "REPETIDO", "PAG1", 0, 0, valores);
-    const OdDbObjectId segunda = insercoes.Insere(caminho, "REPETIDO", "PAG2", 10, 0);
+    const OdDbObjectId segunda = insercoes.Insere(caminho, nome, pag2, 10, 0);
     ASSERT_TRUE(referencia(primeira) && referencia(segunda));
     EXPECT_EQ(referencia(primeira)->layer(), "PAG1");
     EXPECT_EQ(referencia(segunda)->layer(), "PAG2");
@@ -361,7 +363,7 @@ TEST_F(FacadeFixture, RepeatedInsertionsFindAnErasedBlockOrLayerAgain) {
     db().objectByHandle(antigo.handle())->erase();
     db().layer("PAG2")->erase();
     ASSERT_FALSE(CICad::ExisteLayer("PAG2"));
-    const OdDbObjectId terceira = insercoes.Insere(caminho, "REPETIDO", "PAG2", 20, 0);
+    const OdDbObjectId terceira = insercoes.Insere(caminho, nome, pag2, 20, 0);
     ASSERT_TRUE(referencia(terceira));
     OdDbObjectId novo;
     ASSERT_TRUE(CICad::GetBlocoId("REPETIDO", novo));
