@@ -15,21 +15,31 @@ OdDbObjectId CEInsercoesBlocos::Insere(const QString& arquivo, const QString& no
         Reinicia();
         database_ = db;
     }
-    OdDbObjectId& bloco = definicoes_[nome];
-    if (!Como<zvdb::BlockRecord>(bloco) && !CICad::GetBlocoId(nome, bloco, db))
-        bloco = CICad::CarregaBloco(nome, arquivo);
-    if (layer != layer_ || (!layer.isEmpty() && !Como<zvdb::LayerRecord>(layerId_))) {
+    // Rows of one block come one after the other with the very text of its name: the
+    // definition found for the row before is taken without a look-up.
+    if (nome.isEmpty() || !nome.isSharedWith(nome_)) {
+        nome_ = nome;
+        bloco_ = definicoes_.value(nome);
+    }
+    if (!Como<zvdb::BlockRecord>(bloco_)) {
+        if (!CICad::GetBlocoId(nome, bloco_, db)) bloco_ = CICad::CarregaBloco(nome, arquivo);
+        definicoes_.insert(nome, bloco_);
+    }
+    const bool mesmaLayer = layer.isSharedWith(layer_) || layer == layer_;
+    if (!mesmaLayer || (!layer.isEmpty() && !Como<zvdb::LayerRecord>(layerId_))) {
         CICad::CriaLayer(layer, db);
         layer_ = layer;
         layerUtf8_ = U8(layer);
         layerId_ = Id(Layer(layer, db));
     }
-    return CICad::InsereReferencia(bloco, layerUtf8_, x, y, 0, 0, valores);
+    return CICad::InsereReferencia(bloco_, layerUtf8_, x, y, 0, 0, valores);
 }
 
 void CEInsercoesBlocos::Reinicia() {
     database_ = nullptr;
     definicoes_.clear();
+    nome_ = QString();
+    bloco_ = OdDbObjectId();
     layer_ = QString();
     layerUtf8_.clear();
     layerId_ = OdDbObjectId();

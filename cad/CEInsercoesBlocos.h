@@ -23,6 +23,9 @@ public:
 private:
     zvdb::Database* database_ = nullptr;
     QHash<QString, OdDbObjectId> definicoes_;
+    // The block asked for last and its definition.
+    QString nome_;
+    OdDbObjectId bloco_;
     QString layer_;
     std::string layerUtf8_;
     OdDbObjectId layerId_;

@@ -321,6 +321,8 @@ public:
     // Extended data of texts alone (code 1000), given in UTF-8.
     static void SetXDataTextos(const OdDbObjectId& id, std::string_view aplicacao,
                                const std::vector<std::string_view>& textos);
+    static void SetXDataTextos(const OdDbObjectId& id, std::string_view aplicacao,
+                               std::span<const std::string_view> textos);
     static OdDbObjectId GetSimboloMestre(zvdb::Database* database, const OdDbObjectId& entidade);
     static bool GetCircuitoLocal(const OdDbObjectId& entidade, int& numero);
     static bool GetCircuitoLocalInfo(int numero, QString& a, QString& b, QString& c);

@@ -217,6 +217,11 @@ void CICad::SetXData(const OdDbObjectId& id, const QString& aplicacao, const CEL
 
 void CICad::SetXDataTextos(const OdDbObjectId& id, std::string_view aplicacao,
                            const std::vector<std::string_view>& textos) {
+    SetXDataTextos(id, aplicacao, std::span<const std::string_view>(textos));
+}
+
+void CICad::SetXDataTextos(const OdDbObjectId& id, std::string_view aplicacao,
+                           std::span<const std::string_view> textos) {
     zvdb::DbObject* objeto = Objeto(id);
     if (!objeto) return;
     objeto->setXDataTexts(aplicacao, textos);

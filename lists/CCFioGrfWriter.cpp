@@ -9,6 +9,7 @@
 
 #include <cstdint>
 #include <optional>
+#include <span>
 #include <string_view>
 
 namespace {
@@ -25,6 +26,12 @@ void NovaPagina(std::vector<CEPaginaLista>& paginas, Grade& grade, int indice) {
     pagina.atributos = paginas.back().atributos;
     pagina.atributos.insert("PAGINA", QString::number(indice));
     paginas.push_back(std::move(pagina));
+}
+
+// Two fields' values as texts; a missing field reads empty.
+bool Igual(const QString* a, const QString* b) {
+    static const QString kVazio;
+    return (a ? *a : kVazio) == (b ? *b : kVazio);
 }
 
 bool ComecaCom(const QString& tag, const char* a, const char* b) {
@@ -73,23 +80,32 @@ std::vector<CEPaginaLista> CCFioGrfWriter::Diagrama(VetorItens& itens, CETemplat
     const bool comBranco = QuebraComBranco(modelo);
 
     std::vector<double> somas(size_t(totais.size()), 0.0);
+    // The fields summed and the break keys by their numbers, found once for all the rows.
+    std::vector<CECampoPorNumero> somados, quebras;
+    for (const QString& total : totais)
+        somados.push_back(CECampoPorNumero::De(total));
+    for (const QString& chave : chaves)
+        quebras.push_back(CECampoPorNumero::De(chave));
     // Rows repeat a few texts (a length, a quantity): each is read as a number once.
     QHash<QString, double> numeros;
     for (int i = 0; i < n; ++i) {
         CEItemLista& item = *presentes[size_t(i)];
         for (int t = 0; t < totais.size(); ++t) {
-            QString valor;
-            if (!item.obterCampo(totais[t], valor)) continue;
-            auto numero = numeros.constFind(valor);
+            const QString* valor = somados[size_t(t)].Procura(item.campos, totais[t]);
+            if (!valor) continue;
+            auto numero = numeros.constFind(*valor);
             if (numero == numeros.constEnd())
-                numero = numeros.insert(valor, CETemplateLisp::TextoParaReal(valor));
+                numero = numeros.insert(*valor, CETemplateLisp::TextoParaReal(*valor));
             somas[size_t(t)] += numero.value();
         }
         grade.Coloca(paginas.back(), &item);
         if (i + 1 < n) {
             const CEItemLista& proximo = *presentes[size_t(i + 1)];
-            for (const QString& chave : chaves) {
-                if (proximo.valorCampo(chave) == item.valorCampo(chave)) continue;
+            for (int c = 0; c < chaves.size(); ++c) {
+                CECampoPorNumero& chave = quebras[size_t(c)];
+                if (Igual(chave.Procura(proximo.campos, chaves[c]),
+                          chave.Procura(item.campos, chaves[c])))
+                    continue;
                 if (!comBranco) {
                     NovaPagina(paginas, grade, i + 1);
                 } else {
@@ -159,37 +175,41 @@ CCFioGrfWriter::Papel CCFioGrfWriter::PapelDoTag(const QString& tag) {
     return papel;
 }
 
+CCFioGrfWriter::CelulaLinha CCFioGrfWriter::NovaCelula(const QString& tag, const QString& padrao) {
+    const Papel papel = PapelDoTag(tag);
+    const bool campo = papel == Papel::Variavel || papel == Papel::Total;
+    return CelulaLinha{papel, campo ? CECampoPorNumero::De(padrao) : CECampoPorNumero{}};
+}
+
+std::optional<QString> CCFioGrfWriter::ValorCelula(Linha& linha, const QString& tag,
+                                                   const QString& padrao) {
+    CelulaLinha& esta = celulas_.Proxima(
+        tag, padrao, [this](const QString& t, const QString& p) { return NovaCelula(t, p); });
+    switch (esta.papel) {
+        case Papel::Variavel: {
+            QString texto = esta.campo.Valor(linha.item.campos, padrao);
+            if (linha.comprimento.isEmpty() || texto != linha.comprimento) return texto;
+            if (!linha.impresso) linha.impresso = Impresso(linha.comprimento);
+            return *linha.impresso;
+        }
+        case Papel::Total:
+            return esta.campo.Valor(linha.item.campos, padrao);
+        case Papel::Funcao:
+        case Papel::Outro:
+            break;
+    }
+    return std::nullopt;
+}
+
 void CCFioGrfWriter::InsereLinha(const CCListaPaginada::Bloco& bloco, const QString& layer,
                                  const CELinhaLista& linha) {
     if (!bloco.existe() || !linha.item) return;
     static const QString kComprimento = QStringLiteral("COMPRIMENTO");
     const CEItemLista& item = *linha.item;
-    // What ValorVariavel gives, with the length's text and its printed form found once for
-    // the row's cells.
-    const QString comprimento = item.valorCampo(kComprimento);
-    std::optional<QString> impresso;
-    // A cell's value from its role and its default text; none leaves the cell as it is.
-    const auto celula = [this](const QString& tag, const QString& padrao) {
-        const Papel papel = PapelDoTag(tag);
-        const bool campo = papel == Papel::Variavel || papel == Papel::Total;
-        return CelulaLinha{papel, campo ? CECampoPorNumero::De(padrao) : CECampoPorNumero{}};
-    };
-    const auto valor = [&](const QString& tag, const QString& padrao) -> std::optional<QString> {
-        CelulaLinha& esta = celulas_.Proxima(tag, padrao, celula);
-        switch (esta.papel) {
-            case Papel::Variavel: {
-                QString texto = esta.campo.Valor(item.campos, padrao);
-                if (comprimento.isEmpty() || texto != comprimento) return texto;
-                if (!impresso) impresso = Impresso(comprimento);
-                return *impresso;
-            }
-            case Papel::Total:
-                return esta.campo.Valor(item.campos, padrao);
-            case Papel::Funcao:
-            case Papel::Outro:
-                break;
-        }
-        return std::nullopt;
+    Linha esta{item, comprimento_.Valor(item.campos, kComprimento), std::nullopt};
+    // Two captures: the function object holds them in place, without a copy on the heap.
+    const auto valor = [this, &esta](const QString& tag, const QString& padrao) {
+        return ValorCelula(esta, tag, padrao);
     };
     celulas_.Inicia(bloco.nome);
     const OdDbObjectId ref =
@@ -201,7 +221,8 @@ void CCFioGrfWriter::InsereLinha(const CCListaPaginada::Bloco& bloco, const QStr
         int n = 0;
         for (std::uint64_t h = item.ids.front().handle(); n == 0 || h; h >>= 4)
             digitos[15 - n++] = "0123456789ABCDEF"[h & 15];
-        CICad::SetXDataTextos(ref, "KVR_ZV_LINK", {std::string_view(digitos + 16 - n, size_t(n))});
+        const std::string_view texto(digitos + 16 - n, size_t(n));
+        CICad::SetXDataTextos(ref, "KVR_ZV_LINK", std::span<const std::string_view>(&texto, 1));
     }
 }
 
@@ -222,6 +243,7 @@ void CCFioGrfWriter::EscreverItens(VetorItens& itens, CETemplate& modelo) {
     preenchidos_.Reinicia();
     celulas_.Reinicia();
     impressos_.clear();
+    comprimento_ = {};
     grupo_ = modelo.LerTexto("FUNCAO_LSTGRW");
     variasColunas_ = modelo.LerLogico("*COLUNA_SN*");
     digitos_ = CICad::GetIntLisp("PBLINTFIODGTSAFTERDOT", 0);

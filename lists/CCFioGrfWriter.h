@@ -7,6 +7,7 @@
 
 #include <QHash>
 
+#include <optional>
 #include <utility>
 #include <vector>
 
@@ -50,9 +51,22 @@ protected:
         CECampoPorNumero campo;
     };
     CECelulasBloco<CelulaLinha> celulas_;
+    CelulaLinha NovaCelula(const QString& tag, const QString& padrao);
+    // What a row's cells read: the item, its length's text, and that length as printed once
+    // a cell asks for it.
+    struct Linha {
+        const CEItemLista& item;
+        const QString comprimento;
+        std::optional<QString> impresso;
+    };
+    // What ValorVariavel gives for a VARIAVEL cell, the field for a TOTAL one; none leaves
+    // the cell as it is.
+    std::optional<QString> ValorCelula(Linha& linha, const QString& tag, const QString& padrao);
     // The run's row blocks, filled from their items.
     CCListaPaginada::BlocosPreenchidos preenchidos_;
     // A length's printed form with the run's digits; rows repeat a few lengths.
     const QString& Impresso(const QString& comprimento);
     QHash<QString, QString> impressos_;
+    // The length's field, by its number.
+    CECampoPorNumero comprimento_;
 };

@@ -11,6 +11,8 @@
 
 #include <QDateTime>
 
+#include <algorithm>
+
 namespace {
 
 bool Pergunta(int numero) {
@@ -95,6 +97,14 @@ bool EhVariavel(const QString& tag) {
     return tag.startsWith(QLatin1String("VARIAVEL")) || tag.startsWith(QLatin1String("VARIABLE"));
 }
 
+CCListaPaginada::CelulaDetalhe NovaCelulaDetalhe(const QString& tag, const QString& padrao) {
+    using Celula = CCListaPaginada::CelulaDetalhe;
+    const QString maiuscula = tag.toUpper();
+    if (EhVariavel(maiuscula)) return Celula{Celula::Tipo::Variavel, CECampoPorNumero::De(padrao)};
+    if (CCListaPaginada::EhFuncao(maiuscula)) return Celula{Celula::Tipo::Funcao, {}};
+    return Celula{};
+}
+
 }  // namespace
 
 void CCListaPaginada::InsereDetalhe(Detalhes& detalhes, const Bloco& bloco, const QString& layer,
@@ -103,23 +113,23 @@ void CCListaPaginada::InsereDetalhe(Detalhes& detalhes, const Bloco& bloco, cons
     // A field named by the default value is the attribute's value from the start; functions
     // (their place among the attributes and their text) are worked out in LISP once the
     // reference is whole.
-    std::vector<std::pair<size_t, QString>> funcoes;
-    size_t indice = 0;
-    const auto celula = [](const QString& tag, const QString& padrao) {
-        const QString maiuscula = tag.toUpper();
-        if (EhVariavel(maiuscula))
-            return CelulaDetalhe{CelulaDetalhe::Tipo::Variavel, CECampoPorNumero::De(padrao)};
-        if (EhFuncao(maiuscula)) return CelulaDetalhe{CelulaDetalhe::Tipo::Funcao, {}};
-        return CelulaDetalhe{};
-    };
-    const auto valores = [&](const QString& tag, const QString& padrao) -> std::optional<QString> {
-        CelulaDetalhe& esta = detalhes.celulas.Proxima(tag, padrao, celula);
-        const size_t este = indice++;
+    struct Estado {
+        Detalhes& detalhes;
+        const CEItemLista& item;
+        std::vector<std::pair<size_t, QString>> funcoes;
+        size_t indice = 0;
+    } estado{detalhes, *linha.item, {}};
+    // One capture: the function object holds it in place, without a copy on the heap.
+    const auto valores = [&estado](const QString& tag,
+                                   const QString& padrao) -> std::optional<QString> {
+        CelulaDetalhe& esta = estado.detalhes.celulas.Proxima(tag, padrao, NovaCelulaDetalhe);
+        const size_t este = estado.indice++;
         if (esta.tipo == CelulaDetalhe::Tipo::Variavel)
-            return esta.campo.Valor(linha.item->campos, padrao);
-        if (esta.tipo == CelulaDetalhe::Tipo::Funcao) funcoes.emplace_back(este, padrao);
+            return esta.campo.Valor(estado.item.campos, padrao);
+        if (esta.tipo == CelulaDetalhe::Tipo::Funcao) estado.funcoes.emplace_back(este, padrao);
         return std::nullopt;
     };
+    const auto& funcoes = estado.funcoes;
     detalhes.celulas.Inicia(bloco.nome);
     const OdDbObjectId ref =
         detalhes.insercoes.Insere(bloco.arquivo, bloco.nome, layer, linha.x, linha.y, valores);
@@ -153,6 +163,11 @@ CCListaPaginada::Grade CCListaPaginada::Grade::DoModelo(CETemplate& modelo) {
 
 void CCListaPaginada::Grade::Coloca(CEPaginaLista& pagina, CEItemLista* item,
                                     std::shared_ptr<CEItemLista> proprio) {
+    // A page's rows take their room at once: a list of a thousand pages would otherwise
+    // ask the allocator again at each doubling of each page.
+    if (pagina.linhas.capacity() == 0)
+        pagina.linhas.reserve(size_t(std::clamp(linhas, 1, kMaxLinhas)) *
+                              size_t(std::clamp(colunas, 1, kMaxColunas)));
     pagina.linhas.push_back(
         {item, double(CICad::Simples(x)), double(CICad::Simples(y)), {}, {}, std::move(proprio)});
     ++contagem;
@@ -169,9 +184,14 @@ OdDbObjectId CCListaPaginada::BlocosPreenchidos::Insere(const QString& arquivo, 
                                                         const CEItemLista& item,
                                                         const Valor& valor) {
     if (arquivo.isEmpty()) return {};
-    const auto conhecido = comFuncao_.constFind(nome);
-    if (conhecido != comFuncao_.constEnd() && !conhecido.value())
-        return insercoes_.Insere(arquivo, nome, layer, x, y, valor);
+    // The row before's block, named by the very same text, is known to have no functions.
+    bool semFuncoes = !nome.isEmpty() && nome.isSharedWith(semFuncoes_);
+    if (!semFuncoes) {
+        const auto conhecido = comFuncao_.constFind(nome);
+        semFuncoes = conhecido != comFuncao_.constEnd() && !conhecido.value();
+        if (semFuncoes) semFuncoes_ = nome;
+    }
+    if (semFuncoes) return insercoes_.Insere(arquivo, nome, layer, x, y, valor);
     const OdDbObjectId referencia = insercoes_.Insere(arquivo, nome, layer, x, y);
     if (referencia.isNull()) return referencia;
     std::unique_ptr<zv::CEListaAtributos> atributos;

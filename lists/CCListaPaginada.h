@@ -84,11 +84,13 @@ public:
                             double x, double y, const CEItemLista& item, const Valor& valor);
         void Reinicia() {
             comFuncao_.clear();
+            semFuncoes_ = QString();
             insercoes_.Reinicia();
         }
 
     private:
         QHash<QString, bool> comFuncao_;
+        QString semFuncoes_;
         CEInsercoesBlocos insercoes_;
     };
 
@@ -102,8 +104,10 @@ public:
         // start of the first column.
         static Grade DoModelo(CETemplate& modelo);
         // A row for the item at the running point; the row may own its item.
+        // The first row of a page takes room for a full page, up to a bound.
         void Coloca(CEPaginaLista& pagina, CEItemLista* item,
                     std::shared_ptr<CEItemLista> proprio = {});
         void Reinicia();
+        static constexpr int kMaxLinhas = 512, kMaxColunas = 8;
     };
 };

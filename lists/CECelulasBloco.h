@@ -70,9 +70,14 @@ struct CECampoPorNumero {
     }
     // The item's value of the field (empty when it has none), as CamposItem::value gives it.
     QString Valor(const CamposItem& campos, const QString& nome) {
+        const QString* valor = Procura(campos, nome);
+        return valor ? *valor : QString();
+    }
+    // The same without a copy: null when the item has no such field; good until the item's
+    // fields change.
+    const QString* Procura(const CamposItem& campos, const QString& nome) {
         if (numero == CamposItem::kSemNome && nomes != CamposItem::quantidadeNomes())
             *this = De(nome);
-        const QString* valor = numero == CamposItem::kSemNome ? nullptr : campos.procura(numero);
-        return valor ? *valor : QString();
+        return numero == CamposItem::kSemNome ? nullptr : campos.procura(numero);
     }
 };

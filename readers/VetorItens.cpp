@@ -113,6 +113,8 @@ public:
         if (const int c = natural(a).compare(natural(b)); c != 0) return c < 0;
         return textos_[a]->compare(*textos_[b]) < 0;
     }
+    // The numbers of the texts in their order.
+    std::vector<std::uint32_t> emOrdem() const;
 
 private:
     static constexpr std::uint32_t kLivre = ~std::uint32_t(0);
@@ -126,6 +128,66 @@ private:
     std::vector<std::uint32_t> inicios_;
     std::vector<char16_t> naturais_;
 };
+
+// The start of a natural form as a number that orders as the forms do, as far as it goes:
+// forms whose numbers differ compare as their numbers, equal numbers tell nothing. The
+// form's units go in as four-bit codes: a digit (natural forms are mostly digits, numbers
+// being padded to ten) takes one, any other unit below 0xFF three (the code of its side of
+// the digits, then the unit), and a unit from 0xFF on ends the number with the highest code.
+// Units past the number's 32 codes are left out.
+struct Prefixo {
+    std::uint64_t alto = 0, baixo = 0;
+    bool operator==(const Prefixo&) const = default;
+    bool operator<(const Prefixo& outro) const {
+        return alto != outro.alto ? alto < outro.alto : baixo < outro.baixo;
+    }
+    static Prefixo De(QStringView natural) {
+        Prefixo prefixo;
+        int livres = 32;
+        const auto poe = [&](unsigned codigo) {
+            if (livres == 0) return;
+            --livres;
+            std::uint64_t& metade = livres >= 16 ? prefixo.alto : prefixo.baixo;
+            metade |= std::uint64_t(codigo) << (4 * (livres % 16));
+        };
+        for (const QChar letra : natural) {
+            if (livres == 0) break;
+            const char16_t u = letra.unicode();
+            if (u >= u'0' && u <= u'9') {
+                poe(1 + unsigned(u - u'0'));
+                continue;
+            }
+            if (u >= 0xFF) {
+                poe(15);
+                break;
+            }
+            poe(u < u'0' ? 0 : 11);
+            poe(unsigned(u) >> 4);
+            poe(unsigned(u) & 15);
+        }
+        return prefixo;
+    }
+};
+
+std::vector<std::uint32_t> TextosDistintos::emOrdem() const {
+    // Most pairs differ within their prefixes: the sort reads the forms themselves only
+    // for those that do not.
+    struct Distinta {
+        Prefixo prefixo;
+        std::uint32_t numero;
+    };
+    std::vector<Distinta> distintas(size());
+    for (std::uint32_t d = 0; d < distintas.size(); ++d)
+        distintas[d] = {Prefixo::De(natural(d)), d};
+    std::sort(distintas.begin(), distintas.end(), [this](const Distinta& a, const Distinta& b) {
+        if (!(a.prefixo == b.prefixo)) return a.prefixo < b.prefixo;
+        return antes(a.numero, b.numero);
+    });
+    std::vector<std::uint32_t> ordem(distintas.size());
+    for (size_t d = 0; d < ordem.size(); ++d)
+        ordem[d] = distintas[d].numero;
+    return ordem;
+}
 
 // Ties keep their first order when `estavel`; else they fall where the sort leaves them.
 void OrdenaItens(VetorItens& itens, const QStringList& campos, bool estavel) {
@@ -169,14 +231,10 @@ void OrdenaItens(VetorItens& itens, const QStringList& campos, bool estavel) {
     }
     // Each field's texts are put in order once; an item's place becomes the rank of its
     // text, so two places compare as their texts do.
-    std::vector<std::uint32_t> ordemDistintas, lugar;
+    std::vector<std::uint32_t> lugar;
     for (size_t c = 0; c < k; ++c) {
         const TextosDistintos& distintas = porCampo[c].distintas;
-        ordemDistintas.resize(distintas.size());
-        for (size_t d = 0; d < ordemDistintas.size(); ++d)
-            ordemDistintas[d] = std::uint32_t(d);
-        std::sort(ordemDistintas.begin(), ordemDistintas.end(),
-                  [&distintas](std::uint32_t a, std::uint32_t b) { return distintas.antes(a, b); });
+        const std::vector<std::uint32_t> ordemDistintas = distintas.emOrdem();
         lugar.resize(distintas.size());
         for (size_t d = 0; d < ordemDistintas.size(); ++d)
             lugar[ordemDistintas[d]] = std::uint32_t(d);

@@ -51,29 +51,43 @@ AttributeLayout::AttributeLayout(Database& target, const Attribute& definition)
     rotated_ = makeVariant(target, definition, true);
     // Values of a definition of another drawing may go with it: its attributes get whole tags.
     if (&definition.database() == &target) {
-        PatternTexts& texts = target.attributeLayouts().texts();
-        makePatterns(plain_, texts);
-        makePatterns(rotated_, texts);
+        AttributeLayouts& layouts = target.attributeLayouts();
+        PatternTexts& texts = layouts.texts();
+        std::array<std::string_view, SlotCount> fixed{};
+        for (Variant* variant : {&plain_, &rotated_})
+            makePatterns(*variant, texts, fixed, variant->patterns, variant->holes);
+        // The texts a flat reference's attribute would take for them, as compose gives them.
+        fixed[Z] = fixed[AlignZ] = layouts.real(target, 0.0);
+        fixed[Height] = layouts.real(target, height_);
+        for (Variant* variant : {&plain_, &rotated_})
+            makePatterns(*variant, texts, fixed, variant->flatPatterns, variant->flatHoles);
     }
 }
 
-void AttributeLayout::makePatterns(Variant& variant, PatternTexts& texts) {
-    // The handle and owner come from the object; each slot and the value get a hole.
+void AttributeLayout::makePatterns(const Variant& variant, PatternTexts& texts,
+                                   const std::array<std::string_view, SlotCount>& fixed,
+                                   std::unique_ptr<TagPattern> (&patterns)[2], Holes& holes) {
+    // The handle and owner come from the object; each slot not fixed and the value get a
+    // hole.
     std::vector<Tag> tags = variant.tags;
     tags[1].value = TagPattern::handleHole();
     tags[2].value = TagPattern::ownerHole();
-    variant.holes.fill(kNoHole);
+    holes.fill(kNoHole);
     std::size_t next = 0;
     for (std::size_t slot = 0; slot <= SlotCount; ++slot) {
         const std::size_t at = slot < SlotCount ? variant.slots[slot] : variant.value;
         if (at == kNone) continue;
-        variant.holes[slot] = static_cast<std::uint8_t>(next);
+        if (slot < SlotCount && fixed[slot].data()) {
+            tags[at].value = fixed[slot];
+            continue;
+        }
+        holes[slot] = static_cast<std::uint8_t>(next);
         tags[at].value = TagPattern::hole(next++);
     }
-    variant.patterns[0] = std::make_unique<TagPattern>(tags, texts);
+    patterns[0] = std::make_unique<TagPattern>(tags, texts);
     // The paper space flag goes right after the entity's subclass marker.
     tags.insert(tags.begin() + 4, Tag{67, "1"});
-    variant.patterns[1] = std::make_unique<TagPattern>(tags, texts);
+    patterns[1] = std::make_unique<TagPattern>(tags, texts);
 }
 
 AttributeLayout::Variant AttributeLayout::makeVariant(Database& target, const Attribute& definition,
@@ -160,21 +174,30 @@ TagPattern::Values* AttributeLayout::composeValues(
     const std::optional<std::string_view>& value) const {
     const bool rotated = placement.rotation != 0.0 || ownRotation_ != 0.0;
     const Variant& variant = rotated ? rotated_ : plain_;
-    const TagPattern* pattern = variant.patterns[placement.paperSpace ? 1 : 0].get();
-    if (!pattern || (value && variant.value == kNone)) return nullptr;
-    TagPattern::Values* made = pattern->make(target.arena());
-    std::uint32_t* holes = made->values();
-    AttributeLayouts& reals = target.attributeLayouts();
-    PatternTexts& texts = reals.texts();
-    const auto put = [&](int slot, double number) {
-        const std::uint8_t hole = variant.holes[static_cast<std::size_t>(slot)];
-        if (hole != kNoHole) holes[hole] = reals.realNumber(target, number);
+    const std::size_t space = placement.paperSpace ? 1 : 0;
+    if (!variant.patterns[space] || (value && variant.value == kNone)) return nullptr;
+    const bool aligned = variant.holes[AlignX] != kNoHole;
+    double numbers[SlotCount] = {};
+    placeNumbers(placement, rotated, aligned,
+                 [&](int slot, double number) { numbers[slot] = number; });
+    // Only a true zero and the very height are what the flat patterns hold.
+    const auto same = [](double a, double b) {
+        return std::bit_cast<std::uint64_t>(a) == std::bit_cast<std::uint64_t>(b);
     };
-    placeNumbers(placement, rotated, variant.holes[AlignX] != kNoHole, put);
+    const bool flat = same(numbers[Z], 0.0) && (!aligned || same(numbers[AlignZ], 0.0)) &&
+                      same(numbers[Height], height_);
+    const TagPattern* pattern = (flat ? variant.flatPatterns : variant.patterns)[space].get();
+    const Holes& holes = flat ? variant.flatHoles : variant.holes;
+    TagPattern::Values* made = pattern->make(target.arena());
+    std::uint32_t* own = made->values();
+    AttributeLayouts& reals = target.attributeLayouts();
+    for (std::size_t slot = 0; slot < SlotCount; ++slot)
+        if (const std::uint8_t hole = holes[slot]; hole != kNoHole)
+            own[hole] = reals.realNumber(target, numbers[slot]);
     // Short values come back from row to row (a section, a colour, a length): kept once.
-    if (const std::uint8_t hole = variant.holes[SlotCount]; hole != kNoHole)
-        holes[hole] =
-            texts.shared(value ? target.storeShared(*value) : variant.tags[variant.value].value);
+    if (const std::uint8_t hole = holes[SlotCount]; hole != kNoHole)
+        own[hole] = reals.texts().shared(value ? target.storeShared(*value)
+                                               : variant.tags[variant.value].value);
     return made;
 }
 

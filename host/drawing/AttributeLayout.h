@@ -83,6 +83,7 @@ private:
         if (rotated) put(Rotation, ownRotation_ + placement.rotation);
     }
 
+    using Holes = std::array<std::uint8_t, SlotCount + 1>;
     struct Variant {
         std::vector<Tag> tags;  // without the paper space flag
         std::array<std::size_t, SlotCount> slots{};
@@ -90,11 +91,18 @@ private:
         // The same tags as patterns, without and with the paper space flag, and the hole
         // each slot (then the value) fills; kNoHole where it has none.
         std::unique_ptr<TagPattern> patterns[2];
-        std::array<std::uint8_t, SlotCount + 1> holes{};
+        Holes holes{};
+        // The same for attributes of a flat reference (elevation zero, height unscaled), the
+        // most: the elevations and the height are the pattern's own texts.
+        std::unique_ptr<TagPattern> flatPatterns[2];
+        Holes flatHoles{};
     };
     static constexpr std::uint8_t kNoHole = 0xFF;
     Variant makeVariant(Database& target, const Attribute& definition, bool rotated) const;
-    static void makePatterns(Variant& variant, PatternTexts& texts);
+    // `fixed` holds the text of each slot that the patterns fix, null for the others.
+    static void makePatterns(const Variant& variant, PatternTexts& texts,
+                             const std::array<std::string_view, SlotCount>& fixed,
+                             std::unique_ptr<TagPattern> (&patterns)[2], Holes& holes);
 
     Point3 position_;
     Point3 alignment_;

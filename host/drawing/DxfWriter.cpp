@@ -11,6 +11,9 @@
 
 #include "sdk/AtomicFile.h"
 
+#include <bit>
+#include <cstring>
+#include <span>
 #include <unordered_set>
 
 namespace zvdb {
@@ -103,9 +106,14 @@ void DxfWriter::tag(int code, std::string_view value) {
 }
 
 const DxfWriter::PatternText& DxfWriter::patternText(const TagPattern& pattern) {
-    const auto [at, made] = patternTexts_.try_emplace(&pattern);
-    PatternText& rendered = at->second;
-    if (!made) return rendered;
+    // A reference's objects go through a few patterns by turns: those are answered here
+    // without a look-up in the map (whose texts stay where they are).
+    const auto at = reinterpret_cast<std::uintptr_t>(&pattern) * 0x9E3779B97F4A7C15ull;
+    KnownPattern& known = knownPatterns_[at >> (64 - kKnownBits)];
+    if (known.pattern == &pattern) return *known.text;
+    PatternText& rendered = patternTexts_[&pattern];
+    known = {&pattern, &rendered};
+    if (!rendered.pieces.empty()) return rendered;
     std::size_t begin = 0;
     pattern.forEachItem(
         [&](int code, TagPattern::Kind kind, std::uint8_t hole, std::string_view value) {
@@ -131,6 +139,114 @@ const DxfWriter::PatternText& DxfWriter::patternText(const TagPattern& pattern) 
 void DxfWriter::writePatterned(const DbObject& object, const TagPattern::Values& values) {
     const TagPattern& pattern = *values.pattern;
     const PatternText& rendered = patternText(pattern);
+    if (!writeWhole(object, values, rendered)) {
+        writePieces(object, values, rendered);
+        for (const Tag& item : values.xdata())
+            tag(item.code, item.value);
+    }
+    if (sink_ && out_.size() >= kChunk) flush();
+}
+
+namespace {
+
+// A group code's line as appendCode writes it (right-aligned in three), at `at`; its end.
+char* putCode(char* at, int code) {
+    char digits[16];
+    int n = 0;
+    int c = code < 0 ? -code : code;
+    do {
+        digits[n++] = static_cast<char>('0' + c % 10);
+        c /= 10;
+    } while (c);
+    if (code < 0) digits[n++] = '-';
+    for (int pad = n; pad < 3; ++pad)
+        *at++ = ' ';
+    while (n)
+        *at++ = digits[--n];
+    *at++ = '\n';
+    return at;
+}
+
+// The text at `at`; its end. An empty value may have no memory at all.
+char* putText(char* at, std::string_view text) {
+    if (!text.empty()) std::memcpy(at, text.data(), text.size());
+    return at + text.size();
+}
+
+// Upper-case hexadecimal as TagPattern::hexText gives it, at `at`; its end.
+char* putHex(char* at, std::uint64_t value) {
+    const int digits = value == 0 ? 1 : (std::bit_width(value) + 3) / 4;
+    for (int i = digits - 1; i >= 0; --i, value >>= 4)
+        at[i] = "0123456789ABCDEF"[value & 15];
+    return at + digits;
+}
+
+}  // namespace
+
+// The object's text and its extended data put in place at once, their size known
+// beforehand: one growth of the text and plain copies instead of an append, with its checks,
+// for each run and value. False, with nothing written, when a value needs the code page or
+// the pattern has more values than are kept here.
+bool DxfWriter::writeWhole(const DbObject& object, const TagPattern::Values& values,
+                           const PatternText& rendered) {
+    constexpr std::size_t kMaxPieces = 32;
+    constexpr std::size_t kHexDigits = 16;
+    const std::size_t count = rendered.pieces.size();
+    if (count > kMaxPieces) return false;
+    std::string_view own[kMaxPieces];
+    const TagPattern& pattern = *values.pattern;
+    std::size_t size = rendered.text.size() + count;
+    for (std::size_t i = 0; i < count; ++i) {
+        const PatternText::Piece& piece = rendered.pieces[i];
+        if (piece.value == TagPattern::Kind::Hole) {
+            own[i] = pattern.holeValue(values, piece.hole);
+            if (legacyEncoding_ && !TextCodec::isAscii(own[i])) return false;
+            size += own[i].size();
+        } else if (piece.value != TagPattern::Kind::Fixed) {
+            size += kHexDigits;
+        }
+    }
+    // A code takes at most six characters and its line end.
+    constexpr std::size_t kCodeLine = 7;
+    const std::span<const Tag> xdata = values.xdata();
+    for (const Tag& item : xdata) {
+        if (legacyEncoding_ && !TextCodec::isAscii(item.value)) return false;
+        size += kCodeLine + item.value.size() + 1;
+    }
+    const std::size_t start = out_.size();
+    out_.resize(start + size);
+    char* at = out_.data() + start;
+    const char* text = rendered.text.data();
+    for (std::size_t i = 0; i < count; ++i) {
+        const PatternText::Piece& piece = rendered.pieces[i];
+        std::memcpy(at, text + piece.begin, piece.size);
+        at += piece.size;
+        switch (piece.value) {
+            case TagPattern::Kind::Fixed:
+                continue;
+            case TagPattern::Kind::Hole:
+                at = putText(at, own[i]);
+                break;
+            case TagPattern::Kind::Handle:
+            case TagPattern::Kind::Owner: {
+                const bool handle = piece.value == TagPattern::Kind::Handle;
+                at = putHex(at, handle ? object.handle() : object.ownerHandle());
+                break;
+            }
+        }
+        *at++ = '\n';
+    }
+    for (const Tag& item : xdata) {
+        at = putText(putCode(at, item.code), item.value);
+        *at++ = '\n';
+    }
+    out_.resize(static_cast<std::size_t>(at - out_.data()));
+    return true;
+}
+
+void DxfWriter::writePieces(const DbObject& object, const TagPattern::Values& values,
+                            const PatternText& rendered) {
+    const TagPattern& pattern = *values.pattern;
     for (const PatternText::Piece& piece : rendered.pieces) {
         out_.append(rendered.text, piece.begin, piece.size);
         switch (piece.value) {
@@ -150,9 +266,6 @@ void DxfWriter::writePatterned(const DbObject& object, const TagPattern::Values&
         }
         out_ += '\n';
     }
-    for (const Tag& item : values.xdata())
-        tag(item.code, item.value);
-    if (sink_ && out_.size() >= kChunk) flush();
 }
 
 void DxfWriter::flush() {

@@ -3,6 +3,7 @@
 // $HANDSEED above all handles, every extended-data application registered, table counts
 // brought up to date. Files before R2007 are written in their code page, with \U+XXXX for
 // characters it lacks; R2007 and later in UTF-8.
+#include <array>
 #include <cstdint>
 #include <string>
 #include <unordered_map>
@@ -55,6 +56,10 @@ private:
     };
     const PatternText& patternText(const TagPattern& pattern);
     void writePatterned(const DbObject& object, const TagPattern::Values& values);
+    bool writeWhole(const DbObject& object, const TagPattern::Values& values,
+                    const PatternText& rendered);
+    void writePieces(const DbObject& object, const TagPattern::Values& values,
+                     const PatternText& rendered);
     void flush();
     void writeTableHead(const class SymbolTable& table);
     bool isErasedObject(const Tag& pointer) const;
@@ -66,6 +71,12 @@ private:
     bool legacyEncoding_ = false;
     std::string codePage_;
     std::unordered_map<const TagPattern*, PatternText> patternTexts_;
+    struct KnownPattern {
+        const TagPattern* pattern = nullptr;
+        const PatternText* text = nullptr;
+    };
+    static constexpr int kKnownBits = 6;
+    std::array<KnownPattern, std::size_t(1) << kKnownBits> knownPatterns_{};
 };
 
 }  // namespace zvdb

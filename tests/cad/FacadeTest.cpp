@@ -336,8 +336,10 @@ TEST_F(FacadeFixture, InsertingAFoundDefinitionAndWritingTextsGiveWhatTheLongWay
 
 // A writer's run of insertions finds each block and page once: a reference lands on the
 // layer of its own call, and a definition or a layer erased between two calls is loaded or
-// made again, as the name-and-file insertion would.
+// made again, as the name-and-file insertion would; so too when the calls pass the very
+// same texts, as writers do row after row.
 TEST_F(FacadeFixture, RepeatedInsertionsFindAnErasedBlockOrLayerAgain) {
+    const QString nome = "REPETIDO", pag2 = "PAG2";
     const QString caminho = arquivoBloco("REPETIDO", {"VARIAVEL_1"});
     const CEValoresAtributos valores = [](const QString& tag,
                                           const QString&) -> std::optional<QString> {
@@ -348,7 +350,7 @@ TEST_F(FacadeFixture, RepeatedInsertionsFindAnErasedBlockOrLayerAgain) {
         return dynamic_cast<zvdb::BlockReference*>(db().objectByHandle(id.handle()));
     };
     const OdDbObjectId primeira = insercoes.Insere(caminho, "REPETIDO", "PAG1", 0, 0, valores);
-    const OdDbObjectId segunda = insercoes.Insere(caminho, "REPETIDO", "PAG2", 10, 0);
+    const OdDbObjectId segunda = insercoes.Insere(caminho, nome, pag2, 10, 0);
     ASSERT_TRUE(referencia(primeira) && referencia(segunda));
     EXPECT_EQ(referencia(primeira)->layer(), "PAG1");
     EXPECT_EQ(referencia(segunda)->layer(), "PAG2");
@@ -361,7 +363,7 @@ TEST_F(FacadeFixture, RepeatedInsertionsFindAnErasedBlockOrLayerAgain) {
     db().objectByHandle(antigo.handle())->erase();
     db().layer("PAG2")->erase();
     ASSERT_FALSE(CICad::ExisteLayer("PAG2"));
-    const OdDbObjectId terceira = insercoes.Insere(caminho, "REPETIDO", "PAG2", 20, 0);
+    const OdDbObjectId terceira = insercoes.Insere(caminho, nome, pag2, 20, 0);
     ASSERT_TRUE(referencia(terceira));
     OdDbObjectId novo;
     ASSERT_TRUE(CICad::GetBlocoId("REPETIDO", novo));
@@ -373,9 +375,10 @@ TEST_F(FacadeFixture, RepeatedInsertionsFindAnErasedBlockOrLayerAgain) {
 
 // The tag and default asked about are those of the definition as it stands at each
 // insertion: a definition edited, or a block redefined from its file, between two rows.
-// Values of every kind reach their attributes as UTF-8: plain, accented, empty, longer than
-// a row's values together, and for more attributes than a row has; read back from the
-// drawing and from the saved file alike.
+// Values of every kind reach their attributes as UTF-8: plain, accented, of two and three
+// bytes a letter, beyond the basic plane, empty, longer than a row's values together (plain
+// or not), and for more attributes than a row has; read back from the drawing and from the
+// saved file alike.
 TEST_F(FacadeFixture, EveryValueReachesItsAttributeWhateverItsTextAndTheirNumber) {
     QStringList tags;
     for (int i = 0; i < 20; ++i)
@@ -386,6 +389,9 @@ TEST_F(FacadeFixture, EveryValueReachesItsAttributeWhateverItsTextAndTheirNumber
         const int i = tag.mid(6).toInt();
         if (i == 3) return std::nullopt;
         if (i == 5) return longo;
+        if (i == 7) return QString::fromUtf8("2,5mm² € \xF0\x9F\x98\x80 ") + tag;
+        if (i == 8) return QString::fromUtf8("é").repeated(600);
+        if (i == 10) return QString::fromUtf8("中文 € ²") + tag;
         if (i % 4 == 1) return QString::fromUtf8("ação Ø ") + tag;
         if (i == 6) return QString();
         return tag.toLower();
@@ -414,6 +420,11 @@ TEST_F(FacadeFixture, EveryValueReachesItsAttributeWhateverItsTextAndTheirNumber
     EXPECT_EQ(lidos(*ref), esperados);
     EXPECT_EQ(esperados[9], "ação Ø CAMPO_9");
     EXPECT_EQ(esperados[5].size(), 1500u);
+    EXPECT_EQ(esperados[7], "2,5mm\xC2\xB2 \xE2\x82\xAC \xF0\x9F\x98\x80 CAMPO_7");
+    EXPECT_EQ(esperados[8].size(), 1200u);
+    EXPECT_EQ(esperados[10],
+              "\xE4\xB8\xAD\xE6\x96\x87 \xE2\x82\xAC \xC2\xB2"
+              "CAMPO_10");
     const auto salvo = zvdb::DxfLoader::load(zvdb::DxfWriter::toText(db()));
     auto* lido = dynamic_cast<zvdb::BlockReference*>(salvo->objectByHandle(id.handle()));
     ASSERT_TRUE(lido);

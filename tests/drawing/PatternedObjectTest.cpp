@@ -147,38 +147,56 @@ TEST(PatternedObjects, TagsAreThoseOfTheStepByStepAttribute) {
     Database db;
     BlockRecord* block = sampleBlock(db);
     const std::vector<std::optional<std::string_view>> values = {"v1", std::nullopt, "v3", "v4"};
-    for (const bool paper : {false, true})
-        for (const double degrees : {0.0, 30.0}) {
-            SCOPED_TRACE(degrees);
-            const Made fast = insert(db, *block, {3, 4, 0}, {1, 2, 1}, degrees, paper, values);
-            BlockRecord* owner = paper ? db.paperSpace() : db.modelSpace();
-            BlockReference* slow =
-                owner->addBlockReference(*block, {3, 4, 0}, {1, 2, 1}, degrees, "PAGE");
-            std::size_t i = 0;
-            for (Attribute* definition : block->attributeDefinitions()) {
-                if (definition->isConstant()) continue;
-                Attribute* made = madeStepByStep(*slow, *definition);
-                if (values[i]) made->setTextValue(*values[i]);
-                ++i;
+    // Scaled, flat (the elevations and heights are the patterns' own), raised, at a zero
+    // that may come out negative, below zero; whether each is flat (-1: either).
+    struct Placement {
+        Point3 at, scale;
+        int flat;
+    };
+    const Placement placements[] = {{{3, 4, 0}, {1, 2, 1}, 0},
+                                    {{3, 4, 0}, {1, 1, 1}, 1},
+                                    {{3, 4, 0.5}, {1, 1, 1}, 0},
+                                    {{3, 4, -0.0}, {1, 1, 1}, -1},
+                                    {{3, 4, -2}, {1, 1, 1}, 0}};
+    for (const auto& [at, scale, flat] : placements)
+        for (const bool paper : {false, true})
+            for (const double degrees : {0.0, 30.0}) {
+                SCOPED_TRACE(::testing::Message()
+                             << degrees << " at " << at.z << " scale " << scale.y);
+                const Made fast = insert(db, *block, at, scale, degrees, paper, values);
+                BlockRecord* owner = paper ? db.paperSpace() : db.modelSpace();
+                BlockReference* slow = owner->addBlockReference(*block, at, scale, degrees, "PAGE");
+                std::size_t i = 0;
+                for (Attribute* definition : block->attributeDefinitions()) {
+                    if (definition->isConstant()) continue;
+                    Attribute* made = madeStepByStep(*slow, *definition);
+                    if (values[i]) made->setTextValue(*values[i]);
+                    ++i;
+                }
+                ASSERT_EQ(fast.attributes.size(), 4u);
+                // A flat reference's attributes keep neither elevation nor height of their own:
+                // the aligned one's position, alignment point, height, value (and rotation).
+                const std::size_t aligned = 8 + (degrees != 0 ? 1 : 0);
+                if (flat >= 0)
+                    EXPECT_EQ(fast.attributes[1]->patternValues()->pattern->holeCount(),
+                              flat ? aligned - 3 : aligned);
+                for (std::size_t k = 0; k < fast.attributes.size(); ++k) {
+                    Attribute* mine = fast.attributes[k];
+                    // Type, handle and owner are answered without the tags.
+                    EXPECT_EQ(mine->type(), "ATTRIB");
+                    EXPECT_TRUE(mine->isPatterned());
+                    std::vector<std::string> expected = lines(*slow->attributes()[k]);
+                    expected[1] = "5 " + TagValues::fromHandle(mine->handle());
+                    expected[2] = "330 " + TagValues::fromHandle(fast.reference->handle());
+                    EXPECT_EQ(lines(*mine), expected);
+                    EXPECT_FALSE(mine->isPatterned());
+                }
+                std::vector<std::string> seqend = lines(*slow->seqend());
+                seqend[1] = "5 " + TagValues::fromHandle(fast.reference->seqend()->handle());
+                seqend[2] = "330 " + TagValues::fromHandle(fast.reference->handle());
+                EXPECT_EQ(lines(*fast.reference->seqend()), seqend);
+                EXPECT_EQ(fast.attributes[3]->text(101), "Embedded Object") << "multi-line part";
             }
-            ASSERT_EQ(fast.attributes.size(), 4u);
-            for (std::size_t k = 0; k < fast.attributes.size(); ++k) {
-                Attribute* mine = fast.attributes[k];
-                // Type, handle and owner are answered without the tags.
-                EXPECT_EQ(mine->type(), "ATTRIB");
-                EXPECT_TRUE(mine->isPatterned());
-                std::vector<std::string> expected = lines(*slow->attributes()[k]);
-                expected[1] = "5 " + TagValues::fromHandle(mine->handle());
-                expected[2] = "330 " + TagValues::fromHandle(fast.reference->handle());
-                EXPECT_EQ(lines(*mine), expected);
-                EXPECT_FALSE(mine->isPatterned());
-            }
-            std::vector<std::string> seqend = lines(*slow->seqend());
-            seqend[1] = "5 " + TagValues::fromHandle(fast.reference->seqend()->handle());
-            seqend[2] = "330 " + TagValues::fromHandle(fast.reference->handle());
-            EXPECT_EQ(lines(*fast.reference->seqend()), seqend);
-            EXPECT_EQ(fast.attributes[3]->text(101), "Embedded Object") << "multi-line part";
-        }
 }
 
 TEST(PatternedObjects, ChangesAfterMakingAreWrittenAndReadBack) {

@@ -77,6 +77,19 @@ TEST_F(WireLayoutTest, AFullPageStartsTheNextAtTheItemsIndex) {
     EXPECT_EQ(paginas(escritor),
               QStringList({"1 7 | 1@10,200 2@10,195 3@10,190 4@110,200 5@110,195 6@110,190",
                            "6 7 | 7@10,200"}));
+    // Each page took room for its three rows by two columns at its first row, and needed
+    // no more; a template's absurd grid takes a bounded room.
+    itens_.clear();
+    for (const char* n : {"1", "2", "3", "4", "5", "6", "7"})
+        fio(n);
+    for (const CEPaginaLista& pagina : escritor.Diagrama(itens_, modelo_, {}))
+        EXPECT_EQ(pagina.linhas.capacity(), 6u);
+    modelo_.simbolos["*LINHAS_POR_PAGINA*"] = 1 << 30;
+    modelo_.simbolos["*NUMERO_COLUNA*"] = -5;
+    const std::vector<CEPaginaLista> grande = escritor.Diagrama(itens_, modelo_, {});
+    ASSERT_EQ(grande.size(), 1u);
+    EXPECT_EQ(grande[0].linhas.size(), 7u);
+    EXPECT_EQ(grande[0].linhas.capacity(), size_t(CCListaPaginada::Grade::kMaxLinhas));
 }
 
 TEST_F(WireLayoutTest, AnyOrderButCReversesTheSortedList) {

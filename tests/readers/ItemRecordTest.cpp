@@ -574,6 +574,42 @@ TEST(OrderingTest, ManyDistinctTextsSortAsTheirComparisonDoes) {
     EXPECT_EQ(Valores(v, "ID"), Valores(estavel, "ID"));
 }
 
+TEST(OrderingTest, TextsAlikeForLongOrBeyondLatinSortAsTheirComparisonDoes) {
+    // Texts that differ only far into their natural forms, by a unit from 0xFF on, by an
+    // embedded null or by ending early, each unit class beside the digits: every pair must
+    // come out as the field-by-field comparison orders it.
+    const QString inicio = "X12:34-";
+    const QChar unidades[] = {QChar(0),     QChar('/'),   QChar('0'),    QChar('9'),
+                              QChar(':'),   QChar('A'),   QChar(0xFE),   QChar(0xFF),
+                              QChar(0x100), QChar(0x3A9), QChar(0xFFFF), QChar('a')};
+    Itens itens;
+    VetorItens v;
+    int id = 0;
+    for (const QString& base : QStringList{QString(), inicio, inicio + inicio, inicio + "777777"}) {
+        for (const QChar a : unidades) {
+            for (const QChar b : unidades) {
+                CEItemLista* item = itens.novo({{"ID", ""}});
+                item->definirCampoInteiro("ID", id++);
+                item->definirCampo("T", base + a + b);
+                v.push_back(item);
+            }
+            CEItemLista* item = itens.novo({{"ID", ""}});
+            item->definirCampoInteiro("ID", id++);
+            item->definirCampo("T", base + a);
+            v.push_back(item);
+        }
+    }
+    std::reverse(v.begin(), v.end());
+    VetorItens esperado = v;
+    std::stable_sort(esperado.begin(), esperado.end(),
+                     [](const CEItemLista* a, const CEItemLista* b) {
+                         return VetorItens::compararItens(a, b, {"T"}) < 0;
+                     });
+    v.ordenarEstavel({"T"});
+    EXPECT_EQ(Valores(v, "T"), Valores(esperado, "T"));
+    EXPECT_EQ(Valores(v, "ID"), Valores(esperado, "ID"));
+}
+
 TEST(OrderingTest, AStableSortKeepsTiedItemsInTheirFirstOrder) {
     // Enough items that an unstable sort would move ties (the test above shows it does).
     Itens itens;
