@@ -177,9 +177,10 @@ TEST(PatternedObjects, TagsAreThoseOfTheStepByStepAttribute) {
                 // A flat reference's attributes keep neither elevation nor height of their own:
                 // the aligned one's position, alignment point, height, value (and rotation).
                 const std::size_t aligned = 8 + (degrees != 0 ? 1 : 0);
-                if (flat >= 0)
+                if (flat >= 0) {
                     EXPECT_EQ(fast.attributes[1]->patternValues()->pattern->holeCount(),
                               flat ? aligned - 3 : aligned);
+                }
                 for (std::size_t k = 0; k < fast.attributes.size(); ++k) {
                     Attribute* mine = fast.attributes[k];
                     // Type, handle and owner are answered without the tags.
