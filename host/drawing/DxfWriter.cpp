@@ -69,9 +69,10 @@ void DxfWriter::prepare() {
     codePage_ = std::string(db_.header_.text("$DWGCODEPAGE", "ANSI_1252"));
 }
 
-// Inlined: the writer calls these for every tag of the drawing.
-[[gnu::always_inline]] inline void DxfWriter::appendCode(std::string& out, int code) {
-    char buffer[16];
+namespace {
+
+// A group code's line (right-aligned in three) in `buffer`; its length.
+[[gnu::always_inline]] inline std::size_t codeLine(char (&buffer)[16], int code) {
     int n = 0;
     char digits[16];
     int c = code < 0 ? -code : code;
@@ -86,7 +87,23 @@ void DxfWriter::prepare() {
     while (n)
         buffer[len++] = digits[--n];
     buffer[len++] = '\n';
-    out.append(buffer, static_cast<std::size_t>(len));
+    return static_cast<std::size_t>(len);
+}
+
+// The same line at `at`; its end.
+char* putCode(char* at, int code) {
+    char buffer[16];
+    const std::size_t len = codeLine(buffer, code);
+    std::memcpy(at, buffer, len);
+    return at + len;
+}
+
+}  // namespace
+
+// Inlined: the writer calls these for every tag of the drawing.
+[[gnu::always_inline]] inline void DxfWriter::appendCode(std::string& out, int code) {
+    char buffer[16];
+    out.append(buffer, codeLine(buffer, code));
 }
 
 [[gnu::always_inline]] inline void DxfWriter::appendValue(std::string& out,
@@ -148,24 +165,6 @@ void DxfWriter::writePatterned(const DbObject& object, const TagPattern::Values&
 }
 
 namespace {
-
-// A group code's line as appendCode writes it (right-aligned in three), at `at`; its end.
-char* putCode(char* at, int code) {
-    char digits[16];
-    int n = 0;
-    int c = code < 0 ? -code : code;
-    do {
-        digits[n++] = static_cast<char>('0' + c % 10);
-        c /= 10;
-    } while (c);
-    if (code < 0) digits[n++] = '-';
-    for (int pad = n; pad < 3; ++pad)
-        *at++ = ' ';
-    while (n)
-        *at++ = digits[--n];
-    *at++ = '\n';
-    return at;
-}
 
 // The text at `at`; its end. An empty value may have no memory at all.
 char* putText(char* at, std::string_view text) {
