@@ -678,8 +678,11 @@ TEST_F(FacadeFixture, AWireReadsItsKeyAndTextsInOneWalk) {
     const OdDbObjectId fio = id(ms->addCircle({0, 0, 0}, 1));
     CICad::SetXData(fio, "KVR_ZV_CABO", {{1000, "C1"}});
     CICad::SetXData(fio, "KVR_ZV_WIRE",
-                    {{1070, "3"}, {1000, QString("FIO") + QChar(0x0C) + "IEC"}, {1000, "12"},
-                     {1010, "", 1.5, 2.5, 0}, {1000, "COR=AZ"}});
+                    {{1070, "3"},
+                     {1000, QString("FIO") + QChar(0x0C) + "IEC"},
+                     {1000, "12"},
+                     {1010, "", 1.5, 2.5, 0},
+                     {1000, "COR=AZ"}});
     std::string_view chave;
     bool temChave = true;
     std::vector<std::string_view> textos{"antes"};
