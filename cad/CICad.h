@@ -314,6 +314,10 @@ public:
     // The key text alone, as LeituraSimbolo reads it: false when none of the key applications
     // has items.
     static bool TextoChave(const OdDbObjectId& entidade, std::string_view& texto, bool& temTexto);
+    // A wire's key text, as TextoChave reads it, and the texts TextosXData gives for
+    // "KVR_ZV_WIRE", from one walk of its extended data.
+    static bool TextosFio(const OdDbObjectId& fio, std::string_view& chave, bool& temChave,
+                          std::vector<std::string_view>& textos);
     // Whether the attribute is invisible.
     static bool AtributoInvisivel(const OdDbObjectId& atributo);
     static void SetXData(const OdDbObjectId& id, const QString& aplicacao,

@@ -51,15 +51,6 @@ void GravaTextoConfiguracao(const QString& aplicacao, const QString& valor) {
     ponto->setXData(U8(aplicacao), std::span<const zvdb::Tag>(&item, 1));
 }
 
-// Past a point's y and z items, which belong to its one item (`i` at its x).
-void PassaPonto(std::span<const zvdb::Tag> itens, std::size_t& i) {
-    const int codigo = itens[i].code;
-    if (codigo < 1010 || codigo > 1013) return;
-    while (i + 1 < itens.size() &&
-           (itens[i + 1].code == codigo + 10 || itens[i + 1].code == codigo + 20))
-        ++i;
-}
-
 CEItemXData ItemXData(std::span<const zvdb::Tag> itens, std::size_t& i) {
     CEItemXData item;
     item.codigo = itens[i].code;
@@ -125,6 +116,14 @@ OdDbObjectId IdDoItem(zvdb::Database& db, const CEListaXData& itens, size_t indi
 }
 
 }  // namespace
+
+void cicad::PassaPonto(std::span<const zvdb::Tag> itens, std::size_t& i) {
+    const int codigo = itens[i].code;
+    if (codigo < 1010 || codigo > 1013) return;
+    while (i + 1 < itens.size() &&
+           (itens[i + 1].code == codigo + 10 || itens[i + 1].code == codigo + 20))
+        ++i;
+}
 
 // ---- extended data, masters, project settings
 

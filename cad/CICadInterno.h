@@ -14,6 +14,7 @@
 #include <cstdint>
 #include <exception>
 #include <optional>
+#include <span>
 #include <string>
 #include <string_view>
 #include <type_traits>
@@ -96,6 +97,9 @@ struct AtributosNovos {
 };
 void PreparaAtributos(zvdb::Database& db, const zvdb::BlockRecord& bloco,
                       const CEValoresAtributos& valores, AtributosNovos& novos);
+
+// Past a point's y and z items in extended data, which belong to its one item (`i` at its x).
+void PassaPonto(std::span<const zvdb::Tag> itens, std::size_t& i);
 
 // The project-settings operations log what goes wrong and answer nothing.
 template <class F>

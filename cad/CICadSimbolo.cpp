@@ -51,6 +51,21 @@ bool CICad::TextoChave(const OdDbObjectId& entidade, std::string_view& texto, bo
     return objeto && Chave(Grupos(*objeto), texto, temTexto);
 }
 
+bool CICad::TextosFio(const OdDbObjectId& fio, std::string_view& chave, bool& temChave,
+                      std::vector<std::string_view>& textos) {
+    textos.clear();
+    temChave = false;
+    zvdb::DbObject* objeto = Objeto(fio);
+    if (!objeto) return false;
+    const auto grupos = Grupos(*objeto);
+    const std::span<const zvdb::Tag> itens = grupos[kZvWire];
+    for (std::size_t i = 0; i < itens.size(); ++i) {
+        textos.push_back(itens[i].value);
+        PassaPonto(itens, i);
+    }
+    return Chave(grupos, chave, temChave);
+}
+
 bool CICad::AtributoInvisivel(const OdDbObjectId& atributo) {
     auto* a = Como<zvdb::Attribute>(atributo);
     return a && a->isInvisible();

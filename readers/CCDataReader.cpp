@@ -724,15 +724,18 @@ void CCDataReader::LeRotasDoItem(const CEItemLista& item, CETemplate* modelo) {
 }
 
 bool CCDataReader::LeCamposFio(const QString& s, CEItemLista& item, const OdDbObjectId& polilinha) {
-    // Wires repeat their key texts: each is split and looked up once for the run.
-    PoeColunasFio(s, item, ChaveDaEntidadeLida(polilinha));
     if (appFioEm_ != polilinha.database() ||
         appFioVersao_ != CICad::VersaoDesenho(polilinha.database())) {
         CICad::RegistraApp("KVR_ZV_WIRE", polilinha.database());
         appFioEm_ = polilinha.database();
         appFioVersao_ = CICad::VersaoDesenho(polilinha.database());
     }
-    CICad::TextosXData(polilinha, "KVR_ZV_WIRE", textosFio_);
+    // The key and the wire's own texts come from one walk of its extended data.
+    std::string_view textoChave;
+    bool temTextoChave = false;
+    const bool temChave = CICad::TextosFio(polilinha, textoChave, temTextoChave, textosFio_);
+    // Wires repeat their key texts: each is split and looked up once for the run.
+    PoeColunasFio(s, item, temChave && temTextoChave ? ChaveDoTexto(textoChave) : semChave_);
     const ChaveLida* chave = &semChave_;
     if (!textosFio_.empty()) {
         chave = &ChaveDoTexto(textosFio_[0]);

@@ -421,8 +421,6 @@ private:
     // their items share one text.
     mutable TabelaTextos<QString> valores_;
     const QString& ValorDoTexto(std::string_view valor) const;
-    // The key text of an entity as ChaveENorma reads it; semChave_ without one.
-    const ChaveLida& ChaveDaEntidadeLida(const OdDbObjectId& entidade) const;
     // A wire's catalogue columns under the suffix, and its list and description, asked of
     // the catalogue once per key.
     void PoeColunasFio(const QString& s, CEItemLista& item, const ChaveLida& chave);

@@ -56,14 +56,6 @@ bool CCDataReader::ChaveENorma(const OdDbObjectId& entidade, QString& chave, QSt
     return true;
 }
 
-const CCDataReader::ChaveLida& CCDataReader::ChaveDaEntidadeLida(
-    const OdDbObjectId& entidade) const {
-    std::string_view texto;
-    bool temTexto = false;
-    if (!CICad::TextoChave(entidade, texto, temTexto) || !temTexto) return semChave_;
-    return ChaveDoTexto(texto);
-}
-
 void CCDataReader::PoeColunasFio(const QString& s, CEItemLista& item, const ChaveLida& chave) {
     if (chave.colunasFio) {
         for (const auto& [nome, valor] : *chave.colunasFio)

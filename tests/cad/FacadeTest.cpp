@@ -670,6 +670,59 @@ TEST_F(FacadeFixture, ASymbolReadInTwoStepsGivesTheWholeReading) {
     EXPECT_FALSE(CICad::LeituraChaveSimbolo(OdDbObjectId(&db(), 0xFFFFFF), chave));
 }
 
+// A wire's one reading of its extended data gives the key text the key applications give,
+// in their order, and its own texts item by item, a point counting as one.
+TEST_F(FacadeFixture, AWireReadsItsKeyAndTextsInOneWalk) {
+    zvdb::BlockRecord* ms = db().modelSpace();
+    auto id = [this](zvdb::DbObject* o) { return OdDbObjectId(&db(), o->handle()); };
+    const OdDbObjectId fio = id(ms->addCircle({0, 0, 0}, 1));
+    CICad::SetXData(fio, "KVR_ZV_CABO", {{1000, "C1"}});
+    CICad::SetXData(fio, "KVR_ZV_WIRE",
+                    {{1070, "3"},
+                     {1000, QString("FIO") + QChar(0x0C) + "IEC"},
+                     {1000, "12"},
+                     {1010, "", 1.5, 2.5, 0},
+                     {1000, "COR=AZ"}});
+    std::string_view chave;
+    bool temChave = true;
+    std::vector<std::string_view> textos{"antes"};
+    ASSERT_TRUE(CICad::TextosFio(fio, chave, temChave, textos));
+    EXPECT_TRUE(temChave);
+    EXPECT_EQ(chave,
+              "FIO\x0c"
+              "IEC");
+    ASSERT_EQ(textos.size(), 5u);
+    EXPECT_EQ(textos[1], chave);
+    EXPECT_EQ(textos[2], "12");
+    EXPECT_EQ(textos[4], "COR=AZ");
+    std::vector<std::string_view> aparte;
+    CICad::TextosXData(fio, "KVR_ZV_WIRE", aparte);
+    EXPECT_EQ(textos, aparte);
+
+    // The symbol's own key data comes before the wire's; a key application without a text
+    // item has a key but no text.
+    CICad::SetXData(fio, "KVR_ZV", {{1070, "1"}});
+    ASSERT_TRUE(CICad::TextosFio(fio, chave, temChave, textos));
+    EXPECT_FALSE(temChave);
+    EXPECT_EQ(textos.size(), 5u);
+
+    const OdDbObjectId cabo = id(ms->addCircle({5, 0, 0}, 1));
+    CICad::SetXData(cabo, "KVR_ZV_CABO", {{1000, "C1"}});
+    ASSERT_TRUE(CICad::TextosFio(cabo, chave, temChave, textos));
+    EXPECT_TRUE(temChave);
+    EXPECT_EQ(chave, "C1");
+    EXPECT_TRUE(textos.empty());
+
+    const OdDbObjectId nada = id(ms->addCircle({9, 0, 0}, 1));
+    textos = {"antes"};
+    EXPECT_FALSE(CICad::TextosFio(nada, chave, temChave, textos));
+    EXPECT_FALSE(temChave);
+    EXPECT_TRUE(textos.empty());
+    textos = {"antes"};
+    EXPECT_FALSE(CICad::TextosFio(OdDbObjectId(&db(), 0xFFFFFF), chave, temChave, textos));
+    EXPECT_TRUE(textos.empty());
+}
+
 TEST_F(FacadeFixture, MastersResolveThroughEachApplication) {
     zvdb::BlockRecord* ms = db().modelSpace();
     auto id = [this](zvdb::DbObject* o) { return OdDbObjectId(&db(), o->handle()); };

@@ -395,6 +395,10 @@ TEST_F(WireReaderTest, AWiresFieldsFollowItsTextsUnderAnySuffixAndAfterAChange) 
     EXPECT_EQ(lidoB.valorCampo("FIO_X"), "30");
     EXPECT_FALSE(lidoB.temCampo("FIO"));
     EXPECT_EQ(lidoB.valorCampo("ZV_KEY_X"), "10006");
+    // The key's catalogue columns come with the wire, under the suffix too.
+    EXPECT_EQ(lidoA.valorCampo("REFERENCIA"), "FX-1.5-BK");
+    EXPECT_EQ(lidoB.valorCampo("SECAO_MM2_X"), "1.5");
+    EXPECT_FALSE(lidoB.temCampo("REFERENCIA"));
 
     // The texts changed in the drawing: the next reading gives the new fields; a text of
     // three parts or of separators alone is no field.
@@ -410,6 +414,7 @@ TEST_F(WireReaderTest, AWiresFieldsFollowItsTextsUnderAnySuffixAndAfterAChange) 
     leitor.LeFio(QString(), depois, id(b), &modelo_);
     EXPECT_EQ(depois.valorCampo("FIO"), "31");
     EXPECT_EQ(depois.valorCampo("COR"), "AZ");
+    EXPECT_EQ(depois.valorCampo("FABRICANTE"), "Condutel");
     EXPECT_FALSE(depois.temCampo("A"));
     CCFioDataReader novo;
     CEItemLista novoB;
