@@ -5,6 +5,7 @@
 #include "CCFioDataReader.h"
 #include "CEAtributo.h"
 #include "Descarte.h"
+#include "NomeCampo.h"
 #include "catalogue/CEConexaoCatalogo.h"
 #include "export/CEExportacao.h"
 #include "lists/CETemplate.h"
@@ -22,27 +23,6 @@ namespace {
 constexpr const char* kRelacoes[3] = {"RELACAO", "TAG", "ETIQUETA"};
 constexpr const char* kReguas[3] = {"REGUA", "STRIP", "REGLETA"};
 constexpr const char* kNumeros[3] = {"NUMERO", "NUMBER", "NUMERO"};
-
-// A field name and its number. The number is taken when an item first gets the field, as
-// naming the field there would; a question about a name no item has yet numbers nothing.
-class NomeCampo {
-public:
-    NomeCampo() = default;
-    explicit NomeCampo(const QString& texto) : texto_(texto) {}
-    std::uint32_t ParaDefinir() {
-        if (numero_ == CamposItem::kSemNome) numero_ = CamposItem::numero(texto_);
-        return numero_;
-    }
-    // kSemNome while no item has the field.
-    std::uint32_t ParaBuscar() {
-        if (numero_ == CamposItem::kSemNome) numero_ = CamposItem::numeroSeHouver(texto_);
-        return numero_;
-    }
-
-private:
-    QString texto_;
-    std::uint32_t numero_ = CamposItem::kSemNome;
-};
 
 QString Primeiro(const CEItemLista& item, std::array<NomeCampo, 3>& nomes) {
     for (NomeCampo& nome : nomes) {

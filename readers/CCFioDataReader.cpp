@@ -1,6 +1,7 @@
 #include "CCFioDataReader.h"
 
 #include "CEAtributo.h"
+#include "NomeCampo.h"
 #include "SelecaoPaginas.h"
 #include "lists/CETemplate.h"
 #include "module/CIProgress.h"
@@ -17,34 +18,6 @@ QString Tag(CampoTraduzido campo, int idioma) {
 void Define(CIProgress* progresso, int percentual) {
     if (progresso) progresso->Definir(percentual);
 }
-
-// A field name an end's relation reads and writes, by its number: found once, or known
-// absent while the name table does not grow. Only a field set enters the table, as before,
-// so the order of an item's fields does not change.
-class NomeCampo {
-public:
-    NomeCampo() = default;
-    explicit NomeCampo(QString texto) : texto_(std::move(texto)) {}
-    const QString* Em(const CEItemLista& item) const {
-        if (numero_ == CamposItem::kSemNome) {
-            const std::size_t nomes = CamposItem::quantidadeNomes();
-            if (nomes == conferido_) return nullptr;
-            numero_ = CamposItem::numeroSeHouver(texto_);
-            conferido_ = nomes;
-            if (numero_ == CamposItem::kSemNome) return nullptr;
-        }
-        return item.campos.procura(numero_);
-    }
-    void Define(CEItemLista& item, const QString& valor) const {
-        if (numero_ == CamposItem::kSemNome) numero_ = CamposItem::numero(texto_);
-        item.definirCampo(numero_, valor);
-    }
-
-private:
-    QString texto_;
-    mutable std::uint32_t numero_ = CamposItem::kSemNome;
-    mutable std::size_t conferido_ = ~std::size_t(0);
-};
 
 // The names of an end under one suffix, made once: each stretch end asks for some twenty.
 struct NomesExtremidade {
