@@ -167,6 +167,10 @@ public:
                                          const CEValoresAtributos& valores = {});
     static std::unique_ptr<zv::CEListaAtributos> GetDefinicoesAtributos(const QString& arquivo,
                                                                         const QString& nome);
+    // The same without defining the block: from the drawing's block of that name, else read
+    // from the file alone. Null when neither is there.
+    static std::unique_ptr<zv::CEListaAtributos> LeDefinicoesAtributos(const QString& arquivo,
+                                                                       const QString& nome);
     static OdDbObjectId GetReferenciaNoLayer(const QString& nome, const QString& layer);
     static QString GetValorSimboloPagina(const QString& tag, const QString& nome,
                                          const QString& layer);

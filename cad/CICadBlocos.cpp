@@ -52,6 +52,19 @@ void RejeitaBloco(const QString& mensagem, const QString& nome, const QString& a
     CICad::Imprime("\n" + mensagem + nome + " = " + CaminhoParaMensagem(arquivo) + "\n");
 }
 
+// The block's attribute definitions that take a value, with their ids when `comIds`.
+std::unique_ptr<zv::CEListaAtributos> DefinicoesDe(const zvdb::BlockRecord* bloco, bool comIds) {
+    if (!bloco) return nullptr;
+    auto lista = std::make_unique<zv::CEListaAtributos>();
+    for (zvdb::Attribute* definicao : bloco->attributeDefinitions()) {
+        if (definicao->isConstant()) continue;
+        lista->Adicionar(std::make_unique<zv::CEAtributo>(
+            Q(definicao->tag()), Q(definicao->prompt()), Q(definicao->textValue()),
+            comIds ? Id(definicao) : OdDbObjectId(), definicao->isInvisible()));
+    }
+    return lista;
+}
+
 // Product block files hold one layer and no nested references.
 bool ConfereBloco(zvdb::Database& lado, const QString& nome, const QString& arquivo) {
     if (lado.layers().size() >= 2) {
@@ -304,16 +317,20 @@ std::unique_ptr<zv::CEListaAtributos> CICad::GetDefinicoesAtributos(const QStrin
                                                                     const QString& nome) {
     OdDbObjectId id;
     if (!GetBlocoId(nome, id)) id = CarregaBloco(nome, arquivo);
-    auto* bloco = Como<zvdb::BlockRecord>(id);
-    if (!bloco) return nullptr;
-    auto lista = std::make_unique<zv::CEListaAtributos>();
-    for (zvdb::Attribute* definicao : bloco->attributeDefinitions()) {
-        if (definicao->isConstant()) continue;
-        lista->Adicionar(std::make_unique<zv::CEAtributo>(
-            Q(definicao->tag()), Q(definicao->prompt()), Q(definicao->textValue()), Id(definicao),
-            definicao->isInvisible()));
-    }
-    return lista;
+    return DefinicoesDe(Como<zvdb::BlockRecord>(id), true);
+}
+
+std::unique_ptr<zv::CEListaAtributos> CICad::LeDefinicoesAtributos(const QString& arquivo,
+                                                                   const QString& nome) {
+    OdDbObjectId id;
+    if (GetBlocoId(nome, id)) return DefinicoesDe(Como<zvdb::BlockRecord>(id), true);
+    const QString caminho = ResolveArquivo(arquivo);
+    if (!QFileInfo(caminho).isFile()) return nullptr;
+    // Quietly: the insertion that follows tells the user what is wrong with the file.
+    QString erro;
+    const std::unique_ptr<zvdb::Database> lado = zvhost::readDrawing(caminho, &erro);
+    // The side drawing goes with this call: its definitions have no id to give.
+    return lado ? DefinicoesDe(lado->modelSpace(), false) : nullptr;
 }
 
 OdDbObjectId CICad::GetReferenciaNoLayer(const QString& nome, const QString& layer) {

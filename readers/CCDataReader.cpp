@@ -800,7 +800,15 @@ size_t CCDataReader::HashNomes::operator()(const std::vector<std::uint32_t>& nom
     return h;
 }
 
-CCDataReader::FormaCampos::ComSufixo& CCDataReader::FormaCampos::Com(const QString& sufixo) {
+void CCDataReader::FiltraSufixos(std::function<bool(const QString& nome)> fica) {
+    ficaComSufixo_ = std::move(fica);
+    // The names under each suffix were put in order for the filter before.
+    for (auto& [nomes, forma] : formas_)
+        forma->sufixos.clear();
+}
+
+CCDataReader::FormaCampos::ComSufixo& CCDataReader::FormaCampos::Com(
+    const QString& sufixo, const std::function<bool(const QString&)>* fica) {
     // The callers pass the same few texts again and again: the same text is known at once.
     for (ComSufixo& feito : sufixos)
         if (feito.sufixo.isSharedWith(sufixo)) return feito;
@@ -809,10 +817,15 @@ CCDataReader::FormaCampos::ComSufixo& CCDataReader::FormaCampos::Com(const QStri
     // The names under the suffix enter the name table in the order of the plain names, as
     // when each copy renamed its own fields.
     ComSufixo novo{sufixo, NumeroCampo<"QTD">(sufixo), {}, {}, {}, {}};
+    // Every name is numbered, kept or not, so that the names' order stays that of a full copy.
+    const bool filtra = fica && *fica && !sufixo.isEmpty();
+    if (filtra) novo.qtdFica = (*fica)(CamposItem::nome(novo.qtd));
     std::vector<std::pair<std::uint32_t, std::uint32_t>> pares;
     pares.reserve(nomes.size());
-    for (size_t i = 0; i < nomes.size(); ++i)
-        pares.emplace_back(CamposItem::numeroComSufixo(nomes[i], sufixo), std::uint32_t(i));
+    for (size_t i = 0; i < nomes.size(); ++i) {
+        const std::uint32_t nome = CamposItem::numeroComSufixo(nomes[i], sufixo);
+        if (!filtra || (*fica)(CamposItem::nome(nome))) pares.emplace_back(nome, std::uint32_t(i));
+    }
     std::sort(pares.begin(), pares.end());
     novo.nomes.reserve(pares.size());
     novo.lugares.reserve(pares.size());
@@ -932,10 +945,10 @@ void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const
     ConfereVersao();
     const EntidadeLida& lida = EntidadeGuardada(id, modelo);
     const bool rotas = lida.rotas;
-    FormaCampos::ComSufixo& com = lida.forma->Com(sufixo);
+    FormaCampos::ComSufixo& com = lida.forma->Com(sufixo, &ficaComSufixo_);
     const std::uint32_t qtd = com.qtd;
-    const QString* qtdAtual = item.campos.procura(qtd);
-    const bool poeQtd = lida.qtdPadrao && (!qtdAtual || qtdAtual->isEmpty());
+    const QString* qtdAtual = com.qtdFica ? item.campos.procura(qtd) : nullptr;
+    const bool poeQtd = com.qtdFica && lida.qtdPadrao && (!qtdAtual || qtdAtual->isEmpty());
     if (poeQtd && com.nomesQtd.empty()) {
         // The batch holds no QTD: the "1" joins it in its place, so the item's fields move
         // once.
@@ -945,7 +958,8 @@ void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const
         com.nomesQtd.insert(com.nomesQtd.end(), lugar, com.nomes.end());
         const auto n = lugar - com.nomes.begin();
         com.lugaresQtd.assign(com.lugares.begin(), com.lugares.begin() + n);
-        com.lugaresQtd.push_back(std::uint32_t(com.nomes.size()));
+        // The "1" stands after all the reading's values, kept by the copy or not.
+        com.lugaresQtd.push_back(std::uint32_t(lida.forma->nomes.size()));
         com.lugaresQtd.insert(com.lugaresQtd.end(), com.lugares.begin() + n, com.lugares.end());
     }
     const std::vector<std::uint32_t>& nomes = poeQtd ? com.nomesQtd : com.nomes;

@@ -14,6 +14,7 @@
 #include <QStringList>
 
 #include <algorithm>
+#include <functional>
 #include <memory>
 #include <optional>
 #include <span>
@@ -163,6 +164,10 @@ protected:
     // By name number, the only fields a symbol's reading writes (none past the end); null:
     // every field. For a reader that keeps a few fields of many symbols.
     const std::vector<char>* CamposLidos = nullptr;
+    // Which names, under a suffix, a copy under that suffix writes; unset: every name. For a
+    // reader whose items are asked for few of their neighbours' fields (the strip drawing's
+    // terminals); set it before the read with FiltraSufixos.
+    void FiltraSufixos(std::function<bool(const QString& nome)> fica);
     // The whole texts of the wires' entries ("HANDLE#CONNECTION#BLOCK") are kept for the
     // readers that ask for them; one that never does leaves them to the answer.
     bool GuardaCompletas = true;
@@ -246,14 +251,17 @@ private:
             // Ascending, with where each one's value stands; the same with the entity's QTD
             // of "1" (its value after the others), made when first asked.
             std::vector<std::uint32_t> nomes, lugares, nomesQtd, lugaresQtd;
+            bool qtdFica = true;  // whether the filter keeps QTD under the suffix
         };
         std::vector<ComSufixo> sufixos;
-        ComSufixo& Com(const QString& sufixo);
+        // `fica`: the names under a suffix that the copies keep; null: all of them.
+        ComSufixo& Com(const QString& sufixo, const std::function<bool(const QString&)>* fica);
     };
     struct HashNomes {
         size_t operator()(const std::vector<std::uint32_t>& nomes) const;
     };
     std::unordered_map<std::vector<std::uint32_t>, std::unique_ptr<FormaCampos>, HashNomes> formas_;
+    std::function<bool(const QString&)> ficaComSufixo_;
     // The fields of entities read for CopiaEntidade: their names' shape and the values in
     // its order. `qtdPadrao`: the entity gave no QTD, so the copy puts "1" only where the
     // item has none, as a reading would; `rotas`: a complete wire, after which a reading

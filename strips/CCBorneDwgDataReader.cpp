@@ -1,12 +1,16 @@
 #include "CCBorneDwgDataReader.h"
 
+#include "CCBorneDwgWriter.h"
+
 #include "lists/CETemplate.h"
 #include "module/CIProgress.h"
 #include "readers/CCBorneDataReader.h"
 
 #include <algorithm>
 #include <array>
+#include <functional>
 #include <memory>
+#include <optional>
 #include <vector>
 
 namespace {
@@ -21,6 +25,20 @@ const QString& Valor(const CEItemLista& item, std::uint32_t campo) {
 // Whether the terminal has a wire on a side.
 bool ComFio(const CEItemLista& borne, const CCBorneDwgDataReader::Chaves& chaves) {
     return !Valor(borne, chaves.relacaoIni).isEmpty() || !Valor(borne, chaves.relacaoFim).isEmpty();
+}
+
+// The fields of the sides the strip drawing reads: the terminal's blocks and template name
+// theirs; the sides read relation, strip, number and handle of their neighbours; the model
+// links a side's symbol by its handle and reads the side connections (LIG_...). None: all.
+std::function<bool(const QString&)> CamposDosLados(std::optional<QSet<QString>> nomes) {
+    if (!nomes) return {};
+    for (const char* base : {"RELACAO", "TAG", "ETIQUETA", "REGUA", "STRIP", "REGLETA", "NUMERO",
+                             "NUMBER", "HANDLE", "REL", "LIG"})
+        for (const char* sufixo : {"_INI", "_FIM", "_SEGINI", "_SEGFIM"})
+            *nomes << QLatin1String(base) + QLatin1String(sufixo);
+    return [nomes = std::move(*nomes)](const QString& nome) {
+        return nome.startsWith(QLatin1String("LIG_")) || nomes.contains(nome.toUpper());
+    };
 }
 
 }  // namespace
@@ -68,6 +86,8 @@ VetorItens* CCBorneDwgDataReader::LerDados(zvdb::Database* database,
                                            const std::optional<QStringList>& paginas,
                                            CETemplate& modelo, CIProgress& progresso) {
     CICad::SetIntLisp("EXPORTA", 3);
+    // Each terminal copies its neighbours' fields: only those the drawing reads.
+    FiltraSufixos(CamposDosLados(CCBorneDwgWriter::CamposDosBornes(modelo)));
     // The cable connections: the export read loads them for the components it reads, and
     // once is enough for a run.
     std::unique_ptr<VetorItens> lidos(Le(database, &modelo, true, paginas));

@@ -23,6 +23,13 @@ bool ComecaCom(const QString& tag, const char* a, const char* b) {
            tag.startsWith(QLatin1String(b), Qt::CaseInsensitive);
 }
 
+CCBorneDwgWriter::Bloco Configurado(const QString& valor, const QString& prefixo,
+                                    const QString& pasta) {
+    if (valor.isEmpty()) return {};
+    const QStringList partes = ZVString(valor).Divide("\\");
+    return {prefixo + (partes.isEmpty() ? QString() : partes.last()), pasta + valor + ".dwg"};
+}
+
 }  // namespace
 
 CCBorneDwgWriter::CCBorneDwgWriter()
@@ -40,9 +47,30 @@ CCBorneDwgWriter::~CCBorneDwgWriter() {
 }
 
 CCBorneDwgWriter::Bloco CCBorneDwgWriter::BlocoConfigurado(const QString& valor) const {
-    if (valor.isEmpty()) return {};
-    const QStringList partes = ZVString(valor).Divide("\\");
-    return {prefixo_ + (partes.isEmpty() ? QString() : partes.last()), pastaRede_ + valor + ".dwg"};
+    return Configurado(valor, prefixo_, pastaRede_);
+}
+
+std::optional<QSet<QString>> CCBorneDwgWriter::CamposDosBornes(CETemplate& modelo) {
+    const QString prefixo = CICad::GetStringLisp("*ZV_PREFIX*");
+    const QString pasta = CICad::GetStringLisp("*DIRETORIO_REDE*");
+    QSet<QString> nomes;
+    for (const char* simbolo : {"*BLOCO_BORNE_GRX*", "*BLOCO_DETALHE_GRX*"}) {
+        const Bloco bloco = Configurado(modelo.LerTexto(simbolo), prefixo, pasta);
+        if (!bloco.existe()) continue;
+        const auto definicoes = CICad::LeDefinicoesAtributos(bloco.arquivo, bloco.nome);
+        if (!definicoes) return std::nullopt;
+        for (int i = 0; i < definicoes->Quantidade(); ++i) {
+            const zv::CEAtributo& definicao = (*definicoes)[i];
+            if (CCListaPaginada::EhFuncao(definicao.GetTag())) return std::nullopt;
+            nomes << definicao.GetTag().trimmed().toUpper()
+                  << definicao.GetValor().trimmed().toUpper();
+        }
+    }
+    const CEModeloReguas::Parametros parametros = CEModeloReguas::Parametros::DoModelo(modelo);
+    for (const QStringList* lista : {&parametros.camposDetalhe, &parametros.chavesQuebra})
+        for (const QString& nome : *lista)
+            nomes << nome.trimmed().toUpper();
+    return nomes;
 }
 
 CCBorneDwgWriter::Bloco CCBorneDwgWriter::BlocoSimbolo(const CEItemLista& item) {

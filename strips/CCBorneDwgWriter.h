@@ -9,10 +9,12 @@
 #include "lists/CCListaPaginada.h"
 #include "module/CCDataWriter.h"
 
+#include <QSet>
 #include <QString>
 
 #include <cstddef>
 #include <cstdint>
+#include <optional>
 #include <string>
 
 class CEItemLista;
@@ -39,6 +41,12 @@ public:
     // A template's block value, a path below the shared folder without extension: the
     // name is the prefix and the path's last piece, the file the folder, path and ".dwg".
     Bloco BlocoConfigurado(const QString& valor) const;
+
+    // The names of a terminal's fields the drawing may read, in upper case: each cell's tag
+    // and default text in the terminal and detail blocks (either may name a field), and the
+    // template's detail and page-break fields. None when a cell is a function, which sees
+    // every field, or a block file the template names cannot be read.
+    static std::optional<QSet<QString>> CamposDosBornes(CETemplate& modelo);
 
     // The laid-out model of the last run.
     const CEModeloReguas& Modelo() const { return modelo_; }

@@ -7,6 +7,7 @@
 #include "readers/ZVString.h"
 #include "sample/XDataItems.h"
 
+#include <functional>
 #include <memory>
 
 namespace {
@@ -280,4 +281,57 @@ TEST_F(BlockReadingTest, ATerminalReadForOneCopyGivesEachCopyTheWholeReading) {
     EXPECT_EQ(item.valorCampo("ZZ_PROPRIO"), "meu");
     EXPECT_EQ(item.valorCampo("QTD"), "1");
     EXPECT_EQ(item.valorCampo("REGUA"), "X1");
+}
+
+namespace {
+
+// A reader whose copies under a suffix keep the names the test gives, as the strip
+// drawing's reader keeps the few fields of a terminal's sides that its blocks show.
+class LeitorFiltrado : public LeitorBase {
+public:
+    void Filtra(std::function<bool(const QString&)> fica) { FiltraSufixos(std::move(fica)); }
+};
+
+}  // namespace
+
+TEST_F(BlockReadingTest, ACopyUnderASuffixKeepsOnlyTheNamesItsReaderAsksFor) {
+    // No QTD of its own: a full copy puts "1" under the suffix.
+    const OdDbObjectId k =
+        Simbolo("NA-1", "A1", "ESQ$0001$A", {{"REGUA", "X1"}, {"NUMERO", "5"}}, 0);
+    LeitorBase todos;
+    LeitorFiltrado leitor;
+    leitor.Filtra([](const QString& nome) {
+        return nome == "NUMERO_FIM" || nome == "REGUA_INI" || nome == "QTD_INI" ||
+               nome == "REGUA_ZQ";
+    });
+    const auto copia = [](CCDataReader& r, const QString& sufixo, const OdDbObjectId& id) {
+        CEItemLista item;
+        r.CopiaEntidade(sufixo, item, id, nullptr);
+        return item;
+    };
+    const CEItemLista cheio = copia(todos, "_FIM", k);
+    ASSERT_GT(cheio.campos.size(), 5);
+    EXPECT_EQ(cheio.valorCampo("QTD_FIM"), "1");
+    for (int vez = 0; vez < 2; ++vez) {  // the second time from the names put in order
+        const CEItemLista fim = copia(leitor, "_FIM", k);
+        EXPECT_EQ(fim.campos.keys(), QStringList({"NUMERO_FIM"}));
+        EXPECT_EQ(fim.valorCampo("NUMERO_FIM"), "5");
+        const CEItemLista ini = copia(leitor, "_INI", k);
+        EXPECT_EQ(ini.campos.size(), 2);
+        EXPECT_EQ(ini.valorCampo("REGUA_INI"), "X1");
+        EXPECT_EQ(ini.valorCampo("QTD_INI"), "1");
+    }
+    // A name left out is numbered all the same, so that the names keep the order a full
+    // copy gives them.
+    EXPECT_EQ(CamposItem::numeroSeHouver("NUMERO_ZQ"), CamposItem::kSemNome);
+    EXPECT_EQ(copia(leitor, "_ZQ", k).campos.keys(), QStringList({"REGUA_ZQ"}));
+    EXPECT_NE(CamposItem::numeroSeHouver("NUMERO_ZQ"), CamposItem::kSemNome);
+    EXPECT_EQ(CamposItem::numeroSeHouver("NUMERO_ZQ") < CamposItem::numeroSeHouver("REGUA_ZQ"),
+              CamposItem::numeroSeHouver("NUMERO") < CamposItem::numeroSeHouver("REGUA"));
+    // Without a suffix the whole reading; without the filter every name again.
+    EXPECT_EQ(copia(leitor, QString(), k).campos.keys(), copia(todos, QString(), k).campos.keys());
+    leitor.Filtra({});
+    const CEItemLista fim = copia(leitor, "_FIM", k);
+    EXPECT_EQ(fim.campos.keys(), cheio.campos.keys());
+    EXPECT_EQ(fim.campos.values(), cheio.campos.values());
 }

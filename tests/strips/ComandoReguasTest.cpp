@@ -355,4 +355,81 @@ TEST_F(ComandoReguasTest, AMissingBlockFileEndsTheCommandAndNothingIsSaved) {
     EXPECT_EQ(Hash(pasta_->project()), antes);
 }
 
+// The terminal block's cells may name any field of a side's neighbour or wire: a block of
+// plain cells shows the same as one that also holds a function, which sees every field.
+TEST_F(ComandoReguasTest, TerminalCellsShowTheNeighboursFieldsThatAFunctionCellWouldSee) {
+    const auto bloco = [](const QString& nome, bool funcao) {
+        zvdb::Database db;
+        db.modelSpace()->addLwPolyline({{0, 0}, {5, 0}, {5, -10}, {0, -10}}, true);
+        std::vector<std::pair<std::string, std::string>> celulas{
+            {"VARIAVEL_NUMERO", "NUMERO"},
+            {"VARIAVEL_NUMBER", "NUMBER"},
+            {"VARIAVEL_A", " DESCRICAO_FIM "},
+            {"VARIAVEL_B", "FABRICANTE_INI"},
+            {"COR_SEGFIM", ""},
+            {"REFERENCIA_FIM", "?"},
+            {"VARIAVEL_C", "SECAO_MM2_SEGINI"}};
+        if (funcao) celulas.emplace_back("FUNCAO_N", "(itoa (length reg))");
+        double y = -2;
+        for (const auto& [tag, valor] : celulas)
+            db.modelSpace()->addAttributeDefinition(tag, tag, valor, {0, y -= 2, 0}, 1.0);
+        zvdb::DxfWriter::saveFile(
+            db, pasta_->path("produto/DADOS/1/BLOCOS/" + nome + ".dxf").toStdString());
+    };
+    bloco("REGUA_BORNE_C", false);
+    bloco("REGUA_BORNE_F", true);
+    // Each drawn terminal's cells, in the order the terminals were drawn.
+    const auto celulas = [](const QString& arquivo, const QString& nome) {
+        QStringList linhas;
+        const auto db = zvdb::DxfLoader::loadFile(arquivo.toStdString());
+        for (zvdb::Entity* e : db->modelSpace()->entities()) {
+            auto* ref = dynamic_cast<zvdb::BlockReference*>(e);
+            if (!ref || ref->blockName() != nome.toStdString()) continue;
+            QStringList valores;
+            for (const char* tag : {"VARIAVEL_NUMERO", "VARIAVEL_NUMBER", "VARIAVEL_A",
+                                    "VARIAVEL_B", "COR_SEGFIM", "REFERENCIA_FIM", "VARIAVEL_C"}) {
+                zvdb::Attribute* a = ref->attribute(tag);
+                valores << (a ? QString::fromStdString(std::string(a->textValue())) : "-");
+            }
+            linhas << valores.join('|');
+        }
+        return linhas;
+    };
+    const auto desenha = [&](const QString& nome) {
+        const QString saida = pasta_->path(nome + ".dxf");
+        const zvtest::HostRun r = Desenha(
+            pasta_->project(), saida,
+            Modelo(nome, "(setq *BLOCO_BORNE_GRX* \"DADOS\\\\1\\\\BLOCOS\\\\" + nome + "\")"));
+        EXPECT_EQ(r.status, 0) << r.err.toStdString();
+        return celulas(saida, nome);
+    };
+    const QStringList simples = desenha("REGUA_BORNE_C");
+    const QStringList comFuncao = desenha("REGUA_BORNE_F");
+    ASSERT_GT(simples.size(), 10);
+    EXPECT_EQ(simples, comFuncao);
+    // The cells hold values: neighbours' fields under both sides, and the wires'.
+    int descricao = 0, fabricante = 0, cor = 0, referencia = 0, secao = 0;
+    for (const QString& linha : simples) {
+        const QStringList v = linha.split('|');
+        descricao += !v[2].isEmpty();
+        fabricante += !v[3].isEmpty();
+        cor += !v[4].isEmpty();
+        referencia += !v[5].isEmpty() && v[5] != "?";
+        secao += !v[6].isEmpty();
+    }
+    EXPECT_GT(descricao, 0);
+    EXPECT_GT(fabricante, 0);
+    EXPECT_GT(cor, 0);
+    EXPECT_GT(referencia, 0);
+    EXPECT_GT(secao, 0);
+    // A terminal block that is missing still ends the command with its message.
+    const QString saida = pasta_->path("sem-borne.dxf");
+    const zvtest::HostRun r = Desenha(
+        pasta_->project(), saida,
+        Modelo("reguas-sem-borne", "(setq *BLOCO_BORNE_GRX* \"DADOS\\\\1\\\\BLOCOS\\\\NAO_HA\")"));
+    EXPECT_EQ(r.status, 3) << r.err.toStdString();
+    EXPECT_TRUE(QString(r.out + r.err).contains("NAO_HA.dwg"));
+    EXPECT_FALSE(QFile::exists(saida));
+}
+
 }  // namespace
