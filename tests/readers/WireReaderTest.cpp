@@ -344,6 +344,53 @@ TEST_F(WireReaderTest, AWireThroughManyElementsFindsTheWireAtEachEndAndItsConnec
     }
 }
 
+TEST_F(WireReaderTest, AnElementTouchedTwiceAtOneConnectionGivesBothEndsTheWireAtItsFirstPlace) {
+    // One wire of a few entries and one of more than sixteen (found through an index): on
+    // each, -K2 has two connection attributes of one value, so two entries share one whole
+    // text; another wire, drawn first, passes the second place only. Both ends take the
+    // wire at the first place of their text.
+    const auto monta = [this](double x, int n, const std::string& numero) {
+        borne("X1", numero, {x, 1000, 0});
+        std::vector<zvdb::Point3> pontos{{x, 990, 0}};
+        for (int i = 0; i < n; ++i)
+            pontos.push_back({x, 950.0 - 30.0 * i, 0});
+        const int segundo = n - 2;
+        const zvdb::Point3 outro = pontos[size_t(segundo) + 1];
+        fio({outro, {x - 15, outro.y, 0}}, numero + "9");
+        const zvdb::BlockReference* repetido = nullptr;
+        for (int i = 0; i < n; ++i) {
+            if (i == segundo) continue;
+            std::vector<std::pair<std::string, zvdb::Point3>> ligacoes{
+                {QString("A%1").arg(i + 1).toStdString(), pontos[size_t(i) + 1]}};
+            if (i == 1) ligacoes.push_back({"A2", outro});
+            const zvdb::BlockReference* k =
+                componente(QString("-K%1").arg(i + 1).toStdString(), ligacoes);
+            if (i == 1) repetido = k;
+        }
+        fio(pontos, numero);
+        return handle(repetido);
+    };
+    const QString curto = monta(20, 8, "30");
+    const QString longo = monta(200, 24, "40");
+    CCFioDataReader leitor;
+    le(leitor);
+    int pontas = 0;
+    for (const CEItemLista* item : itens_) {
+        const QString numero = item->valorCampo("FIO");
+        if (numero != "30" && numero != "40") continue;
+        const QString repetido = numero == "30" ? curto : longo;
+        pontas += (item->valorCampo("HANDLE_INI") == repetido) +
+                  (item->valorCampo("HANDLE_FIM") == repetido);
+        EXPECT_EQ(item->valorCampo("FIO_SEGINI"), numero)
+            << item->valorCampo("REL_INI").toStdString();
+        EXPECT_EQ(item->valorCampo("FIO_SEGFIM"), numero)
+            << item->valorCampo("REL_FIM").toStdString();
+    }
+    // Each wire meets -K2 twice, and each meeting is the end of one stretch and the start of
+    // the next.
+    EXPECT_EQ(pontas, 8);
+}
+
 // ---- which wires
 
 TEST_F(WireReaderTest, AWireWhoseKeyIsNotListedIsLeftOutWithoutAMessage) {
