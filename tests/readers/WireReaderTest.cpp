@@ -469,6 +469,73 @@ TEST_F(WireReaderTest, AWiresFieldsFollowItsTextsUnderAnySuffixAndAfterAChange) 
     EXPECT_EQ(textos(depois), textos(novoB));
 }
 
+TEST_F(WireReaderTest, AWiresTextsGiveWayToTheFieldsWrittenAfterThemAndNameFieldsInTurn) {
+    // Texts that repeat a name, or name a field the reader writes after them, or leave the
+    // quantity empty; and two names no wire had before.
+    zvdb::Polyline* linha = fio({{0, 10, 0}, {10, 10, 0}}, "60");
+    linha->setXData("KVR_ZV_WIRE", zvsample::XDataItems()
+                                       .text("100061")
+                                       .text("1")
+                                       .text("FIO60")
+                                       .text("CORVM")
+                                       .text("CORAZ")
+                                       .text("LAYEROUTRO")
+                                       .text("QTD")
+                                       .text("ZZ_FIO_TURNO1a")
+                                       .text("AA_FIO_TURNO2b")
+                                       .tags());
+    const zvdb::Polyline* semQtd = fio({{0, 20, 0}, {10, 20, 0}}, "61");
+    ASSERT_EQ(CamposItem::numeroSeHouver("ZZ_FIO_TURNO1"), CamposItem::kSemNome);
+    ASSERT_EQ(CamposItem::numeroSeHouver("ZV_KEY_TURNO"), CamposItem::kSemNome);
+    const auto confere = [](const CEItemLista& item, const QString& s) {
+        EXPECT_EQ(item.valorCampo("FIO" + s), "60");
+        EXPECT_EQ(item.valorCampo("COR" + s), "AZ");
+        EXPECT_EQ(item.valorCampo("LAYER" + s), kPagina1);
+        EXPECT_EQ(item.valorCampo("QTD" + s), "1");
+        EXPECT_EQ(item.valorCampo("ZZ_FIO_TURNO1" + s), "a");
+        EXPECT_EQ(item.valorCampo("AA_FIO_TURNO2" + s), "b");
+    };
+    // Read into an item that holds fields already: the wire's replace them, the others stay.
+    CCFioDataReader leitor;
+    CEItemLista item;
+    item.definirCampo("COR", "PR");
+    item.definirCampo("QTD", "7");
+    item.definirCampo("OUTRO", "x");
+    leitor.LeFio(QString(), item, id(linha), &modelo_);
+    confere(item, QString());
+    EXPECT_EQ(item.valorCampo("OUTRO"), "x");
+    // A wire without a quantity of its own keeps the item's.
+    CEItemLista comQtd;
+    comQtd.definirCampo("QTD", "7");
+    leitor.LeFio(QString(), comQtd, id(semQtd), &modelo_);
+    EXPECT_EQ(comQtd.valorCampo("QTD"), "7");
+    EXPECT_EQ(comQtd.valorCampo("FIO"), "61");
+    // The reading kept for the copies gives the same, under a suffix too.
+    LeitorDasLeituras dasLeituras;
+    CEItemLista ponta;
+    dasLeituras.CopiaEntidade("_P", ponta, id(linha), &modelo_);
+    confere(ponta, "_P");
+    const std::unique_ptr<CEItemLista> criado(dasLeituras.CriaItemFio(id(linha), modelo_));
+    ASSERT_TRUE(criado);
+    confere(*criado, QString());
+
+    // Names are numbered in the order the fields are written, new ones of the texts among
+    // them: the fields reach LISP in that order.
+    EXPECT_LT(CamposItem::numeroSeHouver("ZZ_FIO_TURNO1"),
+              CamposItem::numeroSeHouver("AA_FIO_TURNO2"));
+    CEItemLista sufixado;
+    leitor.LeFio("_TURNO", sufixado, id(linha), &modelo_);
+    confere(sufixado, "_TURNO");
+    std::vector<std::uint32_t> numeros;
+    // (COR is a catalogue column too: it comes first, with the columns.)
+    for (const char* nome :
+         {"ZV_KEY", "FIO", "LAYER", "QTD", "ZZ_FIO_TURNO1", "AA_FIO_TURNO2", "WIRE_LISTA",
+          "DESCRICAO", "TP_DESCRI", "POSICAO", "GRUPO", "PAGINA", "SAP_MATERIAL"})
+        numeros.push_back(CamposItem::numeroSeHouver(QString(nome) + "_TURNO"));
+    EXPECT_TRUE(std::is_sorted(numeros.begin(), numeros.end()));
+    EXPECT_EQ(std::adjacent_find(numeros.begin(), numeros.end()), numeros.end());
+}
+
 class FiltroTemplate : public TemplateDouble {
 public:
     bool FiltraItem(const CEItemLista& item) override { return item.valorCampo("FIO") != "51"; }
