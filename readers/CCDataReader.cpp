@@ -738,10 +738,20 @@ bool CCDataReader::LoteFio(const QString& s, const CamposItem& campos,
         appFioVersao_ = CICad::VersaoDesenho(polilinha.database());
     }
     lote_.clear();
-    // The key and the wire's own texts come from one walk of its extended data.
+    // The key and the wire's own texts come from one walk of its extended data, the one
+    // FioTemChave made when it asked for this polyline just before.
     std::string_view textoChave;
-    bool temTextoChave = false;
-    const bool temChave = CICad::TextosFio(polilinha, textoChave, temTextoChave, textosFio_);
+    bool temTextoChave = false, temChave = false;
+    TextosGuardados& guardados = textosGuardados_;
+    if (guardados.fio == polilinha && !polilinha.isNull() &&
+        guardados.versao == CICad::VersaoDesenho(polilinha.database())) {
+        textoChave = guardados.chave;
+        temTextoChave = guardados.temTexto;
+        temChave = guardados.tem;
+    } else {
+        temChave = CICad::TextosFio(polilinha, textoChave, temTextoChave, textosFio_);
+    }
+    guardados.fio = OdDbObjectId();
     // Wires repeat their key texts: each is split and looked up once for the run.
     PoeColunasFio(s, temChave && temTextoChave ? ChaveDoTexto(textoChave) : semChave_);
     const ChaveLida* chave = &semChave_;
@@ -782,6 +792,14 @@ bool CCDataReader::LoteFio(const QString& s, const CamposItem& campos,
     if (!valorQtd || valorQtd->isEmpty()) lote_.push_back({qtd, QStringLiteral("1")});
     lote_.push_back({NumeroCampo<"SAP_MATERIAL">(s), QString()});
     return true;
+}
+
+bool CCDataReader::FioTemChave(const OdDbObjectId& polilinha) {
+    TextosGuardados& guardados = textosGuardados_;
+    guardados.tem = CICad::TextosFio(polilinha, guardados.chave, guardados.temTexto, textosFio_);
+    guardados.fio = polilinha;
+    guardados.versao = CICad::VersaoDesenho(polilinha.database());
+    return guardados.tem && guardados.temTexto && !ChaveDoTexto(guardados.chave).chave.isEmpty();
 }
 
 std::uint32_t CCDataReader::NumeroDoNomeFio(std::string_view nome) {

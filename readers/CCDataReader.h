@@ -188,6 +188,10 @@ protected:
     // An item kept for the list shares its field names with the items kept before it.
     void PartilhaNomes(CEItemLista& item) { item.partilharNomes(); }
     double Tolerancia() const { return tolerancia_; }
+    // Whether the polyline has a key, as ChaveDaEntidade tells it, from the walk of its
+    // extended data that its reading makes: a reading of it that follows (with the drawing
+    // unchanged) takes that walk's texts instead of walking it again.
+    bool FioTemChave(const OdDbObjectId& polilinha);
 
 private:
     void CarregaConexoes(const QString& funcao, bool detalhes);
@@ -429,6 +433,15 @@ private:
     void PoeColunasFio(const QString& s, const ChaveLida& chave);
     const std::pair<QString, QString>& ListaDescricaoFioDe(const ChaveLida& chave);
     std::vector<std::string_view> textosFio_;  // the items of the wire being read
+    // The polyline FioTemChave walked last and the drawing's version then, with the key
+    // text it found (as CICad::TextosFio gives it); none once a reading took them.
+    struct TextosGuardados {
+        OdDbObjectId fio;
+        std::uint64_t versao = 0;
+        std::string_view chave;
+        bool temTexto = false, tem = false;
+    };
+    TextosGuardados textosGuardados_;
     // The numbers of wires' field names by the names as the drawing holds them.
     PorTexto<std::uint32_t> nomesFio_;
     std::uint32_t NumeroDoNomeFio(std::string_view nome);

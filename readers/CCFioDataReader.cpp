@@ -148,7 +148,8 @@ std::vector<OdDbObjectId> CCFioDataReader::ListaFios(const QStringList& layers) 
 
 CEItemLista* CCFioDataReader::ItemFio(const OdDbObjectId& polilinha, CETemplate* modelo,
                                       std::size_t lugares) {
-    if (ChaveDaEntidade(polilinha).isEmpty()) return nullptr;
+    // The walk that answers this gives the wire's texts to its reading in the copy below.
+    if (!FioTemChave(polilinha)) return nullptr;
     auto* item = new CEItemLista;
     item->ids.push_back(polilinha);
     item->campos.reservar(lugares);

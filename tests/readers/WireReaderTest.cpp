@@ -536,6 +536,30 @@ TEST_F(WireReaderTest, AWiresTextsGiveWayToTheFieldsWrittenAfterThemAndNameField
     EXPECT_EQ(std::adjacent_find(numeros.begin(), numeros.end()), numeros.end());
 }
 
+TEST_F(WireReaderTest, AWireReadAgainAfterAChangeGivesItsNewTextsNotThoseTheListSaw) {
+    borne("X1", "1", {20, 200, 0});
+    borne("X1", "2", {20, 100, 0});
+    zvdb::Polyline* linha = fio({{20, 190, 0}, {20, 100, 0}}, "70");
+    CCFioDataReader leitor;
+    // The second walk finds the wire's reading kept from the first.
+    for (int vez = 0; vez < 2; ++vez) {
+        le(leitor);
+        ASSERT_EQ(itens_.size(), 1u);
+        EXPECT_EQ(itens_[0]->valorCampo("FIO"), "70");
+        itens_.destruirItens();
+    }
+    linha->setXData(
+        "KVR_ZV_WIRE",
+        zvsample::XDataItems().text("10006\f1").text("1").text("FIO\f71").text("COR\fAZ").tags());
+    CEItemLista depois;
+    leitor.LeFio(QString(), depois, id(linha), &modelo_);
+    EXPECT_EQ(depois.valorCampo("FIO"), "71");
+    EXPECT_EQ(depois.valorCampo("COR"), "AZ");
+    le(leitor);
+    ASSERT_EQ(itens_.size(), 1u);
+    EXPECT_EQ(itens_[0]->valorCampo("FIO"), "71");
+}
+
 class FiltroTemplate : public TemplateDouble {
 public:
     bool FiltraItem(const CEItemLista& item) override { return item.valorCampo("FIO") != "51"; }
