@@ -753,10 +753,15 @@ bool CCDataReader::LoteFio(const QString& s, const CamposItem& campos,
     }
     guardados.fio = OdDbObjectId();
     // Wires repeat their key texts: each is split and looked up once for the run.
-    PoeColunasFio(s, temChave && temTextoChave ? ChaveDoTexto(textoChave) : semChave_);
+    const ChaveLida& daChave = temChave && temTextoChave ? ChaveDoTexto(textoChave) : semChave_;
+    PoeColunasFio(s, daChave);
     const ChaveLida* chave = &semChave_;
     if (!textosFio_.empty()) {
-        chave = &ChaveDoTexto(textosFio_[0]);
+        // The key text is most often the wire's first text itself: not looked up again.
+        const std::string_view primeiro = textosFio_[0];
+        const bool mesmo = &daChave != &semChave_ && primeiro.data() == textoChave.data() &&
+                           primeiro.size() == textoChave.size();
+        chave = mesmo ? &daChave : &ChaveDoTexto(primeiro);
         // Without key, standard and its second item the polyline is no complete wire.
         if (chave->chave.isEmpty() || chave->norma.isEmpty() || textosFio_.size() < 2 ||
             textosFio_[1].empty())

@@ -560,6 +560,23 @@ TEST_F(WireReaderTest, AWireReadAgainAfterAChangeGivesItsNewTextsNotThoseTheList
     EXPECT_EQ(itens_[0]->valorCampo("FIO"), "71");
 }
 
+TEST_F(WireReaderTest, APolylineWithASymbolsKeyTooTakesItsWireKeyFromItsOwnTexts) {
+    zvdb::Polyline* linha = fio({{0, 10, 0}, {10, 10, 0}}, "80");
+    linha->setXData("KVR_ZV", zvsample::XDataItems().text("7001\f1").tags());
+    const zvdb::Polyline* simples = fio({{0, 20, 0}, {10, 20, 0}}, "81");
+    CCFioDataReader leitor;
+    CEItemLista item, outro;
+    leitor.LeFio(QString(), item, id(linha), &modelo_);
+    leitor.LeFio(QString(), outro, id(simples), &modelo_);
+    // The wire's own key and what the catalogue lists of it; the columns follow the key the
+    // polyline answers to, the symbol's.
+    EXPECT_EQ(item.valorCampo("ZV_KEY"), "10006");
+    EXPECT_EQ(item.valorCampo("DESCRICAO"), outro.valorCampo("DESCRICAO"));
+    EXPECT_FALSE(outro.valorCampo("DESCRICAO").isEmpty());
+    EXPECT_EQ(outro.valorCampo("REFERENCIA"), "FX-1.5-BK");
+    EXPECT_NE(item.valorCampo("REFERENCIA"), "FX-1.5-BK");
+}
+
 class FiltroTemplate : public TemplateDouble {
 public:
     bool FiltraItem(const CEItemLista& item) override { return item.valorCampo("FIO") != "51"; }
