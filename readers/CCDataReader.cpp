@@ -724,54 +724,87 @@ void CCDataReader::LeRotasDoItem(const CEItemLista& item, CETemplate* modelo) {
 }
 
 bool CCDataReader::LeCamposFio(const QString& s, CEItemLista& item, const OdDbObjectId& polilinha) {
+    const bool completo = LoteFio(s, item.campos, polilinha);
+    JuntaLote(item);
+    return completo;
+}
+
+bool CCDataReader::LoteFio(const QString& s, const CamposItem& campos,
+                           const OdDbObjectId& polilinha) {
     if (appFioEm_ != polilinha.database() ||
         appFioVersao_ != CICad::VersaoDesenho(polilinha.database())) {
         CICad::RegistraApp("KVR_ZV_WIRE", polilinha.database());
         appFioEm_ = polilinha.database();
         appFioVersao_ = CICad::VersaoDesenho(polilinha.database());
     }
-    // The key and the wire's own texts come from one walk of its extended data.
+    lote_.clear();
+    // The key and the wire's own texts come from one walk of its extended data, the one
+    // FioTemChave made when it asked for this polyline just before.
     std::string_view textoChave;
-    bool temTextoChave = false;
-    const bool temChave = CICad::TextosFio(polilinha, textoChave, temTextoChave, textosFio_);
+    bool temTextoChave = false, temChave = false;
+    TextosGuardados& guardados = textosGuardados_;
+    if (guardados.fio == polilinha && !polilinha.isNull() &&
+        guardados.versao == CICad::VersaoDesenho(polilinha.database())) {
+        textoChave = guardados.chave;
+        temTextoChave = guardados.temTexto;
+        temChave = guardados.tem;
+    } else {
+        temChave = CICad::TextosFio(polilinha, textoChave, temTextoChave, textosFio_);
+    }
+    guardados.fio = OdDbObjectId();
     // Wires repeat their key texts: each is split and looked up once for the run.
-    PoeColunasFio(s, item, temChave && temTextoChave ? ChaveDoTexto(textoChave) : semChave_);
+    const ChaveLida& daChave = temChave && temTextoChave ? ChaveDoTexto(textoChave) : semChave_;
+    PoeColunasFio(s, daChave);
     const ChaveLida* chave = &semChave_;
     if (!textosFio_.empty()) {
-        chave = &ChaveDoTexto(textosFio_[0]);
+        // The key text is most often the wire's first text itself: not looked up again.
+        const std::string_view primeiro = textosFio_[0];
+        const bool mesmo = &daChave != &semChave_ && primeiro.data() == textoChave.data() &&
+                           primeiro.size() == textoChave.size();
+        chave = mesmo ? &daChave : &ChaveDoTexto(primeiro);
         // Without key, standard and its second item the polyline is no complete wire.
         if (chave->chave.isEmpty() || chave->norma.isEmpty() || textosFio_.size() < 2 ||
             textosFio_[1].empty())
             return false;
-        item.definirCampo(NumeroCampo<"ZV_KEY">(s), chave->chave);
+        lote_.push_back({NumeroCampo<"ZV_KEY">(s), chave->chave});
         // Each wire has a number of its own: its field texts are split as they come, where
         // the drawing holds them; the names repeat and are numbered once.
         for (size_t i = 2; i < textosFio_.size(); ++i) {
             std::string_view nome, valor;
             if (!DivideCampo(textosFio_[i], nome, valor)) continue;
-            const QString texto = QString::fromUtf8(valor.data(), int(valor.size()));
-            if (s.isEmpty())
-                item.definirCampo(NumeroDoNomeFio(nome), texto);
-            else
-                item.definirCampo(
-                    CamposItem::numero(QString::fromUtf8(nome.data(), int(nome.size())) + s),
-                    texto);
+            const std::uint32_t numero =
+                s.isEmpty()
+                    ? NumeroDoNomeFio(nome)
+                    : CamposItem::numero(QString::fromUtf8(nome.data(), int(nome.size())) + s);
+            lote_.push_back({numero, QString::fromUtf8(valor.data(), int(valor.size()))});
         }
     }
     const auto& [lista, descricao] = ListaDescricaoFioDe(*chave);
-    item.definirCampo(NumeroCampo<"WIRE_LISTA">(s), lista);
-    item.definirCampo(NumeroCampo<"DESCRICAO">(s), descricao);
-    item.definirCampo(NumeroCampo<"TP_DESCRI">(s), descricao);
+    lote_.push_back({NumeroCampo<"WIRE_LISTA">(s), lista});
+    lote_.push_back({NumeroCampo<"DESCRICAO">(s), descricao});
+    lote_.push_back({NumeroCampo<"TP_DESCRI">(s), descricao});
     const LayerLido& layer = LayerDoNome(CICad::NomeLayerUtf8(polilinha));
-    item.definirCampo(NumeroCampo<"POSICAO">(s), PosicaoNoLayer(polilinha, layer));
-    item.definirCampo(NumeroCampo<"LAYER">(s), layer.nome);
-    item.definirCampo(NumeroCampo<"GRUPO">(s), layer.grupo);
-    item.definirCampo(NumeroCampo<"PAGINA">(s), layer.pagina);
+    lote_.push_back({NumeroCampo<"POSICAO">(s), PosicaoNoLayer(polilinha, layer)});
+    lote_.push_back({NumeroCampo<"LAYER">(s), layer.nome});
+    lote_.push_back({NumeroCampo<"GRUPO">(s), layer.grupo});
+    lote_.push_back({NumeroCampo<"PAGINA">(s), layer.pagina});
+    // QTD as the item has it so far: the last written here, or the item's own.
     const std::uint32_t qtd = NumeroCampo<"QTD">(s);
-    if (const QString* valor = item.campos.procura(qtd); !valor || valor->isEmpty())
-        item.definirCampo(qtd, QStringLiteral("1"));
-    item.definirCampo(NumeroCampo<"SAP_MATERIAL">(s), QString());
+    const QString* valorQtd = nullptr;
+    for (auto it = lote_.rbegin(); it != lote_.rend() && !valorQtd; ++it)
+        if (it->nome == qtd) valorQtd = &it->valor;
+    if (!valorQtd) valorQtd = campos.procura(qtd);
+    if (!valorQtd || valorQtd->isEmpty()) lote_.push_back({qtd, QStringLiteral("1")});
+    lote_.push_back({NumeroCampo<"SAP_MATERIAL">(s), QString()});
     return true;
+}
+
+bool CCDataReader::FioTemChave(const OdDbObjectId& polilinha) {
+    TextosGuardados& guardados = textosGuardados_;
+    guardados.tem = CICad::TextosFio(polilinha, guardados.chave, guardados.temTexto, textosFio_);
+    guardados.fio = polilinha;
+    guardados.versao = CICad::VersaoDesenho(polilinha.database());
+    return guardados.tem && guardados.temTexto && !ChaveDoTexto(guardados.chave).chave.isEmpty();
 }
 
 std::uint32_t CCDataReader::NumeroDoNomeFio(std::string_view nome) {
@@ -861,26 +894,15 @@ CCDataReader::EntidadeLida CCDataReader::LeEntidadeGuardada(const OdDbObjectId& 
         lida.qtdPadrao = marcada;
         // Unless its QTD was the mark, the batch keeps every name: the form is the order's.
         if (nomes.size() == ordem.ordem.size()) formaDaOrdem = &ordem.forma;
-    } else {
-        bool completa = false;
-        if (CICad::EhPolilinha(id)) {
-            lido.definirCampo(qtd, kMarca);
-            completa = lida.rotas = LeCamposFio(QString(), lido, id);
-            lida.fio = true;
-        }
-        // The reading is made apart: its values move into the kept form, none is copied.
-        std::vector<CamposItem::Campo> campos = lido.campos.retirar();
-        lida.valores.reserve(campos.size() + 1);
-        for (CamposItem::Campo& campo : campos) {
-            if (campo.nome == qtd && campo.valor == kMarca) {
-                marcada = true;
-                continue;
-            }
-            nomes.push_back(campo.nome);
-            lida.valores.push_back(std::move(campo.valor));
-        }
+    } else if (CICad::EhPolilinha(id)) {
+        // A wire's fields take the symbols' way, from the batch into the kept form.
+        lido.definirCampo(qtd, kMarca);
+        const bool completa = lida.rotas = LoteFio(QString(), lido.campos, id);
+        lida.fio = true;
+        OrdemLote& ordem = OrdenaLote();
+        marcada = TiraLote(ordem.ordem, qtd, kMarca, nomes, lida.valores);
         lida.qtdPadrao = marcada && completa;
-        lido.campos.reaproveitar(std::move(campos));
+        if (nomes.size() == ordem.ordem.size()) formaDaOrdem = &ordem.forma;
     }
     if (lida.qtdPadrao) lida.valores.push_back(QStringLiteral("1"));
     if (formaDaOrdem && *formaDaOrdem) {

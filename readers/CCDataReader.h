@@ -193,6 +193,10 @@ protected:
     // An item kept for the list shares its field names with the items kept before it.
     void PartilhaNomes(CEItemLista& item) { item.partilharNomes(); }
     double Tolerancia() const { return tolerancia_; }
+    // Whether the polyline has a key, as ChaveDaEntidade tells it, from the walk of its
+    // extended data that its reading makes: a reading of it that follows (with the drawing
+    // unchanged) takes that walk's texts instead of walking it again.
+    bool FioTemChave(const OdDbObjectId& polilinha);
 
 private:
     void CarregaConexoes(const QString& funcao, bool detalhes);
@@ -209,6 +213,9 @@ private:
     // The wire's fields without the look-up of its routes; false when the polyline is no
     // complete wire (the reading stops there).
     bool LeCamposFio(const QString& s, CEItemLista& item, const OdDbObjectId& polilinha);
+    // The same fields into `lote_`, in the order they are written; `campos`: the item's so
+    // far, for its QTD.
+    bool LoteFio(const QString& s, const CamposItem& campos, const OdDbObjectId& polilinha);
     // The routes of the wire number the item holds without a suffix.
     void LeRotasDoItem(const CEItemLista& item, CETemplate* modelo);
     // The key text's two parts; false when no key application is there.
@@ -429,11 +436,20 @@ private:
     // their items share one text.
     mutable TabelaTextos<QString> valores_;
     const QString& ValorDoTexto(std::string_view valor) const;
-    // A wire's catalogue columns under the suffix, and its list and description, asked of
-    // the catalogue once per key.
-    void PoeColunasFio(const QString& s, CEItemLista& item, const ChaveLida& chave);
+    // A wire's catalogue columns under the suffix (into `lote_`), and its list and
+    // description, asked of the catalogue once per key.
+    void PoeColunasFio(const QString& s, const ChaveLida& chave);
     const std::pair<QString, QString>& ListaDescricaoFioDe(const ChaveLida& chave);
     std::vector<std::string_view> textosFio_;  // the items of the wire being read
+    // The polyline FioTemChave walked last and the drawing's version then, with the key
+    // text it found (as CICad::TextosFio gives it); none once a reading took them.
+    struct TextosGuardados {
+        OdDbObjectId fio;
+        std::uint64_t versao = 0;
+        std::string_view chave;
+        bool temTexto = false, tem = false;
+    };
+    TextosGuardados textosGuardados_;
     // The numbers of wires' field names by the names as the drawing holds them.
     PorTexto<std::uint32_t> nomesFio_;
     std::uint32_t NumeroDoNomeFio(std::string_view nome);
@@ -442,8 +458,8 @@ private:
     CESimboloLido simbolo_;
     std::vector<CamposItem::Campo> lote_;
     std::vector<std::uint64_t> ordemLote_;
-    // OrdenaLote's answer by the batch's names in order of writing: the symbols of a kind
-    // write the same names, and their order is sorted out once; with the kept form of a batch
+    // OrdenaLote's answer by the batch's names in order of writing: the symbols (and wires) of a
+    // kind write the same names, and their order is sorted out once; with the kept form of a batch
     // of those names once LeEntidadeGuardada found it (null before, and for a batch whose QTD
     // was its mark).
     struct OrdemLote {

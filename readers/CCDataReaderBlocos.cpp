@@ -56,10 +56,10 @@ bool CCDataReader::ChaveENorma(const OdDbObjectId& entidade, QString& chave, QSt
     return true;
 }
 
-void CCDataReader::PoeColunasFio(const QString& s, CEItemLista& item, const ChaveLida& chave) {
+void CCDataReader::PoeColunasFio(const QString& s, const ChaveLida& chave) {
     if (chave.colunasFio) {
         for (const auto& [nome, valor] : *chave.colunasFio)
-            item.definirCampo(CamposItem::numeroComSufixo(nome, s), valor);
+            lote_.push_back({CamposItem::numeroComSufixo(nome, s), valor});
         return;
     }
     // The first time each column is split and written in turn: names are numbered in the
@@ -69,7 +69,7 @@ void CCDataReader::PoeColunasFio(const QString& s, CEItemLista& item, const Chav
         const std::pair<std::uint32_t, QString>& dividida = ColunaDividida(coluna);
         if (dividida.first == kSemColuna) continue;
         campos.push_back(dividida);
-        item.definirCampo(CamposItem::numeroComSufixo(dividida.first, s), dividida.second);
+        lote_.push_back({CamposItem::numeroComSufixo(dividida.first, s), dividida.second});
     }
     chave.colunasFio = std::move(campos);
 }

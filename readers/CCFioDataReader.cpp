@@ -148,7 +148,8 @@ std::vector<OdDbObjectId> CCFioDataReader::ListaFios(const QStringList& layers) 
 
 CEItemLista* CCFioDataReader::ItemFio(const OdDbObjectId& polilinha, CETemplate* modelo,
                                       std::size_t lugares) {
-    if (ChaveDaEntidade(polilinha).isEmpty()) return nullptr;
+    // The walk that answers this gives the wire's texts to its reading in the copy below.
+    if (!FioTemChave(polilinha)) return nullptr;
     auto* item = new CEItemLista;
     item->ids.push_back(polilinha);
     item->campos.reservar(lugares);
@@ -223,11 +224,15 @@ int CCFioDataReader::PrimeiroLugar(const QString& numero, int indice) {
                 primeiros[size_t(i)] = j;
             }
         } else {
-            // A bus wire holds thousands of entries.
+            // A bus wire holds thousands of entries. A text seen before keeps its first place.
             QHash<QString, int> lugares;
             lugares.reserve(n);
-            for (int i = 0; i < n; ++i)
-                primeiros[size_t(i)] = lugares.insert((*completas)[i], i).value();
+            for (int i = 0; i < n; ++i) {
+                const QString texto = (*completas)[i];
+                auto achado = lugares.constFind(texto);
+                if (achado == lugares.constEnd()) achado = lugares.insert(texto, i);
+                primeiros[size_t(i)] = achado.value();
+            }
         }
     }
     return primeiros[size_t(indice)];

@@ -344,6 +344,53 @@ TEST_F(WireReaderTest, AWireThroughManyElementsFindsTheWireAtEachEndAndItsConnec
     }
 }
 
+TEST_F(WireReaderTest, AnElementTouchedTwiceAtOneConnectionGivesBothEndsTheWireAtItsFirstPlace) {
+    // One wire of a few entries and one of more than sixteen (found through an index): on
+    // each, -K2 has two connection attributes of one value, so two entries share one whole
+    // text; another wire, drawn first, passes the second place only. Both ends take the
+    // wire at the first place of their text.
+    const auto monta = [this](double x, int n, const std::string& numero) {
+        borne("X1", numero, {x, 1000, 0});
+        std::vector<zvdb::Point3> pontos{{x, 990, 0}};
+        for (int i = 0; i < n; ++i)
+            pontos.push_back({x, 950.0 - 30.0 * i, 0});
+        const int segundo = n - 2;
+        const zvdb::Point3 outro = pontos[size_t(segundo) + 1];
+        fio({outro, {x - 15, outro.y, 0}}, numero + "9");
+        const zvdb::BlockReference* repetido = nullptr;
+        for (int i = 0; i < n; ++i) {
+            if (i == segundo) continue;
+            std::vector<std::pair<std::string, zvdb::Point3>> ligacoes{
+                {QString("A%1").arg(i + 1).toStdString(), pontos[size_t(i) + 1]}};
+            if (i == 1) ligacoes.push_back({"A2", outro});
+            const zvdb::BlockReference* k =
+                componente(QString("-K%1").arg(i + 1).toStdString(), ligacoes);
+            if (i == 1) repetido = k;
+        }
+        fio(pontos, numero);
+        return handle(repetido);
+    };
+    const QString curto = monta(20, 8, "30");
+    const QString longo = monta(200, 24, "40");
+    CCFioDataReader leitor;
+    le(leitor);
+    int pontas = 0;
+    for (const CEItemLista* item : itens_) {
+        const QString numero = item->valorCampo("FIO");
+        if (numero != "30" && numero != "40") continue;
+        const QString repetido = numero == "30" ? curto : longo;
+        pontas += (item->valorCampo("HANDLE_INI") == repetido) +
+                  (item->valorCampo("HANDLE_FIM") == repetido);
+        EXPECT_EQ(item->valorCampo("FIO_SEGINI"), numero)
+            << item->valorCampo("REL_INI").toStdString();
+        EXPECT_EQ(item->valorCampo("FIO_SEGFIM"), numero)
+            << item->valorCampo("REL_FIM").toStdString();
+    }
+    // Each wire meets -K2 twice, and each meeting is the end of one stretch and the start of
+    // the next.
+    EXPECT_EQ(pontas, 8);
+}
+
 // ---- which wires
 
 TEST_F(WireReaderTest, AWireWhoseKeyIsNotListedIsLeftOutWithoutAMessage) {
@@ -420,6 +467,114 @@ TEST_F(WireReaderTest, AWiresFieldsFollowItsTextsUnderAnySuffixAndAfterAChange) 
     CEItemLista novoB;
     novo.LeFio(QString(), novoB, id(b), &modelo_);
     EXPECT_EQ(textos(depois), textos(novoB));
+}
+
+TEST_F(WireReaderTest, AWiresTextsGiveWayToTheFieldsWrittenAfterThemAndNameFieldsInTurn) {
+    // Texts that repeat a name, or name a field the reader writes after them, or leave the
+    // quantity empty; and two names no wire had before.
+    zvdb::Polyline* linha = fio({{0, 10, 0}, {10, 10, 0}}, "60");
+    linha->setXData("KVR_ZV_WIRE", zvsample::XDataItems()
+                                       .text("100061")
+                                       .text("1")
+                                       .text("FIO60")
+                                       .text("CORVM")
+                                       .text("CORAZ")
+                                       .text("LAYEROUTRO")
+                                       .text("QTD")
+                                       .text("ZZ_FIO_TURNO1a")
+                                       .text("AA_FIO_TURNO2b")
+                                       .tags());
+    const zvdb::Polyline* semQtd = fio({{0, 20, 0}, {10, 20, 0}}, "61");
+    ASSERT_EQ(CamposItem::numeroSeHouver("ZZ_FIO_TURNO1"), CamposItem::kSemNome);
+    ASSERT_EQ(CamposItem::numeroSeHouver("ZV_KEY_TURNO"), CamposItem::kSemNome);
+    const auto confere = [](const CEItemLista& item, const QString& s) {
+        EXPECT_EQ(item.valorCampo("FIO" + s), "60");
+        EXPECT_EQ(item.valorCampo("COR" + s), "AZ");
+        EXPECT_EQ(item.valorCampo("LAYER" + s), kPagina1);
+        EXPECT_EQ(item.valorCampo("QTD" + s), "1");
+        EXPECT_EQ(item.valorCampo("ZZ_FIO_TURNO1" + s), "a");
+        EXPECT_EQ(item.valorCampo("AA_FIO_TURNO2" + s), "b");
+    };
+    // Read into an item that holds fields already: the wire's replace them, the others stay.
+    CCFioDataReader leitor;
+    CEItemLista item;
+    item.definirCampo("COR", "PR");
+    item.definirCampo("QTD", "7");
+    item.definirCampo("OUTRO", "x");
+    leitor.LeFio(QString(), item, id(linha), &modelo_);
+    confere(item, QString());
+    EXPECT_EQ(item.valorCampo("OUTRO"), "x");
+    // A wire without a quantity of its own keeps the item's.
+    CEItemLista comQtd;
+    comQtd.definirCampo("QTD", "7");
+    leitor.LeFio(QString(), comQtd, id(semQtd), &modelo_);
+    EXPECT_EQ(comQtd.valorCampo("QTD"), "7");
+    EXPECT_EQ(comQtd.valorCampo("FIO"), "61");
+    // The reading kept for the copies gives the same, under a suffix too.
+    LeitorDasLeituras dasLeituras;
+    CEItemLista ponta;
+    dasLeituras.CopiaEntidade("_P", ponta, id(linha), &modelo_);
+    confere(ponta, "_P");
+    const std::unique_ptr<CEItemLista> criado(dasLeituras.CriaItemFio(id(linha), modelo_));
+    ASSERT_TRUE(criado);
+    confere(*criado, QString());
+
+    // Names are numbered in the order the fields are written, new ones of the texts among
+    // them: the fields reach LISP in that order.
+    EXPECT_LT(CamposItem::numeroSeHouver("ZZ_FIO_TURNO1"),
+              CamposItem::numeroSeHouver("AA_FIO_TURNO2"));
+    CEItemLista sufixado;
+    leitor.LeFio("_TURNO", sufixado, id(linha), &modelo_);
+    confere(sufixado, "_TURNO");
+    std::vector<std::uint32_t> numeros;
+    // (COR is a catalogue column too: it comes first, with the columns.)
+    for (const char* nome :
+         {"ZV_KEY", "FIO", "LAYER", "QTD", "ZZ_FIO_TURNO1", "AA_FIO_TURNO2", "WIRE_LISTA",
+          "DESCRICAO", "TP_DESCRI", "POSICAO", "GRUPO", "PAGINA", "SAP_MATERIAL"})
+        numeros.push_back(CamposItem::numeroSeHouver(QString(nome) + "_TURNO"));
+    EXPECT_TRUE(std::is_sorted(numeros.begin(), numeros.end()));
+    EXPECT_EQ(std::adjacent_find(numeros.begin(), numeros.end()), numeros.end());
+}
+
+TEST_F(WireReaderTest, AWireReadAgainAfterAChangeGivesItsNewTextsNotThoseTheListSaw) {
+    borne("X1", "1", {20, 200, 0});
+    borne("X1", "2", {20, 100, 0});
+    zvdb::Polyline* linha = fio({{20, 190, 0}, {20, 100, 0}}, "70");
+    CCFioDataReader leitor;
+    // The second walk finds the wire's reading kept from the first.
+    for (int vez = 0; vez < 2; ++vez) {
+        le(leitor);
+        ASSERT_EQ(itens_.size(), 1u);
+        EXPECT_EQ(itens_[0]->valorCampo("FIO"), "70");
+        itens_.destruirItens();
+    }
+    linha->setXData(
+        "KVR_ZV_WIRE",
+        zvsample::XDataItems().text("10006\f1").text("1").text("FIO\f71").text("COR\fAZ").tags());
+    CEItemLista depois;
+    leitor.LeFio(QString(), depois, id(linha), &modelo_);
+    EXPECT_EQ(depois.valorCampo("FIO"), "71");
+    EXPECT_EQ(depois.valorCampo("COR"), "AZ");
+    le(leitor);
+    ASSERT_EQ(itens_.size(), 1u);
+    EXPECT_EQ(itens_[0]->valorCampo("FIO"), "71");
+}
+
+TEST_F(WireReaderTest, APolylineWithASymbolsKeyTooTakesItsWireKeyFromItsOwnTexts) {
+    zvdb::Polyline* linha = fio({{0, 10, 0}, {10, 10, 0}}, "80");
+    linha->setXData("KVR_ZV", zvsample::XDataItems().text("7001\f1").tags());
+    const zvdb::Polyline* simples = fio({{0, 20, 0}, {10, 20, 0}}, "81");
+    CCFioDataReader leitor;
+    CEItemLista item, outro;
+    leitor.LeFio(QString(), item, id(linha), &modelo_);
+    leitor.LeFio(QString(), outro, id(simples), &modelo_);
+    // The wire's own key and what the catalogue lists of it; the columns follow the key the
+    // polyline answers to, the symbol's.
+    EXPECT_EQ(item.valorCampo("ZV_KEY"), "10006");
+    EXPECT_EQ(item.valorCampo("DESCRICAO"), outro.valorCampo("DESCRICAO"));
+    EXPECT_FALSE(outro.valorCampo("DESCRICAO").isEmpty());
+    EXPECT_EQ(outro.valorCampo("REFERENCIA"), "FX-1.5-BK");
+    EXPECT_NE(item.valorCampo("REFERENCIA"), "FX-1.5-BK");
 }
 
 class FiltroTemplate : public TemplateDouble {
