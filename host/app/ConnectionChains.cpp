@@ -121,13 +121,13 @@ ResultBuffer* ConnectionChains::toChain(const std::vector<zvproduct::WireConnect
 
 void ConnectionChains::deliver(const zvproduct::ConnectionTable& table, bool details,
                                zvsdk::ConnectionReceiver& receiver) {
-    receiver.begin(table.numbers.size(), table.touches.size());
+    receiver.begin(table.numbers.size(), table.entries.size());
     std::string text;
     std::size_t touch = 0;
     for (std::size_t w = 0; w < table.numbers.size(); ++w) {
         receiver.wire(qText(table.numbers[w]));
         for (; touch < table.ends[w]; ++touch) {
-            const zvproduct::Touch& entry = table.touches[touch];
+            const zvproduct::Touch entry = table.touch(touch);
             receiver.entry(entryText(entry, details, text), entry.point.x, entry.point.y,
                            entry.point.z);
         }
@@ -157,13 +157,15 @@ void ConnectionChains::install(DocumentLisp& lisp, const zvproduct::ProductConte
             *chain = toChain(answers->answer(in, context, kind, true), details);
             return true;
         });
-        lisp.addConnectionAnswer(
-            function, [context, answers, kind, details, hasDrawing](
-                          zvlisp::Interpreter& in, zvsdk::ConnectionReceiver& receiver) {
-                if (!hasDrawing()) return false;
-                deliver(answers->table(in, context, kind, true), details, receiver);
-                return true;
+        lisp.addConnectionAnswer(function, [context, answers, kind, details, hasDrawing](
+                                               zvlisp::Interpreter& in,
+                                               zvsdk::ConnectionReceiver& receiver) {
+            if (!hasDrawing()) return false;
+            answers->table(in, context, kind, true, [&](const zvproduct::ConnectionTable& table) {
+                deliver(table, details, receiver);
             });
+            return true;
+        });
     };
     add("getConexoesTodosFios", ConnectionAnswers::Kind::Wires, true);
     add("getConexoesTodosCabos", ConnectionAnswers::Kind::Cables, false);

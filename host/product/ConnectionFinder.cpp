@@ -92,12 +92,14 @@ bool sameUpper(std::string_view name, std::string_view upperName) {
 }
 
 // The applications that decide what a model-space entity is to the connection rule, with
-// the items of the first group of each: one walk over the entity's extended data.
+// the items of the first group of each, and where the extended data starts
+// (TagList::xdataStart): one walk over the entity's extended data, from its end.
 struct Roles {
     enum App { Symbol, Equipment, CutPoints, Wire, Cable, Blind, Count };
     std::size_t begin[Count] = {};
     std::size_t end[Count] = {};
     bool has[Count] = {};
+    std::size_t xdata = 0;
 
     // Every entity of model space passes here with all its applications: the names are
     // told apart by their length first.
@@ -120,21 +122,22 @@ struct Roles {
         }
     }
 
+    // The extended data is the run of codes 1000 and above at the end, from its first 1001
+    // on; a group ends where the next one starts. Walked backwards, an application's first
+    // group is the last one met.
     explicit Roles(const zvdb::DbObject& object) {
         const auto all = object.tags();
-        int open = -1;
-        for (std::size_t i = zvdb::TagList::xdataStart(all); i < all.size(); ++i) {
-            if (all[i].code != 1001) continue;
-            if (open >= 0) end[open] = i;
-            open = -1;
-            const int app = appOf(all[i].value);
-            if (app >= 0 && !has[app]) {
+        xdata = all.size();
+        for (std::size_t i = all.size(); i > 1 && all[i - 1].code >= 1000; --i) {
+            if (all[i - 1].code != 1001) continue;
+            const int app = appOf(all[i - 1].value);
+            if (app >= 0) {
                 has[app] = true;
-                begin[app] = i + 1;
-                open = app;
+                begin[app] = i;
+                end[app] = xdata;
             }
+            xdata = i - 1;
         }
-        if (open >= 0) end[open] = all.size();
     }
     std::span<const zvdb::Tag> items(const zvdb::DbObject& object, App app) const {
         return has[app] ? object.tags().subspan(begin[app], end[app] - begin[app])
@@ -150,8 +153,8 @@ struct FirstTags {
     std::span<const zvdb::Tag> all;
     int value = -1, name = -1, layer = -1, point = -1;
 
-    FirstTags(std::span<const zvdb::Tag> tags, unsigned wanted) : all(tags) {
-        const std::size_t end = zvdb::TagList::xdataStart(all);
+    // `end`: where the extended data starts.
+    FirstTags(std::span<const zvdb::Tag> tags, unsigned wanted, std::size_t end) : all(tags) {
         bool inGroup = false;
         unsigned found = 0;
         for (std::size_t i = 1; i < end; ++i) {
@@ -235,43 +238,48 @@ void byRankThenHandle(std::vector<T>& items, std::size_t pages, std::vector<T>& 
 struct ConnectionFinder::Scratch {
     std::vector<const Spot*> near;
     std::vector<std::uint32_t> seen;
-    std::vector<zvdb::Point3> vertices;
-    std::vector<Touch> touches;
+    std::vector<std::uint32_t> touches;
 };
 
 namespace {
 
-// The vertices of a polyline as Polyline::vertices gives them, into `out`: a lightweight
-// polyline's in one walk of its tags (its elevation, the first 38 outside application
+// The vertices of a polyline as Polyline::vertices gives them, appended to `out`, and its
+// layer as Entity::layer reads it: a lightweight polyline's in one walk of its tags up to
+// `end`, where its extended data starts (its elevation, the first 38 outside application
 // groups, is the z of all), without a vector made per polyline.
-void readVertices(const zvdb::Polyline& polyline, std::vector<zvdb::Point3>& out) {
-    out.clear();
+std::string_view appendVertices(const zvdb::Polyline& polyline, std::size_t end,
+                                std::vector<zvdb::Point3>& out) {
     if (!polyline.isLightweight()) {
-        out = polyline.vertices();
-        return;
+        const std::vector<zvdb::Point3> points = polyline.vertices();
+        out.insert(out.end(), points.begin(), points.end());
+        return polyline.layer();
     }
     const auto all = polyline.tags();
-    const std::size_t end = zvdb::TagList::xdataStart(all);
-    int elevation = -1;
+    const std::size_t first = out.size();
+    int elevation = -1, layer = -1;
     bool inGroup = false;
     for (std::size_t i = 1; i < end; ++i) {
         const zvdb::Tag& tag = all[i];
         if (tag.code == 10) {
             out.push_back({zvdb::TagValues::toReal(tag.value), 0.0, 0.0});
         } else if (tag.code == 20) {
-            if (!out.empty()) out.back().y = zvdb::TagValues::toReal(tag.value);
+            if (out.size() > first) out.back().y = zvdb::TagValues::toReal(tag.value);
         } else if (zvdb::TagList::opensGroup(tag)) {
             inGroup = true;
         } else if (zvdb::TagList::closesGroup(tag)) {
             inGroup = false;
         } else if (tag.code == 38 && !inGroup && elevation < 0) {
             elevation = static_cast<int>(i);
+        } else if (tag.code == 8 && !inGroup && layer < 0) {
+            layer = static_cast<int>(i);
         }
     }
-    if (elevation < 0) return;
-    const double z = zvdb::TagValues::toReal(all[static_cast<std::size_t>(elevation)].value);
-    for (zvdb::Point3& p : out)
-        p.z = z;
+    if (elevation >= 0) {
+        const double z = zvdb::TagValues::toReal(all[static_cast<std::size_t>(elevation)].value);
+        for (std::size_t k = first; k < out.size(); ++k)
+            out[k].z = z;
+    }
+    return layer < 0 ? std::string_view("0") : all[static_cast<std::size_t>(layer)].value;
 }
 
 }  // namespace
@@ -338,36 +346,54 @@ void ConnectionFinder::readModelSpace() {
     const auto entities = database_.modelSpace()->entities();
     symbols_.reserve(entities.size() / 2);
     spots_.reserve(entities.size());
+    // about one vertex an entity: the lines have two or three, and most entities are symbols
+    vertices_.reserve(entities.size());
     for (zvdb::Entity* entity : entities) {
         const Roles roles(*entity);
-        auto* reference = roles.has[Roles::Symbol] || roles.has[Roles::Equipment]
-                              ? dynamic_cast<zvdb::BlockReference*>(entity)
-                              : nullptr;
-        if (reference) {
-            indexSymbol(*reference, roles.begin[Roles::CutPoints],
+        // no kind of reference or polyline derives from their classes: the type tells them
+        const std::type_info& type = typeid(*entity);
+        if ((roles.has[Roles::Symbol] || roles.has[Roles::Equipment]) &&
+            type == typeid(zvdb::BlockReference)) {
+            indexSymbol(static_cast<const zvdb::BlockReference&>(*entity), roles.xdata,
+                        roles.begin[Roles::CutPoints],
                         roles.has[Roles::CutPoints] ? roles.end[Roles::CutPoints] : 0);
             continue;
         }
         if (!roles.has[Roles::Wire] && !roles.has[Roles::Cable] && !roles.has[Roles::Blind])
             continue;
-        auto* polyline = dynamic_cast<zvdb::Polyline*>(entity);
-        if (!polyline) continue;
-        Line line{polyline, polyline->handle(), 0, layerId(polyline->layer()), {}};
-        if (roles.has[Roles::Wire]) {
-            line.number = wireNumberOf(roles.items(*polyline, Roles::Wire));
-            wireLines_.push_back(line);
-            line.number = {};
-        }
-        if (roles.has[Roles::Cable]) leadLines_.push_back(line);
-        if (roles.has[Roles::Blind]) blindLines_.push_back(line);
+        if (type != typeid(zvdb::Polyline)) continue;
+        auto& polyline = static_cast<zvdb::Polyline&>(*entity);
+        addLine(polyline, roles.xdata, roles.has[Roles::Wire], roles.has[Roles::Cable],
+                roles.has[Roles::Blind], wireNumberOf(roles.items(polyline, Roles::Wire)));
     }
+}
+
+// A polyline of the roles given, with its vertices.
+void ConnectionFinder::addLine(zvdb::Polyline& polyline, std::size_t xdata, bool wire, bool lead,
+                               bool blind, std::string_view number) {
+    const auto firstVertex = static_cast<std::uint32_t>(vertices_.size());
+    const std::int32_t layer = layerId(appendVertices(polyline, xdata, vertices_));
+    const auto vertexCount = static_cast<std::uint32_t>(vertices_.size() - firstVertex);
+    Line line{&polyline, polyline.handle(), 0, layer, {}, firstVertex, vertexCount};
+    if (wire) {
+        line.number = number;
+        wireLines_.push_back(line);
+        line.number = {};
+    }
+    if (lead) leadLines_.push_back(line);
+    if (blind) blindLines_.push_back(line);
+}
+
+std::span<const zvdb::Point3> ConnectionFinder::verticesOf(const Line& line) const {
+    return {vertices_.data() + line.firstVertex, line.vertexCount};
 }
 
 // A project symbol gives its connection attributes' text positions, its insertion point and
 // its cut point; the two latter take the name of a connection attribute standing on them.
-void ConnectionFinder::indexSymbol(const zvdb::BlockReference& reference, std::size_t cutBegin,
-                                   std::size_t cutEnd) {
-    const FirstTags own(reference.tags(), FirstTags::Name | FirstTags::Layer | FirstTags::Point);
+void ConnectionFinder::indexSymbol(const zvdb::BlockReference& reference, std::size_t xdata,
+                                   std::size_t cutBegin, std::size_t cutEnd) {
+    const FirstTags own(reference.tags(), FirstTags::Name | FirstTags::Layer | FirstTags::Point,
+                        xdata);
     const std::int32_t layer = layerId(own.text(own.layer, "0"));
     const auto symbol = static_cast<std::uint32_t>(symbols_.size());
     symbols_.push_back({reference.handle(), own.text(own.name)});
@@ -375,8 +401,9 @@ void ConnectionFinder::indexSymbol(const zvdb::BlockReference& reference, std::s
     for (zvdb::Entity* sub : reference.subEntities()) {
         // no kind of attribute derives from Attribute: its type tells it at once
         if (sub->isErased() || typeid(*sub) != typeid(zvdb::Attribute)) continue;
-        const FirstTags attribute(sub->tags(),
-                                  FirstTags::Value | FirstTags::Name | FirstTags::Point);
+        const auto tags = sub->tags();
+        const FirstTags attribute(tags, FirstTags::Value | FirstTags::Name | FirstTags::Point,
+                                  zvdb::TagList::xdataStart(tags));
         if (isConnectionTag(attribute.text(attribute.name)))
             addSpot(symbol, layer, attribute.position(), attribute.text(attribute.value));
     }
@@ -522,7 +549,7 @@ void ConnectionFinder::sortLines() {
 
 // One touch per symbol near the vertex, at the symbol's nearest point, nearest first.
 void ConnectionFinder::touchesAt(std::int32_t layer, const zvdb::Point3& p, double radius,
-                                 std::vector<Touch>& out, Scratch& scratch) const {
+                                 std::vector<std::uint32_t>& out, Scratch& scratch) const {
     auto& near = scratch.near;
     near.clear();
     // nothing is within a distance of a point that is not finite
@@ -566,14 +593,25 @@ void ConnectionFinder::touchesAt(std::int32_t layer, const zvdb::Point3& p, doub
     for (const Spot* spot : near) {
         if (std::find(seen.begin(), seen.end(), spot->symbol) != seen.end()) continue;
         seen.push_back(spot->symbol);
-        const Symbol& symbol = symbols_[spot->symbol];
-        const Touch touch{symbol.handle, spot->connection, symbol.block, spot->point};
         // two vertices on one point of a symbol are one touch
-        if (!out.empty() && out.back().symbol == touch.symbol &&
-            out.back().connection == touch.connection && out.back().point == touch.point)
-            continue;
-        out.push_back(touch);
+        if (!out.empty()) {
+            const Spot& last = spots_[out.back()];
+            if (symbols_[last.symbol].handle == symbols_[spot->symbol].handle &&
+                last.connection == spot->connection && last.point == spot->point)
+                continue;
+        }
+        out.push_back(static_cast<std::uint32_t>(spot - spots_.data()));
     }
+}
+
+Touch ConnectionFinder::touchAt(std::uint32_t place) const {
+    const Spot& spot = spots_[place];
+    const Symbol& symbol = symbols_[spot.symbol];
+    return {symbol.handle, spot.connection, symbol.block, spot.point};
+}
+
+Touch ConnectionTable::touch(std::size_t k) const {
+    return finder->touchAt(entries[k]);
 }
 
 std::vector<zvdb::Polyline*> ConnectionFinder::polylinesInPageOrder(zvdb::Database& database,
@@ -669,10 +707,11 @@ void eachGroup(const WireGroups& groups, const std::vector<Line>& lines, AddTouc
 // Group by group, its polylines in their order and its touches: each group's vectors are
 // made to size once.
 struct MakeConnections {
+    const ConnectionFinder& finder;
     template <class Line, class AddTouches>
     std::vector<WireConnections> operator()(const WireGroups& groups,
                                             const std::vector<Line>& lines,
-                                            std::vector<Touch>& touches,
+                                            std::vector<std::uint32_t>& touches,
                                             AddTouches&& addTouches) const {
         std::vector<WireConnections> result(groups.numbers.size());
         touches.clear();
@@ -682,7 +721,9 @@ struct MakeConnections {
             group.polylines.reserve(groups.first[g + 1] - groups.first[g]);
             for (std::uint32_t k = groups.first[g]; k < groups.first[g + 1]; ++k)
                 group.polylines.push_back(lines[groups.lines[k]].handle);
-            group.touches.assign(touches.begin(), touches.end());
+            group.touches.reserve(touches.size());
+            for (const std::uint32_t place : touches)
+                group.touches.push_back(finder.touchAt(place));
             touches.clear();
         });
         return result;
@@ -693,7 +734,7 @@ struct MakeConnections {
 struct MakeTable {
     template <class Line, class AddTouches>
     ConnectionTable operator()(const WireGroups& groups, const std::vector<Line>& lines,
-                               std::vector<Touch>& touches, AddTouches&& addTouches) const {
+                               std::vector<std::uint32_t>& touches, AddTouches&& addTouches) const {
         ConnectionTable table;
         table.numbers = groups.numbers;
         table.ends.reserve(groups.numbers.size());
@@ -701,7 +742,7 @@ struct MakeTable {
         eachGroup(groups, lines, addTouches, [&](std::size_t) {
             table.ends.push_back(static_cast<std::uint32_t>(touches.size()));
         });
-        table.touches = std::move(touches);
+        table.entries = std::move(touches);
         return table;
     }
 };
@@ -717,8 +758,7 @@ auto ConnectionFinder::wiresWith(Make&& make) const {
     lineNumbers = {};
     Scratch scratch;
     return make(groups, wireLines_, scratch.touches, [&](const Line& line) {
-        readVertices(*line.polyline, scratch.vertices);
-        for (const zvdb::Point3& vertex : scratch.vertices)
+        for (const zvdb::Point3& vertex : verticesOf(line))
             touchesAt(line.layer, vertex, tolerance_, scratch.touches, scratch);
     });
 }
@@ -737,8 +777,7 @@ auto ConnectionFinder::cablesWith(Make&& make) const {
     std::sort(blinds.begin(), blinds.end());
     Scratch scratch;
     auto ends = [&](const Line& line, bool firstToo) {
-        readVertices(*line.polyline, scratch.vertices);
-        const auto& vertices = scratch.vertices;
+        const auto vertices = verticesOf(line);
         if (vertices.empty()) return;
         if (firstToo)
             touchesAt(line.layer, vertices.front(), kLeadTolerance, scratch.touches, scratch);
@@ -767,19 +806,23 @@ auto ConnectionFinder::cablesWith(Make&& make) const {
 }
 
 std::vector<WireConnections> ConnectionFinder::wires() const {
-    return wiresWith(MakeConnections{});
+    return wiresWith(MakeConnections{*this});
 }
 
 std::vector<WireConnections> ConnectionFinder::cables() const {
-    return cablesWith(MakeConnections{});
+    return cablesWith(MakeConnections{*this});
 }
 
 ConnectionTable ConnectionFinder::wireTable() const {
-    return wiresWith(MakeTable{});
+    ConnectionTable table = wiresWith(MakeTable{});
+    table.finder = this;
+    return table;
 }
 
 ConnectionTable ConnectionFinder::cableTable() const {
-    return cablesWith(MakeTable{});
+    ConnectionTable table = cablesWith(MakeTable{});
+    table.finder = this;
+    return table;
 }
 
 std::string ConnectionFinder::cableNumber(const zvdb::Polyline& lead) const {
