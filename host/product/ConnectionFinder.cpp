@@ -153,7 +153,8 @@ struct FirstTags {
     std::span<const zvdb::Tag> all;
     int value = -1, name = -1, layer = -1, point = -1;
 
-    // `end`: where the extended data starts.
+    // `end`: where the extended data starts, or past it (the extended data holds codes of
+    // 1000 and above only).
     FirstTags(std::span<const zvdb::Tag> tags, unsigned wanted, std::size_t end) : all(tags) {
         bool inGroup = false;
         unsigned found = 0;
@@ -401,9 +402,10 @@ void ConnectionFinder::indexSymbol(const zvdb::BlockReference& reference, std::s
     for (zvdb::Entity* sub : reference.subEntities()) {
         // no kind of attribute derives from Attribute: its type tells it at once
         if (sub->isErased() || typeid(*sub) != typeid(zvdb::Attribute)) continue;
+        // the extended data holds codes of 1000 and above only: the walk may run over it
         const auto tags = sub->tags();
         const FirstTags attribute(tags, FirstTags::Value | FirstTags::Name | FirstTags::Point,
-                                  zvdb::TagList::xdataStart(tags));
+                                  tags.size());
         if (isConnectionTag(attribute.text(attribute.name)))
             addSpot(symbol, layer, attribute.position(), attribute.text(attribute.value));
     }
@@ -610,10 +612,6 @@ Touch ConnectionFinder::touchAt(std::uint32_t place) const {
     return {symbol.handle, spot.connection, symbol.block, spot.point};
 }
 
-Touch ConnectionTable::touch(std::size_t k) const {
-    return finder->touchAt(entries[k]);
-}
-
 std::vector<zvdb::Polyline*> ConnectionFinder::polylinesInPageOrder(zvdb::Database& database,
                                                                     const char* application) {
     const auto pages = PageRegistry(database).pages();
@@ -785,8 +783,9 @@ auto ConnectionFinder::cablesWith(Make&& make) const {
             touchesAt(line.layer, vertices.back(), kLeadTolerance, scratch.touches, scratch);
     };
     std::vector<std::string> leadNumbers(leadLines_.size());
+    CableRecord last;
     for (std::size_t i = 0; i < leadLines_.size(); ++i)
-        leadNumbers[i] = cableNumber(*leadLines_[i].polyline);
+        leadNumbers[i] = cableNumber(*leadLines_[i].polyline, last);
     const std::vector<std::string_view> views(leadNumbers.begin(), leadNumbers.end());
     const WireGroups groups(views);
     auto answer = make(groups, leadLines_, scratch.touches, [&](const Line& lead) {
@@ -826,17 +825,32 @@ ConnectionTable ConnectionFinder::cableTable() const {
 }
 
 std::string ConnectionFinder::cableNumber(const zvdb::Polyline& lead) const {
+    CableRecord last;
+    return cableNumber(lead, last);
+}
+
+// The leads of a cable name one record of it first: the name read from the last record
+// serves the next lead that names the same.
+std::string ConnectionFinder::cableNumber(const zvdb::Polyline& lead, CableRecord& last) const {
     const auto items = Roles(lead).items(lead, Roles::Cable);
     if (items.size() < 2) return {};
     const std::string_view keyText = items[0].value;
     const std::string_view key = keyText.substr(0, keyText.find('\f'));
+    auto number = [key](std::string_view name) {
+        std::string text;
+        text.reserve(name.size() + 1 + key.size());
+        return text.append(name).append(1, '\f').append(key);
+    };
     for (std::size_t i = 1; i < items.size(); ++i) {
-        zvdb::DbObject* record =
-            database_.objectByHandle(zvdb::TagValues::toHandle(items[i].value));
+        const std::uint64_t handle = zvdb::TagValues::toHandle(items[i].value);
+        if (i == 1 && handle == last.handle && !last.name.empty()) return number(last.name);
+        zvdb::DbObject* record = database_.objectByHandle(handle);
         if (!record) continue;
         for (const zvdb::Tag& field : appItems(*record, "KVR_ZV_ATT_VIRTUAL")) {
             const std::string_view name = fieldValue(field.value, {"CABO", "CABLE"});
-            if (!name.empty()) return std::string(name) + '\f' + std::string(key);
+            if (name.empty()) continue;
+            last = {handle, name};
+            return number(name);
         }
     }
     return {};

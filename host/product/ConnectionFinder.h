@@ -128,6 +128,12 @@ private:
         std::uint32_t mask = 0;  // its size - 1; 0: no spot on the layer, no table
     };
     struct Scratch;
+    // A record of a cable with the name it gives, or none.
+    struct CableRecord {
+        std::uint64_t handle = 0;
+        std::string_view name;
+    };
+    std::string cableNumber(const zvdb::Polyline& lead, CableRecord& last) const;
 
     void readModelSpace();
     void indexSymbol(const zvdb::BlockReference& reference, std::size_t xdata, std::size_t cutBegin,
@@ -169,5 +175,9 @@ private:
     // The lines' vertices, read on the walk while their tags are at hand.
     std::vector<zvdb::Point3> vertices_;
 };
+
+inline Touch ConnectionTable::touch(std::size_t k) const {
+    return finder->touchAt(entries[k]);
+}
 
 }  // namespace zvproduct
