@@ -1,46 +1,39 @@
 #include "LispInterface.h"
 
-#include <charconv>
+#include <string>
 #include <vector>
 
 namespace zvsdk {
 
-namespace {
-
-bool isAscii(std::string_view text) {
-    for (char c : text)
-        if (static_cast<unsigned char>(c) >= 0x80) return false;
-    return true;
-}
-
-}  // namespace
-
-// Written straight into its QString when the names are ASCII, as they nearly always are.
+// Written straight into its QString, the handle's digits from its last, while the names are
+// ASCII, as they nearly always are; made again through the UTF-8 decoder otherwise.
 QString symbolEntryText(std::uint64_t handle, bool details, std::string_view connection,
                         std::string_view block) {
-    char digits[24];
-    const auto end = std::to_chars(digits, digits + sizeof digits, handle, 16).ptr;
-    for (char* c = digits; c != end; ++c)
-        if (*c >= 'a') *c = static_cast<char>(*c - 'a' + 'A');
-    const auto count = static_cast<std::size_t>(end - digits);
-    if (details && !(isAscii(connection) && isAscii(block))) {
-        std::string text(digits, count);
-        text.append(1, '#').append(connection).append(1, '#').append(block);
-        return QString::fromUtf8(text.data(), static_cast<int>(text.size()));
-    }
-    const std::size_t size = count + (details ? 2 + connection.size() + block.size() : 0);
+    int digits = 1;
+    for (std::uint64_t rest = handle >> 4; rest != 0; rest >>= 4)
+        ++digits;
+    const std::size_t size =
+        std::size_t(digits) + (details ? 2 + connection.size() + block.size() : 0);
     QString text(static_cast<int>(size), Qt::Uninitialized);
-    QChar* out = text.data();
-    for (std::size_t i = 0; i < count; ++i)
-        *out++ = QLatin1Char(digits[i]);
+    QChar* const first = text.data();
+    for (int i = digits - 1; i >= 0; --i, handle >>= 4)
+        first[i] = QLatin1Char("0123456789ABCDEF"[handle & 0xF]);
     if (!details) return text;
-    *out++ = QLatin1Char('#');
-    for (char c : connection)
-        *out++ = QLatin1Char(c);
-    *out++ = QLatin1Char('#');
-    for (char c : block)
-        *out++ = QLatin1Char(c);
-    return text;
+    QChar* out = first + digits;
+    unsigned char high = 0;  // any byte of 0x80 and above
+    auto put = [&out, &high](std::string_view name) {
+        *out++ = QLatin1Char('#');
+        for (const char c : name) {
+            high |= static_cast<unsigned char>(c);
+            *out++ = QLatin1Char(c);
+        }
+    };
+    put(connection);
+    put(block);
+    if (high < 0x80) return text;
+    std::string bytes = text.left(digits).toStdString();
+    bytes.append(1, '#').append(connection).append(1, '#').append(block);
+    return QString::fromUtf8(bytes.data(), static_cast<int>(bytes.size()));
 }
 
 void ConnectionReceiver::symbolEntry(std::uint64_t handle, bool details,
