@@ -451,78 +451,68 @@ const ConnectionFinder::CellRun* ConnectionFinder::run(std::int32_t layer,
     }
 }
 
-// Spot i goes to where `order` puts it: spots_[i] becomes spots_[order[i].index], one cycle
-// of the permutation at a time (an index pointing at its own place is done).
-template <class Key>
-void ConnectionFinder::placeSpots(std::vector<Key>& order) {
-    for (std::uint32_t i = 0; i < order.size(); ++i) {
-        if (order[i].index == i) continue;
+// Spot i goes to where `from` takes it from: spots_[i] becomes spots_[from[i]], one cycle of
+// the permutation at a time (a place taking its own spot is done).
+void ConnectionFinder::placeSpots(std::vector<std::uint32_t>& from) {
+    for (std::uint32_t i = 0; i < from.size(); ++i) {
+        if (from[i] == i) continue;
         const Spot held = spots_[i];
         std::uint32_t at = i;
         for (;;) {
-            const std::uint32_t from = std::exchange(order[at].index, at);
-            if (from == i) {
+            const std::uint32_t next = std::exchange(from[at], at);
+            if (next == i) {
                 spots_[at] = held;
                 break;
             }
-            spots_[at] = spots_[from];
-            at = from;
+            spots_[at] = spots_[next];
+            at = next;
         }
     }
 }
 
-// The spots go to their layer's place in one counting pass, and each layer's are sorted by
-// cell (the order they came in kept within a cell): a vertex then finds its cells' spots in
-// a run each. The spots are moved in place, without a second array of them.
+// Each layer's table has room for twice its spots, more than its cells. The spots are counted
+// into the slots of their cells, each cell's run follows the one before in the slots' order,
+// and the spots go to their runs in the order they came: a vertex then finds its cells' spots
+// in a run each, without a sort. The spots are moved in place, without a second array of them.
 void ConnectionFinder::buildGrid() {
-    struct Key {
-        std::uint64_t cell;
-        std::uint32_t index;
-    };
-    std::vector<std::uint32_t> starts(layers_.size() + 1, 0);
+    std::vector<std::uint32_t> counts(layers_.size(), 0);
     for (const Spot& spot : spots_)
-        ++starts[static_cast<std::size_t>(spot.layer) + 1];
-    for (std::size_t layer = 1; layer < starts.size(); ++layer)
-        starts[layer] += starts[layer - 1];
-    std::vector<Key> keys(spots_.size());
-    {
-        std::vector<std::uint32_t> next(starts.begin(), starts.end() - 1);
-        for (std::uint32_t i = 0; i < spots_.size(); ++i)
-            keys[next[static_cast<std::size_t>(spots_[i].layer)]++] = {spots_[i].cell, i};
-    }
-    // the cells of each layer counted on the way
-    std::vector<std::uint32_t> cells(layers_.size(), 0);
-    for (std::size_t layer = 0; layer < cells.size(); ++layer) {
-        const auto first = keys.begin() + starts[layer], last = keys.begin() + starts[layer + 1];
-        std::sort(first, last, [](const Key& a, const Key& b) {
-            return a.cell != b.cell ? a.cell < b.cell : a.index < b.index;
-        });
-        for (auto key = first; key != last; ++key)
-            if (key == first || key->cell != (key - 1)->cell) ++cells[layer];
-    }
-    placeSpots(keys);
+        ++counts[static_cast<std::size_t>(spot.layer)];
     layerCells_.assign(layers_.size(), LayerCells{});
     std::size_t size = 0;
-    for (std::size_t layer = 0; layer < cells.size(); ++layer) {
-        if (cells[layer] == 0) continue;
-        const std::size_t own = std::bit_ceil(std::max<std::size_t>(4, cells[layer] * 2));
+    for (std::size_t layer = 0; layer < counts.size(); ++layer) {
+        if (counts[layer] == 0) continue;
+        const std::size_t own = std::bit_ceil(std::max<std::size_t>(4, counts[layer] * 2));
         layerCells_[layer] = {static_cast<std::uint32_t>(size),
                               static_cast<std::uint32_t>(own - 1)};
         size += own;
     }
+    // each spot's slot, its cell's count in `end` until the runs are laid out
     grid_.assign(size, CellRun{0, 0, 0});
-    for (std::uint32_t i = 0; i < spots_.size();) {
-        std::uint32_t end = i + 1;
-        while (end < spots_.size() && spots_[end].layer == spots_[i].layer &&
-               spots_[end].cell == spots_[i].cell)
-            ++end;
-        const LayerCells& table = layerCells_[static_cast<std::size_t>(spots_[i].layer)];
-        std::size_t slot = slotOf(spots_[i].cell) & table.mask;
-        while (grid_[table.first + slot].end != 0)
+    std::vector<std::uint32_t> slots(spots_.size());
+    for (std::size_t i = 0; i < spots_.size(); ++i) {
+        const Spot& spot = spots_[i];
+        const LayerCells& table = layerCells_[static_cast<std::size_t>(spot.layer)];
+        std::size_t slot = slotOf(spot.cell) & table.mask;
+        while (grid_[table.first + slot].end != 0 && grid_[table.first + slot].cell != spot.cell)
             slot = (slot + 1) & table.mask;
-        grid_[table.first + slot] = {spots_[i].cell, i, end};
-        i = end;
+        CellRun& run = grid_[table.first + slot];
+        run.cell = spot.cell;
+        ++run.end;
+        slots[i] = static_cast<std::uint32_t>(table.first + slot);
     }
+    std::uint32_t next = 0;
+    for (CellRun& run : grid_) {
+        if (run.end == 0) continue;
+        const std::uint32_t count = run.end;
+        run.begin = run.end = next;  // `end` is where its next spot goes, for now
+        next += count;
+    }
+    std::vector<std::uint32_t> from(spots_.size());
+    for (std::uint32_t i = 0; i < spots_.size(); ++i)
+        from[grid_[slots[i]].end++] = i;
+    slots = {};
+    placeSpots(from);
 }
 
 // Each role's polylines by registry page order, then by handle.

@@ -115,7 +115,7 @@ private:
         std::string_view number;  // a wire's number, read with its roles; empty otherwise
         std::uint32_t firstVertex, vertexCount;  // its vertices in vertices_
     };
-    // The run of the spots of one layer's cell in spots_ (sorted by layer and cell), in an
+    // The run of the spots of one layer's cell in spots_ (in the order they came), in an
     // open-addressed table: a vertex asks nine cells, most of them empty.
     struct CellRun {
         std::uint64_t cell;
@@ -147,8 +147,7 @@ private:
     static std::size_t slotOf(std::uint64_t cell);
     const CellRun* run(std::int32_t layer, std::uint64_t cell) const;
     void buildGrid();
-    template <class Key>
-    void placeSpots(std::vector<Key>& order);
+    void placeSpots(std::vector<std::uint32_t>& from);
     void sortLines();
     // The places in spots_ of the touches, appended to `out`.
     void touchesAt(std::int32_t layer, const zvdb::Point3& p, double radius,

@@ -576,6 +576,22 @@ TEST_F(ConnectionsTest, EachWireIsReadFromItsOwnTags) {
     EXPECT_EQ(table.touch(1).point, (zvdb::Point3{300, 200, 5}));
 }
 
+// Two connections of a symbol in one cell of the index, as near to a vertex as each other:
+// the touch is at the one whose attribute comes first.
+TEST_F(ConnectionsTest, EquallyNearConnectionsOfASymbolTouchByTheOrderOfItsAttributes) {
+    auto* ab = twoPoint("NA-1", "ESQ$0001$A", {100, 200, 0});
+    ab->addAttribute("LIGACAO1", "13", {100, 200, 0}, 2.5);
+    ab->addAttribute("LIGACAO2", "14", {100.125, 200, 0}, 2.5);
+    auto* ba = twoPoint("NA-1", "ESQ$0001$A", {100, 300, 0});
+    ba->addAttribute("LIGACAO2", "14", {100.125, 300, 0}, 2.5);
+    ba->addAttribute("LIGACAO1", "13", {100, 300, 0}, 2.5);
+    wire("ESQ$0001$A", {{100.0625, 200, 0}, {50, 200, 0}}, "501");
+    wire("ESQ$0001$A", {{100.0625, 300, 0}, {50, 300, 0}}, "502");
+    EXPECT_EQ(show("(mapcar 'cadr (getConexoesTodosFios))"),
+              "((\"" + hex(ab) + "#13#NA-1\" 100.0 200.0 0.0) (\"" + hex(ba) +
+                  "#14#NA-1\" 100.125 300.0 0.0))");
+}
+
 TEST_F(ConnectionsTest, TouchesAcrossTheIndexsCellsAndAtTheToleranceItself) {
     // the index's cells are one unit wide: each vertex here is in another cell than its
     // terminal, the last one exactly the tolerance away from it
