@@ -240,6 +240,7 @@ struct ConnectionFinder::Scratch {
     std::vector<const Spot*> near;
     std::vector<std::uint32_t> seen;
     std::vector<std::uint32_t> touches;
+    std::size_t wireStart = 0;  // the touches before it are another wire's
 };
 
 namespace {
@@ -586,7 +587,7 @@ void ConnectionFinder::touchesAt(std::int32_t layer, const zvdb::Point3& p, doub
         if (std::find(seen.begin(), seen.end(), spot->symbol) != seen.end()) continue;
         seen.push_back(spot->symbol);
         // two vertices on one point of a symbol are one touch
-        if (!out.empty()) {
+        if (out.size() > scratch.wireStart) {
             const Spot& last = spots_[out.back()];
             if (symbols_[last.symbol].handle == symbols_[spot->symbol].handle &&
                 last.connection == spot->connection && last.point == spot->point)
@@ -699,7 +700,7 @@ struct MakeConnections {
     template <class Line, class AddTouches>
     std::vector<WireConnections> operator()(const WireGroups& groups,
                                             const std::vector<Line>& lines,
-                                            std::vector<std::uint32_t>& touches,
+                                            std::vector<std::uint32_t>& touches, std::size_t&,
                                             AddTouches&& addTouches) const {
         std::vector<WireConnections> result(groups.numbers.size());
         touches.clear();
@@ -722,13 +723,15 @@ struct MakeConnections {
 struct MakeTable {
     template <class Line, class AddTouches>
     ConnectionTable operator()(const WireGroups& groups, const std::vector<Line>& lines,
-                               std::vector<std::uint32_t>& touches, AddTouches&& addTouches) const {
+                               std::vector<std::uint32_t>& touches, std::size_t& wireStart,
+                               AddTouches&& addTouches) const {
         ConnectionTable table;
         table.numbers = groups.numbers;
         table.ends.reserve(groups.numbers.size());
         touches.clear();
         eachGroup(groups, lines, addTouches, [&](std::size_t) {
             table.ends.push_back(static_cast<std::uint32_t>(touches.size()));
+            wireStart = touches.size();
         });
         table.entries = std::move(touches);
         return table;
@@ -745,7 +748,7 @@ auto ConnectionFinder::wiresWith(Make&& make) const {
     const WireGroups groups(lineNumbers);
     lineNumbers = {};
     Scratch scratch;
-    return make(groups, wireLines_, scratch.touches, [&](const Line& line) {
+    return make(groups, wireLines_, scratch.touches, scratch.wireStart, [&](const Line& line) {
         for (const zvdb::Point3& vertex : verticesOf(line))
             touchesAt(line.layer, vertex, tolerance_, scratch.touches, scratch);
     });
@@ -778,13 +781,14 @@ auto ConnectionFinder::cablesWith(Make&& make) const {
         leadNumbers[i] = cableNumber(*leadLines_[i].polyline, last);
     const std::vector<std::string_view> views(leadNumbers.begin(), leadNumbers.end());
     const WireGroups groups(views);
-    auto answer = make(groups, leadLines_, scratch.touches, [&](const Line& lead) {
-        ends(lead, true);
-        auto own = std::lower_bound(blinds.begin(), blinds.end(),
-                                    std::pair<std::uint64_t, std::uint32_t>{lead.handle, 0});
-        for (; own != blinds.end() && own->first == lead.handle; ++own)
-            ends(blindLines_[own->second], false);
-    });
+    auto answer =
+        make(groups, leadLines_, scratch.touches, scratch.wireStart, [&](const Line& lead) {
+            ends(lead, true);
+            auto own = std::lower_bound(blinds.begin(), blinds.end(),
+                                        std::pair<std::uint64_t, std::uint32_t>{lead.handle, 0});
+            for (; own != blinds.end() && own->first == lead.handle; ++own)
+                ends(blindLines_[own->second], false);
+        });
     if constexpr (std::is_same_v<decltype(answer), ConnectionTable>) {
         // the numbers' texts go with the table, where its views point
         answer.owned = std::move(leadNumbers);

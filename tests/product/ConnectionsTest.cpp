@@ -592,6 +592,21 @@ TEST_F(ConnectionsTest, EquallyNearConnectionsOfASymbolTouchByTheOrderOfItsAttri
                   "#14#NA-1\" 100.125 300.0 0.0))");
 }
 
+// One wire ends where the next one starts, on a terminal: each touches it, in the answer
+// as much as in the table the module reads.
+TEST_F(ConnectionsTest, TwoWiresOnOnePointOfASymbolEachTouchIt) {
+    auto* shared = terminal("ESQ$0001$A", {100, 200, 0}, "X1", "1");
+    wire("ESQ$0001$A", {{0, 200, 0}, {100, 200, 0}}, "601");
+    wire("ESQ$0001$A", {{100, 200, 0}, {200, 200, 0}}, "602");
+    const std::string entry = "(\"" + hex(shared) + "##BORNE_1\" 100.0 200.0 0.0)";
+    EXPECT_EQ(show("(getConexoesTodosFios)"), "((\"601\" " + entry + ") (\"602\" " + entry + "))");
+    const ConnectionFinder finder(*database, 0.1);
+    const ConnectionTable table = finder.wireTable();
+    EXPECT_EQ(table.ends, (std::vector<std::uint32_t>{1, 2}));
+    ASSERT_EQ(table.entries.size(), 2u);
+    EXPECT_EQ(table.touch(1).symbol, shared->handle());
+}
+
 TEST_F(ConnectionsTest, TouchesAcrossTheIndexsCellsAndAtTheToleranceItself) {
     // the index's cells are one unit wide: each vertex here is in another cell than its
     // terminal, the last one exactly the tolerance away from it
