@@ -153,8 +153,8 @@ private:
     void touchesAt(std::int32_t layer, const zvdb::Point3& p, double radius,
                    std::vector<std::uint32_t>& out, Scratch& scratch) const;
     std::int32_t layerId(std::string_view layer);
-    // `make(groups, lines, touches, addTouches)` given what the wires' (the cables') answer
-    // is made of.
+    // `make(groups, lines, touches, wireStart, addTouches)` given what the wires' (the
+    // cables') answer is made of; wireStart: where the wire being read starts in touches.
     template <class Make>
     auto wiresWith(Make&& make) const;
     template <class Make>
