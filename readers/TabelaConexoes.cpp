@@ -151,6 +151,13 @@ void TabelaConexoes::Entrada(QString texto, bool detalhes, bool completas) {
     pontos_.push_back({});
 }
 
+void TabelaConexoes::Entrada(QString texto, int corte, std::uint64_t handle) {
+    textos_.push_back(std::move(texto));
+    cortes_.push_back(corte);
+    handles_.push_back(handle);
+    pontos_.push_back({});
+}
+
 void TabelaConexoes::FechaFio(Fio&& fio, bool detalhes, bool completas) {
     fio.total = std::uint32_t(textos_.size()) - fio.primeiro;
     if (detalhes && completas) {
@@ -213,6 +220,22 @@ public:
     void entry(QString texto, double x, double y, double z) override {
         if (!aberto_) return;
         tabela_.Entrada(std::move(texto), detalhes_, completas_);
+        tabela_.pontos_.back() = {x, y, z};
+    }
+    // The element of a symbol's entry is its handle's text: it is made alone when the whole
+    // text is not kept, and nothing is read back from the text. A text whose element is the
+    // whole of it, or a handle longer than Handle reads as a number, goes the way of entry().
+    void symbolEntry(std::uint64_t handle, bool details, std::string_view connection,
+                     std::string_view block, double x, double y, double z) override {
+        int digitos = 1;
+        for (std::uint64_t resto = handle >> 4; resto != 0; resto >>= 4)
+            ++digitos;
+        if (!aberto_ || (details && !detalhes_) || digitos > 15) {
+            ConnectionReceiver::symbolEntry(handle, details, connection, block, x, y, z);
+            return;
+        }
+        tabela_.Entrada(zvsdk::symbolEntryText(handle, details && completas_, connection, block),
+                        digitos, handle);
         tabela_.pontos_.back() = {x, y, z};
     }
     void Fecha() {

@@ -99,6 +99,8 @@ private:
     Fio AbreFio(QString numero, bool detalhes) const;
     // Its point is pontos_.back(), the origin until the answer's reals come.
     void Entrada(QString texto, bool detalhes, bool completas);
+    // The same for a text whose element's length and handle are known.
+    void Entrada(QString texto, int corte, std::uint64_t handle);
     void FechaFio(Fio&& fio, bool detalhes, bool completas);
 
     std::vector<Fio> fios_;

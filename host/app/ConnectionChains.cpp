@@ -32,34 +32,6 @@ QString qText(std::string_view text) {
     return QString::fromLatin1(text.data(), size);
 }
 
-// An entry's text written straight into its QString when it is all ASCII, as it nearly
-// always is; `scratch` holds it on the way through the UTF-8 decoder otherwise.
-QString entryText(const zvproduct::Touch& touch, bool details, std::string& scratch) {
-    if (details && !(isAscii(touch.connection) && isAscii(touch.block))) {
-        scratch.clear();
-        ConnectionAnswers::appendEntryText(touch, details, scratch);
-        return QString::fromUtf8(scratch.data(), static_cast<int>(scratch.size()));
-    }
-    char digits[24];
-    const auto end = std::to_chars(digits, digits + sizeof digits, touch.symbol, 16).ptr;
-    const auto count = static_cast<std::size_t>(end - digits);
-    const std::size_t size =
-        count + (details ? 2 + touch.connection.size() + touch.block.size() : 0);
-    QString text(static_cast<int>(size), Qt::Uninitialized);
-    QChar* out = text.data();
-    for (std::size_t i = 0; i < count; ++i)
-        *out++ =
-            QLatin1Char(digits[i] >= 'a' ? static_cast<char>(digits[i] - 'a' + 'A') : digits[i]);
-    if (!details) return text;
-    *out++ = QLatin1Char('#');
-    for (char c : touch.connection)
-        *out++ = QLatin1Char(c);
-    *out++ = QLatin1Char('#');
-    for (char c : touch.block)
-        *out++ = QLatin1Char(c);
-    return text;
-}
-
 // Handles as the product's LISP functions give them: upper-case hexadecimal texts.
 QString handleText(std::uint64_t handle) {
     char digits[24];
@@ -100,14 +72,13 @@ ResultBuffer* ConnectionChains::toChain(const std::vector<zvproduct::WireConnect
     ChainFiller fill(chain);
     // the nodes go if the filling stops half-way
     std::unique_ptr<ResultBuffer, void (*)(ResultBuffer*)> owner(chain, zvsdk::releaseChain);
-    std::string text;
     fill.mark(zvsdk::RTLB);
     for (const zvproduct::WireConnections& wire : wires) {
         fill.mark(zvsdk::RTLB);
         fill.text(qText(wire.number));
         for (const zvproduct::Touch& touch : wire.touches) {
             fill.mark(zvsdk::RTLB);
-            fill.text(entryText(touch, details, text));
+            fill.text(zvsdk::symbolEntryText(touch.symbol, details, touch.connection, touch.block));
             fill.real(touch.point.x);
             fill.real(touch.point.y);
             fill.real(touch.point.z);
@@ -121,15 +92,14 @@ ResultBuffer* ConnectionChains::toChain(const std::vector<zvproduct::WireConnect
 
 void ConnectionChains::deliver(const zvproduct::ConnectionTable& table, bool details,
                                zvsdk::ConnectionReceiver& receiver) {
-    receiver.begin(table.numbers.size(), table.touches.size());
-    std::string text;
+    receiver.begin(table.numbers.size(), table.entries.size());
     std::size_t touch = 0;
     for (std::size_t w = 0; w < table.numbers.size(); ++w) {
         receiver.wire(qText(table.numbers[w]));
         for (; touch < table.ends[w]; ++touch) {
-            const zvproduct::Touch& entry = table.touches[touch];
-            receiver.entry(entryText(entry, details, text), entry.point.x, entry.point.y,
-                           entry.point.z);
+            const zvproduct::Touch entry = table.touch(touch);
+            receiver.symbolEntry(entry.symbol, details, entry.connection, entry.block,
+                                 entry.point.x, entry.point.y, entry.point.z);
         }
     }
 }
@@ -157,13 +127,15 @@ void ConnectionChains::install(DocumentLisp& lisp, const zvproduct::ProductConte
             *chain = toChain(answers->answer(in, context, kind, true), details);
             return true;
         });
-        lisp.addConnectionAnswer(
-            function, [context, answers, kind, details, hasDrawing](
-                          zvlisp::Interpreter& in, zvsdk::ConnectionReceiver& receiver) {
-                if (!hasDrawing()) return false;
-                deliver(answers->table(in, context, kind, true), details, receiver);
-                return true;
+        lisp.addConnectionAnswer(function, [context, answers, kind, details, hasDrawing](
+                                               zvlisp::Interpreter& in,
+                                               zvsdk::ConnectionReceiver& receiver) {
+            if (!hasDrawing()) return false;
+            answers->table(in, context, kind, true, [&](const zvproduct::ConnectionTable& table) {
+                deliver(table, details, receiver);
             });
+            return true;
+        });
     };
     add("getConexoesTodosFios", ConnectionAnswers::Kind::Wires, true);
     add("getConexoesTodosCabos", ConnectionAnswers::Kind::Cables, false);

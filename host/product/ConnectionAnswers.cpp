@@ -37,10 +37,11 @@ std::vector<WireConnections> ConnectionAnswers::answer(zvdb::Database& database,
     });
 }
 
-ConnectionTable ConnectionAnswers::table(zvdb::Database& database, double tolerance, Kind kind,
-                                         bool keepOther) {
-    return withFinder(database, tolerance, keepOther, [kind](const ConnectionFinder& finder) {
-        return kind == Kind::Wires ? finder.wireTable() : finder.cableTable();
+void ConnectionAnswers::table(zvdb::Database& database, double tolerance, Kind kind, bool keepOther,
+                              const TableUse& use) {
+    withFinder(database, tolerance, keepOther, [kind, &use](const ConnectionFinder& finder) {
+        use(kind == Kind::Wires ? finder.wireTable() : finder.cableTable());
+        return true;
     });
 }
 
@@ -57,9 +58,9 @@ std::vector<WireConnections> ConnectionAnswers::answer(zvlisp::Interpreter& lisp
     return answer(databaseOf(lisp, context), tolerance(lisp), kind, keepOther);
 }
 
-ConnectionTable ConnectionAnswers::table(zvlisp::Interpreter& lisp, const ProductContext& context,
-                                         Kind kind, bool keepOther) {
-    return table(databaseOf(lisp, context), tolerance(lisp), kind, keepOther);
+void ConnectionAnswers::table(zvlisp::Interpreter& lisp, const ProductContext& context, Kind kind,
+                              bool keepOther, const TableUse& use) {
+    table(databaseOf(lisp, context), tolerance(lisp), kind, keepOther, use);
 }
 
 double ConnectionAnswers::tolerance(zvlisp::Interpreter& lisp) {

@@ -11,6 +11,7 @@
 #include "WireLayerIndex.h"
 #include "WireListIndex.h"
 
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -36,11 +37,13 @@ public:
     std::vector<WireConnections> answer(zvlisp::Interpreter& lisp, const ProductContext& context,
                                         Kind kind, bool keepOther);
 
-    // The same answers as tables (ConnectionFinder::wireTable), from the same kept index.
-    ConnectionTable table(zvdb::Database& database, double tolerance, Kind kind,
-                          bool keepOther = true);
-    ConnectionTable table(zvlisp::Interpreter& lisp, const ProductContext& context, Kind kind,
-                          bool keepOther);
+    // The same answers as tables (ConnectionFinder::wireTable), from the same kept index,
+    // handed to `use` while their index lives.
+    using TableUse = std::function<void(const ConnectionTable&)>;
+    void table(zvdb::Database& database, double tolerance, Kind kind, bool keepOther,
+               const TableUse& use);
+    void table(zvlisp::Interpreter& lisp, const ProductContext& context, Kind kind, bool keepOther,
+               const TableUse& use);
 
     // The text of an entry: the symbol's handle in upper-case hexadecimal, with
     // "#CONNECTION#BLOCK" behind it for `details`; appended to `out`.

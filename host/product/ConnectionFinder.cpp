@@ -92,12 +92,14 @@ bool sameUpper(std::string_view name, std::string_view upperName) {
 }
 
 // The applications that decide what a model-space entity is to the connection rule, with
-// the items of the first group of each: one walk over the entity's extended data.
+// the items of the first group of each, and where the extended data starts
+// (TagList::xdataStart): one walk over the entity's extended data, from its end.
 struct Roles {
     enum App { Symbol, Equipment, CutPoints, Wire, Cable, Blind, Count };
     std::size_t begin[Count] = {};
     std::size_t end[Count] = {};
     bool has[Count] = {};
+    std::size_t xdata = 0;
 
     // Every entity of model space passes here with all its applications: the names are
     // told apart by their length first.
@@ -120,21 +122,22 @@ struct Roles {
         }
     }
 
+    // The extended data is the run of codes 1000 and above at the end, from its first 1001
+    // on; a group ends where the next one starts. Walked backwards, an application's first
+    // group is the last one met.
     explicit Roles(const zvdb::DbObject& object) {
         const auto all = object.tags();
-        int open = -1;
-        for (std::size_t i = zvdb::TagList::xdataStart(all); i < all.size(); ++i) {
-            if (all[i].code != 1001) continue;
-            if (open >= 0) end[open] = i;
-            open = -1;
-            const int app = appOf(all[i].value);
-            if (app >= 0 && !has[app]) {
+        xdata = all.size();
+        for (std::size_t i = all.size(); i > 1 && all[i - 1].code >= 1000; --i) {
+            if (all[i - 1].code != 1001) continue;
+            const int app = appOf(all[i - 1].value);
+            if (app >= 0) {
                 has[app] = true;
-                begin[app] = i + 1;
-                open = app;
+                begin[app] = i;
+                end[app] = xdata;
             }
+            xdata = i - 1;
         }
-        if (open >= 0) end[open] = all.size();
     }
     std::span<const zvdb::Tag> items(const zvdb::DbObject& object, App app) const {
         return has[app] ? object.tags().subspan(begin[app], end[app] - begin[app])
@@ -150,8 +153,9 @@ struct FirstTags {
     std::span<const zvdb::Tag> all;
     int value = -1, name = -1, layer = -1, point = -1;
 
-    FirstTags(std::span<const zvdb::Tag> tags, unsigned wanted) : all(tags) {
-        const std::size_t end = zvdb::TagList::xdataStart(all);
+    // `end`: where the extended data starts, or past it (the extended data holds codes of
+    // 1000 and above only).
+    FirstTags(std::span<const zvdb::Tag> tags, unsigned wanted, std::size_t end) : all(tags) {
         bool inGroup = false;
         unsigned found = 0;
         for (std::size_t i = 1; i < end; ++i) {
@@ -235,43 +239,49 @@ void byRankThenHandle(std::vector<T>& items, std::size_t pages, std::vector<T>& 
 struct ConnectionFinder::Scratch {
     std::vector<const Spot*> near;
     std::vector<std::uint32_t> seen;
-    std::vector<zvdb::Point3> vertices;
-    std::vector<Touch> touches;
+    std::vector<std::uint32_t> touches;
+    std::size_t wireStart = 0;  // the touches before it are another wire's
 };
 
 namespace {
 
-// The vertices of a polyline as Polyline::vertices gives them, into `out`: a lightweight
-// polyline's in one walk of its tags (its elevation, the first 38 outside application
+// The vertices of a polyline as Polyline::vertices gives them, appended to `out`, and its
+// layer as Entity::layer reads it: a lightweight polyline's in one walk of its tags up to
+// `end`, where its extended data starts (its elevation, the first 38 outside application
 // groups, is the z of all), without a vector made per polyline.
-void readVertices(const zvdb::Polyline& polyline, std::vector<zvdb::Point3>& out) {
-    out.clear();
+std::string_view appendVertices(const zvdb::Polyline& polyline, std::size_t end,
+                                std::vector<zvdb::Point3>& out) {
     if (!polyline.isLightweight()) {
-        out = polyline.vertices();
-        return;
+        const std::vector<zvdb::Point3> points = polyline.vertices();
+        out.insert(out.end(), points.begin(), points.end());
+        return polyline.layer();
     }
     const auto all = polyline.tags();
-    const std::size_t end = zvdb::TagList::xdataStart(all);
-    int elevation = -1;
+    const std::size_t first = out.size();
+    int elevation = -1, layer = -1;
     bool inGroup = false;
     for (std::size_t i = 1; i < end; ++i) {
         const zvdb::Tag& tag = all[i];
         if (tag.code == 10) {
             out.push_back({zvdb::TagValues::toReal(tag.value), 0.0, 0.0});
         } else if (tag.code == 20) {
-            if (!out.empty()) out.back().y = zvdb::TagValues::toReal(tag.value);
+            if (out.size() > first) out.back().y = zvdb::TagValues::toReal(tag.value);
         } else if (zvdb::TagList::opensGroup(tag)) {
             inGroup = true;
         } else if (zvdb::TagList::closesGroup(tag)) {
             inGroup = false;
         } else if (tag.code == 38 && !inGroup && elevation < 0) {
             elevation = static_cast<int>(i);
+        } else if (tag.code == 8 && !inGroup && layer < 0) {
+            layer = static_cast<int>(i);
         }
     }
-    if (elevation < 0) return;
-    const double z = zvdb::TagValues::toReal(all[static_cast<std::size_t>(elevation)].value);
-    for (zvdb::Point3& p : out)
-        p.z = z;
+    if (elevation >= 0) {
+        const double z = zvdb::TagValues::toReal(all[static_cast<std::size_t>(elevation)].value);
+        for (std::size_t k = first; k < out.size(); ++k)
+            out[k].z = z;
+    }
+    return layer < 0 ? std::string_view("0") : all[static_cast<std::size_t>(layer)].value;
 }
 
 }  // namespace
@@ -338,36 +348,54 @@ void ConnectionFinder::readModelSpace() {
     const auto entities = database_.modelSpace()->entities();
     symbols_.reserve(entities.size() / 2);
     spots_.reserve(entities.size());
+    // about one vertex an entity: the lines have two or three, and most entities are symbols
+    vertices_.reserve(entities.size());
     for (zvdb::Entity* entity : entities) {
         const Roles roles(*entity);
-        auto* reference = roles.has[Roles::Symbol] || roles.has[Roles::Equipment]
-                              ? dynamic_cast<zvdb::BlockReference*>(entity)
-                              : nullptr;
-        if (reference) {
-            indexSymbol(*reference, roles.begin[Roles::CutPoints],
+        // no kind of reference or polyline derives from their classes: the type tells them
+        const std::type_info& type = typeid(*entity);
+        if ((roles.has[Roles::Symbol] || roles.has[Roles::Equipment]) &&
+            type == typeid(zvdb::BlockReference)) {
+            indexSymbol(static_cast<const zvdb::BlockReference&>(*entity), roles.xdata,
+                        roles.begin[Roles::CutPoints],
                         roles.has[Roles::CutPoints] ? roles.end[Roles::CutPoints] : 0);
             continue;
         }
         if (!roles.has[Roles::Wire] && !roles.has[Roles::Cable] && !roles.has[Roles::Blind])
             continue;
-        auto* polyline = dynamic_cast<zvdb::Polyline*>(entity);
-        if (!polyline) continue;
-        Line line{polyline, polyline->handle(), 0, layerId(polyline->layer()), {}};
-        if (roles.has[Roles::Wire]) {
-            line.number = wireNumberOf(roles.items(*polyline, Roles::Wire));
-            wireLines_.push_back(line);
-            line.number = {};
-        }
-        if (roles.has[Roles::Cable]) leadLines_.push_back(line);
-        if (roles.has[Roles::Blind]) blindLines_.push_back(line);
+        if (type != typeid(zvdb::Polyline)) continue;
+        auto& polyline = static_cast<zvdb::Polyline&>(*entity);
+        addLine(polyline, roles.xdata, roles.has[Roles::Wire], roles.has[Roles::Cable],
+                roles.has[Roles::Blind], wireNumberOf(roles.items(polyline, Roles::Wire)));
     }
+}
+
+// A polyline of the roles given, with its vertices.
+void ConnectionFinder::addLine(zvdb::Polyline& polyline, std::size_t xdata, bool wire, bool lead,
+                               bool blind, std::string_view number) {
+    const auto firstVertex = static_cast<std::uint32_t>(vertices_.size());
+    const std::int32_t layer = layerId(appendVertices(polyline, xdata, vertices_));
+    const auto vertexCount = static_cast<std::uint32_t>(vertices_.size() - firstVertex);
+    Line line{&polyline, polyline.handle(), 0, layer, {}, firstVertex, vertexCount};
+    if (wire) {
+        line.number = number;
+        wireLines_.push_back(line);
+        line.number = {};
+    }
+    if (lead) leadLines_.push_back(line);
+    if (blind) blindLines_.push_back(line);
+}
+
+std::span<const zvdb::Point3> ConnectionFinder::verticesOf(const Line& line) const {
+    return {vertices_.data() + line.firstVertex, line.vertexCount};
 }
 
 // A project symbol gives its connection attributes' text positions, its insertion point and
 // its cut point; the two latter take the name of a connection attribute standing on them.
-void ConnectionFinder::indexSymbol(const zvdb::BlockReference& reference, std::size_t cutBegin,
-                                   std::size_t cutEnd) {
-    const FirstTags own(reference.tags(), FirstTags::Name | FirstTags::Layer | FirstTags::Point);
+void ConnectionFinder::indexSymbol(const zvdb::BlockReference& reference, std::size_t xdata,
+                                   std::size_t cutBegin, std::size_t cutEnd) {
+    const FirstTags own(reference.tags(), FirstTags::Name | FirstTags::Layer | FirstTags::Point,
+                        xdata);
     const std::int32_t layer = layerId(own.text(own.layer, "0"));
     const auto symbol = static_cast<std::uint32_t>(symbols_.size());
     symbols_.push_back({reference.handle(), own.text(own.name)});
@@ -375,8 +403,10 @@ void ConnectionFinder::indexSymbol(const zvdb::BlockReference& reference, std::s
     for (zvdb::Entity* sub : reference.subEntities()) {
         // no kind of attribute derives from Attribute: its type tells it at once
         if (sub->isErased() || typeid(*sub) != typeid(zvdb::Attribute)) continue;
-        const FirstTags attribute(sub->tags(),
-                                  FirstTags::Value | FirstTags::Name | FirstTags::Point);
+        // the extended data holds codes of 1000 and above only: the walk may run over it
+        const auto tags = sub->tags();
+        const FirstTags attribute(tags, FirstTags::Value | FirstTags::Name | FirstTags::Point,
+                                  tags.size());
         if (isConnectionTag(attribute.text(attribute.name)))
             addSpot(symbol, layer, attribute.position(), attribute.text(attribute.value));
     }
@@ -422,78 +452,68 @@ const ConnectionFinder::CellRun* ConnectionFinder::run(std::int32_t layer,
     }
 }
 
-// Spot i goes to where `order` puts it: spots_[i] becomes spots_[order[i].index], one cycle
-// of the permutation at a time (an index pointing at its own place is done).
-template <class Key>
-void ConnectionFinder::placeSpots(std::vector<Key>& order) {
-    for (std::uint32_t i = 0; i < order.size(); ++i) {
-        if (order[i].index == i) continue;
+// Spot i goes to where `from` takes it from: spots_[i] becomes spots_[from[i]], one cycle of
+// the permutation at a time (a place taking its own spot is done).
+void ConnectionFinder::placeSpots(std::vector<std::uint32_t>& from) {
+    for (std::uint32_t i = 0; i < from.size(); ++i) {
+        if (from[i] == i) continue;
         const Spot held = spots_[i];
         std::uint32_t at = i;
         for (;;) {
-            const std::uint32_t from = std::exchange(order[at].index, at);
-            if (from == i) {
+            const std::uint32_t next = std::exchange(from[at], at);
+            if (next == i) {
                 spots_[at] = held;
                 break;
             }
-            spots_[at] = spots_[from];
-            at = from;
+            spots_[at] = spots_[next];
+            at = next;
         }
     }
 }
 
-// The spots go to their layer's place in one counting pass, and each layer's are sorted by
-// cell (the order they came in kept within a cell): a vertex then finds its cells' spots in
-// a run each. The spots are moved in place, without a second array of them.
+// Each layer's table has room for twice its spots, more than its cells. The spots are counted
+// into the slots of their cells, each cell's run follows the one before in the slots' order,
+// and the spots go to their runs in the order they came: a vertex then finds its cells' spots
+// in a run each, without a sort. The spots are moved in place, without a second array of them.
 void ConnectionFinder::buildGrid() {
-    struct Key {
-        std::uint64_t cell;
-        std::uint32_t index;
-    };
-    std::vector<std::uint32_t> starts(layers_.size() + 1, 0);
+    std::vector<std::uint32_t> counts(layers_.size(), 0);
     for (const Spot& spot : spots_)
-        ++starts[static_cast<std::size_t>(spot.layer) + 1];
-    for (std::size_t layer = 1; layer < starts.size(); ++layer)
-        starts[layer] += starts[layer - 1];
-    std::vector<Key> keys(spots_.size());
-    {
-        std::vector<std::uint32_t> next(starts.begin(), starts.end() - 1);
-        for (std::uint32_t i = 0; i < spots_.size(); ++i)
-            keys[next[static_cast<std::size_t>(spots_[i].layer)]++] = {spots_[i].cell, i};
-    }
-    // the cells of each layer counted on the way
-    std::vector<std::uint32_t> cells(layers_.size(), 0);
-    for (std::size_t layer = 0; layer < cells.size(); ++layer) {
-        const auto first = keys.begin() + starts[layer], last = keys.begin() + starts[layer + 1];
-        std::sort(first, last, [](const Key& a, const Key& b) {
-            return a.cell != b.cell ? a.cell < b.cell : a.index < b.index;
-        });
-        for (auto key = first; key != last; ++key)
-            if (key == first || key->cell != (key - 1)->cell) ++cells[layer];
-    }
-    placeSpots(keys);
+        ++counts[static_cast<std::size_t>(spot.layer)];
     layerCells_.assign(layers_.size(), LayerCells{});
     std::size_t size = 0;
-    for (std::size_t layer = 0; layer < cells.size(); ++layer) {
-        if (cells[layer] == 0) continue;
-        const std::size_t own = std::bit_ceil(std::max<std::size_t>(4, cells[layer] * 2));
+    for (std::size_t layer = 0; layer < counts.size(); ++layer) {
+        if (counts[layer] == 0) continue;
+        const std::size_t own = std::bit_ceil(std::max<std::size_t>(4, counts[layer] * 2));
         layerCells_[layer] = {static_cast<std::uint32_t>(size),
                               static_cast<std::uint32_t>(own - 1)};
         size += own;
     }
+    // each spot's slot, its cell's count in `end` until the runs are laid out
     grid_.assign(size, CellRun{0, 0, 0});
-    for (std::uint32_t i = 0; i < spots_.size();) {
-        std::uint32_t end = i + 1;
-        while (end < spots_.size() && spots_[end].layer == spots_[i].layer &&
-               spots_[end].cell == spots_[i].cell)
-            ++end;
-        const LayerCells& table = layerCells_[static_cast<std::size_t>(spots_[i].layer)];
-        std::size_t slot = slotOf(spots_[i].cell) & table.mask;
-        while (grid_[table.first + slot].end != 0)
+    std::vector<std::uint32_t> slots(spots_.size());
+    for (std::size_t i = 0; i < spots_.size(); ++i) {
+        const Spot& spot = spots_[i];
+        const LayerCells& table = layerCells_[static_cast<std::size_t>(spot.layer)];
+        std::size_t slot = slotOf(spot.cell) & table.mask;
+        while (grid_[table.first + slot].end != 0 && grid_[table.first + slot].cell != spot.cell)
             slot = (slot + 1) & table.mask;
-        grid_[table.first + slot] = {spots_[i].cell, i, end};
-        i = end;
+        CellRun& run = grid_[table.first + slot];
+        run.cell = spot.cell;
+        ++run.end;
+        slots[i] = static_cast<std::uint32_t>(table.first + slot);
     }
+    std::uint32_t next = 0;
+    for (CellRun& run : grid_) {
+        if (run.end == 0) continue;
+        const std::uint32_t count = run.end;
+        run.begin = run.end = next;  // `end` is where its next spot goes, for now
+        next += count;
+    }
+    std::vector<std::uint32_t> from(spots_.size());
+    for (std::uint32_t i = 0; i < spots_.size(); ++i)
+        from[grid_[slots[i]].end++] = i;
+    slots = {};
+    placeSpots(from);
 }
 
 // Each role's polylines by registry page order, then by handle.
@@ -522,7 +542,7 @@ void ConnectionFinder::sortLines() {
 
 // One touch per symbol near the vertex, at the symbol's nearest point, nearest first.
 void ConnectionFinder::touchesAt(std::int32_t layer, const zvdb::Point3& p, double radius,
-                                 std::vector<Touch>& out, Scratch& scratch) const {
+                                 std::vector<std::uint32_t>& out, Scratch& scratch) const {
     auto& near = scratch.near;
     near.clear();
     // nothing is within a distance of a point that is not finite
@@ -566,14 +586,21 @@ void ConnectionFinder::touchesAt(std::int32_t layer, const zvdb::Point3& p, doub
     for (const Spot* spot : near) {
         if (std::find(seen.begin(), seen.end(), spot->symbol) != seen.end()) continue;
         seen.push_back(spot->symbol);
-        const Symbol& symbol = symbols_[spot->symbol];
-        const Touch touch{symbol.handle, spot->connection, symbol.block, spot->point};
         // two vertices on one point of a symbol are one touch
-        if (!out.empty() && out.back().symbol == touch.symbol &&
-            out.back().connection == touch.connection && out.back().point == touch.point)
-            continue;
-        out.push_back(touch);
+        if (out.size() > scratch.wireStart) {
+            const Spot& last = spots_[out.back()];
+            if (symbols_[last.symbol].handle == symbols_[spot->symbol].handle &&
+                last.connection == spot->connection && last.point == spot->point)
+                continue;
+        }
+        out.push_back(static_cast<std::uint32_t>(spot - spots_.data()));
     }
+}
+
+Touch ConnectionFinder::touchAt(std::uint32_t place) const {
+    const Spot& spot = spots_[place];
+    const Symbol& symbol = symbols_[spot.symbol];
+    return {symbol.handle, spot.connection, symbol.block, spot.point};
 }
 
 std::vector<zvdb::Polyline*> ConnectionFinder::polylinesInPageOrder(zvdb::Database& database,
@@ -669,10 +696,11 @@ void eachGroup(const WireGroups& groups, const std::vector<Line>& lines, AddTouc
 // Group by group, its polylines in their order and its touches: each group's vectors are
 // made to size once.
 struct MakeConnections {
+    const ConnectionFinder& finder;
     template <class Line, class AddTouches>
     std::vector<WireConnections> operator()(const WireGroups& groups,
                                             const std::vector<Line>& lines,
-                                            std::vector<Touch>& touches,
+                                            std::vector<std::uint32_t>& touches, std::size_t&,
                                             AddTouches&& addTouches) const {
         std::vector<WireConnections> result(groups.numbers.size());
         touches.clear();
@@ -682,7 +710,9 @@ struct MakeConnections {
             group.polylines.reserve(groups.first[g + 1] - groups.first[g]);
             for (std::uint32_t k = groups.first[g]; k < groups.first[g + 1]; ++k)
                 group.polylines.push_back(lines[groups.lines[k]].handle);
-            group.touches.assign(touches.begin(), touches.end());
+            group.touches.reserve(touches.size());
+            for (const std::uint32_t place : touches)
+                group.touches.push_back(finder.touchAt(place));
             touches.clear();
         });
         return result;
@@ -693,15 +723,17 @@ struct MakeConnections {
 struct MakeTable {
     template <class Line, class AddTouches>
     ConnectionTable operator()(const WireGroups& groups, const std::vector<Line>& lines,
-                               std::vector<Touch>& touches, AddTouches&& addTouches) const {
+                               std::vector<std::uint32_t>& touches, std::size_t& wireStart,
+                               AddTouches&& addTouches) const {
         ConnectionTable table;
         table.numbers = groups.numbers;
         table.ends.reserve(groups.numbers.size());
         touches.clear();
         eachGroup(groups, lines, addTouches, [&](std::size_t) {
             table.ends.push_back(static_cast<std::uint32_t>(touches.size()));
+            wireStart = touches.size();
         });
-        table.touches = std::move(touches);
+        table.entries = std::move(touches);
         return table;
     }
 };
@@ -716,9 +748,8 @@ auto ConnectionFinder::wiresWith(Make&& make) const {
     const WireGroups groups(lineNumbers);
     lineNumbers = {};
     Scratch scratch;
-    return make(groups, wireLines_, scratch.touches, [&](const Line& line) {
-        readVertices(*line.polyline, scratch.vertices);
-        for (const zvdb::Point3& vertex : scratch.vertices)
+    return make(groups, wireLines_, scratch.touches, scratch.wireStart, [&](const Line& line) {
+        for (const zvdb::Point3& vertex : verticesOf(line))
             touchesAt(line.layer, vertex, tolerance_, scratch.touches, scratch);
     });
 }
@@ -737,8 +768,7 @@ auto ConnectionFinder::cablesWith(Make&& make) const {
     std::sort(blinds.begin(), blinds.end());
     Scratch scratch;
     auto ends = [&](const Line& line, bool firstToo) {
-        readVertices(*line.polyline, scratch.vertices);
-        const auto& vertices = scratch.vertices;
+        const auto vertices = verticesOf(line);
         if (vertices.empty()) return;
         if (firstToo)
             touchesAt(line.layer, vertices.front(), kLeadTolerance, scratch.touches, scratch);
@@ -746,17 +776,19 @@ auto ConnectionFinder::cablesWith(Make&& make) const {
             touchesAt(line.layer, vertices.back(), kLeadTolerance, scratch.touches, scratch);
     };
     std::vector<std::string> leadNumbers(leadLines_.size());
+    CableRecord last;
     for (std::size_t i = 0; i < leadLines_.size(); ++i)
-        leadNumbers[i] = cableNumber(*leadLines_[i].polyline);
+        leadNumbers[i] = cableNumber(*leadLines_[i].polyline, last);
     const std::vector<std::string_view> views(leadNumbers.begin(), leadNumbers.end());
     const WireGroups groups(views);
-    auto answer = make(groups, leadLines_, scratch.touches, [&](const Line& lead) {
-        ends(lead, true);
-        auto own = std::lower_bound(blinds.begin(), blinds.end(),
-                                    std::pair<std::uint64_t, std::uint32_t>{lead.handle, 0});
-        for (; own != blinds.end() && own->first == lead.handle; ++own)
-            ends(blindLines_[own->second], false);
-    });
+    auto answer =
+        make(groups, leadLines_, scratch.touches, scratch.wireStart, [&](const Line& lead) {
+            ends(lead, true);
+            auto own = std::lower_bound(blinds.begin(), blinds.end(),
+                                        std::pair<std::uint64_t, std::uint32_t>{lead.handle, 0});
+            for (; own != blinds.end() && own->first == lead.handle; ++own)
+                ends(blindLines_[own->second], false);
+        });
     if constexpr (std::is_same_v<decltype(answer), ConnectionTable>) {
         // the numbers' texts go with the table, where its views point
         answer.owned = std::move(leadNumbers);
@@ -767,33 +799,52 @@ auto ConnectionFinder::cablesWith(Make&& make) const {
 }
 
 std::vector<WireConnections> ConnectionFinder::wires() const {
-    return wiresWith(MakeConnections{});
+    return wiresWith(MakeConnections{*this});
 }
 
 std::vector<WireConnections> ConnectionFinder::cables() const {
-    return cablesWith(MakeConnections{});
+    return cablesWith(MakeConnections{*this});
 }
 
 ConnectionTable ConnectionFinder::wireTable() const {
-    return wiresWith(MakeTable{});
+    ConnectionTable table = wiresWith(MakeTable{});
+    table.finder = this;
+    return table;
 }
 
 ConnectionTable ConnectionFinder::cableTable() const {
-    return cablesWith(MakeTable{});
+    ConnectionTable table = cablesWith(MakeTable{});
+    table.finder = this;
+    return table;
 }
 
 std::string ConnectionFinder::cableNumber(const zvdb::Polyline& lead) const {
+    CableRecord last;
+    return cableNumber(lead, last);
+}
+
+// The leads of a cable name one record of it first: the name read from the last record
+// serves the next lead that names the same.
+std::string ConnectionFinder::cableNumber(const zvdb::Polyline& lead, CableRecord& last) const {
     const auto items = Roles(lead).items(lead, Roles::Cable);
     if (items.size() < 2) return {};
     const std::string_view keyText = items[0].value;
     const std::string_view key = keyText.substr(0, keyText.find('\f'));
+    auto number = [key](std::string_view name) {
+        std::string text;
+        text.reserve(name.size() + 1 + key.size());
+        return text.append(name).append(1, '\f').append(key);
+    };
     for (std::size_t i = 1; i < items.size(); ++i) {
-        zvdb::DbObject* record =
-            database_.objectByHandle(zvdb::TagValues::toHandle(items[i].value));
+        const std::uint64_t handle = zvdb::TagValues::toHandle(items[i].value);
+        if (i == 1 && handle == last.handle && !last.name.empty()) return number(last.name);
+        zvdb::DbObject* record = database_.objectByHandle(handle);
         if (!record) continue;
         for (const zvdb::Tag& field : appItems(*record, "KVR_ZV_ATT_VIRTUAL")) {
             const std::string_view name = fieldValue(field.value, {"CABO", "CABLE"});
-            if (!name.empty()) return std::string(name) + '\f' + std::string(key);
+            if (name.empty()) continue;
+            last = {handle, name};
+            return number(name);
         }
     }
     return {};

@@ -10,6 +10,7 @@
 #include "drawing/Geometry.h"
 
 #include <cstdint>
+#include <span>
 #include <string>
 #include <string_view>
 #include <unordered_map>
@@ -36,9 +37,6 @@ struct WireConnections {
     std::vector<std::uint64_t> polylines;  // page order, then handle order
 };
 
-// The same answer in a few arrays: wire w's touches are touches[ends[w - 1]] (0 for the
-// first wire) to touches[ends[w]]. The numbers are views into the drawing's storage, or
-// into `owned` (a cable's number is made of two texts): a table is moved, not copied.
 // A wire polyline with its number (empty when it has none) and its layer: views into the
 // drawing's storage.
 struct WireLine {
@@ -47,11 +45,21 @@ struct WireLine {
     bool operator==(const WireLine&) const = default;
 };
 
+class ConnectionFinder;
+
+// The same answer in a few arrays: wire w's touches are entries[ends[w - 1]] (0 for the
+// first wire) to entries[ends[w]], each a place in the finder that made the table, which
+// touch(k) turns into the k-th Touch: four bytes an entry, and the table serves while its
+// finder lives. The numbers are views into the drawing's storage, or into `owned` (a
+// cable's number is made of two texts): a table is moved, not copied.
 struct ConnectionTable {
     std::vector<std::string_view> numbers;
     std::vector<std::uint32_t> ends;
-    std::vector<Touch> touches;
+    std::vector<std::uint32_t> entries;
     std::vector<std::string> owned;
+    const ConnectionFinder* finder = nullptr;
+
+    Touch touch(std::size_t k) const;
 };
 
 class ConnectionFinder {
@@ -66,6 +74,8 @@ public:
     // The same as tables, without the polylines: no arrays per wire.
     ConnectionTable wireTable() const;
     ConnectionTable cableTable() const;
+    // The touch at a place of a table's entries.
+    Touch touchAt(std::uint32_t place) const;
     double tolerance() const { return tolerance_; }
     // The wire and lead polylines (KVR_ZV_WIRE or KVR_ZV_CABO) of each layer, each once, in
     // handle order: what the walk above saw, for those who ask by layer.
@@ -103,8 +113,9 @@ private:
         std::int32_t rank;  // registry page order; off the pages last
         std::int32_t layer;
         std::string_view number;  // a wire's number, read with its roles; empty otherwise
+        std::uint32_t firstVertex, vertexCount;  // its vertices in vertices_
     };
-    // The run of the spots of one layer's cell in spots_ (sorted by layer and cell), in an
+    // The run of the spots of one layer's cell in spots_ (in the order they came), in an
     // open-addressed table: a vertex asks nine cells, most of them empty.
     struct CellRun {
         std::uint64_t cell;
@@ -117,24 +128,33 @@ private:
         std::uint32_t mask = 0;  // its size - 1; 0: no spot on the layer, no table
     };
     struct Scratch;
+    // A record of a cable with the name it gives, or none.
+    struct CableRecord {
+        std::uint64_t handle = 0;
+        std::string_view name;
+    };
+    std::string cableNumber(const zvdb::Polyline& lead, CableRecord& last) const;
 
     void readModelSpace();
-    void indexSymbol(const zvdb::BlockReference& reference, std::size_t cutBegin,
+    void indexSymbol(const zvdb::BlockReference& reference, std::size_t xdata, std::size_t cutBegin,
                      std::size_t cutEnd);
+    void addLine(zvdb::Polyline& polyline, std::size_t xdata, bool wire, bool lead, bool blind,
+                 std::string_view number);
+    std::span<const zvdb::Point3> verticesOf(const Line& line) const;
     void addSpot(std::uint32_t symbol, std::int32_t layer, const zvdb::Point3& p,
                  std::string_view connection);
     std::uint64_t cellKey(long long x, long long y) const;
     static std::size_t slotOf(std::uint64_t cell);
     const CellRun* run(std::int32_t layer, std::uint64_t cell) const;
     void buildGrid();
-    template <class Key>
-    void placeSpots(std::vector<Key>& order);
+    void placeSpots(std::vector<std::uint32_t>& from);
     void sortLines();
+    // The places in spots_ of the touches, appended to `out`.
     void touchesAt(std::int32_t layer, const zvdb::Point3& p, double radius,
-                   std::vector<Touch>& out, Scratch& scratch) const;
+                   std::vector<std::uint32_t>& out, Scratch& scratch) const;
     std::int32_t layerId(std::string_view layer);
-    // `make(groups, lines, touches, addTouches)` given what the wires' (the cables') answer
-    // is made of.
+    // `make(groups, lines, touches, wireStart, addTouches)` given what the wires' (the
+    // cables') answer is made of; wireStart: where the wire being read starts in touches.
     template <class Make>
     auto wiresWith(Make&& make) const;
     template <class Make>
@@ -151,6 +171,12 @@ private:
     std::vector<CellRun> grid_;
     std::vector<LayerCells> layerCells_;  // by layer id
     std::vector<Line> wireLines_, leadLines_, blindLines_;
+    // The lines' vertices, read on the walk while their tags are at hand.
+    std::vector<zvdb::Point3> vertices_;
 };
+
+inline Touch ConnectionTable::touch(std::size_t k) const {
+    return finder->touchAt(entries[k]);
+}
 
 }  // namespace zvproduct

@@ -2,7 +2,15 @@
 // The document's LISP interface, as a module sees it.
 #include "ResultBuffer.h"
 
+#include <cstdint>
+#include <string_view>
+
 namespace zvsdk {
+
+// The text of an entry of a symbol: its handle in upper-case hexadecimal, then
+// "#CONNECTION#BLOCK" when `details` (the names in UTF-8).
+QString symbolEntryText(std::uint64_t handle, bool details, std::string_view connection,
+                        std::string_view block);
 
 // Takes an answer of wires and their entries, ((NUMBER (TEXT x y z) ...) ...), as a host
 // hands it over without its chain (see LispInterface::lispInvokeConnections).
@@ -14,6 +22,10 @@ public:
     // A wire, its entries after it.
     virtual void wire(QString number) = 0;
     virtual void entry(QString text, double x, double y, double z) = 0;
+    // An entry whose text is symbolEntryText's, in its parts: a receiver that keeps less than
+    // the whole text makes only what it keeps. The default makes the text for entry().
+    virtual void symbolEntry(std::uint64_t handle, bool details, std::string_view connection,
+                             std::string_view block, double x, double y, double z);
 };
 
 class LispInterface {

@@ -387,7 +387,8 @@ TEST_F(ConnectionsTest, TheWireListThatAnIndexHandsOverIsThatOfAWalkOfItsOwn) {
         {}, {"ESQ$0001$A"}, {"ESQ$0002$A"}, {"OFF", "ESQ$0002$A"}, {"NONE"}, {"esq$0001$a"}};
     const auto compare = [&] {
         ConnectionAnswers answers;
-        answers.table(*database, 0.1, ConnectionAnswers::Kind::Wires);
+        answers.table(*database, 0.1, ConnectionAnswers::Kind::Wires, true,
+                      [](const ConnectionTable&) {});
         // Handed over by the index, not walked again.
         ASSERT_TRUE(answers.wireList().current(*database));
         for (const auto& layers : asked) {
@@ -528,6 +529,82 @@ TEST_F(ConnectionsTest, AWiresElevationIsTheZOfItsVertices) {
     line->setReal(38, 0.0, "AcDbPolyline");
     EXPECT_EQ(show("(length (cdr (car (getConexoesTodosFios))))"), "1");
     EXPECT_EQ(show("(cadr (car (cdr (car (getConexoesTodosFios)))))"), "200.0");
+}
+
+// A wire's layer, vertices, elevation and number come from its own tags, whatever the lines
+// read before it hold.
+TEST_F(ConnectionsTest, EachWireIsReadFromItsOwnTags) {
+    auto* first = terminal("ESQ$0001$A", {100, 200, 0}, "X1", "1");
+    auto* high = terminal("ESQ$0001$A", {300, 200, 5}, "X1", "2");
+    auto* other = terminal("ESQ$0001$A", {500, 200, 0}, "X1", "3");
+    wire("ESQ$0001$A", {{50, 200, 0}, {100, 200, 0}}, "901");
+    auto* raised = wire("ESQ$0001$A", {{300, 200, 0}, {350, 200, 0}}, "902");
+    raised->setReal(38, 5.0, "AcDbPolyline");
+    {
+        // a group of another application with a layer of its own before the polyline's, and
+        // a stray y before its first vertex
+        auto& tags = raised->editTags();
+        const std::vector<zvdb::Tag> group = {{102, database->store("{ACAD_REACTORS")},
+                                              {8, database->store("ESQ$0002$A")},
+                                              {102, database->store("}")}};
+        tags.insert(tags.begin() + 2, group.begin(), group.end());
+        const auto vertex = std::find_if(tags.begin(), tags.end(),
+                                         [](const zvdb::Tag& tag) { return tag.code == 10; });
+        tags.insert(vertex, {20, database->store("999.0")});
+    }
+    ASSERT_EQ(raised->layer(), "ESQ$0001$A");
+    // a second group of the wires' application after another one: the first tells the number
+    auto* twice = wire("ESQ$0001$A", {{500, 200, 0}, {550, 200, 0}}, "903");
+    twice->addXData("KVR_ZV_ATT_VIRTUAL", zvsample::XDataItems().text("CABO\fW9\fN").tags());
+    twice->addXData("KVR_ZV_WIRE",
+                    zvsample::XDataItems().text("10006\f1").text("1").text("FIO\f904").tags());
+    EXPECT_EQ(show("(getConexoesTodosFios)"),
+              "((\"901\" (\"" + hex(first) + "##BORNE_1\" 100.0 200.0 0.0)) (\"902\" (\"" +
+                  hex(high) + "##BORNE_1\" 300.0 200.0 5.0)) (\"903\" (\"" + hex(other) +
+                  "##BORNE_1\" 500.0 200.0 0.0)))");
+    // the table the module reads holds the same touches
+    const ConnectionFinder finder(*database, 0.1);
+    const ConnectionTable table = finder.wireTable();
+    EXPECT_EQ(table.numbers, (std::vector<std::string_view>{"901", "902", "903"}));
+    EXPECT_EQ(table.ends, (std::vector<std::uint32_t>{1, 2, 3}));
+    ASSERT_EQ(table.entries.size(), 3u);
+    const zvdb::DbObject* expected[] = {first, high, other};
+    for (std::size_t k = 0; k < 3; ++k) {
+        EXPECT_EQ(table.touch(k).symbol, expected[k]->handle()) << k;
+        EXPECT_EQ(table.touch(k).block, "BORNE_1") << k;
+    }
+    EXPECT_EQ(table.touch(1).point, (zvdb::Point3{300, 200, 5}));
+}
+
+// Two connections of a symbol in one cell of the index, as near to a vertex as each other:
+// the touch is at the one whose attribute comes first.
+TEST_F(ConnectionsTest, EquallyNearConnectionsOfASymbolTouchByTheOrderOfItsAttributes) {
+    auto* ab = twoPoint("NA-1", "ESQ$0001$A", {100, 200, 0});
+    ab->addAttribute("LIGACAO1", "13", {100, 200, 0}, 2.5);
+    ab->addAttribute("LIGACAO2", "14", {100.125, 200, 0}, 2.5);
+    auto* ba = twoPoint("NA-1", "ESQ$0001$A", {100, 300, 0});
+    ba->addAttribute("LIGACAO2", "14", {100.125, 300, 0}, 2.5);
+    ba->addAttribute("LIGACAO1", "13", {100, 300, 0}, 2.5);
+    wire("ESQ$0001$A", {{100.0625, 200, 0}, {50, 200, 0}}, "501");
+    wire("ESQ$0001$A", {{100.0625, 300, 0}, {50, 300, 0}}, "502");
+    EXPECT_EQ(show("(mapcar 'cadr (getConexoesTodosFios))"),
+              "((\"" + hex(ab) + "#13#NA-1\" 100.0 200.0 0.0) (\"" + hex(ba) +
+                  "#14#NA-1\" 100.125 300.0 0.0))");
+}
+
+// One wire ends where the next one starts, on a terminal: each touches it, in the answer
+// as much as in the table the module reads.
+TEST_F(ConnectionsTest, TwoWiresOnOnePointOfASymbolEachTouchIt) {
+    auto* shared = terminal("ESQ$0001$A", {100, 200, 0}, "X1", "1");
+    wire("ESQ$0001$A", {{0, 200, 0}, {100, 200, 0}}, "601");
+    wire("ESQ$0001$A", {{100, 200, 0}, {200, 200, 0}}, "602");
+    const std::string entry = "(\"" + hex(shared) + "##BORNE_1\" 100.0 200.0 0.0)";
+    EXPECT_EQ(show("(getConexoesTodosFios)"), "((\"601\" " + entry + ") (\"602\" " + entry + "))");
+    const ConnectionFinder finder(*database, 0.1);
+    const ConnectionTable table = finder.wireTable();
+    EXPECT_EQ(table.ends, (std::vector<std::uint32_t>{1, 2}));
+    ASSERT_EQ(table.entries.size(), 2u);
+    EXPECT_EQ(table.touch(1).symbol, shared->handle());
 }
 
 TEST_F(ConnectionsTest, TouchesAcrossTheIndexsCellsAndAtTheToleranceItself) {

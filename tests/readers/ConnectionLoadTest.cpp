@@ -231,15 +231,18 @@ protected:
     }
 };
 
-// The wires then the cables, as a reader loads them, with and without the whole texts: the
-// same table from the chains as from the answers without them.
+// The wires then the cables, as a reader loads them, with and without the whole texts, and
+// each read with and without the details: the same table from the chains as from the answers
+// without them.
 TEST_F(ProductConnectionLoadTest, TheAnswersWithoutTheirChainsMakeTheSameTable) {
-    for (const bool completas : {true, false}) {
-        SCOPED_TRACE(completas);
+    for (const auto& [completas, detalhesFios] :
+         {std::pair{true, true}, std::pair{false, true}, std::pair{true, false},
+          std::pair{false, false}}) {
+        SCOPED_TRACE(std::to_string(completas) + " " + std::to_string(detalhesFios));
         TabelaConexoes semCadeia, pelaCadeia;
         QStringList numeros;
-        for (const auto& [funcao, detalhes] :
-             {std::pair{"getConexoesTodosFios", true}, std::pair{"getConexoesTodosCabos", false}}) {
+        for (const auto& [funcao, detalhes] : {std::pair{"getConexoesTodosFios", detalhesFios},
+                                               std::pair{"getConexoesTodosCabos", !detalhesFios}}) {
             ASSERT_TRUE(semCadeia.CarregaSemCadeia(funcao, detalhes, completas)) << funcao;
             zvsdk::ResultBuffer* cadeia = CICad::zvInvokeLista(funcao);
             ASSERT_NE(cadeia, nullptr);
