@@ -840,7 +840,11 @@ CCDataReader::EntidadeLida CCDataReader::LeEntidadeGuardada(const OdDbObjectId& 
     if (CICad::EhReferencia(id)) {
         // The symbol's fields go from the batch into the kept form, with no item between.
         lido.definirCampo(qtd, kMarca);
-        CICad::LeituraSimbolo(id, simbolo_);
+        if (chaveLidaDe_ == id)
+            CICad::CompletaLeituraSimbolo(id, simbolo_);
+        else
+            CICad::LeituraSimbolo(id, simbolo_);
+        chaveLidaDe_ = OdDbObjectId();
         FazLote(QString(), lido.campos, id);
         lida.borne = EhBlocoDeBorne(simbolo_.bloco);
         OrdemLote& ordem = OrdenaLote();
@@ -971,15 +975,18 @@ void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const
 }
 
 CEItemLista* CCDataReader::CriaItemBloco(const OdDbObjectId& referencia, CETemplate& modelo) {
-    // A symbol read here is read once: its key is told by the first part of the reading.
+    // A symbol read here is read once: its key is told by the first part of the reading,
+    // which a kept reading made for the copy completes.
     const bool copia = GuardaSimbolos && CICad::EhReferencia(referencia);
-    if (copia ? ChaveDaEntidade(referencia).isEmpty() : !LeChaveDoSimbolo(referencia))
-        return nullptr;
+    if (!LeChaveDoSimbolo(referencia)) return nullptr;
     auto* item = new CEItemLista;
     item->ids.push_back(referencia);
     if (CamposPrevistos) item->campos.reservar(CamposPrevistos);
     if (copia) {
+        chaveLidaDe_ = referencia;
         CopiaEntidade(QString(), *item, referencia, &modelo);
+        // Found kept, the reading was not made: the part read serves nothing else.
+        chaveLidaDe_ = OdDbObjectId();
     } else {
         CICad::CompletaLeituraSimbolo(referencia, simbolo_);
         LeSimboloLido(QString(), *item, referencia);

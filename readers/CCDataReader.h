@@ -432,6 +432,9 @@ private:
     // The last symbol read, and the fields of one reading before they join the item (in
     // order of writing: a later one of the same name wins).
     CESimboloLido simbolo_;
+    // The reference whose key part `simbolo_` holds, read by CriaItemBloco to tell whether
+    // it makes an item: the kept reading made for its copy completes that part.
+    OdDbObjectId chaveLidaDe_;
     std::vector<CamposItem::Campo> lote_;
     std::vector<std::uint64_t> ordemLote_;
     // OrdenaLote's answer by the batch's names in order of writing: the symbols of a kind
