@@ -840,11 +840,12 @@ CCDataReader::EntidadeLida CCDataReader::LeEntidadeGuardada(const OdDbObjectId& 
     if (CICad::EhReferencia(id)) {
         // The symbol's fields go from the batch into the kept form, with no item between.
         lido.definirCampo(qtd, kMarca);
-        if (chaveLidaDe_ == id)
+        if (chaveLidaDe_ == id) {
             CICad::CompletaLeituraSimbolo(id, simbolo_);
-        else
+            chaveLidaDe_ = OdDbObjectId();
+        } else {
             CICad::LeituraSimbolo(id, simbolo_);
-        chaveLidaDe_ = OdDbObjectId();
+        }
         FazLote(QString(), lido.campos, id);
         lida.borne = EhBlocoDeBorne(simbolo_.bloco);
         OrdemLote& ordem = OrdenaLote();
@@ -982,16 +983,20 @@ CEItemLista* CCDataReader::CriaItemBloco(const OdDbObjectId& referencia, CETempl
     auto* item = new CEItemLista;
     item->ids.push_back(referencia);
     if (CamposPrevistos) item->campos.reservar(CamposPrevistos);
+    bool lida = true;
     if (copia) {
         chaveLidaDe_ = referencia;
         CopiaEntidade(QString(), *item, referencia, &modelo);
         // Found kept, the reading was not made: the part read serves nothing else.
+        lida = chaveLidaDe_.isNull();
         chaveLidaDe_ = OdDbObjectId();
     } else {
         CICad::CompletaLeituraSimbolo(referencia, simbolo_);
         LeSimboloLido(QString(), *item, referencia);
     }
+    if (lida) lidaAgora_ = referencia;
     LerLadoIni(*item, referencia, modelo);
+    lidaAgora_ = OdDbObjectId();
     LerLadoFim(*item, referencia, modelo);
     return item;
 }

@@ -188,6 +188,11 @@ protected:
     // An item kept for the list shares its field names with the items kept before it.
     void PartilhaNomes(CEItemLista& item) { item.partilharNomes(); }
     double Tolerancia() const { return tolerancia_; }
+    // For the start side of the item CriaItemBloco makes: the reference's block name,
+    // insertion point and layer from the reading it has just made of it; false when the
+    // reading was found kept (or the item is of another entity).
+    bool LidaAgora(const OdDbObjectId& referencia, std::string_view& bloco, CEPonto& posicao,
+                   const QString*& layer) const;
 
 private:
     void CarregaConexoes(const QString& funcao, bool detalhes);
@@ -435,6 +440,8 @@ private:
     // The reference whose key part `simbolo_` holds, read by CriaItemBloco to tell whether
     // it makes an item: the kept reading made for its copy completes that part.
     OdDbObjectId chaveLidaDe_;
+    // The reference whose whole reading `simbolo_` holds while its start side is read.
+    OdDbObjectId lidaAgora_;
     std::vector<CamposItem::Campo> lote_;
     std::vector<std::uint64_t> ordemLote_;
     // OrdenaLote's answer by the batch's names in order of writing: the symbols of a kind

@@ -228,6 +228,15 @@ void CCDataReader::JuntaLote(CEItemLista& item) {
     lote_.clear();
 }
 
+bool CCDataReader::LidaAgora(const OdDbObjectId& referencia, std::string_view& bloco,
+                             CEPonto& posicao, const QString*& layer) const {
+    if (lidaAgora_.isNull() || referencia != lidaAgora_ || !simbolo_.referencia) return false;
+    bloco = simbolo_.bloco;
+    posicao = simbolo_.posicao;
+    layer = &LayerDoNome(simbolo_.layer).nome;
+    return true;
+}
+
 bool CCDataReader::LeChaveDoSimbolo(const OdDbObjectId& referencia) {
     // As ChaveDaEntidade tells it, from the walk of the extended data the reading makes.
     return CICad::LeituraChaveSimbolo(referencia, simbolo_) && simbolo_.temTextoChave &&
