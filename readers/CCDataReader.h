@@ -14,6 +14,7 @@
 #include <QStringList>
 
 #include <algorithm>
+#include <array>
 #include <memory>
 #include <optional>
 #include <span>
@@ -465,6 +466,18 @@ private:
     // The fields of the symbol read into `simbolo_` under the suffix, into `lote_`; `campos`:
     // the item's so far, for its QTD.
     void FazLote(const QString& s, const CamposItem& campos, const OdDbObjectId& referencia);
+    // The numbers of the fields every batch writes after the symbol's own, under the last
+    // few suffixes: the callers pass the same few in turn.
+    struct NomesDoLote {
+        QString sufixo;
+        bool feitos = false;
+        std::uint32_t handle = 0, painel = 0, local = 0, circuito = 0, lista = 0, chave = 0,
+                      descricao = 0, tpDescri = 0, posicao = 0, layer = 0, grupo = 0, pagina = 0,
+                      tipo = 0, qtd = 0, material = 0;
+    };
+    std::array<NomesDoLote, 4> nomesDoLote_;
+    std::size_t proximoNomesDoLote_ = 0;
+    const NomesDoLote& NomesDoLoteCom(const QString& s);
 
     // Per symbol read while GuardaAcessorios is set, what ChaveENorma gives of it (`temChave`:
     // what it answers) and the texts of its ZV_VINC_ADITIVO; kept while the drawing is the

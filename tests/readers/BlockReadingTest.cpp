@@ -204,6 +204,27 @@ TEST_F(BlockReadingTest, NewFieldNamesAreNumberedInTheOrderOfWriting) {
     leitor.LeBloco("_FIM", lado, q, nullptr);
     EXPECT_EQ(lado.valorCampo(c + "_FIM"), "3");
     EXPECT_EQ(CamposItem::numeroSeHouver(c), CamposItem::kSemNome);
+    // Under a suffix new to the run, the fields every symbol has are numbered as written,
+    // after the symbol's own attributes; a second symbol under other suffixes, then this
+    // one again, gives each its own names.
+    const QString novo = "_" + marca;
+    CEItemLista comNovo;
+    leitor.LeBloco(novo, comNovo, q, nullptr);
+    const QStringList escritos = {
+        c,        "HANDLE",        "PAINEL",    "LOCAL",        "CIRCUITO",  "ZV_LISTA",
+        "ZV_KEY", "DESCRICAO",     "TP_DESCRI", "POSICAO",      "LAYER",     "GRUPO",
+        "PAGINA", "COMPONENTTYPE", "QTD",       "SAP_MATERIAL", "ORIENTACAO"};
+    for (qsizetype i = 0; i + 1 < escritos.size(); ++i)
+        EXPECT_LT(CamposItem::numeroSeHouver(escritos[i] + novo),
+                  CamposItem::numeroSeHouver(escritos[i + 1] + novo))
+            << escritos[i].toStdString();
+    for (const QString& sufixo : {QStringLiteral("_INI"), QStringLiteral("_FIM"), novo}) {
+        CEItemLista outro;
+        leitor.LeBloco(sufixo, outro, k, nullptr);
+        EXPECT_EQ(outro.valorCampo("HANDLE" + sufixo), handle(k));
+        EXPECT_EQ(outro.valorCampo("ZV_KEY" + sufixo), "A1");
+        EXPECT_FALSE(outro.temCampo("HANDLE"));
+    }
 }
 
 // Of a name written twice the later value counts, whatever the order of the other names; the
