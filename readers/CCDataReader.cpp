@@ -87,6 +87,7 @@ void CCDataReader::LiberaLeituras() {
     versaoIndices_ = 0;
     indiceAtual_ = nullptr;
     layerDoUltimo_ = nullptr;
+    ultimaOrdem_ = nullptr;
     rotasLidas_ = false;
     corteDe_ = OdDbObjectId();
     versaoLidas_ = 0;

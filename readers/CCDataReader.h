@@ -455,6 +455,9 @@ private:
     };
     std::vector<std::uint32_t> nomesLote_;
     std::unordered_map<std::vector<std::uint32_t>, OrdemLote, HashNomes> ordensLote_;
+    // The entry of the last batch, whose names `nomesLote_` still holds: a block's symbols
+    // come in a row and write the same names.
+    OrdemLote* ultimaOrdem_ = nullptr;
     void JuntaLote(CEItemLista& item);
     // The places in `lote_` of the fields JuntaLote joins, sorted by name (the name in the
     // high half): the entry of the batch's names, valid until the next call.

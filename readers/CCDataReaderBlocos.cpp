@@ -197,10 +197,18 @@ const CCDataReader::ConstantesBloco& CCDataReader::ConstantesDoBloco(const OdDbO
 }
 
 CCDataReader::OrdemLote& CCDataReader::OrdenaLote() {
+    if (ultimaOrdem_ && std::equal(lote_.begin(), lote_.end(), nomesLote_.begin(), nomesLote_.end(),
+                                   [](const CamposItem::Campo& campo, std::uint32_t nome) {
+                                       return campo.nome == nome;
+                                   }))
+        return *ultimaOrdem_;
     nomesLote_.clear();
     for (const CamposItem::Campo& campo : lote_)
         nomesLote_.push_back(campo.nome);
-    if (auto it = ordensLote_.find(nomesLote_); it != ordensLote_.end()) return it->second;
+    if (auto it = ordensLote_.find(nomesLote_); it != ordensLote_.end()) {
+        ultimaOrdem_ = &it->second;
+        return it->second;
+    }
     // By name, and of one name the last written: sorted by name and place, the last of each
     // run of a name is kept.
     ordemLote_.clear();
@@ -215,7 +223,8 @@ CCDataReader::OrdemLote& CCDataReader::OrdenaLote() {
     if (ordensLote_.size() >= kMaxOrdens) ordensLote_.clear();
     OrdemLote nova;
     nova.ordem.assign(ordemLote_.begin(), ordemLote_.begin() + std::ptrdiff_t(n));
-    return ordensLote_.emplace(nomesLote_, std::move(nova)).first->second;
+    ultimaOrdem_ = &ordensLote_.emplace(nomesLote_, std::move(nova)).first->second;
+    return *ultimaOrdem_;
 }
 
 void CCDataReader::JuntaLote(CEItemLista& item) {
