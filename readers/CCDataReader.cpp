@@ -87,6 +87,7 @@ void CCDataReader::LiberaLeituras() {
     versaoIndices_ = 0;
     indiceAtual_ = nullptr;
     layerDoUltimo_ = nullptr;
+    ultimaOrdem_ = nullptr;
     rotasLidas_ = false;
     corteDe_ = OdDbObjectId();
     versaoLidas_ = 0;
@@ -886,7 +887,12 @@ CCDataReader::EntidadeLida CCDataReader::LeEntidadeGuardada(const OdDbObjectId& 
     if (CICad::EhReferencia(id)) {
         // The symbol's fields go from the batch into the kept form, with no item between.
         lido.definirCampo(qtd, kMarca);
-        CICad::LeituraSimbolo(id, simbolo_);
+        if (chaveLidaDe_ == id) {
+            CICad::CompletaLeituraSimbolo(id, simbolo_);
+            chaveLidaDe_ = OdDbObjectId();
+        } else {
+            CICad::LeituraSimbolo(id, simbolo_);
+        }
         FazLote(QString(), lido.campos, id);
         lida.borne = EhBlocoDeBorne(simbolo_.bloco);
         OrdemLote& ordem = OrdenaLote();
@@ -1007,20 +1013,27 @@ void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const
 }
 
 CEItemLista* CCDataReader::CriaItemBloco(const OdDbObjectId& referencia, CETemplate& modelo) {
-    // A symbol read here is read once: its key is told by the first part of the reading.
+    // A symbol read here is read once: its key is told by the first part of the reading,
+    // which a kept reading made for the copy completes.
     const bool copia = GuardaSimbolos && CICad::EhReferencia(referencia);
-    if (copia ? ChaveDaEntidade(referencia).isEmpty() : !LeChaveDoSimbolo(referencia))
-        return nullptr;
+    if (!LeChaveDoSimbolo(referencia)) return nullptr;
     auto* item = new CEItemLista;
     item->ids.push_back(referencia);
     if (CamposPrevistos) item->campos.reservar(CamposPrevistos);
+    bool lida = true;
     if (copia) {
+        chaveLidaDe_ = referencia;
         CopiaEntidade(QString(), *item, referencia, &modelo);
+        // Found kept, the reading was not made: the part read serves nothing else.
+        lida = chaveLidaDe_.isNull();
+        chaveLidaDe_ = OdDbObjectId();
     } else {
         CICad::CompletaLeituraSimbolo(referencia, simbolo_);
         LeSimboloLido(QString(), *item, referencia);
     }
+    if (lida) lidaAgora_ = referencia;
     LerLadoIni(*item, referencia, modelo);
+    lidaAgora_ = OdDbObjectId();
     LerLadoFim(*item, referencia, modelo);
     return item;
 }

@@ -14,6 +14,7 @@
 #include <QStringList>
 
 #include <algorithm>
+#include <array>
 #include <functional>
 #include <memory>
 #include <optional>
@@ -197,6 +198,11 @@ protected:
     // extended data that its reading makes: a reading of it that follows (with the drawing
     // unchanged) takes that walk's texts instead of walking it again.
     bool FioTemChave(const OdDbObjectId& polilinha);
+    // For the start side of the item CriaItemBloco makes: the reference's block name,
+    // insertion point and layer from the reading it has just made of it; false when the
+    // reading was found kept (or the item is of another entity).
+    bool LidaAgora(const OdDbObjectId& referencia, std::string_view& bloco, CEPonto& posicao,
+                   const QString*& layer) const;
 
 private:
     void CarregaConexoes(const QString& funcao, bool detalhes);
@@ -456,6 +462,11 @@ private:
     // The last symbol read, and the fields of one reading before they join the item (in
     // order of writing: a later one of the same name wins).
     CESimboloLido simbolo_;
+    // The reference whose key part `simbolo_` holds, read by CriaItemBloco to tell whether
+    // it makes an item: the kept reading made for its copy completes that part.
+    OdDbObjectId chaveLidaDe_;
+    // The reference whose whole reading `simbolo_` holds while its start side is read.
+    OdDbObjectId lidaAgora_;
     std::vector<CamposItem::Campo> lote_;
     std::vector<std::uint64_t> ordemLote_;
     // OrdenaLote's answer by the batch's names in order of writing: the symbols (and wires) of a
@@ -468,6 +479,9 @@ private:
     };
     std::vector<std::uint32_t> nomesLote_;
     std::unordered_map<std::vector<std::uint32_t>, OrdemLote, HashNomes> ordensLote_;
+    // The entry of the last batch, whose names `nomesLote_` still holds: a block's symbols
+    // come in a row and write the same names.
+    OrdemLote* ultimaOrdem_ = nullptr;
     void JuntaLote(CEItemLista& item);
     // The places in `lote_` of the fields JuntaLote joins, sorted by name (the name in the
     // high half): the entry of the batch's names, valid until the next call.
@@ -479,6 +493,18 @@ private:
     // The fields of the symbol read into `simbolo_` under the suffix, into `lote_`; `campos`:
     // the item's so far, for its QTD.
     void FazLote(const QString& s, const CamposItem& campos, const OdDbObjectId& referencia);
+    // The numbers of the fields every batch writes after the symbol's own, under the last
+    // few suffixes: the callers pass the same few in turn.
+    struct NomesDoLote {
+        QString sufixo;
+        bool feitos = false;
+        std::uint32_t handle = 0, painel = 0, local = 0, circuito = 0, lista = 0, chave = 0,
+                      descricao = 0, tpDescri = 0, posicao = 0, layer = 0, grupo = 0, pagina = 0,
+                      tipo = 0, qtd = 0, material = 0;
+    };
+    std::array<NomesDoLote, 4> nomesDoLote_;
+    std::size_t proximoNomesDoLote_ = 0;
+    const NomesDoLote& NomesDoLoteCom(const QString& s);
 
     // Per symbol read while GuardaAcessorios is set, what ChaveENorma gives of it (`temChave`:
     // what it answers) and the texts of its ZV_VINC_ADITIVO; kept while the drawing is the

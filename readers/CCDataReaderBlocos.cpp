@@ -197,10 +197,18 @@ const CCDataReader::ConstantesBloco& CCDataReader::ConstantesDoBloco(const OdDbO
 }
 
 CCDataReader::OrdemLote& CCDataReader::OrdenaLote() {
+    if (ultimaOrdem_ && std::equal(lote_.begin(), lote_.end(), nomesLote_.begin(), nomesLote_.end(),
+                                   [](const CamposItem::Campo& campo, std::uint32_t nome) {
+                                       return campo.nome == nome;
+                                   }))
+        return *ultimaOrdem_;
     nomesLote_.clear();
     for (const CamposItem::Campo& campo : lote_)
         nomesLote_.push_back(campo.nome);
-    if (auto it = ordensLote_.find(nomesLote_); it != ordensLote_.end()) return it->second;
+    if (auto it = ordensLote_.find(nomesLote_); it != ordensLote_.end()) {
+        ultimaOrdem_ = &it->second;
+        return it->second;
+    }
     // By name, and of one name the last written: sorted by name and place, the last of each
     // run of a name is kept.
     ordemLote_.clear();
@@ -215,7 +223,8 @@ CCDataReader::OrdemLote& CCDataReader::OrdenaLote() {
     if (ordensLote_.size() >= kMaxOrdens) ordensLote_.clear();
     OrdemLote nova;
     nova.ordem.assign(ordemLote_.begin(), ordemLote_.begin() + std::ptrdiff_t(n));
-    return ordensLote_.emplace(nomesLote_, std::move(nova)).first->second;
+    ultimaOrdem_ = &ordensLote_.emplace(nomesLote_, std::move(nova)).first->second;
+    return *ultimaOrdem_;
 }
 
 void CCDataReader::JuntaLote(CEItemLista& item) {
@@ -226,6 +235,15 @@ void CCDataReader::JuntaLote(CEItemLista& item) {
             return std::move(lote_[std::uint32_t(ordem[j])].valor);
         });
     lote_.clear();
+}
+
+bool CCDataReader::LidaAgora(const OdDbObjectId& referencia, std::string_view& bloco,
+                             CEPonto& posicao, const QString*& layer) const {
+    if (lidaAgora_.isNull() || referencia != lidaAgora_ || !simbolo_.referencia) return false;
+    bloco = simbolo_.bloco;
+    posicao = simbolo_.posicao;
+    layer = &LayerDoNome(simbolo_.layer).nome;
+    return true;
 }
 
 bool CCDataReader::LeChaveDoSimbolo(const OdDbObjectId& referencia) {
@@ -281,6 +299,33 @@ void CCDataReader::LeSimboloLido(const QString& s, CEItemLista& item,
     JuntaLote(item);
 }
 
+const CCDataReader::NomesDoLote& CCDataReader::NomesDoLoteCom(const QString& s) {
+    for (const NomesDoLote& feitos : nomesDoLote_)
+        if (feitos.feitos && feitos.sufixo.isSharedWith(s)) return feitos;
+    for (const NomesDoLote& feitos : nomesDoLote_)
+        if (feitos.feitos && feitos.sufixo == s) return feitos;
+    NomesDoLote& n = nomesDoLote_[proximoNomesDoLote_++ % nomesDoLote_.size()];
+    // Asked in the order FazLote writes them: a name new under the suffix is numbered so.
+    n.sufixo = s;
+    n.handle = NumeroCampo<"HANDLE">(s);
+    n.painel = NumeroCampo<"PAINEL">(s);
+    n.local = NumeroCampo<"LOCAL">(s);
+    n.circuito = NumeroCampo<"CIRCUITO">(s);
+    n.lista = NumeroCampo<"ZV_LISTA">(s);
+    n.chave = NumeroCampo<"ZV_KEY">(s);
+    n.descricao = NumeroCampo<"DESCRICAO">(s);
+    n.tpDescri = NumeroCampo<"TP_DESCRI">(s);
+    n.posicao = NumeroCampo<"POSICAO">(s);
+    n.layer = NumeroCampo<"LAYER">(s);
+    n.grupo = NumeroCampo<"GRUPO">(s);
+    n.pagina = NumeroCampo<"PAGINA">(s);
+    n.tipo = NumeroCampo<"COMPONENTTYPE">(s);
+    n.qtd = NumeroCampo<"QTD">(s);
+    n.material = NumeroCampo<"SAP_MATERIAL">(s);
+    n.feitos = true;
+    return n;
+}
+
 void CCDataReader::FazLote(const QString& s, const CamposItem& campos,
                            const OdDbObjectId& referencia) {
     // The names are numbered in the order the fields are written, as when each was set on
@@ -327,39 +372,38 @@ void CCDataReader::FazLote(const QString& s, const CamposItem& campos,
                 poe(NumeroCampo<"CONECTOR">(s), pino[0].texto);
         }
     }
-    poe(NumeroCampo<"HANDLE">(s), ZVString::DeHandle(referencia.handle()));
+    const NomesDoLote& nomes = NomesDoLoteCom(s);
+    poe(nomes.handle, ZVString::DeHandle(referencia.handle()));
     // PAINEL and LOCAL hold the same value: templates use either name.
-    const std::uint32_t painel = NumeroCampo<"PAINEL">(s), local = NumeroCampo<"LOCAL">(s),
-                        numeroCircuito = NumeroCampo<"CIRCUITO">(s);
-    if (quer(painel) || quer(local) || quer(numeroCircuito)) {
+    if (quer(nomes.painel) || quer(nomes.local) || quer(nomes.circuito)) {
         const Circuito& circuito = CircuitoDe(lido.temCircuito, lido.circuito);
-        poe(painel, circuito.painel);
-        poe(local, circuito.painel);
-        poe(numeroCircuito, circuito.circuito);
+        poe(nomes.painel, circuito.painel);
+        poe(nomes.local, circuito.painel);
+        poe(nomes.circuito, circuito.circuito);
     }
-    poe(NumeroCampo<"ZV_LISTA">(s), catalogo.lista);
-    poe(NumeroCampo<"ZV_KEY">(s), chave.chave);
-    poe(NumeroCampo<"DESCRICAO">(s), catalogo.descricao);
-    poe(NumeroCampo<"TP_DESCRI">(s), catalogo.descricao);
+    poe(nomes.lista, catalogo.lista);
+    poe(nomes.chave, chave.chave);
+    poe(nomes.descricao, catalogo.descricao);
+    poe(nomes.tpDescri, catalogo.descricao);
     const LayerLido& layer = LayerDoNome(lido.layer);
     // A reference's position is its insertion point; anything else is asked the long way.
-    if (const std::uint32_t posicao = NumeroCampo<"POSICAO">(s); quer(posicao))
-        poe(posicao, !lido.referencia ? Posicao(referencia)
-                     : layer.grupo.isEmpty()
-                         ? QStringLiteral("??")
-                         : PosicaoNoPonto(referencia, layer.grupo, layer.pagina, lido.posicao));
-    poe(NumeroCampo<"LAYER">(s), layer.nome);
-    poe(NumeroCampo<"GRUPO">(s), layer.grupo);
-    poe(NumeroCampo<"PAGINA">(s), layer.pagina);
-    poe(NumeroCampo<"COMPONENTTYPE">(s), catalogo.tipo);
+    if (quer(nomes.posicao))
+        poe(nomes.posicao, !lido.referencia        ? Posicao(referencia)
+                           : layer.grupo.isEmpty() ? QStringLiteral("??")
+                                                   : PosicaoNoPonto(referencia, layer.grupo,
+                                                                    layer.pagina, lido.posicao));
+    poe(nomes.layer, layer.nome);
+    poe(nomes.grupo, layer.grupo);
+    poe(nomes.pagina, layer.pagina);
+    poe(nomes.tipo, catalogo.tipo);
     // QTD as the item has it so far: the last written here, or the item's own.
-    const std::uint32_t qtd = NumeroCampo<"QTD">(s);
+    const std::uint32_t qtd = nomes.qtd;
     const QString* valorQtd = nullptr;
     for (auto it = lote_.rbegin(); it != lote_.rend() && !valorQtd; ++it)
         if (it->nome == qtd) valorQtd = &it->valor;
     if (!valorQtd) valorQtd = campos.procura(qtd);
     if (!valorQtd || valorQtd->isEmpty()) poe(qtd, QStringLiteral("1"));
-    poe(NumeroCampo<"SAP_MATERIAL">(s), catalogo.material);
+    poe(nomes.material, catalogo.material);
     QString orientacao = QStringLiteral("0");
     if (lido.temLayout) {
         const CEListaXData layout = CICad::GetXData(referencia, "KVR_LAYOUT_ESQUEMA");

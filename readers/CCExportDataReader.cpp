@@ -46,9 +46,12 @@ bool ComecaCom(std::string_view nome, std::string_view prefixo) {
 }
 
 // A terminal's reference: its block is BORNE... or BOR-...
-bool EhBorne(const OdDbObjectId& id) {
-    const std::string_view nome = CICad::NomeBlocoUtf8(id);
+bool EhNomeDeBorne(std::string_view nome) {
     return ComecaCom(nome, "BORNE") || ComecaCom(nome, "BOR-");
+}
+
+bool EhBorne(const OdDbObjectId& id) {
+    return EhNomeDeBorne(CICad::NomeBlocoUtf8(id));
 }
 
 // The exports read without a template: the readers they borrow ask it for separators,
@@ -292,11 +295,19 @@ void CCExportDataReader::LerLadoIni(CEItemLista& item, const OdDbObjectId& entid
     // The reference was just read: its block name, and what its sides ask of it, are at
     // hand now, not when the sides are read after the walk.
     ladosVistos_ = true;
-    if (entidade.isNull() || !EhBorne(entidade)) return;
+    if (entidade.isNull()) return;
     BornesLidos::Referencia referencia;
-    referencia.insercao = CICad::GetPosicao(entidade);
+    std::string_view bloco;
+    const QString* layer = nullptr;
+    if (LidaAgora(entidade, bloco, referencia.insercao, layer)) {
+        if (!EhNomeDeBorne(bloco)) return;
+        referencia.layer = *layer;
+    } else {
+        if (!EhBorne(entidade)) return;
+        referencia.insercao = CICad::GetPosicao(entidade);
+        referencia.layer = LayerDe(entidade);
+    }
     referencia.corte = PontoDeCorte(entidade);
-    referencia.layer = LayerDe(entidade);
     referencia.equipamento = CICad::TemXData(entidade, "KVR_ZV_EQUIPO");
     bornesLidos_.Anota(resultado_.size(), item, entidade, std::move(referencia));
 }

@@ -2,6 +2,7 @@
 // circuit, position and layer, and what the reader keeps of them for the run following a
 // change of the drawing, of the symbol's key or of the catalogue.
 #include "ReaderFixture.h"
+#include "lists/TemplateDouble.h"
 #include "readers/CEAtributo.h"
 #include "readers/LeitorBase.h"
 #include "readers/ZVString.h"
@@ -204,6 +205,27 @@ TEST_F(BlockReadingTest, NewFieldNamesAreNumberedInTheOrderOfWriting) {
     leitor.LeBloco("_FIM", lado, q, nullptr);
     EXPECT_EQ(lado.valorCampo(c + "_FIM"), "3");
     EXPECT_EQ(CamposItem::numeroSeHouver(c), CamposItem::kSemNome);
+    // Under a suffix new to the run, the fields every symbol has are numbered as written,
+    // after the symbol's own attributes; a second symbol under other suffixes, then this
+    // one again, gives each its own names.
+    const QString novo = "_" + marca;
+    CEItemLista comNovo;
+    leitor.LeBloco(novo, comNovo, q, nullptr);
+    const QStringList escritos = {
+        c,        "HANDLE",        "PAINEL",    "LOCAL",        "CIRCUITO",  "ZV_LISTA",
+        "ZV_KEY", "DESCRICAO",     "TP_DESCRI", "POSICAO",      "LAYER",     "GRUPO",
+        "PAGINA", "COMPONENTTYPE", "QTD",       "SAP_MATERIAL", "ORIENTACAO"};
+    for (qsizetype i = 0; i + 1 < escritos.size(); ++i)
+        EXPECT_LT(CamposItem::numeroSeHouver(escritos[i] + novo),
+                  CamposItem::numeroSeHouver(escritos[i + 1] + novo))
+            << escritos[i].toStdString();
+    for (const QString& sufixo : {QStringLiteral("_INI"), QStringLiteral("_FIM"), novo}) {
+        CEItemLista outro;
+        leitor.LeBloco(sufixo, outro, k, nullptr);
+        EXPECT_EQ(outro.valorCampo("HANDLE" + sufixo), handle(k));
+        EXPECT_EQ(outro.valorCampo("ZV_KEY" + sufixo), "A1");
+        EXPECT_FALSE(outro.temCampo("HANDLE"));
+    }
 }
 
 // Of a name written twice the later value counts, whatever the order of the other names; the
@@ -292,6 +314,12 @@ public:
     void Filtra(std::function<bool(const QString&)> fica) { FiltraSufixos(std::move(fica)); }
 };
 
+// A reader whose items of symbols are copies of kept readings, as the exports' are.
+class LeitorQueCopia : public LeitorBase {
+public:
+    LeitorQueCopia() { GuardaSimbolos = true; }
+};
+
 }  // namespace
 
 TEST_F(BlockReadingTest, ACopyUnderASuffixKeepsOnlyTheNamesItsReaderAsksFor) {
@@ -334,4 +362,41 @@ TEST_F(BlockReadingTest, ACopyUnderASuffixKeepsOnlyTheNamesItsReaderAsksFor) {
     const CEItemLista fim = copia(leitor, "_FIM", k);
     EXPECT_EQ(fim.campos.keys(), cheio.campos.keys());
     EXPECT_EQ(fim.campos.values(), cheio.campos.values());
+}
+
+// The key read to tell whether a symbol makes an item is the start of the kept reading made
+// for its copy; a reading found kept, or made for another entity, owes nothing to it.
+TEST_F(BlockReadingTest, AnItemCopiedFromAKeptReadingIsItsOwnSymbolsWholeReading) {
+    const OdDbObjectId a = Simbolo("NA-1", "A1", "ESQ$0001$A", {{"REGUA", "X1"}}, 0);
+    const OdDbObjectId b = Simbolo("NA-1", "SO", "ESQ$0001$A", {{"REGUA", "X2"}}, 10);
+    LeitorBase direto;
+    LeitorQueCopia leitor;
+    TemplateDouble modelo;
+    const auto confere = [&](const OdDbObjectId& id, const CEItemLista& item) {
+        const CEItemLista lido = Le(direto, id);
+        for (auto it = lido.campos.begin(); it != lido.campos.end(); ++it)
+            EXPECT_EQ(item.valorCampo(it.key()), it.value()) << it.key().toStdString();
+        EXPECT_EQ(item.campos.size(), lido.campos.size());
+    };
+    for (const OdDbObjectId& id : {a, b, a}) {
+        const std::unique_ptr<CEItemLista> item(leitor.CriaItemBloco(id, modelo));
+        ASSERT_NE(item, nullptr);
+        confere(id, *item);
+    }
+    EXPECT_EQ(std::unique_ptr<CEItemLista>(leitor.CriaItemBloco(a, modelo))->valorCampo("ZV_KEY"),
+              "A1");
+    // After the item of a reading found kept, a copy asked for by itself reads its own symbol.
+    const OdDbObjectId c = Simbolo("NA-1", "B3", "ESQ$0001$A", {{"REGUA", "X3"}}, 20);
+    CEItemLista copia;
+    leitor.CopiaEntidade(QString(), copia, c, nullptr);
+    EXPECT_EQ(copia.valorCampo("ZV_KEY"), "B3");
+    confere(c, copia);
+    // A new key is read; a symbol whose key text is empty makes no item.
+    CICad::SetXData(a, "KVR_ZV", {{1000, QString("SY") + QChar(0x0C) + "1"}});
+    const std::unique_ptr<CEItemLista> novo(leitor.CriaItemBloco(a, modelo));
+    ASSERT_NE(novo, nullptr);
+    EXPECT_EQ(novo->valorCampo("ZV_KEY"), "SY");
+    confere(a, *novo);
+    CICad::SetXData(b, "KVR_ZV", {{1000, ""}});
+    EXPECT_EQ(std::unique_ptr<CEItemLista>(leitor.CriaItemBloco(b, modelo)), nullptr);
 }

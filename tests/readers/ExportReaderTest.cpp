@@ -564,6 +564,38 @@ TEST_F(ExportTerminalSidesTest, WiresAndTerminalsReadApartGiveTheSameSidesAndAre
     avulsos->destruirItens();
 }
 
+// The terminals' places and layers come from their readings as the walk makes them; a second
+// walk finds the readings kept and asks the references: the sides are the same.
+TEST_F(ExportTerminalSidesTest, ASecondWalkOverKeptReadingsGivesTheSameSides) {
+    x1_ = borne("X1", "1", {20, 200, 0});
+    x2_ = borne("X1", "2", {60, 200, 0});
+    k1_ = componente("-K1", {{"A1", {20, 100, 0}}});
+    fio({{20, 190, 0}, {20, 100, 0}}, "1");
+    fio({{20, 200, 0}, {20, 220, 0}, {60, 220, 0}, {60, 200, 0}}, "5");
+    ASSERT_TRUE(lisp("(setq EXPORTA 3)"));
+    CCExportDataReader leitor;
+    std::unique_ptr<VetorItens> primeiros(leitor.Le(&db(), nullptr, true, std::nullopt));
+    ASSERT_TRUE(primeiros);
+    EXPECT_TRUE(leitor.LeituraGuardada(OdDbObjectId(&db(), x1_->handle())));
+    std::unique_ptr<VetorItens> segundos(leitor.Le(&db(), nullptr, true, std::nullopt));
+    ASSERT_TRUE(segundos);
+    ASSERT_EQ(primeiros->size(), segundos->size());
+    QStringList vizinhos;
+    for (size_t i = 0; i < primeiros->size(); ++i) {
+        const CEItemLista& a = *(*primeiros)[i];
+        const CEItemLista& b = *(*segundos)[i];
+        EXPECT_EQ(a.campos.keys(), b.campos.keys());
+        EXPECT_EQ(a.campos.values(), b.campos.values());
+        if (b.valorCampo("ZV_LISTA_TIPO") == "BORNE")
+            vizinhos << b.valorCampo("NUMERO") + "<" + b.valorCampo("RELACAO_INI") + ">" +
+                            b.valorCampo("RELACAO_FIM") + "/" + b.valorCampo("FIO_SEGFIM");
+    }
+    vizinhos.sort();
+    EXPECT_EQ(vizinhos, QStringList({"1<-K1:A1>X1:2/5", "2<>X1:1/5"}));
+    primeiros->destruirItens();
+    segundos->destruirItens();
+}
+
 TEST_F(ExportTerminalSidesTest, AnInvertedTerminalSwapsItsSides) {
     x1_ = borne("X1", "1", {20, 200, 0});
     x1_->addAttribute("INVERTIDO", "s", {24, 191, 0}, 1.0);
