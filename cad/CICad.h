@@ -297,6 +297,9 @@ public:
     // gives; valid until the object changes. Empty when the object has none.
     static void TextosXData(const OdDbObjectId& id, const char* aplicacao,
                             std::vector<std::string_view>& textos);
+    // The same with each item's code (a point's: its x's) beside its text.
+    static void TextosXData(const OdDbObjectId& id, const char* aplicacao,
+                            std::vector<std::string_view>& textos, std::vector<int>& codigos);
     // The points (codes 1010 to 1013) of those items, in order, as GetXData reads them.
     static std::vector<CEPonto> PontosXData(const OdDbObjectId& id, const char* aplicacao);
     // Whether the object has items under the application; `texto` takes the first text item,

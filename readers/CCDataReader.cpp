@@ -44,10 +44,6 @@ double DistanciaAoSegmento(const CEPonto& p, const CEPonto& a, const CEPonto& b)
     return d;
 }
 
-bool EhTexto(const CEItemXData& item) {
-    return item.codigo == 1000;
-}
-
 // A terminal's block name: BORNE... or BOR-..., in any case.
 bool EhBlocoDeBorne(std::string_view nome) {
     const auto comeca = [nome](std::string_view prefixo) {
@@ -432,19 +428,29 @@ std::optional<QString> CCDataReader::NumeroDoRegistroCabo(const OdDbObjectId& re
 }
 
 // A cable core's number: the cable's own number (a CABO or CABLE attribute of its record)
-// and the core, from KVR_ZV_CABO; empty when there is none.
+// and the core, from KVR_ZV_CABO; empty when there is none. Every wire without a number of
+// its own is asked: its texts are read where the drawing holds them.
 QString CCDataReader::NumeroNoCabo(const OdDbObjectId& entidade) const {
-    const CEListaXData cabo = CICad::GetXData(entidade, "KVR_ZV_CABO");
-    if (cabo.size() < 2 || !EhTexto(cabo[0]) || !EhTexto(cabo[1])) return {};
-    QString esquerda, direita;
-    ZVString(cabo[0].texto).DivideEmDois(CCDataReader::kSeparador, esquerda, direita);
-    for (size_t i = 2; i < cabo.size(); ++i) {
-        if (!EhTexto(cabo[i])) continue;
-        auto guardado = numerosCabos_.constFind(cabo[i].texto);
-        if (guardado == numerosCabos_.constEnd())
-            guardado = numerosCabos_.insert(cabo[i].texto,
-                                            NumeroDoRegistroCabo(CICad::IdDoHandle(cabo[i].texto)));
-        if (*guardado) return **guardado + CCDataReader::kSeparador + esquerda;
+    CICad::TextosXData(entidade, "KVR_ZV_CABO", textosCabo_, codigosCabo_);
+    const auto ehTexto = [this](std::size_t i) { return codigosCabo_[i] == 1000; };
+    if (textosCabo_.size() < 2 || !ehTexto(0) || !ehTexto(1)) return {};
+    // The core is the first part of the first text, when it has one or two parts.
+    std::string_view nucleo, resto;
+    if (!DivideCampo(textosCabo_[0], nucleo, resto)) nucleo = {};
+    for (size_t i = 2; i < textosCabo_.size(); ++i) {
+        if (!ehTexto(i)) continue;
+        const std::string_view registro = textosCabo_[i];
+        auto guardado = numerosCabos_.find(registro);
+        if (guardado == numerosCabos_.end()) {
+            const QString handle = QString::fromUtf8(registro.data(), int(registro.size()));
+            guardado =
+                numerosCabos_
+                    .emplace(std::string(registro), NumeroDoRegistroCabo(CICad::IdDoHandle(handle)))
+                    .first;
+        }
+        if (guardado->second)
+            return *guardado->second + kSeparador +
+                   QString::fromUtf8(nucleo.data(), int(nucleo.size()));
     }
     return {};
 }

@@ -290,9 +290,10 @@ private:
     mutable TabelaIds<NumeroFio> numerosFios_;
     mutable std::vector<std::string_view> textosNumero_;  // the wire's items being searched
     std::optional<QString> NumeroNoCampoFio(const OdDbObjectId& entidade) const;
-    // Per cable record (by handle text): its CABO or CABLE attribute, shared by its cores.
-    mutable QHash<QString, std::optional<QString>> numerosCabos_;
     QString NumeroNoCabo(const OdDbObjectId& entidade) const;
+    // The items of a core's KVR_ZV_CABO being searched, and their codes.
+    mutable std::vector<std::string_view> textosCabo_;
+    mutable std::vector<int> codigosCabo_;
     std::optional<QString> NumeroDoRegistroCabo(const OdDbObjectId& registro) const;
     // Per element, its connection attributes with the places of their texts.
     struct LigacaoGuardada {
@@ -369,6 +370,9 @@ private:
         QString nome, grupo, pagina;
     };
     mutable PorTexto<LayerLido> layers_;
+    // Per cable record, by its handle's text as the core holds it: its CABO or CABLE
+    // attribute, shared by its cores.
+    mutable PorTexto<std::optional<QString>> numerosCabos_;
     const LayerLido& LayerDoNome(std::string_view nome) const;
     // The entity LayerDe was asked for last, its layer's name and the drawing's version then.
     mutable OdDbObjectId layerDe_;

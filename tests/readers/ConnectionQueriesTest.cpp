@@ -820,6 +820,50 @@ TEST_F(ConnectionQueriesTest, CoresOfACableTakeItsNumberAndFollowItsChange) {
     EXPECT_EQ(r->NumeroDoFio(id(um)), "");
 }
 
+// The core is the first part of the core's first text when that text has one or two parts
+// (empty ones skipped), else nothing; the first two items must be texts, and the records
+// are the text items after them, the first with a cable number giving it.
+TEST_F(ConnectionQueriesTest, ACoresNumberTakesItsCoreFromItsFirstTextAndItsCableFromTheRecords) {
+    const std::string caminho[] = {"ZV_CABOS"};
+    zvdb::Dictionary* cabos = db().dictionaryAt(caminho, true);
+    zvdb::XRecord* registro = cabos->getOrCreateXRecord("W3");
+    registro->setXData("KVR_ZV_ATT_VIRTUAL", zvsample::XDataItems().text("CABO\fW3\fN").tags());
+    zvdb::XRecord* semNumero = cabos->getOrCreateXRecord("W4");
+    semNumero->setXData("KVR_ZV_ATT_VIRTUAL", zvsample::XDataItems().text("COR\fAZUL\fN").tags());
+    const std::string h = ZVString::DeHandle(registro->handle()).toStdString();
+    const std::string sem = ZVString::DeHandle(semNumero->handle()).toStdString();
+    // Items by code: texts (1000), 32-bit integers (1071) and points (1010, its x y z).
+    using Itens = std::vector<std::pair<int, std::string>>;
+    const std::vector<std::pair<Itens, QString>> casos = {
+        {{{1000, "7\f20101"}, {1000, h}, {1000, h}}, "W3\f7"},
+        {{{1000, "7"}, {1000, "x"}, {1000, h}}, "W3\f7"},
+        {{{1000, "\f7\f\f"}, {1000, h}, {1000, h}}, "W3\f7"},
+        {{{1000, "\xce\xa9\f1"}, {1000, h}, {1000, h}}, QString::fromUtf8("W3\f\xce\xa9")},
+        {{{1000, "7\f8\f9"}, {1000, h}, {1000, h}}, "W3\f"},
+        {{{1000, ""}, {1000, h}, {1000, h}}, "W3\f"},
+        {{{1000, "7"}, {1000, h}}, ""},
+        {{{1010, ""}, {1000, h}, {1000, h}}, ""},
+        {{{1000, "7"}, {1071, "5"}, {1000, h}}, ""},
+        // Past records that name nothing or no cable number, and items that are no texts.
+        {{{1000, "7"}, {1000, h}, {1000, "FFFFF"}, {1071, "3"}, {1000, sem}, {1000, h}}, "W3\f7"},
+        {{{1000, "7"}, {1000, h}, {1010, ""}, {1000, sem}}, ""},
+    };
+    for (const auto& [itens, esperado] : casos) {
+        zvsample::XDataItems xdata;
+        for (const auto& [codigo, texto] : itens) {
+            if (codigo == 1010)
+                xdata.point({1, 2, 3});
+            else
+                xdata.add(codigo, texto);
+        }
+        zvdb::Polyline* nucleo = db().modelSpace()->addLwPolyline({{0, 0, 0}, {9, 0, 0}}, false);
+        nucleo->setXData("KVR_ZV_CABO", xdata.tags());
+        auto r = leitor();
+        EXPECT_EQ(r->NumeroDoFio(id(nucleo)), esperado) << itens.front().second;
+        EXPECT_FALSE(r->EhFioNumerado(id(nucleo)));
+    }
+}
+
 // The record's texts are split as its virtual attributes are: the first of three fields
 // named CABO or CABLE in any case gives the cable's number.
 TEST_F(ConnectionQueriesTest, ACableNumberIsTheRecordsVirtualAttributeOfThatName) {
