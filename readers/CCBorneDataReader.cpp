@@ -123,8 +123,11 @@ CCBorneDataReader::LadoBorne CCBorneDataReader::AchaLado(CCDataReader& leitor,
     // The wire at the point and its entries are found once for both directions, the
     // element's handle and its point.
     if (lado.layer.isNull()) lado.layer = leitor.LayerDe(borne);
-    const OdDbObjectId fio = leitor.FioNoPonto(lado.layer, lado.ponto);
-    const auto entradas = leitor.EntradasDoFio(fio);
+    const OdDbObjectId fio =
+        oposto && oposto->fioOutro ? *oposto->fioOutro : leitor.FioNoPonto(lado.layer, lado.ponto);
+    QString numero;
+    bool numerado = false;
+    const auto entradas = leitor.EntradasDoFio(fio, numero, numerado);
     if (!entradas) return lado;
     const TabelaConexoes::Textos& elementos = entradas->elementos;
     // An entry with an empty text counts as none, as an empty handle would.
@@ -139,6 +142,8 @@ CCBorneDataReader::LadoBorne CCBorneDataReader::AchaLado(CCDataReader& leitor,
     // A stale handle in the connection answer: the element is null, the side stays blank.
     lado.elemento = CICad::IdDoHandle(lado.vizinho.toString(), borne.database());
     lado.fio = fio;
+    lado.numeroFio = std::move(numero);
+    lado.fioNumerado = numerado;
     // The point of the element's first entry on the wire.
     const int j = elementos.indexOf(lado.vizinho);
     if (j >= 0 && size_t(j) < entradas->pontos.size())
@@ -161,10 +166,11 @@ void CCBorneDataReader::LeLado(CEItemLista& item, const OdDbObjectId& borne, con
     LeFiosLado(*this, item, borne, achado, lado.insercao, &modelo);
 }
 
-void CCBorneDataReader::LeFiosLado(CCDataReader& leitor, CEItemLista& item,
-                                   const OdDbObjectId& borne, const LadoBorne& lado, bool insercao,
-                                   CETemplate* modelo) {
-    if (!leitor.EhFioNumerado(lado.fio)) return;
+std::optional<OdDbObjectId> CCBorneDataReader::LeFiosLado(CCDataReader& leitor, CEItemLista& item,
+                                                          const OdDbObjectId& borne,
+                                                          const LadoBorne& lado, bool insercao,
+                                                          CETemplate* modelo) {
+    if (!lado.fioNumerado) return std::nullopt;
     // AchaLado found the wire at the side's point already.
     const OdDbObjectId& fioAqui = lado.fio;
     const OdDbObjectId fioOutro =
@@ -181,6 +187,7 @@ void CCBorneDataReader::LeFiosLado(CCDataReader& leitor, CEItemLista& item,
         if (!fioP.isNull()) leitor.CopiaEntidade(segP, item, fioP, modelo);
         if (!fioQ.isNull()) leitor.CopiaEntidade(segQ, item, fioQ, modelo);
     }
+    return fioOutro;
 }
 
 void CCBorneDataReader::CompoeRelacaoBorne(const QString& sufixo, CEItemLista& item,

@@ -508,6 +508,16 @@ std::optional<TabelaConexoes::Entradas> CCDataReader::EntradasDoFio(const OdDbOb
     return conexoes_.DoFio(NumeroDoFio(fio));
 }
 
+std::optional<TabelaConexoes::Entradas> CCDataReader::EntradasDoFio(const OdDbObjectId& fio,
+                                                                    QString& numero,
+                                                                    bool& numerado) const {
+    if (fio.isNull()) return std::nullopt;
+    const NumeroFio& lido = NumeroDoFioGuardado(fio);
+    numero = lido.numero;
+    numerado = lido.proprio;
+    return conexoes_.DoFio(numero);
+}
+
 int CCDataReader::LugarDoVizinho(const TabelaConexoes::Entradas& c, const OdDbObjectId& entidade,
                                  const CEPonto& ponto, bool anterior) {
     const TabelaConexoes::Textos& elementos = c.elementos;

@@ -78,6 +78,10 @@ public:
     // of the element VizinhoNoFio gives (-1 when it gives none): a terminal's side reads the
     // element's handle and point there, without texts made for them.
     std::optional<TabelaConexoes::Entradas> EntradasDoFio(const OdDbObjectId& fio) const;
+    // The same, with the wire's number and whether its own field holds it (NumeroDoFio and
+    // EhFioNumerado; untouched when `fio` is null).
+    std::optional<TabelaConexoes::Entradas> EntradasDoFio(const OdDbObjectId& fio, QString& numero,
+                                                          bool& numerado) const;
     static int LugarDoVizinho(const TabelaConexoes::Entradas& c, const OdDbObjectId& entidade,
                               const CEPonto& ponto, bool anterior);
     CEPonto PontoDeCorte(const OdDbObjectId& referencia) const;

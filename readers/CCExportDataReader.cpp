@@ -397,7 +397,7 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
         if (lado->vizinho.isEmpty()) return;
         ponto = lado->ponto;
         outro = lado->outro;
-        fio = NumeroDoFio(lado->fio);
+        fio = lado->numeroFio;
         conectado = lado->vizinho.toString();
     } else {
         // The terminal is met where this wire touches it, which may be its cut point.
@@ -448,8 +448,13 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
         // Both sides read the same two wires under the same suffixes: when the first side
         // read them, the second finds them on the item.
         const bool lidos = segundoLado && primeiro.fiosLidos;
-        if (!lidos) CCBorneDataReader::LeFiosLado(*this, item, entidade, *lado, inicio, modelo);
-        if (inicio && EhFioNumerado(lado->fio)) primeiroLado_.fiosLidos = true;
+        if (!lidos) {
+            const std::optional<OdDbObjectId> outro =
+                CCBorneDataReader::LeFiosLado(*this, item, entidade, *lado, inicio, modelo);
+            // The second side's point is the first side's other point.
+            if (inicio && primeiroLado_.lado) primeiroLado_.lado->fioOutro = outro;
+        }
+        if (inicio && lado->fioNumerado) primeiroLado_.fiosLidos = true;
     } else {
         const OdDbObjectId fioOutro = FioNoPonto(CICad::GetLayerEntidade(entidade), outro);
         if (!fioOutro.isNull())

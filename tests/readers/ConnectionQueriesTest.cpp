@@ -400,6 +400,8 @@ TEST_F(NeighbourTest, ATerminalsSideIsWhatTheNeighbourAndPointQueriesGive) {
             ++lados;
             EXPECT_EQ(lado.elemento, CICad::IdDoHandle(esperado)) << onde;
             EXPECT_EQ(lado.fio, r->FioNoPonto(r->LayerDe(id(borne)), ponto)) << onde;
+            EXPECT_EQ(lado.numeroFio, r->NumeroDoFio(lado.fio)) << onde;
+            EXPECT_EQ(lado.fioNumerado, r->EhFioNumerado(lado.fio)) << onde;
             const CEPonto noFio = r->PontoDaConexao(r->NumeroDoFio(lado.fio), esperado);
             EXPECT_DOUBLE_EQ(lado.pontoElemento.x, noFio.x) << onde;
             EXPECT_DOUBLE_EQ(lado.pontoElemento.y, noFio.y) << onde;
@@ -410,6 +412,39 @@ TEST_F(NeighbourTest, ATerminalsSideIsWhatTheNeighbourAndPointQueriesGive) {
     const CCBorneDataReader::LadoBorne emD = CCBorneDataReader::AchaLado(*r, id(d), true);
     EXPECT_EQ(emD.vizinho.toString(), handle(w));
     EXPECT_DOUBLE_EQ(emD.pontoElemento.y, 150.0);
+}
+
+// The wires of a numbered side answer the wire at the terminal's other point; the other side,
+// whose point that is, takes it as its own wire instead of looking for one.
+TEST_F(NeighbourTest, ATerminalsSecondSideTakesTheWireTheFirstFoundAtItsPoint) {
+    TemplateDouble modelo;
+    CEItemLista item;
+    const CCBorneDataReader::LadoBorne primeiro = CCBorneDataReader::AchaLado(*r, id(t), true);
+    ASSERT_TRUE(primeiro.fioNumerado);
+    EXPECT_EQ(primeiro.numeroFio, "101");
+    const std::optional<OdDbObjectId> outro =
+        CCBorneDataReader::LeFiosLado(*r, item, id(t), primeiro, true, &modelo);
+    ASSERT_TRUE(outro);
+    EXPECT_EQ(*outro, r->FioNoPonto(r->LayerDe(id(t)), primeiro.outro));
+    EXPECT_EQ(r->NumeroDoFio(*outro), "102");
+    CCBorneDataReader::LadoBorne oposto = primeiro;
+    oposto.fioOutro = outro;
+    const CCBorneDataReader::LadoBorne segundo =
+        CCBorneDataReader::AchaLado(*r, id(t), false, &oposto);
+    EXPECT_EQ(segundo.fio, *outro);
+    EXPECT_EQ(segundo.numeroFio, "102");
+    EXPECT_EQ(segundo.vizinho.toString(), handle(u));
+    EXPECT_EQ(segundo.vizinho.toString(),
+              CCBorneDataReader::AchaLado(*r, id(t), false).vizinho.toString());
+    // Told that no wire is there, the side has no neighbour, though one is on the drawing.
+    oposto.fioOutro = OdDbObjectId();
+    EXPECT_TRUE(CCBorneDataReader::AchaLado(*r, id(t), false, &oposto).vizinho.isEmpty());
+    // A side whose wire has no number of its own reads no wires and looks for none.
+    CCBorneDataReader::LadoBorne semNumero = primeiro;
+    semNumero.fioNumerado = false;
+    CEItemLista vazio;
+    EXPECT_FALSE(CCBorneDataReader::LeFiosLado(*r, vazio, id(t), semNumero, true, &modelo));
+    EXPECT_EQ(vazio.campos.size(), 0);
 }
 
 // A neighbour erased after the connections were loaded answers by a handle that no longer
