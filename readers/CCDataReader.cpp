@@ -579,16 +579,24 @@ const zv::CEAtributo* CCDataReader::ConexaoProxima(const OdDbObjectId& elemento,
                                         zv::CEAtributo(lida.tag, QString(), lida.valor, lida.id,
                                                        CICad::AtributoInvisivel(lida.id))});
             } else {
-                // The attributes as the drawing holds them, with their tags and values trimmed
-                // as an attribute list gives them: no list and no texts made for the others.
-                CICad::LeituraSimbolo(elemento, simboloLigacoes_);
-                for (const CESimboloLido::Atributo& atributo : simboloLigacoes_.atributos) {
-                    const TagLida& tag = TagDoTexto(atributo.tag);
-                    if (!tag.ligacao) continue;
+                // The connection attributes as the drawing holds them, with their tags and
+                // values trimmed as an attribute list gives them: the rest of the symbol is
+                // not read, and no texts are made for the other attributes.
+                tagsLigacoes_.clear();
+                CICad::AtributosPostos(
+                    elemento,
+                    [this](std::string_view texto) {
+                        const TagLida& tag = TagDoTexto(texto);
+                        if (tag.ligacao) tagsLigacoes_.push_back(tag.texto);
+                        return tag.ligacao;
+                    },
+                    atributosLigacoes_);
+                for (std::size_t i = 0; i < atributosLigacoes_.size(); ++i) {
+                    const CEAtributoPosto& atributo = atributosLigacoes_[i];
                     ligacoes.push_back(
-                        {CICad::GetPosicaoTexto(atributo.id),
-                         zv::CEAtributo(tag.texto, QString(), ValorDoTexto(atributo.valor),
-                                        atributo.id, CICad::AtributoInvisivel(atributo.id))});
+                        {atributo.posicao,
+                         zv::CEAtributo(tagsLigacoes_[i], QString(), ValorDoTexto(atributo.valor),
+                                        atributo.id, atributo.invisivel)});
                 }
             }
         }

@@ -361,8 +361,10 @@ private:
     mutable OdDbObjectId atributosDe_;
     mutable std::uint64_t atributosVersao_ = 0;
     mutable std::vector<LigacaoLida> ligacoesLidas_;
-    // An element read for its connection attributes alone.
-    mutable CESimboloLido simboloLigacoes_;
+    // An element's connection attributes, read for them alone, and their tags' texts (the
+    // tag table's own may move as it grows).
+    mutable std::vector<CEAtributoPosto> atributosLigacoes_;
+    mutable std::vector<QString> tagsLigacoes_;
     // Per layer name, its group and page (empty unless the name has three parts); per catalogue
     // type, its text: items repeat a few of each.
     mutable QHash<QString, std::pair<QString, QString>> gruposPaginas_;
