@@ -204,19 +204,20 @@ const CCDataReader::FiosDoLayer& CCDataReader::LeIndiceFios(const QString& layer
     indice = std::make_unique<FiosDoLayer>();
     auto it = fiosPorLayer_.constFind(layer);
     if (it == fiosPorLayer_.constEnd()) {
-        QStringList handles;
+        // The answer's handles as numbers: each opens its wire without a text kept for it.
+        std::vector<std::uint64_t> handles;
         ResultBuffer* resposta = CICad::zvInvokeLista("getFiosPorLayer", {layer});
         for (const ResultBuffer* no = resposta; no; no = no->rbnext)
-            if (no->restype == zvsdk::RTSTR) handles << no->rstring;
+            if (no->restype == zvsdk::RTSTR) handles.push_back(ZVString(no->rstring).ParaHandle());
         CICad::LiberaLista(resposta);
-        it = fiosPorLayer_.insert(layer, handles);
+        it = fiosPorLayer_.insert(layer, std::move(handles));
     }
     FiosDoLayer& f = *indice;
     // The layer's name as the drawing holds it: each wire's is compared without a copy.
     const QByteArray nomeLayer = layer.toUtf8();
     const std::string_view nome(nomeLayer.constData(), std::size_t(nomeLayer.size()));
-    for (const QString& handle : *it) {
-        const OdDbObjectId fio = CICad::IdDoHandle(handle);
+    for (const std::uint64_t handle : *it) {
+        const OdDbObjectId fio = CICad::IdDoHandleNumero(handle);
         const std::size_t antes = f.pontos.size();
         const std::size_t vertices = CICad::AcrescentaVertices(fio, nome, f.pontos);
         if (vertices > 0 && !primeirosVertices_.contains(fio))
@@ -278,15 +279,24 @@ const CCDataReader::FiosDoLayer& CCDataReader::LeIndiceFios(const QString& layer
     // Two walks over the boxes: the first counts each cell's wires, the second puts them
     // in place. A wire enters a cell once, however many of its segments meet the cell.
     const std::size_t nCelulas = f.nx * f.ny;
+    // Each box's range of cells, worked out once for both walks.
+    struct Celulas {
+        std::uint32_t i1, i2, j1, j2, fio;
+    };
+    std::vector<Celulas> faixas;
+    faixas.reserve(caixas.size());
+    for (const Caixa& c : caixas)
+        faixas.push_back({std::uint32_t(f.Celula(c.x1, f.x0, f.nx)),
+                          std::uint32_t(f.Celula(c.x2, f.x0, f.nx)),
+                          std::uint32_t(f.Celula(c.y1, f.y0, f.ny)),
+                          std::uint32_t(f.Celula(c.y2, f.y0, f.ny)), c.fio});
     static constexpr std::uint32_t kNenhum = ~std::uint32_t(0);
     std::vector<std::uint32_t> ultimo(nCelulas, kNenhum);
-    auto cadaCelula = [&f, &caixas, &ultimo](auto&& faz) {
+    auto cadaCelula = [&f, &faixas, &ultimo](auto&& faz) {
         std::fill(ultimo.begin(), ultimo.end(), kNenhum);
-        for (const Caixa& c : caixas) {
-            const std::size_t i1 = f.Celula(c.x1, f.x0, f.nx), i2 = f.Celula(c.x2, f.x0, f.nx);
-            const std::size_t j1 = f.Celula(c.y1, f.y0, f.ny), j2 = f.Celula(c.y2, f.y0, f.ny);
-            for (std::size_t j = j1; j <= j2; ++j)
-                for (std::size_t i = i1; i <= i2; ++i) {
+        for (const Celulas& c : faixas) {
+            for (std::size_t j = c.j1; j <= c.j2; ++j)
+                for (std::size_t i = c.i1; i <= c.i2; ++i) {
                     const std::size_t celula = j * f.nx + i;
                     if (ultimo[celula] == c.fio) continue;
                     ultimo[celula] = c.fio;

@@ -226,7 +226,8 @@ private:
     // The circuit of a number as GetCircuitoLocal found it (`tem`); empty texts without one.
     const Circuito& CircuitoDe(bool tem, int numero);
     TabelaConexoes conexoes_;
-    QHash<QString, QStringList> fiosPorLayer_;
+    // Per layer, the handles of its wires as getFiosPorLayer answers them.
+    QHash<QString, std::vector<std::uint64_t>> fiosPorLayer_;
     std::unordered_map<QString, std::unique_ptr<FiosDoLayer>> indicesFios_;
     std::uint64_t versaoIndices_ = 0;  // the drawing's version the indexes were read at
     // The first vertex of each wire the indexes read, for the wire's position.
