@@ -85,16 +85,15 @@ void CCBorneDataReader::LerLadoFim(CEItemLista& item, const OdDbObjectId& borne,
     LeLado(item, borne, Lado{false}, modelo);
 }
 
-namespace {
-
 // Asked at every side of every terminal: the field by its number, and no upper-case copy
-// of a text that cannot read "S".
-bool Invertido(const CEItemLista& borne) {
+// of a text that cannot read "S" (upper case never shortens a text), nor of an ASCII letter.
+bool CCBorneDataReader::Invertido(const CEItemLista& borne) {
     const QString* valor = borne.campos.procura(NumeroCampo<"INVERTIDO">());
-    return valor && valor->size() == 1 && valor->toUpper() == QLatin1String("S");
+    if (!valor || valor->size() != 1) return false;
+    const char16_t c = valor->front().unicode();
+    if (c < 0x80) return c == 'S' || c == 's';
+    return valor->toUpper() == QLatin1String("S");
 }
-
-}  // namespace
 
 QString CCBorneDataReader::SufixoElemento(const CEItemLista& borne, bool insercao) {
     return insercao != Invertido(borne) ? QStringLiteral("_FIM") : QStringLiteral("_INI");

@@ -81,6 +81,8 @@ public:
     // wire at the insertion point (or the cut point), for the terminal's INVERTIDO.
     static QString SufixoElemento(const CEItemLista& borne, bool insercao);
     static QString SufixoFio(const CEItemLista& borne, bool insercao);
+    // Whether the item's INVERTIDO reads "S" in any case: its wires' ends are not swapped.
+    static bool Invertido(const CEItemLista& borne);
 
 private:
     struct Lado;

@@ -536,14 +536,15 @@ TEST_F(NeighbourTest, ASideJoinsRelationAndConnectionAsItsTemplateSays) {
     terminais.LerLadoIni(segundo, id(t), depois);
     EXPECT_EQ(primeiro.valorCampo("RELACAO_FIM"), "-K1:A1");
     EXPECT_EQ(segundo.valorCampo("TAG_FIM"), "A1.-K1");
-    for (const char* invertido : {"S", "s"}) {
+    // U+017F (long s) upper-cases to S; U+00DF (sharp s) to SS, U+0160 to itself.
+    for (const char* invertido : {"S", "s", "\xc5\xbf"}) {
         CEItemLista item;
         item.definirCampo("INVERTIDO", invertido);
         terminais.LerLadoIni(item, id(t), antes);
         EXPECT_EQ(item.valorCampo("RELACAO_INI"), "-K1:A1") << invertido;
         EXPECT_FALSE(item.temCampo("RELACAO_FIM")) << invertido;
     }
-    for (const char* reto : {"SS", "N", " S", ""}) {
+    for (const char* reto : {"SS", "N", " S", "", "\xc3\x9f", "\xc5\xa0", "t"}) {
         CEItemLista item;
         item.definirCampo("INVERTIDO", reto);
         terminais.LerLadoIni(item, id(t), antes);
