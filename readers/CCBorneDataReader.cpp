@@ -139,7 +139,8 @@ CCBorneDataReader::LadoBorne CCBorneDataReader::AchaLado(CCDataReader& leitor,
     if (i < 0) return lado;
     lado.vizinho = elementos.vista(i);
     // A stale handle in the connection answer: the element is null, the side stays blank.
-    lado.elemento = CICad::IdDoHandle(lado.vizinho.toString(), borne.database());
+    // Its handle as the table read it from the text: no text made to read it again.
+    lado.elemento = CICad::IdDoHandleNumero(elementos.handle(i), borne.database());
     lado.fio = fio;
     lado.numeroFio = std::move(numero);
     lado.fioNumerado = numerado;
