@@ -66,6 +66,15 @@ struct CESimboloLido {
     int circuito = 1;
 };
 
+// An attribute of a reference as a connection's question takes it: its tag and value as the
+// drawing holds them, where its text stands and whether it is invisible.
+struct CEAtributoPosto {
+    std::string_view tag, valor;
+    OdDbObjectId id;
+    CEPonto posicao;
+    bool invisivel = false;
+};
+
 // The rows of the three-language tag table.
 enum class CampoTraduzido {
     Relacao = 1,
@@ -245,6 +254,12 @@ public:
     static double GetRotacao(const OdDbObjectId& referencia);
     // The insertion point of a text or attribute.
     static CEPonto GetPosicaoTexto(const OdDbObjectId& texto);
+    // The reference's attributes, in the drawing's order, whose tag `aceita` takes, each
+    // looked at once; none for another entity. An element asked for its connections reads
+    // these, not its whole symbol.
+    static void AtributosPostos(const OdDbObjectId& referencia,
+                                const std::function<bool(std::string_view)>& aceita,
+                                std::vector<CEAtributoPosto>& atributos);
     static OdDbObjectId GetDono(const OdDbObjectId& id);
     static OdDbObjectId GetModelSpace(zvdb::Database* database = nullptr);
     // Block definitions in table order, layouts included.
@@ -301,6 +316,9 @@ public:
     // gives; valid until the object changes. Empty when the object has none.
     static void TextosXData(const OdDbObjectId& id, const char* aplicacao,
                             std::vector<std::string_view>& textos);
+    // The same with each item's code (a point's: its x's) beside its text.
+    static void TextosXData(const OdDbObjectId& id, const char* aplicacao,
+                            std::vector<std::string_view>& textos, std::vector<int>& codigos);
     // The points (codes 1010 to 1013) of those items, in order, as GetXData reads them.
     static std::vector<CEPonto> PontosXData(const OdDbObjectId& id, const char* aplicacao);
     // Whether the object has items under the application; `texto` takes the first text item,

@@ -191,6 +191,20 @@ void CICad::TextosXData(const OdDbObjectId& id, const char* aplicacao,
     }
 }
 
+void CICad::TextosXData(const OdDbObjectId& id, const char* aplicacao,
+                        std::vector<std::string_view>& textos, std::vector<int>& codigos) {
+    textos.clear();
+    codigos.clear();
+    zvdb::DbObject* objeto = Objeto(id);
+    if (!objeto) return;
+    const std::span<const zvdb::Tag> itens = objeto->xdataItems(aplicacao);
+    for (std::size_t i = 0; i < itens.size(); ++i) {
+        textos.push_back(itens[i].value);
+        codigos.push_back(itens[i].code);
+        PassaPonto(itens, i);
+    }
+}
+
 bool CICad::TextoXData(const OdDbObjectId& id, const char* aplicacao, QString& texto,
                        bool& temTexto) {
     zvdb::DbObject* objeto = Objeto(id);

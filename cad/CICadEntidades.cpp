@@ -140,6 +140,27 @@ CEPonto CICad::GetPosicaoTexto(const OdDbObjectId& texto) {
     return {p.x, p.y, p.z};
 }
 
+void CICad::AtributosPostos(const OdDbObjectId& referencia,
+                            const std::function<bool(std::string_view)>& aceita,
+                            std::vector<CEAtributoPosto>& atributos) {
+    atributos.clear();
+    auto* ref = Como<zvdb::BlockReference>(referencia);
+    if (!ref) return;
+    static constexpr int kTagEValor[] = {2, 1};
+    static constexpr std::string_view kSemPadrao[2] = {};
+    for (zvdb::Entity* sub : ref->subEntities()) {
+        if (sub->isErased()) continue;
+        auto* atributo = Classe<zvdb::Attribute>(sub);
+        if (!atributo) continue;
+        std::string_view textos[2];
+        atributo->texts(kTagEValor, kSemPadrao, textos);
+        if (!aceita(textos[0])) continue;
+        const zvdb::Point3 p = atributo->position();
+        atributos.push_back(
+            {textos[0], textos[1], Id(atributo), {p.x, p.y, p.z}, atributo->isInvisible()});
+    }
+}
+
 OdDbObjectId CICad::GetDono(const OdDbObjectId& id) {
     zvdb::DbObject* objeto = Objeto(id);
     return objeto ? Id(objeto->owner()) : OdDbObjectId();

@@ -85,16 +85,15 @@ void CCBorneDataReader::LerLadoFim(CEItemLista& item, const OdDbObjectId& borne,
     LeLado(item, borne, Lado{false}, modelo);
 }
 
-namespace {
-
 // Asked at every side of every terminal: the field by its number, and no upper-case copy
-// of a text that cannot read "S".
-bool Invertido(const CEItemLista& borne) {
+// of a text that cannot read "S" (upper case never shortens a text), nor of an ASCII letter.
+bool CCBorneDataReader::Invertido(const CEItemLista& borne) {
     const QString* valor = borne.campos.procura(NumeroCampo<"INVERTIDO">());
-    return valor && valor->size() == 1 && valor->toUpper() == QLatin1String("S");
+    if (!valor || valor->size() != 1) return false;
+    const char16_t c = valor->front().unicode();
+    if (c < 0x80) return c == 'S' || c == 's';
+    return valor->toUpper() == QLatin1String("S");
 }
-
-}  // namespace
 
 QString CCBorneDataReader::SufixoElemento(const CEItemLista& borne, bool insercao) {
     return insercao != Invertido(borne) ? QStringLiteral("_FIM") : QStringLiteral("_INI");
@@ -123,8 +122,11 @@ CCBorneDataReader::LadoBorne CCBorneDataReader::AchaLado(CCDataReader& leitor,
     // The wire at the point and its entries are found once for both directions, the
     // element's handle and its point.
     if (lado.layer.isNull()) lado.layer = leitor.LayerDe(borne);
-    const OdDbObjectId fio = leitor.FioNoPonto(lado.layer, lado.ponto);
-    const auto entradas = leitor.EntradasDoFio(fio);
+    const OdDbObjectId fio =
+        oposto && oposto->fioOutro ? *oposto->fioOutro : leitor.FioNoPonto(lado.layer, lado.ponto);
+    QString numero;
+    bool numerado = false;
+    const auto entradas = leitor.EntradasDoFio(fio, numero, numerado);
     if (!entradas) return lado;
     const TabelaConexoes::Textos& elementos = entradas->elementos;
     // An entry with an empty text counts as none, as an empty handle would.
@@ -137,8 +139,11 @@ CCBorneDataReader::LadoBorne CCBorneDataReader::AchaLado(CCDataReader& leitor,
     if (i < 0) return lado;
     lado.vizinho = elementos.vista(i);
     // A stale handle in the connection answer: the element is null, the side stays blank.
-    lado.elemento = CICad::IdDoHandle(lado.vizinho.toString(), borne.database());
+    // Its handle as the table read it from the text: no text made to read it again.
+    lado.elemento = CICad::IdDoHandleNumero(elementos.handle(i), borne.database());
     lado.fio = fio;
+    lado.numeroFio = std::move(numero);
+    lado.fioNumerado = numerado;
     // The point of the element's first entry on the wire.
     const int j = elementos.indexOf(lado.vizinho);
     if (j >= 0 && size_t(j) < entradas->pontos.size())
@@ -161,10 +166,11 @@ void CCBorneDataReader::LeLado(CEItemLista& item, const OdDbObjectId& borne, con
     LeFiosLado(*this, item, borne, achado, lado.insercao, &modelo);
 }
 
-void CCBorneDataReader::LeFiosLado(CCDataReader& leitor, CEItemLista& item,
-                                   const OdDbObjectId& borne, const LadoBorne& lado, bool insercao,
-                                   CETemplate* modelo) {
-    if (!leitor.EhFioNumerado(lado.fio)) return;
+std::optional<OdDbObjectId> CCBorneDataReader::LeFiosLado(CCDataReader& leitor, CEItemLista& item,
+                                                          const OdDbObjectId& borne,
+                                                          const LadoBorne& lado, bool insercao,
+                                                          CETemplate* modelo) {
+    if (!lado.fioNumerado) return std::nullopt;
     // AchaLado found the wire at the side's point already.
     const OdDbObjectId& fioAqui = lado.fio;
     const OdDbObjectId fioOutro =
@@ -181,6 +187,7 @@ void CCBorneDataReader::LeFiosLado(CCDataReader& leitor, CEItemLista& item,
         if (!fioP.isNull()) leitor.CopiaEntidade(segP, item, fioP, modelo);
         if (!fioQ.isNull()) leitor.CopiaEntidade(segQ, item, fioQ, modelo);
     }
+    return fioOutro;
 }
 
 void CCBorneDataReader::CompoeRelacaoBorne(const QString& sufixo, CEItemLista& item,

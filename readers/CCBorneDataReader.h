@@ -4,6 +4,7 @@
 #include "CCDataReader.h"
 
 #include <array>
+#include <optional>
 #include <unordered_set>
 #include <utility>
 #include <vector>
@@ -51,25 +52,37 @@ public:
         QStringView vizinho;
         OdDbObjectId elemento;  // that element, null when its handle is stale
         OdDbObjectId fio;       // the wire at the side's point, null when none
+        // That wire's number and whether its own field holds it, as NumeroDoFio and
+        // EhFioNumerado give them: the side asks for both more than once.
+        QString numeroFio;
+        bool fioNumerado = false;
         CEPonto pontoElemento;  // where the wire meets the element
         QString layer;          // the terminal's layer, as the reader names it
+        // The wire at the other point, once looked for (null: none there): the terminal's
+        // other side, whose point that is, takes it.
+        std::optional<OdDbObjectId> fioOutro;
     };
     // Repeated numbers leave the jumpers unlinked; the terminal list says so (message 329),
     // the exports, which draw no jumpers, do not.
     bool AvisaNumerosRepetidos = true;
 
     // The side at the insertion point, or at the cut point. `oposto`, the terminal's other
-    // side when it was found already, lends its two points, and its layer when it has one.
+    // side when it was found already, lends its two points, its layer when it has one, and
+    // the wire at its other point when it looked for it.
     static LadoBorne AchaLado(CCDataReader& leitor, const OdDbObjectId& borne, bool insercao,
                               const LadoBorne* oposto = nullptr);
     // The wires at the terminal's two points under their suffixes, when the side's wire is
-    // a numbered one.
-    static void LeFiosLado(CCDataReader& leitor, CEItemLista& item, const OdDbObjectId& borne,
-                           const LadoBorne& lado, bool insercao, CETemplate* modelo);
+    // a numbered one. Answers the wire it found at the other point (null: none), when it
+    // looked for one.
+    static std::optional<OdDbObjectId> LeFiosLado(CCDataReader& leitor, CEItemLista& item,
+                                                  const OdDbObjectId& borne, const LadoBorne& lado,
+                                                  bool insercao, CETemplate* modelo);
     // The suffix of the element wired at the insertion side (or the cut side), and of the
     // wire at the insertion point (or the cut point), for the terminal's INVERTIDO.
     static QString SufixoElemento(const CEItemLista& borne, bool insercao);
     static QString SufixoFio(const CEItemLista& borne, bool insercao);
+    // Whether the item's INVERTIDO reads "S" in any case: its wires' ends are not swapped.
+    static bool Invertido(const CEItemLista& borne);
 
 private:
     struct Lado;

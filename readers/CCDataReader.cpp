@@ -44,10 +44,6 @@ double DistanciaAoSegmento(const CEPonto& p, const CEPonto& a, const CEPonto& b)
     return d;
 }
 
-bool EhTexto(const CEItemXData& item) {
-    return item.codigo == 1000;
-}
-
 // A terminal's block name: BORNE... or BOR-..., in any case.
 bool EhBlocoDeBorne(std::string_view nome) {
     const auto comeca = [nome](std::string_view prefixo) {
@@ -209,19 +205,20 @@ const CCDataReader::FiosDoLayer& CCDataReader::LeIndiceFios(const QString& layer
     indice = std::make_unique<FiosDoLayer>();
     auto it = fiosPorLayer_.constFind(layer);
     if (it == fiosPorLayer_.constEnd()) {
-        QStringList handles;
+        // The answer's handles as numbers: each opens its wire without a text kept for it.
+        std::vector<std::uint64_t> handles;
         ResultBuffer* resposta = CICad::zvInvokeLista("getFiosPorLayer", {layer});
         for (const ResultBuffer* no = resposta; no; no = no->rbnext)
-            if (no->restype == zvsdk::RTSTR) handles << no->rstring;
+            if (no->restype == zvsdk::RTSTR) handles.push_back(ZVString(no->rstring).ParaHandle());
         CICad::LiberaLista(resposta);
-        it = fiosPorLayer_.insert(layer, handles);
+        it = fiosPorLayer_.insert(layer, std::move(handles));
     }
     FiosDoLayer& f = *indice;
     // The layer's name as the drawing holds it: each wire's is compared without a copy.
     const QByteArray nomeLayer = layer.toUtf8();
     const std::string_view nome(nomeLayer.constData(), std::size_t(nomeLayer.size()));
-    for (const QString& handle : *it) {
-        const OdDbObjectId fio = CICad::IdDoHandle(handle);
+    for (const std::uint64_t handle : *it) {
+        const OdDbObjectId fio = CICad::IdDoHandleNumero(handle);
         const std::size_t antes = f.pontos.size();
         const std::size_t vertices = CICad::AcrescentaVertices(fio, nome, f.pontos);
         if (vertices > 0 && !primeirosVertices_.contains(fio))
@@ -283,15 +280,24 @@ const CCDataReader::FiosDoLayer& CCDataReader::LeIndiceFios(const QString& layer
     // Two walks over the boxes: the first counts each cell's wires, the second puts them
     // in place. A wire enters a cell once, however many of its segments meet the cell.
     const std::size_t nCelulas = f.nx * f.ny;
+    // Each box's range of cells, worked out once for both walks.
+    struct Celulas {
+        std::uint32_t i1, i2, j1, j2, fio;
+    };
+    std::vector<Celulas> faixas;
+    faixas.reserve(caixas.size());
+    for (const Caixa& c : caixas)
+        faixas.push_back({std::uint32_t(f.Celula(c.x1, f.x0, f.nx)),
+                          std::uint32_t(f.Celula(c.x2, f.x0, f.nx)),
+                          std::uint32_t(f.Celula(c.y1, f.y0, f.ny)),
+                          std::uint32_t(f.Celula(c.y2, f.y0, f.ny)), c.fio});
     static constexpr std::uint32_t kNenhum = ~std::uint32_t(0);
     std::vector<std::uint32_t> ultimo(nCelulas, kNenhum);
-    auto cadaCelula = [&f, &caixas, &ultimo](auto&& faz) {
+    auto cadaCelula = [&f, &faixas, &ultimo](auto&& faz) {
         std::fill(ultimo.begin(), ultimo.end(), kNenhum);
-        for (const Caixa& c : caixas) {
-            const std::size_t i1 = f.Celula(c.x1, f.x0, f.nx), i2 = f.Celula(c.x2, f.x0, f.nx);
-            const std::size_t j1 = f.Celula(c.y1, f.y0, f.ny), j2 = f.Celula(c.y2, f.y0, f.ny);
-            for (std::size_t j = j1; j <= j2; ++j)
-                for (std::size_t i = i1; i <= i2; ++i) {
+        for (const Celulas& c : faixas) {
+            for (std::size_t j = c.j1; j <= c.j2; ++j)
+                for (std::size_t i = c.i1; i <= c.i2; ++i) {
                     const std::size_t celula = j * f.nx + i;
                     if (ultimo[celula] == c.fio) continue;
                     ultimo[celula] = c.fio;
@@ -433,19 +439,29 @@ std::optional<QString> CCDataReader::NumeroDoRegistroCabo(const OdDbObjectId& re
 }
 
 // A cable core's number: the cable's own number (a CABO or CABLE attribute of its record)
-// and the core, from KVR_ZV_CABO; empty when there is none.
+// and the core, from KVR_ZV_CABO; empty when there is none. Every wire without a number of
+// its own is asked: its texts are read where the drawing holds them.
 QString CCDataReader::NumeroNoCabo(const OdDbObjectId& entidade) const {
-    const CEListaXData cabo = CICad::GetXData(entidade, "KVR_ZV_CABO");
-    if (cabo.size() < 2 || !EhTexto(cabo[0]) || !EhTexto(cabo[1])) return {};
-    QString esquerda, direita;
-    ZVString(cabo[0].texto).DivideEmDois(CCDataReader::kSeparador, esquerda, direita);
-    for (size_t i = 2; i < cabo.size(); ++i) {
-        if (!EhTexto(cabo[i])) continue;
-        auto guardado = numerosCabos_.constFind(cabo[i].texto);
-        if (guardado == numerosCabos_.constEnd())
-            guardado = numerosCabos_.insert(cabo[i].texto,
-                                            NumeroDoRegistroCabo(CICad::IdDoHandle(cabo[i].texto)));
-        if (*guardado) return **guardado + CCDataReader::kSeparador + esquerda;
+    CICad::TextosXData(entidade, "KVR_ZV_CABO", textosCabo_, codigosCabo_);
+    const auto ehTexto = [this](std::size_t i) { return codigosCabo_[i] == 1000; };
+    if (textosCabo_.size() < 2 || !ehTexto(0) || !ehTexto(1)) return {};
+    // The core is the first part of the first text, when it has one or two parts.
+    std::string_view nucleo, resto;
+    if (!DivideCampo(textosCabo_[0], nucleo, resto)) nucleo = {};
+    for (size_t i = 2; i < textosCabo_.size(); ++i) {
+        if (!ehTexto(i)) continue;
+        const std::string_view registro = textosCabo_[i];
+        auto guardado = numerosCabos_.find(registro);
+        if (guardado == numerosCabos_.end()) {
+            const QString handle = QString::fromUtf8(registro.data(), int(registro.size()));
+            guardado =
+                numerosCabos_
+                    .emplace(std::string(registro), NumeroDoRegistroCabo(CICad::IdDoHandle(handle)))
+                    .first;
+        }
+        if (guardado->second)
+            return *guardado->second + kSeparador +
+                   QString::fromUtf8(nucleo.data(), int(nucleo.size()));
     }
     return {};
 }
@@ -501,6 +517,16 @@ QString CCDataReader::VizinhoNoFio(const OdDbObjectId& fio, const OdDbObjectId& 
 std::optional<TabelaConexoes::Entradas> CCDataReader::EntradasDoFio(const OdDbObjectId& fio) const {
     if (fio.isNull()) return std::nullopt;
     return conexoes_.DoFio(NumeroDoFio(fio));
+}
+
+std::optional<TabelaConexoes::Entradas> CCDataReader::EntradasDoFio(const OdDbObjectId& fio,
+                                                                    QString& numero,
+                                                                    bool& numerado) const {
+    if (fio.isNull()) return std::nullopt;
+    const NumeroFio& lido = NumeroDoFioGuardado(fio);
+    numero = lido.numero;
+    numerado = lido.proprio;
+    return conexoes_.DoFio(numero);
 }
 
 int CCDataReader::LugarDoVizinho(const TabelaConexoes::Entradas& c, const OdDbObjectId& entidade,
@@ -564,16 +590,24 @@ const zv::CEAtributo* CCDataReader::ConexaoProxima(const OdDbObjectId& elemento,
                                         zv::CEAtributo(lida.tag, QString(), lida.valor, lida.id,
                                                        CICad::AtributoInvisivel(lida.id))});
             } else {
-                // The attributes as the drawing holds them, with their tags and values trimmed
-                // as an attribute list gives them: no list and no texts made for the others.
-                CICad::LeituraSimbolo(elemento, simboloLigacoes_);
-                for (const CESimboloLido::Atributo& atributo : simboloLigacoes_.atributos) {
-                    const TagLida& tag = TagDoTexto(atributo.tag);
-                    if (!tag.ligacao) continue;
+                // The connection attributes as the drawing holds them, with their tags and
+                // values trimmed as an attribute list gives them: the rest of the symbol is
+                // not read, and no texts are made for the other attributes.
+                tagsLigacoes_.clear();
+                CICad::AtributosPostos(
+                    elemento,
+                    [this](std::string_view texto) {
+                        const TagLida& tag = TagDoTexto(texto);
+                        if (tag.ligacao) tagsLigacoes_.push_back(tag.texto);
+                        return tag.ligacao;
+                    },
+                    atributosLigacoes_);
+                for (std::size_t i = 0; i < atributosLigacoes_.size(); ++i) {
+                    const CEAtributoPosto& atributo = atributosLigacoes_[i];
                     ligacoes.push_back(
-                        {CICad::GetPosicaoTexto(atributo.id),
-                         zv::CEAtributo(tag.texto, QString(), ValorDoTexto(atributo.valor),
-                                        atributo.id, CICad::AtributoInvisivel(atributo.id))});
+                        {atributo.posicao,
+                         zv::CEAtributo(tagsLigacoes_[i], QString(), ValorDoTexto(atributo.valor),
+                                        atributo.id, atributo.invisivel)});
                 }
             }
         }

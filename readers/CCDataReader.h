@@ -80,6 +80,10 @@ public:
     // of the element VizinhoNoFio gives (-1 when it gives none): a terminal's side reads the
     // element's handle and point there, without texts made for them.
     std::optional<TabelaConexoes::Entradas> EntradasDoFio(const OdDbObjectId& fio) const;
+    // The same, with the wire's number and whether its own field holds it (NumeroDoFio and
+    // EhFioNumerado; untouched when `fio` is null).
+    std::optional<TabelaConexoes::Entradas> EntradasDoFio(const OdDbObjectId& fio, QString& numero,
+                                                          bool& numerado) const;
     static int LugarDoVizinho(const TabelaConexoes::Entradas& c, const OdDbObjectId& entidade,
                               const CEPonto& ponto, bool anterior);
     CEPonto PontoDeCorte(const OdDbObjectId& referencia) const;
@@ -240,7 +244,8 @@ private:
     // The circuit of a number as GetCircuitoLocal found it (`tem`); empty texts without one.
     const Circuito& CircuitoDe(bool tem, int numero);
     TabelaConexoes conexoes_;
-    QHash<QString, QStringList> fiosPorLayer_;
+    // Per layer, the handles of its wires as getFiosPorLayer answers them.
+    QHash<QString, std::vector<std::uint64_t>> fiosPorLayer_;
     std::unordered_map<QString, std::unique_ptr<FiosDoLayer>> indicesFios_;
     std::uint64_t versaoIndices_ = 0;  // the drawing's version the indexes were read at
     // The first vertex of each wire the indexes read, for the wire's position.
@@ -311,9 +316,10 @@ private:
     mutable TabelaIds<NumeroFio> numerosFios_;
     mutable std::vector<std::string_view> textosNumero_;  // the wire's items being searched
     std::optional<QString> NumeroNoCampoFio(const OdDbObjectId& entidade) const;
-    // Per cable record (by handle text): its CABO or CABLE attribute, shared by its cores.
-    mutable QHash<QString, std::optional<QString>> numerosCabos_;
     QString NumeroNoCabo(const OdDbObjectId& entidade) const;
+    // The items of a core's KVR_ZV_CABO being searched, and their codes.
+    mutable std::vector<std::string_view> textosCabo_;
+    mutable std::vector<int> codigosCabo_;
     std::optional<QString> NumeroDoRegistroCabo(const OdDbObjectId& registro) const;
     // Per element, its connection attributes with the places of their texts.
     struct LigacaoGuardada {
@@ -377,8 +383,10 @@ private:
     mutable OdDbObjectId atributosDe_;
     mutable std::uint64_t atributosVersao_ = 0;
     mutable std::vector<LigacaoLida> ligacoesLidas_;
-    // An element read for its connection attributes alone.
-    mutable CESimboloLido simboloLigacoes_;
+    // An element's connection attributes, read for them alone, and their tags' texts (the
+    // tag table's own may move as it grows).
+    mutable std::vector<CEAtributoPosto> atributosLigacoes_;
+    mutable std::vector<QString> tagsLigacoes_;
     // Per layer name, its group and page (empty unless the name has three parts); per catalogue
     // type, its text: items repeat a few of each.
     mutable QHash<QString, std::pair<QString, QString>> gruposPaginas_;
@@ -390,6 +398,9 @@ private:
         QString nome, grupo, pagina;
     };
     mutable PorTexto<LayerLido> layers_;
+    // Per cable record, by its handle's text as the core holds it: its CABO or CABLE
+    // attribute, shared by its cores.
+    mutable PorTexto<std::optional<QString>> numerosCabos_;
     const LayerLido& LayerDoNome(std::string_view nome) const;
     // The entity LayerDe was asked for last, its layer's name and the drawing's version then.
     mutable OdDbObjectId layerDe_;

@@ -365,8 +365,7 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
     const PrimeiroLado primeiro = std::exchange(primeiroLado_, PrimeiroLado{});
     if (entidade.isNull() || !(borne || EhBorne(entidade))) return;
     // An inverted wire keeps its ends; any other wire has them the other way round.
-    const QString* marca = item.campos.procura(NumeroCampo<"INVERTIDO">());
-    const bool invertido = marca && marca->toUpper() == QLatin1String("S");
+    const bool invertido = CCBorneDataReader::Invertido(item);
     static const QString kIni = QStringLiteral("_INI"), kFim = QStringLiteral("_FIM"),
                          kSegIni = QStringLiteral("_SEGINI"), kSegFim = QStringLiteral("_SEGFIM"),
                          kEquipo = QStringLiteral("KVR_ZV_EQUIPO");
@@ -408,7 +407,7 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
         if (lado->vizinho.isEmpty()) return;
         ponto = lado->ponto;
         outro = lado->outro;
-        fio = NumeroDoFio(lado->fio);
+        fio = lado->numeroFio;
         conectado = lado->vizinho.toString();
     } else {
         // The terminal is met where this wire touches it, which may be its cut point.
@@ -436,10 +435,17 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
             if (!achado.isEmpty()) conectado = achado;
         }
     }
-    const OdDbObjectId objeto = CICad::IdDoHandle(conectado);
+    // A terminal's side found the element of its neighbour's handle already, in the drawing
+    // the handle is looked up in.
+    const bool elementoAchado = lado && !lado->elemento.isNull() &&
+                                TabelaConexoes::Iguais(conectado, lado->vizinho) &&
+                                lado->elemento.database() == CICad::GetDatabase();
+    const OdDbObjectId objeto = elementoAchado ? lado->elemento : CICad::IdDoHandle(conectado);
     if (doBorne && objeto.isNull()) return;
     QString ligacao;
-    NomesRelacao& nomes = Nomes(sufixo);
+    NomesRelacao*& guardados = &sufixo == &kIni ? nomesIni_ : nomesFim_;
+    if (!guardados) guardados = &Nomes(sufixo);
+    NomesRelacao& nomes = *guardados;
     if (!objeto.isNull()) {
         // The relation the wire reader composed for this end is no field of the object:
         // a terminal, which has no relation, is told by its strip and number instead.
@@ -459,8 +465,13 @@ void CCExportDataReader::AoLigar(CEItemLista& item, const OdDbObjectId& entidade
         // Both sides read the same two wires under the same suffixes: when the first side
         // read them, the second finds them on the item.
         const bool lidos = segundoLado && primeiro.fiosLidos;
-        if (!lidos) CCBorneDataReader::LeFiosLado(*this, item, entidade, *lado, inicio, modelo);
-        if (inicio && EhFioNumerado(lado->fio)) primeiroLado_.fiosLidos = true;
+        if (!lidos) {
+            const std::optional<OdDbObjectId> outro =
+                CCBorneDataReader::LeFiosLado(*this, item, entidade, *lado, inicio, modelo);
+            // The second side's point is the first side's other point.
+            if (inicio && primeiroLado_.lado) primeiroLado_.lado->fioOutro = outro;
+        }
+        if (inicio && lado->fioNumerado) primeiroLado_.fiosLidos = true;
     } else {
         const OdDbObjectId fioOutro = FioNoPonto(CICad::GetLayerEntidade(entidade), outro);
         if (!fioOutro.isNull())

@@ -100,6 +100,10 @@ private:
         }
     };
     PrimeiroLado primeiroLado_;
+    // The names of the two suffixes of an end, found once per reader (Nomes keeps them for
+    // the run).
+    NomesRelacao* nomesIni_ = nullptr;
+    NomesRelacao* nomesFim_ = nullptr;
     QString PaginasOpcao() const;
     // The relation's separator and order, of the template or of the export settings.
     struct Composicao {

@@ -400,6 +400,8 @@ TEST_F(NeighbourTest, ATerminalsSideIsWhatTheNeighbourAndPointQueriesGive) {
             ++lados;
             EXPECT_EQ(lado.elemento, CICad::IdDoHandle(esperado)) << onde;
             EXPECT_EQ(lado.fio, r->FioNoPonto(r->LayerDe(id(borne)), ponto)) << onde;
+            EXPECT_EQ(lado.numeroFio, r->NumeroDoFio(lado.fio)) << onde;
+            EXPECT_EQ(lado.fioNumerado, r->EhFioNumerado(lado.fio)) << onde;
             const CEPonto noFio = r->PontoDaConexao(r->NumeroDoFio(lado.fio), esperado);
             EXPECT_DOUBLE_EQ(lado.pontoElemento.x, noFio.x) << onde;
             EXPECT_DOUBLE_EQ(lado.pontoElemento.y, noFio.y) << onde;
@@ -410,6 +412,39 @@ TEST_F(NeighbourTest, ATerminalsSideIsWhatTheNeighbourAndPointQueriesGive) {
     const CCBorneDataReader::LadoBorne emD = CCBorneDataReader::AchaLado(*r, id(d), true);
     EXPECT_EQ(emD.vizinho.toString(), handle(w));
     EXPECT_DOUBLE_EQ(emD.pontoElemento.y, 150.0);
+}
+
+// The wires of a numbered side answer the wire at the terminal's other point; the other side,
+// whose point that is, takes it as its own wire instead of looking for one.
+TEST_F(NeighbourTest, ATerminalsSecondSideTakesTheWireTheFirstFoundAtItsPoint) {
+    TemplateDouble modelo;
+    CEItemLista item;
+    const CCBorneDataReader::LadoBorne primeiro = CCBorneDataReader::AchaLado(*r, id(t), true);
+    ASSERT_TRUE(primeiro.fioNumerado);
+    EXPECT_EQ(primeiro.numeroFio, "101");
+    const std::optional<OdDbObjectId> outro =
+        CCBorneDataReader::LeFiosLado(*r, item, id(t), primeiro, true, &modelo);
+    ASSERT_TRUE(outro);
+    EXPECT_EQ(*outro, r->FioNoPonto(r->LayerDe(id(t)), primeiro.outro));
+    EXPECT_EQ(r->NumeroDoFio(*outro), "102");
+    CCBorneDataReader::LadoBorne oposto = primeiro;
+    oposto.fioOutro = outro;
+    const CCBorneDataReader::LadoBorne segundo =
+        CCBorneDataReader::AchaLado(*r, id(t), false, &oposto);
+    EXPECT_EQ(segundo.fio, *outro);
+    EXPECT_EQ(segundo.numeroFio, "102");
+    EXPECT_EQ(segundo.vizinho.toString(), handle(u));
+    EXPECT_EQ(segundo.vizinho.toString(),
+              CCBorneDataReader::AchaLado(*r, id(t), false).vizinho.toString());
+    // Told that no wire is there, the side has no neighbour, though one is on the drawing.
+    oposto.fioOutro = OdDbObjectId();
+    EXPECT_TRUE(CCBorneDataReader::AchaLado(*r, id(t), false, &oposto).vizinho.isEmpty());
+    // A side whose wire has no number of its own reads no wires and looks for none.
+    CCBorneDataReader::LadoBorne semNumero = primeiro;
+    semNumero.fioNumerado = false;
+    CEItemLista vazio;
+    EXPECT_FALSE(CCBorneDataReader::LeFiosLado(*r, vazio, id(t), semNumero, true, &modelo));
+    EXPECT_EQ(vazio.campos.size(), 0);
 }
 
 // A neighbour erased after the connections were loaded answers by a handle that no longer
@@ -501,14 +536,15 @@ TEST_F(NeighbourTest, ASideJoinsRelationAndConnectionAsItsTemplateSays) {
     terminais.LerLadoIni(segundo, id(t), depois);
     EXPECT_EQ(primeiro.valorCampo("RELACAO_FIM"), "-K1:A1");
     EXPECT_EQ(segundo.valorCampo("TAG_FIM"), "A1.-K1");
-    for (const char* invertido : {"S", "s"}) {
+    // U+017F (long s) upper-cases to S; U+00DF (sharp s) to SS, U+0160 to itself.
+    for (const char* invertido : {"S", "s", "\xc5\xbf"}) {
         CEItemLista item;
         item.definirCampo("INVERTIDO", invertido);
         terminais.LerLadoIni(item, id(t), antes);
         EXPECT_EQ(item.valorCampo("RELACAO_INI"), "-K1:A1") << invertido;
         EXPECT_FALSE(item.temCampo("RELACAO_FIM")) << invertido;
     }
-    for (const char* reto : {"SS", "N", " S", ""}) {
+    for (const char* reto : {"SS", "N", " S", "", "\xc3\x9f", "\xc5\xa0", "t"}) {
         CEItemLista item;
         item.definirCampo("INVERTIDO", reto);
         terminais.LerLadoIni(item, id(t), antes);
@@ -818,6 +854,50 @@ TEST_F(ConnectionQueriesTest, CoresOfACableTakeItsNumberAndFollowItsChange) {
     // A record without a cable number: the core has none either.
     registro->setXData("KVR_ZV_ATT_VIRTUAL", zvsample::XDataItems().text("COR\fAZUL\fN").tags());
     EXPECT_EQ(r->NumeroDoFio(id(um)), "");
+}
+
+// The core is the first part of the core's first text when that text has one or two parts
+// (empty ones skipped), else nothing; the first two items must be texts, and the records
+// are the text items after them, the first with a cable number giving it.
+TEST_F(ConnectionQueriesTest, ACoresNumberTakesItsCoreFromItsFirstTextAndItsCableFromTheRecords) {
+    const std::string caminho[] = {"ZV_CABOS"};
+    zvdb::Dictionary* cabos = db().dictionaryAt(caminho, true);
+    zvdb::XRecord* registro = cabos->getOrCreateXRecord("W3");
+    registro->setXData("KVR_ZV_ATT_VIRTUAL", zvsample::XDataItems().text("CABO\fW3\fN").tags());
+    zvdb::XRecord* semNumero = cabos->getOrCreateXRecord("W4");
+    semNumero->setXData("KVR_ZV_ATT_VIRTUAL", zvsample::XDataItems().text("COR\fAZUL\fN").tags());
+    const std::string h = ZVString::DeHandle(registro->handle()).toStdString();
+    const std::string sem = ZVString::DeHandle(semNumero->handle()).toStdString();
+    // Items by code: texts (1000), 32-bit integers (1071) and points (1010, its x y z).
+    using Itens = std::vector<std::pair<int, std::string>>;
+    const std::vector<std::pair<Itens, QString>> casos = {
+        {{{1000, "7\f20101"}, {1000, h}, {1000, h}}, "W3\f7"},
+        {{{1000, "7"}, {1000, "x"}, {1000, h}}, "W3\f7"},
+        {{{1000, "\f7\f\f"}, {1000, h}, {1000, h}}, "W3\f7"},
+        {{{1000, "\xce\xa9\f1"}, {1000, h}, {1000, h}}, QString::fromUtf8("W3\f\xce\xa9")},
+        {{{1000, "7\f8\f9"}, {1000, h}, {1000, h}}, "W3\f"},
+        {{{1000, ""}, {1000, h}, {1000, h}}, "W3\f"},
+        {{{1000, "7"}, {1000, h}}, ""},
+        {{{1010, ""}, {1000, h}, {1000, h}}, ""},
+        {{{1000, "7"}, {1071, "5"}, {1000, h}}, ""},
+        // Past records that name nothing or no cable number, and items that are no texts.
+        {{{1000, "7"}, {1000, h}, {1000, "FFFFF"}, {1071, "3"}, {1000, sem}, {1000, h}}, "W3\f7"},
+        {{{1000, "7"}, {1000, h}, {1010, ""}, {1000, sem}}, ""},
+    };
+    for (const auto& [itens, esperado] : casos) {
+        zvsample::XDataItems xdata;
+        for (const auto& [codigo, texto] : itens) {
+            if (codigo == 1010)
+                xdata.point({1, 2, 3});
+            else
+                xdata.add(codigo, texto);
+        }
+        zvdb::Polyline* nucleo = db().modelSpace()->addLwPolyline({{0, 0, 0}, {9, 0, 0}}, false);
+        nucleo->setXData("KVR_ZV_CABO", xdata.tags());
+        auto r = leitor();
+        EXPECT_EQ(r->NumeroDoFio(id(nucleo)), esperado) << itens.front().second;
+        EXPECT_FALSE(r->EhFioNumerado(id(nucleo)));
+    }
 }
 
 // The record's texts are split as its virtual attributes are: the first of three fields
