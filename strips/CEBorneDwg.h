@@ -31,7 +31,7 @@ public:
     // The terminals of the item's jumper links, when they are in the drawing.
     CEBorneDwg* proximo = nullptr;
     CEBorneDwg* anterior = nullptr;
-    // The values of the item's side connections (LIG_...), in field order: the symbols wired
-    // to the terminal place it by them.
-    std::vector<QString> ligacoes;
+    // The values of the item's side connections (LIG_...), in field order, where the item
+    // holds them: the symbols wired to the terminal place it by them while the model is built.
+    std::vector<const QString*> ligacoes;
 };

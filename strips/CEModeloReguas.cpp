@@ -93,9 +93,10 @@ int PrefixoDoNome(std::uint32_t numero) {
 
 // The item's values under the names, ascending: a terminal holds many fields and few side
 // connections, so each name is looked for from where the one before stood. They are
-// gathered in `achados` first, so that each terminal's array is made once, to measure.
+// gathered in `achados` first, so that each terminal's array is made once, to measure. The
+// values stay in the item: a copy would touch each text's own memory, away from the item's.
 void LeLigacoes(const CEItemLista& item, const std::vector<std::uint32_t>& nomes,
-                std::vector<const QString*>& achados, std::vector<QString>& valores) {
+                std::vector<const QString*>& achados, std::vector<const QString*>& valores) {
     const std::vector<CamposItem::Campo>& campos = item.campos.todos();
     achados.clear();
     auto lugar = campos.begin();
@@ -106,9 +107,7 @@ void LeLigacoes(const CEItemLista& item, const std::vector<std::uint32_t>& nomes
         if (lugar == campos.end()) break;
         if (lugar->nome == nome) achados.push_back(&lugar->valor);
     }
-    valores.reserve(valores.size() + achados.size());
-    for (const QString* valor : achados)
-        valores.push_back(*valor);
+    valores.assign(achados.begin(), achados.end());
 }
 
 }  // namespace
@@ -257,8 +256,10 @@ std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& sim
         for (CEItemDwg* ligado : simbolo.ligados) {
             auto* borne = static_cast<CEBorneDwg*>(ligado);
             if (std::find(ordem.begin(), ordem.end(), borne) != ordem.end()) continue;
-            const std::vector<QString>& seus = borne->ligacoes;
-            if (std::find(seus.begin(), seus.end(), valor) == seus.end()) continue;
+            const std::vector<const QString*>& seus = borne->ligacoes;
+            if (std::none_of(seus.begin(), seus.end(),
+                             [&valor](const QString* seu) { return *seu == valor; }))
+                continue;
             ordem.push_back(borne);
             break;
         }
