@@ -95,17 +95,20 @@ OdDbObjectId CCBorneDwgWriter::Insere(const Bloco& bloco, const QString& layer, 
     return insercoes_.Insere(bloco.arquivo, bloco.nome, layer, x, y);
 }
 
+CCBorneDwgWriter::CampoDaCelula CCBorneDwgWriter::Celula(const QString& tag,
+                                                         const QString& padrao) {
+    // A VARIAVEL cell names the field in its default text; any other is the field of its tag.
+    const bool variavel = ComecaCom(tag, "VARIAVEL", "VARIABLE");
+    return CampoDaCelula{variavel, CECampoPorNumero::De(variavel ? padrao : tag)};
+}
+
 OdDbObjectId CCBorneDwgWriter::InserePreenchido(const Bloco& bloco, const QString& layer, double x,
                                                 double y, const CEItemLista& item) {
-    // A VARIAVEL cell names the field in its default text; any other is the field of its tag.
-    const auto celula = [](const QString& tag, const QString& padrao) {
-        const bool variavel = ComecaCom(tag, "VARIAVEL", "VARIABLE");
-        return CampoDaCelula{variavel, CECampoPorNumero::De(variavel ? padrao : tag)};
-    };
     celulas_.Inicia(bloco.nome);
+    // Two pointers: the function holds them in place, with no allocation per block.
     return preenchidos_.Insere(bloco.arquivo, bloco.nome, layer, x, y, item,
-                               [this, &item, &celula](const QString& tag, const QString& padrao) {
-                                   CampoDaCelula& esta = celulas_.Proxima(tag, padrao, celula);
+                               [this, &item](const QString& tag, const QString& padrao) {
+                                   CampoDaCelula& esta = celulas_.Proxima(tag, padrao, &Celula);
                                    return std::optional<QString>(
                                        esta.campo.Valor(item.campos, esta.variavel ? padrao : tag));
                                });
