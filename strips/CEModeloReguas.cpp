@@ -112,6 +112,15 @@ void LeLigacoes(const CEItemLista& item, const std::vector<std::uint32_t>& nomes
 
 }  // namespace
 
+struct CEModeloReguas::Rascunho {
+    // The names of a symbol's connections, ascending.
+    std::vector<std::uint32_t> nomesSimbolo;
+    // One symbol's connections as found, by language; then by suffix; then its terminals.
+    std::vector<std::pair<int, const CamposItem::Campo*>> achados;
+    std::vector<std::pair<QStringRef, const QString*>> ligacoes;
+    std::vector<CEBorneDwg*> ordem;
+};
+
 CEModeloReguas::Parametros CEModeloReguas::Parametros::DoModelo(CETemplate& modelo) {
     Parametros p;
     p.bornesPorRegua = modelo.LerInteiro("*BORNE_PAGINA_GRX*");
@@ -165,10 +174,17 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
     // By strip, then number, in the three languages; Spanish shares the Portuguese number
     // field, which a second time would never decide a comparison.
     terminais.ordenar(Presentes({"REGUA", "STRIP", "REGLETA", "NUMERO", "NUMBER"}));
-    // The names of side connections: each terminal's values are read as it is built.
+    // The names of side connections: each terminal's values are read as it is built; and
+    // those of a symbol's connections, read as the strips are put in order.
     std::vector<std::uint32_t> nomesLigacao;
-    for (std::uint32_t nome = 0; nome < CamposItem::quantidadeNomes(); ++nome)
-        if (PrefixoDoNome(nome) == kLigacoesDoBorne) nomesLigacao.push_back(nome);
+    Rascunho rascunho;
+    for (std::uint32_t nome = 0; nome < CamposItem::quantidadeNomes(); ++nome) {
+        const int prefixo = PrefixoDoNome(nome);
+        if (prefixo == kLigacoesDoBorne)
+            nomesLigacao.push_back(nome);
+        else if (prefixo != kSemPrefixo)
+            rascunho.nomesSimbolo.push_back(nome);
+    }
     std::vector<const QString*> ligacoesAchadas;
     TabelaChaves<QString, CEReguaDwg*> reguaPorNome;
     CEReguaDwg* ultima = nullptr;
@@ -222,21 +238,29 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
         borne.anterior = busca(borne.item->anterior);
     }
     for (const auto& regua : reguas)
-        OrdenaPorSimbolos(*regua);
+        OrdenaPorSimbolos(*regua, rascunho);
 }
 
-std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& simbolo) const {
-    // The symbol's connections by suffix: LIGACAO_1, CONNECTION_2... One pass over its
-    // fields finds them with their languages.
-    std::vector<std::pair<int, const CamposItem::Campo*>> achados;
-    for (const CamposItem::Campo& campo : simbolo.item->campos.todos()) {
-        const int p = PrefixoDoNome(campo.nome);
-        if (p >= 0 && p < kLigacoesDoBorne) achados.emplace_back(p, &campo);
+void CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& simbolo, Rascunho& rascunho) const {
+    // The symbol's connections by suffix: LIGACAO_1, CONNECTION_2... A symbol holds many
+    // fields and few connections: each name is looked for from where the one before stood,
+    // and found with its language.
+    std::vector<std::pair<int, const CamposItem::Campo*>>& achados = rascunho.achados;
+    achados.clear();
+    const std::vector<CamposItem::Campo>& campos = simbolo.item->campos.todos();
+    auto lugar = campos.begin();
+    for (const std::uint32_t nome : rascunho.nomesSimbolo) {
+        lugar = std::lower_bound(
+            lugar, campos.end(), nome,
+            [](const CamposItem::Campo& c, std::uint32_t n) { return c.nome < n; });
+        if (lugar == campos.end()) break;
+        if (lugar->nome == nome) achados.emplace_back(PrefixoDoNome(nome), &*lugar);
     }
     // A suffix given in two languages keeps the first language's value; the connections go
     // in the order of their suffixes. A symbol has few: small arrays do, with the suffixes
     // read in place in the names.
-    std::vector<std::pair<QStringRef, const QString*>> ligacoes;
+    std::vector<std::pair<QStringRef, const QString*>>& ligacoes = rascunho.ligacoes;
+    ligacoes.clear();
     for (int p = 0; p < kLigacoesDoBorne; ++p)
         for (const auto& [idioma, campo] : achados) {
             if (idioma != p) continue;
@@ -250,7 +274,8 @@ std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& sim
               [](const auto& a, const auto& b) { return a.first < b.first; });
     // Each connection takes the first terminal wired to the symbol, in the symbol's own
     // order, that has the connection's value on a side and is not taken yet.
-    std::vector<CEBorneDwg*> ordem;
+    std::vector<CEBorneDwg*>& ordem = rascunho.ordem;
+    ordem.clear();
     for (const auto& ligacao : ligacoes) {
         const QString& valor = *ligacao.second;
         for (CEItemDwg* ligado : simbolo.ligados) {
@@ -264,7 +289,6 @@ std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& sim
             break;
         }
     }
-    return ordem;
 }
 
 namespace {
@@ -292,7 +316,7 @@ private:
 
 }  // namespace
 
-void CEModeloReguas::OrdenaPorSimbolos(CEReguaDwg& regua) {
+void CEModeloReguas::OrdenaPorSimbolos(CEReguaDwg& regua, Rascunho& rascunho) {
     std::vector<CEBorneDwg*> ordem;
     ordem.reserve(regua.bornes.size());
     // Which of the strip's terminals are placed, and which symbols wired to it placed theirs.
@@ -305,7 +329,8 @@ void CEModeloReguas::OrdenaPorSimbolos(CEReguaDwg& regua) {
         for (CEItemDwg* ligado : borne->ligados) {
             if (!tratados.Marca(ligado)) continue;
             auto* simbolo = static_cast<CESimboloDwg*>(ligado);
-            for (CEBorneDwg* irmao : BornesDoSimbolo(*simbolo))
+            BornesDoSimbolo(*simbolo, rascunho);
+            for (CEBorneDwg* irmao : rascunho.ordem)
                 if (irmao->regua == &regua && colocados.Marca(irmao)) ordem.push_back(irmao);
         }
         // A terminal its symbols did not place keeps its turn: none is lost.
