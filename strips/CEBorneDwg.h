@@ -31,7 +31,9 @@ public:
     // The terminals of the item's jumper links, when they are in the drawing.
     CEBorneDwg* proximo = nullptr;
     CEBorneDwg* anterior = nullptr;
-    // The values of the item's side connections (LIG_...), in field order, where the item
-    // holds them: the symbols wired to the terminal place it by them while the model is built.
-    std::vector<const QString*> ligacoes;
+    // The values of the item's side connections (LIG_...), in field order: the symbols wired
+    // to the terminal place it by them while the model is built. They stand in one array of
+    // the model, from `ligacoesInicio` on, and stay where the item holds them.
+    std::uint32_t ligacoesInicio = 0;
+    std::uint32_t ligacoesQuantas = 0;
 };

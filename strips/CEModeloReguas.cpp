@@ -91,23 +91,20 @@ int PrefixoDoNome(std::uint32_t numero) {
     return prefixo;
 }
 
-// The item's values under the names, ascending: a terminal holds many fields and few side
-// connections, so each name is looked for from where the one before stood. They are
-// gathered in `achados` first, so that each terminal's array is made once, to measure. The
+// Appends the item's values under the names, ascending: a terminal holds many fields and
+// few side connections, so each name is looked for from where the one before stood. The
 // values stay in the item: a copy would touch each text's own memory, away from the item's.
 void LeLigacoes(const CEItemLista& item, const std::vector<std::uint32_t>& nomes,
-                std::vector<const QString*>& achados, std::vector<const QString*>& valores) {
+                std::vector<const QString*>& valores) {
     const std::vector<CamposItem::Campo>& campos = item.campos.todos();
-    achados.clear();
     auto lugar = campos.begin();
     for (const std::uint32_t nome : nomes) {
         lugar = std::lower_bound(
             lugar, campos.end(), nome,
             [](const CamposItem::Campo& c, std::uint32_t n) { return c.nome < n; });
         if (lugar == campos.end()) break;
-        if (lugar->nome == nome) achados.push_back(&lugar->valor);
+        if (lugar->nome == nome) valores.push_back(&lugar->valor);
     }
-    valores.assign(achados.begin(), achados.end());
 }
 
 }  // namespace
@@ -185,7 +182,6 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
         else if (prefixo != kSemPrefixo)
             rascunho.nomesSimbolo.push_back(nome);
     }
-    std::vector<const QString*> ligacoesAchadas;
     TabelaChaves<QString, CEReguaDwg*> reguaPorNome;
     CEReguaDwg* ultima = nullptr;
     bornesPorChave.reserve(terminais.size());
@@ -226,7 +222,9 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
             borne->ligados.push_back(doLado[i]);
             doLado[i]->Liga(borne);
         }
-        LeLigacoes(*item, nomesLigacao, ligacoesAchadas, borne->ligacoes);
+        borne->ligacoesInicio = std::uint32_t(ligacoes_.size());
+        LeLigacoes(*item, nomesLigacao, ligacoes_);
+        borne->ligacoesQuantas = std::uint32_t(ligacoes_.size()) - borne->ligacoesInicio;
     }
     // Jumper links by strip and number, so a duplicate's link lands on the terminal kept.
     auto busca = [this](const CEItemLista* ligado) -> CEBorneDwg* {
@@ -281,8 +279,8 @@ void CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& simbolo, Rascunho& rasc
         for (CEItemDwg* ligado : simbolo.ligados) {
             auto* borne = static_cast<CEBorneDwg*>(ligado);
             if (std::find(ordem.begin(), ordem.end(), borne) != ordem.end()) continue;
-            const std::vector<const QString*>& seus = borne->ligacoes;
-            if (std::none_of(seus.begin(), seus.end(),
+            const auto seus = ligacoes_.begin() + std::ptrdiff_t(borne->ligacoesInicio);
+            if (std::none_of(seus, seus + std::ptrdiff_t(borne->ligacoesQuantas),
                              [&valor](const QString* seu) { return *seu == valor; }))
                 continue;
             ordem.push_back(borne);
