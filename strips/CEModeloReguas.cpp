@@ -226,14 +226,21 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
         LeLigacoes(*item, nomesLigacao, ligacoes_);
         borne->ligacoesQuantas = std::uint32_t(ligacoes_.size()) - borne->ligacoesInicio;
     }
-    // Jumper links by strip and number, so a duplicate's link lands on the terminal kept.
-    auto busca = [this](const CEItemLista* ligado) -> CEBorneDwg* {
+    // Jumper links by strip and number, so a duplicate's link lands on the terminal kept. A
+    // link mostly goes to the terminal made just before or after, whose item is its own: that
+    // one is asked first, without reading the linked item's fields.
+    auto busca = [this](const CEItemLista* ligado, CEBorneDwg* vizinho) -> CEBorneDwg* {
         if (!ligado) return nullptr;
+        if (vizinho && vizinho->item == ligado) return vizinho;
         return Borne(CCBorneDataReader::Regua(*ligado), CCBorneDataReader::Numero(*ligado));
     };
-    for (CEBorneDwg& borne : bornes) {
-        borne.proximo = busca(borne.item->proximo);
-        borne.anterior = busca(borne.item->anterior);
+    CEBorneDwg* antes = nullptr;
+    for (auto borne = bornes.begin(); borne != bornes.end(); ++borne) {
+        const auto seguinte = std::next(borne);
+        borne->proximo =
+            busca(borne->item->proximo, seguinte != bornes.end() ? &*seguinte : nullptr);
+        borne->anterior = busca(borne->item->anterior, antes);
+        antes = &*borne;
     }
     for (const auto& regua : reguas)
         OrdenaPorSimbolos(*regua, rascunho);

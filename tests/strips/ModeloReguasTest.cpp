@@ -271,6 +271,29 @@ TEST_F(ModeloReguasTest, AChainBeginsPassesGoesThroughAndEnds) {
     EXPECT_EQ(modelo.Borne("X1", "4")->anterior, modelo.Borne("X1", "2"));
 }
 
+// Links go to the terminal next door or further on, either way, and a link to the second
+// item of a number lands on the terminal kept for it.
+TEST_F(ModeloReguasTest, JumperLinksFindTheirTerminalsNearOrFarAndThroughASecondItemOfANumber) {
+    auto x1 = itens_.Regua("X1", 4);
+    CEItemLista* outro2 = itens_.Borne("X1", "2");
+    x1[0]->proximo = outro2;
+    x1[1]->proximo = outro2->proximo = x1[3];
+    x1[3]->anterior = outro2;
+    x1[2]->anterior = x1[1];
+    CEModeloReguas& modelo = Modelo();
+    ASSERT_EQ(modelo.bornes.size(), 4u);
+    CEBorneDwg* const b1 = modelo.Borne("X1", "1");
+    CEBorneDwg* const b2 = modelo.Borne("X1", "2");
+    CEBorneDwg* const b3 = modelo.Borne("X1", "3");
+    CEBorneDwg* const b4 = modelo.Borne("X1", "4");
+    EXPECT_EQ(b1->proximo, b2);
+    EXPECT_EQ(b2->proximo, b4);
+    EXPECT_EQ(b4->anterior, b2);
+    EXPECT_EQ(b3->anterior, b2);
+    EXPECT_EQ(b1->anterior, nullptr);
+    EXPECT_EQ(b3->proximo, nullptr);
+}
+
 TEST_F(ModeloReguasTest, ChainsThatOverlapOrCrossTakeTheNextTrack) {
     auto x1 = itens_.Regua("X1", 6);
     ItensRegua::Jumper({x1[0], x1[2]});
