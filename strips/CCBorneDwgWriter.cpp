@@ -23,6 +23,18 @@ bool ComecaCom(const QString& tag, const char* a, const char* b) {
            tag.startsWith(QLatin1String(b), Qt::CaseInsensitive);
 }
 
+// A text in UTF-8. A handle is a few hex digits: its bytes are its units, made in place
+// without a byte array of Qt's in between.
+std::string Utf8(const QString& texto) {
+    std::string feito;
+    feito.reserve(size_t(texto.size()));
+    for (const QChar unidade : texto) {
+        if (unidade.unicode() >= 0x80) return texto.toStdString();
+        feito.push_back(char(unidade.unicode()));
+    }
+    return feito;
+}
+
 CCBorneDwgWriter::Bloco Configurado(const QString& valor, const QString& prefixo,
                                     const QString& pasta) {
     if (valor.isEmpty()) return {};
@@ -169,7 +181,7 @@ void CCBorneDwgWriter::DesenhaRegua(CEReguaDwg& regua, const QString& layer) {
                                                       regua.y - entreBornes_, *simbolo->item);
             if (!ref.isNull()) {
                 const QString* handle = simbolo->item->campos.procura(NumeroCampo<"HANDLE">());
-                const std::string handleUtf8 = handle ? handle->toStdString() : std::string();
+                const std::string handleUtf8 = handle ? Utf8(*handle) : std::string();
                 CICad::SetXDataTextos(ref, "KVR_ZV_REPRESENTACAO",
                                       {representacaoUtf8_, handleUtf8});
             }
