@@ -17,9 +17,20 @@
 template <typename Papel>
 class CECelulasBloco {
 public:
-    // The cells of one placing of the block of that name start here, in their order.
+    CECelulasBloco() = default;
+    // The cells of a block are found by the name kept with them: a copy would find the
+    // other's.
+    CECelulasBloco(const CECelulasBloco&) = delete;
+    CECelulasBloco& operator=(const CECelulasBloco&) = delete;
+
+    // The cells of one placing of the block of that name start here, in their order. A
+    // writer places one block many times in a row under the very same name text: that name
+    // finds its cells without asking the table again.
     void Inicia(const QString& nome) {
-        atual_ = &porBloco_[nome];
+        if (!atual_ || !nome.isSharedWith(nomeAtual_)) {
+            atual_ = &porBloco_[nome];
+            nomeAtual_ = nome;
+        }
         indice_ = 0;
     }
     // What the next cell is: the kept answer when its texts are the ones seen at its place,
@@ -36,6 +47,7 @@ public:
     void Reinicia() {
         porBloco_.clear();
         atual_ = nullptr;
+        nomeAtual_ = QString();
         indice_ = 0;
     }
 
@@ -54,8 +66,10 @@ private:
         Papel papel{};
         bool conhecida = false;
     };
+    // Each block's cells; the table's entries stay where they are as others are added.
     QHash<QString, std::vector<Celula>> porBloco_;
     std::vector<Celula>* atual_ = nullptr;
+    QString nomeAtual_;  // the name atual_ was found by
     std::size_t indice_ = 0;
 };
 

@@ -492,10 +492,23 @@ void EstendeCadeia(VetorItens& cadeia) {
     }
 }
 
+// The names a chain is sorted by, less those that can never decide a comparison: a name
+// no item holds reads empty for all, and a name given twice is equal the second time. The
+// sort then makes the very same moves without their tables. When none is held, all stay.
+QStringList OrdemDaCadeia() {
+    static const QStringList kOrdem = {"REGUA", "STRIP", "REGLETA", "NUMERO", "NUMBER", "NUMERO"};
+    QStringList presentes;
+    for (const QString& nome : kOrdem)
+        if (!presentes.contains(nome) && CamposItem::numeroSeHouver(nome) != CamposItem::kSemNome)
+            presentes << nome;
+    return presentes.isEmpty() ? kOrdem : presentes;
+}
+
 }  // namespace
 
 void CCBorneDataReader::LigaJumpers(VetorItens& itens) {
     const IndiceBornes indice(itens);
+    const QStringList ordem = OrdemDaCadeia();
     std::unordered_set<CEItemLista*> visitados;
     for (std::size_t k = 0; k < itens.size(); ++k) {
         CEItemLista* item = itens[k];
@@ -505,9 +518,7 @@ void CCBorneDataReader::LigaJumpers(VetorItens& itens) {
         if (!visitados.insert(item).second) continue;
         VetorItens cadeia = ColetaJumper(item, indice, visitados);
         EstendeCadeia(cadeia);
-        static const QStringList kOrdem = {"REGUA",  "STRIP",  "REGLETA",
-                                           "NUMERO", "NUMBER", "NUMERO"};
-        cadeia.ordenar(kOrdem);
+        cadeia.ordenar(ordem);
         for (size_t i = 0; i + 1 < cadeia.size(); ++i) {
             cadeia[i]->proximo = cadeia[i + 1];
             cadeia[i + 1]->anterior = cadeia[i];

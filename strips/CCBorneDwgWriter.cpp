@@ -23,6 +23,18 @@ bool ComecaCom(const QString& tag, const char* a, const char* b) {
            tag.startsWith(QLatin1String(b), Qt::CaseInsensitive);
 }
 
+// A text in UTF-8. A handle is a few hex digits: its bytes are its units, made in place
+// without a byte array of Qt's in between.
+std::string Utf8(const QString& texto) {
+    std::string feito;
+    feito.reserve(size_t(texto.size()));
+    for (const QChar unidade : texto) {
+        if (unidade.unicode() >= 0x80) return texto.toStdString();
+        feito.push_back(char(unidade.unicode()));
+    }
+    return feito;
+}
+
 CCBorneDwgWriter::Bloco Configurado(const QString& valor, const QString& prefixo,
                                     const QString& pasta) {
     if (valor.isEmpty()) return {};
@@ -95,17 +107,20 @@ OdDbObjectId CCBorneDwgWriter::Insere(const Bloco& bloco, const QString& layer, 
     return insercoes_.Insere(bloco.arquivo, bloco.nome, layer, x, y);
 }
 
+CCBorneDwgWriter::CampoDaCelula CCBorneDwgWriter::Celula(const QString& tag,
+                                                         const QString& padrao) {
+    // A VARIAVEL cell names the field in its default text; any other is the field of its tag.
+    const bool variavel = ComecaCom(tag, "VARIAVEL", "VARIABLE");
+    return CampoDaCelula{variavel, CECampoPorNumero::De(variavel ? padrao : tag)};
+}
+
 OdDbObjectId CCBorneDwgWriter::InserePreenchido(const Bloco& bloco, const QString& layer, double x,
                                                 double y, const CEItemLista& item) {
-    // A VARIAVEL cell names the field in its default text; any other is the field of its tag.
-    const auto celula = [](const QString& tag, const QString& padrao) {
-        const bool variavel = ComecaCom(tag, "VARIAVEL", "VARIABLE");
-        return CampoDaCelula{variavel, CECampoPorNumero::De(variavel ? padrao : tag)};
-    };
     celulas_.Inicia(bloco.nome);
+    // Two pointers: the function holds them in place, with no allocation per block.
     return preenchidos_.Insere(bloco.arquivo, bloco.nome, layer, x, y, item,
-                               [this, &item, &celula](const QString& tag, const QString& padrao) {
-                                   CampoDaCelula& esta = celulas_.Proxima(tag, padrao, celula);
+                               [this, &item](const QString& tag, const QString& padrao) {
+                                   CampoDaCelula& esta = celulas_.Proxima(tag, padrao, &Celula);
                                    return std::optional<QString>(
                                        esta.campo.Valor(item.campos, esta.variavel ? padrao : tag));
                                });
@@ -166,7 +181,7 @@ void CCBorneDwgWriter::DesenhaRegua(CEReguaDwg& regua, const QString& layer) {
                                                       regua.y - entreBornes_, *simbolo->item);
             if (!ref.isNull()) {
                 const QString* handle = simbolo->item->campos.procura(NumeroCampo<"HANDLE">());
-                const std::string handleUtf8 = handle ? handle->toStdString() : std::string();
+                const std::string handleUtf8 = handle ? Utf8(*handle) : std::string();
                 CICad::SetXDataTextos(ref, "KVR_ZV_REPRESENTACAO",
                                       {representacaoUtf8_, handleUtf8});
             }

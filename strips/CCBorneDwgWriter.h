@@ -72,6 +72,7 @@ private:
         bool variavel = false;
         CECampoPorNumero campo;
     };
+    static CampoDaCelula Celula(const QString& tag, const QString& padrao);
     CECelulasBloco<CampoDaCelula> celulas_;
     QString prefixo_;
     QString pastaRede_;

@@ -32,6 +32,8 @@ public:
     CEBorneDwg* proximo = nullptr;
     CEBorneDwg* anterior = nullptr;
     // The values of the item's side connections (LIG_...), in field order: the symbols wired
-    // to the terminal place it by them.
-    std::vector<QString> ligacoes;
+    // to the terminal place it by them while the model is built. They stand in one array of
+    // the model, from `ligacoesInicio` on, and stay where the item holds them.
+    std::uint32_t ligacoesInicio = 0;
+    std::uint32_t ligacoesQuantas = 0;
 };

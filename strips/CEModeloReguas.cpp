@@ -91,27 +91,32 @@ int PrefixoDoNome(std::uint32_t numero) {
     return prefixo;
 }
 
-// The item's values under the names, ascending: a terminal holds many fields and few side
-// connections, so each name is looked for from where the one before stood. They are
-// gathered in `achados` first, so that each terminal's array is made once, to measure.
+// Appends the item's values under the names, ascending: a terminal holds many fields and
+// few side connections, so each name is looked for from where the one before stood. The
+// values stay in the item: a copy would touch each text's own memory, away from the item's.
 void LeLigacoes(const CEItemLista& item, const std::vector<std::uint32_t>& nomes,
-                std::vector<const QString*>& achados, std::vector<QString>& valores) {
+                std::vector<const QString*>& valores) {
     const std::vector<CamposItem::Campo>& campos = item.campos.todos();
-    achados.clear();
     auto lugar = campos.begin();
     for (const std::uint32_t nome : nomes) {
         lugar = std::lower_bound(
             lugar, campos.end(), nome,
             [](const CamposItem::Campo& c, std::uint32_t n) { return c.nome < n; });
         if (lugar == campos.end()) break;
-        if (lugar->nome == nome) achados.push_back(&lugar->valor);
+        if (lugar->nome == nome) valores.push_back(&lugar->valor);
     }
-    valores.reserve(valores.size() + achados.size());
-    for (const QString* valor : achados)
-        valores.push_back(*valor);
 }
 
 }  // namespace
+
+struct CEModeloReguas::Rascunho {
+    // The names of a symbol's connections, ascending.
+    std::vector<std::uint32_t> nomesSimbolo;
+    // One symbol's connections as found, by language; then by suffix; then its terminals.
+    std::vector<std::pair<int, const CamposItem::Campo*>> achados;
+    std::vector<std::pair<QStringRef, const QString*>> ligacoes;
+    std::vector<CEBorneDwg*> ordem;
+};
 
 CEModeloReguas::Parametros CEModeloReguas::Parametros::DoModelo(CETemplate& modelo) {
     Parametros p;
@@ -166,11 +171,17 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
     // By strip, then number, in the three languages; Spanish shares the Portuguese number
     // field, which a second time would never decide a comparison.
     terminais.ordenar(Presentes({"REGUA", "STRIP", "REGLETA", "NUMERO", "NUMBER"}));
-    // The names of side connections: each terminal's values are read as it is built.
+    // The names of side connections: each terminal's values are read as it is built; and
+    // those of a symbol's connections, read as the strips are put in order.
     std::vector<std::uint32_t> nomesLigacao;
-    for (std::uint32_t nome = 0; nome < CamposItem::quantidadeNomes(); ++nome)
-        if (PrefixoDoNome(nome) == kLigacoesDoBorne) nomesLigacao.push_back(nome);
-    std::vector<const QString*> ligacoesAchadas;
+    Rascunho rascunho;
+    for (std::uint32_t nome = 0; nome < CamposItem::quantidadeNomes(); ++nome) {
+        const int prefixo = PrefixoDoNome(nome);
+        if (prefixo == kLigacoesDoBorne)
+            nomesLigacao.push_back(nome);
+        else if (prefixo != kSemPrefixo)
+            rascunho.nomesSimbolo.push_back(nome);
+    }
     TabelaChaves<QString, CEReguaDwg*> reguaPorNome;
     CEReguaDwg* ultima = nullptr;
     bornesPorChave.reserve(terminais.size());
@@ -211,33 +222,50 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
             borne->ligados.push_back(doLado[i]);
             doLado[i]->Liga(borne);
         }
-        LeLigacoes(*item, nomesLigacao, ligacoesAchadas, borne->ligacoes);
+        borne->ligacoesInicio = std::uint32_t(ligacoes_.size());
+        LeLigacoes(*item, nomesLigacao, ligacoes_);
+        borne->ligacoesQuantas = std::uint32_t(ligacoes_.size()) - borne->ligacoesInicio;
     }
-    // Jumper links by strip and number, so a duplicate's link lands on the terminal kept.
-    auto busca = [this](const CEItemLista* ligado) -> CEBorneDwg* {
+    // Jumper links by strip and number, so a duplicate's link lands on the terminal kept. A
+    // link mostly goes to the terminal made just before or after, whose item is its own: that
+    // one is asked first, without reading the linked item's fields.
+    auto busca = [this](const CEItemLista* ligado, CEBorneDwg* vizinho) -> CEBorneDwg* {
         if (!ligado) return nullptr;
+        if (vizinho && vizinho->item == ligado) return vizinho;
         return Borne(CCBorneDataReader::Regua(*ligado), CCBorneDataReader::Numero(*ligado));
     };
-    for (CEBorneDwg& borne : bornes) {
-        borne.proximo = busca(borne.item->proximo);
-        borne.anterior = busca(borne.item->anterior);
+    CEBorneDwg* antes = nullptr;
+    for (auto borne = bornes.begin(); borne != bornes.end(); ++borne) {
+        const auto seguinte = std::next(borne);
+        borne->proximo =
+            busca(borne->item->proximo, seguinte != bornes.end() ? &*seguinte : nullptr);
+        borne->anterior = busca(borne->item->anterior, antes);
+        antes = &*borne;
     }
     for (const auto& regua : reguas)
-        OrdenaPorSimbolos(*regua);
+        OrdenaPorSimbolos(*regua, rascunho);
 }
 
-std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& simbolo) const {
-    // The symbol's connections by suffix: LIGACAO_1, CONNECTION_2... One pass over its
-    // fields finds them with their languages.
-    std::vector<std::pair<int, const CamposItem::Campo*>> achados;
-    for (const CamposItem::Campo& campo : simbolo.item->campos.todos()) {
-        const int p = PrefixoDoNome(campo.nome);
-        if (p >= 0 && p < kLigacoesDoBorne) achados.emplace_back(p, &campo);
+void CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& simbolo, Rascunho& rascunho) const {
+    // The symbol's connections by suffix: LIGACAO_1, CONNECTION_2... A symbol holds many
+    // fields and few connections: each name is looked for from where the one before stood,
+    // and found with its language.
+    std::vector<std::pair<int, const CamposItem::Campo*>>& achados = rascunho.achados;
+    achados.clear();
+    const std::vector<CamposItem::Campo>& campos = simbolo.item->campos.todos();
+    auto lugar = campos.begin();
+    for (const std::uint32_t nome : rascunho.nomesSimbolo) {
+        lugar = std::lower_bound(
+            lugar, campos.end(), nome,
+            [](const CamposItem::Campo& c, std::uint32_t n) { return c.nome < n; });
+        if (lugar == campos.end()) break;
+        if (lugar->nome == nome) achados.emplace_back(PrefixoDoNome(nome), &*lugar);
     }
     // A suffix given in two languages keeps the first language's value; the connections go
     // in the order of their suffixes. A symbol has few: small arrays do, with the suffixes
     // read in place in the names.
-    std::vector<std::pair<QStringRef, const QString*>> ligacoes;
+    std::vector<std::pair<QStringRef, const QString*>>& ligacoes = rascunho.ligacoes;
+    ligacoes.clear();
     for (int p = 0; p < kLigacoesDoBorne; ++p)
         for (const auto& [idioma, campo] : achados) {
             if (idioma != p) continue;
@@ -251,19 +279,21 @@ std::vector<CEBorneDwg*> CEModeloReguas::BornesDoSimbolo(const CESimboloDwg& sim
               [](const auto& a, const auto& b) { return a.first < b.first; });
     // Each connection takes the first terminal wired to the symbol, in the symbol's own
     // order, that has the connection's value on a side and is not taken yet.
-    std::vector<CEBorneDwg*> ordem;
+    std::vector<CEBorneDwg*>& ordem = rascunho.ordem;
+    ordem.clear();
     for (const auto& ligacao : ligacoes) {
         const QString& valor = *ligacao.second;
         for (CEItemDwg* ligado : simbolo.ligados) {
             auto* borne = static_cast<CEBorneDwg*>(ligado);
             if (std::find(ordem.begin(), ordem.end(), borne) != ordem.end()) continue;
-            const std::vector<QString>& seus = borne->ligacoes;
-            if (std::find(seus.begin(), seus.end(), valor) == seus.end()) continue;
+            const auto seus = ligacoes_.begin() + std::ptrdiff_t(borne->ligacoesInicio);
+            if (std::none_of(seus, seus + std::ptrdiff_t(borne->ligacoesQuantas),
+                             [&valor](const QString* seu) { return *seu == valor; }))
+                continue;
             ordem.push_back(borne);
             break;
         }
     }
-    return ordem;
 }
 
 namespace {
@@ -291,7 +321,7 @@ private:
 
 }  // namespace
 
-void CEModeloReguas::OrdenaPorSimbolos(CEReguaDwg& regua) {
+void CEModeloReguas::OrdenaPorSimbolos(CEReguaDwg& regua, Rascunho& rascunho) {
     std::vector<CEBorneDwg*> ordem;
     ordem.reserve(regua.bornes.size());
     // Which of the strip's terminals are placed, and which symbols wired to it placed theirs.
@@ -304,7 +334,8 @@ void CEModeloReguas::OrdenaPorSimbolos(CEReguaDwg& regua) {
         for (CEItemDwg* ligado : borne->ligados) {
             if (!tratados.Marca(ligado)) continue;
             auto* simbolo = static_cast<CESimboloDwg*>(ligado);
-            for (CEBorneDwg* irmao : BornesDoSimbolo(*simbolo))
+            BornesDoSimbolo(*simbolo, rascunho);
+            for (CEBorneDwg* irmao : rascunho.ordem)
                 if (irmao->regua == &regua && colocados.Marca(irmao)) ordem.push_back(irmao);
         }
         // A terminal its symbols did not place keeps its turn: none is lost.

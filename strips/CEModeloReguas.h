@@ -61,9 +61,14 @@ public:
     std::vector<std::unique_ptr<CEReguaDwg>> reguas;
 
 private:
-    void OrdenaPorSimbolos(CEReguaDwg& regua);
-    // The symbol's terminals in the order of its connections; those that match none drop.
-    std::vector<CEBorneDwg*> BornesDoSimbolo(const CESimboloDwg& simbolo) const;
+    // What ordering the strips by their symbols keeps from one symbol to the next.
+    struct Rascunho;
+    void OrdenaPorSimbolos(CEReguaDwg& regua, Rascunho& rascunho);
+    // The symbol's terminals in the order of its connections, into rascunho.ordem; those that
+    // match none drop.
+    void BornesDoSimbolo(const CESimboloDwg& simbolo, Rascunho& rascunho) const;
+    // The terminals' side connections, each terminal's in a run of its own.
+    std::vector<const QString*> ligacoes_;
     // Where the next piece of a strip begins (the terminal count when no cut is due), and
     // whether the strip ends its page there.
     size_t Corte(const CEReguaDwg& regua, int limite, const std::vector<std::uint32_t>& chaves,

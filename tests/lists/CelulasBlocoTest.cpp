@@ -75,6 +75,39 @@ TEST(CelulasBlocoTest, BlocksPlacedInTurnKeepTheirCellsApartUntilReset) {
     EXPECT_EQ(resolve.vezes, 3);
 }
 
+// A writer places its blocks under the very same name texts, row after row, and new blocks
+// come in between: each name keeps finding its own cells, however the table grows.
+TEST(CelulasBlocoTest, ANameTextPlacedAgainFindsItsOwnCellsWhileOtherBlocksComeAndGo) {
+    CECelulasBloco<QString> celulas;
+    Contador resolve;
+    const QString borne = "BORNE", simbolo = "SIMBOLO", tag = "T", padrao = "x";
+    const QString outroPadrao = "y";
+    celulas.Inicia(borne);
+    EXPECT_EQ(celulas.Proxima(tag, padrao, resolve), "T/x");
+    celulas.Inicia(borne);
+    EXPECT_EQ(celulas.Proxima(tag, padrao, resolve), "T/x");
+    EXPECT_EQ(resolve.vezes, 1);
+    // Many other blocks, each under a name of its own, between two placings of one name.
+    for (int i = 0; i < 200; ++i) {
+        celulas.Inicia(simbolo + QString::number(i));
+        EXPECT_EQ(celulas.Proxima(tag, outroPadrao, resolve), "T/y");
+        celulas.Inicia(borne);
+        EXPECT_EQ(celulas.Proxima(tag, padrao, resolve), "T/x");
+    }
+    EXPECT_EQ(resolve.vezes, 201);
+    // The same name in memory of its own is the same block.
+    celulas.Inicia(Outra(borne));
+    EXPECT_EQ(celulas.Proxima(tag, padrao, resolve), "T/x");
+    celulas.Inicia(simbolo + "7");
+    EXPECT_EQ(celulas.Proxima(tag, outroPadrao, resolve), "T/y");
+    EXPECT_EQ(resolve.vezes, 201);
+    // After a reset the name's cells are worked out anew, under the same text too.
+    celulas.Reinicia();
+    celulas.Inicia(borne);
+    EXPECT_EQ(celulas.Proxima(tag, padrao, resolve), "T/x");
+    EXPECT_EQ(resolve.vezes, 202);
+}
+
 TEST(CelulasBlocoTest, AFieldNameNoItemHadIsFoundOnceAnItemHasIt) {
     const QString nome = "CAMPO_SO_DAS_CELULAS_DE_BLOCO";
     ASSERT_EQ(CamposItem::numeroSeHouver(nome), CamposItem::kSemNome)

@@ -155,6 +155,20 @@ TEST_F(TerminalStepsTest, ChainsFollowJumpersOfJumpersAndOtherLanguages) {
     EXPECT_EQ(b9->proximo, nullptr);
 }
 
+TEST_F(TerminalStepsTest, AChainIsSortedByTheTagsItsTerminalsCarryInTheirLanguage) {
+    // Tagged in English only and made out of order: the chain runs by strip and number.
+    CEItemLista* b10 = borne("X5", "10", "9", "STRIP", "NUMBER");
+    CEItemLista* b9 = borne("X5", "9", "2", "STRIP", "NUMBER");
+    CEItemLista* b2 = borne("X5", "2", "", "STRIP", "NUMBER");
+    CCBorneDataReader::LigaJumpers(vetor_);
+    EXPECT_EQ(b2->anterior, nullptr);
+    EXPECT_EQ(b2->proximo, b9);
+    EXPECT_EQ(b9->anterior, b2);
+    EXPECT_EQ(b9->proximo, b10);
+    EXPECT_EQ(b10->anterior, b9);
+    EXPECT_EQ(b10->proximo, nullptr);
+}
+
 TEST_F(TerminalStepsTest, AJumperToAMissingNumberLinksNothing) {
     CEItemLista* b1 = borne("X1", "1", " 8 ");
     CCBorneDataReader::LigaJumpers(vetor_);

@@ -300,7 +300,8 @@ TEST_F(DesenhoReguasTest, TracksSideBySideAndAJumperAcrossAPageBreak) {
 TEST_F(DesenhoReguasTest, SymbolsStandUnderTheirFirstTerminalAndLinkBackToTheSchematic) {
     CEItemLista* k1 = itens_.Simbolo("2A", "K1", {"13", "14", "A1"});
     k1->definirCampo("ZV_KEY", "1001");
-    CEItemLista* k2 = itens_.Simbolo("2B", "K2", {"1"});
+    // A link is any text, in UTF-8 as the schematic holds it.
+    CEItemLista* k2 = itens_.Simbolo("2B-ção", "K2", {"1"});
     k2->definirCampo("ZV_KEY", "1001");
     // A key without a strip view in the catalogue leaves a gap.
     CEItemLista* k3 = itens_.Simbolo("2C", "K3", {"1"});
@@ -324,7 +325,7 @@ TEST_F(DesenhoReguasTest, SymbolsStandUnderTheirFirstTerminalAndLinkBackToTheSch
             reps << i.rep.join(":");
         }
     EXPECT_EQ(rotulos, QStringList({"K1", "K2"}));
-    EXPECT_EQ(reps, QStringList({"2:2A", "2:2B"}));
+    EXPECT_EQ(reps, QStringList({"2:2A", "2:2B-ção"}));
     EXPECT_EQ(Pontos(todas, "REGUA_BORNE").size(), 6);
     EXPECT_TRUE(Pontos(todas, "REGUA_COMP").isEmpty());
 }

@@ -240,6 +240,26 @@ TEST_F(ModeloReguasTest, SideConnectionsAreFoundAmongManyFieldsWhateverTheirName
     EXPECT_EQ(Reguas(Modelo()), QStringList({"X1: 3 1 2"}));
 }
 
+// A symbol's connections are found among many other fields, in each language, under
+// names made before and after the others, and names that only other symbols hold are passed.
+TEST_F(ModeloReguasTest, SymbolConnectionsAreFoundAmongManyFieldsWhateverTheirNames) {
+    CEItemLista* k1 = itens_.Simbolo("A1", "K1", {"A"});
+    CEItemLista* k2 = itens_.Simbolo("A2", "K2");
+    for (int i = 0; i < 40; ++i) {
+        k1->definirCampo(QString("CAMPO_%1_SIMBOLO").arg(i), QString::number(i));
+        k2->definirCampo(QString("CONNECTION_%1").arg(i + 2), QString("K2_%1").arg(i));
+    }
+    k1->definirCampo("CONNECTION_0", "C");
+    k1->definirCampo("LIGACAO_Z9_SO_DESTE_TESTE", "B");
+    auto x1 = itens_.Regua("X1", 4);
+    ItensRegua::Liga(x1[0], "INI", k1, "B");
+    ItensRegua::Liga(x1[1], "INI", k1, "C");
+    ItensRegua::Liga(x1[2], "INI", k1, "A");
+    ItensRegua::Liga(x1[3], "INI", k2, "K2_5");
+    // K1's connections by suffix: 0 (C), 1 (A), Z9... (B); then K2 places 4.
+    EXPECT_EQ(Reguas(Modelo()), QStringList({"X1: 2 3 1 4"}));
+}
+
 // ---- jumper tracks
 
 TEST_F(ModeloReguasTest, AChainBeginsPassesGoesThroughAndEnds) {
@@ -249,6 +269,29 @@ TEST_F(ModeloReguasTest, AChainBeginsPassesGoesThroughAndEnds) {
     EXPECT_EQ(Trilhas(*modelo.reguas[0]), "1: 2:1 3:2 4:4 5:3 6:");
     EXPECT_EQ(modelo.Borne("X1", "2")->proximo, modelo.Borne("X1", "4"));
     EXPECT_EQ(modelo.Borne("X1", "4")->anterior, modelo.Borne("X1", "2"));
+}
+
+// Links go to the terminal next door or further on, either way, and a link to the second
+// item of a number lands on the terminal kept for it.
+TEST_F(ModeloReguasTest, JumperLinksFindTheirTerminalsNearOrFarAndThroughASecondItemOfANumber) {
+    auto x1 = itens_.Regua("X1", 4);
+    CEItemLista* outro2 = itens_.Borne("X1", "2");
+    x1[0]->proximo = outro2;
+    x1[1]->proximo = outro2->proximo = x1[3];
+    x1[3]->anterior = outro2;
+    x1[2]->anterior = x1[1];
+    CEModeloReguas& modelo = Modelo();
+    ASSERT_EQ(modelo.bornes.size(), 4u);
+    CEBorneDwg* const b1 = modelo.Borne("X1", "1");
+    CEBorneDwg* const b2 = modelo.Borne("X1", "2");
+    CEBorneDwg* const b3 = modelo.Borne("X1", "3");
+    CEBorneDwg* const b4 = modelo.Borne("X1", "4");
+    EXPECT_EQ(b1->proximo, b2);
+    EXPECT_EQ(b2->proximo, b4);
+    EXPECT_EQ(b4->anterior, b2);
+    EXPECT_EQ(b3->anterior, b2);
+    EXPECT_EQ(b1->anterior, nullptr);
+    EXPECT_EQ(b3->proximo, nullptr);
 }
 
 TEST_F(ModeloReguasTest, ChainsThatOverlapOrCrossTakeTheNextTrack) {
