@@ -106,20 +106,22 @@ void refreshPageCounts(zvdb::Database& database) {
     std::unordered_map<std::string, std::size_t> counts;
     for (const PageGroup& group : registry.groups())
         counts[group.name + "$DE"] = group.pages.size();
-    for (zvdb::Entity* entity : database.modelSpace()->entities()) {
+    // Walked in place: a list of a large drawing's entities would be made and freed for the
+    // few title blocks.
+    database.modelSpace()->forEachEntity([&counts](zvdb::Entity& entity) {
         // The kind first: it is read off the object, the layer off its tags. Nearly every
         // entity lies on a page: only a "$DE" layer's name is worth a copy.
-        if (typeid(*entity) != typeid(zvdb::BlockReference)) continue;
-        const std::string_view layer = entity->layer();
-        if (!layer.ends_with("$DE")) continue;
+        if (typeid(entity) != typeid(zvdb::BlockReference)) return;
+        const std::string_view layer = entity.layer();
+        if (!layer.ends_with("$DE")) return;
         auto count = counts.find(std::string(layer));
-        if (count == counts.end()) continue;
-        auto* reference = static_cast<zvdb::BlockReference*>(entity);
+        if (count == counts.end()) return;
+        auto& reference = static_cast<zvdb::BlockReference&>(entity);
         // A count that stands is left alone: the title block is not changed for nothing.
-        zvdb::Attribute* total = reference->attribute("TOTAL");
+        zvdb::Attribute* total = reference.attribute("TOTAL");
         const std::string text = std::to_string(count->second);
         if (total && total->text(1) != text) total->setText(1, text);
-    }
+    });
 }
 
 bool thawPage(zvdb::Database& database, const std::string& page) {
