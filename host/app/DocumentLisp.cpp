@@ -111,6 +111,11 @@ int DocumentLisp::lispGetSymbolFirst(const QString& name, zvsdk::ResultBuffer& f
                 first.restype = zvsdk::RTSTR;
                 first.rstring = value.asString();
                 return zvsdk::RTNORM;
+            case zvlisp::Type::Symbol:
+                // T answers most tests, a list's filter at every item: no chain for it.
+                if (value.asSymbol()->name != QLatin1String("T")) break;
+                first.restype = zvsdk::RTT;
+                return zvsdk::RTNORM;
             default:
                 break;
         }
