@@ -125,6 +125,17 @@ void cicad::PassaPonto(std::span<const zvdb::Tag> itens, std::size_t& i) {
         ++i;
 }
 
+void cicad::TextosDosItens(std::span<const zvdb::Tag> itens, std::vector<std::string_view>& textos,
+                           std::vector<int>* codigos) {
+    textos.clear();
+    if (codigos) codigos->clear();
+    for (std::size_t i = 0; i < itens.size(); ++i) {
+        textos.push_back(itens[i].value);
+        if (codigos) codigos->push_back(itens[i].code);
+        PassaPonto(itens, i);
+    }
+}
+
 // ---- extended data, masters, project settings
 
 void CICad::RegistraApp(const QString& aplicacao, zvdb::Database* database) {
@@ -181,28 +192,15 @@ CEListaXData CICad::GetXData(const OdDbObjectId& id, const char* aplicacao) {
 
 void CICad::TextosXData(const OdDbObjectId& id, const char* aplicacao,
                         std::vector<std::string_view>& textos) {
-    textos.clear();
     zvdb::DbObject* objeto = Objeto(id);
-    if (!objeto) return;
-    const std::span<const zvdb::Tag> itens = objeto->xdataItems(aplicacao);
-    for (std::size_t i = 0; i < itens.size(); ++i) {
-        textos.push_back(itens[i].value);
-        PassaPonto(itens, i);
-    }
+    TextosDosItens(objeto ? objeto->xdataItems(aplicacao) : std::span<const zvdb::Tag>(), textos);
 }
 
 void CICad::TextosXData(const OdDbObjectId& id, const char* aplicacao,
                         std::vector<std::string_view>& textos, std::vector<int>& codigos) {
-    textos.clear();
-    codigos.clear();
     zvdb::DbObject* objeto = Objeto(id);
-    if (!objeto) return;
-    const std::span<const zvdb::Tag> itens = objeto->xdataItems(aplicacao);
-    for (std::size_t i = 0; i < itens.size(); ++i) {
-        textos.push_back(itens[i].value);
-        codigos.push_back(itens[i].code);
-        PassaPonto(itens, i);
-    }
+    TextosDosItens(objeto ? objeto->xdataItems(aplicacao) : std::span<const zvdb::Tag>(), textos,
+                   &codigos);
 }
 
 bool CICad::TextoXData(const OdDbObjectId& id, const char* aplicacao, QString& texto,

@@ -100,6 +100,10 @@ void PreparaAtributos(zvdb::Database& db, const zvdb::BlockRecord& bloco,
 
 // Past a point's y and z items in extended data, which belong to its one item (`i` at its x).
 void PassaPonto(std::span<const zvdb::Tag> itens, std::size_t& i);
+// The items' texts in order, a point's as its x's (its y and z belong to it), with each
+// item's code when `codigos` is given.
+void TextosDosItens(std::span<const zvdb::Tag> itens, std::vector<std::string_view>& textos,
+                    std::vector<int>* codigos = nullptr);
 
 // The project-settings operations log what goes wrong and answer nothing.
 template <class F>

@@ -58,11 +58,7 @@ bool CICad::TextosFio(const OdDbObjectId& fio, std::string_view& chave, bool& te
     zvdb::DbObject* objeto = Objeto(fio);
     if (!objeto) return false;
     const auto grupos = Grupos(*objeto);
-    const std::span<const zvdb::Tag> itens = grupos[kZvWire];
-    for (std::size_t i = 0; i < itens.size(); ++i) {
-        textos.push_back(itens[i].value);
-        PassaPonto(itens, i);
-    }
+    TextosDosItens(grupos[kZvWire], textos);
     return Chave(grupos, chave, temChave);
 }
 

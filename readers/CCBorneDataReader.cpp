@@ -492,23 +492,12 @@ void EstendeCadeia(VetorItens& cadeia) {
     }
 }
 
-// The names a chain is sorted by, less those that can never decide a comparison: a name
-// no item holds reads empty for all, and a name given twice is equal the second time. The
-// sort then makes the very same moves without their tables. When none is held, all stay.
-QStringList OrdemDaCadeia() {
-    static const QStringList kOrdem = {"REGUA", "STRIP", "REGLETA", "NUMERO", "NUMBER", "NUMERO"};
-    QStringList presentes;
-    for (const QString& nome : kOrdem)
-        if (!presentes.contains(nome) && CamposItem::numeroSeHouver(nome) != CamposItem::kSemNome)
-            presentes << nome;
-    return presentes.isEmpty() ? kOrdem : presentes;
-}
-
 }  // namespace
 
 void CCBorneDataReader::LigaJumpers(VetorItens& itens) {
     const IndiceBornes indice(itens);
-    const QStringList ordem = OrdemDaCadeia();
+    const QStringList ordem =
+        VetorItens::camposQueDecidem({"REGUA", "STRIP", "REGLETA", "NUMERO", "NUMBER", "NUMERO"});
     std::unordered_set<CEItemLista*> visitados;
     for (std::size_t k = 0; k < itens.size(); ++k) {
         CEItemLista* item = itens[k];

@@ -13,6 +13,14 @@
 #include <functional>
 #include <unordered_set>
 
+QStringList VetorItens::camposQueDecidem(const QStringList& campos) {
+    QStringList presentes;
+    for (const QString& nome : campos)
+        if (!presentes.contains(nome) && CamposItem::numeroSeHouver(nome) != CamposItem::kSemNome)
+            presentes << nome;
+    return presentes.isEmpty() ? campos : presentes;
+}
+
 void VetorItens::juntarSemRepetir(const VetorItens& origem) {
     // Most accessories have none of their own: no set of what is here for nothing.
     if (origem.empty()) return;

@@ -28,6 +28,11 @@ public:
     // Destroys every item, then empties the vector.
     void destruirItens();
 
+    // The sort fields that can decide a comparison, in their order: those some item holds,
+    // each once (a name no item holds reads empty for all, a name given again is equal the
+    // second time). All of them when none is held: the sort still runs, and moves equal items
+    // as it did. Sorting by these makes the very same moves without the others' tables.
+    static QStringList camposQueDecidem(const QStringList& campos);
     // <0, 0 or >0: the order of two items by the fields, as `ordenar` sorts them.
     static int compararItens(const CEItemLista* a, const CEItemLista* b, const QStringList& campos);
 };

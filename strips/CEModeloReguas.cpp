@@ -7,7 +7,6 @@
 #include <algorithm>
 #include <array>
 #include <cstdint>
-#include <initializer_list>
 #include <iterator>
 #include <limits>
 #include <unordered_set>
@@ -23,19 +22,6 @@ std::vector<std::uint32_t> Numeros(const QStringList& campos) {
     for (const QString& campo : campos)
         numeros.push_back(CamposItem::numeroSeHouver(campo));
     return numeros;
-}
-
-// The names some item holds, in their order: a name none holds reads empty for every item,
-// so it never decides a comparison and sorting by it would only cost its tables. When none
-// is held, all stay: the sort still runs, and moves equal items as it did.
-QStringList Presentes(std::initializer_list<const char*> nomes) {
-    QStringList todos, presentes;
-    for (const char* nome : nomes) {
-        todos << QString::fromLatin1(nome);
-        if (CamposItem::numeroSeHouver(todos.back()) != CamposItem::kSemNome)
-            presentes << todos.back();
-    }
-    return presentes.isEmpty() ? todos : presentes;
 }
 
 // Whether the items differ in one of the fields; a field an item lacks reads as empty.
@@ -158,7 +144,7 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
         else if (*tipo == kBorne)
             terminais.push_back(item);
     }
-    componentes.ordenar(Presentes({"RELACAO", "TAG", "ETIQUETA"}));
+    componentes.ordenar(VetorItens::camposQueDecidem({"RELACAO", "TAG", "ETIQUETA"}));
     simbolosPorHandle.reserve(componentes.size());
     for (CEItemLista* item : componentes) {
         CESimboloDwg& simbolo = simbolos.emplace_back(item);
@@ -170,7 +156,8 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
     }
     // By strip, then number, in the three languages; Spanish shares the Portuguese number
     // field, which a second time would never decide a comparison.
-    terminais.ordenar(Presentes({"REGUA", "STRIP", "REGLETA", "NUMERO", "NUMBER"}));
+    terminais.ordenar(
+        VetorItens::camposQueDecidem({"REGUA", "STRIP", "REGLETA", "NUMERO", "NUMBER"}));
     // The names of side connections: each terminal's values are read as it is built; and
     // those of a symbol's connections, read as the strips are put in order.
     std::vector<std::uint32_t> nomesLigacao;
