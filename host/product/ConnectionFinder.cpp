@@ -669,10 +669,12 @@ void ConnectionFinder::readWires(
     }
     for (auto& [layer, handles] : byLayer)
         std::sort(handles.begin(), handles.end());
-    decltype(found) sorted;
-    byRankThenHandle(
-        found, pages.size(), sorted, [](const auto& item) { return item.first; },
-        [](const auto& item) { return item.second.handle; });
+    {
+        decltype(found) sorted;
+        byRankThenHandle(
+            found, pages.size(), sorted, [](const auto& item) { return item.first; },
+            [](const auto& item) { return item.second.handle; });
+    }  // the copy in the drawing's order goes before the lines are made
     lines.clear();
     lines.reserve(found.size());
     for (const auto& item : found)
