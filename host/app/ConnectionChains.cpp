@@ -147,8 +147,9 @@ void ConnectionChains::install(DocumentLisp& lisp, const zvproduct::ProductConte
             if (!args || args->rbnext || args->restype != zvsdk::RTSTR) return false;
             zvdb::Database* database = context.database ? context.database() : nullptr;
             if (!database) return false;
+            zvproduct::WireLayerIndex& byLayer = answers->wireLayersOf(*database);
             const std::vector<std::uint64_t>& handles =
-                answers->wireLayers().polylinesOn(*database, args->rstring.toStdString());
+                byLayer.polylinesOn(*database, args->rstring.toStdString());
             *chain = handleChain(handles);
             return true;
         });

@@ -3,6 +3,7 @@
 #include "Interrupts.h"
 #include "LispChains.h"
 
+#include <cstring>
 #include <utility>
 
 namespace zvhost {
@@ -167,10 +168,28 @@ zvlisp::Symbol* DocumentLisp::symbolOf(const QString& name) {
 }
 
 zvlisp::Symbol* DocumentLisp::knownSymbol(const QString& name) {
+    if (zvlisp::Symbol* recent = recentSymbol(name)) return recent;
     auto it = symbolsByName_.constFind(name);
-    if (it != symbolsByName_.constEnd()) return it.value();
+    if (it != symbolsByName_.constEnd()) {
+        noteRecent(it.key(), it.value());
+        return it.value();
+    }
     zvlisp::Symbol* symbol = lisp_.findSymbol(name);
     return symbol ? remember(name, symbol) : nullptr;
+}
+
+zvlisp::Symbol* DocumentLisp::recentSymbol(const QString& name) const {
+    const qsizetype size = name.size();
+    for (const RecentName& recent : recent_)
+        if (recent.symbol && recent.name.size() == size &&
+            std::memcmp(recent.name.constData(), name.constData(), size * sizeof(QChar)) == 0)
+            return recent.symbol;
+    return nullptr;
+}
+
+void DocumentLisp::noteRecent(const QString& name, zvlisp::Symbol* symbol) {
+    recent_[nextRecent_] = {name, symbol};
+    nextRecent_ = (nextRecent_ + 1) % recent_.size();
 }
 
 zvlisp::Symbol* DocumentLisp::remember(const QString& name, zvlisp::Symbol* symbol) {

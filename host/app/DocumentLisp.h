@@ -8,6 +8,7 @@
 
 #include <QHash>
 
+#include <array>
 #include <functional>
 #include <vector>
 
@@ -83,6 +84,14 @@ private:
     // The symbol if the name was ever used, without making it.
     zvlisp::Symbol* knownSymbol(const QString& name);
     zvlisp::Symbol* remember(const QString& name, zvlisp::Symbol* symbol);
+    // The names asked last, looked at before the hash: a list run asks for the same few
+    // names at every item, and a name's hash costs more than a comparison or two.
+    struct RecentName {
+        QString name;
+        zvlisp::Symbol* symbol = nullptr;
+    };
+    zvlisp::Symbol* recentSymbol(const QString& name) const;
+    void noteRecent(const QString& name, zvlisp::Symbol* symbol);
 
     // The pairs last published are about to be set again or replaced: a holder other than
     // `setNow` gets them made whole while their texts stand.
@@ -90,6 +99,8 @@ private:
 
     zvlisp::Interpreter lisp_;
     QHash<QString, zvlisp::Symbol*> symbolsByName_;
+    std::array<RecentName, 4> recent_;
+    std::size_t nextRecent_ = 0;
     // The pairs last published, kept to be given the next ones, and their symbol.
     zvlisp::Value pairs_;
     zvlisp::Symbol* pairsSymbol_ = nullptr;

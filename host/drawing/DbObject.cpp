@@ -393,10 +393,12 @@ std::vector<std::string_view> DbObject::xdataApplications() const {
 }
 
 bool DbObject::hasXData(std::string_view application) const {
-    const auto all = tags();
-    for (std::size_t i = xdataStart(); i < all.size(); ++i)
-        if (all[i].code == 1001 && TagValues::sameName(all[i].value, application)) return true;
-    return false;
+    bool found = false;
+    TagList::forEachGroupFromEnd(tags(), [&](std::string_view name, std::size_t, std::size_t) {
+        found = TagValues::sameName(name, application);
+        return !found;
+    });
+    return found;
 }
 
 std::vector<std::vector<Tag>> DbObject::xdataGroups(std::string_view application) const {
@@ -421,30 +423,27 @@ std::vector<Tag> DbObject::xdata(std::string_view application) const {
 
 std::span<const Tag> DbObject::xdataItems(std::string_view application) const {
     const auto all = tags();
-    for (std::size_t i = xdataStart(); i < all.size(); ++i) {
-        if (all[i].code != 1001 || !TagValues::sameName(all[i].value, application)) continue;
-        std::size_t end = i + 1;
-        while (end < all.size() && all[end].code != 1001)
-            ++end;
-        return all.subspan(i + 1, end - i - 1);
-    }
-    return {};
+    std::span<const Tag> items;
+    // Walked from the end: the application's first group is the last one met.
+    const auto take = [&](std::string_view name, std::size_t begin, std::size_t end) {
+        if (TagValues::sameName(name, application)) items = all.subspan(begin, end - begin);
+        return true;
+    };
+    TagList::forEachGroupFromEnd(all, take);
+    return items;
 }
 
 void DbObject::xdataItemsOf(std::span<const std::string_view> applications,
                             std::span<std::span<const Tag>> items) const {
     std::fill(items.begin(), items.end(), std::span<const Tag>());
     const auto all = tags();
-    for (std::size_t i = xdataStart(); i < all.size(); ++i) {
-        if (all[i].code != 1001) continue;
-        std::size_t end = i + 1;
-        while (end < all.size() && all[end].code != 1001)
-            ++end;
+    const auto take = [&](std::string_view name, std::size_t begin, std::size_t end) {
         for (std::size_t k = 0; k < applications.size(); ++k)
-            if (!items[k].data() && TagValues::sameName(all[i].value, applications[k]))
-                items[k] = all.subspan(i + 1, end - i - 1);
-        i = end - 1;
-    }
+            if (TagValues::sameName(name, applications[k]))
+                items[k] = all.subspan(begin, end - begin);
+        return true;
+    };
+    TagList::forEachGroupFromEnd(all, take);
 }
 
 namespace {

@@ -23,6 +23,11 @@ public:
         return tag.code == 102 && !tag.value.empty() && tag.value[0] == '}';
     }
     static std::size_t xdataStart(std::span<const Tag> all);
+    // Each group of the extended data, the last first: `visit(name, begin, end)` with its
+    // items at [begin, end); a false answer ends the walk. One walk from the end, where the
+    // extended data lies, and no walk back to its start.
+    template <class Visit>
+    static void forEachGroupFromEnd(std::span<const Tag> all, Visit&& visit);
     // Index of the first tag with the code, outside application groups and before the
     // extended data, from `from` on; -1 when absent.
     static int indexOf(std::span<const Tag> all, int code, std::size_t from = 1);
@@ -43,6 +48,17 @@ public:
     static void setPoint(std::vector<Tag>& all, int code, const std::string_view (&values)[3],
                          std::string_view subclass, bool withZ = true);
 };
+
+template <class Visit>
+void TagList::forEachGroupFromEnd(std::span<const Tag> all, Visit&& visit) {
+    // As xdataStart: the run of codes 1000 and above at the end, from its first 1001 on.
+    std::size_t end = all.size();
+    for (std::size_t i = all.size(); i > 1 && all[i - 1].code >= 1000; --i) {
+        if (all[i - 1].code != 1001) continue;
+        if (!visit(all[i - 1].value, i, end)) return;
+        end = i - 1;
+    }
+}
 
 template <std::size_t N>
 void TagList::indexesOf(std::span<const Tag> all, const int (&codes)[N], int (&found)[N]) {

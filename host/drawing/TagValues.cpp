@@ -100,8 +100,7 @@ std::string TagValues::fromHandle(std::uint64_t handle) {
     return text;
 }
 
-bool TagValues::sameName(std::string_view a, std::string_view b) {
-    if (a.size() != b.size()) return false;
+bool TagValues::sameLetters(std::string_view a, std::string_view b) {
     // Names mostly come in the case they were registered in: a byte that matches as it is
     // is not converted.
     for (std::size_t i = 0; i < a.size(); ++i)

@@ -20,9 +20,16 @@ public:
     static std::string fromReal(double value);
     static std::string fromInteger(long long value);
     static std::string fromHandle(std::uint64_t handle);
-    // Case-blind comparison of ASCII letters, as the format compares names.
-    static bool sameName(std::string_view a, std::string_view b);
+    // Case-blind comparison of ASCII letters, as the format compares names. Most names
+    // compared differ in length: those are told apart here, without a call.
+    static bool sameName(std::string_view a, std::string_view b) {
+        return a.size() == b.size() && sameLetters(a, b);
+    }
     static std::string upperName(std::string_view name);
+
+private:
+    // sameName for two names of one length.
+    static bool sameLetters(std::string_view a, std::string_view b);
 };
 
 // Builds a tag list whose values are stored in an arena.

@@ -30,6 +30,26 @@ auto ConnectionAnswers::withFinder(zvdb::Database& database, double tolerance, b
     return asked;
 }
 
+void ConnectionAnswers::readWires(zvdb::Database& database) {
+    // One stale index alone is made again by itself, as it always was.
+    if (wireLayers_.current(database) || wireList_.current(database)) return;
+    std::vector<WireLine> lines;
+    WireLayerIndex::ByLayer byLayer;
+    ConnectionFinder::readWires(database, lines, byLayer);
+    wireLayers_.adopt(database, std::move(byLayer));
+    wireList_.adopt(database, std::move(lines));
+}
+
+WireLayerIndex& ConnectionAnswers::wireLayersOf(zvdb::Database& database) {
+    readWires(database);
+    return wireLayers_;
+}
+
+WireListIndex& ConnectionAnswers::wireListOf(zvdb::Database& database) {
+    readWires(database);
+    return wireList_;
+}
+
 std::vector<WireConnections> ConnectionAnswers::answer(zvdb::Database& database, double tolerance,
                                                        Kind kind, bool keepOther) {
     return withFinder(database, tolerance, keepOther, [kind](const ConnectionFinder& finder) {

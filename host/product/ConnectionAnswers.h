@@ -60,12 +60,18 @@ public:
     // The numbered wires in page order (getListaFios, getListaFiosProj), handed over the
     // same way: a reader loads the connections before it lists the wires.
     WireListIndex& wireList() { return wireList_; }
+    // The two as the drawing stands. When both are stale they are made from one walk of the
+    // drawing: the material list asks for the wires and then for them page by page, with no
+    // connection answer in between to hand them over.
+    WireLayerIndex& wireLayersOf(zvdb::Database& database);
+    WireListIndex& wireListOf(zvdb::Database& database);
 
 private:
     // `ask(finder)` from the kept index or a new one, which is kept after for `keepOther`.
     template <class Ask>
     auto withFinder(zvdb::Database& database, double tolerance, bool keepOther, Ask&& ask);
     static zvdb::Database& databaseOf(zvlisp::Interpreter& lisp, const ProductContext& context);
+    void readWires(zvdb::Database& database);
 
     DrawingStamp stamp_;
     double tolerance_ = 0;

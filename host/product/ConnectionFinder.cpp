@@ -637,6 +637,50 @@ std::vector<zvdb::Polyline*> ConnectionFinder::polylinesInPageOrder(zvdb::Databa
     return result;
 }
 
+void ConnectionFinder::readWires(
+    zvdb::Database& database, std::vector<WireLine>& lines,
+    std::unordered_map<std::string, std::vector<std::uint64_t>>& byLayer) {
+    const auto pages = PageRegistry(database).pages();
+    std::unordered_map<std::string_view, int> order;
+    for (std::size_t i = 0; i < pages.size(); ++i)
+        order.emplace(pages[i], static_cast<int>(i));
+    static constexpr std::string_view kApplications[] = {"KVR_ZV_WIRE", "KVR_ZV_CABO"};
+    std::vector<std::pair<int, WireLine>> found;
+    byLayer.clear();
+    // entities come page by page: the last layer's rank and handles serve the next polyline
+    std::string_view lastLayer;
+    int lastRank = -1;
+    std::vector<std::uint64_t>* onLayer = nullptr;
+    for (zvdb::Entity* entity : database.modelSpace()->entities()) {
+        if (typeid(*entity) != typeid(zvdb::Polyline)) continue;
+        std::span<const zvdb::Tag> items[2];
+        entity->xdataItemsOf(kApplications, items);
+        const bool wire = items[0].data() != nullptr;
+        if (!wire && !items[1].data()) continue;
+        const std::string_view layer = entity->layer();
+        if (lastRank < 0 || layer != lastLayer) {
+            auto page = order.find(layer);
+            lastLayer = layer;
+            lastRank = page == order.end() ? INT_MAX : page->second;
+            onLayer = &byLayer[std::string(layer)];
+        }
+        onLayer->push_back(entity->handle());
+        if (wire) found.push_back({lastRank, {entity->handle(), wireNumberOf(items[0]), layer}});
+    }
+    for (auto& [layer, handles] : byLayer)
+        std::sort(handles.begin(), handles.end());
+    {
+        decltype(found) sorted;
+        byRankThenHandle(
+            found, pages.size(), sorted, [](const auto& item) { return item.first; },
+            [](const auto& item) { return item.second.handle; });
+    }  // the copy in the drawing's order goes before the lines are made
+    lines.clear();
+    lines.reserve(found.size());
+    for (const auto& item : found)
+        lines.push_back(item.second);
+}
+
 std::string_view ConnectionFinder::wireNumber(const zvdb::Polyline& polyline) {
     return wireNumberOf(Roles(polyline).items(polyline, Roles::Wire));
 }

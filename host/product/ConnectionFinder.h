@@ -93,6 +93,10 @@ public:
     // (polylines off the pages last), then by handle.
     static std::vector<zvdb::Polyline*> polylinesInPageOrder(zvdb::Database& database,
                                                              const char* application);
+    // What wireLinesInPageOrder and wiresAndLeadsByLayer give, from one walk of the polylines
+    // without the connections: for the lists of wires, which ask for both.
+    static void readWires(zvdb::Database& database, std::vector<WireLine>& lines,
+                          std::unordered_map<std::string, std::vector<std::uint64_t>>& byLayer);
 
 private:
     struct Symbol {

@@ -113,7 +113,8 @@ void installConnectionFunctions(Interpreter& lisp, const ProductContext& context
         "getFiosPorLayer",
         [context, answers](Interpreter& in, Args a) {
             zvdb::Database& database = databaseOf(in, context);
-            return handleTexts(answers->wireLayers().polylinesOn(database, stdText(in, a[0])));
+            return handleTexts(
+                answers->wireLayersOf(database).polylinesOn(database, stdText(in, a[0])));
         },
         1, 1);
     // The wire reader, the ferrule reader and the material list ask in turn: one index, which
@@ -121,13 +122,15 @@ void installConnectionFunctions(Interpreter& lisp, const ProductContext& context
     lisp.define("getListaFios", [context, answers](Interpreter& in, Args a) {
         zvdb::Database& database = databaseOf(in, context);
         zvlisp::ListBuilder list;
-        for (std::uint64_t handle : answers->wireList().firstPolylines(database, layerNames(a, 0)))
+        for (std::uint64_t handle :
+             answers->wireListOf(database).firstPolylines(database, layerNames(a, 0)))
             list.add(ename(database, handle));
         return list.take();
     });
     lisp.define("getListaFiosProj", [context, answers](Interpreter& in, Args a) {
         zvdb::Database& database = databaseOf(in, context);
-        return handleTexts(answers->wireList().firstPolylines(database, layerNames(a, 1)));
+        return handleTexts(
+            answers->wireListOf(database).firstPolylines(database, layerNames(a, 1)));
     });
 }
 

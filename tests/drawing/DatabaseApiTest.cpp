@@ -756,3 +756,67 @@ TEST_F(DatabaseApi, TextsAndGroupsReadTogetherAnswerAsOneByOne) {
         EXPECT_EQ(items[2].size(), 2u);
     }
 }
+
+TEST_F(DatabaseApi, ExtendedDataIsTheRunFromItsFirstApplicationAndAnEditIsSeenAtOnce) {
+    // Codes of 1000 and above count as extended data only in the run at the end and from
+    // its first 1001 on; an application's first group answers, its name in any case.
+    Entity* line = db.modelSpace()->addLine({0, 0, 0}, {1, 1, 0});
+    std::vector<Tag> all(line->tags().begin(), line->tags().end());
+    const Tag tail[] = {tag(1001, "EARLY"),  tag(1000, "inside"), tag(62, "3"),
+                        tag(1000, "before"), tag(1001, "APP"),    tag(1000, "a"),
+                        tag(1001, "Other"),  tag(1001, "app"),    tag(1000, "b"),
+                        tag(1070, "2")};
+    all.insert(all.end(), std::begin(tail), std::end(tail));
+    line->replaceTags(all);
+    using Texts = std::vector<std::string_view>;
+    const auto values = [](std::span<const Tag> items) {
+        Texts out;
+        for (const Tag& item : items)
+            out.push_back(item.value);
+        return out;
+    };
+    const std::unique_ptr<Database> again = reloaded(db);
+    for (Entity* entity : {line, again->modelSpace()->entities().front()}) {
+        EXPECT_EQ(entity->color(), 3);
+        EXPECT_EQ(entity->xdataApplications(), (Texts{"APP", "Other", "app"}));
+        EXPECT_EQ(values(entity->xdataItems("App")), (Texts{"a"}));
+        EXPECT_TRUE(entity->hasXData("OTHER"));
+        EXPECT_TRUE(entity->xdataItems("OTHER").empty());
+        EXPECT_FALSE(entity->hasXData("before"));
+        EXPECT_FALSE(entity->hasXData("EARLY"));
+        EXPECT_TRUE(entity->xdataItems("EARLY").empty());
+        EXPECT_EQ(entity->xdataGroups("APP").size(), 2u);
+        const std::string_view names[] = {"app", "NONE", "OTHER", "APP", "AP"};
+        std::span<const Tag> items[5];
+        entity->xdataItemsOf(names, items);
+        EXPECT_EQ(values(items[0]), (Texts{"a"}));
+        EXPECT_EQ(items[1].data(), nullptr);
+        EXPECT_NE(items[2].data(), nullptr);
+        EXPECT_TRUE(items[2].empty());
+        EXPECT_EQ(items[3].data(), items[0].data());
+        EXPECT_EQ(items[4].data(), nullptr);
+
+        // What was answered before an edit is answered anew after it.
+        entity->setXDataTexts("APP", std::vector<std::string_view>{"c", "d"});
+        entity->xdataItemsOf(names, items);
+        EXPECT_EQ(values(items[0]), (Texts{"c", "d"}));
+        EXPECT_EQ(values(entity->xdataItems("app")), (Texts{"c", "d"}));
+        EXPECT_TRUE(entity->removeXData("other"));
+        EXPECT_FALSE(entity->hasXData("Other"));
+        entity->xdataItemsOf(names, items);
+        EXPECT_EQ(items[2].data(), nullptr);
+        EXPECT_EQ(values(items[0]), (Texts{"c", "d"}));
+        EXPECT_EQ(entity->color(), 3);
+    }
+
+    // A run of codes of 1000 and above without an application is no extended data.
+    Entity* bare = db.modelSpace()->addLine({0, 0, 0}, {2, 2, 0});
+    std::vector<Tag> stray(bare->tags().begin(), bare->tags().end());
+    stray.push_back(tag(1000, "APP"));
+    stray.push_back(tag(1070, "1"));
+    bare->replaceTags(stray);
+    EXPECT_FALSE(bare->hasXData("APP"));
+    EXPECT_TRUE(bare->xdataApplications().empty());
+    bare->setXData("APP", std::vector<Tag>{tag(1000, "x")});
+    EXPECT_EQ(values(bare->xdataItems("APP")), (Texts{"x"}));
+}

@@ -418,6 +418,63 @@ TEST_F(ConnectionsTest, TheWireListThatAnIndexHandsOverIsThatOfAWalkOfItsOwn) {
     EXPECT_EQ(show("(getListaFiosProj \"proj.dxf\" \"OFF\")"), "(\"" + hex(off) + "\")");
 }
 
+TEST_F(ConnectionsTest, BothWireIndexesMadeFromOneWalkAreThoseOfWalksOfTheirOwn) {
+    auto* late = wire("ESQ$0002$A", {{0, 0, 0}, {10, 0, 0}}, "801");
+    wire("OFF", {{0, 0, 0}, {10, 0, 0}}, "802");
+    auto* early = wire("ESQ$0001$A", {{0, 0, 0}, {10, 0, 0}}, "801");
+    wire("ESQ$0001$A", {{0, 5, 0}, {10, 5, 0}}, "");  // no number
+    auto* both = wire("ESQ$0002$A", {{0, 6, 0}, {10, 6, 0}}, "803");
+    both->setXData("kvr_zv_cabo", zvsample::XDataItems().text("20001\f1").tags());
+    auto* lead = database->modelSpace()->addLwPolyline({{0, 1, 0}, {9, 1, 0}}, false, "OFF");
+    lead->setXData("KVR_ZV_CABO", zvsample::XDataItems().text("20001\f1").tags());
+    auto* empty =
+        database->modelSpace()->addLwPolyline({{0, 2, 0}, {9, 2, 0}}, false, "ESQ$0001$A");
+    empty->setXData("KVR_ZV_WIRE", std::vector<zvdb::Tag>{});  // a wire without items
+    database->modelSpace()
+        ->addLine({0, 3, 0}, {9, 3, 0})
+        ->setXData("KVR_ZV_WIRE", zvsample::XDataItems().text("10006\f1").text("FIO\f9").tags());
+    terminal("ESQ$0001$A", {0, 0, 0}, "X1", "1");
+
+    const std::vector<std::string> layers = {"ESQ$0001$A", "ESQ$0002$A", "OFF", "NONE"};
+    const std::vector<std::unordered_set<std::string>> asked = {
+        {}, {"ESQ$0001$A"}, {"OFF", "ESQ$0002$A"}, {"NONE"}};
+    const auto compare = [&](ConnectionAnswers& answers) {
+        WireLayerIndex ownLayers;
+        WireListIndex ownList;
+        for (const std::string& layer : layers)
+            EXPECT_EQ(answers.wireLayersOf(*database).polylinesOn(*database, layer),
+                      ownLayers.polylinesOn(*database, layer))
+                << layer;
+        for (const auto& names : asked)
+            EXPECT_EQ(answers.wireListOf(*database).firstPolylines(*database, names),
+                      ownList.firstPolylines(*database, names))
+                << names.size();
+    };
+    ConnectionAnswers answers;
+    // whichever is asked first, the other is made by the same walk
+    answers.wireListOf(*database);
+    EXPECT_TRUE(answers.wireLayers().current(*database));
+    EXPECT_TRUE(answers.wireList().current(*database));
+    compare(answers);
+    EXPECT_EQ(answers.wireListOf(*database).firstPolylines(*database, {}).front(), early->handle());
+    EXPECT_EQ(answers.wireLayersOf(*database).polylinesOn(*database, "OFF").size(), 2u);
+    // A change since: both are made again from the drawing as it stands.
+    early->erase();
+    lead->setText(8, "ESQ$0002$A");
+    EXPECT_FALSE(answers.wireList().current(*database));
+    EXPECT_EQ(answers.wireListOf(*database).firstPolylines(*database, {}).front(), late->handle());
+    EXPECT_TRUE(answers.wireLayers().current(*database));
+    EXPECT_EQ(answers.wireLayersOf(*database).polylinesOn(*database, "OFF").size(), 1u);
+    compare(answers);
+    // One stale index alone is made again by itself, and the other is kept.
+    ConnectionAnswers one;
+    one.wireList().firstPolylines(*database, {});
+    EXPECT_FALSE(one.wireLayers().current(*database));
+    one.wireLayersOf(*database);
+    EXPECT_FALSE(one.wireLayers().current(*database));
+    compare(one);
+}
+
 TEST_F(ConnectionsTest, WireListsOfLayersOffThePagesWhosePolylinesAlternate) {
     // off the pages the polylines go by handle alone, so their layers take turns
     auto* one = wire("OFF1", {{0, 0, 0}, {10, 0, 0}}, "601");
