@@ -848,7 +848,8 @@ bool CCDataReader::LoteFio(const QString& s, const CamposItem& campos,
     lote_.push_back({NumeroCampo<"DESCRICAO">(s), descricao});
     lote_.push_back({NumeroCampo<"TP_DESCRI">(s), descricao});
     const LayerLido& layer = LayerDoNome(CICad::NomeLayerUtf8(polilinha));
-    lote_.push_back({NumeroCampo<"POSICAO">(s), PosicaoNoLayer(polilinha, layer)});
+    lote_.push_back({NumeroCampo<"POSICAO">(s),
+                     PosicaoDescartada() ? QString() : PosicaoNoLayer(polilinha, layer)});
     lote_.push_back({NumeroCampo<"LAYER">(s), layer.nome});
     lote_.push_back({NumeroCampo<"GRUPO">(s), layer.grupo});
     lote_.push_back({NumeroCampo<"PAGINA">(s), layer.pagina});
@@ -1031,10 +1032,18 @@ const CCDataReader::EntidadeLida& CCDataReader::EntidadeGuardada(const OdDbObjec
     return entidadesLidas_.insere(id, std::move(lida));
 }
 
+bool CCDataReader::PosicaoDescartada() const {
+    // Only a wire's reading that serves one copy, under a suffix whose filter drops it.
+    if (!copiaAvulsa_ || GuardaFios || !ficaComSufixo_ || copiaAvulsa_->isEmpty()) return false;
+    return !ficaComSufixo_(CamposItem::nome(NumeroCampo<"POSICAO">(*copiaAvulsa_)));
+}
+
 void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
                                  CETemplate* modelo, const QString* numeroFio) {
     ConfereVersao();
+    copiaAvulsa_ = &sufixo;
     const EntidadeLida& lida = EntidadeGuardada(id, modelo);
+    copiaAvulsa_ = nullptr;
     const bool rotas = lida.rotas;
     FormaCampos::ComSufixo& com = lida.forma->Com(sufixo, &ficaComSufixo_);
     const std::uint32_t qtd = com.qtd;

@@ -301,6 +301,11 @@ private:
     // that is not to be kept waits in `avulsa_` for the copy that asked, which takes its values.
     const EntidadeLida& EntidadeGuardada(const OdDbObjectId& id, CETemplate* modelo);
     EntidadeLida avulsa_;
+    // The suffix of the copy a reading is made for, while it is made: a wire's reading that
+    // only this copy takes leaves out the position (a call of the LISP side) when the copy
+    // drops it.
+    const QString* copiaAvulsa_ = nullptr;
+    bool PosicaoDescartada() const;
     // The entity read apart into the form CopiaEntidade keeps.
     EntidadeLida LeEntidadeGuardada(const OdDbObjectId& id, CETemplate* modelo);
     // The item each reading is made in and the names it gave: their arrays serve the next.

@@ -304,6 +304,35 @@ TEST_F(ConnectionQueriesTest, EachWireOfAnIndexedPageTakesItsOwnFirstVertex) {
     EXPECT_EQ(r->Posicao(id(fios[5])), "7;8");
 }
 
+// A wire read for one copy alone asks the position function only when the copy keeps the
+// position under its suffix; a reading kept for other copies always has it.
+TEST_F(ConnectionQueriesTest, AWireReadForOneCopyLeavesOutThePositionItsCopyDrops) {
+    ASSERT_TRUE(documento_->lisp()->lispEvaluate(
+        "(progn (setq chamadas 0) (defun BuscarCoordenadas (e g p x y) (setq chamadas (1+ "
+        "chamadas)) \"B2\"))"));
+    const zvdb::Polyline* w = fio({{10, 100, 0}, {100, 100, 0}}, "7");
+    struct Leitor : LeitorBase {
+        explicit Leitor(bool guarda) { GuardaFios = guarda; }
+        void Filtra(std::function<bool(const QString&)> fica) { FiltraSufixos(std::move(fica)); }
+    };
+    const auto chamadas = [] { return CICad::GetIntLisp("chamadas", -1); };
+    const auto copia = [&](bool guarda, const QString& fica) -> QString {
+        Leitor leitor(guarda);
+        leitor.Filtra([fica](const QString& nome) { return nome == "FIO_SEGINI" || nome == fica; });
+        CEItemLista item;
+        leitor.CopiaEntidade("_SEGINI", item, id(w), nullptr);
+        return QString("%1 %2 %3")
+            .arg(item.campos.size())
+            .arg(item.valorCampo("FIO_SEGINI"), item.valorCampo("POSICAO_SEGINI"));
+    };
+    EXPECT_EQ(copia(false, "POSICAO_SEGINI"), "2 7 B2");
+    EXPECT_EQ(chamadas(), 1);
+    EXPECT_EQ(copia(false, "LAYER_SEGINI"), "2 7 ");
+    EXPECT_EQ(chamadas(), 1);
+    EXPECT_EQ(copia(true, "LAYER_SEGINI"), "2 7 ");
+    EXPECT_EQ(chamadas(), 2);
+}
+
 // ---- neighbours along a wire
 
 class NeighbourTest : public ConnectionQueriesTest {
