@@ -56,7 +56,7 @@ public:
     // Gives back what the reads kept to answer faster (connections, entities read, indexes,
     // routes): once the items are made, the writer that follows needs the memory. A later
     // read loads them again.
-    void LiberaLeituras();
+    virtual void LiberaLeituras();
 
     // ---- connections
     void CarregaConexoesFios();
