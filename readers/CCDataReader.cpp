@@ -746,7 +746,7 @@ QString CCDataReader::PosicaoNoLayer(const OdDbObjectId& entidade, const LayerLi
     if (CICad::EhPolilinha(entidade)) {
         // the index of its layer read it already, unless the drawing changed since
         const CEPonto* lido = nullptr;
-        if (versaoIndices_ == CICad::VersaoDesenho()) {
+        if (!indicesFios_.empty() && versaoIndices_ == CICad::VersaoDesenho()) {
             const auto indice = indicesFios_.find(layer.nome);
             if (indice != indicesFios_.end() && indice->second)
                 lido = indice->second->Primeiro(entidade);
@@ -848,8 +848,9 @@ bool CCDataReader::LoteFio(const QString& s, const CamposItem& campos,
     lote_.push_back({NumeroCampo<"DESCRICAO">(s), descricao});
     lote_.push_back({NumeroCampo<"TP_DESCRI">(s), descricao});
     const LayerLido& layer = LayerDoNome(CICad::NomeLayerUtf8(polilinha));
-    lote_.push_back({NumeroCampo<"POSICAO">(s),
-                     PosicaoDescartada() ? QString() : PosicaoNoLayer(polilinha, layer)});
+    lote_.push_back({NumeroCampo<"POSICAO">(s), !GuardaFios && PosicaoDescartada()
+                                                    ? QString()
+                                                    : PosicaoNoLayer(polilinha, layer)});
     lote_.push_back({NumeroCampo<"LAYER">(s), layer.nome});
     lote_.push_back({NumeroCampo<"GRUPO">(s), layer.grupo});
     lote_.push_back({NumeroCampo<"PAGINA">(s), layer.pagina});
