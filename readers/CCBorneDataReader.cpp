@@ -144,10 +144,13 @@ CCBorneDataReader::LadoBorne CCBorneDataReader::AchaLado(CCDataReader& leitor,
     lado.fio = fio;
     lado.numeroFio = std::move(numero);
     lado.fioNumerado = numerado;
-    // The point of the element's first entry on the wire.
-    const int j = elementos.indexOf(lado.vizinho);
-    if (j >= 0 && size_t(j) < entradas->pontos.size())
-        lado.pontoElemento = entradas->pontos[size_t(j)];
+    // The point of the element's first entry on the wire. Equal texts have equal handles:
+    // only entries of the same handle have their texts compared.
+    const std::span<const std::uint64_t> handles = entradas->handles;
+    int j = 0;
+    while (j < i && (handles[size_t(j)] != handles[size_t(i)] || !elementos.MesmoTexto(j, i)))
+        ++j;
+    if (size_t(j) < entradas->pontos.size()) lado.pontoElemento = entradas->pontos[size_t(j)];
     return lado;
 }
 

@@ -74,12 +74,12 @@ std::tuple<T...> Retira(T&... conteudos) {
 void CCDataReader::LiberaLeituras() {
     // Items share the texts of these; they keep theirs.
     auto leituras = Retira(
-        circuitos_, conexoes_, fiosPorLayer_, indicesFios_, primeirosVertices_, rotas_,
-        rotasPorChave_, caminhos_, entidadesLidas_, entidadesAntigas_, avulsa_, leitura_,
-        nomesLidos_, formas_, numerosFios_, numerosCabos_, ligacoesPorElemento_, ligacoesAntigas_,
-        layers_, gruposPaginas_, textosTipo_, colunasDivididas_, catalogoComp_, constantes_,
-        ligacoesLidas_, chaves_, textosFio_, tags_, valores_, lote_, ordemLote_, basesAcessorio_,
-        nomesFio_, textosNumero_, acessoriosLidos_, acessoriosCatalogo_, nomesLote_, ordensLote_);
+        circuitos_, conexoes_, fiosPorLayer_, indicesFios_, rotas_, rotasPorChave_, caminhos_,
+        entidadesLidas_, entidadesAntigas_, avulsa_, leitura_, nomesLidos_, formas_, numerosFios_,
+        numerosCabos_, ligacoesPorElemento_, ligacoesAntigas_, layers_, gruposPaginas_, textosTipo_,
+        colunasDivididas_, catalogoComp_, constantes_, ligacoesLidas_, chaves_, textosFio_, tags_,
+        valores_, lote_, ordemLote_, basesAcessorio_, nomesFio_, textosNumero_, acessoriosLidos_,
+        acessoriosCatalogo_, nomesLote_, ordensLote_);
     versaoIndices_ = 0;
     indiceAtual_ = nullptr;
     layerDoUltimo_ = nullptr;
@@ -169,6 +169,10 @@ struct CCDataReader::FiosDoLayer {
     std::size_t nx = 0, ny = 0;
     std::vector<std::uint32_t> iniciosCelulas;  // nx * ny + 1 when there is a grid
     std::vector<std::uint32_t> membros;         // each cell's wires, ascending
+    // The first vertex of each polyline of the layer in the answer, of one vertex or more, by
+    // handle ascending (the first of a repeated one first): a wire's position reads it here,
+    // in the few arrays of its page, not in a table of every wire read.
+    std::vector<std::pair<OdDbObjectId, CEPonto>> primeiros;
 
     std::size_t Celula(double v, double origem, std::size_t n) const {
         const double c = std::floor((v - origem) / passo);
@@ -181,6 +185,14 @@ struct CCDataReader::FiosDoLayer {
     std::span<const std::uint32_t> Membros(std::size_t celula) const {
         return {membros.data() + iniciosCelulas[celula],
                 membros.data() + iniciosCelulas[celula + 1]};
+    }
+    const CEPonto* Primeiro(const OdDbObjectId& fio) const {
+        auto it = std::lower_bound(
+            primeiros.begin(), primeiros.end(), fio.handle(),
+            [](const auto& par, std::uint64_t handle) { return par.first.handle() < handle; });
+        for (; it != primeiros.end() && it->first.handle() == fio.handle(); ++it)
+            if (it->first == fio) return &it->second;
+        return nullptr;
     }
 };
 
@@ -197,7 +209,6 @@ const CCDataReader::FiosDoLayer& CCDataReader::LeIndiceFios(const QString& layer
     const std::uint64_t versao = CICad::VersaoDesenho();
     if (versao != versaoIndices_) {
         indicesFios_.clear();
-        primeirosVertices_.limpa();
         versaoIndices_ = versao;
     }
     std::unique_ptr<FiosDoLayer>& indice = indicesFios_[layer];
@@ -221,8 +232,7 @@ const CCDataReader::FiosDoLayer& CCDataReader::LeIndiceFios(const QString& layer
         const OdDbObjectId fio = CICad::IdDoHandleNumero(handle);
         const std::size_t antes = f.pontos.size();
         const std::size_t vertices = CICad::AcrescentaVertices(fio, nome, f.pontos);
-        if (vertices > 0 && !primeirosVertices_.contains(fio))
-            primeirosVertices_.insere(fio, f.pontos[antes]);
+        if (vertices > 0) f.primeiros.emplace_back(fio, f.pontos[antes]);
         if (vertices < 2) {
             f.pontos.resize(antes);
             continue;
@@ -230,6 +240,12 @@ const CCDataReader::FiosDoLayer& CCDataReader::LeIndiceFios(const QString& layer
         f.fios.push_back(fio);
         f.inicios.push_back(std::uint32_t(f.pontos.size()));
     }
+    // The answer gives them in handle order, most often.
+    const auto porHandle = [](const auto& a, const auto& b) {
+        return a.first.handle() < b.first.handle();
+    };
+    if (!std::is_sorted(f.primeiros.begin(), f.primeiros.end(), porHandle))
+        std::stable_sort(f.primeiros.begin(), f.primeiros.end(), porHandle);
     // Widened boxes of the segments; the grid spans the finite ones.
     struct Caixa {
         double x1, y1, x2, y2;
@@ -479,10 +495,7 @@ void CCDataReader::ConfereVersao() const {
     versaoLidas_ = versao;
 }
 
-const CCDataReader::NumeroFio& CCDataReader::NumeroDoFioGuardado(
-    const OdDbObjectId& entidade) const {
-    ConfereVersao();
-    if (const NumeroFio* achado = numerosFios_.procura(entidade)) return *achado;
+CCDataReader::NumeroFio CCDataReader::LeNumeroFio(const OdDbObjectId& entidade) const {
     NumeroFio numero;
     if (std::optional<QString> proprio = NumeroNoCampoFio(entidade)) {
         numero.numero = *proprio;
@@ -490,7 +503,14 @@ const CCDataReader::NumeroFio& CCDataReader::NumeroDoFioGuardado(
     } else {
         numero.numero = NumeroNoCabo(entidade);
     }
-    return numerosFios_.insere(entidade, std::move(numero));
+    return numero;
+}
+
+const CCDataReader::NumeroFio& CCDataReader::NumeroDoFioGuardado(
+    const OdDbObjectId& entidade) const {
+    ConfereVersao();
+    if (const NumeroFio* achado = numerosFios_.procura(entidade)) return *achado;
+    return numerosFios_.insere(entidade, LeNumeroFio(entidade));
 }
 
 QString CCDataReader::NumeroDoFio(const OdDbObjectId& entidade) const {
@@ -523,8 +543,12 @@ std::optional<TabelaConexoes::Entradas> CCDataReader::EntradasDoFio(const OdDbOb
                                                                     QString& numero,
                                                                     bool& numerado) const {
     if (fio.isNull()) return std::nullopt;
-    const NumeroFio& lido = NumeroDoFioGuardado(fio);
-    numero = lido.numero;
+    // A terminal's side asks for the wire at its point once: its number is read, not kept,
+    // unless another question kept it before.
+    ConfereVersao();
+    const NumeroFio* guardado = numerosFios_.procura(fio);
+    NumeroFio lido = guardado ? *guardado : LeNumeroFio(fio);
+    numero = std::move(lido.numero);
     numerado = lido.proprio;
     return conexoes_.DoFio(numero);
 }
@@ -720,9 +744,14 @@ QString CCDataReader::PosicaoNoLayer(const OdDbObjectId& entidade, const LayerLi
     if (layer.grupo.isEmpty()) return "??";
     CEPonto p;
     if (CICad::EhPolilinha(entidade)) {
-        // the wires' indexes read it already, unless the drawing changed since
-        const CEPonto* lido = primeirosVertices_.procura(entidade);
-        if (lido && versaoIndices_ == CICad::VersaoDesenho()) {
+        // the index of its layer read it already, unless the drawing changed since
+        const CEPonto* lido = nullptr;
+        if (!indicesFios_.empty() && versaoIndices_ == CICad::VersaoDesenho()) {
+            const auto indice = indicesFios_.find(layer.nome);
+            if (indice != indicesFios_.end() && indice->second)
+                lido = indice->second->Primeiro(entidade);
+        }
+        if (lido) {
             p = *lido;
         } else {
             const std::vector<CEPonto> vertices = CICad::GetVertices(entidade);
@@ -819,7 +848,9 @@ bool CCDataReader::LoteFio(const QString& s, const CamposItem& campos,
     lote_.push_back({NumeroCampo<"DESCRICAO">(s), descricao});
     lote_.push_back({NumeroCampo<"TP_DESCRI">(s), descricao});
     const LayerLido& layer = LayerDoNome(CICad::NomeLayerUtf8(polilinha));
-    lote_.push_back({NumeroCampo<"POSICAO">(s), PosicaoNoLayer(polilinha, layer)});
+    lote_.push_back({NumeroCampo<"POSICAO">(s), !GuardaFios && PosicaoDescartada()
+                                                    ? QString()
+                                                    : PosicaoNoLayer(polilinha, layer)});
     lote_.push_back({NumeroCampo<"LAYER">(s), layer.nome});
     lote_.push_back({NumeroCampo<"GRUPO">(s), layer.grupo});
     lote_.push_back({NumeroCampo<"PAGINA">(s), layer.pagina});
@@ -1002,10 +1033,18 @@ const CCDataReader::EntidadeLida& CCDataReader::EntidadeGuardada(const OdDbObjec
     return entidadesLidas_.insere(id, std::move(lida));
 }
 
+bool CCDataReader::PosicaoDescartada() const {
+    // Only a wire's reading that serves one copy, under a suffix whose filter drops it.
+    if (!copiaAvulsa_ || GuardaFios || !ficaComSufixo_ || copiaAvulsa_->isEmpty()) return false;
+    return !ficaComSufixo_(CamposItem::nome(NumeroCampo<"POSICAO">(*copiaAvulsa_)));
+}
+
 void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,
                                  CETemplate* modelo, const QString* numeroFio) {
     ConfereVersao();
+    copiaAvulsa_ = &sufixo;
     const EntidadeLida& lida = EntidadeGuardada(id, modelo);
+    copiaAvulsa_ = nullptr;
     const bool rotas = lida.rotas;
     FormaCampos::ComSufixo& com = lida.forma->Com(sufixo, &ficaComSufixo_);
     const std::uint32_t qtd = com.qtd;

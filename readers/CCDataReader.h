@@ -56,7 +56,7 @@ public:
     // Gives back what the reads kept to answer faster (connections, entities read, indexes,
     // routes): once the items are made, the writer that follows needs the memory. A later
     // read loads them again.
-    void LiberaLeituras();
+    virtual void LiberaLeituras();
 
     // ---- connections
     void CarregaConexoesFios();
@@ -81,7 +81,8 @@ public:
     // element's handle and point there, without texts made for them.
     std::optional<TabelaConexoes::Entradas> EntradasDoFio(const OdDbObjectId& fio) const;
     // The same, with the wire's number and whether its own field holds it (NumeroDoFio and
-    // EhFioNumerado; untouched when `fio` is null).
+    // EhFioNumerado; untouched when `fio` is null). The number is not kept for later
+    // questions: each wire at a terminal's point is asked for once.
     std::optional<TabelaConexoes::Entradas> EntradasDoFio(const OdDbObjectId& fio, QString& numero,
                                                           bool& numerado) const;
     static int LugarDoVizinho(const TabelaConexoes::Entradas& c, const OdDbObjectId& entidade,
@@ -248,8 +249,6 @@ private:
     QHash<QString, std::vector<std::uint64_t>> fiosPorLayer_;
     std::unordered_map<QString, std::unique_ptr<FiosDoLayer>> indicesFios_;
     std::uint64_t versaoIndices_ = 0;  // the drawing's version the indexes were read at
-    // The first vertex of each wire the indexes read, for the wire's position.
-    TabelaIds<CEPonto> primeirosVertices_;
     // Route records in store order, read on the first lookup; routes by wire key.
     struct Rota {
         QString chave, dados;
@@ -302,6 +301,11 @@ private:
     // that is not to be kept waits in `avulsa_` for the copy that asked, which takes its values.
     const EntidadeLida& EntidadeGuardada(const OdDbObjectId& id, CETemplate* modelo);
     EntidadeLida avulsa_;
+    // The suffix of the copy a reading is made for, while it is made: a wire's reading that
+    // only this copy takes leaves out the position (a call of the LISP side) when the copy
+    // drops it.
+    const QString* copiaAvulsa_ = nullptr;
+    bool PosicaoDescartada() const;
     // The entity read apart into the form CopiaEntidade keeps.
     EntidadeLida LeEntidadeGuardada(const OdDbObjectId& id, CETemplate* modelo);
     // The item each reading is made in and the names it gave: their arrays serve the next.
@@ -337,6 +341,8 @@ private:
     // Empties the caches of entities when the drawing changed since they were read.
     void ConfereVersao() const;
     const NumeroFio& NumeroDoFioGuardado(const OdDbObjectId& entidade) const;
+    // The same read from the drawing, and not kept.
+    NumeroFio LeNumeroFio(const OdDbObjectId& entidade) const;
     // Catalogue column texts split into the number of the name and the value; a text that
     // is no column has kSemColuna.
     static constexpr std::uint32_t kSemColuna = ~std::uint32_t(0);

@@ -85,6 +85,11 @@ void Junta(VetorItens& destino, VetorItens* origem) {
 
 }  // namespace
 
+void CCExportDataReader::LiberaLeituras() {
+    CCDataReader::LiberaLeituras();
+    Descarte::Largar(relacoesComponentes_);
+}
+
 QString CCExportDataReader::PaginasOpcao() const {
     return Exportacao ? Exportacao->GetOpcao("PAGINAS") : QString();
 }
@@ -245,7 +250,8 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
         }
         itens.push_back(item);
     }
-    resultado_.clear();
+    // Its items are all handed on: the array's room goes too.
+    resultado_ = VetorItens();
     // Terminals read alike hold about as many fields once their sides are read: room for as
     // many as the terminal before held moves a terminal's fields once, not at each doubling.
     size_t medida = 0;

@@ -28,6 +28,10 @@ public:
     virtual VetorItens* Le(zvdb::Database* database, CETemplate* modelo, bool flag,
                            const std::optional<QStringList>& paginas);
 
+    // With the readings go the components' relations: once every read is made, no side
+    // asks for them.
+    void LiberaLeituras() override;
+
     // The export this reader reads for; null for the topographic diagram.
     CEExportacao* Exportacao = nullptr;
 

@@ -284,6 +284,55 @@ TEST_F(ConnectionQueriesTest, AWirePositionFollowsItsFirstVertex) {
     EXPECT_EQ(r->Posicao(id(w)), "ESQ/0001:20.0;300.0");
 }
 
+// Each wire of an indexed page, given in any order and of one vertex too, takes its own first
+// vertex.
+TEST_F(ConnectionQueriesTest, EachWireOfAnIndexedPageTakesItsOwnFirstVertex) {
+    ASSERT_TRUE(documento_->lisp()->lispEvaluate(
+        "(defun BuscarCoordenadas (e g p x y) (strcat (rtos x 2 0) \";\" (rtos y 2 0)))"));
+    std::vector<const zvdb::Polyline*> fios;
+    for (int k = 0; k < 5; ++k)
+        fios.push_back(fio({{double(k), 100.0 + k, 0}, {100, 100.0 + k, 0}}, std::to_string(k)));
+    fios.push_back(db().modelSpace()->addLwPolyline({{7, 8, 0}}, false, kPagina));
+    QStringList respostas;
+    for (auto it = fios.rbegin(); it != fios.rend(); ++it)
+        respostas << "\"" + handle(*it) + "\"";
+    CICad::AvaliaLisp("(defun getFiosPorLayer (l) (list " + respostas.join(' ') + "))");
+    auto r = leitor(0.5);
+    EXPECT_EQ(r->FioNoPonto(QString::fromStdString(kPagina), {50, 102, 0}), id(fios[2]));
+    for (int k = 0; k < 5; ++k)
+        EXPECT_EQ(r->Posicao(id(fios[size_t(k)])), QString("%1;%2").arg(k).arg(100 + k));
+    EXPECT_EQ(r->Posicao(id(fios[5])), "7;8");
+}
+
+// A wire read for one copy alone asks the position function only when the copy keeps the
+// position under its suffix; a reading kept for other copies always has it.
+TEST_F(ConnectionQueriesTest, AWireReadForOneCopyLeavesOutThePositionItsCopyDrops) {
+    ASSERT_TRUE(documento_->lisp()->lispEvaluate(
+        "(progn (setq chamadas 0) (defun BuscarCoordenadas (e g p x y) (setq chamadas (1+ "
+        "chamadas)) \"B2\"))"));
+    const zvdb::Polyline* w = fio({{10, 100, 0}, {100, 100, 0}}, "7");
+    struct Leitor : LeitorBase {
+        explicit Leitor(bool guarda) { GuardaFios = guarda; }
+        void Filtra(std::function<bool(const QString&)> fica) { FiltraSufixos(std::move(fica)); }
+    };
+    const auto chamadas = [] { return CICad::GetIntLisp("chamadas", -1); };
+    const auto copia = [&](bool guarda, const QString& fica) -> QString {
+        Leitor leitor(guarda);
+        leitor.Filtra([fica](const QString& nome) { return nome == "FIO_SEGINI" || nome == fica; });
+        CEItemLista item;
+        leitor.CopiaEntidade("_SEGINI", item, id(w), nullptr);
+        return QString("%1 %2 %3")
+            .arg(item.campos.size())
+            .arg(item.valorCampo("FIO_SEGINI"), item.valorCampo("POSICAO_SEGINI"));
+    };
+    EXPECT_EQ(copia(false, "POSICAO_SEGINI"), "2 7 B2");
+    EXPECT_EQ(chamadas(), 1);
+    EXPECT_EQ(copia(false, "LAYER_SEGINI"), "2 7 ");
+    EXPECT_EQ(chamadas(), 1);
+    EXPECT_EQ(copia(true, "LAYER_SEGINI"), "2 7 ");
+    EXPECT_EQ(chamadas(), 2);
+}
+
 // ---- neighbours along a wire
 
 class NeighbourTest : public ConnectionQueriesTest {
@@ -854,6 +903,33 @@ TEST_F(ConnectionQueriesTest, CoresOfACableTakeItsNumberAndFollowItsChange) {
     // A record without a cable number: the core has none either.
     registro->setXData("KVR_ZV_ATT_VIRTUAL", zvsample::XDataItems().text("COR\fAZUL\fN").tags());
     EXPECT_EQ(r->NumeroDoFio(id(um)), "");
+}
+
+// The wire at a side's point gives its entries with the number NumeroDoFio tells, read for
+// that question alone or kept by an earlier one, and a change of the drawing is seen.
+TEST_F(ConnectionQueriesTest, AWiresEntriesComeWithItsNumberKeptOrNot) {
+    const std::string caminho[] = {"ZV_CABOS"};
+    zvdb::XRecord* registro = db().dictionaryAt(caminho, true)->getOrCreateXRecord("W1");
+    registro->setXData("KVR_ZV_ATT_VIRTUAL", zvsample::XDataItems().text("CABO\fW1\fN").tags());
+    zvdb::Polyline* nucleo = db().modelSpace()->addLwPolyline({{0, 0, 0}, {9, 0, 0}}, false);
+    const std::string h = ZVString::DeHandle(registro->handle()).toStdString();
+    nucleo->setXData("KVR_ZV_CABO", zvsample::XDataItems().text("20101\f1").text(h).text(h).tags());
+    const zvdb::Polyline* proprio = fio({{0, 50, 0}, {9, 50, 0}}, "12");
+    auto r = leitor();
+    auto numero = [&](const zvdb::DbObject* linha) -> QString {
+        QString texto = "unset";
+        bool numerado = true;
+        r->EntradasDoFio(id(linha), texto, numerado);
+        return texto + (numerado ? " own" : " core");
+    };
+    EXPECT_EQ(numero(proprio), "12 own");
+    EXPECT_EQ(numero(nucleo), "W1\f20101 core");
+    // Kept by the plain question, then asked again after the cable was renamed.
+    EXPECT_EQ(r->NumeroDoFio(id(nucleo)), "W1\f20101");
+    EXPECT_EQ(numero(nucleo), "W1\f20101 core");
+    registro->setXData("KVR_ZV_ATT_VIRTUAL", zvsample::XDataItems().text("CABO\fW7\fN").tags());
+    EXPECT_EQ(numero(nucleo), "W7\f20101 core");
+    EXPECT_EQ(r->NumeroDoFio(id(nucleo)), "W7\f20101");
 }
 
 // The core is the first part of the core's first text when that text has one or two parts

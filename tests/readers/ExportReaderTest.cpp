@@ -683,6 +683,26 @@ TEST_F(ExportTerminalSidesTest, AContactOnATerminalNamesItsComponent) {
     EXPECT_EQ(um->valorCampo("REL_INI"), "-K1");
 }
 
+// The reader names a contact's component while it keeps its readings; once it gave them back,
+// the contact stands for itself.
+TEST_F(ExportTerminalSidesTest, TheComponentsRelationsGoWithTheReadings) {
+    k1_ = componente("-K1", {{"A1", {200, 100, 0}}});
+    const zvdb::BlockReference* contato = componente("-K1", {{"13", {20, 100, 0}}}, "NA-1");
+    ASSERT_TRUE(lisp("(setq EXPORTA 3)"));
+    CCExportDataReader leitor;
+    std::unique_ptr<VetorItens> itens(leitor.Le(&db(), nullptr, true, std::nullopt));
+    ASSERT_TRUE(itens);
+    const auto copia = [&] {
+        CEItemLista item;
+        leitor.CopiaAtributos("_X", item, handle(contato));
+        return item.valorCampo("HANDLE_X");
+    };
+    EXPECT_EQ(copia(), handle(k1_));
+    leitor.LiberaLeituras();
+    EXPECT_EQ(copia(), handle(contato));
+    itens->destruirItens();
+}
+
 // The block names that make a terminal (BORNE..., BOR-...) and a contact (NA-...) count in
 // any case; a name that only starts alike does not.
 TEST_F(ExportTerminalSidesTest, TerminalAndContactBlockNamesCountInAnyCase) {
