@@ -3,9 +3,11 @@
 #include "CEAtributo.h"
 #include "NomeCampo.h"
 #include "SelecaoPaginas.h"
+#include "lists/CCFioGrfWriter.h"
 #include "lists/CETemplate.h"
 #include "module/CIProgress.h"
 
+#include <functional>
 #include <memory>
 #include <unordered_set>
 
@@ -43,6 +45,22 @@ const NomesExtremidade& Nomes(const QString& sufixo) {
         n.numero[size_t(i)] = NomeCampo(Tag(CampoTraduzido::Numero, i + 1) + sufixo);
     }
     return porSufixo.insert(sufixo, n).value();
+}
+
+// What the walk reads of an end's fields, under each end's suffix, with the names the list
+// reads (in upper case): the stretches copy no other field of their ends. None: every field.
+std::function<bool(const QString&)> CamposDasPontas(std::optional<QSet<QString>> nomes) {
+    if (!nomes) return {};
+    for (const QString& sufixo : {QStringLiteral("_INI"), QStringLiteral("_FIM")}) {
+        for (const char* nome : {"LAYER", "CONECTOR", "REL", "LIG"})
+            *nomes << QLatin1String(nome) + sufixo;
+        for (const CampoTraduzido campo : {CampoTraduzido::Pino, CampoTraduzido::Relacao,
+                                           CampoTraduzido::Regua, CampoTraduzido::Numero})
+            for (int i = 1; i <= 3; ++i)
+                *nomes << Tag(campo, i) + sufixo;
+    }
+    return
+        [nomes = std::move(*nomes)](const QString& nome) { return nomes.contains(nome.toUpper()); };
 }
 
 // A copy of `origem` whose field array has room for `lugares` fields from the start: a
@@ -124,7 +142,10 @@ VetorItens* CCFioDataReader::LerDados(zvdb::Database* database,
         SelecionaPaginas(false, escolhidas);
     auto* itens = new VetorItens;
     progresso.Definir(0);
+    // A list holds every stretch at once: each keeps of its ends only what is read of them.
+    FiltraSufixos(CamposDasPontas(CCFioGrfWriter::CamposDasLinhas(modelo)));
     const std::unique_ptr<VetorItens> lidos(LeFios(escolhidas, &modelo, &progresso));
+    FiltraSufixos({});
     itens->juntarSemRepetir(*lidos);
     AplicaCaminhos(*itens);
     progresso.Definir(100);

@@ -5,6 +5,8 @@
 #include "module/CIProgress.h"
 #include "readers/CEAtributo.h"
 
+#include <QRegularExpression>
+
 namespace {
 
 using WireReaderTest = FioFixture;
@@ -644,6 +646,99 @@ TEST_F(WirePagesTest, ThePagePickerOfTheTemplateChoosesThePages) {
         semPicker.LerDados(&db(), QStringList{kPagina1}, modelo_, progresso));
     EXPECT_EQ(todos->size(), 4u);
     todos->destruirItens();
+}
+
+// ---- the fields a list keeps of the ends
+
+class WireListFieldsTest : public FioFixture {
+protected:
+    void SetUp() override {
+        FioFixture::SetUp();
+        borne("X1", "1", {20, 200, 0});
+        componente("-K1", {{"A1", {20, 150, 0}}});
+        zvdb::BlockReference* pino =
+            simbolo("PIN-1", {20, 120, 0}, {{"ID_PINO", "3", {25, 115, 0}}}, "9011");
+        pino->setXData("ZV_PINO", zvsample::XDataItems().text("-X5").tags());
+        borne("X1", "2", {20, 80, 0});
+        fio({{20, 190, 0}, {20, 150, 0}, {20, 120, 0}, {20, 80, 0}}, "12");
+        CICad::SetStringLisp("*DIRETORIO_REDE*", pasta_.path() + "/");
+        modelo_.simbolos["FUNCAO_LSTGRW"] = "LISTAS";
+        modelo_.simbolos["LISTA_DETALHE"] = "BLOCOS\\LINHA";
+    }
+    // The row block's file, with these attribute definitions (tag and default text).
+    void linha(const std::vector<std::pair<std::string, std::string>>& atributos) {
+        zvdb::Database bloco;
+        double x = 0;
+        for (const auto& [tag, valor] : atributos)
+            bloco.modelSpace()->addAttributeDefinition(tag, tag, valor, {x += 10, -4, 0}, 2.0);
+        const QString caminho = pasta_.filePath("BLOCOS/LINHA.dxf");
+        QDir().mkpath(QFileInfo(caminho).path());
+        zvdb::DxfWriter::saveFile(bloco, caminho.toStdString());
+    }
+    // Each stretch's fields as "name=value", in the reader's order.
+    std::vector<QStringList> campos(const VetorItens& itens) {
+        std::vector<QStringList> todos;
+        for (const CEItemLista* item : itens) {
+            QStringList deste;
+            for (auto c = item->campos.begin(); c != item->campos.end(); ++c)
+                deste << c.key() + "=" + c.value();
+            todos.push_back(deste);
+        }
+        return todos;
+    }
+    std::vector<QStringList> lista() {
+        CCFioDataReader leitor;
+        CIProgress progresso;
+        std::unique_ptr<VetorItens> lidos(leitor.LerDados(&db(), std::nullopt, modelo_, progresso));
+        const std::vector<QStringList> lidas = campos(*lidos);
+        lidos->destruirItens();
+        return lidas;
+    }
+};
+
+TEST_F(WireListFieldsTest, TheStretchesKeepOfTheirEndsWhatTheRowsAndTheWalkReadAndAFunctionAll) {
+    CCFioDataReader leitor;
+    const std::vector<QStringList> inteiros = campos(le(leitor));
+    ASSERT_EQ(inteiros.size(), 3u);
+    // A full reading holds every field of the ends.
+    for (const char* campo : {"QTD_INI=", "DESCRICAO_FIM=", "FIO_SEGFIM=", "HANDLE_INI="})
+        ASSERT_FALSE(inteiros[0].filter(campo).isEmpty()) << campo;
+    linha({{"VARIAVEL_1", "FIO"}, {"VARIAVEL_2", "zv_key_fim"}, {"VARIAVEL_3", "FIO_SEGINI"}});
+    const std::vector<QStringList> lidos = lista();
+    ASSERT_EQ(lidos.size(), inteiros.size());
+    for (size_t k = 0; k < lidos.size(); ++k) {
+        SCOPED_TRACE(k);
+        QStringList esperados;
+        for (const QString& campo : inteiros[k]) {
+            const QString nome = campo.section('=', 0, 0);
+            const bool ponta = nome.endsWith("_INI") || nome.endsWith("_FIM");
+            // The wire's own fields, the cells' and the walk's: the relations composed from
+            // the pin's connector and pin, the element's layer where the wire is looked for.
+            if (!nome.contains("_SEG") && !ponta) esperados << campo;
+            for (const char* lido : {"ZV_KEY_FIM", "LAYER_", "REL_", "LIG_", "RELACAO_", "TAG_",
+                                     "ETIQUETA_", "ID_PINO_", "REGUA_", "NUMERO_", "CONECTOR_"})
+                if (ponta && nome.startsWith(lido) && !nome.contains("_SEG")) esperados << campo;
+            if (nome == "FIO_SEGINI") esperados << campo;
+        }
+        esperados.removeDuplicates();
+        EXPECT_EQ(lidos[k].join(' ').toStdString(), esperados.join(' ').toStdString());
+        // What no one reads stays behind.
+        EXPECT_TRUE(lidos[k]
+                        .filter(QRegularExpression("^(QTD_INI|DESCRICAO_FIM|FIO_SEGFIM|"
+                                                   "HANDLE_INI)="))
+                        .isEmpty());
+    }
+    // The pin's end is composed from its connector and pin.
+    EXPECT_TRUE(std::any_of(lidos.begin(), lidos.end(), [](const QStringList& campos) {
+        return campos.contains("REL_FIM=-X5") && campos.contains("LIG_FIM=3");
+    }));
+
+    // A function in the row may read any field: every one is kept.
+    linha({{"VARIAVEL_1", "FIO"}, {"FUNCAO_1", "(cdr (assoc \"QTD_INI\" reg))"}});
+    const std::vector<QStringList> todos = lista();
+    ASSERT_EQ(todos.size(), inteiros.size());
+    for (size_t k = 0; k < todos.size(); ++k)
+        EXPECT_EQ(todos[k].join(' ').toStdString(), inteiros[k].join(' ').toStdString());
 }
 
 // ---- the relation texts of an end
