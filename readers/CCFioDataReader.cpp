@@ -47,20 +47,34 @@ const NomesExtremidade& Nomes(const QString& sufixo) {
     return porSufixo.insert(sufixo, n).value();
 }
 
-// What the walk reads of an end's fields, under each end's suffix, with the names the list
-// reads (in upper case): the stretches copy no other field of their ends. None: every field.
-std::function<bool(const QString&)> CamposDasPontas(std::optional<QSet<QString>> nomes) {
-    if (!nomes) return {};
+// The names (in upper case) read of a list's stretches once they are made: the list's own,
+// the wire's number under any language's name and the ends' relations, which the routes
+// look up.
+QSet<QString> CamposDepois(QSet<QString> nomes) {
+    for (int i = 1; i <= 3; ++i)
+        nomes << Tag(CampoTraduzido::Fio, i);
+    nomes << QStringLiteral("FIO") << QStringLiteral("RELACAO_INI")
+          << QStringLiteral("RELACAO_FIM");
+    return nomes;
+}
+
+// And while the walk makes them: an end's layer, connector, relation, connection, pin, strip
+// and number.
+QSet<QString> CamposDurante(QSet<QString> nomes) {
     for (const QString& sufixo : {QStringLiteral("_INI"), QStringLiteral("_FIM")}) {
         for (const char* nome : {"LAYER", "CONECTOR", "REL", "LIG"})
-            *nomes << QLatin1String(nome) + sufixo;
+            nomes << QLatin1String(nome) + sufixo;
         for (const CampoTraduzido campo : {CampoTraduzido::Pino, CampoTraduzido::Relacao,
                                            CampoTraduzido::Regua, CampoTraduzido::Numero})
             for (int i = 1; i <= 3; ++i)
-                *nomes << Tag(campo, i) + sufixo;
+                nomes << Tag(campo, i) + sufixo;
     }
+    return nomes;
+}
+
+std::function<bool(const QString&)> Filtro(QSet<QString> nomes) {
     return
-        [nomes = std::move(*nomes)](const QString& nome) { return nomes.contains(nome.toUpper()); };
+        [nomes = std::move(nomes)](const QString& nome) { return nomes.contains(nome.toUpper()); };
 }
 
 // A copy of `origem` whose field array has room for `lugares` fields from the start: a
@@ -142,14 +156,32 @@ VetorItens* CCFioDataReader::LerDados(zvdb::Database* database,
         SelecionaPaginas(false, escolhidas);
     auto* itens = new VetorItens;
     progresso.Definir(0);
-    // A list holds every stretch at once: each keeps of its ends only what is read of them.
-    FiltraSufixos(CamposDasPontas(CCFioGrfWriter::CamposDasLinhas(modelo)));
+    // A list holds every stretch at once: each keeps only what is read of it.
+    LimitaCampos(CCFioGrfWriter::CamposDasLinhas(modelo));
     const std::unique_ptr<VetorItens> lidos(LeFios(escolhidas, &modelo, &progresso));
-    FiltraSufixos({});
+    LimitaCampos(std::nullopt);
     itens->juntarSemRepetir(*lidos);
     AplicaCaminhos(*itens);
     progresso.Definir(100);
     return itens;
+}
+
+void CCFioDataReader::LimitaCampos(const std::optional<QSet<QString>>& lista) {
+    const std::optional<QSet<QString>> depois =
+        lista ? std::optional(CamposDepois(*lista)) : std::nullopt;
+    depois_ = {depois ? Filtro(*depois) : nullptr, {}};
+    durante_ = {depois ? Filtro(CamposDurante(*depois)) : nullptr, {}};
+    FiltraSufixos(durante_.fica);
+}
+
+void CCFioDataReader::CamposLidos::Retem(CEItemLista& item) {
+    if (!fica) return;
+    item.campos.reter([this](std::uint32_t numero) {
+        if (numero >= porNumero.size()) porNumero.resize(numero + 1, 0);
+        char& lido = porNumero[numero];
+        if (!lido) lido = fica(CamposItem::nome(numero)) ? 1 : 2;
+        return lido == 1;
+    });
 }
 
 std::vector<OdDbObjectId> CCFioDataReader::ListaFios(const QStringList& layers) {
@@ -372,6 +404,8 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
         }
         item->definirCampo(NumeroCampo<"ZV_LISTA_TIPO">(), kTipoFio);
         numeros.insert(numero);
+        // The filter has seen the wire's fields: its stretches start from those read.
+        durante_.Retem(*item);
 
         const TabelaConexoes::Textos elementos =
             ListaConexoes(numero).value_or(TabelaConexoes::Textos());
@@ -411,8 +445,10 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
             lugares = std::max(lugares, trecho.first->campos.size());
         // The wire's stretches are complete: their spare room goes back now, not after the
         // whole walk, so the room of every stretch read is not held at once.
-        for (CEItemLista* trecho = item; trecho; trecho = trecho->ligado)
+        for (CEItemLista* trecho = item; trecho; trecho = trecho->ligado) {
+            depois_.Retem(*trecho);
             PartilhaNomes(*trecho);
+        }
         // The first stretch stands behind the later ones; the writer sorts.
         itens->push_back(item);
     }
