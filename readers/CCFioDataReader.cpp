@@ -172,6 +172,14 @@ void CCFioDataReader::LimitaCampos(const std::optional<QSet<QString>>& lista) {
     depois_ = {depois ? Filtro(*depois) : nullptr, {}};
     durante_ = {depois ? Filtro(CamposDurante(*depois)) : nullptr, {}};
     FiltraSufixos(durante_.fica);
+    // The elements are read for their copies at the ends alone.
+    std::function<bool(const QString&)> dasPontas;
+    if (depois)
+        dasPontas = [fica = durante_.fica](const QString& nome) {
+            return fica(nome) || fica(nome + QLatin1String("_INI")) ||
+                   fica(nome + QLatin1String("_FIM"));
+        };
+    LeSoCampos(std::move(dasPontas));
 }
 
 void CCFioDataReader::CamposLidos::Retem(CEItemLista& item) {

@@ -688,6 +688,9 @@ protected:
     }
     std::vector<QStringList> lista() {
         CCFioDataReader leitor;
+        return lista(leitor);
+    }
+    std::vector<QStringList> lista(CCFioDataReader& leitor) {
         CIProgress progresso;
         std::unique_ptr<VetorItens> lidos(leitor.LerDados(&db(), std::nullopt, modelo_, progresso));
         const std::vector<QStringList> lidas = campos(*lidos);
@@ -719,6 +722,14 @@ TEST_F(WireListFieldsTest, TheStretchesKeepWhatTheListReadsAndAFunctionKeepsEver
     EXPECT_TRUE(std::any_of(lidos.begin(), lidos.end(), [](const QStringList& campos) {
         return campos.contains("RELACAO_FIM=-X5:3");
     }));
+    // The same reader reads every field again once the list is made.
+    CCFioDataReader mesmo;
+    lista(mesmo);
+    itens_.destruirItens();
+    const std::vector<QStringList> depois = campos(le(mesmo));
+    ASSERT_EQ(depois.size(), inteiros.size());
+    for (size_t k = 0; k < depois.size(); ++k)
+        EXPECT_EQ(depois[k].join(' ').toStdString(), inteiros[k].join(' ').toStdString());
 
     // A function in the row may read any field: every one is kept.
     linha({{"VARIAVEL_1", "FIO"}, {"FUNCAO_1", "(cdr (assoc \"QTD_INI\" reg))"}});
