@@ -7,6 +7,7 @@
 #include "lists/CETemplate.h"
 #include "module/CIProgress.h"
 
+#include <algorithm>
 #include <functional>
 #include <memory>
 #include <unordered_set>
@@ -170,8 +171,18 @@ void CCFioDataReader::LimitaCampos(const std::optional<QSet<QString>>& lista) {
     const std::optional<QSet<QString>> depois =
         lista ? std::optional(CamposDepois(*lista)) : std::nullopt;
     depois_ = {depois ? Filtro(*depois) : nullptr, {}};
-    durante_ = {depois ? Filtro(CamposDurante(*depois)) : nullptr, {}};
+    const std::optional<QSet<QString>> durante =
+        depois ? std::optional(CamposDurante(*depois)) : std::nullopt;
+    durante_ = {durante ? Filtro(*durante) : nullptr, {}};
     FiltraSufixos(durante_.fica);
+    auto algumCom = [&durante](const char* sufixo) {
+        return !durante ||
+               std::any_of(durante->begin(), durante->end(), [sufixo](const QString& nome) {
+                   return nome.endsWith(QLatin1String(sufixo));
+               });
+    };
+    segmentoIni_ = algumCom("_SEGINI");
+    segmentoFim_ = algumCom("_SEGFIM");
     // The elements are read for their copies at the ends alone.
     std::function<bool(const QString&)> dasPontas;
     if (depois)
@@ -363,7 +374,8 @@ void CCFioDataReader::PreencheExtremidade(const QString& lado, CEItemLista& item
     CopiaEntidade(sufixo, item, Elemento(numero, elementos, indice), modelo);
     // The wire's number comes from the walk: an element's fields copied under the suffix
     // never hold a field of the wire without one, so the item's number stays the wire's.
-    LeSegmentoNoIndice(lado, item, numero, indice, modelo);
+    if (lado == kIni ? segmentoIni_ : segmentoFim_)
+        LeSegmentoNoIndice(lado, item, numero, indice, modelo);
     CompoeExtremidade(sufixo, item, modelo, numero, indice);
 }
 

@@ -113,6 +113,9 @@ private:
         void Retem(CEItemLista& item);
     };
     CamposLidos durante_, depois_;
+    // Whether the copy of the wire found at the start (end) of a stretch keeps a field: one
+    // that keeps none is not looked for.
+    bool segmentoIni_ = true, segmentoFim_ = true;
     // `lista`: the names (in upper case) the list reads of the items; none: all.
     void LimitaCampos(const std::optional<QSet<QString>>& lista);
     // The wire's item from its polyline; null without a key.
