@@ -183,6 +183,8 @@ void CCFioDataReader::LimitaCampos(const std::optional<QSet<QString>>& lista) {
     };
     segmentoIni_ = algumCom("_SEGINI");
     segmentoFim_ = algumCom("_SEGFIM");
+    // Without those copies each wire polyline is copied once, into its own item.
+    GuardaFios = segmentoIni_ || segmentoFim_;
     // The elements are read for their copies at the ends alone.
     std::function<bool(const QString&)> dasPontas;
     if (depois)

@@ -722,6 +722,16 @@ TEST_F(WireListFieldsTest, TheStretchesKeepWhatTheListReadsAndAFunctionKeepsEver
     EXPECT_TRUE(std::any_of(lidos.begin(), lidos.end(), [](const QStringList& campos) {
         return campos.contains("RELACAO_FIM=-X5:3");
     }));
+    // Without a cell at the wire found at an end, the wire is not looked for there, and each
+    // polyline's reading goes whole into its item.
+    linha({{"VARIAVEL_1", "FIO"}, {"VARIAVEL_2", "DESCRICAO"}, {"VARIAVEL_3", "GRUPO"}});
+    const std::vector<QStringList> semSegmento = lista();
+    ASSERT_EQ(semSegmento.size(), inteiros.size());
+    const QRegularExpression semSegmentoDaLista(
+        "^(FIO|DESCRICAO|GRUPO|COMPRIMENTO|RELACAO_INI|RELACAO_FIM)=");
+    for (size_t k = 0; k < semSegmento.size(); ++k)
+        EXPECT_EQ(semSegmento[k].join(' ').toStdString(),
+                  inteiros[k].filter(semSegmentoDaLista).join(' ').toStdString());
     // The same reader reads every field again once the list is made.
     CCFioDataReader mesmo;
     lista(mesmo);
