@@ -180,6 +180,9 @@ public:
     // from the file alone. Null when neither is there.
     static std::unique_ptr<zv::CEListaAtributos> LeDefinicoesAtributos(const QString& arquivo,
                                                                        const QString& nome);
+    // Those of the block file alone, as the lists define their blocks from it; null when the
+    // file does not read. Quiet: the import that follows tells what is wrong with the file.
+    static std::unique_ptr<zv::CEListaAtributos> LeDefinicoesDoArquivo(const QString& arquivo);
     static OdDbObjectId GetReferenciaNoLayer(const QString& nome, const QString& layer);
     static QString GetValorSimboloPagina(const QString& tag, const QString& nome,
                                          const QString& layer);

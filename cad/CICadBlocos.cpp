@@ -324,6 +324,10 @@ std::unique_ptr<zv::CEListaAtributos> CICad::LeDefinicoesAtributos(const QString
                                                                    const QString& nome) {
     OdDbObjectId id;
     if (GetBlocoId(nome, id)) return DefinicoesDe(Como<zvdb::BlockRecord>(id), true);
+    return LeDefinicoesDoArquivo(arquivo);
+}
+
+std::unique_ptr<zv::CEListaAtributos> CICad::LeDefinicoesDoArquivo(const QString& arquivo) {
     const QString caminho = ResolveArquivo(arquivo);
     if (!QFileInfo(caminho).isFile()) return nullptr;
     // Quietly: the insertion that follows tells the user what is wrong with the file.

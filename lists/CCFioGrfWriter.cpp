@@ -8,6 +8,7 @@
 #include "readers/ZVString.h"
 
 #include <cstdint>
+#include <iterator>
 #include <optional>
 #include <span>
 #include <string_view>
@@ -15,6 +16,13 @@
 namespace {
 
 enum { kCabecalho, kDetalhe, kPrimeira, kRodape, kTotal };
+
+// The template's symbol of each block, and the prefix of the block's name in the drawing.
+const char* const kSimbolos[] = {"LISTA_CABEC", "LISTA_DETALHE", "LISTA_DETALHE_PRIM",
+                                 "LISTA_RODAPE", "LISTA_TOTAL"};
+const char* const kPrefixos[] = {"BLK_CTR_LST_CABEC_CABLA", "BLK_CTR_LST_DET_CABLA",
+                                 "BLK_CTR_LST_DET_PRIM", "BLK_CTR_LST_RODAPE_CABLA",
+                                 "BLK_CTR_LST_TOTAL_CABLA"};
 
 using Grade = CCListaPaginada::Grade;
 
@@ -54,6 +62,49 @@ QStringList CCFioGrfWriter::CamposTotal(const CCListaPaginada::Bloco& total) {
             campos << definicao.GetValor();
     }
     return campos;
+}
+
+namespace {
+
+// A name as the list looks it up, and in upper case: the filter compares in upper case.
+void JuntaNome(QSet<QString>& nomes, const QString& nome) {
+    nomes << nome.toUpper() << nome.trimmed().toUpper();
+}
+
+// The tags and default texts of the definitions; false when one of them is a function.
+bool JuntaDefinicoes(const zv::CEListaAtributos* definicoes, QSet<QString>& nomes) {
+    for (int i = 0; definicoes && i < definicoes->Quantidade(); ++i) {
+        const zv::CEAtributo& definicao = (*definicoes)[i];
+        if (CCListaPaginada::EhFuncao(definicao.GetTag())) return false;
+        JuntaNome(nomes, definicao.GetTag());
+        JuntaNome(nomes, definicao.GetValor());
+    }
+    return true;
+}
+
+}  // namespace
+
+std::optional<QSet<QString>> CCFioGrfWriter::CamposDasLinhas(CETemplate& modelo) {
+    QSet<QString> nomes;
+    const QString grupo = modelo.LerTexto("FUNCAO_LSTGRW");
+    // The blocks whose references take an item's fields: the first-row block is never placed.
+    for (const size_t bloco : {size_t(kDetalhe), size_t(kTotal)}) {
+        const QString valor = modelo.LerTexto(kSimbolos[bloco]);
+        if (valor.isEmpty()) continue;
+        const QString arquivo = CCListaPaginada::CaminhoBloco(valor);
+        if (!JuntaDefinicoes(CICad::LeDefinicoesDoArquivo(arquivo).get(), nomes))
+            return std::nullopt;
+        OdDbObjectId id;
+        const QString nome = kPrefixos[bloco] + grupo;
+        if (CICad::GetBlocoId(nome, id) &&
+            !JuntaDefinicoes(CICad::LeDefinicoesAtributos(arquivo, nome).get(), nomes))
+            return std::nullopt;
+    }
+    for (const char* lista : {"*LISTA_DE_SORT*", "*ZV_CHAVE_QUEBRA_PAGINA*"})
+        for (const QString& nome : modelo.LerListaTexto(lista))
+            JuntaNome(nomes, nome);
+    JuntaNome(nomes, QStringLiteral("COMPRIMENTO"));
+    return nomes;
 }
 
 bool CCFioGrfWriter::QuebraComBranco(CETemplate& modelo) {
@@ -247,12 +298,12 @@ void CCFioGrfWriter::EscreverItens(VetorItens& itens, CETemplate& modelo) {
     grupo_ = modelo.LerTexto("FUNCAO_LSTGRW");
     variasColunas_ = modelo.LerLogico("*COLUNA_SN*");
     digitos_ = CICad::GetIntLisp("PBLINTFIODGTSAFTERDOT", 0);
-    blocos_ = CCListaPaginada::ResolveBlocos(
-        modelo,
-        {"LISTA_CABEC", "LISTA_DETALHE", "LISTA_DETALHE_PRIM", "LISTA_RODAPE", "LISTA_TOTAL"},
-        {"BLK_CTR_LST_CABEC_CABLA", "BLK_CTR_LST_DET_CABLA", "BLK_CTR_LST_DET_PRIM",
-         "BLK_CTR_LST_RODAPE_CABLA", "BLK_CTR_LST_TOTAL_CABLA"},
-        grupo_);
+    QStringList simbolos, prefixos;
+    for (size_t i = 0; i < std::size(kSimbolos); ++i) {
+        simbolos << kSimbolos[i];
+        prefixos << kPrefixos[i];
+    }
+    blocos_ = CCListaPaginada::ResolveBlocos(modelo, simbolos, prefixos, grupo_);
     std::vector<CEPaginaLista> paginas = Diagrama(itens, modelo, CamposTotal(blocos_[kTotal]));
     CCListaPaginada::CriaPaginas(grupo_, paginas);
     for (const CEPaginaLista& pagina : paginas) {

@@ -6,6 +6,7 @@
 #include "module/CCDataWriter.h"
 
 #include <QHash>
+#include <QSet>
 
 #include <optional>
 #include <utility>
@@ -29,6 +30,11 @@ public:
     static QStringList CamposTotal(const CCListaPaginada::Bloco& total);
     // A VARIAVEL cell of a row: the length prints as a number with `digitos` decimals.
     static QString ValorVariavel(const CEItemLista& item, const QString& campo, int digitos);
+    // The names (in upper case) of the fields a list of the template reads of its items: the
+    // sort and break fields, the length, and the tags and default texts of the row and total
+    // blocks as the list defines them (from their files; the drawing's own, kept when a file
+    // fails, count too). None when one of those blocks has a function, which reads any field.
+    static std::optional<QSet<QString>> CamposDasLinhas(CETemplate& modelo);
 
 protected:
     // Fills a detail or total row inserted at the row's point.

@@ -899,6 +899,22 @@ size_t CCDataReader::HashNomes::operator()(const std::vector<std::uint32_t>& nom
     return h;
 }
 
+void CCDataReader::LeSoCampos(std::function<bool(const QString& nome)> quer) {
+    querNome_ = std::move(quer);
+    queridos_.clear();
+    entidadesLidas_.libera();
+    entidadesAntigas_.libera();
+    avulsa_ = EntidadeLida();
+}
+
+bool CCDataReader::Quer(std::uint32_t nome) {
+    if (!querNome_) return true;
+    if (nome >= queridos_.size()) queridos_.resize(nome + 1, 0);
+    char& querido = queridos_[nome];
+    if (!querido) querido = querNome_(CamposItem::nome(nome)) ? 1 : 2;
+    return querido == 1;
+}
+
 void CCDataReader::FiltraSufixos(std::function<bool(const QString& nome)> fica) {
     ficaComSufixo_ = std::move(fica);
     // The names under each suffix were put in order for the filter before.

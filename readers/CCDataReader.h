@@ -170,6 +170,10 @@ protected:
     // By name number, the only fields a symbol's reading writes (none past the end); null:
     // every field. For a reader that keeps a few fields of many symbols.
     const std::vector<char>* CamposLidos = nullptr;
+    // Without CamposLidos, the same told by the names' texts, each name asked once: for a
+    // reader that knows the names it keeps before they are numbered. Setting it forgets the
+    // readings kept. Unset: every field.
+    void LeSoCampos(std::function<bool(const QString& nome)> quer);
     // Which names, under a suffix, a copy under that suffix writes; unset: every name. For a
     // reader whose items are asked for few of their neighbours' fields (the strip drawing's
     // terminals); set it before the read with FiltraSufixos.
@@ -297,6 +301,10 @@ private:
     // Unbounded unless the reader sets a bound: the other lists ask in orders that would read
     // many again.
     std::size_t limiteLidas_ = SIZE_MAX;
+    // What LeSoCampos set, and its answers by name number: 0 not asked yet, 1 written, 2 not.
+    std::function<bool(const QString&)> querNome_;
+    std::vector<char> queridos_;
+    bool Quer(std::uint32_t nome);
     // The entity's kept reading, read now when none is kept; a wire's or terminal's reading
     // that is not to be kept waits in `avulsa_` for the copy that asked, which takes its values.
     const EntidadeLida& EntidadeGuardada(const OdDbObjectId& id, CETemplate* modelo);

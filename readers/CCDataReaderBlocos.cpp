@@ -339,8 +339,8 @@ void CCDataReader::FazLote(const QString& s, const CamposItem& campos,
     lote_.clear();
     const std::vector<char>* lidos = CamposLidos;
     // A value no field will hold is not worked out: its name is still numbered in turn.
-    const auto quer = [lidos](std::uint32_t nome) {
-        return !lidos || (nome < lidos->size() && (*lidos)[nome]);
+    const auto quer = [this, lidos](std::uint32_t nome) {
+        return lidos ? nome < lidos->size() && (*lidos)[nome] : Quer(nome);
     };
     auto poe = [this, &quer](std::uint32_t nome, const QString& valor) {
         if (quer(nome)) lote_.push_back({nome, valor});

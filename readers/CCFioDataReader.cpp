@@ -3,9 +3,12 @@
 #include "CEAtributo.h"
 #include "NomeCampo.h"
 #include "SelecaoPaginas.h"
+#include "lists/CCFioGrfWriter.h"
 #include "lists/CETemplate.h"
 #include "module/CIProgress.h"
 
+#include <algorithm>
+#include <functional>
 #include <memory>
 #include <unordered_set>
 
@@ -43,6 +46,36 @@ const NomesExtremidade& Nomes(const QString& sufixo) {
         n.numero[size_t(i)] = NomeCampo(Tag(CampoTraduzido::Numero, i + 1) + sufixo);
     }
     return porSufixo.insert(sufixo, n).value();
+}
+
+// The names (in upper case) read of a list's stretches once they are made: the list's own,
+// the wire's number under any language's name and the ends' relations, which the routes
+// look up.
+QSet<QString> CamposDepois(QSet<QString> nomes) {
+    for (int i = 1; i <= 3; ++i)
+        nomes << Tag(CampoTraduzido::Fio, i);
+    nomes << QStringLiteral("FIO") << QStringLiteral("RELACAO_INI")
+          << QStringLiteral("RELACAO_FIM");
+    return nomes;
+}
+
+// And while the walk makes them: an end's layer, connector, relation, connection, pin, strip
+// and number.
+QSet<QString> CamposDurante(QSet<QString> nomes) {
+    for (const QString& sufixo : {QStringLiteral("_INI"), QStringLiteral("_FIM")}) {
+        for (const char* nome : {"LAYER", "CONECTOR", "REL", "LIG"})
+            nomes << QLatin1String(nome) + sufixo;
+        for (const CampoTraduzido campo : {CampoTraduzido::Pino, CampoTraduzido::Relacao,
+                                           CampoTraduzido::Regua, CampoTraduzido::Numero})
+            for (int i = 1; i <= 3; ++i)
+                nomes << Tag(campo, i) + sufixo;
+    }
+    return nomes;
+}
+
+std::function<bool(const QString&)> Filtro(QSet<QString> nomes) {
+    return
+        [nomes = std::move(nomes)](const QString& nome) { return nomes.contains(nome.toUpper()); };
 }
 
 // A copy of `origem` whose field array has room for `lugares` fields from the start: a
@@ -124,11 +157,52 @@ VetorItens* CCFioDataReader::LerDados(zvdb::Database* database,
         SelecionaPaginas(false, escolhidas);
     auto* itens = new VetorItens;
     progresso.Definir(0);
+    // A list holds every stretch at once: each keeps only what is read of it.
+    LimitaCampos(CCFioGrfWriter::CamposDasLinhas(modelo));
     const std::unique_ptr<VetorItens> lidos(LeFios(escolhidas, &modelo, &progresso));
+    LimitaCampos(std::nullopt);
     itens->juntarSemRepetir(*lidos);
     AplicaCaminhos(*itens);
     progresso.Definir(100);
     return itens;
+}
+
+void CCFioDataReader::LimitaCampos(const std::optional<QSet<QString>>& lista) {
+    const std::optional<QSet<QString>> depois =
+        lista ? std::optional(CamposDepois(*lista)) : std::nullopt;
+    depois_ = {depois ? Filtro(*depois) : nullptr, {}};
+    const std::optional<QSet<QString>> durante =
+        depois ? std::optional(CamposDurante(*depois)) : std::nullopt;
+    durante_ = {durante ? Filtro(*durante) : nullptr, {}};
+    FiltraSufixos(durante_.fica);
+    auto algumCom = [&durante](const char* sufixo) {
+        return !durante ||
+               std::any_of(durante->begin(), durante->end(), [sufixo](const QString& nome) {
+                   return nome.endsWith(QLatin1String(sufixo));
+               });
+    };
+    segmentoIni_ = algumCom("_SEGINI");
+    segmentoFim_ = algumCom("_SEGFIM");
+    // Without those copies each wire polyline is copied once, into its own item.
+    GuardaFios = segmentoIni_ || segmentoFim_;
+    // The elements are read for their copies at the ends alone.
+    std::function<bool(const QString&)> dasPontas;
+    if (depois)
+        dasPontas = [fica = durante_.fica](const QString& nome) {
+            return fica(nome) || fica(nome + QLatin1String("_INI")) ||
+                   fica(nome + QLatin1String("_FIM"));
+        };
+    LeSoCampos(std::move(dasPontas));
+}
+
+void CCFioDataReader::CamposLidos::Retem(CEItemLista& item) {
+    if (!fica) return;
+    item.campos.reter([this](std::uint32_t numero) {
+        if (numero >= porNumero.size()) porNumero.resize(numero + 1, 0);
+        char& lido = porNumero[numero];
+        if (!lido) lido = fica(CamposItem::nome(numero)) ? 1 : 2;
+        return lido == 1;
+    });
 }
 
 std::vector<OdDbObjectId> CCFioDataReader::ListaFios(const QStringList& layers) {
@@ -302,7 +376,8 @@ void CCFioDataReader::PreencheExtremidade(const QString& lado, CEItemLista& item
     CopiaEntidade(sufixo, item, Elemento(numero, elementos, indice), modelo);
     // The wire's number comes from the walk: an element's fields copied under the suffix
     // never hold a field of the wire without one, so the item's number stays the wire's.
-    LeSegmentoNoIndice(lado, item, numero, indice, modelo);
+    if (lado == kIni ? segmentoIni_ : segmentoFim_)
+        LeSegmentoNoIndice(lado, item, numero, indice, modelo);
     CompoeExtremidade(sufixo, item, modelo, numero, indice);
 }
 
@@ -351,6 +426,8 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
         }
         item->definirCampo(NumeroCampo<"ZV_LISTA_TIPO">(), kTipoFio);
         numeros.insert(numero);
+        // The filter has seen the wire's fields: its stretches start from those read.
+        durante_.Retem(*item);
 
         const TabelaConexoes::Textos elementos =
             ListaConexoes(numero).value_or(TabelaConexoes::Textos());
@@ -390,8 +467,10 @@ VetorItens* CCFioDataReader::LeFios(const std::optional<QStringList>& paginas, C
             lugares = std::max(lugares, trecho.first->campos.size());
         // The wire's stretches are complete: their spare room goes back now, not after the
         // whole walk, so the room of every stretch read is not held at once.
-        for (CEItemLista* trecho = item; trecho; trecho = trecho->ligado)
+        for (CEItemLista* trecho = item; trecho; trecho = trecho->ligado) {
+            depois_.Retem(*trecho);
             PartilhaNomes(*trecho);
+        }
         // The first stretch stands behind the later ones; the writer sorts.
         itens->push_back(item);
     }

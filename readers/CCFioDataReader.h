@@ -9,6 +9,7 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <optional>
 #include <span>
 #include <unordered_map>
@@ -102,6 +103,21 @@ public:
     }
 
 private:
+    // The fields read of a list's stretches while the walk makes them and once it has, by
+    // their names with the ends' suffixes: a copy of an end keeps no other, a stretch drops
+    // its wire's others once the template's filter has seen them, and the walk's own once
+    // the wire is done. Unset: every field.
+    struct CamposLidos {
+        std::function<bool(const QString&)> fica;
+        std::vector<char> porNumero;  // by name number: 0 not asked yet, 1 kept, 2 not
+        void Retem(CEItemLista& item);
+    };
+    CamposLidos durante_, depois_;
+    // Whether the copy of the wire found at the start (end) of a stretch keeps a field: one
+    // that keeps none is not looked for.
+    bool segmentoIni_ = true, segmentoFim_ = true;
+    // `lista`: the names (in upper case) the list reads of the items; none: all.
+    void LimitaCampos(const std::optional<QSet<QString>>& lista);
     // The wire's item from its polyline; null without a key.
     // `lugares`: room for that many fields, given before the first copy.
     CEItemLista* ItemFio(const OdDbObjectId& polilinha, CETemplate* modelo,

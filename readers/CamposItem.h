@@ -82,13 +82,11 @@ public:
     void reservar(std::size_t n) { campos_.reserve(n); }
     // Gives back the spare room of the array once the item is complete.
     void compactar() { campos_.shrink_to_fit(); }
-    // Keeps the fields whose name number `fica` accepts, in their order, and gives back the
-    // room of the others.
+    // Keeps the fields whose name number `fica` accepts, in their order; the room of the
+    // others stays until compactar (an item still being filled would take it again).
     template <class Fica>
     void reter(Fica fica) {
-        const auto antes = campos_.size();
         std::erase_if(campos_, [&fica](const Campo& campo) { return !fica(campo.nome); });
-        if (campos_.size() != antes) campos_.shrink_to_fit();
     }
 
     const_iterator begin() const { return const_iterator(campos_.data()); }

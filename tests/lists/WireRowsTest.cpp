@@ -42,14 +42,15 @@ protected:
     }
 
     // The row block's file, with these attribute definitions (tag and default text).
-    void Bloco(const std::vector<std::pair<QString, QString>>& atributos) {
+    void Bloco(const std::vector<std::pair<QString, QString>>& atributos,
+               const QString& nome = "LINHA") {
         zvdb::Database bloco;
         bloco.modelSpace()->addLwPolyline({{0, 0}, {100, 0}, {100, -5}, {0, -5}}, true);
         double x = 0;
         for (const auto& [tag, valor] : atributos)
             bloco.modelSpace()->addAttributeDefinition(tag.toStdString(), tag.toStdString(),
                                                        valor.toStdString(), {x += 10, -4, 0}, 2.0);
-        const QString caminho = pasta_.filePath("BLOCOS/LINHA.dxf");
+        const QString caminho = pasta_.filePath("BLOCOS/" + nome + ".dxf");
         QDir().mkpath(QFileInfo(caminho).path());
         zvdb::DxfWriter::saveFile(bloco, caminho.toStdString());
     }
@@ -108,6 +109,34 @@ TEST_F(WireRowsTest, EveryCellIsFilledFromItsRowAndABlockThatGainsAFunctionRunsI
     EXPECT_EQ(Linhas(), QStringList({"VARIAVEL_1=1 FUNCAO_1=F1 VARIAVEL_2=" + c1,
                                      "VARIAVEL_1=2 FUNCAO_1=F2 VARIAVEL_2=" + c2,
                                      "VARIAVEL_1=3 FUNCAO_1=F3 VARIAVEL_2="}));
+}
+
+TEST_F(WireRowsTest, TheFieldsOfTheRowsAreThoseTheirBlocksSortAndBreaksNameUnlessAFunctionReads) {
+    modelo_.simbolos["*ZV_CHAVE_QUEBRA_PAGINA*"] = QStringList{"grupo "};
+    modelo_.simbolos["LISTA_TOTAL"] = "BLOCOS\\SOMA";
+    Bloco({{"VARIAVEL_S", "COMPRIMENTO_TOTAL"}}, "SOMA");
+    auto nomes = [this] {
+        const std::optional<QSet<QString>> lidos = CCFioGrfWriter::CamposDasLinhas(modelo_);
+        if (!lidos) return QStringList{"(all)"};
+        QStringList ordenados(lidos->begin(), lidos->end());
+        ordenados.sort();
+        return ordenados;
+    };
+    EXPECT_EQ(nomes(), QStringList({"COMPRIMENTO", "COMPRIMENTO_TOTAL", "FIO", "FIXO", "GRUPO",
+                                    "GRUPO ", "ROTULO", "VARIAVEL_1", "VARIAVEL_2", "VARIAVEL_S"}));
+    // A list defines its row block from the file again: the drawing's older one counts too.
+    Fio("1", "12.5");
+    CCFioGrfWriter().EscreverItens(itens_, modelo_);
+    Bloco({{"VARIAVEL_1", "NOVO"}});
+    EXPECT_EQ(nomes(),
+              QStringList({"COMPRIMENTO", "COMPRIMENTO_TOTAL", "FIO", "FIXO", "GRUPO", "GRUPO ",
+                           "NOVO", "ROTULO", "VARIAVEL_1", "VARIAVEL_2", "VARIAVEL_S"}));
+    // A function in the row or the total may read any field.
+    Bloco({{"VARIAVEL_1", "FIO"}, {"function_1", "(princ)"}});
+    EXPECT_EQ(nomes(), QStringList{"(all)"});
+    Bloco({{"VARIAVEL_1", "FIO"}});
+    Bloco({{"FUNCAO_S", "(princ)"}}, "SOMA");
+    EXPECT_EQ(nomes(), QStringList{"(all)"});
 }
 
 TEST_F(WireRowsTest, RowsOfOneLengthPrintItAlikeAndTheNextListTakesTheDigitsSetSince) {

@@ -5,6 +5,8 @@
 #include "module/CIProgress.h"
 #include "readers/CEAtributo.h"
 
+#include <QRegularExpression>
+
 namespace {
 
 using WireReaderTest = FioFixture;
@@ -644,6 +646,107 @@ TEST_F(WirePagesTest, ThePagePickerOfTheTemplateChoosesThePages) {
         semPicker.LerDados(&db(), QStringList{kPagina1}, modelo_, progresso));
     EXPECT_EQ(todos->size(), 4u);
     todos->destruirItens();
+}
+
+// ---- the fields a list keeps of the ends
+
+class WireListFieldsTest : public FioFixture {
+protected:
+    void SetUp() override {
+        FioFixture::SetUp();
+        borne("X1", "1", {20, 200, 0});
+        componente("-K1", {{"A1", {20, 150, 0}}});
+        zvdb::BlockReference* pino =
+            simbolo("PIN-1", {20, 120, 0}, {{"ID_PINO", "3", {25, 115, 0}}}, "9011");
+        pino->setXData("ZV_PINO", zvsample::XDataItems().text("-X5").tags());
+        borne("X1", "2", {20, 80, 0});
+        fio({{20, 190, 0}, {20, 150, 0}, {20, 120, 0}, {20, 80, 0}}, "12");
+        CICad::SetStringLisp("*DIRETORIO_REDE*", pasta_.path() + "/");
+        modelo_.simbolos["FUNCAO_LSTGRW"] = "LISTAS";
+        modelo_.simbolos["LISTA_DETALHE"] = "BLOCOS\\LINHA";
+    }
+    // The row block's file, with these attribute definitions (tag and default text).
+    void linha(const std::vector<std::pair<std::string, std::string>>& atributos) {
+        zvdb::Database bloco;
+        double x = 0;
+        for (const auto& [tag, valor] : atributos)
+            bloco.modelSpace()->addAttributeDefinition(tag, tag, valor, {x += 10, -4, 0}, 2.0);
+        const QString caminho = pasta_.filePath("BLOCOS/LINHA.dxf");
+        QDir().mkpath(QFileInfo(caminho).path());
+        zvdb::DxfWriter::saveFile(bloco, caminho.toStdString());
+    }
+    // Each stretch's fields as "name=value", in the reader's order.
+    std::vector<QStringList> campos(const VetorItens& itens) {
+        std::vector<QStringList> todos;
+        for (const CEItemLista* item : itens) {
+            QStringList deste;
+            for (auto c = item->campos.begin(); c != item->campos.end(); ++c)
+                deste << c.key() + "=" + c.value();
+            todos.push_back(deste);
+        }
+        return todos;
+    }
+    std::vector<QStringList> lista() {
+        CCFioDataReader leitor;
+        return lista(leitor);
+    }
+    std::vector<QStringList> lista(CCFioDataReader& leitor) {
+        CIProgress progresso;
+        std::unique_ptr<VetorItens> lidos(leitor.LerDados(&db(), std::nullopt, modelo_, progresso));
+        const std::vector<QStringList> lidas = campos(*lidos);
+        lidos->destruirItens();
+        return lidas;
+    }
+};
+
+TEST_F(WireListFieldsTest, TheStretchesKeepWhatTheListReadsAndAFunctionKeepsEveryField) {
+    CCFioDataReader leitor;
+    const std::vector<QStringList> inteiros = campos(le(leitor));
+    ASSERT_EQ(inteiros.size(), 3u);
+    // A full reading holds every field of the wire and of its ends, and what the walk wrote.
+    for (const char* campo : {"WIRE_LISTA", "DESCRICAO", "QTD_INI", "DESCRICAO_FIM", "FIO_SEGFIM",
+                              "HANDLE_INI", "LAYER_INI", "REL_INI", "LENGTH"})
+        ASSERT_FALSE(inteiros[0].filter(QRegularExpression(QString("^") + campo + "=")).isEmpty())
+            << campo;
+    linha({{"VARIAVEL_1", "FIO"}, {"VARIAVEL_2", "zv_key_fim"}, {"VARIAVEL_3", "FIO_SEGINI"}});
+    const std::vector<QStringList> lidos = lista();
+    ASSERT_EQ(lidos.size(), inteiros.size());
+    // The cells' fields, the length and the ends' relations (the routes look them up), as a
+    // full reading gives them: the relations come from fields the walk read and dropped.
+    const QRegularExpression daLista(
+        "^(FIO|ZV_KEY_FIM|FIO_SEGINI|COMPRIMENTO|RELACAO_INI|RELACAO_FIM)=");
+    for (size_t k = 0; k < lidos.size(); ++k)
+        EXPECT_EQ(lidos[k].join(' ').toStdString(),
+                  inteiros[k].filter(daLista).join(' ').toStdString());
+    // The pin's end: its connector and pin.
+    EXPECT_TRUE(std::any_of(lidos.begin(), lidos.end(), [](const QStringList& campos) {
+        return campos.contains("RELACAO_FIM=-X5:3");
+    }));
+    // Without a cell at the wire found at an end, the wire is not looked for there, and each
+    // polyline's reading goes whole into its item.
+    linha({{"VARIAVEL_1", "FIO"}, {"VARIAVEL_2", "DESCRICAO"}, {"VARIAVEL_3", "GRUPO"}});
+    const std::vector<QStringList> semSegmento = lista();
+    ASSERT_EQ(semSegmento.size(), inteiros.size());
+    const QRegularExpression semSegmentoDaLista(
+        "^(FIO|DESCRICAO|GRUPO|COMPRIMENTO|RELACAO_INI|RELACAO_FIM)=");
+    for (size_t k = 0; k < semSegmento.size(); ++k)
+        EXPECT_EQ(semSegmento[k].join(' ').toStdString(),
+                  inteiros[k].filter(semSegmentoDaLista).join(' ').toStdString());
+    // The same reader reads every field again once the list is made.
+    CCFioDataReader mesmo;
+    lista(mesmo);
+    itens_.destruirItens();
+    const std::vector<QStringList> depois = campos(le(mesmo));
+    ASSERT_EQ(depois.size(), inteiros.size());
+    for (size_t k = 0; k < depois.size(); ++k)
+        EXPECT_EQ(depois[k].join(' ').toStdString(), inteiros[k].join(' ').toStdString());
+
+    // A function in the row may read any field: every one is kept.
+    linha({{"VARIAVEL_1", "FIO"}, {"FUNCAO_1", "(cdr (assoc \"QTD_INI\" reg))"}});
+    const std::vector<QStringList> todos = lista();
+    ASSERT_EQ(todos.size(), inteiros.size());
+    for (size_t k = 0; k < todos.size(); ++k)
+        EXPECT_EQ(todos[k].join(' ').toStdString(), inteiros[k].join(' ').toStdString());
 }
 
 // ---- the relation texts of an end
