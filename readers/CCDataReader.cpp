@@ -411,6 +411,24 @@ std::optional<QString> CCDataReader::NumeroNoCampoFio(const OdDbObjectId& entida
     return std::nullopt;
 }
 
+QString CCDataReader::NomeDoFioNoXData(const OdDbObjectId& fio) const {
+    static constexpr std::array<std::string_view, 4> kNomes = {"CABO", "WIRE", "ALAMBRE", "FIO"};
+    std::array<std::string_view, 4> valores;
+    CICad::TextosXData(fio, "KVR_ZV_WIRE", textosNumero_);
+    for (size_t i = 2; i < textosNumero_.size(); ++i) {
+        std::string_view nome, valor;
+        if (!DivideCampo(textosNumero_[i], nome, valor)) continue;
+        for (size_t k = 0; k < kNomes.size(); ++k)
+            if (nome == kNomes[k]) valores[k] = valor;
+    }
+    for (const std::string_view valor : valores) {
+        if (valor.empty()) continue;
+        const QString nome = QString::fromUtf8(valor.data(), int(valor.size())).trimmed();
+        if (!nome.isEmpty()) return nome;
+    }
+    return {};
+}
+
 // The value of the record's first virtual attribute named CABO or CABLE in any case; none
 // without one. Its texts are read where the drawing holds them, split as
 // CICad::GetAtributosVirtuais splits them: an empty field between two separators reads " ",
@@ -750,7 +768,7 @@ void CCDataReader::LeCircuitoLocal(const QString& sufixo, CEItemLista& item,
 
 void CCDataReader::LeFio(const QString& s, CEItemLista& item, const OdDbObjectId& polilinha,
                          CETemplate* modelo) {
-    if (LeCamposFio(s, item, polilinha)) LeRotasDoItem(item, modelo);
+    if (LeCamposFio(s, item, polilinha) && LeRotas) LeRotasDoItem(item, modelo);
 }
 
 void CCDataReader::LeRotasDoItem(const CEItemLista& item, CETemplate* modelo) {
@@ -1006,7 +1024,7 @@ void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const
                                  CETemplate* modelo, const QString* numeroFio) {
     ConfereVersao();
     const EntidadeLida& lida = EntidadeGuardada(id, modelo);
-    const bool rotas = lida.rotas;
+    const bool rotas = lida.rotas && LeRotas;
     FormaCampos::ComSufixo& com = lida.forma->Com(sufixo, &ficaComSufixo_);
     const std::uint32_t qtd = com.qtd;
     const QString* qtdAtual = com.qtdFica ? item.campos.procura(qtd) : nullptr;

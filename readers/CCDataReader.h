@@ -182,6 +182,13 @@ protected:
     // The same for terminals (blocks BORNE... and BOR-...): a reader that reads every terminal
     // as an item before any side seldom meets one again as a neighbour.
     bool GuardaBornes = true;
+    // A wire's reading looks up the routes of its number, for Caminhos: a reader that never
+    // asks for them (the bill of materials) clears it.
+    bool LeRotas = true;
+    // A wire's name as the bill of materials takes it from its KVR_ZV_WIRE fields (from the
+    // third item on), read where the drawing holds them: the first not blank, once trimmed, of
+    // CABO, WIRE, ALAMBRE and FIO, a field given twice counting with its last value.
+    QString NomeDoFioNoXData(const OdDbObjectId& fio) const;
     // CriaItemFio takes the wire's fields from its kept reading: set by a reader that copies
     // the same polylines again as the ends of its items (the bill of materials).
     bool FiosDasLeituras = false;

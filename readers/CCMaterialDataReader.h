@@ -14,7 +14,11 @@
 class CCMaterialDataReader : public CCDataReader {
 public:
     // Each wire's first polyline is read for its item and copied again as its first end.
-    CCMaterialDataReader() { FiosDasLeituras = true; }
+    // No route of a wire is asked for.
+    CCMaterialDataReader() {
+        FiosDasLeituras = true;
+        LeRotas = false;
+    }
     // Nothing on sides: a material has no connections of its own.
     void LerLadoIni(CEItemLista& item, const OdDbObjectId& entidade, CETemplate& modelo) override;
     void LerLadoFim(CEItemLista& item, const OdDbObjectId& entidade, CETemplate& modelo) override;
