@@ -201,6 +201,12 @@ protected:
     // sides) sets the size of the last one, so that an item's fields move once, not at each
     // doubling of its array.
     std::size_t CamposPrevistos = 0;
+    // Room an item's fields leave, once made, for what the list adds to every member; none
+    // unless the reader knows its list.
+    virtual std::size_t FolgaDosCampos(const CamposItem& campos) const {
+        Q_UNUSED(campos);
+        return 0;
+    }
     CECacheCatalogo& Catalogo() { return catalogo_; }
     // An item kept for the list shares its field names with the items kept before it.
     void PartilhaNomes(CEItemLista& item) { item.partilharNomes(); }

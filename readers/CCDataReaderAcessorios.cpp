@@ -165,7 +165,9 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
             }
             BaseAcessorio& b = base(chave);
             if (item->campos.isEmpty()) {
-                item->campos = CamposDaUnidade(b, qtd);
+                const CamposItem& unidade = CamposDaUnidade(b, qtd);
+                item->campos.reservar(std::size_t(unidade.size()) + FolgaDosCampos(unidade));
+                item->campos = unidade;
             } else {
                 item->copiarCampos(b.item);
                 item->definirCampo(campoQtd, qtd);
@@ -191,7 +193,9 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
             continue;
         // A zero row is a unit of quantity 0: its fields are joined once per key.
         auto* item = new CEItemLista;
-        item->campos = CamposDaUnidade(base(chave), kZero);
+        const CamposItem& unidade = CamposDaUnidade(base(chave), kZero);
+        item->campos.reservar(std::size_t(unidade.size()) + FolgaDosCampos(unidade));
+        item->campos = unidade;
         if (estaListado(*item) && (!modelo || modelo->FiltraItem(*item)))
             resultado.push_back(item);
         else

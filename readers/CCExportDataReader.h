@@ -28,6 +28,12 @@ public:
     virtual VetorItens* Le(zvdb::Database* database, CETemplate* modelo, bool flag,
                            const std::optional<QStringList>& paginas);
 
+    // The exports add no field to the items they read.
+    std::size_t FolgaDosCampos(const CamposItem& campos) const override {
+        Q_UNUSED(campos);
+        return 0;
+    }
+
     // The export this reader reads for; null for the topographic diagram.
     CEExportacao* Exportacao = nullptr;
 

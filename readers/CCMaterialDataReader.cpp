@@ -1,6 +1,7 @@
 #include "CCMaterialDataReader.h"
 
 #include "CEAtributo.h"
+#include "lists/CCMaterialGrfWriter.h"
 #include "lists/CETemplate.h"
 #include "module/CIProgress.h"
 
@@ -125,9 +126,14 @@ bool CCMaterialDataReader::Adiciona(CEItemLista* item, bool barramento) {
     return true;
 }
 
+std::size_t CCMaterialDataReader::FolgaDosCampos(const CamposItem& campos) const {
+    return CCMaterialGrfWriter::SomasAusentes(campos);
+}
+
 void CCMaterialDataReader::Guarda(CEItemLista* item) {
-    // Kept items share their field names from the start: a large list holds millions.
-    PartilhaNomes(*item);
+    // Kept items share their field names from the start: a large list holds millions. Their
+    // arrays keep room for the sums alone.
+    item->campos.compactar(FolgaDosCampos(item->campos));
     resultado_.push_back(item);
 }
 

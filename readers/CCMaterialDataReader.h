@@ -31,6 +31,11 @@ public:
     static void Agrupa(VetorItens& itens, CETemplate& modelo);
 
 protected:
+    // The sums the list writes into every member of a group: their room is left when the
+    // item is made, so that no member's fields move for them then.
+    std::size_t FolgaDosCampos(const CamposItem& campos) const override;
+
+protected:
     struct Simbolos {
         bool selecaoPaginas = false, bornes = false, aceOrfaos = false;
         QString fontes;
