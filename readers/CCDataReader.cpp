@@ -72,14 +72,21 @@ std::tuple<T...> Retira(T&... conteudos) {
 }  // namespace
 
 void CCDataReader::LiberaLeituras() {
+    LiberaLeiturasDeEntidades();
+    Descarte::Descartar(Retira(basesAcessorio_, acessoriosLidos_, acessoriosCatalogo_));
+    desenhoAcessorios_ = appVinculosEm_ = nullptr;
+    appVinculosVersao_ = ~std::uint64_t(0);
+}
+
+void CCDataReader::LiberaLeiturasDeEntidades() {
     // Items share the texts of these; they keep theirs.
-    auto leituras = Retira(
-        circuitos_, conexoes_, fiosPorLayer_, indicesFios_, primeirosVertices_, rotas_,
-        rotasPorChave_, caminhos_, entidadesLidas_, entidadesAntigas_, avulsa_, leitura_,
-        nomesLidos_, formas_, numerosFios_, numerosCabos_, ligacoesPorElemento_, ligacoesAntigas_,
-        layers_, gruposPaginas_, textosTipo_, colunasDivididas_, catalogoComp_, constantes_,
-        ligacoesLidas_, chaves_, textosFio_, tags_, valores_, lote_, ordemLote_, basesAcessorio_,
-        nomesFio_, textosNumero_, acessoriosLidos_, acessoriosCatalogo_, nomesLote_, ordensLote_);
+    auto leituras =
+        Retira(circuitos_, conexoes_, fiosPorLayer_, indicesFios_, primeirosVertices_, rotas_,
+               rotasPorChave_, caminhos_, entidadesLidas_, entidadesAntigas_, avulsa_, leitura_,
+               nomesLidos_, formas_, numerosFios_, numerosCabos_, ligacoesPorElemento_,
+               ligacoesAntigas_, layers_, gruposPaginas_, textosTipo_, colunasDivididas_,
+               catalogoComp_, constantes_, ligacoesLidas_, chaves_, textosFio_, tags_, valores_,
+               lote_, ordemLote_, nomesFio_, textosNumero_, nomesLote_, ordensLote_);
     versaoIndices_ = 0;
     indiceAtual_ = nullptr;
     layerDoUltimo_ = nullptr;
@@ -88,8 +95,6 @@ void CCDataReader::LiberaLeituras() {
     corteDe_ = OdDbObjectId();
     versaoLidas_ = 0;
     atributosDe_ = OdDbObjectId();
-    desenhoAcessorios_ = appVinculosEm_ = nullptr;
-    appVinculosVersao_ = ~std::uint64_t(0);
     // It points into the catalogue answers just taken.
     semChave_.Esquece();
     // The module's commands go on while another thread frees them; elsewhere they go now.

@@ -57,6 +57,10 @@ public:
     // routes): once the items are made, the writer that follows needs the memory. A later
     // read loads them again.
     void LiberaLeituras();
+    // The same but for what expanding accessories asks (each symbol's own accessories, the
+    // catalogue's, the units' fields): a reader done with the entities before it expands
+    // accessories gives the rest back then.
+    void LiberaLeiturasDeEntidades();
 
     // ---- connections
     void CarregaConexoesFios();

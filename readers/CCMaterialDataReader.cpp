@@ -1,6 +1,7 @@
 #include "CCMaterialDataReader.h"
 
 #include "CEAtributo.h"
+#include "Descarte.h"
 #include "lists/CCMaterialGrfWriter.h"
 #include "lists/CETemplate.h"
 #include "module/CIProgress.h"
@@ -104,11 +105,17 @@ VetorItens* CCMaterialDataReader::LerDados(zvdb::Database* database,
         for (CEItemLista* cabo : *cabos)
             Guarda(cabo);
     }
+    // The entities are read: what was kept of them goes while the items are grouped, and the
+    // accessories expanded next take its memory.
+    LiberaReferencias();
+    LiberaLeiturasDeEntidades();
+    Descarte::Largar(vistos_);
+    Descarte::Largar(relacoes_);
+    Descarte::Largar(conectores_);
     Agrupa(resultado_, modelo);
     resultado_.ordenar(modelo.LerListaTexto("*LISTA_DE_SORT*"));
     if (modelo.LerTexto("*ORDEM_CRESCENTE*") != "C") resultado_.inverter();
     if (simbolos_.vinculos == 1) IntercalaAcessorios(modelo);
-    LiberaReferencias();
     progresso.Definir(100);
     auto* itens = new VetorItens(std::move(resultado_));
     resultado_.clear();

@@ -81,4 +81,20 @@ TEST_F(MaterialWiresTest, NoRouteOfAWireIsLookedUpForTheList) {
     EXPECT_NE(fios.Caminhos("12"), nullptr);
 }
 
+// The readings of the entities go once the items are read, before the accessories are
+// expanded and grouped: the list needs that memory more.
+TEST_F(MaterialWiresTest, NoReadingOfAWireOutlivesTheRead) {
+    const zvdb::Polyline* a = trecho(10, {"FIO\f12", "MARCA\fA"});
+    const zvdb::Polyline* b = trecho(20, {"FIO\f12", "MARCA\fB"}, kPagina2);
+    modelo_.simbolos["*IMP_VINCL*"] = 1;
+    CCMaterialDataReader leitor;
+    CIProgress progresso;
+    std::unique_ptr<VetorItens> lidos(leitor.LerDados(&db(), std::nullopt, modelo_, progresso));
+    ASSERT_EQ(lidos->size(), 1u);
+    EXPECT_EQ(lidos->at(0)->valorCampo("MARCA_FIM"), "B");
+    EXPECT_FALSE(leitor.LeituraGuardada(id(a)));
+    EXPECT_FALSE(leitor.LeituraGuardada(id(b)));
+    lidos->destruirItens();
+}
+
 }  // namespace
