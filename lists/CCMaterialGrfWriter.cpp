@@ -5,6 +5,7 @@
 #include "cad/CICad.h"
 #include "readers/CEAtributo.h"
 #include "readers/CEListaAtributos.h"
+#include "readers/NomeCampo.h"
 #include "readers/VetorItens.h"
 #include "readers/ZVString.h"
 
@@ -108,10 +109,16 @@ CCMaterialGrfWriter::itemDet CCMaterialGrfWriter::LeEspecificacao(const QString&
 }
 
 std::size_t CCMaterialGrfWriter::SomasAusentes(const CamposItem& campos) {
+    // Looked up, not numbered: the reader asks before the sums name them, and the names'
+    // order stays that of their first field.
+    static const NomeCampo kSomas[] = {NomeCampo(QStringLiteral("QTD")),
+                                       NomeCampo(QStringLiteral("COMPRIMENTO")),
+                                       NomeCampo(QStringLiteral("LENGTH"))};
     std::size_t ausentes = 0;
-    for (const std::uint32_t nome :
-         {NumeroCampo<"QTD">(), NumeroCampo<"COMPRIMENTO">(), NumeroCampo<"LENGTH">()})
-        ausentes += campos.procura(nome) ? 0 : 1;
+    for (const NomeCampo& nome : kSomas) {
+        const std::uint32_t numero = nome.ParaBuscar();
+        ausentes += numero == CamposItem::kSemNome || !campos.procura(numero) ? 1 : 0;
+    }
     return ausentes;
 }
 

@@ -559,15 +559,23 @@ private:
     // asks, and the catalogue's texts are split once.
     QHash<QString, std::vector<std::pair<QString, int>>> acessoriosCatalogo_;
     const std::vector<std::pair<QString, int>>& AcessoriosDoCatalogo(const QString& chave);
+    // The fields of a unit with nothing of its owner's, for its quantity, and the room
+    // FolgaDosCampos gives them.
+    struct UnidadeAcessorio {
+        QString qtd;
+        CamposItem campos;
+        std::size_t folga = 0;
+    };
     // Per accessory key and standard: the fields of a unit, and its user columns.
     struct BaseAcessorio {
         CEItemLista item, colunas;
-        // The fields of a unit with nothing of its owner's, by the unit's quantity.
-        std::vector<std::pair<QString, CamposItem>> unidades;
+        std::vector<UnidadeAcessorio> unidades;
     };
-    // The fields of a unit of the base with nothing of its owner's: the base's, the quantity
-    // and the user columns, joined once per quantity.
-    const CamposItem& CamposDaUnidade(BaseAcessorio& base, const QString& qtd);
+    // The unit of the base with nothing of its owner's: the base's fields, the quantity and
+    // the user columns, joined once per quantity.
+    const UnidadeAcessorio& UnidadeDaBase(BaseAcessorio& base, const QString& qtd);
+    // A new item of the unit's fields, with their room.
+    static CEItemLista* NovoItemDaUnidade(const UnidadeAcessorio& unidade);
     std::unordered_map<std::pair<QString, QString>, BaseAcessorio, HashPar> basesAcessorio_;
     CECacheCatalogo catalogo_;
     double tolerancia_;

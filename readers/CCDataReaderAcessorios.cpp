@@ -51,9 +51,10 @@ const std::vector<std::pair<QString, int>>& CCDataReader::AcessoriosDoCatalogo(
     return *acessoriosCatalogo_.insert(chave, std::move(pares));
 }
 
-const CamposItem& CCDataReader::CamposDaUnidade(BaseAcessorio& base, const QString& qtd) {
-    for (const auto& [quantidade, campos] : base.unidades)
-        if (quantidade == qtd) return campos;
+const CCDataReader::UnidadeAcessorio& CCDataReader::UnidadeDaBase(BaseAcessorio& base,
+                                                                  const QString& qtd) {
+    for (const UnidadeAcessorio& unidade : base.unidades)
+        if (unidade.qtd == qtd) return unidade;
     // Owners of many quantities keep this bounded: the oldest goes.
     constexpr std::size_t kMaxUnidades = 16;
     if (base.unidades.size() >= kMaxUnidades) base.unidades.erase(base.unidades.begin());
@@ -61,7 +62,15 @@ const CamposItem& CCDataReader::CamposDaUnidade(BaseAcessorio& base, const QStri
     unidade.campos = base.item.campos;
     unidade.definirCampo(NumeroCampo<"QTD">(), qtd);
     unidade.copiarCampos(base.colunas);
-    return base.unidades.emplace_back(qtd, std::move(unidade.campos)).second;
+    const std::size_t folga = FolgaDosCampos(unidade.campos);
+    return base.unidades.emplace_back(UnidadeAcessorio{qtd, std::move(unidade.campos), folga});
+}
+
+CEItemLista* CCDataReader::NovoItemDaUnidade(const UnidadeAcessorio& unidade) {
+    auto* item = new CEItemLista;
+    item->campos.reservar(std::size_t(unidade.campos.size()) + unidade.folga);
+    item->campos = unidade.campos;
+    return item;
 }
 
 VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaAtributos* atributos,
@@ -148,13 +157,17 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
     const QString qtd = qtdDono && !qtdDono->isEmpty() ? *qtdDono : QStringLiteral("1");
     for (const auto& [chave, quantidade] : contados)
         for (int u = 0; u < quantidade; ++u) {
-            auto* item = new CEItemLista;
+            // The owner's fields a unit takes, if any: a unit without them is a copy of the
+            // unit's own.
+            CEItemLista* item = nullptr;
             if (atributosDono && !primeiro.isNull()) {
+                item = new CEItemLista;
                 std::unique_ptr<zv::CEListaAtributos> lista;
                 CICad::GetAtributosPorId(primeiro, lista, false, false);
                 for (int i = 0; lista && i < lista->Quantidade(); ++i)
                     item->definirCampo((*lista)[i].GetTag(), (*lista)[i].GetValor());
             } else if (relacao) {
+                item = new CEItemLista;
                 for (CampoTraduzido campo :
                      {CampoTraduzido::Relacao, CampoTraduzido::Regua, CampoTraduzido::Numero})
                     for (int idioma = 1; idioma <= 3; ++idioma) {
@@ -164,10 +177,9 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
                     }
             }
             BaseAcessorio& b = base(chave);
-            if (item->campos.isEmpty()) {
-                const CamposItem& unidade = CamposDaUnidade(b, qtd);
-                item->campos.reservar(std::size_t(unidade.size()) + FolgaDosCampos(unidade));
-                item->campos = unidade;
+            if (!item || item->campos.isEmpty()) {
+                delete item;
+                item = NovoItemDaUnidade(UnidadeDaBase(b, qtd));
             } else {
                 item->copiarCampos(b.item);
                 item->definirCampo(campoQtd, qtd);
@@ -192,10 +204,7 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
                         [&chave](const Unidades& u) { return u.chave == chave; }))
             continue;
         // A zero row is a unit of quantity 0: its fields are joined once per key.
-        auto* item = new CEItemLista;
-        const CamposItem& unidade = CamposDaUnidade(base(chave), kZero);
-        item->campos.reservar(std::size_t(unidade.size()) + FolgaDosCampos(unidade));
-        item->campos = unidade;
+        CEItemLista* item = NovoItemDaUnidade(UnidadeDaBase(base(chave), kZero));
         if (estaListado(*item) && (!modelo || modelo->FiltraItem(*item)))
             resultado.push_back(item);
         else
