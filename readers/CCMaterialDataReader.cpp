@@ -141,6 +141,9 @@ void CCMaterialDataReader::Guarda(CEItemLista* item) {
     // Kept items share their field names from the start: a large list holds millions. Their
     // arrays keep room for the sums alone.
     item->campos.compactar(FolgaDosCampos(item->campos));
+    // The symbols of a block come in a row: the next one's fields are made in as much room,
+    // and most often need not move here.
+    CamposPrevistos = item->campos.todos().capacity();
     resultado_.push_back(item);
 }
 
