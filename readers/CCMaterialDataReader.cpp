@@ -138,8 +138,8 @@ std::size_t CCMaterialDataReader::FolgaDosCampos(const CamposItem& campos) const
 }
 
 void CCMaterialDataReader::Guarda(CEItemLista* item) {
-    // Kept items share their field names from the start: a large list holds millions. Their
-    // arrays keep room for the sums alone.
+    // Kept items give back their arrays' spare room from the start, but for the sums: a large
+    // list holds millions.
     item->campos.compactar(FolgaDosCampos(item->campos));
     // The symbols of a block come in a row: the next one's fields are made in as much room,
     // and most often need not move here.

@@ -35,7 +35,6 @@ protected:
     // item is made, so that no member's fields move for them then.
     std::size_t FolgaDosCampos(const CamposItem& campos) const override;
 
-protected:
     struct Simbolos {
         bool selecaoPaginas = false, bornes = false, aceOrfaos = false;
         QString fontes;
