@@ -5,6 +5,7 @@
 #include "cad/CICad.h"
 #include "readers/CEAtributo.h"
 #include "readers/CEListaAtributos.h"
+#include "readers/NomeCampo.h"
 #include "readers/VetorItens.h"
 #include "readers/ZVString.h"
 
@@ -107,6 +108,20 @@ CCMaterialGrfWriter::itemDet CCMaterialGrfWriter::LeEspecificacao(const QString&
     return det;
 }
 
+std::size_t CCMaterialGrfWriter::SomasAusentes(const CamposItem& campos) {
+    // Looked up, not numbered: the reader asks before the sums name them, and the names'
+    // order stays that of their first field.
+    static const NomeCampo kSomas[] = {NomeCampo(QStringLiteral("QTD")),
+                                       NomeCampo(QStringLiteral("COMPRIMENTO")),
+                                       NomeCampo(QStringLiteral("LENGTH"))};
+    std::size_t ausentes = 0;
+    for (const NomeCampo& nome : kSomas) {
+        const std::uint32_t numero = nome.ParaBuscar();
+        ausentes += numero == CamposItem::kSemNome || !campos.procura(numero) ? 1 : 0;
+    }
+    return ausentes;
+}
+
 void CCMaterialGrfWriter::SomaGrupos(VetorItens& itens, int digitos) {
     // By name number: this reads and writes three fields of every member of every group.
     const std::uint32_t campoQtd = NumeroCampo<"QTD">();
@@ -138,9 +153,9 @@ void CCMaterialGrfWriter::SomaGrupos(VetorItens& itens, int digitos) {
             lote.begin(), lote.end(),
             [](const CamposItem::Campo& x, const CamposItem::Campo& y) { return x.nome < y.nome; });
         for (CEItemLista* m = item; m; m = m->ligado) {
-            // Room for exactly these: an array that doubled for them, in every item at
-            // once, would be new memory for the whole list.
-            m->campos.reservar(size_t(m->campos.size()) + lote.size());
+            // Room for exactly those it lacks, which the reader mostly left: an array that
+            // moved for them, in every item at once, would be new memory for the whole list.
+            m->campos.reservar(size_t(m->campos.size()) + SomasAusentes(m->campos));
             m->campos.juntarOrdenados(lote);
             if (m->ligado == item) break;
         }

@@ -12,6 +12,7 @@
 #include <map>
 #include <vector>
 
+class CamposItem;
 class CEItemLista;
 
 class CCMaterialGrfWriter : public CCDataWriter {
@@ -34,6 +35,8 @@ public:
     // Group sums and numbering: QTD and COMPRIMENTO (and LENGTH) over each chain, set on
     // every member; SEQUENCIA and SEQUENCE on each entry.
     static void SomaGrupos(VetorItens& itens, int digitos);
+    // How many of the fields SomaGrupos writes into every member the fields lack.
+    static std::size_t SomasAusentes(const CamposItem& campos);
     // The sum of a field's numbers over every item and the members of its chain, as the
     // total block shows it.
     static double SomaCampo(const VetorItens& itens, const QString& campo);

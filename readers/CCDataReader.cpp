@@ -72,14 +72,20 @@ std::tuple<T...> Retira(T&... conteudos) {
 }  // namespace
 
 void CCDataReader::LiberaLeituras() {
+    LiberaLeiturasDeEntidades();
+    Descarte::Descartar(Retira(basesAcessorio_, acessoriosLidos_, acessoriosCatalogo_));
+    desenhoAcessorios_ = appVinculosEm_ = nullptr;
+    appVinculosVersao_ = ~std::uint64_t(0);
+}
+
+void CCDataReader::LiberaLeiturasDeEntidades() {
     // Items share the texts of these; they keep theirs.
     auto leituras = Retira(
         circuitos_, conexoes_, fiosPorLayer_, indicesFios_, rotas_, rotasPorChave_, caminhos_,
         entidadesLidas_, entidadesAntigas_, avulsa_, leitura_, nomesLidos_, formas_, numerosFios_,
         numerosCabos_, ligacoesPorElemento_, ligacoesAntigas_, layers_, gruposPaginas_, textosTipo_,
         colunasDivididas_, catalogoComp_, constantes_, ligacoesLidas_, chaves_, textosFio_, tags_,
-        valores_, lote_, ordemLote_, basesAcessorio_, nomesFio_, textosNumero_, acessoriosLidos_,
-        acessoriosCatalogo_, nomesLote_, ordensLote_);
+        valores_, lote_, ordemLote_, nomesFio_, textosNumero_, nomesLote_, ordensLote_);
     versaoIndices_ = 0;
     indiceAtual_ = nullptr;
     layerDoUltimo_ = nullptr;
@@ -88,8 +94,6 @@ void CCDataReader::LiberaLeituras() {
     corteDe_ = OdDbObjectId();
     versaoLidas_ = 0;
     atributosDe_ = OdDbObjectId();
-    desenhoAcessorios_ = appVinculosEm_ = nullptr;
-    appVinculosVersao_ = ~std::uint64_t(0);
     // It points into the catalogue answers just taken.
     semChave_.Esquece();
     // The module's commands go on while another thread frees them; elsewhere they go now.
@@ -425,6 +429,24 @@ std::optional<QString> CCDataReader::NumeroNoCampoFio(const OdDbObjectId& entida
             return QString::fromUtf8(valor.data(), int(valor.size()));
     }
     return std::nullopt;
+}
+
+QString CCDataReader::NomeDoFioNoXData(const OdDbObjectId& fio) const {
+    static constexpr std::array<std::string_view, 4> kNomes = {"CABO", "WIRE", "ALAMBRE", "FIO"};
+    std::array<std::string_view, 4> valores;
+    CICad::TextosXData(fio, "KVR_ZV_WIRE", textosNumero_);
+    for (size_t i = 2; i < textosNumero_.size(); ++i) {
+        std::string_view nome, valor;
+        if (!DivideCampo(textosNumero_[i], nome, valor)) continue;
+        for (size_t k = 0; k < kNomes.size(); ++k)
+            if (nome == kNomes[k]) valores[k] = valor;
+    }
+    for (const std::string_view valor : valores) {
+        if (valor.empty()) continue;
+        const QString nome = QString::fromUtf8(valor.data(), int(valor.size())).trimmed();
+        if (!nome.isEmpty()) return nome;
+    }
+    return {};
 }
 
 // The value of the record's first virtual attribute named CABO or CABLE in any case; none
@@ -779,7 +801,7 @@ void CCDataReader::LeCircuitoLocal(const QString& sufixo, CEItemLista& item,
 
 void CCDataReader::LeFio(const QString& s, CEItemLista& item, const OdDbObjectId& polilinha,
                          CETemplate* modelo) {
-    if (LeCamposFio(s, item, polilinha)) LeRotasDoItem(item, modelo);
+    if (LeCamposFio(s, item, polilinha) && LeRotas) LeRotasDoItem(item, modelo);
 }
 
 void CCDataReader::LeRotasDoItem(const CEItemLista& item, CETemplate* modelo) {
@@ -1061,7 +1083,7 @@ void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const
     copiaAvulsa_ = &sufixo;
     const EntidadeLida& lida = EntidadeGuardada(id, modelo);
     copiaAvulsa_ = nullptr;
-    const bool rotas = lida.rotas;
+    const bool rotas = lida.rotas && LeRotas;
     FormaCampos::ComSufixo& com = lida.forma->Com(sufixo, &ficaComSufixo_);
     const std::uint32_t qtd = com.qtd;
     const QString* qtdAtual = com.qtdFica ? item.campos.procura(qtd) : nullptr;

@@ -57,6 +57,10 @@ public:
     // routes): once the items are made, the writer that follows needs the memory. A later
     // read loads them again.
     virtual void LiberaLeituras();
+    // The same but for what expanding accessories asks (each symbol's own accessories, the
+    // catalogue's, the units' fields): a reader done with the entities before it expands
+    // accessories gives the rest back then.
+    void LiberaLeiturasDeEntidades();
 
     // ---- connections
     void CarregaConexoesFios();
@@ -187,6 +191,13 @@ protected:
     // The same for terminals (blocks BORNE... and BOR-...): a reader that reads every terminal
     // as an item before any side seldom meets one again as a neighbour.
     bool GuardaBornes = true;
+    // A wire's reading looks up the routes of its number, for Caminhos: a reader that never
+    // asks for them (the bill of materials) clears it.
+    bool LeRotas = true;
+    // A wire's name as the bill of materials takes it from its KVR_ZV_WIRE fields (from the
+    // third item on), read where the drawing holds them: the first not blank, once trimmed, of
+    // CABO, WIRE, ALAMBRE and FIO, a field given twice counting with its last value.
+    QString NomeDoFioNoXData(const OdDbObjectId& fio) const;
     // CriaItemFio takes the wire's fields from its kept reading: set by a reader that copies
     // the same polylines again as the ends of its items (the bill of materials).
     bool FiosDasLeituras = false;
@@ -199,6 +210,12 @@ protected:
     // sides) sets the size of the last one, so that an item's fields move once, not at each
     // doubling of its array.
     std::size_t CamposPrevistos = 0;
+    // Room an item's fields leave, once made, for what the list adds to every member; none
+    // unless the reader knows its list.
+    virtual std::size_t FolgaDosCampos(const CamposItem& campos) const {
+        Q_UNUSED(campos);
+        return 0;
+    }
     CECacheCatalogo& Catalogo() { return catalogo_; }
     // An item kept for the list shares its field names with the items kept before it.
     void PartilhaNomes(CEItemLista& item) { item.partilharNomes(); }
@@ -556,15 +573,23 @@ private:
     // asks, and the catalogue's texts are split once.
     QHash<QString, std::vector<std::pair<QString, int>>> acessoriosCatalogo_;
     const std::vector<std::pair<QString, int>>& AcessoriosDoCatalogo(const QString& chave);
+    // The fields of a unit with nothing of its owner's, for its quantity, and the room
+    // FolgaDosCampos gives them.
+    struct UnidadeAcessorio {
+        QString qtd;
+        CamposItem campos;
+        std::size_t folga = 0;
+    };
     // Per accessory key and standard: the fields of a unit, and its user columns.
     struct BaseAcessorio {
         CEItemLista item, colunas;
-        // The fields of a unit with nothing of its owner's, by the unit's quantity.
-        std::vector<std::pair<QString, CamposItem>> unidades;
+        std::vector<UnidadeAcessorio> unidades;
     };
-    // The fields of a unit of the base with nothing of its owner's: the base's, the quantity
-    // and the user columns, joined once per quantity.
-    const CamposItem& CamposDaUnidade(BaseAcessorio& base, const QString& qtd);
+    // The unit of the base with nothing of its owner's: the base's fields, the quantity and
+    // the user columns, joined once per quantity.
+    const UnidadeAcessorio& UnidadeDaBase(BaseAcessorio& base, const QString& qtd);
+    // A new item of the unit's fields, with their room.
+    static CEItemLista* NovoItemDaUnidade(const UnidadeAcessorio& unidade);
     std::unordered_map<std::pair<QString, QString>, BaseAcessorio, HashPar> basesAcessorio_;
     CECacheCatalogo catalogo_;
     double tolerancia_;

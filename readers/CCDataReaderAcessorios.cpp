@@ -6,13 +6,24 @@
 #include "CEListaAtributos.h"
 #include "lists/CETemplate.h"
 
+#include <algorithm>
+#include <vector>
+
 namespace {
 
 // A quantity beyond this is a typing error in the catalogue or the drawing, not a part
 // count: it stops there, so that one bad row can't exhaust memory.
 constexpr int kMaximoUnidades = 100000;
 
-void Conta(const QString& chave, int quantidade, QStringList& contados, QStringList& zerados) {
+// An accessory key and how many units of it: one entry per catalogue row or symbol pair,
+// not one text per unit.
+struct Unidades {
+    QString chave;
+    int quantidade;
+};
+
+void Conta(const QString& chave, int quantidade, std::vector<Unidades>& contados,
+           QStringList& zerados) {
     if (chave.isEmpty()) return;
     if (quantidade == 0) {
         zerados << chave;
@@ -23,8 +34,7 @@ void Conta(const QString& chave, int quantidade, QStringList& contados, QStringL
                    QString::number(kMaximoUnidades));
         quantidade = kMaximoUnidades;
     }
-    for (int i = 0; i < quantidade; ++i)
-        contados << chave;
+    if (quantidade > 0) contados.push_back({chave, quantidade});
 }
 
 }  // namespace
@@ -41,9 +51,10 @@ const std::vector<std::pair<QString, int>>& CCDataReader::AcessoriosDoCatalogo(
     return *acessoriosCatalogo_.insert(chave, std::move(pares));
 }
 
-const CamposItem& CCDataReader::CamposDaUnidade(BaseAcessorio& base, const QString& qtd) {
-    for (const auto& [quantidade, campos] : base.unidades)
-        if (quantidade == qtd) return campos;
+const CCDataReader::UnidadeAcessorio& CCDataReader::UnidadeDaBase(BaseAcessorio& base,
+                                                                  const QString& qtd) {
+    for (const UnidadeAcessorio& unidade : base.unidades)
+        if (unidade.qtd == qtd) return unidade;
     // Owners of many quantities keep this bounded: the oldest goes.
     constexpr std::size_t kMaxUnidades = 16;
     if (base.unidades.size() >= kMaxUnidades) base.unidades.erase(base.unidades.begin());
@@ -51,7 +62,15 @@ const CamposItem& CCDataReader::CamposDaUnidade(BaseAcessorio& base, const QStri
     unidade.campos = base.item.campos;
     unidade.definirCampo(NumeroCampo<"QTD">(), qtd);
     unidade.copiarCampos(base.colunas);
-    return base.unidades.emplace_back(qtd, std::move(unidade.campos)).second;
+    const std::size_t folga = FolgaDosCampos(unidade.campos);
+    return base.unidades.emplace_back(UnidadeAcessorio{qtd, std::move(unidade.campos), folga});
+}
+
+CEItemLista* CCDataReader::NovoItemDaUnidade(const UnidadeAcessorio& unidade) {
+    auto* item = new CEItemLista;
+    item->campos.reservar(std::size_t(unidade.campos.size()) + unidade.folga);
+    item->campos = unidade.campos;
+    return item;
 }
 
 VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaAtributos* atributos,
@@ -62,6 +81,7 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
     static const QString kRecursivo = QStringLiteral("PBLACERECUR");
     static const QString kRelacao = QStringLiteral("PBLACERELACAO");
     static const QString kAtributos = QStringLiteral("PBLADDATRIBACE");
+    static const QString kZero = QStringLiteral("0");
     const std::uint32_t campoChave = NumeroCampo<"ZV_KEY">();
     const std::uint32_t campoQtd = NumeroCampo<"QTD">();
     const std::uint32_t campoLista = NumeroCampo<"ZV_LISTA">();
@@ -83,9 +103,9 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
     }
     const QString* campoDono = dono.campos.procura(campoChave);
     const QString chaveDono = campoDono ? *campoDono : QString();
-    caminho << chaveDono;
 
-    QStringList contados, zerados;
+    std::vector<Unidades> contados;
+    QStringList zerados;
     for (const auto& [chave, quantidade] : AcessoriosDoCatalogo(chaveDono))
         Conta(chave, quantidade, contados, zerados);
     if (!primeiro.isNull()) {
@@ -123,56 +143,68 @@ VetorItens CCDataReader::ExpandeAcessorios(CEItemLista& dono, const zv::CEListaA
     };
 
     VetorItens resultado;
-    if (contados.isEmpty() && zerados.isEmpty()) return resultado;
+    if (contados.empty() && zerados.isEmpty()) return resultado;
     const bool recursivo = modelo && modelo->LerLogico(kRecursivo);
+    // The path matters only to a recursion: a plain expansion adds nothing to it.
+    if (recursivo) caminho << chaveDono;
+    std::size_t unidades = std::size_t(zerados.size());
+    for (const Unidades& u : contados)
+        unidades += std::size_t(u.quantidade);
+    resultado.reserve(unidades);
     const bool relacao = modelo && modelo->LerLogico(kRelacao);
     const bool atributosDono = !modelo && CICad::GetBoolLisp(kAtributos);
     const QString* qtdDono = dono.campos.procura(campoQtd);
     const QString qtd = qtdDono && !qtdDono->isEmpty() ? *qtdDono : QStringLiteral("1");
-    for (const QString& chave : contados) {
-        auto* item = new CEItemLista;
-        if (atributosDono && !primeiro.isNull()) {
-            std::unique_ptr<zv::CEListaAtributos> lista;
-            CICad::GetAtributosPorId(primeiro, lista, false, false);
-            for (int i = 0; lista && i < lista->Quantidade(); ++i)
-                item->definirCampo((*lista)[i].GetTag(), (*lista)[i].GetValor());
-        } else if (relacao) {
-            for (CampoTraduzido campo :
-                 {CampoTraduzido::Relacao, CampoTraduzido::Regua, CampoTraduzido::Numero})
-                for (int idioma = 1; idioma <= 3; ++idioma) {
-                    const QString nome = CICad::TagTraduzida(campo, idioma);
-                    QString valor;
-                    if (dono.obterCampo(nome, valor)) item->definirCampo(nome, valor);
-                }
+    for (const auto& [chave, quantidade] : contados)
+        for (int u = 0; u < quantidade; ++u) {
+            // The owner's fields a unit takes, if any: a unit without them is a copy of the
+            // unit's own.
+            CEItemLista* item = nullptr;
+            if (atributosDono && !primeiro.isNull()) {
+                item = new CEItemLista;
+                std::unique_ptr<zv::CEListaAtributos> lista;
+                CICad::GetAtributosPorId(primeiro, lista, false, false);
+                for (int i = 0; lista && i < lista->Quantidade(); ++i)
+                    item->definirCampo((*lista)[i].GetTag(), (*lista)[i].GetValor());
+            } else if (relacao) {
+                item = new CEItemLista;
+                for (CampoTraduzido campo :
+                     {CampoTraduzido::Relacao, CampoTraduzido::Regua, CampoTraduzido::Numero})
+                    for (int idioma = 1; idioma <= 3; ++idioma) {
+                        const QString nome = CICad::TagTraduzida(campo, idioma);
+                        QString valor;
+                        if (dono.obterCampo(nome, valor)) item->definirCampo(nome, valor);
+                    }
+            }
+            BaseAcessorio& b = base(chave);
+            if (!item || item->campos.isEmpty()) {
+                delete item;
+                item = NovoItemDaUnidade(UnidadeDaBase(b, qtd));
+            } else {
+                item->copiarCampos(b.item);
+                item->definirCampo(campoQtd, qtd);
+                item->copiarCampos(b.colunas);
+            }
+            const bool listado = estaListado(*item);
+            if (listado && modelo && !modelo->FiltraItem(*item)) {
+                delete item;
+                continue;
+            }
+            if (recursivo && !caminho.contains(chave)) {
+                VetorItens filhos = ExpandeAcessorios(*item, nullptr, modelo, caminho, norma);
+                if (listado) resultado.push_back(item);
+                resultado.juntarSemRepetir(filhos);
+            } else if (listado) {
+                resultado.push_back(item);
+            }
+            if (!listado) delete item;
         }
-        BaseAcessorio& b = base(chave);
-        if (item->campos.isEmpty()) {
-            item->campos = CamposDaUnidade(b, qtd);
-        } else {
-            item->copiarCampos(b.item);
-            item->definirCampo(campoQtd, qtd);
-            item->copiarCampos(b.colunas);
-        }
-        const bool listado = estaListado(*item);
-        if (listado && modelo && !modelo->FiltraItem(*item)) {
-            delete item;
-            continue;
-        }
-        if (recursivo && !caminho.contains(chave)) {
-            VetorItens filhos = ExpandeAcessorios(*item, nullptr, modelo, caminho, norma);
-            if (listado) resultado.push_back(item);
-            resultado.juntarSemRepetir(filhos);
-        } else if (listado) {
-            resultado.push_back(item);
-        }
-        if (!listado) delete item;
-    }
     for (const QString& chave : zerados) {
-        if (contados.contains(chave)) continue;
-        const BaseAcessorio& b = base(chave);
-        auto* item = new CEItemLista(b.item);
-        item->definirCampo(campoQtd, QStringLiteral("0"));
-        item->copiarCampos(b.colunas);
+        if (std::any_of(contados.begin(), contados.end(),
+                        [&chave](const Unidades& u) { return u.chave == chave; }))
+            continue;
+        // A zero row is a unit of quantity 0: its fields are joined once per key.
+        CEItemLista* item = NovoItemDaUnidade(UnidadeDaBase(base(chave), kZero));
         if (estaListado(*item) && (!modelo || modelo->FiltraItem(*item)))
             resultado.push_back(item);
         else

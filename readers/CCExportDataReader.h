@@ -32,6 +32,12 @@ public:
     // asks for them.
     void LiberaLeituras() override;
 
+    // The exports add no field to the items they read.
+    std::size_t FolgaDosCampos(const CamposItem& campos) const override {
+        Q_UNUSED(campos);
+        return 0;
+    }
+
     // The export this reader reads for; null for the topographic diagram.
     CEExportacao* Exportacao = nullptr;
 

@@ -1,11 +1,14 @@
 #include "CCMaterialDataReader.h"
 
 #include "CEAtributo.h"
+#include "Descarte.h"
+#include "lists/CCMaterialGrfWriter.h"
 #include "lists/CETemplate.h"
 #include "module/CIProgress.h"
 
 #include <array>
 #include <cstdint>
+#include <optional>
 #include <unordered_map>
 
 namespace {
@@ -51,25 +54,6 @@ QString NomeDoFio(const CEItemLista& item) {
             const QString nome = valor->trimmed();
             if (!nome.isEmpty()) return nome;
         }
-    return {};
-}
-
-// The same name from the wire's extended data, without building its item. A field given
-// twice counts with its last value.
-QString NomeNoXData(const OdDbObjectId& fio) {
-    const std::array<QString, 4>& nomes = CamposNomeFio();
-    std::array<QString, 4> valores;
-    const CEListaXData dados = CICad::GetXData(fio, "KVR_ZV_WIRE");
-    for (size_t i = 2; i < dados.size(); ++i) {
-        QString nome, valor;
-        if (!ZVString(dados[i].texto).DivideEmDois(CCDataReader::kSeparador, nome, valor)) continue;
-        for (size_t k = 0; k < nomes.size(); ++k)
-            if (nome == nomes[k]) valores[k] = valor;
-    }
-    for (const QString& valor : valores) {
-        const QString nome = valor.trimmed();
-        if (!nome.isEmpty()) return nome;
-    }
     return {};
 }
 
@@ -121,11 +105,17 @@ VetorItens* CCMaterialDataReader::LerDados(zvdb::Database* database,
         for (CEItemLista* cabo : *cabos)
             Guarda(cabo);
     }
+    // The entities are read: what was kept of them goes while the items are grouped, and the
+    // accessories expanded next take its memory.
+    LiberaReferencias();
+    LiberaLeiturasDeEntidades();
+    Descarte::Largar(vistos_);
+    Descarte::Largar(relacoes_);
+    Descarte::Largar(conectores_);
     Agrupa(resultado_, modelo);
     resultado_.ordenar(modelo.LerListaTexto("*LISTA_DE_SORT*"));
     if (modelo.LerTexto("*ORDEM_CRESCENTE*") != "C") resultado_.inverter();
     if (simbolos_.vinculos == 1) IntercalaAcessorios(modelo);
-    LiberaReferencias();
     progresso.Definir(100);
     auto* itens = new VetorItens(std::move(resultado_));
     resultado_.clear();
@@ -143,9 +133,17 @@ bool CCMaterialDataReader::Adiciona(CEItemLista* item, bool barramento) {
     return true;
 }
 
+std::size_t CCMaterialDataReader::FolgaDosCampos(const CamposItem& campos) const {
+    return CCMaterialGrfWriter::SomasAusentes(campos);
+}
+
 void CCMaterialDataReader::Guarda(CEItemLista* item) {
-    // Kept items share their field names from the start: a large list holds millions.
-    PartilhaNomes(*item);
+    // Kept items give back their arrays' spare room from the start, but for the sums: a large
+    // list holds millions.
+    item->campos.compactar(FolgaDosCampos(item->campos));
+    // The symbols of a block come in a row: the next one's fields are made in as much room,
+    // and most often need not move here.
+    CamposPrevistos = item->campos.todos().capacity();
     resultado_.push_back(item);
 }
 
@@ -286,7 +284,7 @@ void CCMaterialDataReader::LeFios(zvdb::Database* database,
         for (const zvsdk::ResultBuffer* no = lista; no; no = no->rbnext) {
             if (no->restype != zvsdk::RTSTR) continue;
             const OdDbObjectId id = CICad::IdDoHandle(no->rstring, database);
-            if (!id.isNull()) segmentos[NomeNoXData(id)].push_back(id);
+            if (!id.isNull()) segmentos[NomeDoFioNoXData(id)].push_back(id);
         }
         CICad::LiberaLista(lista);
     }
@@ -304,17 +302,20 @@ void CCMaterialDataReader::LeFios(zvdb::Database* database,
         const QString nome = NomeDoFio(*item);
         if (nome.isEmpty() || nomes.contains(nome)) continue;
         nomes.insert(nome);
-        const std::vector<OdDbObjectId>& partes = segmentos[nome];
-        if (partes.empty()) continue;
-        const CEItemLista reserva = *item;
+        const auto achadas = segmentos.find(nome);
+        if (achadas == segmentos.end() || achadas->second.empty()) continue;
+        const std::vector<OdDbObjectId>& partes = achadas->second;
+        // The wire's own fields start every stretch after the first: kept only for those.
+        std::optional<CEItemLista> reserva;
+        if (partes.size() > 2) reserva = *item;
         CEItemLista* atual = item.get();
         CopiaEntidade(kIni, *atual, partes.front(), &modelo);
         for (size_t s = 1; s < partes.size(); ++s) {
             CopiaEntidade(kFim, *atual, partes[s], &modelo);
             if (s + 1 == partes.size()) break;
             auto* seguinte = new CEItemLista;
-            seguinte->campos = reserva.campos;
-            seguinte->ids = reserva.ids;
+            seguinte->campos = reserva->campos;
+            seguinte->ids = reserva->ids;
             CopiaEntidade(kIni, *seguinte, partes[s], &modelo);
             atual->ligado = seguinte;
             atual = seguinte;

@@ -14,7 +14,11 @@
 class CCMaterialDataReader : public CCDataReader {
 public:
     // Each wire's first polyline is read for its item and copied again as its first end.
-    CCMaterialDataReader() { FiosDasLeituras = true; }
+    // No route of a wire is asked for.
+    CCMaterialDataReader() {
+        FiosDasLeituras = true;
+        LeRotas = false;
+    }
     // Nothing on sides: a material has no connections of its own.
     void LerLadoIni(CEItemLista& item, const OdDbObjectId& entidade, CETemplate& modelo) override;
     void LerLadoFim(CEItemLista& item, const OdDbObjectId& entidade, CETemplate& modelo) override;
@@ -27,6 +31,10 @@ public:
     static void Agrupa(VetorItens& itens, CETemplate& modelo);
 
 protected:
+    // The sums the list writes into every member of a group: their room is left when the
+    // item is made, so that no member's fields move for them then.
+    std::size_t FolgaDosCampos(const CamposItem& campos) const override;
+
     struct Simbolos {
         bool selecaoPaginas = false, bornes = false, aceOrfaos = false;
         QString fontes;

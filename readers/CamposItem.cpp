@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <array>
 #include <deque>
+#include <iterator>
 
 namespace {
 
@@ -169,6 +170,15 @@ int CamposItem::remove(const QString& chave) {
     if (it == campos_.end() || it->nome != n) return 0;
     campos_.erase(it);
     return 1;
+}
+
+void CamposItem::compactar(std::size_t folga) {
+    const std::size_t tamanho = campos_.size() + folga;
+    if (campos_.capacity() == tamanho) return;
+    std::vector<Campo> novos;
+    novos.reserve(tamanho);
+    std::move(campos_.begin(), campos_.end(), std::back_inserter(novos));
+    campos_.swap(novos);
 }
 
 void CamposItem::juntar(const CamposItem& origem) {

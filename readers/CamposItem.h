@@ -82,6 +82,8 @@ public:
     void reservar(std::size_t n) { campos_.reserve(n); }
     // Gives back the spare room of the array once the item is complete.
     void compactar() { campos_.shrink_to_fit(); }
+    // The same, leaving room for `folga` fields more: for those every item is known to get.
+    void compactar(std::size_t folga);
     // Keeps the fields whose name number `fica` accepts, in their order; the room of the
     // others stays until compactar (an item still being filled would take it again).
     template <class Fica>

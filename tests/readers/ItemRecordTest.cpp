@@ -430,6 +430,27 @@ TEST(ItemRecordTest, AnArrayHandedBackComesEmptyAndKeepsItsRoom) {
     EXPECT_GE(item.campos.retirar().capacity(), lugar);
 }
 
+// Compacted with room for more, an item keeps its fields and takes that many more in place.
+TEST(ItemRecordTest, AnArrayCompactedWithRoomTakesThatManyMoreWithoutMoving) {
+    CEItemLista item;
+    for (const char* nome : {"FOLGA_C", "FOLGA_A", "FOLGA_E"})
+        item.definirCampo(nome, nome);
+    item.campos.compactar(2);
+    EXPECT_EQ(item.campos.size(), 3);
+    EXPECT_EQ(item.valorCampo("FOLGA_A"), "FOLGA_A");
+    EXPECT_EQ(item.valorCampo("FOLGA_E"), "FOLGA_E");
+    const CamposItem::Campo* antes = item.campos.todos().data();
+    item.definirCampo("FOLGA_B", "b");
+    item.definirCampo("FOLGA_D", "d");
+    EXPECT_EQ(item.campos.todos().data(), antes);
+    EXPECT_EQ(item.campos.keys(),
+              QStringList({"FOLGA_C", "FOLGA_A", "FOLGA_E", "FOLGA_B", "FOLGA_D"}));
+    // None left: the next field moves the array.
+    EXPECT_EQ(item.campos.todos().capacity(), 5u);
+    item.campos.compactar(0);
+    EXPECT_EQ(item.campos.todos().capacity(), 5u);
+}
+
 // Asking for a name no item ever had does not add it to the program's name table.
 TEST(ItemRecordTest, LookingUpAnUnknownNameLeavesTheNameTableAlone) {
     CEItemLista item;

@@ -126,6 +126,37 @@ TEST_F(MaterialReaderTest, AccessoriesGroupedLikeMaterialsOrBehindTheirOwner) {
     EXPECT_EQ(Le(), QStringList({"A1:2", "B3:1"}));
 }
 
+// The list writes its sums into every member: the reader leaves room for them, so that no
+// member's fields move then.
+TEST_F(MaterialReaderTest, EveryMemberTakesTheGroupsSumsWithoutMovingItsFields) {
+    Simbolo("K", "A1", "ESQ$0001$A", {}, 0);
+    Simbolo("K", "A1", "ESQ$0002$A", {{"QTD", "2"}}, 10);
+    Simbolo("K", "B3", "ESQ$0002$A", {}, 20);
+    for (int vinculos : {1, 2}) {
+        modelo.simbolos["*IMP_VINCL*"] = vinculos;
+        CCMaterialDataReader leitor;
+        CIProgress progresso;
+        std::unique_ptr<VetorItens> itens(leitor.LerDados(&db(), std::nullopt, modelo, progresso));
+        // Behind each head (which also gets its sequence number) its members.
+        std::vector<std::pair<CEItemLista*, const CamposItem::Campo*>> membros;
+        for (CEItemLista* item : *itens)
+            for (CEItemLista* m = item->ligado; m; m = m->ligado)
+                membros.emplace_back(m, m->campos.todos().data());
+        ASSERT_GT(membros.size(), 5u);
+        CCMaterialGrfWriter::SomaGrupos(*itens, 0);
+        for (const auto& [m, antes] : membros) {
+            EXPECT_EQ(m->campos.todos().data(), antes) << m->valorCampo("ZV_KEY").toStdString();
+            EXPECT_EQ(CCMaterialGrfWriter::SomasAusentes(m->campos), 0u);
+        }
+        EXPECT_EQ(itens->at(0)->valorCampo("ZV_KEY"), "A1");
+        EXPECT_EQ(itens->at(0)->valorCampo("QTD"), "3");
+        for (const auto& [m, antes] : membros)
+            delete m;
+        for (CEItemLista* item : *itens)
+            delete item;
+    }
+}
+
 TEST_F(MaterialReaderTest, AccessoriesOfAnUnlistedSymbolCountOnlyWhenAsked) {
     Simbolo("K", "NL", "ESQ$0001$A");
     modelo.simbolos["*IMP_VINCL*"] = 2;
