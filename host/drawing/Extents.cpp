@@ -9,6 +9,7 @@
 
 #include <cmath>
 #include <numbers>
+#include <typeinfo>
 
 namespace zvdb {
 
@@ -108,7 +109,11 @@ BoundingBox Extents::ofEntity(const Entity& entity, bool withAttributes, int dep
     BoundingBox box;
     if (entity.isErased() || depth > kMaxDepth) return box;
     const std::string_view type = entity.type();
-    if (const auto* reference = dynamic_cast<const BlockReference*>(&entity)) {
+    // No kind of reference or polyline derives from their classes: the type tells them, more
+    // cheaply than a cast that searches the hierarchy.
+    const std::type_info& kind = typeid(entity);
+    if (kind == typeid(BlockReference)) {
+        const auto* reference = static_cast<const BlockReference*>(&entity);
         if (const BlockRecord* block = reference->definition())
             box = transformed(ofBlock(*block, depth + 1), reference->transformFor(block));
         if (withAttributes)
@@ -119,7 +124,8 @@ BoundingBox Extents::ofEntity(const Entity& entity, bool withAttributes, int dep
     // The object coordinate system, read only for the kinds drawn in it (a reference's is in
     // its transform, a text's in its own placing).
     auto ocs = [&entity] { return Transform::fromOcs(entity.point(210, {0, 0, 1})); };
-    if (const auto* polyline = dynamic_cast<const Polyline*>(&entity)) {
+    if (kind == typeid(Polyline)) {
+        const auto* polyline = static_cast<const Polyline*>(&entity);
         const std::vector<Point3> vertices = polyline->vertices();
         if (vertices.empty()) return box;
         if (!polyline->isLightweight()) {
