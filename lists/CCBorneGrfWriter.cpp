@@ -46,6 +46,26 @@ void Preenche(CEPaginaLista& pagina, Grade& grade, const CEItemLista& ultimo) {
 
 }  // namespace
 
+std::optional<QSet<QString>> CCBorneGrfWriter::CamposDasLinhas(CETemplate& modelo) {
+    QSet<QString> nomes;
+    // Only the row block takes an item's fields; the header and footer take the page's.
+    const QString valor = modelo.LerTexto("LISTA_DETALHE");
+    if (!valor.isEmpty()) {
+        const QString nome = "BLK_CTR_LST_DET_BORN" + modelo.LerTexto("FUNCAO_LSTGRT");
+        const std::optional<QSet<QString>> doBloco = CCListaPaginada::CamposDoBloco(
+            {"LISTA_DETALHE", nome, CCListaPaginada::CaminhoBloco(valor)}, true);
+        if (!doBloco) return std::nullopt;
+        nomes = *doBloco;
+    }
+    for (const char* lista : {"*LISTA_DE_SORT*", "*ZV_CHAVE_QUEBRA_PAGINA*"})
+        for (const QString& nome : modelo.LerListaTexto(lista))
+            CCListaPaginada::JuntaNome(nomes, nome);
+    const std::optional<QSet<QString>> doFiltro =
+        CETemplateLisp::CamposDaExpressao(modelo.LerTexto("*FILTRO_TEMPLATE*").trimmed());
+    if (!doFiltro) return std::nullopt;
+    return nomes.unite(*doFiltro);
+}
+
 std::vector<CEPaginaLista> CCBorneGrfWriter::Diagrama(VetorItens& itens, CETemplate& modelo) {
     std::vector<CEPaginaLista> paginas;
     VetorItens presentes;

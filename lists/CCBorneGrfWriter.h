@@ -4,11 +4,19 @@
 #include "CCListaPaginada.h"
 #include "module/CCDataWriter.h"
 
+#include <QSet>
+
+#include <optional>
 #include <vector>
 
 class CCBorneGrfWriter : public CCDataWriter {
 public:
     void EscreverItens(VetorItens& itens, CETemplate& modelo) override;
+
+    // The names (in upper case) of the fields the list reads of its items: its row block's
+    // cells, its sort and break fields and what its filter reads. None when an unreadable row
+    // block, or a function cell or filter that could read any field, leaves them open.
+    static std::optional<QSet<QString>> CamposDasLinhas(CETemplate& modelo);
 
     // The page layout of the items, without touching the drawing.
     static std::vector<CEPaginaLista> Diagrama(VetorItens& itens, CETemplate& modelo);

@@ -64,26 +64,6 @@ QStringList CCFioGrfWriter::CamposTotal(const CCListaPaginada::Bloco& total) {
     return campos;
 }
 
-namespace {
-
-// A name as the list looks it up, and in upper case: the filter compares in upper case.
-void JuntaNome(QSet<QString>& nomes, const QString& nome) {
-    nomes << nome.toUpper() << nome.trimmed().toUpper();
-}
-
-// The tags and default texts of the definitions; false when one of them is a function.
-bool JuntaDefinicoes(const zv::CEListaAtributos* definicoes, QSet<QString>& nomes) {
-    for (int i = 0; definicoes && i < definicoes->Quantidade(); ++i) {
-        const zv::CEAtributo& definicao = (*definicoes)[i];
-        if (CCListaPaginada::EhFuncao(definicao.GetTag())) return false;
-        JuntaNome(nomes, definicao.GetTag());
-        JuntaNome(nomes, definicao.GetValor());
-    }
-    return true;
-}
-
-}  // namespace
-
 std::optional<QSet<QString>> CCFioGrfWriter::CamposDasLinhas(CETemplate& modelo) {
     QSet<QString> nomes;
     const QString grupo = modelo.LerTexto("FUNCAO_LSTGRW");
@@ -91,19 +71,15 @@ std::optional<QSet<QString>> CCFioGrfWriter::CamposDasLinhas(CETemplate& modelo)
     for (const size_t bloco : {size_t(kDetalhe), size_t(kTotal)}) {
         const QString valor = modelo.LerTexto(kSimbolos[bloco]);
         if (valor.isEmpty()) continue;
-        const QString arquivo = CCListaPaginada::CaminhoBloco(valor);
-        if (!JuntaDefinicoes(CICad::LeDefinicoesDoArquivo(arquivo).get(), nomes))
-            return std::nullopt;
-        OdDbObjectId id;
-        const QString nome = kPrefixos[bloco] + grupo;
-        if (CICad::GetBlocoId(nome, id) &&
-            !JuntaDefinicoes(CICad::LeDefinicoesAtributos(arquivo, nome).get(), nomes))
-            return std::nullopt;
+        const std::optional<QSet<QString>> doBloco = CCListaPaginada::CamposDoBloco(
+            {kSimbolos[bloco], kPrefixos[bloco] + grupo, CCListaPaginada::CaminhoBloco(valor)});
+        if (!doBloco) return std::nullopt;
+        nomes.unite(*doBloco);
     }
     for (const char* lista : {"*LISTA_DE_SORT*", "*ZV_CHAVE_QUEBRA_PAGINA*"})
         for (const QString& nome : modelo.LerListaTexto(lista))
-            JuntaNome(nomes, nome);
-    JuntaNome(nomes, QStringLiteral("COMPRIMENTO"));
+            CCListaPaginada::JuntaNome(nomes, nome);
+    CCListaPaginada::JuntaNome(nomes, QStringLiteral("COMPRIMENTO"));
     return nomes;
 }
 

@@ -32,6 +32,44 @@ void CCListaPaginada::ImportaBloco(const Bloco& bloco) {
     if (bloco.existe()) CICad::RecarregaBloco(bloco.arquivo, bloco.nome);
 }
 
+void CCListaPaginada::JuntaNome(QSet<QString>& nomes, const QString& nome) {
+    nomes << nome.toUpper() << nome.trimmed().toUpper();
+}
+
+bool CCListaPaginada::JuntaCampos(const zv::CEListaAtributos* definicoes, QSet<QString>& nomes,
+                                  bool porNome) {
+    for (int i = 0; definicoes && i < definicoes->Quantidade(); ++i) {
+        const zv::CEAtributo& definicao = (*definicoes)[i];
+        if (EhFuncao(definicao.GetTag())) {
+            // The function reads its item as `reg`, as a filter does.
+            const std::optional<QSet<QString>> lidos =
+                porNome ? CETemplateLisp::CamposDaExpressao(definicao.GetValor()) : std::nullopt;
+            if (!lidos) return false;
+            nomes.unite(*lidos);
+            continue;
+        }
+        JuntaNome(nomes, definicao.GetTag());
+        JuntaNome(nomes, definicao.GetValor());
+    }
+    return true;
+}
+
+std::optional<QSet<QString>> CCListaPaginada::CamposDoBloco(const Bloco& bloco, bool porNome) {
+    QSet<QString> nomes;
+    const std::unique_ptr<zv::CEListaAtributos> doArquivo =
+        CICad::LeDefinicoesDoArquivo(bloco.arquivo);
+    if (!JuntaCampos(doArquivo.get(), nomes, porNome)) return std::nullopt;
+    // The drawing's own block stays when the file fails: without either, nothing says
+    // what the rows read.
+    OdDbObjectId id;
+    const bool noDesenho = CICad::GetBlocoId(bloco.nome, id);
+    if (!doArquivo && !noDesenho) return std::nullopt;
+    if (noDesenho &&
+        !JuntaCampos(CICad::LeDefinicoesAtributos(bloco.arquivo, bloco.nome).get(), nomes, porNome))
+        return std::nullopt;
+    return nomes;
+}
+
 std::vector<CCListaPaginada::Bloco> CCListaPaginada::ResolveBlocos(CETemplate& modelo,
                                                                    const QStringList& simbolos,
                                                                    const QStringList& prefixos,

@@ -8,6 +8,7 @@
 #include "cad/OdDbObjectId.h"
 
 #include <QHash>
+#include <QSet>
 #include <QStringList>
 
 #include <functional>
@@ -16,6 +17,9 @@
 #include <vector>
 
 class CETemplate;
+namespace zv {
+class CEListaAtributos;
+}
 
 class CCListaPaginada {
 public:
@@ -34,6 +38,15 @@ public:
     // "\\DADOS\\X" and the like from the shared folder, as a ".dwg" path.
     static QString CaminhoBloco(const QString& valor);
     static void ImportaBloco(const Bloco& bloco);
+    // The fields a block's cells may name: every tag and default text, in upper case (as a
+    // list looks them up, and trimmed) into `nomes`. False when a cell is a function, which
+    // reads any field; with `porNome`, one that only looks fields up by name gives those.
+    static bool JuntaCampos(const zv::CEListaAtributos* definicoes, QSet<QString>& nomes,
+                            bool porNome = false);
+    static void JuntaNome(QSet<QString>& nomes, const QString& nome);
+    // The fields a list reads of the block's definitions: those of its file, and of the
+    // drawing's own block of that name when there is one. None when a function reads them.
+    static std::optional<QSet<QString>> CamposDoBloco(const Bloco& bloco, bool porNome = false);
 
     // Message 89 when the group exists (Yes replaces it), then one page per record, named
     // after the layer criarpagina leaves current, then atualizarpaginas.

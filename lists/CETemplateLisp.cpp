@@ -42,6 +42,83 @@ void CETemplateLisp::LerPonto(const QString& simbolo, double& x, double& y) {
     y = TextoParaReal(partes.value(1));
 }
 
+namespace {
+
+// The expression's atoms and parentheses; a string keeps its quotes. False on a string left open
+// or with an escape, whose text the reader would have to read as LISP does.
+bool Fatias(const QString& texto, QStringList& fatias) {
+    for (int i = 0; i < texto.size();) {
+        const QChar c = texto[i];
+        if (c.isSpace()) {
+            ++i;
+        } else if (c == '(' || c == ')') {
+            fatias << QString(c);
+            ++i;
+        } else if (c == '"') {
+            QString literal(c);
+            for (++i; i < texto.size() && texto[i] != '"'; ++i) {
+                if (texto[i] == '\\') return false;
+                literal += texto[i];
+            }
+            if (i == texto.size()) return false;
+            fatias << literal + '"';
+            ++i;
+        } else {
+            const int inicio = i;
+            while (i < texto.size() && !texto[i].isSpace() && texto[i] != '(' && texto[i] != ')' &&
+                   texto[i] != '"')
+                ++i;
+            fatias << texto.mid(inicio, i - inicio);
+        }
+    }
+    return true;
+}
+
+// Functions that see nothing of the item but their arguments.
+bool Simples(const QString& simbolo) {
+    static const QSet<QString> kSimples = {
+        "/=",   "=",      "<",      ">",      "<=",  ">=",    "and",     "or",      "not",
+        "null", "eq",     "equal",  "car",    "cdr", "assoc", "strcase", "wcmatch", "atoi",
+        "atof", "strlen", "substr", "strcat", "nil", "t",     "if",      "+",       "-"};
+    return kSimples.contains(simbolo.toLower());
+}
+
+// Digits, a sign, a point or an exponent alone: no symbol that could name a function.
+bool Numero(const QString& fatia) {
+    bool numero = false;
+    fatia.toDouble(&numero);
+    return numero && std::all_of(fatia.begin(), fatia.end(), [](QChar c) {
+               return c.isDigit() || QStringLiteral("+-.eE").contains(c);
+           });
+}
+
+bool Literal(const QString& fatia) {
+    return fatia.startsWith('"');
+}
+
+}  // namespace
+
+std::optional<QSet<QString>> CETemplateLisp::CamposDaExpressao(const QString& expressao) {
+    QStringList fatias;
+    if (!Fatias(expressao, fatias)) return std::nullopt;
+    QSet<QString> nomes;
+    for (int i = 0; i < fatias.size(); ++i) {
+        const QString& fatia = fatias[i];
+        if (fatia == "(" || fatia == ")" || Literal(fatia) || Numero(fatia)) continue;
+        // `reg` holds the item's fields (CEItemLista::paraLisp).
+        if (fatia.compare(QLatin1String("reg"), Qt::CaseInsensitive) == 0) {
+            const bool porNome = i >= 3 && i + 1 < fatias.size() && fatias[i - 3] == "(" &&
+                                 fatias[i - 2].toLower() == "assoc" && Literal(fatias[i - 1]) &&
+                                 fatias[i + 1] == ")";
+            if (!porNome) return std::nullopt;
+            nomes << fatias[i - 1].mid(1, fatias[i - 1].size() - 2).toUpper();
+        } else if (!Simples(fatia)) {
+            return std::nullopt;
+        }
+    }
+    return nomes;
+}
+
 bool CETemplateLisp::FiltraItem(const CEItemLista& item) {
     static const QString simboloFiltro("*FILTRO_TEMPLATE*");
     static const QString simboloResposta("INVOKELISP_LISTAS_TMP");

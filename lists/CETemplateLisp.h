@@ -2,6 +2,10 @@
 // A template that is a LISP file, loaded by the product's ZVCarregaTemplate.
 #include "CETemplate.h"
 
+#include <QSet>
+
+#include <optional>
+
 class CETemplateLisp : public CETemplate {
 public:
     using CETemplate::CETemplate;
@@ -14,6 +18,12 @@ public:
     bool LerLogico(const QString& simbolo) override;
     void LerPonto(const QString& simbolo, double& x, double& y) override;
     bool FiltraItem(const CEItemLista& item) override;
+
+    // The fields a LISP expression over an item (a filter, a function cell) reads, when all it
+    // does with them is look them up by name, (assoc "NAME" reg), among plain functions; none
+    // when it could read any field (reg used otherwise, a function of the product's own, a
+    // quoted form).
+    static std::optional<QSet<QString>> CamposDaExpressao(const QString& expressao);
 
     // The plain text-to-real rule: the leading number, 0.0 when there is none.
     static double TextoParaReal(const QString& texto);

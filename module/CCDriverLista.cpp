@@ -113,6 +113,7 @@ void CCDriverLista::Executar(TipoLista tipo) {
     }
     if (tipo == TipoLista::Materiais) return ExecutarMateriais(caminho);
     CCBorneDataReader leitor;
+    leitor.CamposDaLista = &CCBorneGrfWriter::CamposDasLinhas;
     CCBorneGrfWriter escritor;
     CETemplateLisp modelo(caminho);
     ExecutarLista(leitor, escritor, modelo);

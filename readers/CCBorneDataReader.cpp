@@ -55,6 +55,18 @@ CEItemLista* ItemEmBranco(const QString& regua, int numero) {
     return item;
 }
 
+// The names a side keeps of its copies: those the list reads, and the relation, strip and
+// number the side reads back to make its relation. None: all.
+std::function<bool(const QString&)> DosLados(std::optional<QSet<QString>> nomes) {
+    if (!nomes) return {};
+    for (const char* base :
+         {"RELACAO", "TAG", "ETIQUETA", "REGUA", "STRIP", "REGLETA", "NUMERO", "NUMBER"})
+        for (const char* sufixo : {"_INI", "_FIM"})
+            *nomes << QLatin1String(base) + QLatin1String(sufixo);
+    return
+        [nomes = std::move(*nomes)](const QString& nome) { return nomes.contains(nome.toUpper()); };
+}
+
 QString Progresso(int k, int n) {
     return CIProgress::Contagem(k, n);
 }
@@ -270,6 +282,7 @@ VetorItens* CCBorneDataReader::LerDados(zvdb::Database* database,
                                         CETemplate& modelo, CIProgress& progresso) {
     Q_UNUSED(paginas);
     concatenacao_ = {};  // the template's texts are read again for each run
+    if (CamposDaLista) FiltraSufixos(DosLados(CamposDaLista(modelo)));
     CarregaConexoesFios();
     progresso.Definir(10);
     CarregaConexoesCabos();

@@ -3,7 +3,10 @@
 // each of its sides, the wires themselves, and the jumper chains of the strips.
 #include "CCDataReader.h"
 
+#include <QSet>
+
 #include <array>
+#include <functional>
 #include <optional>
 #include <unordered_set>
 #include <utility>
@@ -62,6 +65,9 @@ public:
         // other side, whose point that is, takes it.
         std::optional<OdDbObjectId> fioOutro;
     };
+    // For a list that reads few of its items' fields: the names it reads (none: any). The
+    // sides then copy of their neighbours and wires only those and what they read themselves.
+    std::function<std::optional<QSet<QString>>(CETemplate&)> CamposDaLista;
     // Repeated numbers leave the jumpers unlinked; the terminal list says so (message 329),
     // the exports, which draw no jumpers, do not.
     bool AvisaNumerosRepetidos = true;

@@ -9,6 +9,7 @@
 #include "drawing/DxfLoader.h"
 #include "drawing/DxfWriter.h"
 #include "drawing/PythonChecker.h"
+#include "lists/CETemplateLisp.h"
 
 #include <gtest/gtest.h>
 
@@ -237,6 +238,93 @@ TEST_F(TerminalListTest, AFilterExpressionKeepsOnlyTheTerminalsItAccepts) {
         obtido << linha.texto;
     }
     EXPECT_EQ(obtido, esperado);
+}
+
+TEST_F(TerminalListTest, RowCellsShowTheSidesFieldsThatAFunctionCellWouldSee) {
+    const char* const tags[] = {"VARIAVEL_N", "VARIAVEL_A", "VARIAVEL_B",
+                                "VARIAVEL_C", "VARIAVEL_D", "VARIAVEL_E"};
+    // A row block naming fields of the sides' neighbours and wires, with or without a
+    // function cell (which may read any field, so every one is copied).
+    const auto bloco = [&](const QString& nome, bool funcao) {
+        zvdb::Database db;
+        const std::vector<std::pair<std::string, std::string>> celulas{
+            {tags[0], "NUMERO"},           {tags[1], " DESCRICAO_FIM "}, {tags[2], "DESCRICAO_INI"},
+            {tags[3], "SECAO_MM2_SEGINI"}, {tags[4], "RELACAO_INI"},     {tags[5], "COR_SEGFIM"}};
+        double x = 0;
+        for (const auto& [tag, valor] : celulas)
+            db.modelSpace()->addAttributeDefinition(tag, tag, valor, {x += 10, 0, 0}, 1.0);
+        if (funcao)
+            db.modelSpace()->addAttributeDefinition("FUNCAO_N", "FUNCAO_N", "(itoa (length reg))",
+                                                    {x + 10, 0, 0}, 1.0);
+        zvdb::DxfWriter::saveFile(
+            db, pasta_->path("produto/DADOS/1/BLOCOS/" + nome + ".dxf").toStdString());
+    };
+    bloco("LINHA_C", false);
+    bloco("LINHA_F", true);
+    // Each row's named cells, in order.
+    const auto celulas = [&](const QString& arquivo) {
+        QStringList linhas;
+        const auto db = zvdb::DxfLoader::loadFile(arquivo.toStdString());
+        for (zvdb::Entity* e : db->modelSpace()->entities()) {
+            auto* ref = dynamic_cast<zvdb::BlockReference*>(e);
+            if (!ref || !ref->blockName().starts_with("BLK_CTR_LST_DET_BORN")) continue;
+            QStringList valores;
+            for (const char* tag : tags) {
+                zvdb::Attribute* a = ref->attribute(tag);
+                valores << (a ? QString::fromStdString(std::string(a->textValue())) : "-");
+            }
+            linhas << valores.join('|');
+        }
+        return linhas;
+    };
+    const auto lista = [&](const QString& nome, const QString& bloco, const QString& filtro) {
+        const QString saida = pasta_->path(nome + ".dxf");
+        const QStringList extra =
+            modelo(nome + ".grt", ("(setq LISTA_DETALHE \"DADOS\\\\1\\\\BLOCOS\\\\" + bloco +
+                                   "\" *FILTRO_TEMPLATE* \"" + filtro + "\")")
+                                      .toUtf8());
+        const Resultado r = TerminalListTest::lista(pasta_->path("p.dxf"), saida, extra);
+        EXPECT_EQ(r.status, 0) << r.err.toStdString();
+        return celulas(saida);
+    };
+    // The demo's filter reads the strip alone.
+    const QString demo = "(/= (cdr (assoc \\\"REGUA\\\" reg)) \\\"XV\\\")";
+    const QStringList simples = lista("campos-c", "LINHA_C", demo);
+    ASSERT_GT(simples.size(), 20);
+    EXPECT_EQ(simples, lista("campos-f", "LINHA_F", demo));
+    // The cells hold values of both sides' neighbours and wires.
+    int cheias[6] = {};
+    for (const QString& linha : simples) {
+        const QStringList v = linha.split('|');
+        for (int i = 0; i < 6; ++i)
+            cheias[i] += !v[i].isEmpty();
+    }
+    for (int i = 1; i < 6; ++i)
+        EXPECT_GT(cheias[i], 0) << tags[i];
+    // A filter on a side's field no cell names still sees it: the terminals it drops leave
+    // blank rows.
+    const QString lado = "(/= (cdr (assoc \\\"FABRICANTE_INI\\\" reg)) \\\"Conexa\\\")";
+    const QStringList filtrada = lista("campos-lado-c", "LINHA_C", lado);
+    EXPECT_FALSE(filtrada.isEmpty());
+    EXPECT_NE(filtrada, simples);
+    EXPECT_EQ(filtrada, lista("campos-lado-f", "LINHA_F", lado));
+}
+
+TEST(TerminalListFilterTest, AFilterReadsTheFieldsItLooksUpByNameAndAnyOtherReadsAll) {
+    using Nomes = std::optional<QSet<QString>>;
+    EXPECT_EQ(CETemplateLisp::CamposDaExpressao(""), Nomes(QSet<QString>{}));
+    EXPECT_EQ(
+        CETemplateLisp::CamposDaExpressao(
+            "(and (/= (cdr (assoc \"REGUA\" reg)) \"XV\")\n"
+            "     (or (not (assoc \"cor_ini\" REG)) (> (atoi (cdr (assoc \"N\" reg))) -2.5)))"),
+        Nomes(QSet<QString>({"REGUA", "COR_INI", "N"})));
+    // reg as a whole, a function of the product's, a quoted form, a symbol that looks like
+    // a number, an escape, an open string: any field may be read.
+    for (const char* filtro :
+         {"(length reg)", "(assoc (strcat \"A\" \"_INI\") reg)", "(meufiltro reg)",
+          "(member (cdr (assoc \"REGUA\" reg)) '(\"X0\"))", "(inf)", "(assoc \"A\\\"B\" reg)",
+          "(assoc \"REGUA reg)", "(setq reg nil)", "(cdr (assoc \"A\" reg) reg)"})
+        EXPECT_EQ(CETemplateLisp::CamposDaExpressao(filtro), std::nullopt) << filtro;
 }
 
 TEST_F(TerminalListTest, TheListedDrawingPassesTheAuditOfAnotherReader) {

@@ -3,6 +3,7 @@
 #include "readers/FioFixture.h"
 
 #include "module/CIProgress.h"
+#include "readers/CCBorneDataReader.h"
 #include "readers/CEAtributo.h"
 
 #include <QRegularExpression>
@@ -747,6 +748,58 @@ TEST_F(WireListFieldsTest, TheStretchesKeepWhatTheListReadsAndAFunctionKeepsEver
     ASSERT_EQ(todos.size(), inteiros.size());
     for (size_t k = 0; k < todos.size(); ++k)
         EXPECT_EQ(todos[k].join(' ').toStdString(), inteiros[k].join(' ').toStdString());
+}
+
+// ---- the fields the terminal list keeps of a terminal's sides
+
+class TerminalSidesTest : public FioFixture {
+protected:
+    // Each terminal's fields as "name=value"; with `nomes`, the reader copies of its sides only
+    // those the list reads.
+    std::vector<QStringList> bornes(const std::optional<QSet<QString>>& nomes) {
+        CCBorneDataReader leitor;
+        if (nomes) leitor.CamposDaLista = [&nomes](CETemplate&) { return nomes; };
+        CIProgress progresso;
+        std::unique_ptr<VetorItens> lidos(leitor.LerDados(&db(), std::nullopt, modelo_, progresso));
+        std::vector<QStringList> todos;
+        for (const CEItemLista* item : *lidos) {
+            QStringList deste;
+            for (auto c = item->campos.begin(); c != item->campos.end(); ++c)
+                deste << c.key() + "=" + c.value();
+            todos.push_back(deste);
+        }
+        lidos->destruirItens();
+        return todos;
+    }
+};
+
+TEST_F(TerminalSidesTest, ASideKeepsWhatTheListReadsAndWhatItsRelationIsMadeOf) {
+    borne("X1", "1", {20, 200, 0});
+    borne("X2", "5", {20, 150, 0});
+    componente("-K1", {{"A1", {20, 100, 0}}});
+    fio({{20, 190, 0}, {20, 150, 0}}, "12");
+    fio({{20, 140, 0}, {20, 100, 0}}, "13");
+    const std::vector<QStringList> inteiros = bornes(std::nullopt);
+    ASSERT_EQ(inteiros.size(), 2u);
+    const QStringList todos = inteiros[0] + inteiros[1];
+    // A full reading holds the neighbours' and wires' fields; the terminal met as neighbour
+    // gives its strip and number as the relation.
+    for (const char* campo : {"DESCRICAO_INI", "QTD_FIM", "FIO_SEGINI", "REGUA_FIM"})
+        EXPECT_FALSE(todos.filter(QRegularExpression(QString("^") + campo + "=")).isEmpty())
+            << campo;
+    EXPECT_TRUE(todos.contains("RELACAO_FIM=X1:1"));
+    // A list that reads one field of a wire: the terminals' own fields, that one, and the
+    // relations with what they are made of, as the full reading gives them.
+    const QRegularExpression lido(
+        "^([A-Z_0-9]+(?<!_INI|_FIM|_SEGINI|_SEGFIM)|FIO_SEGINI|"
+        "(RELACAO|TAG|ETIQUETA|REGUA|STRIP|REGLETA|NUMERO|NUMBER)_(INI|FIM))=");
+    const std::vector<QStringList> lidos = bornes(QSet<QString>{"FIO_SEGINI"});
+    ASSERT_EQ(lidos.size(), inteiros.size());
+    for (size_t k = 0; k < lidos.size(); ++k) {
+        const QStringList esperado = inteiros[k].filter(lido);
+        EXPECT_EQ(lidos[k].join('|').toStdString(), esperado.join('|').toStdString());
+        EXPECT_LT(esperado.size(), inteiros[k].size());
+    }
 }
 
 // ---- the relation texts of an end
