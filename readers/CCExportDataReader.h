@@ -14,7 +14,10 @@ class CEExportacao;
 
 class CCExportDataReader : public CCMaterialDataReader {
 public:
-    CCExportDataReader() { GuardaSimbolos = true; }
+    CCExportDataReader() {
+        GuardaSimbolos = true;
+        PreveCampos = false;
+    }
     // A terminal's two sides are the hooks on the terminal itself: what is wired at its
     // insertion point, and at its cut point.
     void LerLadoIni(CEItemLista& item, const OdDbObjectId& entidade, CETemplate& modelo) override;

@@ -143,7 +143,7 @@ void CCMaterialDataReader::Guarda(CEItemLista* item) {
     item->campos.compactar(FolgaDosCampos(item->campos));
     // The symbols of a block come in a row: the next one's fields are made in as much room,
     // and most often need not move here.
-    CamposPrevistos = item->campos.todos().capacity();
+    if (PreveCampos) CamposPrevistos = item->campos.todos().capacity();
     resultado_.push_back(item);
 }
 

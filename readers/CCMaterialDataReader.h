@@ -34,6 +34,10 @@ protected:
     // The sums the list writes into every member of a group: their room is left when the
     // item is made, so that no member's fields move for them then.
     std::size_t FolgaDosCampos(const CamposItem& campos) const override;
+    // The next symbol's fields are made in the room the last kept item took: a bill of
+    // materials meets the symbols of one block in a row. A reader that keeps terminals,
+    // components and wires mixed clears it, as a wrong guess leaves holes in the heap.
+    bool PreveCampos = true;
 
     struct Simbolos {
         bool selecaoPaginas = false, bornes = false, aceOrfaos = false;
