@@ -57,9 +57,7 @@ std::optional<QSet<QString>> CCBorneGrfWriter::CamposDasLinhas(CETemplate& model
         if (!doBloco) return std::nullopt;
         nomes = *doBloco;
     }
-    for (const char* lista : {"*LISTA_DE_SORT*", "*ZV_CHAVE_QUEBRA_PAGINA*"})
-        for (const QString& nome : modelo.LerListaTexto(lista))
-            CCListaPaginada::JuntaNome(nomes, nome);
+    CCListaPaginada::JuntaOrdemEQuebras(modelo, nomes);
     const std::optional<QSet<QString>> doFiltro =
         CETemplateLisp::CamposDaExpressao(modelo.LerTexto("*FILTRO_TEMPLATE*").trimmed());
     if (!doFiltro) return std::nullopt;

@@ -76,9 +76,7 @@ std::optional<QSet<QString>> CCFioGrfWriter::CamposDasLinhas(CETemplate& modelo)
         if (!doBloco) return std::nullopt;
         nomes.unite(*doBloco);
     }
-    for (const char* lista : {"*LISTA_DE_SORT*", "*ZV_CHAVE_QUEBRA_PAGINA*"})
-        for (const QString& nome : modelo.LerListaTexto(lista))
-            CCListaPaginada::JuntaNome(nomes, nome);
+    CCListaPaginada::JuntaOrdemEQuebras(modelo, nomes);
     CCListaPaginada::JuntaNome(nomes, QStringLiteral("COMPRIMENTO"));
     return nomes;
 }

@@ -36,6 +36,12 @@ void CCListaPaginada::JuntaNome(QSet<QString>& nomes, const QString& nome) {
     nomes << nome.toUpper() << nome.trimmed().toUpper();
 }
 
+void CCListaPaginada::JuntaOrdemEQuebras(CETemplate& modelo, QSet<QString>& nomes) {
+    for (const char* lista : {"*LISTA_DE_SORT*", "*ZV_CHAVE_QUEBRA_PAGINA*"})
+        for (const QString& nome : modelo.LerListaTexto(lista))
+            JuntaNome(nomes, nome);
+}
+
 bool CCListaPaginada::JuntaCampos(const zv::CEListaAtributos* definicoes, QSet<QString>& nomes,
                                   bool porNome) {
     for (int i = 0; definicoes && i < definicoes->Quantidade(); ++i) {

@@ -44,6 +44,8 @@ public:
     static bool JuntaCampos(const zv::CEListaAtributos* definicoes, QSet<QString>& nomes,
                             bool porNome = false);
     static void JuntaNome(QSet<QString>& nomes, const QString& nome);
+    // The template's sort and page-break fields, which every paged list reads of its items.
+    static void JuntaOrdemEQuebras(CETemplate& modelo, QSet<QString>& nomes);
     // The fields a list reads of the block's definitions: those of its file, and of the
     // drawing's own block of that name when there is one. None when a function reads them.
     static std::optional<QSet<QString>> CamposDoBloco(const Bloco& bloco, bool porNome = false);

@@ -70,13 +70,8 @@ std::optional<QSet<QString>> CCBorneDwgWriter::CamposDosBornes(CETemplate& model
         const Bloco bloco = Configurado(modelo.LerTexto(simbolo), prefixo, pasta);
         if (!bloco.existe()) continue;
         const auto definicoes = CICad::LeDefinicoesAtributos(bloco.arquivo, bloco.nome);
-        if (!definicoes) return std::nullopt;
-        for (int i = 0; i < definicoes->Quantidade(); ++i) {
-            const zv::CEAtributo& definicao = (*definicoes)[i];
-            if (CCListaPaginada::EhFuncao(definicao.GetTag())) return std::nullopt;
-            nomes << definicao.GetTag().trimmed().toUpper()
-                  << definicao.GetValor().trimmed().toUpper();
-        }
+        if (!definicoes || !CCListaPaginada::JuntaCampos(definicoes.get(), nomes))
+            return std::nullopt;
     }
     const CEModeloReguas::Parametros parametros = CEModeloReguas::Parametros::DoModelo(modelo);
     for (const QStringList* lista : {&parametros.camposDetalhe, &parametros.chavesQuebra})
