@@ -70,7 +70,7 @@ std::optional<QSet<QString>> CCBorneDwgWriter::CamposDosBornes(CETemplate& model
         const Bloco bloco = Configurado(modelo.LerTexto(simbolo), prefixo, pasta);
         if (!bloco.existe()) continue;
         const auto definicoes = CICad::LeDefinicoesAtributos(bloco.arquivo, bloco.nome);
-        if (!definicoes || !CCListaPaginada::JuntaCampos(definicoes.get(), nomes))
+        if (!definicoes || !CCListaPaginada::JuntaCampos(definicoes.get(), nomes, true))
             return std::nullopt;
     }
     const CEModeloReguas::Parametros parametros = CEModeloReguas::Parametros::DoModelo(modelo);

@@ -43,9 +43,10 @@ public:
     Bloco BlocoConfigurado(const QString& valor) const;
 
     // The names of a terminal's fields the drawing may read, in upper case: each cell's tag
-    // and default text in the terminal and detail blocks (either may name a field), and the
-    // template's detail and page-break fields. None when a cell is a function, which sees
-    // every field, or a block file the template names cannot be read.
+    // and default text in the terminal and detail blocks (either may name a field), the
+    // names a function cell looks up by name, and the template's detail and page-break
+    // fields. None when a function cell may read any field (it sees the item as `reg`, as a
+    // filter does), or a block file the template names cannot be read.
     static std::optional<QSet<QString>> CamposDosBornes(CETemplate& modelo);
 
     // The laid-out model of the last run.

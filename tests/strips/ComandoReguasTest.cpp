@@ -2,6 +2,7 @@
 // added: strips of one terminal, numbers that are no numbers, jumpers to other strips,
 // strips the picker or the filter empties, and missing block files.
 #include "ProductFolder.h"
+#include "QtPrinters.h"
 #include "drawing/Attribute.h"
 #include "drawing/BlockRecord.h"
 #include "drawing/BlockReference.h"
@@ -156,6 +157,37 @@ protected:
             if (lingua == 2) return achado.captured(1);
         }
         return {};
+    }
+
+    // A block of the product's strip blocks, with the cells given (tag, default text).
+    static void Bloco(const QString& nome,
+                      const std::vector<std::pair<std::string, std::string>>& celulas) {
+        zvdb::Database db;
+        db.modelSpace()->addLwPolyline({{0, 0}, {5, 0}, {5, -10}, {0, -10}}, true);
+        double y = -2;
+        for (const auto& [tag, valor] : celulas)
+            db.modelSpace()->addAttributeDefinition(tag, tag, valor, {0, y -= 2, 0}, 1.0);
+        zvdb::DxfWriter::saveFile(
+            db, pasta_->path("produto/DADOS/1/BLOCOS/" + nome + ".dxf").toStdString());
+    }
+
+    // The cells of each reference of a block, in drawing order: the tags' values joined by
+    // "|", "-" for a tag the reference lacks.
+    static QStringList Celulas(const QString& arquivo, const QString& nome,
+                               const QStringList& tags) {
+        QStringList linhas;
+        const auto db = zvdb::DxfLoader::loadFile(arquivo.toStdString());
+        for (zvdb::Entity* e : db->modelSpace()->entities()) {
+            auto* ref = dynamic_cast<zvdb::BlockReference*>(e);
+            if (!ref || ref->blockName() != nome.toStdString()) continue;
+            QStringList valores;
+            for (const QString& tag : tags) {
+                zvdb::Attribute* a = ref->attribute(tag.toStdString());
+                valores << (a ? QString::fromStdString(std::string(a->textValue())) : "-");
+            }
+            linhas << valores.join('|');
+        }
+        return linhas;
     }
 
     static QByteArray Hash(const QString& arquivo) {
@@ -356,55 +388,39 @@ TEST_F(ComandoReguasTest, AMissingBlockFileEndsTheCommandAndNothingIsSaved) {
 }
 
 // The terminal block's cells may name any field of a side's neighbour or wire: a block of
-// plain cells shows the same as one that also holds a function, which sees every field.
+// plain cells shows the same as one that also holds a function that sees every field, and a
+// function that looks a field up by name shows what it would see with every field kept.
 TEST_F(ComandoReguasTest, TerminalCellsShowTheNeighboursFieldsThatAFunctionCellWouldSee) {
-    const auto bloco = [](const QString& nome, bool funcao) {
-        zvdb::Database db;
-        db.modelSpace()->addLwPolyline({{0, 0}, {5, 0}, {5, -10}, {0, -10}}, true);
-        std::vector<std::pair<std::string, std::string>> celulas{
-            {"VARIAVEL_NUMERO", "NUMERO"},
-            {"VARIAVEL_NUMBER", "NUMBER"},
-            {"VARIAVEL_A", " DESCRICAO_FIM "},
-            {"VARIAVEL_B", "FABRICANTE_INI"},
-            {"COR_SEGFIM", ""},
-            {"REFERENCIA_FIM", "?"},
-            {"VARIAVEL_C", "SECAO_MM2_SEGINI"}};
-        if (funcao) celulas.emplace_back("FUNCAO_N", "(itoa (length reg))");
-        double y = -2;
-        for (const auto& [tag, valor] : celulas)
-            db.modelSpace()->addAttributeDefinition(tag, tag, valor, {0, y -= 2, 0}, 1.0);
-        zvdb::DxfWriter::saveFile(
-            db, pasta_->path("produto/DADOS/1/BLOCOS/" + nome + ".dxf").toStdString());
+    const std::vector<std::pair<std::string, std::string>> celulas{
+        {"VARIAVEL_NUMERO", "NUMERO"},
+        {"VARIAVEL_NUMBER", "NUMBER"},
+        {"VARIAVEL_A", " DESCRICAO_FIM "},
+        {"VARIAVEL_B", "FABRICANTE_INI"},
+        {"COR_SEGFIM", ""},
+        {"REFERENCIA_FIM", "?"},
+        {"VARIAVEL_C", "SECAO_MM2_SEGINI"}};
+    const std::pair<std::string, std::string> porNome{"FUNCAO_D",
+                                                      "(cdr (assoc \"DESCRICAO_INI\" reg))"};
+    const std::pair<std::string, std::string> todos{"FUNCAO_N", "(itoa (length reg))"};
+    auto com = [&celulas](std::vector<std::pair<std::string, std::string>> mais) {
+        mais.insert(mais.begin(), celulas.begin(), celulas.end());
+        return mais;
     };
-    bloco("REGUA_BORNE_C", false);
-    bloco("REGUA_BORNE_F", true);
-    // Each drawn terminal's cells, in the order the terminals were drawn.
-    const auto celulas = [](const QString& arquivo, const QString& nome) {
-        QStringList linhas;
-        const auto db = zvdb::DxfLoader::loadFile(arquivo.toStdString());
-        for (zvdb::Entity* e : db->modelSpace()->entities()) {
-            auto* ref = dynamic_cast<zvdb::BlockReference*>(e);
-            if (!ref || ref->blockName() != nome.toStdString()) continue;
-            QStringList valores;
-            for (const char* tag : {"VARIAVEL_NUMERO", "VARIAVEL_NUMBER", "VARIAVEL_A",
-                                    "VARIAVEL_B", "COR_SEGFIM", "REFERENCIA_FIM", "VARIAVEL_C"}) {
-                zvdb::Attribute* a = ref->attribute(tag);
-                valores << (a ? QString::fromStdString(std::string(a->textValue())) : "-");
-            }
-            linhas << valores.join('|');
-        }
-        return linhas;
-    };
-    const auto desenha = [&](const QString& nome) {
+    Bloco("REGUA_BORNE_C", celulas);
+    Bloco("REGUA_BORNE_F", com({todos, porNome}));
+    Bloco("REGUA_BORNE_D", com({porNome}));
+    const QStringList tags{"VARIAVEL_NUMERO", "VARIAVEL_NUMBER", "VARIAVEL_A", "VARIAVEL_B",
+                           "COR_SEGFIM",      "REFERENCIA_FIM",  "VARIAVEL_C"};
+    const auto desenha = [&](const QString& nome, const QStringList& quais) {
         const QString saida = pasta_->path(nome + ".dxf");
         const zvtest::HostRun r = Desenha(
             pasta_->project(), saida,
             Modelo(nome, "(setq *BLOCO_BORNE_GRX* \"DADOS\\\\1\\\\BLOCOS\\\\" + nome + "\")"));
         EXPECT_EQ(r.status, 0) << r.err.toStdString();
-        return celulas(saida, nome);
+        return Celulas(saida, nome, quais);
     };
-    const QStringList simples = desenha("REGUA_BORNE_C");
-    const QStringList comFuncao = desenha("REGUA_BORNE_F");
+    const QStringList simples = desenha("REGUA_BORNE_C", tags);
+    const QStringList comFuncao = desenha("REGUA_BORNE_F", tags);
     ASSERT_GT(simples.size(), 10);
     EXPECT_EQ(simples, comFuncao);
     // The cells hold values: neighbours' fields under both sides, and the wires'.
@@ -422,6 +438,13 @@ TEST_F(ComandoReguasTest, TerminalCellsShowTheNeighboursFieldsThatAFunctionCellW
     EXPECT_GT(cor, 0);
     EXPECT_GT(referencia, 0);
     EXPECT_GT(secao, 0);
+    // A function that reads a field no plain cell names, by its name alone.
+    const QStringList comD = QStringList(tags) << "FUNCAO_D";
+    const QStringList porNomeVisto = desenha("REGUA_BORNE_D", comD);
+    EXPECT_EQ(porNomeVisto, desenha("REGUA_BORNE_F", comD));
+    EXPECT_GT(std::count_if(porNomeVisto.begin(), porNomeVisto.end(),
+                            [](const QString& linha) { return !linha.endsWith('|'); }),
+              0);
     // A terminal block that is missing still ends the command with its message.
     const QString saida = pasta_->path("sem-borne.dxf");
     const zvtest::HostRun r = Desenha(

@@ -439,6 +439,24 @@ TEST_F(DesenhoReguasTest, TheBlockNameTakesThePrefixAndTheLastPieceOfThePath) {
     EXPECT_TRUE(Pontos(todas, "REGUA_BORNE").isEmpty());
 }
 
+// The fields the drawing reads of a terminal: its blocks' cells, and what a function cell
+// looks up by name; nothing to say when a function may read any field (the fixture's detail
+// block counts them).
+TEST_F(DesenhoReguasTest, ATerminalsFieldsAreItsBlocksCellsAndWhatTheirFunctionsLookUp) {
+    EXPECT_EQ(CCBorneDwgWriter::CamposDosBornes(modelo_), std::nullopt);
+    Bloco("REGUA_DET_NOMES", {{"VARIAVEL_REL", "RELACAO_INI"},
+                              {"FUNCAO_T", "(strcat \"T\" (cdr (assoc \"Tensao_fim\" reg)))"}});
+    modelo_.simbolos["*BLOCO_DETALHE_GRX*"] = "DADOS\\1\\BLOCOS\\REGUA_DET_NOMES";
+    modelo_.simbolos["*ZV_CAMPOS_QUEBRA_DETALHE*"] = QStringList{"grupo "};
+    modelo_.simbolos["*ZV_CHAVE_QUEBRA_PAGINA*"] = QStringList{"REGUA"};
+    // The fixture's terminal block has cells without default text: the empty name, which no
+    // field has, comes with them.
+    const auto nomes = CCBorneDwgWriter::CamposDosBornes(modelo_);
+    EXPECT_EQ(nomes, std::optional(QSet<QString>({"", "VARIAVEL_NUMERO", "NUMERO", "ZV_KEY",
+                                                  kAcabamento, "VARIAVEL_REL", "RELACAO_INI",
+                                                  "TENSAO_FIM", "GRUPO", "REGUA"})));
+}
+
 }  // namespace
 
 namespace {
