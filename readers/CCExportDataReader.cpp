@@ -247,6 +247,7 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
                 QString& dono = relacoesComponentes_[relacao];
                 if (dono.isEmpty()) dono = *handle;
             }
+            ComponenteLido(*item);
         }
         itens.push_back(item);
     }

@@ -66,6 +66,11 @@ protected:
     void LeFiosExportacao(const std::optional<QStringList>& paginas, CETemplate* modelo,
                           VetorItens& itens);
 
+    // A component the walk made, with its kind and relation taken: the sides read the
+    // drawing's objects, not this item, so a reader that keeps few of its fields may drop
+    // the others here, before the sides take the room.
+    virtual void ComponenteLido(CEItemLista& item) { Q_UNUSED(item); }
+
     // Component relations to the handle whose fields stand for the component.
     TabelaChaves<QString, QString> relacoesComponentes_;
     // Whether the components' accessories follow them; a reader that keeps only components

@@ -3,6 +3,7 @@
 #include "CCBorneDwgWriter.h"
 
 #include "lists/CETemplate.h"
+#include "lists/CETemplateLisp.h"
 #include "module/CIProgress.h"
 #include "readers/CCBorneDataReader.h"
 
@@ -42,6 +43,54 @@ std::function<bool(const QString&)> CamposDosLados(std::optional<QSet<QString>> 
 }
 
 }  // namespace
+
+// While a read runs, what the drawing and the template's filter read of the components: the
+// layout's fields, the filter's and those of each key's symbol block.
+struct CCBorneDwgDataReader::Cortes {
+    QSet<QString> doFiltro;
+    CETemplate& modelo;
+    CCBorneDwgWriter escritor;  // its blocks, found as the drawing will find them
+    struct DaChave {
+        std::optional<QSet<QString>> nomes;  // none: every field stays
+        std::vector<char> fica;              // by name number: 0 not asked yet, 1 kept, 2 not
+    };
+    QHash<QString, DaChave> porChave;
+
+    bool Fica(DaChave& daChave, std::uint32_t nome) const {
+        if (nome >= daChave.fica.size()) daChave.fica.resize(size_t(nome) + 1, 0);
+        char& resposta = daChave.fica[nome];
+        if (!resposta) {
+            const QString& texto = CamposItem::nome(nome);
+            const QString maiusculo = texto.toUpper();
+            const bool lido = CEModeloReguas::LeCampoDoSimbolo(texto) ||
+                              daChave.nomes->contains(maiusculo) || doFiltro.contains(maiusculo);
+            resposta = lido ? 1 : 2;
+        }
+        return resposta == 1;
+    }
+};
+
+CCBorneDwgDataReader::CCBorneDwgDataReader() {
+    lerAcessorios_ = false;
+    GuardaFios = false;
+    GuardaBornes = false;
+}
+
+CCBorneDwgDataReader::~CCBorneDwgDataReader() = default;
+
+void CCBorneDwgDataReader::ComponenteLido(CEItemLista& item) {
+    if (!cortes_) return;
+    const QString* campo = item.campos.procura(NumeroCampo<"ZV_KEY">());
+    const QString chave = campo ? *campo : QString();
+    auto achado = cortes_->porChave.find(chave);
+    if (achado == cortes_->porChave.end())
+        achado = cortes_->porChave.insert(
+            chave, {cortes_->escritor.CamposDoSimbolo(item, cortes_->modelo), {}});
+    Cortes::DaChave& daChave = achado.value();
+    if (!daChave.nomes) return;
+    item.campos.reter([&](std::uint32_t nome) { return cortes_->Fica(daChave, nome); });
+    item.campos.compactar();
+}
 
 CCBorneDwgDataReader::Chaves CCBorneDwgDataReader::ChavesBornes(const VetorItens& bornes) {
     Chaves chaves;
@@ -88,9 +137,20 @@ VetorItens* CCBorneDwgDataReader::LerDados(zvdb::Database* database,
     CICad::SetIntLisp("EXPORTA", 3);
     // Each terminal copies its neighbours' fields: only those the drawing reads.
     FiltraSufixos(CamposDosLados(CCBorneDwgWriter::CamposDosBornes(modelo)));
+    // The components keep what the drawing and the filter read of them, each as it is read;
+    // a filter that may read any field keeps them whole.
+    std::optional<QSet<QString>> doFiltro =
+        CETemplateLisp::CamposDaExpressao(modelo.LerTexto("*FILTRO_TEMPLATE*").trimmed());
+    if (doFiltro) *doFiltro << QStringLiteral("ZV_LISTA");
+    cortes_.reset(doFiltro ? new Cortes{std::move(*doFiltro), modelo, {}, {}} : nullptr);
+    struct FimDosCortes {
+        std::unique_ptr<Cortes>& cortes;
+        ~FimDosCortes() { cortes.reset(); }
+    } fimDosCortes{cortes_};
     // The cable connections: the export read loads them for the components it reads, and
     // once is enough for a run.
     std::unique_ptr<VetorItens> lidos(Le(database, &modelo, true, paginas));
+    cortes_.reset();
     if (!lidos) return nullptr;
     progresso.Definir(80);
 

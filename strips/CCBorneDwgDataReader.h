@@ -8,6 +8,7 @@
 
 #include <array>
 #include <cstdint>
+#include <memory>
 #include <vector>
 
 class CCBorneDwgDataReader : public CCExportDataReader {
@@ -15,11 +16,8 @@ public:
     // Each wire is copied into the sides of the one or two terminals it reaches, and each
     // terminal read as an item before any side asks for a neighbour: their readings are not
     // kept, the components' are.
-    CCBorneDwgDataReader() {
-        lerAcessorios_ = false;
-        GuardaFios = false;
-        GuardaBornes = false;
-    }
+    CCBorneDwgDataReader();
+    ~CCBorneDwgDataReader() override;
     VetorItens* LerDados(zvdb::Database* database, const std::optional<QStringList>& paginas,
                          CETemplate& modelo, CIProgress& progresso) override;
 
@@ -37,4 +35,12 @@ public:
     // True when the terminal has a wire on a side, or a jumper to a number of its strip
     // among the keys (strip and number in any of the three languages).
     static bool Ligado(const CEItemLista& borne, const Chaves& chaves);
+
+protected:
+    // Keeps of the component the fields the drawing or the template's filter may read.
+    void ComponenteLido(CEItemLista& item) override;
+
+private:
+    struct Cortes;
+    std::unique_ptr<Cortes> cortes_;  // while a read runs; none: the components stay whole
 };

@@ -80,6 +80,21 @@ std::optional<QSet<QString>> CCBorneDwgWriter::CamposDosBornes(CETemplate& model
     return nomes;
 }
 
+std::optional<QSet<QString>> CCBorneDwgWriter::CamposDoSimbolo(const CEItemLista& componente,
+                                                               CETemplate& modelo) {
+    norma_ = modelo.LerTexto("*NORMA_UTILIZADA*");
+    representacao_ = modelo.LerTexto("PBLCHAVEREPBORNEDWG");
+    const Bloco bloco = BlocoSimbolo(componente);
+    // The block's key, and the link back to the schematic.
+    QSet<QString> nomes{QStringLiteral("ZV_KEY"), QStringLiteral("HANDLE")};
+    // A symbol without a block is drawn with no cells.
+    if (!bloco.existe()) return nomes;
+    const auto definicoes = CICad::LeDefinicoesAtributos(bloco.arquivo, bloco.nome);
+    if (!definicoes || !CCListaPaginada::JuntaCampos(definicoes.get(), nomes, true))
+        return std::nullopt;
+    return nomes;
+}
+
 CCBorneDwgWriter::Bloco CCBorneDwgWriter::BlocoSimbolo(const CEItemLista& item) {
     const QString* campo = item.campos.procura(NumeroCampo<"ZV_KEY">());
     const QString chave = campo ? *campo : QString();

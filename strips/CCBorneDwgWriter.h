@@ -48,6 +48,11 @@ public:
     // fields. None when a function cell may read any field (it sees the item as `reg`, as a
     // filter does), or a block file the template names cannot be read.
     static std::optional<QSet<QString>> CamposDosBornes(CETemplate& modelo);
+    // The same for a component: the cells of the block its key gives in the template's
+    // standard and representation, as the drawing will place it, and the key and handle
+    // that every symbol reads. None when the block cannot be read or has a function cell
+    // that may read any field.
+    std::optional<QSet<QString>> CamposDoSimbolo(const CEItemLista& componente, CETemplate& modelo);
 
     // The laid-out model of the last run.
     const CEModeloReguas& Modelo() const { return modelo_; }

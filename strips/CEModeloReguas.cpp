@@ -117,6 +117,14 @@ CEModeloReguas::Parametros CEModeloReguas::Parametros::DoModelo(CETemplate& mode
     return p;
 }
 
+bool CEModeloReguas::LeCampoDoSimbolo(const QString& nome) {
+    for (const char* campo : {"ZV_LISTA_TIPO", "HANDLE", "RELACAO", "TAG", "ETIQUETA"})
+        if (nome == QLatin1String(campo)) return true;
+    return std::any_of(
+        std::begin(kPrefixos), std::begin(kPrefixos) + kLigacoesDoBorne,
+        [&nome](const char* prefixo) { return nome.startsWith(QLatin1String(prefixo)); });
+}
+
 CEBorneDwg* CEModeloReguas::Borne(const QString& regua, const QString& numero) const {
     return bornesPorChave.value(ChaveBorne{regua, numero});
 }

@@ -46,6 +46,10 @@ public:
     void CalculaPontos(double distancia, double refX, double refY);
     void CalculaDetalhes(const QStringList& campos);
 
+    // Whether the layout reads a component's field of that name: its kind, handle and
+    // label, and its connections in the three languages.
+    static bool LeCampoDoSimbolo(const QString& nome);
+
     // Symbols that no terminal of the drawing is wired to, in symbol order.
     std::vector<CESimboloDwg*> SimbolosSemBorne();
     using ChaveBorne = CCBorneDataReader::ChaveBorne;

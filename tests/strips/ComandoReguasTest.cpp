@@ -455,4 +455,82 @@ TEST_F(ComandoReguasTest, TerminalCellsShowTheNeighboursFieldsThatAFunctionCellW
     EXPECT_FALSE(QFile::exists(saida));
 }
 
+// The components' symbols show what they would with every field of the component kept: their
+// plain cells, and a function that reads a field by name; a function that may read any field
+// sees all of them, as it does when the template's filter may.
+TEST_F(ComandoReguasTest, SymbolCellsShowTheComponentsFieldsAsWhenEveryFieldIsKept) {
+    // The product's symbol block comes back however the test ends.
+    struct Guarda {
+        QString arquivo;
+        QByteArray produto;
+        ~Guarda() {
+            QFile f(arquivo);
+            if (f.open(QIODevice::WriteOnly)) f.write(produto);
+        }
+    } guarda{pasta_->path("produto/DADOS/1/BLOCOS/REGUA_COMP.dxf"), {}};
+    QFile original(guarda.arquivo);
+    ASSERT_TRUE(original.open(QIODevice::ReadOnly));
+    guarda.produto = original.readAll();
+    using ListaCelulas = std::vector<std::pair<std::string, std::string>>;
+    const ListaCelulas celulas{{"VARIAVEL_RELACAO", "RELACAO"},
+                               {"VARIAVEL_D", "DESCRICAO"},
+                               {"FABRICANTE", ""},
+                               {"FUNCAO_R", "(cdr (assoc \"REFERENCIA\" reg))"}};
+    ListaCelulas todas = celulas;
+    todas.emplace_back("FUNCAO_N", "(itoa (length reg))");
+    const QStringList tags{"VARIAVEL_RELACAO", "VARIAVEL_D", "FABRICANTE", "FUNCAO_R", "FUNCAO_N"};
+    const auto desenha = [&](const QString& nome, const ListaCelulas& bloco,
+                             const QString& linhas) {
+        Bloco("REGUA_COMP", bloco);
+        const QString saida = pasta_->path(nome + ".dxf");
+        const zvtest::HostRun r = Desenha(pasta_->project(), saida, Modelo(nome, linhas));
+        EXPECT_EQ(r.status, 0) << r.err.toStdString();
+        return Celulas(saida, "REGUA_COMP", tags);
+    };
+    const QStringList cortados = desenha("simbolos-cortados", celulas, QString());
+    const QStringList inteiros = desenha("simbolos-inteiros", todas, QString());
+    // A filter that may read any field keeps every field, whatever the blocks read.
+    const QStringList semCorte =
+        desenha("simbolos-sem-corte", todas, "(setq *FILTRO_TEMPLATE* \"(not (null reg))\")");
+    ASSERT_GT(cortados.size(), 1);
+    ASSERT_EQ(cortados.size(), inteiros.size());
+    for (int i = 0; i < cortados.size(); ++i)
+        EXPECT_EQ(cortados[i].section('|', 0, 3), inteiros[i].section('|', 0, 3)) << i;
+    EXPECT_EQ(inteiros, semCorte);
+    QMap<QString, int> fabricantes;
+    int referencia = 0;
+    for (const QString& linha : cortados) {
+        const QStringList v = linha.split('|');
+        if (!v[2].isEmpty()) ++fabricantes[v[2]];
+        referencia += !v[3].isEmpty();
+        EXPECT_EQ(v[4], "-");
+    }
+    ASSERT_FALSE(fabricantes.isEmpty());
+    EXPECT_GT(referencia, 0);
+
+    // The template's filter reads a field that no cell shows: it sees it as the walk read it,
+    // whether it names the field or not, as when a cell keeps every field. Terminals (with a
+    // strip) pass as the shipped template lets them.
+    const auto relacoes = [](const QStringList& linhas) {
+        QStringList primeiras;
+        for (const QString& linha : linhas)
+            primeiras << linha.section('|', 0, 0);
+        return primeiras;
+    };
+    for (const char* forma : {"\\\"%1\\\"", "(strcase \\\"%1\\\")"}) {
+        const auto campo = [forma](const char* nome) -> QString {
+            return "(cdr (assoc " + QString(forma).arg(nome) + " reg))";
+        };
+        const QString filtro = "(setq *FILTRO_TEMPLATE* \"(if " + campo("REGUA") +
+                               " (/= " + campo("REGUA") + " \\\"XV\\\") (= " + campo("FABRICANTE") +
+                               " \\\"" + fabricantes.firstKey() + "\\\"))\")";
+        const QStringList filtrados = desenha("simbolos-filtrados", {celulas.front()}, filtro);
+        const QStringList vistos =
+            desenha("simbolos-vistos", {celulas.front(), todas.back()}, filtro);
+        EXPECT_GT(vistos.size(), 0);
+        EXPECT_LT(vistos.size(), cortados.size());
+        EXPECT_EQ(relacoes(filtrados), relacoes(vistos)) << filtro.toStdString();
+    }
+}
+
 }  // namespace

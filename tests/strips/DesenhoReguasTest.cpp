@@ -457,6 +457,30 @@ TEST_F(DesenhoReguasTest, ATerminalsFieldsAreItsBlocksCellsAndWhatTheirFunctions
                                                   "TENSAO_FIM", "GRUPO", "REGUA"})));
 }
 
+// The same for a component: the cells of the block its key gives, with the key and handle;
+// a key without a block reads those alone.
+TEST_F(DesenhoReguasTest, ASymbolsFieldsAreItsBlocksCellsAndWhatTheirFunctionsLookUp) {
+    CEItemLista* simbolo = itens_.Simbolo("A01", "-K1", {"A1"});
+    const auto campos = [&](const char* chave) {
+        simbolo->definirCampo("ZV_KEY", chave);
+        CCBorneDwgWriter escritor;
+        return escritor.CamposDoSimbolo(*simbolo, modelo_);
+    };
+    EXPECT_EQ(campos("1001"),
+              std::optional(QSet<QString>({"ZV_KEY", "HANDLE", "VARIAVEL_RELACAO", "RELACAO"})));
+    EXPECT_EQ(campos("SEM_BLOCO"), std::optional(QSet<QString>({"ZV_KEY", "HANDLE"})));
+    // The catalogue gives 2001 the block REGUA_COMP, which the fixture does not have.
+    Bloco("REGUA_COMP",
+          {{"VARIAVEL_D", "DESCRICAO"}, {"FUNCAO_T", "(cdr (assoc \"TENSAO\" reg))"}});
+    EXPECT_EQ(
+        campos("2001"),
+        std::optional(QSet<QString>({"ZV_KEY", "HANDLE", "VARIAVEL_D", "DESCRICAO", "TENSAO"})));
+    Bloco("REGUA_COMP", {{"VARIAVEL_D", "DESCRICAO"}, {"FUNCAO_N", "(itoa (length reg))"}});
+    EXPECT_EQ(campos("2001"), std::nullopt);
+    QFile::remove(pasta_->filePath("DADOS/1/BLOCOS/REGUA_COMP.dxf"));
+    EXPECT_EQ(campos("2001"), std::nullopt);
+}
+
 }  // namespace
 
 namespace {
