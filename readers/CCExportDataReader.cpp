@@ -262,7 +262,9 @@ void CCExportDataReader::LeComponentes(zvdb::Database* database, CETemplate& mod
         AoLigar(*borne, borne->ids.front(), &modelo, true, true, referencia);
         AoLigar(*borne, borne->ids.front(), &modelo, false, true, referencia);
         medida = size_t(borne->campos.size());
-        // The sides were the terminal's last fields: the room their growth left goes.
+        // The sides were the terminal's last fields: the room their growth left goes, with
+        // what the reader does not keep.
+        LadosLidos(*borne);
         PartilhaNomes(*borne);
     }
     bornesLidos_.Libera();

@@ -70,6 +70,9 @@ protected:
     // drawing's objects, not this item, so a reader that keeps few of its fields may drop
     // the others here, before the sides take the room.
     virtual void ComponenteLido(CEItemLista& item) { Q_UNUSED(item); }
+    // The same for a terminal with both its sides read, its last fields; the room of what
+    // it drops goes after.
+    virtual void LadosLidos(CEItemLista& borne) { Q_UNUSED(borne); }
 
     // Component relations to the handle whose fields stand for the component.
     TabelaChaves<QString, QString> relacoesComponentes_;

@@ -42,6 +42,18 @@ std::function<bool(const QString&)> CamposDosLados(std::optional<QSet<QString>> 
     };
 }
 
+// What the drawing reads of a terminal: its sides' fields, its strip, number and jumper in
+// every language, and its kind. None: all of them.
+std::function<bool(const QString&)> CamposDoBorne(std::function<bool(const QString&)> dosLados) {
+    if (!dosLados) return {};
+    return [dosLados = std::move(dosLados)](const QString& nome) {
+        for (const char* proprio :
+             {"ZV_LISTA_TIPO", "REGUA", "STRIP", "REGLETA", "NUMERO", "NUMBER", "JUMPER"})
+            if (nome == QLatin1String(proprio)) return true;
+        return dosLados(nome);
+    };
+}
+
 }  // namespace
 
 // While a read runs, what the drawing and the template's filter read of the components: the
@@ -92,6 +104,16 @@ void CCBorneDwgDataReader::ComponenteLido(CEItemLista& item) {
     item.campos.compactar();
 }
 
+void CCBorneDwgDataReader::LadosLidos(CEItemLista& borne) {
+    if (!doBorne_) return;
+    borne.campos.reter([this](std::uint32_t nome) {
+        if (nome >= ficaNoBorne_.size()) ficaNoBorne_.resize(size_t(nome) + 1, 0);
+        char& resposta = ficaNoBorne_[nome];
+        if (!resposta) resposta = doBorne_(CamposItem::nome(nome)) ? 1 : 2;
+        return resposta == 1;
+    });
+}
+
 CCBorneDwgDataReader::Chaves CCBorneDwgDataReader::ChavesBornes(const VetorItens& bornes) {
     Chaves chaves;
     for (size_t i = 0; i < 3; ++i) {
@@ -135,8 +157,13 @@ VetorItens* CCBorneDwgDataReader::LerDados(zvdb::Database* database,
                                            const std::optional<QStringList>& paginas,
                                            CETemplate& modelo, CIProgress& progresso) {
     CICad::SetIntLisp("EXPORTA", 3);
-    // Each terminal copies its neighbours' fields: only those the drawing reads.
-    FiltraSufixos(CamposDosLados(CCBorneDwgWriter::CamposDosBornes(modelo)));
+    // Each terminal copies its neighbours' fields: only those the drawing reads; and keeps
+    // only those of its own, once its sides are read.
+    const std::function<bool(const QString&)> dosLados =
+        CamposDosLados(CCBorneDwgWriter::CamposDosBornes(modelo));
+    FiltraSufixos(dosLados);
+    doBorne_ = CamposDoBorne(dosLados);
+    ficaNoBorne_.clear();
     // The components keep what the drawing and the filter read of them, each as it is read;
     // a filter that may read any field keeps them whole.
     std::optional<QSet<QString>> doFiltro =
@@ -144,13 +171,15 @@ VetorItens* CCBorneDwgDataReader::LerDados(zvdb::Database* database,
     if (doFiltro) *doFiltro << QStringLiteral("ZV_LISTA");
     cortes_.reset(doFiltro ? new Cortes{std::move(*doFiltro), modelo, {}, {}} : nullptr);
     struct FimDosCortes {
-        std::unique_ptr<Cortes>& cortes;
-        ~FimDosCortes() { cortes.reset(); }
-    } fimDosCortes{cortes_};
+        CCBorneDwgDataReader& leitor;
+        ~FimDosCortes() {
+            leitor.cortes_.reset();
+            leitor.doBorne_ = nullptr;
+        }
+    } fimDosCortes{*this};
     // The cable connections: the export read loads them for the components it reads, and
     // once is enough for a run.
     std::unique_ptr<VetorItens> lidos(Le(database, &modelo, true, paginas));
-    cortes_.reset();
     if (!lidos) return nullptr;
     progresso.Definir(80);
 

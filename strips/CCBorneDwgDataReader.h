@@ -8,6 +8,7 @@
 
 #include <array>
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <vector>
 
@@ -39,8 +40,14 @@ public:
 protected:
     // Keeps of the component the fields the drawing or the template's filter may read.
     void ComponenteLido(CEItemLista& item) override;
+    // Keeps of the terminal the fields the drawing may read.
+    void LadosLidos(CEItemLista& borne) override;
 
 private:
     struct Cortes;
     std::unique_ptr<Cortes> cortes_;  // while a read runs; none: the components stay whole
+    // While a read runs, the fields the terminals keep (none: all), and its answers by name
+    // number: 0 not asked yet, 1 kept, 2 not.
+    std::function<bool(const QString&)> doBorne_;
+    std::vector<char> ficaNoBorne_;
 };

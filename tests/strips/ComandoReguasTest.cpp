@@ -387,9 +387,10 @@ TEST_F(ComandoReguasTest, AMissingBlockFileEndsTheCommandAndNothingIsSaved) {
     EXPECT_EQ(Hash(pasta_->project()), antes);
 }
 
-// The terminal block's cells may name any field of a side's neighbour or wire: a block of
-// plain cells shows the same as one that also holds a function that sees every field, and a
-// function that looks a field up by name shows what it would see with every field kept.
+// The terminal block's cells may name any field of the terminal, of a side's neighbour or of
+// a wire: a block of plain cells shows the same as one that also holds a function that sees
+// every field, and a function that looks a field up by name shows what it would see with
+// every field kept.
 TEST_F(ComandoReguasTest, TerminalCellsShowTheNeighboursFieldsThatAFunctionCellWouldSee) {
     const std::vector<std::pair<std::string, std::string>> celulas{
         {"VARIAVEL_NUMERO", "NUMERO"},
@@ -398,7 +399,9 @@ TEST_F(ComandoReguasTest, TerminalCellsShowTheNeighboursFieldsThatAFunctionCellW
         {"VARIAVEL_B", "FABRICANTE_INI"},
         {"COR_SEGFIM", ""},
         {"REFERENCIA_FIM", "?"},
-        {"VARIAVEL_C", "SECAO_MM2_SEGINI"}};
+        {"VARIAVEL_C", "SECAO_MM2_SEGINI"},
+        {"VARIAVEL_E", "DESCRICAO"},
+        {"FABRICANTE", ""}};
     const std::pair<std::string, std::string> porNome{"FUNCAO_D",
                                                       "(cdr (assoc \"DESCRICAO_INI\" reg))"};
     const std::pair<std::string, std::string> todos{"FUNCAO_N", "(itoa (length reg))"};
@@ -409,8 +412,9 @@ TEST_F(ComandoReguasTest, TerminalCellsShowTheNeighboursFieldsThatAFunctionCellW
     Bloco("REGUA_BORNE_C", celulas);
     Bloco("REGUA_BORNE_F", com({todos, porNome}));
     Bloco("REGUA_BORNE_D", com({porNome}));
-    const QStringList tags{"VARIAVEL_NUMERO", "VARIAVEL_NUMBER", "VARIAVEL_A", "VARIAVEL_B",
-                           "COR_SEGFIM",      "REFERENCIA_FIM",  "VARIAVEL_C"};
+    const QStringList tags{"VARIAVEL_NUMERO", "VARIAVEL_NUMBER", "VARIAVEL_A",
+                           "VARIAVEL_B",      "COR_SEGFIM",      "REFERENCIA_FIM",
+                           "VARIAVEL_C",      "VARIAVEL_E",      "FABRICANTE"};
     const auto desenha = [&](const QString& nome, const QStringList& quais) {
         const QString saida = pasta_->path(nome + ".dxf");
         const zvtest::HostRun r = Desenha(
@@ -423,8 +427,9 @@ TEST_F(ComandoReguasTest, TerminalCellsShowTheNeighboursFieldsThatAFunctionCellW
     const QStringList comFuncao = desenha("REGUA_BORNE_F", tags);
     ASSERT_GT(simples.size(), 10);
     EXPECT_EQ(simples, comFuncao);
-    // The cells hold values: neighbours' fields under both sides, and the wires'.
-    int descricao = 0, fabricante = 0, cor = 0, referencia = 0, secao = 0;
+    // The cells hold values: neighbours' fields under both sides, the wires', and the
+    // terminal's own.
+    int descricao = 0, fabricante = 0, cor = 0, referencia = 0, secao = 0, proprios = 0;
     for (const QString& linha : simples) {
         const QStringList v = linha.split('|');
         descricao += !v[2].isEmpty();
@@ -432,12 +437,14 @@ TEST_F(ComandoReguasTest, TerminalCellsShowTheNeighboursFieldsThatAFunctionCellW
         cor += !v[4].isEmpty();
         referencia += !v[5].isEmpty() && v[5] != "?";
         secao += !v[6].isEmpty();
+        proprios += !v[7].isEmpty() && !v[8].isEmpty();
     }
     EXPECT_GT(descricao, 0);
     EXPECT_GT(fabricante, 0);
     EXPECT_GT(cor, 0);
     EXPECT_GT(referencia, 0);
     EXPECT_GT(secao, 0);
+    EXPECT_GT(proprios, 0);
     // A function that reads a field no plain cell names, by its name alone.
     const QStringList comD = QStringList(tags) << "FUNCAO_D";
     const QStringList porNomeVisto = desenha("REGUA_BORNE_D", comD);
