@@ -100,6 +100,7 @@ void CCDriverLista::Executar(TipoLista tipo) {
     if (tipo == TipoLista::BornesDesenho) {
         CCBorneDwgDataReader leitor;
         CCBorneDwgWriter escritor;
+        leitor.Escritor = &escritor;
         CETemplateLisp modelo(caminho);
         ExecutarLista(leitor, escritor, modelo);
         return;

@@ -61,7 +61,7 @@ std::function<bool(const QString&)> CamposDoBorne(std::function<bool(const QStri
 struct CCBorneDwgDataReader::Cortes {
     QSet<QString> doFiltro;
     CETemplate& modelo;
-    CCBorneDwgWriter escritor;  // its blocks, found as the drawing will find them
+    CCBorneDwgWriter& escritor;
     struct DaChave {
         std::optional<QSet<QString>> nomes;  // none: every field stays
         std::vector<char> fica;              // by name number: 0 not asked yet, 1 kept, 2 not
@@ -165,11 +165,12 @@ VetorItens* CCBorneDwgDataReader::LerDados(zvdb::Database* database,
     doBorne_ = CamposDoBorne(dosLados);
     ficaNoBorne_.clear();
     // The components keep what the drawing and the filter read of them, each as it is read;
-    // a filter that may read any field keeps them whole.
+    // a filter that may read any field keeps them whole, and so does a read for no writer.
     std::optional<QSet<QString>> doFiltro =
         CETemplateLisp::CamposDaExpressao(modelo.LerTexto("*FILTRO_TEMPLATE*").trimmed());
     if (doFiltro) *doFiltro << QStringLiteral("ZV_LISTA");
-    cortes_.reset(doFiltro ? new Cortes{std::move(*doFiltro), modelo, {}, {}} : nullptr);
+    cortes_.reset(doFiltro && Escritor ? new Cortes{std::move(*doFiltro), modelo, *Escritor, {}}
+                                       : nullptr);
     struct FimDosCortes {
         CCBorneDwgDataReader& leitor;
         ~FimDosCortes() {

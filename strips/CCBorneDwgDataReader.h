@@ -12,6 +12,8 @@
 #include <memory>
 #include <vector>
 
+class CCBorneDwgWriter;
+
 class CCBorneDwgDataReader : public CCExportDataReader {
 public:
     // Each wire is copied into the sides of the one or two terminals it reaches, and each
@@ -36,6 +38,10 @@ public:
     // True when the terminal has a wire on a side, or a jumper to a number of its strip
     // among the keys (strip and number in any of the three languages).
     static bool Ligado(const CEItemLista& borne, const Chaves& chaves);
+
+    // The writer the read is for: the components' symbols' blocks are found by the one that
+    // will place them, once. Without it the components keep every field.
+    CCBorneDwgWriter* Escritor = nullptr;
 
 protected:
     // Keeps of the component the fields the drawing or the template's filter may read.

@@ -564,6 +564,61 @@ TEST_F(ExportTerminalSidesTest, WiresAndTerminalsReadApartGiveTheSameSidesAndAre
     avulsos->destruirItens();
 }
 
+// A reader may drop a component's fields as the walk makes it, and a terminal's once its sides
+// are read: the sides read the drawing's objects, not those items, so each item is the one a
+// full read gives, less what was dropped.
+TEST_F(ExportTerminalSidesTest, FieldsDroppedAsItemsAreMadeLeaveTheOthersAsAFullReadGivesThem) {
+    x1_ = borne("X1", "1", {20, 200, 0});
+    x2_ = borne("X1", "2", {60, 200, 0});
+    k1_ = componente("-K1", {{"A1", {20, 100, 0}}});
+    fio({{20, 190, 0}, {20, 100, 0}}, "1");
+    fio({{20, 200, 0}, {20, 220, 0}, {60, 220, 0}, {60, 200, 0}}, "5");
+    ASSERT_TRUE(lisp("(setq EXPORTA 3)"));
+    static const auto fica = [](const QString& nome) {
+        return nome == "ZV_LISTA_TIPO" || nome == "NUMERO" || nome.startsWith("RELACAO");
+    };
+    struct Cortador : CCExportDataReader {
+        int componentes = 0, bornes = 0;
+        static void Corta(CEItemLista& item) {
+            item.campos.reter([](std::uint32_t nome) { return fica(CamposItem::nome(nome)); });
+        }
+        void ComponenteLido(CEItemLista& item) override { Corta(item), ++componentes; }
+        void LadosLidos(CEItemLista& borne) override { Corta(borne), ++bornes; }
+    };
+    CCExportDataReader inteiro;
+    Cortador cortador;
+    std::unique_ptr<VetorItens> inteiros(inteiro.Le(&db(), nullptr, true, std::nullopt));
+    std::unique_ptr<VetorItens> cortados(cortador.Le(&db(), nullptr, true, std::nullopt));
+    ASSERT_TRUE(inteiros && cortados);
+    EXPECT_EQ(cortador.componentes, 1);
+    EXPECT_EQ(cortador.bornes, 2);
+    ASSERT_EQ(inteiros->size(), cortados->size());
+    QStringList vizinhos;
+    for (size_t i = 0; i < inteiros->size(); ++i) {
+        const CEItemLista& a = *(*inteiros)[i];
+        const CEItemLista& b = *(*cortados)[i];
+        // The accessories that follow their owners are no business of the hooks.
+        const QString tipo = a.valorCampo("ZV_LISTA_TIPO");
+        const bool cortado = tipo == "COMP" || tipo == "BORNE";
+        QMap<QString, QString> esperados, vistos;
+        for (auto it = a.campos.constBegin(); it != a.campos.constEnd(); ++it)
+            if (!cortado || fica(it.key())) esperados.insert(it.key(), it.value());
+        for (auto it = b.campos.constBegin(); it != b.campos.constEnd(); ++it)
+            vistos.insert(it.key(), it.value());
+        EXPECT_EQ(vistos, esperados) << i;
+        if (cortado) {
+            EXPECT_LT(b.campos.size(), a.campos.size()) << i;
+        }
+        if (b.valorCampo("ZV_LISTA_TIPO") == "BORNE")
+            vizinhos << b.valorCampo("NUMERO") + "<" + b.valorCampo("RELACAO_INI") + ">" +
+                            b.valorCampo("RELACAO_FIM");
+    }
+    vizinhos.sort();
+    EXPECT_EQ(vizinhos, QStringList({"1<-K1:A1>X1:2", "2<>X1:1"}));
+    inteiros->destruirItens();
+    cortados->destruirItens();
+}
+
 // The terminals' places and layers come from their readings as the walk makes them; a second
 // walk finds the readings kept and asks the references: the sides are the same.
 TEST_F(ExportTerminalSidesTest, ASecondWalkOverKeptReadingsGivesTheSameSides) {
