@@ -303,6 +303,21 @@ public:
     // The box a crossing window tests: the entity's extents without attributes; false for an
     // entity with no extents.
     static bool GetCaixaSelecao(const OdDbObjectId& entidade, CEPonto& minimo, CEPonto& maximo);
+    // What one walk of a block's entities (those GetEntidades gives, in its order) tells of
+    // each: whether it has items of extended data of one of `aplicacoes` (as TemXData), and
+    // for a block reference with extents its GetCaixaSelecao box and its layer's name as the
+    // drawing spells it (valid until the entity changes). A reader that windows the
+    // references and walks the entities of some data touches each entity once.
+    struct EntidadeVista {
+        OdDbObjectId id;
+        bool comXData = false;
+        bool referenciaComCaixa = false;
+        CEPonto minimo, maximo;
+        std::string_view layer;
+    };
+    static void PercorreEntidades(const OdDbObjectId& bloco,
+                                  std::span<const std::string_view> aplicacoes,
+                                  const std::function<void(const EntidadeVista&)>& visita);
     // Frozen layers are not shown, so no window selects their entities.
     static bool LayerCongelado(const QString& nome, zvdb::Database* database = nullptr);
     // Equal within the drawing's tolerance.

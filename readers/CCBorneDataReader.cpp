@@ -318,10 +318,12 @@ VetorItens* CCBorneDataReader::LerDados(zvdb::Database* database,
 
     if (modelo.LerLogico("*SEL_REGUA_BORNE_CFG*")) {
         VetorItens escolhidos = SelecionaReguas(*itens);
-        // What the selection dropped goes now; nothing else points at it.
-        std::unordered_set<CEItemLista*> ficam(escolhidos.begin(), escolhidos.end());
+        // What the selection dropped goes now; nothing else points at it. The kept ones are
+        // told by a sorted array of their addresses, not a node each.
+        std::vector<const CEItemLista*> ficam(escolhidos.begin(), escolhidos.end());
+        std::sort(ficam.begin(), ficam.end());
         for (CEItemLista* item : *itens)
-            if (!ficam.count(item)) delete item;
+            if (!std::binary_search(ficam.begin(), ficam.end(), item)) delete item;
         static_cast<std::vector<CEItemLista*>&>(*itens) = std::move(escolhidos);
     }
     progresso.Definir(92);
@@ -471,9 +473,31 @@ private:
     std::vector<const QString*> jumpers_;
 };
 
+// The items a pass has visited, marked in an array beside their sorted addresses: every
+// terminal with a jumper is marked, and a node per mark would cost an allocation and a free.
+// An item of none of the list's places (none is expected) is kept apart.
+class Visitados {
+public:
+    explicit Visitados(const VetorItens& itens) : enderecos_(itens.begin(), itens.end()) {
+        std::sort(enderecos_.begin(), enderecos_.end());
+        marcas_.resize(enderecos_.size());
+    }
+    // Marks the item; false when it was marked already.
+    bool Marca(CEItemLista* item) {
+        const auto lugar = std::lower_bound(enderecos_.begin(), enderecos_.end(), item);
+        if (lugar == enderecos_.end() || *lugar != item) return fora_.insert(item).second;
+        char& marca = marcas_[std::size_t(lugar - enderecos_.begin())];
+        return !std::exchange(marca, char(1));
+    }
+
+private:
+    std::vector<CEItemLista*> enderecos_;
+    std::vector<char> marcas_;
+    std::unordered_set<CEItemLista*> fora_;
+};
+
 // The terminals bridged to `inicio`, followed through their own jumper texts, depth first.
-VetorItens ColetaJumper(CEItemLista* inicio, const IndiceBornes& indice,
-                        std::unordered_set<CEItemLista*>& visitados) {
+VetorItens ColetaJumper(CEItemLista* inicio, const IndiceBornes& indice, Visitados& visitados) {
     VetorItens cadeia;
     std::vector<CEItemLista*> pilha{inicio};
     while (!pilha.empty()) {
@@ -487,7 +511,7 @@ VetorItens ColetaJumper(CEItemLista* inicio, const IndiceBornes& indice,
             for (int i = 0; i < 3; ++i) {
                 CEItemLista* achado = indice.Busca(*item, i, token);
                 if (!achado) continue;
-                if (visitados.insert(achado).second) achados.push_back(achado);
+                if (visitados.Marca(achado)) achados.push_back(achado);
                 break;
             }
         }
@@ -514,13 +538,13 @@ void CCBorneDataReader::LigaJumpers(VetorItens& itens) {
     const IndiceBornes indice(itens);
     const QStringList ordem =
         VetorItens::camposQueDecidem({"REGUA", "STRIP", "REGLETA", "NUMERO", "NUMBER", "NUMERO"});
-    std::unordered_set<CEItemLista*> visitados;
+    Visitados visitados(itens);
     for (std::size_t k = 0; k < itens.size(); ++k) {
         CEItemLista* item = itens[k];
         if (!item) continue;
         const QString* jumper = indice.Jumper(k);
         if (!jumper || jumper->trimmed().isEmpty()) continue;
-        if (!visitados.insert(item).second) continue;
+        if (!visitados.Marca(item)) continue;
         VetorItens cadeia = ColetaJumper(item, indice, visitados);
         EstendeCadeia(cadeia);
         cadeia.ordenar(ordem);

@@ -64,26 +64,34 @@ struct CCCaboDataReader::Janela {
     bool lida = false;
     std::vector<size_t> visiveis;  // the grades of the layers shown
     QHash<QString, size_t> porLayer;
+    std::unordered_map<std::string_view, size_t> porGrafia;  // while being filled
 
     static std::int64_t Coluna(double v) { return std::int64_t(std::floor(v / kCelula)); }
     static std::int64_t Celula(std::int64_t cx, std::int64_t cy) {
         return std::int64_t(std::uint64_t(cx) << 32 ^ (std::uint64_t(cy) & 0xffffffffu));
     }
 
-    Janela(zvdb::Database* db, const std::vector<OdDbObjectId>& ids) : database(db) {
+    // Filled by Acrescenta, in drawing order, then closed by Fecha.
+    explicit Janela(zvdb::Database* db) : database(db) {}
+
+    // Only block references are taken: the sides read nothing else the window selects.
+    void Acrescenta(const CICad::EntidadeVista& vista) {
+        if (!vista.referenciaComCaixa) return;
+        const Entrada e{vista.id, vista.minimo, vista.maximo};
         // A page's entities share a layer: each spelling of a name is made an upper-case text
         // once.
-        std::unordered_map<std::string_view, size_t> porGrafia;
-        for (const OdDbObjectId& id : ids) {
-            Entrada e{id, {}, {}};
-            if (!CICad::GetCaixaSelecao(id, e.minimo, e.maximo)) continue;
-            const auto [grafia, nova] = porGrafia.try_emplace(CICad::NomeLayerUtf8(id), 0);
-            if (nova) grafia->second = GradeDe(CICad::GetLayerEntidade(id).toUpper());
-            Inclui(grades[grafia->second], std::uint32_t(entradas.size()), e);
-            entradas.push_back(e);
-        }
+        const auto [grafia, nova] = porGrafia.try_emplace(vista.layer, 0);
+        if (nova)
+            grafia->second =
+                GradeDe(QString::fromUtf8(vista.layer.data(), int(vista.layer.size())).toUpper());
+        Inclui(grades[grafia->second], std::uint32_t(entradas.size()), e);
+        entradas.push_back(e);
+    }
+
+    void Fecha() {
         for (Grade& grade : grades)
             grade.Fecha();
+        std::unordered_map<std::string_view, size_t>().swap(porGrafia);
     }
 
     // The grade of a layer by its upper-case name, made when new.
@@ -264,15 +272,25 @@ void CCCaboDataReader::LeLado(const QString& lado, const CEPonto& ponto, CEItemL
 VetorItens* CCCaboDataReader::LeModelSpace(zvdb::Database* database, CETemplate& modelo,
                                            CIProgress* progresso,
                                            const std::function<bool(const QString&)>& aceita) {
-    const std::vector<OdDbObjectId> ids = CICad::GetEntidades(CICad::GetModelSpace(database));
-    janela_ = std::make_unique<Janela>(database, ids);
+    // One walk fills the window and finds the leads and blind connections, with their
+    // places among the entities for the progress count.
+    janela_ = std::make_unique<Janela>(database);
+    std::vector<std::pair<int, OdDbObjectId>> condutores;
+    int n = 0;
+    static constexpr std::string_view kAplicacoes[] = {"KVR_ZV_CABO", "KVR_ZV_CONEX_BLIND"};
+    CICad::PercorreEntidades(CICad::GetModelSpace(database), kAplicacoes,
+                             [&](const CICad::EntidadeVista& vista) {
+                                 ++n;
+                                 if (vista.comXData) condutores.emplace_back(n, vista.id);
+                                 janela_->Acrescenta(vista);
+                             });
+    janela_->Fecha();
     auto* itens = new VetorItens;
-    const int n = int(ids.size());
+    auto proximo = condutores.cbegin();
     for (int k = 1; k <= n; ++k) {
         if (progresso) progresso->Definir(30 + 70 * k / n, CIProgress::Contagem(k, n));
-        const OdDbObjectId& id = ids[size_t(k - 1)];
-        if (!CICad::TemXData(id, "KVR_ZV_CABO") && !CICad::TemXData(id, "KVR_ZV_CONEX_BLIND"))
-            continue;
+        if (proximo == condutores.cend() || proximo->first != k) continue;
+        const OdDbObjectId id = (proximo++)->second;
         if (!aceita(CICad::GetLayerEntidade(id))) continue;
         if (CEItemLista* item = LeCondutor(id, modelo)) {
             item->definirCampo("ZV_LISTA_TIPO", "CABO");

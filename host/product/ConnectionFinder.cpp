@@ -345,29 +345,31 @@ void ConnectionFinder::addSpot(std::uint32_t symbol, std::int32_t layer, const z
 // The symbols (KVR_ZV or KVR_ZV_EQUIPO references) and the polylines of the wires, the
 // cable leads and the blind connections, in model-space order.
 void ConnectionFinder::readModelSpace() {
-    const auto entities = database_.modelSpace()->entities();
-    symbols_.reserve(entities.size() / 2);
-    spots_.reserve(entities.size());
+    // Walked in place: a list of the entities first would touch each one an extra time, and
+    // a large drawing's objects are out of the cache again by the time the walk comes to them.
+    // The room is for every entity made, erased ones too: room not used is never touched.
+    const std::size_t entities = database_.modelSpace()->entitiesMade();
+    symbols_.reserve(entities / 2);
+    spots_.reserve(entities);
     // about one vertex an entity: the lines have two or three, and most entities are symbols
-    vertices_.reserve(entities.size());
-    for (zvdb::Entity* entity : entities) {
-        const Roles roles(*entity);
+    vertices_.reserve(entities);
+    database_.modelSpace()->forEachEntity([this](zvdb::Entity& entity) {
+        const Roles roles(entity);
         // no kind of reference or polyline derives from their classes: the type tells them
-        const std::type_info& type = typeid(*entity);
+        const std::type_info& type = typeid(entity);
         if ((roles.has[Roles::Symbol] || roles.has[Roles::Equipment]) &&
             type == typeid(zvdb::BlockReference)) {
-            indexSymbol(static_cast<const zvdb::BlockReference&>(*entity), roles.xdata,
+            indexSymbol(static_cast<const zvdb::BlockReference&>(entity), roles.xdata,
                         roles.begin[Roles::CutPoints],
                         roles.has[Roles::CutPoints] ? roles.end[Roles::CutPoints] : 0);
-            continue;
+            return;
         }
-        if (!roles.has[Roles::Wire] && !roles.has[Roles::Cable] && !roles.has[Roles::Blind])
-            continue;
-        if (type != typeid(zvdb::Polyline)) continue;
-        auto& polyline = static_cast<zvdb::Polyline&>(*entity);
+        if (!roles.has[Roles::Wire] && !roles.has[Roles::Cable] && !roles.has[Roles::Blind]) return;
+        if (type != typeid(zvdb::Polyline)) return;
+        auto& polyline = static_cast<zvdb::Polyline&>(entity);
         addLine(polyline, roles.xdata, roles.has[Roles::Wire], roles.has[Roles::Cable],
                 roles.has[Roles::Blind], wireNumberOf(roles.items(polyline, Roles::Wire)));
-    }
+    });
 }
 
 // A polyline of the roles given, with its vertices.
@@ -613,11 +615,12 @@ std::vector<zvdb::Polyline*> ConnectionFinder::polylinesInPageOrder(zvdb::Databa
     // entities come page by page: the rank of the last layer serves the next polyline
     std::string_view lastLayer;
     int lastRank = -1;
-    for (zvdb::Entity* entity : database.modelSpace()->entities()) {
+    // walked in place: a list of the entities first would touch each one an extra time
+    database.modelSpace()->forEachEntity([&](zvdb::Entity& entity) {
         // no kind of polyline derives from Polyline: its type tells it at once
-        if (typeid(*entity) != typeid(zvdb::Polyline)) continue;
-        auto* polyline = static_cast<zvdb::Polyline*>(entity);
-        if (!polyline->hasXData(application)) continue;
+        if (typeid(entity) != typeid(zvdb::Polyline)) return;
+        auto* polyline = static_cast<zvdb::Polyline*>(&entity);
+        if (!polyline->hasXData(application)) return;
         const std::string_view layer = polyline->layer();
         if (lastRank < 0 || layer != lastLayer) {
             auto page = order.find(layer);
@@ -625,7 +628,7 @@ std::vector<zvdb::Polyline*> ConnectionFinder::polylinesInPageOrder(zvdb::Databa
             lastRank = page == order.end() ? INT_MAX : page->second;
         }
         found.push_back({{lastRank, polyline->handle()}, polyline});
-    }
+    });
     decltype(found) sorted;
     byRankThenHandle(
         found, pages.size(), sorted, [](const auto& item) { return item.first.first; },
@@ -651,22 +654,23 @@ void ConnectionFinder::readWires(
     std::string_view lastLayer;
     int lastRank = -1;
     std::vector<std::uint64_t>* onLayer = nullptr;
-    for (zvdb::Entity* entity : database.modelSpace()->entities()) {
-        if (typeid(*entity) != typeid(zvdb::Polyline)) continue;
+    // walked in place: a list of the entities first would touch each one an extra time
+    database.modelSpace()->forEachEntity([&](zvdb::Entity& entity) {
+        if (typeid(entity) != typeid(zvdb::Polyline)) return;
         std::span<const zvdb::Tag> items[2];
-        entity->xdataItemsOf(kApplications, items);
+        entity.xdataItemsOf(kApplications, items);
         const bool wire = items[0].data() != nullptr;
-        if (!wire && !items[1].data()) continue;
-        const std::string_view layer = entity->layer();
+        if (!wire && !items[1].data()) return;
+        const std::string_view layer = entity.layer();
         if (lastRank < 0 || layer != lastLayer) {
             auto page = order.find(layer);
             lastLayer = layer;
             lastRank = page == order.end() ? INT_MAX : page->second;
             onLayer = &byLayer[std::string(layer)];
         }
-        onLayer->push_back(entity->handle());
-        if (wire) found.push_back({lastRank, {entity->handle(), wireNumberOf(items[0]), layer}});
-    }
+        onLayer->push_back(entity.handle());
+        if (wire) found.push_back({lastRank, {entity.handle(), wireNumberOf(items[0]), layer}});
+    });
     for (auto& [layer, handles] : byLayer)
         std::sort(handles.begin(), handles.end());
     {

@@ -14,6 +14,11 @@ struct DrawingStamp {
     static DrawingStamp of(const zvdb::Database& database) {
         return {&database, database.changeCount()};
     }
+    // The same, blind to the edits of layer records (their states, colours, names): for what
+    // is worked out from other objects alone, kept over the freezes and thaws of page swaps.
+    static DrawingStamp ofShapes(const zvdb::Database& database) {
+        return {&database, database.shapeCount()};
+    }
     bool operator==(const DrawingStamp&) const = default;
 };
 

@@ -104,15 +104,23 @@ void eraseGroup(zvdb::Database& database, const std::string& group) {
 void refreshPageCounts(zvdb::Database& database) {
     PageRegistry registry(database);
     std::unordered_map<std::string, std::size_t> counts;
-    for (const PageGroup& group : registry.groups())
-        counts[group.name + "$DE"] = group.pages.size();
+    // By length, whether a counted name has it: the length of a layer's name stands in its
+    // tag, and a name of another length is passed without its text read from the file.
+    std::vector<char> countedLength;
+    for (const PageGroup& group : registry.groups()) {
+        const std::string name = group.name + "$DE";
+        if (name.size() >= countedLength.size()) countedLength.resize(name.size() + 1);
+        countedLength[name.size()] = 1;
+        counts[name] = group.pages.size();
+    }
     // Walked in place: a list of a large drawing's entities would be made and freed for the
     // few title blocks.
-    database.modelSpace()->forEachEntity([&counts](zvdb::Entity& entity) {
+    database.modelSpace()->forEachEntity([&counts, &countedLength](zvdb::Entity& entity) {
         // The kind first: it is read off the object, the layer off its tags. Nearly every
         // entity lies on a page: only a "$DE" layer's name is worth a copy.
         if (typeid(entity) != typeid(zvdb::BlockReference)) return;
         const std::string_view layer = entity.layer();
+        if (layer.size() >= countedLength.size() || !countedLength[layer.size()]) return;
         if (!layer.ends_with("$DE")) return;
         auto count = counts.find(std::string(layer));
         if (count == counts.end()) return;

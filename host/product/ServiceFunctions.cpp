@@ -72,15 +72,19 @@ Value gridPosition(Interpreter& lisp, const ProductContext& context, SheetGridIn
 
 // The first panel named on the project settings point (KVR_ZV_PAINEL); empty.
 QString findFirstPanel(zvdb::Database& database) {
-    for (zvdb::Entity* entity : database.modelSpace()->entities()) {
+    QString panel;
+    bool found = false;
+    // Walked in place: a list of the entities first would touch each one an extra time.
+    database.modelSpace()->forEachEntity([&](zvdb::Entity& entity) {
         // The type stands first among the tags; the layer is looked for among them.
-        if (!entity->isType("POINT") || entity->layer() != "ZV_FREEZE") continue;
-        const auto items = entity->xdata("KVR_ZV_PAINEL");
-        if (!items.empty())
-            return QString::fromUtf8(items.front().value.data(),
-                                     static_cast<int>(items.front().value.size()));
-    }
-    return {};
+        if (found || !entity.isType("POINT") || entity.layer() != "ZV_FREEZE") return;
+        const auto items = entity.xdata("KVR_ZV_PAINEL");
+        if (items.empty()) return;
+        panel = QString::fromUtf8(items.front().value.data(),
+                                  static_cast<int>(items.front().value.size()));
+        found = true;
+    });
+    return panel;
 }
 
 // The readers ask for every local circuit: the panel is looked for once per drawing change.
@@ -91,9 +95,10 @@ struct PanelCache {
 
 QString firstPanel(zvdb::Database* database, PanelCache& cache) {
     if (!database) return {};
-    if (!(cache.stamp == DrawingStamp::of(*database))) {
+    // The point is an entity: the freezes and thaws of page swaps leave it as it was.
+    if (!(cache.stamp == DrawingStamp::ofShapes(*database))) {
         cache.panel = findFirstPanel(*database);
-        cache.stamp = DrawingStamp::of(*database);
+        cache.stamp = DrawingStamp::ofShapes(*database);
     }
     return cache.panel;
 }

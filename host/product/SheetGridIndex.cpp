@@ -61,13 +61,14 @@ void SheetGridIndex::readRegistry(zvdb::Database& database) {
     const PageRegistry registry(database);
     for (const PageGroup& group : registry.groups())
         keyOf_.emplace(upper(group.name), group.key);
-    stamp_ = DrawingStamp::of(database);
+    stamp_ = DrawingStamp::ofShapes(database);
 }
 
 const SheetGrid& SheetGridIndex::gridOf(zvdb::Database* database, const QString& group) {
     if (!catalogueRead_) readCatalogue();
     if (!database || byKey_.empty()) return fixed_;
-    if (!(stamp_ == DrawingStamp::of(*database))) readRegistry(*database);
+    // The registry is Xrecords: a page swap's layer edits leave it as it was.
+    if (!(stamp_ == DrawingStamp::ofShapes(*database))) readRegistry(*database);
     // Held here, the text stays what it was: the same text is the same group.
     if (lastGrid_ && group.isSharedWith(lastGroup_)) return *lastGrid_;
     const SheetGrid* grid = asked_.value(group);

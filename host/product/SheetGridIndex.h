@@ -7,7 +7,7 @@
 // model the catalogue lacks, a model without a grid or no catalogue at all: the fixed grid.
 //
 // The catalogue is read once per document, at the first question; the registry again only
-// when the drawing has changed.
+// when an object other than a layer record has changed.
 #include "DrawingStamp.h"
 #include "SheetGrid.h"
 

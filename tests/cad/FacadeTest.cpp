@@ -866,6 +866,73 @@ TEST_F(FacadeFixture, XrecordsCarryExtendedDataBehindTheirData) {
     EXPECT_EQ(entradas[0].first, "BORNE_XV_1");
 }
 
+// The cable reader's one walk: each entity as GetEntidades gives it, its extended data as
+// TemXData tells it, and for a reference its GetCaixaSelecao box and its layer.
+TEST_F(FacadeFixture, OneWalkOfABlocksEntitiesTellsWhatTheirOwnQuestionsTell) {
+    zvdb::BlockRecord* ms = db().modelSpace();
+    zvdb::BlockRecord* caixa = db().createBlock("CAIXA1");
+    caixa->addLine({-1, -2, 0}, {3, 4, 0});
+    zvdb::BlockRecord* vazio = db().createBlock("VAZIO");
+    db().createLayer("P$0001$A");
+    std::vector<zvdb::Entity*> feitas = {
+        ms->addBlockReference(*caixa, {10, 20, 0}, {2, 2, 1}, 0, "P$0001$A"),
+        ms->addLwPolyline({{0, 0, 0}, {5, 5, 0}}, false, "P$0001$A"),
+        ms->addBlockReference(*vazio, {1, 1, 0}),  // no extents
+        ms->addText({0, 0, 0}, 2.5, "T"),
+        ms->addBlockReference(*caixa, {-5, 0, 0}, {1, 1, 1}, 0, "p$0001$a"),
+        ms->addLine({0, 0, 0}, {1, 1, 0}),
+        ms->addBlockReference(*caixa, {7, 7, 0}),
+    };
+    const auto id = [this](const zvdb::DbObject* o) { return OdDbObjectId(&db(), o->handle()); };
+    CICad::SetXData(id(feitas[0]), "KVR_ZV_CABO", {{1000, "20101"}});
+    CICad::SetXData(id(feitas[1]), "kvr_zv_conex_blind", {{1000, "W1"}});
+    CICad::SetXData(id(feitas[3]), "KVR_ZV_CABO", {});  // a group without items
+    CICad::SetXData(id(feitas[4]), "KVR_ZV_CABOS", {{1000, "x"}});
+    CICad::SetXData(id(feitas[5]), "KVR_ZV_CABO", {{1000, "a"}});
+    CICad::SetXData(id(feitas[5]), "KVR_ZV_CONEX_BLIND", {{1000, "b"}});
+    feitas[6]->erase();
+    const std::string_view nomes[] = {"KVR_ZV_CABO", "KVR_ZV_CONEX_BLIND"};
+    const OdDbObjectId modelSpace = CICad::GetModelSpace(&db());
+    std::vector<CICad::EntidadeVista> vistas;
+    CICad::PercorreEntidades(modelSpace, nomes,
+                             [&](const CICad::EntidadeVista& v) { vistas.push_back(v); });
+    const std::vector<OdDbObjectId> ids = CICad::GetEntidades(modelSpace);
+    ASSERT_EQ(vistas.size(), ids.size());
+    ASSERT_EQ(ids.size(), 6u);
+    std::vector<bool> comXData, comCaixa;
+    for (size_t k = 0; k < ids.size(); ++k) {
+        const CICad::EntidadeVista& v = vistas[k];
+        EXPECT_EQ(v.id, ids[k]) << k;
+        EXPECT_EQ(v.comXData, CICad::TemXData(ids[k], "KVR_ZV_CABO") ||
+                                  CICad::TemXData(ids[k], "KVR_ZV_CONEX_BLIND"))
+            << k;
+        CEPonto minimo, maximo;
+        const bool caixaLida = CICad::GetCaixaSelecao(ids[k], minimo, maximo);
+        EXPECT_EQ(v.referenciaComCaixa, CICad::EhReferencia(ids[k]) && caixaLida) << k;
+        if (!v.referenciaComCaixa) continue;
+        EXPECT_EQ(QList<double>({v.minimo.x, v.minimo.y, v.maximo.x, v.maximo.y}),
+                  QList<double>({minimo.x, minimo.y, maximo.x, maximo.y}));
+        EXPECT_EQ(v.layer, CICad::NomeLayerUtf8(ids[k]));
+    }
+    for (const CICad::EntidadeVista& v : vistas) {
+        comXData.push_back(v.comXData);
+        comCaixa.push_back(v.referenciaComCaixa);
+    }
+    EXPECT_EQ(comCaixa, (std::vector<bool>{true, false, false, false, true, false}));
+    EXPECT_EQ(comXData, (std::vector<bool>{true, true, false, false, false, true}));
+    EXPECT_EQ(QList<double>(
+                  {vistas[0].minimo.x, vistas[0].minimo.y, vistas[0].maximo.x, vistas[0].maximo.y}),
+              QList<double>({8, 16, 16, 28}));
+    EXPECT_EQ(vistas[4].layer, "p$0001$a");
+    // No applications: nothing has extended data of them.
+    int vistas2 = 0;
+    CICad::PercorreEntidades(modelSpace, {}, [&](const CICad::EntidadeVista& v) {
+        ++vistas2;
+        EXPECT_FALSE(v.comXData);
+    });
+    EXPECT_EQ(vistas2, 6);
+}
+
 }  // namespace
 
 TEST_F(FacadeFixture, ReferencesAreListedByTheUpperCaseNameOfTheirBlockInDrawingOrder) {

@@ -1,6 +1,7 @@
 // Pages and groups: lists, creation and deletion, kept through a DXF round trip.
 #include "ProductFixture.h"
 #include "QtPrinters.h"
+#include "product/PageRegistry.h"
 
 #include "drawing/DxfLoader.h"
 #include "drawing/DxfWriter.h"
@@ -142,6 +143,32 @@ TEST_F(PagesTest, ThawingAPageAndTheGroupCounts) {
     database->setCurrentLayer("ESQ$0002$A");
     run("(AtualizaModemacro)");
     EXPECT_EQ(show("*ZV_MODEMACRO*"), "\"ZV ESQ$0002$A (4)\"");
+}
+
+// A count goes to the title blocks on the "$DE" layer of its group, spelt as the registry
+// spells it; a layer of the same length or the same ending that is not one keeps its own.
+TEST_F(PagesTest, TotalsGoOnlyToTheTitleBlocksOfTheGroupsOwnLayers) {
+    run("(criarpagina \"ESQ\" 0)");
+    run("(criarpagina \"ESQ\" 0)");
+    run("(criarpagina \"COMANDO\" 0)");
+    zvdb::BlockRecord* count = database->createBlock("PAGINA_DE");
+    std::vector<zvdb::BlockReference*> blocks;
+    for (const char* layer :
+         {"ESQ$DE", "COMANDO$DE", "XYZ$DE", "esq$de", "ESQ$0001$A", "OUTRO$COMANDO$DE", "ESQ$DE"}) {
+        auto* title =
+            database->modelSpace()->addBlockReference(*count, {380, 14, 0}, {1, 1, 1}, 0, layer);
+        title->addAttribute("TOTAL", "7", {380, 14, 0}, 2.5);
+        blocks.push_back(title);
+    }
+    run("(atualizarpaginas)");
+    QStringList totals;
+    for (const zvdb::BlockReference* title : blocks) {
+        const std::string_view total = title->attribute("TOTAL")->text(1);
+        totals << QString::fromUtf8(total.data(), int(total.size()));
+    }
+    const QString esq = QString::number(PageRegistry(*database).group("ESQ")->pages.size());
+    EXPECT_EQ(esq, "4") << "the fixture's two pages and two more";
+    EXPECT_EQ(totals, QStringList({esq, "1", "7", "7", "7", "7", esq}));
 }
 
 TEST_F(PagesTest, PageExportedToItsOwnDxf) {

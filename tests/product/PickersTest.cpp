@@ -1,5 +1,6 @@
 // Pickers and prompts answered and cancelled; templates; a native function overridden.
 #include "ProductFixture.h"
+#include "drawing/LayerRecord.h"
 
 #include <QDir>
 #include <QFile>
@@ -96,6 +97,30 @@ TEST_F(PickersTest, SheetGridCircuitsSolutionAndLanguage) {
     EXPECT_EQ(show("(zv_interno_get_idioma_corrente)"), "\"ES\"");
     EXPECT_EQ(show("(list (zvAlternaStatusBloqueioPalette) (zvAlternaStatusBloqueioPalette))"),
               "(T nil)");
+}
+
+// The project's first panel is kept over the layer edits of page swaps; a change of an
+// entity is seen, and the first settings point in drawing order gives it.
+TEST_F(PickersTest, TheFirstPanelFollowsTheEntitiesAndNotTheLayersStates) {
+    database->createLayer("ZV_FREEZE");
+    auto* erased = database->modelSpace()->addPoint({0, 0, 0}, "ZV_FREEZE");
+    erased->setXData("KVR_ZV_PAINEL", zvsample::XDataItems().text("APAGADO").tags());
+    erased->erase();
+    database->modelSpace()
+        ->addPoint({1, 0, 0}, "OUTRO")
+        ->setXData("KVR_ZV_PAINEL", zvsample::XDataItems().text("FORA").tags());
+    auto* settings = database->modelSpace()->addPoint({0, 0, 0}, "ZV_FREEZE");
+    settings->setXData("KVR_ZV_PAINEL", zvsample::XDataItems().text("PAINEL_1").tags());
+    database->modelSpace()
+        ->addPoint({2, 0, 0}, "ZV_FREEZE")
+        ->setXData("KVR_ZV_PAINEL", zvsample::XDataItems().text("SEGUNDO").tags());
+    EXPECT_EQ(show("(zvGetCircuitoLocalInfo 3)"), "(\"3\" \"PAINEL_1\" \"\")");
+    database->layer("ZV_FREEZE")->setFrozen(true);
+    EXPECT_EQ(show("(zvGetCircuitoLocalInfo 4)"), "(\"4\" \"PAINEL_1\" \"\")");
+    settings->setXData("KVR_ZV_PAINEL", zvsample::XDataItems().text("PAINEL_9").tags());
+    EXPECT_EQ(show("(zvGetCircuitoLocalInfo 5)"), "(\"5\" \"PAINEL_9\" \"\")");
+    settings->erase();
+    EXPECT_EQ(show("(zvGetCircuitoLocalInfo 6)"), "(\"6\" \"SEGUNDO\" \"\")");
 }
 
 TEST_F(PickersTest, ASolutionFileListsItsProjectsOrChangesNothing) {

@@ -2,6 +2,7 @@
 // demo catalogue, on a catalogue made here, and with no catalogue.
 #include "ProductFixture.h"
 #include "ZvhostRun.h"
+#include "drawing/LayerRecord.h"
 
 #include "product/ProductSettings.h"
 #include "product/SheetGrid.h"
@@ -231,6 +232,35 @@ TEST_F(SheetGridCatalogueTest, OneTextAskedAgainFollowsTheRegistryAndOtherGroups
     EXPECT_EQ(index.position(database.get(), g7, 25, 100), "R2");
     addGroup("G7", 99, {"G7$0001$A"});
     EXPECT_EQ(index.position(database.get(), g7, 35, 297 - 37.125), "B2") << "the fixed grid";
+}
+
+// A list that swaps pages freezes and thaws layers between its questions: the grid of a
+// group stays, and a change of the registry after such edits is still seen.
+TEST_F(SheetGridCatalogueTest, LayerEditsKeepTheGroupsGridAndLaterRegistryChangesAreSeen) {
+    makeCatalogue("own.db",
+                  {"create table BDPAGE (ERASED SMALLINT, PAGE_KEY INTEGER, COL_LABEL "
+                   "varchar(200), COL_INT varchar(200), ROW_LABEL varchar(200), ROW_INT "
+                   "varchar(200))",
+                   "create table BDGROUP (ERASED SMALLINT, GROUP_KEY INTEGER, LANG INTEGER, "
+                   "PAGE INTEGER)",
+                   "insert into BDPAGE values (0, 1, 'A;B', '210', 'X;Y', '100'), "
+                   "(0, 2, '1;2;3', '10;20', 'R', '297')",
+                   "insert into BDGROUP values (0, 7, 1, 1), (0, 8, 1, 2)"});
+    writeSettings("own.db", "1");
+    addGroup("G7", 7, {"G7$0001$A", "G7$0002$A"});
+    SheetGridIndex index;
+    const QString g7 = QString::fromUtf8("G7");
+    EXPECT_EQ(index.position(database.get(), g7, 5, 250), "XA");
+    database->layer("G7$0001$A")->setFrozen(true);
+    database->layer("G7$0002$A")->setFrozen(false);
+    EXPECT_EQ(index.position(database.get(), g7, 300, 150), "YB");
+    EXPECT_EQ(index.position(database.get(), QStringLiteral("G7"), 5, 250), "XA");
+    // The registry gives the group another key after the layer edits, then a layer is made.
+    addGroup("G7", 8, {"G7$0001$A", "G7$0002$A"});
+    EXPECT_EQ(index.position(database.get(), g7, 25, 100), "R2");
+    database->layer("G7$0002$A")->setFrozen(true);
+    addGroup("G7", 7, {"G7$0001$A", "G7$0002$A", "G7$0003$A"});
+    EXPECT_EQ(index.position(database.get(), g7, 300, 150), "YB");
 }
 
 }  // namespace
