@@ -573,12 +573,11 @@ private:
     // asks, and the catalogue's texts are split once.
     QHash<QString, std::vector<std::pair<QString, int>>> acessoriosCatalogo_;
     const std::vector<std::pair<QString, int>>& AcessoriosDoCatalogo(const QString& chave);
-    // The fields of a unit with nothing of its owner's, for its quantity, and the room
-    // FolgaDosCampos gives them.
+    // The fields of a unit with nothing of its owner's, for its quantity: shared by the
+    // unit's items, which copy them only if changed.
     struct UnidadeAcessorio {
         QString qtd;
         CamposItem campos;
-        std::size_t folga = 0;
     };
     // Per accessory key and standard: the fields of a unit, and its user columns.
     struct BaseAcessorio {
@@ -588,7 +587,7 @@ private:
     // The unit of the base with nothing of its owner's: the base's fields, the quantity and
     // the user columns, joined once per quantity.
     const UnidadeAcessorio& UnidadeDaBase(BaseAcessorio& base, const QString& qtd);
-    // A new item of the unit's fields, with their room.
+    // A new item sharing the unit's fields.
     static CEItemLista* NovoItemDaUnidade(const UnidadeAcessorio& unidade);
     std::unordered_map<std::pair<QString, QString>, BaseAcessorio, HashPar> basesAcessorio_;
     CECacheCatalogo catalogo_;

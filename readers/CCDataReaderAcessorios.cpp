@@ -62,13 +62,14 @@ const CCDataReader::UnidadeAcessorio& CCDataReader::UnidadeDaBase(BaseAcessorio&
     unidade.campos = base.item.campos;
     unidade.definirCampo(NumeroCampo<"QTD">(), qtd);
     unidade.copiarCampos(base.colunas);
-    const std::size_t folga = FolgaDosCampos(unidade.campos);
-    return base.unidades.emplace_back(UnidadeAcessorio{qtd, std::move(unidade.campos), folga});
+    // The room a kept item leaves, as an item of these fields had before they were shared.
+    unidade.campos.compactar(FolgaDosCampos(unidade.campos));
+    unidade.campos.partilhar();
+    return base.unidades.emplace_back(UnidadeAcessorio{qtd, std::move(unidade.campos)});
 }
 
 CEItemLista* CCDataReader::NovoItemDaUnidade(const UnidadeAcessorio& unidade) {
     auto* item = new CEItemLista;
-    item->campos.reservar(std::size_t(unidade.campos.size()) + unidade.folga);
     item->campos = unidade.campos;
     return item;
 }
