@@ -556,10 +556,33 @@ private:
         QString chave, norma;
         QStringList vinculos;
     };
-    TabelaIds<AcessoriosLidos> acessoriosLidos_;
+    // A reading without pairs, as told apart: texts equal but one null are two.
+    struct SemVinculos {
+        QString chave, norma;
+        bool temChave;
+        bool operator==(const SemVinculos& outra) const {
+            return temChave == outra.temChave && chave == outra.chave && norma == outra.norma &&
+                   chave.isNull() == outra.chave.isNull() && norma.isNull() == outra.norma.isNull();
+        }
+    };
+    struct HashSemVinculos {
+        size_t operator()(const SemVinculos& l) const {
+            return qHash(l.chave, qHash(l.norma)) ^ size_t(l.temChave);
+        }
+    };
+    // Each distinct reading once, and per symbol the number of its own: most symbols read
+    // alike (a key and standard, no pairs of their own), and a large drawing has hundreds of
+    // thousands of them.
+    struct LeiturasAcessorios {
+        TabelaIds<std::uint32_t> porSimbolo;
+        std::vector<AcessoriosLidos> distintas;
+        std::unordered_map<SemVinculos, std::uint32_t, HashSemVinculos> semVinculos;
+    };
+    LeiturasAcessorios acessoriosLidos_;
     const void* desenhoAcessorios_ = nullptr;
     std::uint64_t versaoAcessorios_ = 0;
     void GuardaAcessoriosDe(const OdDbObjectId& referencia, const ChaveLida& chave);
+    // The symbol's kept reading, or null; valid until the next one is kept.
     const AcessoriosLidos* AcessoriosGuardados(const OdDbObjectId& id) const;
     // ZV_VINC_ADITIVO is registered once per drawing and version.
     void RegistraAppVinculos(zvdb::Database* database);

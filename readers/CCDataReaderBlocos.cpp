@@ -255,23 +255,36 @@ bool CCDataReader::LeChaveDoSimbolo(const OdDbObjectId& referencia) {
 void CCDataReader::GuardaAcessoriosDe(const OdDbObjectId& referencia, const ChaveLida& chave) {
     const std::uint64_t versao = CICad::VersaoDesenho(referencia.database());
     const void* desenho = DesenhoDe(referencia.database());
+    LeiturasAcessorios& lidas = acessoriosLidos_;
     if (desenhoAcessorios_ != desenho || versaoAcessorios_ != versao) {
-        acessoriosLidos_.limpa();
+        lidas.porSimbolo.limpa();
+        lidas.distintas.clear();
+        lidas.semVinculos.clear();
         desenhoAcessorios_ = desenho;
         versaoAcessorios_ = versao;
     }
-    AcessoriosLidos lidos{simbolo_.temChave, chave.chave, chave.norma, {}};
-    for (const std::string_view texto : simbolo_.vinculos)
-        lidos.vinculos << Texto(texto);
-    acessoriosLidos_.insere(referencia, std::move(lidos));
+    auto numero = std::uint32_t(lidas.distintas.size());
+    if (simbolo_.vinculos.empty()) {
+        const auto [igual, nova] = lidas.semVinculos.try_emplace(
+            SemVinculos{chave.chave, chave.norma, simbolo_.temChave}, numero);
+        if (nova) lidas.distintas.push_back({simbolo_.temChave, chave.chave, chave.norma, {}});
+        numero = igual->second;
+    } else {
+        AcessoriosLidos& nova = lidas.distintas.emplace_back(
+            AcessoriosLidos{simbolo_.temChave, chave.chave, chave.norma, {}});
+        for (const std::string_view texto : simbolo_.vinculos)
+            nova.vinculos << Texto(texto);
+    }
+    lidas.porSimbolo.insere(referencia, numero);
 }
 
 const CCDataReader::AcessoriosLidos* CCDataReader::AcessoriosGuardados(
     const OdDbObjectId& id) const {
-    if (acessoriosLidos_.empty() || desenhoAcessorios_ != DesenhoDe(id.database()) ||
+    if (acessoriosLidos_.porSimbolo.empty() || desenhoAcessorios_ != DesenhoDe(id.database()) ||
         versaoAcessorios_ != CICad::VersaoDesenho(id.database()))
         return nullptr;
-    return acessoriosLidos_.procura(id);
+    const std::uint32_t* numero = acessoriosLidos_.porSimbolo.procura(id);
+    return numero ? &acessoriosLidos_.distintas[*numero] : nullptr;
 }
 
 void CCDataReader::RegistraAppVinculos(zvdb::Database* database) {

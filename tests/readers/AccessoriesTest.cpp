@@ -122,6 +122,42 @@ TEST_F(AccessoriesTest, WhatASymbolsReadingKeptServesUntilTheDrawingChanges) {
     EXPECT_EQ(item->valorCampo("ZV_KEY"), "SY");
 }
 
+// Symbols that read alike keep one reading between them; a symbol with pairs of its own, or
+// with another standard, keeps its own, read after all of them as well as right away.
+TEST_F(AccessoriesTest, EverySymbolExpandsFromItsOwnReadingAmongManyAlike) {
+    const OdDbObjectId primeiro = Simbolo("K", "A1", "ESQ$0001$A", {}, 0);
+    const OdDbObjectId pares = Simbolo("K", "A1", "ESQ$0001$A", {}, 10);
+    CICad::SetXData(pares, "ZV_VINC_ADITIVO", {{1000, "2"}, {1000, "SY"}});
+    const OdDbObjectId outraNorma = Simbolo("K", "A1", "ESQ$0001$A", {}, 20);
+    CICad::SetXData(outraNorma, "KVR_ZV", {{1000, QString("A1") + QChar(0x0C) + "2"}});
+    const OdDbObjectId ultimo = Simbolo("K", "A1", "ESQ$0001$A", {}, 30);
+    const OdDbObjectId outraChave = Simbolo("K", "SO", "ESQ$0001$A", {}, 40);
+    CICad::SetXData(outraChave, "ZV_VINC_ADITIVO", {{1000, "1"}, {1000, "Z0"}});
+    const QStringList simples = {"B3/1", "B3/1", "B3/1", "Z0/1", "Z0/1"};
+    // Its units are not listed under that standard.
+    CEItemLista donoNorma = Dono(outraNorma);
+    const QStringList daNorma = Expande(donoNorma, nullptr);
+    ASSERT_EQ(daNorma, QStringList());
+    const std::vector<std::pair<OdDbObjectId, QStringList>> esperados = {
+        {primeiro, simples},
+        {pares, simples + QStringList{"SY/1", "SY/1"}},
+        {outraNorma, daNorma},
+        {ultimo, simples},
+        {outraChave, {"Z0/1"}}};
+    LeitorQueGuarda leitor;
+    TemplateDouble modelo;
+    std::vector<std::unique_ptr<CEItemLista>> itens;
+    for (const auto& [id, textos] : esperados) {
+        itens.emplace_back(leitor.CriaItemBloco(id, modelo));
+        ASSERT_NE(itens.back(), nullptr);
+    }
+    // The drawing changes no more, so that what was kept is what answers.
+    for (size_t i = 0; i < itens.size(); ++i)
+        EXPECT_EQ(Textos(leitor.ExpandeAcessorios(*itens[i], nullptr, nullptr, {}, QString())),
+                  esperados[i].second)
+            << i;
+}
+
 TEST_F(AccessoriesTest, AWiresItemKeepsItsKeyAndAccessoriesFromTheWalkThatFoundItsKey) {
     zvdb::Polyline* linha =
         db().modelSpace()->addLwPolyline({{0, 0, 0}, {10, 0, 0}}, false, "ESQ$0001$A");
