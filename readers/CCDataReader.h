@@ -577,6 +577,9 @@ private:
         TabelaIds<std::uint32_t> porSimbolo;
         std::vector<AcessoriosLidos> distintas;
         std::unordered_map<SemVinculos, std::uint32_t, HashSemVinculos> semVinculos;
+        // The number of the reading, kept when new.
+        std::uint32_t numero(AcessoriosLidos&& lidos);
+        void limpa();
     };
     LeiturasAcessorios acessoriosLidos_;
     const void* desenhoAcessorios_ = nullptr;

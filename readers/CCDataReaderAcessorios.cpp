@@ -39,6 +39,24 @@ void Conta(const QString& chave, int quantidade, std::vector<Unidades>& contados
 
 }  // namespace
 
+std::uint32_t CCDataReader::LeiturasAcessorios::numero(AcessoriosLidos&& lidos) {
+    const auto novo = std::uint32_t(distintas.size());
+    if (!lidos.vinculos.isEmpty()) {
+        distintas.push_back(std::move(lidos));
+        return novo;
+    }
+    const auto [igual, nova] =
+        semVinculos.try_emplace(SemVinculos{lidos.chave, lidos.norma, lidos.temChave}, novo);
+    if (nova) distintas.push_back(std::move(lidos));
+    return igual->second;
+}
+
+void CCDataReader::LeiturasAcessorios::limpa() {
+    porSimbolo.limpa();
+    distintas.clear();
+    semVinculos.clear();
+}
+
 const std::vector<std::pair<QString, int>>& CCDataReader::AcessoriosDoCatalogo(
     const QString& chave) {
     auto it = acessoriosCatalogo_.constFind(chave);

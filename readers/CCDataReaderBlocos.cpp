@@ -255,27 +255,15 @@ bool CCDataReader::LeChaveDoSimbolo(const OdDbObjectId& referencia) {
 void CCDataReader::GuardaAcessoriosDe(const OdDbObjectId& referencia, const ChaveLida& chave) {
     const std::uint64_t versao = CICad::VersaoDesenho(referencia.database());
     const void* desenho = DesenhoDe(referencia.database());
-    LeiturasAcessorios& lidas = acessoriosLidos_;
     if (desenhoAcessorios_ != desenho || versaoAcessorios_ != versao) {
-        lidas.porSimbolo.limpa();
-        lidas.distintas.clear();
-        lidas.semVinculos.clear();
+        acessoriosLidos_.limpa();
         desenhoAcessorios_ = desenho;
         versaoAcessorios_ = versao;
     }
-    auto numero = std::uint32_t(lidas.distintas.size());
-    if (simbolo_.vinculos.empty()) {
-        const auto [igual, nova] = lidas.semVinculos.try_emplace(
-            SemVinculos{chave.chave, chave.norma, simbolo_.temChave}, numero);
-        if (nova) lidas.distintas.push_back({simbolo_.temChave, chave.chave, chave.norma, {}});
-        numero = igual->second;
-    } else {
-        AcessoriosLidos& nova = lidas.distintas.emplace_back(
-            AcessoriosLidos{simbolo_.temChave, chave.chave, chave.norma, {}});
-        for (const std::string_view texto : simbolo_.vinculos)
-            nova.vinculos << Texto(texto);
-    }
-    lidas.porSimbolo.insere(referencia, numero);
+    AcessoriosLidos lidos{simbolo_.temChave, chave.chave, chave.norma, {}};
+    for (const std::string_view texto : simbolo_.vinculos)
+        lidos.vinculos << Texto(texto);
+    acessoriosLidos_.porSimbolo.insere(referencia, acessoriosLidos_.numero(std::move(lidos)));
 }
 
 const CCDataReader::AcessoriosLidos* CCDataReader::AcessoriosGuardados(

@@ -105,21 +105,20 @@ std::uint32_t CamposItem::numeroComSufixoNaoVazio(std::uint32_t numero, const QS
 }
 
 const QString* CamposItem::procura(std::uint32_t numero) const {
-    const auto it = lugar(numero);
-    return it != dados().end() && it->nome == numero ? &it->valor : nullptr;
+    const std::vector<Campo>& campos = dados();
+    const auto it = lugar(campos, numero);
+    return it != campos.end() && it->nome == numero ? &it->valor : nullptr;
 }
 
-std::vector<CamposItem::Campo>::const_iterator CamposItem::lugar(std::uint32_t numero) const {
-    const std::vector<Campo>& campos = dados();
+std::vector<CamposItem::Campo>::const_iterator CamposItem::lugar(const std::vector<Campo>& campos,
+                                                                 std::uint32_t numero) {
     return std::lower_bound(campos.begin(), campos.end(), numero,
                             [](const Campo& c, std::uint32_t n) { return c.nome < n; });
 }
 
 const QString* CamposItem::procura(const QString& chave) const {
     const std::uint32_t n = Tabela().procura(chave);
-    if (n == kSemNumero) return nullptr;
-    const auto it = lugar(n);
-    return it != dados().end() && it->nome == n ? &it->valor : nullptr;
+    return n == kSemNumero ? nullptr : procura(n);
 }
 
 QString CamposItem::value(const QString& chave, const QString& padrao) const {
@@ -146,8 +145,9 @@ QStringList CamposItem::values() const {
 CamposItem::const_iterator CamposItem::find(const QString& chave) const {
     const std::uint32_t n = Tabela().procura(chave);
     if (n == kSemNumero) return end();
-    const auto it = lugar(n);
-    return it != dados().end() && it->nome == n ? const_iterator(&*it) : end();
+    const std::vector<Campo>& campos = dados();
+    const auto it = lugar(campos, n);
+    return it != campos.end() && it->nome == n ? const_iterator(&*it) : end();
 }
 
 void CamposItem::insert(const QString& chave, const QString& valor) {
@@ -158,7 +158,7 @@ void CamposItem::insert(std::uint32_t n, const QString& valor) {
     proprios(1);
     // Items hold tens of fields: the first steps of the array's growth are skipped.
     if (campos_.capacity() == 0) campos_.reserve(16);
-    const auto it = campos_.begin() + (lugar(n) - campos_.cbegin());
+    const auto it = campos_.begin() + (lugar(campos_, n) - campos_.cbegin());
     if (it != campos_.end() && it->nome == n)
         it->valor = valor;
     else
@@ -169,7 +169,7 @@ int CamposItem::remove(const QString& chave) {
     const std::uint32_t n = Tabela().procura(chave);
     if (n == kSemNumero || !procura(n)) return 0;
     proprios();
-    campos_.erase(campos_.begin() + (lugar(n) - campos_.cbegin()));
+    campos_.erase(campos_.begin() + (lugar(campos_, n) - campos_.cbegin()));
     return 1;
 }
 

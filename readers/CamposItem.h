@@ -143,7 +143,9 @@ public:
     }
 
 private:
-    std::vector<Campo>::const_iterator lugar(std::uint32_t numero) const;
+    // Where the name number is, or would go, in the fields.
+    static std::vector<Campo>::const_iterator lugar(const std::vector<Campo>& campos,
+                                                    std::uint32_t numero);
     // numeroComSufixo for a suffix that is not empty.
     static std::uint32_t numeroComSufixoNaoVazio(std::uint32_t numero, const QString& sufixo);
     static std::uint32_t numeroNoSufixo(std::vector<std::uint32_t>& numeros, std::uint32_t numero,
