@@ -80,6 +80,35 @@ private:
     size_t quantos_ = 0;
 };
 
+// Fields shared by members of a group (an accessory's units), before and after its sums:
+// the same sums on the same fields give the same fields, shared again.
+struct Somados {
+    CamposItem antes, depois;
+};
+
+// The group's sums into one member's fields.
+void SomaMembro(CamposItem& campos, const std::vector<CamposItem::Campo>& lote,
+                std::vector<Somados>& somados) {
+    if (campos.partilhado()) {
+        for (const Somados& s : somados)
+            if (s.antes.partilhaCom(campos)) {
+                campos = s.depois;
+                return;
+            }
+    }
+    // A group's members come from a few units: the oldest goes beyond those.
+    constexpr std::size_t kMaxSomados = 8;
+    const CamposItem antes = campos.partilhado() ? campos : CamposItem();
+    // Room for exactly those it lacks, which the reader mostly left: an array that moved
+    // for them, in every item at once, would be new memory for the whole list.
+    campos.reservar(size_t(campos.size()) + CCMaterialGrfWriter::SomasAusentes(campos));
+    campos.juntarOrdenados(lote);
+    if (!antes.partilhado()) return;
+    campos.partilhar();
+    if (somados.size() >= kMaxSomados) somados.erase(somados.begin());
+    somados.push_back({antes, campos});
+}
+
 // The running grid, in single precision as the drawing keeps it.
 struct Grade {
     float x0 = 0, y0 = 0, x = 0, y = 0;
@@ -131,6 +160,7 @@ void CCMaterialGrfWriter::SomaGrupos(VetorItens& itens, int digitos) {
         return texto ? double(float(CETemplateLisp::TextoParaReal(*texto))) : 0.0;
     };
     ItensVistos feitos(itens.size());
+    std::vector<Somados> somados;
     for (CEItemLista* item : itens) {
         if (!item || feitos.contem(item)) continue;
         double qtd = 0, comprimento = 0;
@@ -152,11 +182,9 @@ void CCMaterialGrfWriter::SomaGrupos(VetorItens& itens, int digitos) {
         std::sort(
             lote.begin(), lote.end(),
             [](const CamposItem::Campo& x, const CamposItem::Campo& y) { return x.nome < y.nome; });
+        somados.clear();
         for (CEItemLista* m = item; m; m = m->ligado) {
-            // Room for exactly those it lacks, which the reader mostly left: an array that
-            // moved for them, in every item at once, would be new memory for the whole list.
-            m->campos.reservar(size_t(m->campos.size()) + SomasAusentes(m->campos));
-            m->campos.juntarOrdenados(lote);
+            SomaMembro(m->campos, lote, somados);
             if (m->ligado == item) break;
         }
     }

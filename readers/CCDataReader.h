@@ -556,10 +556,36 @@ private:
         QString chave, norma;
         QStringList vinculos;
     };
-    TabelaIds<AcessoriosLidos> acessoriosLidos_;
+    // A reading without pairs, as told apart: texts equal but one null are two.
+    struct SemVinculos {
+        QString chave, norma;
+        bool temChave;
+        bool operator==(const SemVinculos& outra) const {
+            return temChave == outra.temChave && chave == outra.chave && norma == outra.norma &&
+                   chave.isNull() == outra.chave.isNull() && norma.isNull() == outra.norma.isNull();
+        }
+    };
+    struct HashSemVinculos {
+        size_t operator()(const SemVinculos& l) const {
+            return qHash(l.chave, qHash(l.norma)) ^ size_t(l.temChave);
+        }
+    };
+    // Each distinct reading once, and per symbol the number of its own: most symbols read
+    // alike (a key and standard, no pairs of their own), and a large drawing has hundreds of
+    // thousands of them.
+    struct LeiturasAcessorios {
+        TabelaIds<std::uint32_t> porSimbolo;
+        std::vector<AcessoriosLidos> distintas;
+        std::unordered_map<SemVinculos, std::uint32_t, HashSemVinculos> semVinculos;
+        // The number of the reading, kept when new.
+        std::uint32_t numero(AcessoriosLidos&& lidos);
+        void limpa();
+    };
+    LeiturasAcessorios acessoriosLidos_;
     const void* desenhoAcessorios_ = nullptr;
     std::uint64_t versaoAcessorios_ = 0;
     void GuardaAcessoriosDe(const OdDbObjectId& referencia, const ChaveLida& chave);
+    // The symbol's kept reading, or null; valid until the next one is kept.
     const AcessoriosLidos* AcessoriosGuardados(const OdDbObjectId& id) const;
     // ZV_VINC_ADITIVO is registered once per drawing and version.
     void RegistraAppVinculos(zvdb::Database* database);
@@ -573,12 +599,11 @@ private:
     // asks, and the catalogue's texts are split once.
     QHash<QString, std::vector<std::pair<QString, int>>> acessoriosCatalogo_;
     const std::vector<std::pair<QString, int>>& AcessoriosDoCatalogo(const QString& chave);
-    // The fields of a unit with nothing of its owner's, for its quantity, and the room
-    // FolgaDosCampos gives them.
+    // The fields of a unit with nothing of its owner's, for its quantity: shared by the
+    // unit's items, which copy them only if changed.
     struct UnidadeAcessorio {
         QString qtd;
         CamposItem campos;
-        std::size_t folga = 0;
     };
     // Per accessory key and standard: the fields of a unit, and its user columns.
     struct BaseAcessorio {
@@ -588,7 +613,7 @@ private:
     // The unit of the base with nothing of its owner's: the base's fields, the quantity and
     // the user columns, joined once per quantity.
     const UnidadeAcessorio& UnidadeDaBase(BaseAcessorio& base, const QString& qtd);
-    // A new item of the unit's fields, with their room.
+    // A new item sharing the unit's fields.
     static CEItemLista* NovoItemDaUnidade(const UnidadeAcessorio& unidade);
     std::unordered_map<std::pair<QString, QString>, BaseAcessorio, HashPar> basesAcessorio_;
     CECacheCatalogo catalogo_;

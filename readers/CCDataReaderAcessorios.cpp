@@ -39,6 +39,24 @@ void Conta(const QString& chave, int quantidade, std::vector<Unidades>& contados
 
 }  // namespace
 
+std::uint32_t CCDataReader::LeiturasAcessorios::numero(AcessoriosLidos&& lidos) {
+    const auto novo = std::uint32_t(distintas.size());
+    if (!lidos.vinculos.isEmpty()) {
+        distintas.push_back(std::move(lidos));
+        return novo;
+    }
+    const auto [igual, nova] =
+        semVinculos.try_emplace(SemVinculos{lidos.chave, lidos.norma, lidos.temChave}, novo);
+    if (nova) distintas.push_back(std::move(lidos));
+    return igual->second;
+}
+
+void CCDataReader::LeiturasAcessorios::limpa() {
+    porSimbolo.limpa();
+    distintas.clear();
+    semVinculos.clear();
+}
+
 const std::vector<std::pair<QString, int>>& CCDataReader::AcessoriosDoCatalogo(
     const QString& chave) {
     auto it = acessoriosCatalogo_.constFind(chave);
@@ -62,13 +80,14 @@ const CCDataReader::UnidadeAcessorio& CCDataReader::UnidadeDaBase(BaseAcessorio&
     unidade.campos = base.item.campos;
     unidade.definirCampo(NumeroCampo<"QTD">(), qtd);
     unidade.copiarCampos(base.colunas);
-    const std::size_t folga = FolgaDosCampos(unidade.campos);
-    return base.unidades.emplace_back(UnidadeAcessorio{qtd, std::move(unidade.campos), folga});
+    // The room a kept item leaves, as an item of these fields had before they were shared.
+    unidade.campos.compactar(FolgaDosCampos(unidade.campos));
+    unidade.campos.partilhar();
+    return base.unidades.emplace_back(UnidadeAcessorio{qtd, std::move(unidade.campos)});
 }
 
 CEItemLista* CCDataReader::NovoItemDaUnidade(const UnidadeAcessorio& unidade) {
     auto* item = new CEItemLista;
-    item->campos.reservar(std::size_t(unidade.campos.size()) + unidade.folga);
     item->campos = unidade.campos;
     return item;
 }

@@ -263,15 +263,16 @@ void CCDataReader::GuardaAcessoriosDe(const OdDbObjectId& referencia, const Chav
     AcessoriosLidos lidos{simbolo_.temChave, chave.chave, chave.norma, {}};
     for (const std::string_view texto : simbolo_.vinculos)
         lidos.vinculos << Texto(texto);
-    acessoriosLidos_.insere(referencia, std::move(lidos));
+    acessoriosLidos_.porSimbolo.insere(referencia, acessoriosLidos_.numero(std::move(lidos)));
 }
 
 const CCDataReader::AcessoriosLidos* CCDataReader::AcessoriosGuardados(
     const OdDbObjectId& id) const {
-    if (acessoriosLidos_.empty() || desenhoAcessorios_ != DesenhoDe(id.database()) ||
+    if (acessoriosLidos_.porSimbolo.empty() || desenhoAcessorios_ != DesenhoDe(id.database()) ||
         versaoAcessorios_ != CICad::VersaoDesenho(id.database()))
         return nullptr;
-    return acessoriosLidos_.procura(id);
+    const std::uint32_t* numero = acessoriosLidos_.porSimbolo.procura(id);
+    return numero ? &acessoriosLidos_.distintas[*numero] : nullptr;
 }
 
 void CCDataReader::RegistraAppVinculos(zvdb::Database* database) {

@@ -329,6 +329,7 @@ void CCMaterialDataReader::Agrupa(VetorItens& itens, CETemplate& modelo) {
     const QStringList grupo = modelo.LerListaTexto("PBLLSTAGRUPAMENTO");
     if (grupo.isEmpty()) return;
     itens.ordenar(grupo + modelo.LerListaTexto("*LISTA_DE_SORT*"));
+    if (grupo.size() == 1 && quebra.isEmpty()) return AgrupaVizinhos(itens, grupo.front());
     // The fields that make two items one material, joined with a separator no field holds.
     auto chave = [&](const CEItemLista& item) {
         QString texto;
@@ -358,6 +359,30 @@ void CCMaterialDataReader::Agrupa(VetorItens& itens, CETemplate& modelo) {
             it->second.ultimo->ligado = item;
             it->second.ultimo = fim;
         }
+    }
+    itens = std::move(cabecas);
+}
+
+void CCMaterialDataReader::AgrupaVizinhos(VetorItens& itens, const QString& campo) {
+    // Sorted by the field first, the items of one value lie side by side.
+    const std::uint32_t numero = CamposItem::numeroSeHouver(campo);
+    auto valor = [numero](const CEItemLista& item) -> const QString& {
+        static const QString kVazio;
+        const QString* achado =
+            numero == CamposItem::kSemNome ? nullptr : item.campos.procura(numero);
+        return achado ? *achado : kVazio;
+    };
+    VetorItens cabecas;
+    cabecas.reserve(itens.size());
+    CEItemLista* ultimo = nullptr;
+    for (CEItemLista* item : itens) {
+        if (!item) continue;
+        if (!cabecas.empty() && valor(*item) == valor(*cabecas.back()))
+            ultimo->ligado = item;
+        else
+            cabecas.push_back(item);
+        for (ultimo = item; ultimo->ligado;)
+            ultimo = ultimo->ligado;
     }
     itens = std::move(cabecas);
 }

@@ -74,6 +74,10 @@ protected:
     QSet<QString> conectores_;
 
 private:
+    // Agrupa for items sorted by one grouping field and no page-break field: a material's
+    // items are neighbours, and each one is compared with the head before it.
+    static void AgrupaVizinhos(VetorItens& itens, const QString& campo);
+
     struct Referencias {
         zvdb::Database* desenho = nullptr;
         std::uint64_t versao = 0;

@@ -105,20 +105,20 @@ std::uint32_t CamposItem::numeroComSufixoNaoVazio(std::uint32_t numero, const QS
 }
 
 const QString* CamposItem::procura(std::uint32_t numero) const {
-    const auto it = lugar(numero);
-    return it != campos_.end() && it->nome == numero ? &it->valor : nullptr;
+    const std::vector<Campo>& campos = dados();
+    const auto it = lugar(campos, numero);
+    return it != campos.end() && it->nome == numero ? &it->valor : nullptr;
 }
 
-std::vector<CamposItem::Campo>::const_iterator CamposItem::lugar(std::uint32_t numero) const {
-    return std::lower_bound(campos_.begin(), campos_.end(), numero,
+std::vector<CamposItem::Campo>::const_iterator CamposItem::lugar(const std::vector<Campo>& campos,
+                                                                 std::uint32_t numero) {
+    return std::lower_bound(campos.begin(), campos.end(), numero,
                             [](const Campo& c, std::uint32_t n) { return c.nome < n; });
 }
 
 const QString* CamposItem::procura(const QString& chave) const {
     const std::uint32_t n = Tabela().procura(chave);
-    if (n == kSemNumero) return nullptr;
-    const auto it = lugar(n);
-    return it != campos_.end() && it->nome == n ? &it->valor : nullptr;
+    return n == kSemNumero ? nullptr : procura(n);
 }
 
 QString CamposItem::value(const QString& chave, const QString& padrao) const {
@@ -129,7 +129,7 @@ QString CamposItem::value(const QString& chave, const QString& padrao) const {
 QStringList CamposItem::keys() const {
     QStringList nomes;
     nomes.reserve(size());
-    for (const Campo& campo : campos_)
+    for (const Campo& campo : dados())
         nomes << nome(campo.nome);
     return nomes;
 }
@@ -137,7 +137,7 @@ QStringList CamposItem::keys() const {
 QStringList CamposItem::values() const {
     QStringList valores;
     valores.reserve(size());
-    for (const Campo& campo : campos_)
+    for (const Campo& campo : dados())
         valores << campo.valor;
     return valores;
 }
@@ -145,8 +145,9 @@ QStringList CamposItem::values() const {
 CamposItem::const_iterator CamposItem::find(const QString& chave) const {
     const std::uint32_t n = Tabela().procura(chave);
     if (n == kSemNumero) return end();
-    const auto it = lugar(n);
-    return it != campos_.end() && it->nome == n ? const_iterator(&*it) : end();
+    const std::vector<Campo>& campos = dados();
+    const auto it = lugar(campos, n);
+    return it != campos.end() && it->nome == n ? const_iterator(&*it) : end();
 }
 
 void CamposItem::insert(const QString& chave, const QString& valor) {
@@ -154,9 +155,10 @@ void CamposItem::insert(const QString& chave, const QString& valor) {
 }
 
 void CamposItem::insert(std::uint32_t n, const QString& valor) {
+    proprios(1);
     // Items hold tens of fields: the first steps of the array's growth are skipped.
     if (campos_.capacity() == 0) campos_.reserve(16);
-    const auto it = campos_.begin() + (lugar(n) - campos_.cbegin());
+    const auto it = campos_.begin() + (lugar(campos_, n) - campos_.cbegin());
     if (it != campos_.end() && it->nome == n)
         it->valor = valor;
     else
@@ -165,14 +167,28 @@ void CamposItem::insert(std::uint32_t n, const QString& valor) {
 
 int CamposItem::remove(const QString& chave) {
     const std::uint32_t n = Tabela().procura(chave);
-    if (n == kSemNumero) return 0;
-    const auto it = campos_.begin() + (lugar(n) - campos_.cbegin());
-    if (it == campos_.end() || it->nome != n) return 0;
-    campos_.erase(it);
+    if (n == kSemNumero || !procura(n)) return 0;
+    proprios();
+    campos_.erase(campos_.begin() + (lugar(campos_, n) - campos_.cbegin()));
     return 1;
 }
 
+void CamposItem::partilhar() {
+    if (!partilhados_)
+        partilhados_ = std::make_shared<const std::vector<Campo>>(std::move(campos_));
+    campos_ = {};
+}
+
+void CamposItem::proprio(std::size_t mais) {
+    std::vector<Campo> copia;
+    copia.reserve(partilhados_->size() + mais);
+    copia.assign(partilhados_->begin(), partilhados_->end());
+    partilhados_.reset();
+    campos_ = std::move(copia);
+}
+
 void CamposItem::compactar(std::size_t folga) {
+    if (partilhados_) return;
     const std::size_t tamanho = campos_.size() + folga;
     if (campos_.capacity() == tamanho) return;
     std::vector<Campo> novos;
@@ -182,10 +198,12 @@ void CamposItem::compactar(std::size_t folga) {
 }
 
 void CamposItem::juntar(const CamposItem& origem) {
-    if (&origem != this) juntarOrdenados(origem.campos_);
+    if (&origem != this) juntarOrdenados(origem.dados());
 }
 
 void CamposItem::juntarOrdenados(const std::vector<Campo>& lote) {
+    if (lote.empty()) return;
+    proprios(lote.size());
     if (campos_.empty()) {
         campos_ = lote;
         return;

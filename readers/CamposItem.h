@@ -1,14 +1,16 @@
 #pragma once
 // The text fields of one list item, stored flat: a large list holds millions of fields under
 // a few hundred names, so each name is kept once for the whole program and a field is its
-// name's number next to its value, in one array sorted by that number. The interface is the
-// part of a hash of texts that the readers use.
+// name's number next to its value, in one array sorted by that number; items alike may read
+// one shared array until one of them changes. The interface is the part of a hash of texts
+// that the readers use.
 #include <QString>
 #include <QStringList>
 
 #include <algorithm>
 #include <cstddef>
 #include <cstdint>
+#include <memory>
 #include <utility>
 #include <vector>
 
@@ -42,10 +44,10 @@ public:
     };
     using iterator = const_iterator;
 
-    int size() const { return int(campos_.size()); }
+    int size() const { return int(dados().size()); }
     int count() const { return size(); }
-    bool isEmpty() const { return campos_.empty(); }
-    bool empty() const { return campos_.empty(); }
+    bool isEmpty() const { return dados().empty(); }
+    bool empty() const { return dados().empty(); }
     bool contains(const QString& chave) const { return procura(chave) != nullptr; }
     QString value(const QString& chave, const QString& padrao = QString()) const;
     QString operator[](const QString& chave) const { return value(chave); }
@@ -56,16 +58,32 @@ public:
     void insert(const QString& chave, const QString& valor);
     void insert(std::uint32_t numero, const QString& valor);
     int remove(const QString& chave);
-    void clear() { campos_.clear(); }
+    void clear() {
+        partilhados_.reset();
+        campos_.clear();
+    }
     // Hands the fields over and leaves none: a reading made apart gives its values up
     // without a copy.
-    std::vector<Campo> retirar() { return std::exchange(campos_, {}); }
+    std::vector<Campo> retirar() {
+        proprios();
+        return std::exchange(campos_, {});
+    }
     // Takes an array back, emptied, for its room: readings made one after another in one
     // item allocate once.
     void reaproveitar(std::vector<Campo>&& campos) {
+        partilhados_.reset();
         campos_ = std::move(campos);
         campos_.clear();
     }
+    // From now on the fields are read-only and shared by this item's copies: many items alike
+    // (an accessory's units) cost one array. Any change copies them first, into that item
+    // alone.
+    void partilhar();
+    // Whether both read one shared array.
+    bool partilhaCom(const CamposItem& outro) const {
+        return partilhados_ && partilhados_ == outro.partilhados_;
+    }
+    bool partilhado() const { return partilhados_ != nullptr; }
     // Each field of `origem` under the same name, replacing what was there.
     void juntar(const CamposItem& origem);
     // The fields of `lote`, sorted by name number without repeats, replacing what was there.
@@ -77,22 +95,30 @@ public:
     // The value under a name number, or null; valid until the next change of the fields.
     const QString* procura(std::uint32_t numero) const;
     // The fields in name-number order.
-    const std::vector<Campo>& todos() const { return campos_; }
-    // Room for `n` fields: an item filled in a few merges moves its fields once.
-    void reservar(std::size_t n) { campos_.reserve(n); }
-    // Gives back the spare room of the array once the item is complete.
-    void compactar() { campos_.shrink_to_fit(); }
+    const std::vector<Campo>& todos() const { return dados(); }
+    // Room for `n` fields: an item filled in a few merges moves its fields once. Shared
+    // fields are copied with that room, as a change follows.
+    void reservar(std::size_t n) {
+        proprios(n > dados().size() ? n - dados().size() : 0);
+        campos_.reserve(n);
+    }
+    // Gives back the spare room of the array once the item is complete; shared fields keep
+    // theirs.
+    void compactar() {
+        if (!partilhados_) campos_.shrink_to_fit();
+    }
     // The same, leaving room for `folga` fields more: for those every item is known to get.
     void compactar(std::size_t folga);
     // Keeps the fields whose name number `fica` accepts, in their order; the room of the
     // others stays until compactar (an item still being filled would take it again).
     template <class Fica>
     void reter(Fica fica) {
+        proprios();
         std::erase_if(campos_, [&fica](const Campo& campo) { return !fica(campo.nome); });
     }
 
-    const_iterator begin() const { return const_iterator(campos_.data()); }
-    const_iterator end() const { return const_iterator(campos_.data() + campos_.size()); }
+    const_iterator begin() const { return const_iterator(dados().data()); }
+    const_iterator end() const { return const_iterator(dados().data() + dados().size()); }
     const_iterator constBegin() const { return begin(); }
     const_iterator constEnd() const { return end(); }
     const_iterator find(const QString& chave) const;
@@ -117,18 +143,30 @@ public:
     }
 
 private:
-    std::vector<Campo>::const_iterator lugar(std::uint32_t numero) const;
+    // Where the name number is, or would go, in the fields.
+    static std::vector<Campo>::const_iterator lugar(const std::vector<Campo>& campos,
+                                                    std::uint32_t numero);
     // numeroComSufixo for a suffix that is not empty.
     static std::uint32_t numeroComSufixoNaoVazio(std::uint32_t numero, const QString& sufixo);
     static std::uint32_t numeroNoSufixo(std::vector<std::uint32_t>& numeros, std::uint32_t numero,
                                         const QString& sufixo);
 
+    const std::vector<Campo>& dados() const { return partilhados_ ? *partilhados_ : campos_; }
+    // Shared fields become this item's own, with room for `mais` more.
+    void proprios(std::size_t mais = 0) {
+        if (partilhados_) proprio(mais);
+    }
+    void proprio(std::size_t mais);
+
     std::vector<Campo> campos_;
+    // Set, the fields are these, and campos_ is empty.
+    std::shared_ptr<const std::vector<Campo>> partilhados_;
 };
 
 template <class Nome, class Valor>
 void CamposItem::juntarOrdenados(std::size_t n, Nome nome, Valor valor) {
     if (n == 0) return;
+    proprios(n);
     if (campos_.empty() || campos_.back().nome < nome(0)) {
         // The batch's names all come after the fields there are (a first merge, or fields of
         // names numbered later, as a suffix's are): appended, each value made in its place.

@@ -76,6 +76,37 @@ TEST_F(MaterialGroupingTest, NoGroupingFieldsLeavesTheItemsAsTheyAre) {
     EXPECT_EQ(Cadeias(itens), QStringList({"1", "2"}));
 }
 
+// One grouping field and no break field: the materials are those a lookup by the joined
+// fields makes (a break field every item holds alike changes nothing there). Texts that sort
+// alike but differ ("01", "1") stay apart; an empty key and none are one material.
+TEST_F(MaterialGroupingTest, WithoutABreakFieldTheSameMaterialsJoinInTheSameOrder) {
+    auto monta = [this]() {
+        VetorItens itens;
+        std::uint32_t semente = 7;
+        const QStringList chaves = {"K1", "K01", "K2", "k1", "", "K10", "K1 ", "K3"};
+        for (int i = 0; i < 200; ++i) {
+            semente = semente * 1103515245u + 12345u;
+            const int c = int((semente >> 16) % 9);
+            CEItemLista* item = Item(i, c < 8 ? chaves[c] : "", (semente >> 8) % 3 ? "d" : "e");
+            if (c == 8) item->campos.remove("ZV_KEY");
+            // Some items lead a chain of their own already.
+            if (i % 17 == 0) item->ligado = Item(1000 + i, "OUTRA", "x");
+            itens.push_back(item);
+        }
+        return itens;
+    };
+    VetorItens vizinhos = monta(), porChave = monta();
+    modelo.simbolos["*ZV_CHAVE_QUEBRA_PAGINA*"] = QStringList();
+    CCMaterialDataReader::Agrupa(vizinhos, modelo);
+    modelo.simbolos["*ZV_CHAVE_QUEBRA_PAGINA*"] = QStringList{"GRUPO"};
+    CCMaterialDataReader::Agrupa(porChave, modelo);
+    EXPECT_EQ(Cadeias(vizinhos), Cadeias(porChave));
+    QStringList cabecas;
+    for (const CEItemLista* item : vizinhos)
+        cabecas << item->valorCampo("ZV_KEY");
+    EXPECT_EQ(cabecas, QStringList({"", "K01", "K1", "K1 ", "K2", "K3", "K10", "k1"}));
+}
+
 TEST_F(MaterialGroupingTest, MembersWhoseKeysTieKeepTheOrderOfAFieldByFieldComparisonSort) {
     // Hundreds of items over a few materials with the same description: the members of a
     // chain tie on every sort key, and their order is the one a sort comparing the items

@@ -262,4 +262,37 @@ TEST_F(MaterialLayoutTest, ATemplateFunctionRunsOncePerItemAndAnErrorPrintsNothi
     EXPECT_EQ(itens[0]->valorCampo(erro + "###FUNCAOCACHE"), "");
 }
 
+// Accessory units that share their fields: a function cell sees each unit's fields and
+// runs once per unit; its answer stays in that unit, and the shared fields keep none.
+TEST_F(MaterialLayoutTest, AFunctionCellRunsOnEachSharedUnitAndItsAnswerStaysInThatUnit) {
+    ASSERT_TRUE(CICad::AvaliaLisp("(setq n 0)"));
+    const QString funcao = "(progn (setq n (1+ n)) (strcat (cdr (assoc \"OBS\" reg)) (itoa n)))";
+    const QString cache = funcao + "###FUNCAOCACHE";
+    escritor.especificacoesAce = {Writer::LeEspecificacao("FUNCAO_A", funcao + "%M$30$L$ %")};
+    CEItemLista* cabeca = Item("K", "", "ACE");
+    cabeca->definirCampo("OBS", "h");
+    CamposItem unidade = cabeca->campos;
+    unidade.insert("OBS", "u");
+    unidade.partilhar();
+    std::vector<std::unique_ptr<CEItemLista>> membros;
+    for (CEItemLista* anterior = cabeca; membros.size() < 3; anterior = membros.back().get()) {
+        membros.push_back(std::make_unique<CEItemLista>());
+        membros.back()->campos = unidade;
+        anterior->ligado = membros.back().get();
+    }
+    modelo.simbolos["*LINHAS_POR_PAGINA*"] = 20;
+    Paginas();
+    EXPECT_EQ(CICad::GetIntLisp("n"), 4);
+    EXPECT_EQ(cabeca->valorCampo(cache), "h1");
+    for (int i = 0; i < 3; ++i) {
+        EXPECT_EQ(membros[size_t(i)]->valorCampo(cache), "u" + QString::number(i + 2));
+        EXPECT_EQ(membros[size_t(i)]->valorCampo("OBS"), "u");
+        EXPECT_FALSE(membros[size_t(i)]->campos.partilhaCom(unidade));
+    }
+    EXPECT_FALSE(unidade.contains(cache));
+    // Key, description, type and OBS, as made.
+    EXPECT_EQ(unidade.size(), 4);
+    EXPECT_EQ(unidade.value("OBS"), "u");
+}
+
 }  // namespace

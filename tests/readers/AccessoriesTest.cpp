@@ -5,6 +5,8 @@
 #include "lists/TemplateDouble.h"
 #include "readers/CCMaterialDataReader.h"
 
+#include <QMap>
+
 #include <memory>
 
 namespace {
@@ -120,6 +122,42 @@ TEST_F(AccessoriesTest, WhatASymbolsReadingKeptServesUntilTheDrawingChanges) {
     EXPECT_EQ(item->valorCampo("ZV_KEY"), "SY");
 }
 
+// Symbols that read alike keep one reading between them; a symbol with pairs of its own, or
+// with another standard, keeps its own, read after all of them as well as right away.
+TEST_F(AccessoriesTest, EverySymbolExpandsFromItsOwnReadingAmongManyAlike) {
+    const OdDbObjectId primeiro = Simbolo("K", "A1", "ESQ$0001$A", {}, 0);
+    const OdDbObjectId pares = Simbolo("K", "A1", "ESQ$0001$A", {}, 10);
+    CICad::SetXData(pares, "ZV_VINC_ADITIVO", {{1000, "2"}, {1000, "SY"}});
+    const OdDbObjectId outraNorma = Simbolo("K", "A1", "ESQ$0001$A", {}, 20);
+    CICad::SetXData(outraNorma, "KVR_ZV", {{1000, QString("A1") + QChar(0x0C) + "2"}});
+    const OdDbObjectId ultimo = Simbolo("K", "A1", "ESQ$0001$A", {}, 30);
+    const OdDbObjectId outraChave = Simbolo("K", "SO", "ESQ$0001$A", {}, 40);
+    CICad::SetXData(outraChave, "ZV_VINC_ADITIVO", {{1000, "1"}, {1000, "Z0"}});
+    const QStringList simples = {"B3/1", "B3/1", "B3/1", "Z0/1", "Z0/1"};
+    // Its units are not listed under that standard.
+    CEItemLista donoNorma = Dono(outraNorma);
+    const QStringList daNorma = Expande(donoNorma, nullptr);
+    ASSERT_EQ(daNorma, QStringList());
+    const std::vector<std::pair<OdDbObjectId, QStringList>> esperados = {
+        {primeiro, simples},
+        {pares, simples + QStringList{"SY/1", "SY/1"}},
+        {outraNorma, daNorma},
+        {ultimo, simples},
+        {outraChave, {"Z0/1"}}};
+    LeitorQueGuarda leitor;
+    TemplateDouble modelo;
+    std::vector<std::unique_ptr<CEItemLista>> itens;
+    for (const auto& [id, textos] : esperados) {
+        itens.emplace_back(leitor.CriaItemBloco(id, modelo));
+        ASSERT_NE(itens.back(), nullptr);
+    }
+    // The drawing changes no more, so that what was kept is what answers.
+    for (size_t i = 0; i < itens.size(); ++i)
+        EXPECT_EQ(Textos(leitor.ExpandeAcessorios(*itens[i], nullptr, nullptr, {}, QString())),
+                  esperados[i].second)
+            << i;
+}
+
 TEST_F(AccessoriesTest, AWiresItemKeepsItsKeyAndAccessoriesFromTheWalkThatFoundItsKey) {
     zvdb::Polyline* linha =
         db().modelSpace()->addLwPolyline({{0, 0, 0}, {10, 0, 0}}, false, "ESQ$0001$A");
@@ -163,6 +201,60 @@ TEST_F(AccessoriesTest, EveryUnitHasItsOwnersQuantityWhateverOwnersCameBefore) {
                   QStringList({"B3/" + q, "B3/" + q, "B3/" + q, "Z0/" + q, "Z0/" + q}))
             << qtd.toStdString();
     }
+}
+
+QMap<QString, QString> Campos(const CEItemLista& item) {
+    QMap<QString, QString> campos;
+    for (auto it = item.campos.constBegin(); it != item.campos.constEnd(); ++it)
+        campos.insert(it.key(), it.value());
+    return campos;
+}
+
+// The units of one key and quantity read one array, whoever owns them; each reads what a
+// copy of its own held, and a change to one unit leaves the others as they were.
+TEST_F(AccessoriesTest, UnitsOfAKeyAndQuantityShareOneArrayAndAChangeStaysInItsUnit) {
+    const OdDbObjectId id = Simbolo("K", "A1", "ESQ$0001$A");
+    CCMaterialDataReader leitor;
+    TemplateDouble modelo;
+    CEItemLista dono = Dono(id, "2"), outro = Dono(id, "2");
+    VetorItens itens = leitor.ExpandeAcessorios(dono, nullptr, &modelo, {}, QString());
+    VetorItens outros = leitor.ExpandeAcessorios(outro, nullptr, &modelo, {}, QString());
+    ASSERT_EQ(itens.size(), 5u);
+    ASSERT_EQ(outros.size(), 5u);
+    const QMap<QString, QString> b3 = {{"ZV_LISTA_TIPO", "ACE"},
+                                       {"ZV_LISTA", "S"},
+                                       {"ZV_KEY", "B3"},
+                                       {"DESCRICAO", "Three of them"},
+                                       {"TP_DESCRI", "Three of them"},
+                                       {"QTD", "2"}};
+    QMap<QString, QString> z0 = b3;
+    z0["ZV_KEY"] = "Z0";
+    z0["DESCRICAO"] = z0["TP_DESCRI"] = "Zero and two";
+    for (size_t i = 0; i < 5; ++i) {
+        const QMap<QString, QString>& esperado = i < 3 ? b3 : z0;
+        EXPECT_EQ(Campos(*itens[i]), esperado) << i;
+        EXPECT_TRUE(itens[i]->campos.partilhaCom(outros[i]->campos)) << i;
+        EXPECT_EQ(itens[i]->campos.partilhaCom(itens[0]->campos), i < 3) << i;
+    }
+    itens[1]->definirCampo("QTD", "9");
+    itens[1]->definirCampo("OBS", "x");
+    QMap<QString, QString> mudado = b3;
+    mudado["QTD"] = "9";
+    mudado["OBS"] = "x";
+    EXPECT_EQ(Campos(*itens[1]), mudado);
+    for (size_t i : {0, 2})
+        EXPECT_EQ(Campos(*itens[i]), b3) << i;
+    EXPECT_EQ(Campos(*outros[1]), b3);
+    EXPECT_TRUE(itens[0]->campos.partilhaCom(itens[2]->campos));
+    // Another quantity is another array.
+    CEItemLista terceiro = Dono(id, "3");
+    VetorItens mais = leitor.ExpandeAcessorios(terceiro, nullptr, &modelo, {}, QString());
+    ASSERT_EQ(mais.size(), 5u);
+    EXPECT_EQ(mais[0]->valorCampo("QTD"), "3");
+    EXPECT_FALSE(mais[0]->campos.partilhaCom(itens[0]->campos));
+    EXPECT_EQ(Campos(*itens[0]), b3);
+    for (VetorItens* v : {&itens, &outros, &mais})
+        v->destruirItens();
 }
 
 TEST_F(AccessoriesTest, TheSymbolsAccessoryApplicationIsRegisteredByTheFirstExpansion) {

@@ -12,6 +12,7 @@
 #include <algorithm>
 #include <cstdint>
 #include <cstdio>
+#include <functional>
 #include <map>
 #include <memory>
 #include <random>
@@ -449,6 +450,81 @@ TEST(ItemRecordTest, AnArrayCompactedWithRoomTakesThatManyMoreWithoutMoving) {
     EXPECT_EQ(item.campos.todos().capacity(), 5u);
     item.campos.compactar(0);
     EXPECT_EQ(item.campos.todos().capacity(), 5u);
+}
+
+// Fields every read of an item gives, in one list: names and values in order, and each
+// looked up by name and by number.
+QStringList Leitura(const CamposItem& campos) {
+    QStringList texto;
+    for (auto it = campos.constBegin(); it != campos.constEnd(); ++it) {
+        const QString* porNumero = campos.procura(CamposItem::numero(it.key()));
+        texto << it.key() + "=" + it.value() + "|" + campos.value(it.key()) + "|" +
+                     (porNumero ? *porNumero : "-") + "|" + *campos.find(it.key());
+    }
+    EXPECT_EQ(texto.size(), campos.size());
+    EXPECT_EQ(campos.todos().size(), std::size_t(campos.size()));
+    EXPECT_EQ(campos.keys().size(), campos.size());
+    EXPECT_EQ(campos.values().size(), campos.size());
+    return texto;
+}
+
+// Shared fields read as the item's own did; a change of any kind copies them into that item
+// alone, and the items still sharing see nothing of it.
+TEST(ItemRecordTest, SharedFieldsReadAsOwnOnesAndAChangeCopiesThemForThatItemAlone) {
+    CEItemLista origem;
+    for (const char* nome : {"PART_C", "PART_A", "PART_E", "PART_B"})
+        origem.definirCampo(nome, QString(nome).toLower());
+    const QStringList antes = Leitura(origem.campos);
+    const QStringList nomes = origem.campos.keys();
+    CamposItem unidade = origem.campos;
+    unidade.partilhar();
+    EXPECT_TRUE(unidade.partilhado());
+    EXPECT_EQ(Leitura(unidade), antes);
+    EXPECT_EQ(unidade.keys(), nomes);
+    EXPECT_FALSE(unidade.contains("PART_D"));
+    EXPECT_EQ(unidade.remove("PART_D"), 0);
+    unidade.compactar();
+    unidade.compactar(3);
+    EXPECT_TRUE(unidade.partilhado());
+
+    // One way of changing the fields each: they all leave the other copies as they were.
+    using Mudanca = std::function<void(CamposItem&)>;
+    const std::vector<std::pair<const char*, Mudanca>> mudancas = {
+        {"insert", [](CamposItem& c) { c.insert("PART_D", "d"); }},
+        {"insert over", [](CamposItem& c) { c.insert("PART_A", "novo"); }},
+        {"remove", [](CamposItem& c) { c.remove("PART_E"); }},
+        {"juntar",
+         [](CamposItem& c) {
+             CamposItem outro;
+             outro.insert("PART_A", "junto");
+             outro.insert("PART_F", "f");
+             c.juntar(outro);
+         }},
+        {"reter", [](CamposItem& c) { c.reter([](std::uint32_t n) { return n % 2 == 0; }); }},
+        {"reservar", [](CamposItem& c) { c.reservar(20); }},
+        {"clear", [](CamposItem& c) { c.clear(); }},
+        {"retirar", [](CamposItem& c) { EXPECT_EQ(c.retirar().size(), 4u); }},
+    };
+    for (const auto& [nome, muda] : mudancas) {
+        CamposItem copia = unidade, irma = unidade;
+        ASSERT_TRUE(copia.partilhaCom(unidade));
+        // What the change gives on fields that were never shared.
+        CamposItem propria = origem.campos;
+        muda(propria);
+        muda(copia);
+        EXPECT_FALSE(copia.partilhaCom(unidade)) << nome;
+        EXPECT_EQ(Leitura(copia), Leitura(propria)) << nome;
+        EXPECT_TRUE(irma.partilhaCom(unidade)) << nome;
+        EXPECT_EQ(Leitura(irma), antes) << nome;
+        EXPECT_EQ(Leitura(unidade), antes) << nome;
+    }
+    // Copied with the room asked for: the next fields go in without moving them.
+    CamposItem copia = unidade;
+    copia.reservar(6);
+    const CamposItem::Campo* lugar = copia.todos().data();
+    copia.insert("PART_D", "d");
+    copia.insert("PART_F", "f");
+    EXPECT_EQ(copia.todos().data(), lugar);
 }
 
 // Asking for a name no item ever had does not add it to the program's name table.

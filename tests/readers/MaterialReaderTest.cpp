@@ -126,9 +126,42 @@ TEST_F(MaterialReaderTest, AccessoriesGroupedLikeMaterialsOrBehindTheirOwner) {
     EXPECT_EQ(Le(), QStringList({"A1:2", "B3:1"}));
 }
 
+// The fields of an item as a map of names to values.
+QMap<QString, QString> Campos(const CEItemLista& item) {
+    QMap<QString, QString> campos;
+    for (auto it = item.campos.constBegin(); it != item.campos.constEnd(); ++it)
+        campos.insert(it.key(), it.value());
+    return campos;
+}
+
+// The chains of the items again, each member with fields of its own, shared with none.
+VetorItens CopiasProprias(const VetorItens& itens) {
+    VetorItens copias;
+    for (const CEItemLista* item : itens) {
+        CEItemLista** lugar = &copias.emplace_back();
+        for (const CEItemLista* m = item; m; m = m->ligado) {
+            *lugar = new CEItemLista;
+            (*lugar)->campos.juntar(m->campos);
+            EXPECT_FALSE((*lugar)->campos.partilhado());
+            lugar = &(*lugar)->ligado;
+        }
+    }
+    return copias;
+}
+
+void Destroi(VetorItens& itens) {
+    for (CEItemLista* item : itens)
+        for (CEItemLista* m = item; m;) {
+            CEItemLista* seguinte = m->ligado;
+            delete m;
+            m = seguinte;
+        }
+}
+
 // The list writes its sums into every member: the reader leaves room for them, so that no
-// member's fields move then.
-TEST_F(MaterialReaderTest, EveryMemberTakesTheGroupsSumsWithoutMovingItsFields) {
+// member's own fields move then. Members that read one shared array (an accessory's units)
+// read one summed array after; every member reads what fields of its own would.
+TEST_F(MaterialReaderTest, EveryMemberTakesTheGroupsSumsWithoutMovingOrCopyingItsFields) {
     Simbolo("K", "A1", "ESQ$0001$A", {}, 0);
     Simbolo("K", "A1", "ESQ$0002$A", {{"QTD", "2"}}, 10);
     Simbolo("K", "B3", "ESQ$0002$A", {}, 20);
@@ -137,23 +170,52 @@ TEST_F(MaterialReaderTest, EveryMemberTakesTheGroupsSumsWithoutMovingItsFields) 
         CCMaterialDataReader leitor;
         CIProgress progresso;
         std::unique_ptr<VetorItens> itens(leitor.LerDados(&db(), std::nullopt, modelo, progresso));
-        // Behind each head (which also gets its sequence number) its members.
-        std::vector<std::pair<CEItemLista*, const CamposItem::Campo*>> membros;
+        VetorItens copias = CopiasProprias(*itens);
+        // Behind each head (which also gets its sequence number) its members, each with its
+        // array and the first member before it that read the same shared one.
+        struct Membro {
+            CEItemLista* item;
+            const CamposItem::Campo* campos;
+            CEItemLista* igual;
+        };
+        std::vector<Membro> membros;
+        int partilhados = 0;
         for (CEItemLista* item : *itens)
-            for (CEItemLista* m = item->ligado; m; m = m->ligado)
-                membros.emplace_back(m, m->campos.todos().data());
+            for (CEItemLista* m = item->ligado; m; m = m->ligado) {
+                CEItemLista* igual = nullptr;
+                for (const Membro& antes : membros)
+                    if (!igual && antes.item->campos.partilhaCom(m->campos)) igual = antes.item;
+                partilhados += igual ? 1 : 0;
+                membros.push_back({m, m->campos.todos().data(), igual});
+            }
         ASSERT_GT(membros.size(), 5u);
+        // Each key's units read two arrays, one per owner's quantity: three members of B3
+        // and one of Z0 read an array that a member before them reads.
+        EXPECT_EQ(partilhados, 4);
         CCMaterialGrfWriter::SomaGrupos(*itens, 0);
-        for (const auto& [m, antes] : membros) {
-            EXPECT_EQ(m->campos.todos().data(), antes) << m->valorCampo("ZV_KEY").toStdString();
-            EXPECT_EQ(CCMaterialGrfWriter::SomasAusentes(m->campos), 0u);
+        CCMaterialGrfWriter::SomaGrupos(copias, 0);
+        for (const Membro& m : membros) {
+            const std::string chave = m.item->valorCampo("ZV_KEY").toStdString();
+            if (!m.item->campos.partilhado()) {
+                EXPECT_EQ(m.item->campos.todos().data(), m.campos) << chave;
+            }
+            if (m.igual) {
+                EXPECT_TRUE(m.igual->campos.partilhaCom(m.item->campos)) << chave;
+            }
+            EXPECT_EQ(CCMaterialGrfWriter::SomasAusentes(m.item->campos), 0u);
+        }
+        ASSERT_EQ(itens->size(), copias.size());
+        for (size_t i = 0; i < itens->size(); ++i) {
+            const CEItemLista* m = (*itens)[i];
+            const CEItemLista* c = copias[i];
+            for (; m && c; m = m->ligado, c = c->ligado)
+                EXPECT_EQ(Campos(*m), Campos(*c)) << vinculos << " " << i;
+            EXPECT_EQ(m, c);
         }
         EXPECT_EQ(itens->at(0)->valorCampo("ZV_KEY"), "A1");
         EXPECT_EQ(itens->at(0)->valorCampo("QTD"), "3");
-        for (const auto& [m, antes] : membros)
-            delete m;
-        for (CEItemLista* item : *itens)
-            delete item;
+        Destroi(*itens);
+        Destroi(copias);
     }
 }
 
