@@ -7,14 +7,21 @@
 
 namespace zvdb {
 
+// The most numerous objects of a drawing: a member more must not make each one bigger.
+static_assert(sizeof(Entity) <= 56, "Entity grew");
+
+Entity::~Entity() {
+    if (!subEntity_) delete link_.children;
+}
+
 BlockRecord* Entity::block() const {
-    if (parent_) return parent_->block();
+    if (Entity* up = parent()) return up->block();
     return dynamic_cast<BlockRecord*>(database().objectByHandle(ownerHandle()));
 }
 
 const std::vector<Entity*>& Entity::subEntities() const {
     static const std::vector<Entity*> none;
-    return children_ ? children_->subs : none;
+    return !subEntity_ && link_.children ? link_.children->subs : none;
 }
 
 void* Entity::Children::operator new(std::size_t bytes) {
@@ -26,8 +33,9 @@ void Entity::Children::operator delete(void* room, std::size_t bytes) noexcept {
 }
 
 Entity::Children& Entity::children() {
-    if (!children_) children_ = std::make_unique<Children>();
-    return *children_;
+    // Never a sub-entity's: ATTRIBs, VERTEXes and SEQENDs are the only children, and carry none.
+    if (!link_.children) link_.children = new Children();
+    return *link_.children;
 }
 
 std::vector<Entity*> Entity::liveSubEntities() const {
@@ -103,13 +111,20 @@ bool Entity::moveBy(const Point3& offset) {
     return true;
 }
 
+void Entity::adoptChild(Entity& sub) {
+    // A new sub-entity has no children of its own: they would have no way back to it.
+    if (!sub.subEntity_) delete sub.link_.children;
+    sub.link_.parent = this;
+    sub.subEntity_ = true;
+}
+
 void Entity::addSubEntity(Entity* sub) {
-    sub->parent_ = this;
+    adoptChild(*sub);
     children().subs.push_back(sub);
 }
 
 void Entity::setSeqend(Entity* seqend) {
-    seqend->parent_ = this;
+    adoptChild(*seqend);
     children().seqend = seqend;
 }
 

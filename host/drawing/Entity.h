@@ -14,6 +14,7 @@ class BlockRecord;
 class Entity : public DbObject {
 public:
     using DbObject::DbObject;
+    ~Entity() override;
 
     std::string_view layer() const { return text(8, "0"); }
     void setLayer(std::string_view layer) { setText(8, layer, "AcDbEntity"); }
@@ -26,11 +27,13 @@ public:
     // The block record that holds the entity (for a sub-entity, its parent's).
     BlockRecord* block() const;
     // The INSERT of an ATTRIB, the POLYLINE of a VERTEX or SEQEND; else null.
-    Entity* parent() const { return parent_; }
+    Entity* parent() const { return subEntity_ ? link_.parent : nullptr; }
     // ATTRIBs or VERTEXes, erased ones included; see liveSubEntities().
     const std::vector<Entity*>& subEntities() const;
     std::vector<Entity*> liveSubEntities() const;
-    Entity* seqend() const { return children_ ? children_->seqend : nullptr; }
+    Entity* seqend() const {
+        return !subEntity_ && link_.children ? link_.children->seqend : nullptr;
+    }
     void erase() override;
     // Moves the entity (and its attributes or vertices) by a world offset; false for kinds
     // whose geometry is not known here (they stay where they are).
@@ -54,8 +57,14 @@ private:
         static void operator delete(void* room, std::size_t bytes) noexcept;
     };
     Children& children();
-    std::unique_ptr<Children> children_;
-    Entity* parent_ = nullptr;
+    // The entity under this one becomes its child.
+    void adoptChild(Entity& sub);
+    // A sub-entity has a parent and no children, any other entity may have children and has
+    // no parent: one pointer holds either, as subEntity_ tells.
+    union Link {
+        Children* children = nullptr;
+        Entity* parent;
+    } link_;
 };
 
 }  // namespace zvdb
