@@ -40,13 +40,29 @@ BlockReference* insert(Database& db, BlockRecord& block, const Point3& at,
     return reference;
 }
 
-Polyline* polylineOfTwo(Database& db) {
+// Vertices added one by one, past the room the first ones took.
+Polyline* polylineOf(Database& db, int vertices) {
     Entity* made = db.addEntity(*db.modelSpace(), "POLYLINE",
                                 {Tag{100, "AcDb2dPolyline"}, Tag{66, "1"}, Tag{70, "0"}}, "0");
     auto* polyline = static_cast<Polyline*>(made);
-    db.addVertex(*polyline, {0, 0, 0});
-    db.addVertex(*polyline, {3, 4, 0});
+    for (int i = 0; i < vertices; ++i)
+        db.addVertex(*polyline, {double(i), double(2 * i), 0});
     return polyline;
+}
+
+void expectVerticesInOrder(const Entity& polyline, int vertices) {
+    ASSERT_EQ(polyline.subEntities().size(), std::size_t(vertices));
+    for (int i = 0; i < vertices; ++i)
+        EXPECT_EQ(polyline.subEntities()[std::size_t(i)]->point(10),
+                  (Point3{double(i), double(2 * i), 0}));
+}
+
+// An attribute more than the reference was made with, as LISP or a reader may add one.
+Attribute* addExtra(Database& db, BlockReference& reference) {
+    return db.addAttribute(reference,
+                           {Tag{10, "0.0"}, Tag{20, "0.0"}, Tag{30, "0.0"}, Tag{40, "1.0"},
+                            Tag{1, "X"}, Tag{100, "AcDbAttribute"}, Tag{2, "EXTRA"}, Tag{70, "0"}},
+                           "0");
 }
 
 // Each parent with children, each child knowing its parent and carrying none.
@@ -80,26 +96,31 @@ TEST(EntityLinks, ChildrenKnowTheirParentWhetherMadeLoadedOrCopied) {
     Database db;
     BlockRecord* block = blockWithTwoValues(db);
     BlockReference* reference = insert(db, *block, {10, 0, 0}, {"1", "A"});
-    Polyline* polyline = polylineOfTwo(db);
-    expectFamily(*reference, 2, db.modelSpace());
-    expectFamily(*polyline, 2, db.modelSpace());
+    Attribute* extra = addExtra(db, *reference);
+    Polyline* polyline = polylineOf(db, 9);
+    expectFamily(*reference, 3, db.modelSpace());
+    expectFamily(*polyline, 9, db.modelSpace());
+    expectVerticesInOrder(*polyline, 9);
     EXPECT_EQ(reference->attribute("REG")->textValue(), "A");
+    EXPECT_EQ(reference->subEntities()[2], extra);
 
     auto loaded = DxfLoader::load(DxfWriter::toText(db));
     const Entity* loadedReference = loaded->entityByHandle(reference->handle());
     const Entity* loadedPolyline = loaded->entityByHandle(polyline->handle());
     ASSERT_NE(loadedReference, nullptr);
     ASSERT_NE(loadedPolyline, nullptr);
-    expectFamily(*loadedReference, 2, loaded->modelSpace());
-    expectFamily(*loadedPolyline, 2, loaded->modelSpace());
+    expectFamily(*loadedReference, 3, loaded->modelSpace());
+    expectFamily(*loadedPolyline, 9, loaded->modelSpace());
+    expectVerticesInOrder(*loadedPolyline, 9);
 
     Database target;
     DeepCloner cloner(db, target);
     Entity* const sources[] = {reference, polyline};
     const std::vector<Entity*> copies = cloner.cloneEntities(sources, *target.modelSpace());
     ASSERT_EQ(copies.size(), 2u);
-    expectFamily(*copies[0], 2, target.modelSpace());
-    expectFamily(*copies[1], 2, target.modelSpace());
+    expectFamily(*copies[0], 3, target.modelSpace());
+    expectFamily(*copies[1], 9, target.modelSpace());
+    expectVerticesInOrder(*copies[1], 9);
 }
 
 TEST(EntityLinks, AnErasedParentTakesItsChildrenOutOfTheFile) {
