@@ -668,8 +668,7 @@ void Database::addAttributesFromLayouts(BlockReference& reference,
     if (layouts.empty()) return;
     if (made) made->reserve(made->size() + layouts.size());
     // The reference's list of attributes at its size at once.
-    std::vector<Entity*>& subs = reference.children().subs;
-    subs.reserve(subs.size() + layouts.size());
+    reference.reserveSubEntities(layouts.size());
     AttributeLayout::Placement where{placement, heightScale, rotation, reference.inPaperSpace(),
                                      {},        {}};
     for (std::size_t i = 0; i < layouts.size(); ++i) {

@@ -15,7 +15,7 @@
 namespace zvdb {
 
 // A drawing holds millions of objects: a flag more must not make each one bigger.
-static_assert(sizeof(DbObject) <= 56, "DbObject grew");
+static_assert(sizeof(DbObject) <= 48, "DbObject grew");
 
 DbObject::DbObject(Database& database, std::span<const Tag> tags)
     : database_(&database),
@@ -41,7 +41,18 @@ DbObject::DbObject(Database& database, const TagPattern::Values& values, std::ui
       handle_(handle),
       owner_(owner) {}
 
-DbObject::~DbObject() = default;
+DbObject::~DbObject() {
+    if (hasOwnList()) delete own_;
+}
+
+void DbObject::ownTags(std::unique_ptr<std::vector<Tag>> tags) {
+    std::vector<Tag>* old = hasOwnList() ? own_ : nullptr;
+    own_ = tags.release();
+    owned_ = true;
+    patterned_ = false;
+    fileCount_ = 0;
+    delete old;
+}
 
 void* DbObject::operator new(std::size_t bytes) {
     return pool::take(bytes);
@@ -64,10 +75,8 @@ std::span<const Tag> DbObject::tags() const {
 
 void DbObject::expand() {
     if (!patterned_) return;
-    own_ = std::make_unique<std::vector<Tag>>(
-        pattern_->pattern->expand(*pattern_, handle_, owner_, database_->arena()));
-    patterned_ = false;
-    pattern_ = nullptr;
+    ownTags(std::make_unique<std::vector<Tag>>(
+        pattern_->pattern->expand(*pattern_, handle_, owner_, database_->arena())));
 }
 
 void DbObject::noteEdit() {
@@ -95,23 +104,17 @@ std::vector<Tag>& DbObject::editTags(std::size_t more) {
     }
     if (!owned_) {
         // Copied once at the size the change needs, not copied and then grown.
-        own_ = std::make_unique<std::vector<Tag>>();
-        own_->reserve(fileCount_ + more);
-        own_->assign(fileTags_, fileTags_ + fileCount_);
-        owned_ = true;
-        fileTags_ = nullptr;
-        fileCount_ = 0;
+        auto copy = std::make_unique<std::vector<Tag>>();
+        copy->reserve(fileCount_ + more);
+        copy->assign(fileTags_, fileTags_ + fileCount_);
+        ownTags(std::move(copy));
     }
     return *own_;
 }
 
 void DbObject::takeTags(std::vector<Tag> tags) {
     noteEdit();
-    patterned_ = false;
-    own_ = std::make_unique<std::vector<Tag>>(std::move(tags));
-    owned_ = true;
-    fileTags_ = nullptr;
-    fileCount_ = 0;
+    ownTags(std::make_unique<std::vector<Tag>>(std::move(tags)));
     cacheIdentity();
 }
 

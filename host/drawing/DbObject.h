@@ -171,10 +171,19 @@ private:
     void expand();
     void noteEdit();
 
+    // Gives the object `tags` as its own list, dropping the one it had.
+    void ownTags(std::unique_ptr<std::vector<Tag>> tags);
+    // Whether own_ holds the tags.
+    bool hasOwnList() const { return owned_ && !patterned_; }
+
     Database* database_;
+    // Where the tags are, told by the flags: each object keeps one of the three.
     union {
         const Tag* fileTags_ = nullptr;
         const TagPattern::Values* pattern_;  // when patterned_
+        // When owned_ and not patterned_; held apart, as most objects keep their tags in a
+        // file's list or the arena and an empty list here would cost each one its room.
+        std::vector<Tag>* own_;
     };
     std::uint32_t fileCount_ = 0;
     // Bits, so that the flags take the four bytes beside the count (millions of objects).
@@ -183,9 +192,12 @@ private:
     bool patterned_ : 1 = false;
     mutable bool watched_ : 1 = false;
     bool layerRecord_ : 1 = false;
-    // Held apart: most objects keep their tags in a file's list or the arena, and an empty
-    // list here would cost every one of them its room.
-    std::unique_ptr<std::vector<Tag>> own_;
+
+protected:
+    // For Entity: whether it is a sub-entity (an ATTRIB, VERTEX or SEQEND under its parent).
+    bool subEntity_ : 1 = false;
+
+private:
     std::uint64_t handle_ = 0;
     std::uint64_t owner_ = 0;
 };

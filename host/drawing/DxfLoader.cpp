@@ -535,7 +535,8 @@ void DxfLoader::renumberDuplicates() {
         // Attributes, vertices and the SEQEND that followed it are its own.
         auto* entity = dynamic_cast<Entity*>(object);
         if (!entity) continue;
-        std::vector<Entity*> children = entity->subEntities();
+        const auto subs = entity->subEntities();
+        std::vector<Entity*> children(subs.begin(), subs.end());
         if (entity->seqend()) children.push_back(entity->seqend());
         for (Entity* child : children)
             if (child->ownerHandle() == duplicate.handle) child->setOwner(object->handle());

@@ -5,33 +5,64 @@
 #include "ObjectPool.h"
 #include "TagValues.h"
 
+#include <algorithm>
+#include <new>
+
 namespace zvdb {
 
+// The most numerous objects of a drawing: a member more must not make each one bigger.
+static_assert(sizeof(Entity) <= 56, "Entity grew");
+
+Entity::~Entity() {
+    if (!subEntity_) Children::drop(link_.children);
+}
+
 BlockRecord* Entity::block() const {
-    if (parent_) return parent_->block();
+    if (Entity* up = parent()) return up->block();
     return dynamic_cast<BlockRecord*>(database().objectByHandle(ownerHandle()));
 }
 
-const std::vector<Entity*>& Entity::subEntities() const {
-    static const std::vector<Entity*> none;
-    return children_ ? children_->subs : none;
+std::span<Entity* const> Entity::subEntities() const {
+    if (subEntity_ || !link_.children) return {};
+    return {link_.children->subs(), link_.children->size};
 }
 
-void* Entity::Children::operator new(std::size_t bytes) {
-    return pool::take(bytes);
+Entity::Children* Entity::Children::make(std::uint32_t capacity) {
+    void* room = pool::take(sizeof(Children) + capacity * sizeof(Entity*));
+    auto* made = new (room) Children();
+    made->capacity = capacity;
+    return made;
 }
 
-void Entity::Children::operator delete(void* room, std::size_t bytes) noexcept {
-    pool::give(room, bytes);
+void Entity::Children::drop(Children* children) noexcept {
+    if (children) pool::give(children, sizeof(Children) + children->capacity * sizeof(Entity*));
+}
+
+void Entity::growChildren(std::size_t capacity) {
+    Children* old = link_.children;
+    Children* grown = Children::make(static_cast<std::uint32_t>(capacity));
+    if (old) {
+        grown->seqend = old->seqend;
+        grown->size = old->size;
+        std::copy(old->subs(), old->subs() + old->size, grown->subs());
+    }
+    link_.children = grown;
+    Children::drop(old);
+}
+
+void Entity::reserveSubEntities(std::size_t more) {
+    const std::size_t size = link_.children ? link_.children->size : 0;
+    if (!link_.children || link_.children->capacity < size + more) growChildren(size + more);
 }
 
 Entity::Children& Entity::children() {
-    if (!children_) children_ = std::make_unique<Children>();
-    return *children_;
+    // Never a sub-entity's: ATTRIBs, VERTEXes and SEQENDs are the only children, and carry none.
+    if (!link_.children) link_.children = Children::make(0);
+    return *link_.children;
 }
 
 std::vector<Entity*> Entity::liveSubEntities() const {
-    const std::vector<Entity*>& subs = subEntities();
+    const std::span<Entity* const> subs = subEntities();
     std::vector<Entity*> live;
     live.reserve(subs.size());
     for (Entity* sub : subs)
@@ -103,13 +134,24 @@ bool Entity::moveBy(const Point3& offset) {
     return true;
 }
 
+void Entity::adoptChild(Entity& sub) {
+    // A new sub-entity has no children of its own: they would have no way back to it.
+    if (!sub.subEntity_) Children::drop(sub.link_.children);
+    sub.link_.parent = this;
+    sub.subEntity_ = true;
+}
+
 void Entity::addSubEntity(Entity* sub) {
-    sub->parent_ = this;
-    children().subs.push_back(sub);
+    adoptChild(*sub);
+    Children* own = link_.children;
+    if (!own || own->size == own->capacity)
+        growChildren(own ? std::max<std::size_t>(2, 2 * std::size_t(own->capacity)) : 1);
+    own = link_.children;
+    own->subs()[own->size++] = sub;
 }
 
 void Entity::setSeqend(Entity* seqend) {
-    seqend->parent_ = this;
+    adoptChild(*seqend);
     children().seqend = seqend;
 }
 

@@ -4,7 +4,8 @@
 // with the closing SEQEND.
 #include "DbObject.h"
 
-#include <memory>
+#include <cstdint>
+#include <span>
 #include <vector>
 
 namespace zvdb {
@@ -14,6 +15,7 @@ class BlockRecord;
 class Entity : public DbObject {
 public:
     using DbObject::DbObject;
+    ~Entity() override;
 
     std::string_view layer() const { return text(8, "0"); }
     void setLayer(std::string_view layer) { setText(8, layer, "AcDbEntity"); }
@@ -26,11 +28,13 @@ public:
     // The block record that holds the entity (for a sub-entity, its parent's).
     BlockRecord* block() const;
     // The INSERT of an ATTRIB, the POLYLINE of a VERTEX or SEQEND; else null.
-    Entity* parent() const { return parent_; }
+    Entity* parent() const { return subEntity_ ? link_.parent : nullptr; }
     // ATTRIBs or VERTEXes, erased ones included; see liveSubEntities().
-    const std::vector<Entity*>& subEntities() const;
+    std::span<Entity* const> subEntities() const;
     std::vector<Entity*> liveSubEntities() const;
-    Entity* seqend() const { return children_ ? children_->seqend : nullptr; }
+    Entity* seqend() const {
+        return !subEntity_ && link_.children ? link_.children->seqend : nullptr;
+    }
     void erase() override;
     // Moves the entity (and its attributes or vertices) by a world offset; false for kinds
     // whose geometry is not known here (they stay where they are).
@@ -44,18 +48,31 @@ protected:
     friend class R12Upgrade;
     void addSubEntity(Entity* sub);
     void setSeqend(Entity* seqend);
+    // Room for `more` sub-entities after those there are, at that size.
+    void reserveSubEntities(std::size_t more);
 
 private:
-    // Held apart: most entities have none, and they are the most numerous objects.
+    // Held apart: most entities have none, and they are the most numerous objects. The
+    // sub-entities follow in the same room (a reference has a few), taken from the pool.
     struct Children {
-        std::vector<Entity*> subs;
         Entity* seqend = nullptr;
-        static void* operator new(std::size_t bytes);
-        static void operator delete(void* room, std::size_t bytes) noexcept;
+        std::uint32_t size = 0;
+        std::uint32_t capacity = 0;
+        Entity** subs() { return reinterpret_cast<Entity**>(this + 1); }
+        static Children* make(std::uint32_t capacity);
+        static void drop(Children* children) noexcept;
     };
     Children& children();
-    std::unique_ptr<Children> children_;
-    Entity* parent_ = nullptr;
+    // Moves the children to a room for `capacity` sub-entities.
+    void growChildren(std::size_t capacity);
+    // The entity under this one becomes its child.
+    void adoptChild(Entity& sub);
+    // A sub-entity has a parent and no children, any other entity may have children and has
+    // no parent: one pointer holds either, as subEntity_ tells.
+    union Link {
+        Children* children = nullptr;
+        Entity* parent;
+    } link_;
 };
 
 }  // namespace zvdb
