@@ -86,6 +86,8 @@ CCBorneDwgDataReader::CCBorneDwgDataReader() {
     lerAcessorios_ = false;
     GuardaFios = false;
     GuardaBornes = false;
+    GuardaSimbolos = false;
+    LimitaEntidadesGuardadas(2048);
 }
 
 CCBorneDwgDataReader::~CCBorneDwgDataReader() = default;

@@ -18,7 +18,8 @@ class CCBorneDwgDataReader : public CCExportDataReader {
 public:
     // Each wire is copied into the sides of the one or two terminals it reaches, and each
     // terminal read as an item before any side asks for a neighbour: their readings are not
-    // kept, the components' are.
+    // kept. Nor are those of the components the walk makes: the sides ask for few of them,
+    // each close to the terminals before and after, so those they read are kept for a while.
     CCBorneDwgDataReader();
     ~CCBorneDwgDataReader() override;
     VetorItens* LerDados(zvdb::Database* database, const std::optional<QStringList>& paginas,

@@ -564,6 +564,63 @@ TEST_F(ExportTerminalSidesTest, WiresAndTerminalsReadApartGiveTheSameSidesAndAre
     avulsos->destruirItens();
 }
 
+// A reader that keeps no symbol the walk reads, and few of those the sides read, gives the
+// sides the very fields a reader that keeps them all gives: each component the sides meet is
+// read again, and the first one goes once two more came after it.
+TEST_F(ExportTerminalSidesTest, ComponentsReadAgainForTheSidesGiveTheSameSidesAndFewAreKept) {
+    x1_ = borne("X1", "1", {20, 200, 0});
+    x2_ = borne("X1", "2", {60, 200, 0});
+    borne("X1", "3", {100, 200, 0});
+    k1_ = componente("-K1", {{"A1", {20, 100, 0}}});
+    const zvdb::BlockReference* k2 = componente("-K2", {{"A1", {60, 100, 0}}});
+    const zvdb::BlockReference* k3 = componente("-K3", {{"A1", {100, 100, 0}}});
+    const zvdb::BlockReference* solto = componente("-K4", {{"A1", {300, 100, 0}}});
+    fio({{20, 190, 0}, {20, 100, 0}}, "1");
+    fio({{60, 190, 0}, {60, 100, 0}}, "2");
+    fio({{100, 190, 0}, {100, 100, 0}}, "3");
+    fio({{20, 200, 0}, {20, 220, 0}, {60, 220, 0}, {60, 200, 0}}, "5");
+    ASSERT_TRUE(lisp("(setq EXPORTA 3)"));
+    struct Poucos : CCExportDataReader {
+        Poucos() {
+            GuardaFios = false;
+            GuardaBornes = false;
+            GuardaSimbolos = false;
+            LimitaEntidadesGuardadas(1);
+        }
+    };
+    CCExportDataReader todos;
+    Poucos poucos;
+    std::unique_ptr<VetorItens> inteiros(todos.Le(&db(), nullptr, true, std::nullopt));
+    std::unique_ptr<VetorItens> relidos(poucos.Le(&db(), nullptr, true, std::nullopt));
+    ASSERT_TRUE(inteiros && relidos);
+    const auto id = [this](const zvdb::DbObject* objeto) {
+        return OdDbObjectId(&db(), objeto->handle());
+    };
+    for (const zvdb::DbObject* objeto :
+         std::initializer_list<const zvdb::DbObject*>{k1_, k2, k3, solto})
+        EXPECT_TRUE(todos.LeituraGuardada(id(objeto)));
+    // The walk kept none; the sides read -K1, -K2 and -K3 in turn, one at a time.
+    EXPECT_FALSE(poucos.LeituraGuardada(id(solto)));
+    EXPECT_FALSE(poucos.LeituraGuardada(id(k1_)));
+    EXPECT_TRUE(poucos.LeituraGuardada(id(k3)));
+    // Item by item, in the same order, the same fields.
+    ASSERT_EQ(inteiros->size(), relidos->size());
+    QStringList vizinhos;
+    for (size_t i = 0; i < inteiros->size(); ++i) {
+        const CEItemLista& a = *(*inteiros)[i];
+        const CEItemLista& b = *(*relidos)[i];
+        EXPECT_EQ(a.campos.keys(), b.campos.keys());
+        EXPECT_EQ(a.campos.values(), b.campos.values());
+        if (b.valorCampo("ZV_LISTA_TIPO") == "BORNE")
+            vizinhos << b.valorCampo("NUMERO") + ">" + b.valorCampo("RELACAO_INI") + "/" +
+                            b.valorCampo("FIO_SEGINI");
+    }
+    vizinhos.sort();
+    EXPECT_EQ(vizinhos, QStringList({"1>-K1:A1/1", "2>-K2:A1/2", "3>-K3:A1/3"}));
+    inteiros->destruirItens();
+    relidos->destruirItens();
+}
+
 // A reader may drop a component's fields as the walk makes it, and a terminal's once its sides
 // are read: the sides read the drawing's objects, not those items, so each item is the one a
 // full read gives, less what was dropped.
