@@ -295,22 +295,42 @@ ConnectionFinder::ConnectionFinder(zvdb::Database& database, double tolerance)
     sortLines();
 }
 
-std::unordered_map<std::string, std::vector<std::uint64_t>> ConnectionFinder::wiresAndLeadsByLayer()
-    const {
-    std::vector<std::vector<std::uint64_t>> byId(layers_.size());
+std::unordered_map<std::string, std::vector<std::uint64_t>> ConnectionFinder::wiresAndLeadsByLayer(
+    std::unordered_map<std::string, LayerVertices>* vertices) const {
+    std::vector<std::vector<const Line*>> byId(layers_.size());
     for (const std::vector<Line>* lines : {&wireLines_, &leadLines_})
         for (const Line& line : *lines)
-            byId[static_cast<std::size_t>(line.layer)].push_back(line.handle);
+            byId[static_cast<std::size_t>(line.layer)].push_back(&line);
+    const auto byHandle = [](const Line* a, const Line* b) { return a->handle < b->handle; };
+    const auto sameHandle = [](const Line* a, const Line* b) { return a->handle == b->handle; };
     std::unordered_map<std::string, std::vector<std::uint64_t>> byLayer;
     for (const auto& [name, id] : layers_) {
-        std::vector<std::uint64_t>& handles = byId[static_cast<std::size_t>(id)];
-        if (handles.empty()) continue;
+        std::vector<const Line*>& lines = byId[static_cast<std::size_t>(id)];
+        if (lines.empty()) continue;
         // A polyline that is both a wire and a lead came in both lists.
-        std::sort(handles.begin(), handles.end());
-        handles.erase(std::unique(handles.begin(), handles.end()), handles.end());
-        byLayer.emplace(std::string(name), std::move(handles));
+        std::sort(lines.begin(), lines.end(), byHandle);
+        lines.erase(std::unique(lines.begin(), lines.end(), sameHandle), lines.end());
+        std::vector<std::uint64_t>& handles = byLayer[std::string(name)];
+        handles.reserve(lines.size());
+        for (const Line* line : lines)
+            handles.push_back(line->handle);
+        if (vertices) addVertices(lines, (*vertices)[std::string(name)]);
     }
     return byLayer;
+}
+
+void ConnectionFinder::addVertices(std::span<const Line* const> lines, LayerVertices& out) const {
+    std::size_t count = 0;
+    for (const Line* line : lines)
+        count += line->vertexCount;
+    out.points.reserve(count);
+    out.starts.reserve(lines.size() + 1);
+    for (const Line* line : lines) {
+        out.starts.push_back(static_cast<std::uint32_t>(out.points.size()));
+        const auto points = verticesOf(*line);
+        out.points.insert(out.points.end(), points.begin(), points.end());
+    }
+    out.starts.push_back(static_cast<std::uint32_t>(out.points.size()));
 }
 
 std::vector<WireLine> ConnectionFinder::wireLinesInPageOrder() const {

@@ -45,6 +45,13 @@ struct WireLine {
     bool operator==(const WireLine&) const = default;
 };
 
+// The vertices of a layer's polylines, in the order of its handles: polyline k's are
+// points[starts[k]] up to points[starts[k + 1]], as Polyline::vertices gives them.
+struct LayerVertices {
+    std::vector<zvdb::Point3> points;
+    std::vector<std::uint32_t> starts;
+};
+
 class ConnectionFinder;
 
 // The same answer in a few arrays: wire w's touches are entries[ends[w - 1]] (0 for the
@@ -79,7 +86,9 @@ public:
     double tolerance() const { return tolerance_; }
     // The wire and lead polylines (KVR_ZV_WIRE or KVR_ZV_CABO) of each layer, each once, in
     // handle order: what the walk above saw, for those who ask by layer.
-    std::unordered_map<std::string, std::vector<std::uint64_t>> wiresAndLeadsByLayer() const;
+    // With `vertices`, their vertices by layer too, from the walk's.
+    std::unordered_map<std::string, std::vector<std::uint64_t>> wiresAndLeadsByLayer(
+        std::unordered_map<std::string, LayerVertices>* vertices = nullptr) const;
     // The KVR_ZV_WIRE polylines as polylinesInPageOrder gives them, with their numbers as
     // wireNumber reads them: what the walk above saw, for the lists of wires.
     std::vector<WireLine> wireLinesInPageOrder() const;
@@ -145,6 +154,8 @@ private:
     void addLine(zvdb::Polyline& polyline, std::size_t xdata, bool wire, bool lead, bool blind,
                  std::string_view number);
     std::span<const zvdb::Point3> verticesOf(const Line& line) const;
+    // The lines' vertices appended to `out`, in their order.
+    void addVertices(std::span<const Line* const> lines, LayerVertices& out) const;
     void addSpot(std::uint32_t symbol, std::int32_t layer, const zvdb::Point3& p,
                  std::string_view connection);
     std::uint64_t cellKey(long long x, long long y) const;
