@@ -172,10 +172,14 @@ void ConnectionChains::install(DocumentLisp& lisp, const zvproduct::ProductConte
         });
     // A reader asks for the cables right after the wires or not at all: a call of anything
     // else lets the kept index go, so that it does not weigh on the rest of the run.
-    lisp.addInvokeListener([answers](const QString& function) {
+    // The wires' vertices serve the pages read after them while the drawing stays the same.
+    lisp.addInvokeListener([answers, context](const QString& function) {
         if (answers->keepsIndex() && function != QLatin1String("getConexoesTodosFios") &&
             function != QLatin1String("getConexoesTodosCabos"))
             answers->release();
+        if (!answers->wireLayers().holdsVertices()) return;
+        zvdb::Database* database = context.database ? context.database() : nullptr;
+        if (database) answers->wireLayers().releaseStaleVertices(*database);
     });
 }
 

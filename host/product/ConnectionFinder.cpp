@@ -320,17 +320,13 @@ std::unordered_map<std::string, std::vector<std::uint64_t>> ConnectionFinder::wi
 }
 
 void ConnectionFinder::addVertices(std::span<const Line* const> lines, LayerVertices& out) const {
-    std::size_t count = 0;
-    for (const Line* line : lines)
-        count += line->vertexCount;
-    out.points.reserve(count);
-    out.starts.reserve(lines.size() + 1);
+    out.points = vertices_;
+    out.starts.reserve(lines.size());
+    out.counts.reserve(lines.size());
     for (const Line* line : lines) {
-        out.starts.push_back(static_cast<std::uint32_t>(out.points.size()));
-        const auto points = verticesOf(*line);
-        out.points.insert(out.points.end(), points.begin(), points.end());
+        out.starts.push_back(line->firstVertex);
+        out.counts.push_back(line->vertexCount);
     }
-    out.starts.push_back(static_cast<std::uint32_t>(out.points.size()));
 }
 
 std::vector<WireLine> ConnectionFinder::wireLinesInPageOrder() const {
@@ -372,7 +368,7 @@ void ConnectionFinder::readModelSpace() {
     symbols_.reserve(entities / 2);
     spots_.reserve(entities);
     // about one vertex an entity: the lines have two or three, and most entities are symbols
-    vertices_.reserve(entities);
+    vertices_->reserve(entities);
     database_.modelSpace()->forEachEntity([this](zvdb::Entity& entity) {
         const Roles roles(entity);
         // no kind of reference or polyline derives from their classes: the type tells them
@@ -395,9 +391,9 @@ void ConnectionFinder::readModelSpace() {
 // A polyline of the roles given, with its vertices.
 void ConnectionFinder::addLine(zvdb::Polyline& polyline, std::size_t xdata, bool wire, bool lead,
                                bool blind, std::string_view number) {
-    const auto firstVertex = static_cast<std::uint32_t>(vertices_.size());
-    const std::int32_t layer = layerId(appendVertices(polyline, xdata, vertices_));
-    const auto vertexCount = static_cast<std::uint32_t>(vertices_.size() - firstVertex);
+    const auto firstVertex = static_cast<std::uint32_t>(vertices_->size());
+    const std::int32_t layer = layerId(appendVertices(polyline, xdata, *vertices_));
+    const auto vertexCount = static_cast<std::uint32_t>(vertices_->size() - firstVertex);
     Line line{&polyline, polyline.handle(), 0, layer, {}, firstVertex, vertexCount};
     if (wire) {
         line.number = number;
@@ -409,7 +405,7 @@ void ConnectionFinder::addLine(zvdb::Polyline& polyline, std::size_t xdata, bool
 }
 
 std::span<const zvdb::Point3> ConnectionFinder::verticesOf(const Line& line) const {
-    return {vertices_.data() + line.firstVertex, line.vertexCount};
+    return {vertices_->data() + line.firstVertex, line.vertexCount};
 }
 
 // A project symbol gives its connection attributes' text positions, its insertion point and

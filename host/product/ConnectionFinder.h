@@ -10,6 +10,7 @@
 #include "drawing/Geometry.h"
 
 #include <cstdint>
+#include <memory>
 #include <span>
 #include <string>
 #include <string_view>
@@ -46,10 +47,14 @@ struct WireLine {
 };
 
 // The vertices of a layer's polylines, in the order of its handles: polyline k's are
-// points[starts[k]] up to points[starts[k + 1]], as Polyline::vertices gives them.
+// counts[k] from points[starts[k]] on, as Polyline::vertices gives them.
 struct LayerVertices {
-    std::vector<zvdb::Point3> points;
-    std::vector<std::uint32_t> starts;
+    std::shared_ptr<const std::vector<zvdb::Point3>> points;  // the walk's, shared
+    std::vector<std::uint32_t> starts, counts;
+
+    std::span<const zvdb::Point3> of(std::size_t k) const {
+        return {points->data() + starts[k], counts[k]};
+    }
 };
 
 class ConnectionFinder;
@@ -154,7 +159,7 @@ private:
     void addLine(zvdb::Polyline& polyline, std::size_t xdata, bool wire, bool lead, bool blind,
                  std::string_view number);
     std::span<const zvdb::Point3> verticesOf(const Line& line) const;
-    // The lines' vertices appended to `out`, in their order.
+    // The places of the lines' vertices appended to `out`, in their order.
     void addVertices(std::span<const Line* const> lines, LayerVertices& out) const;
     void addSpot(std::uint32_t symbol, std::int32_t layer, const zvdb::Point3& p,
                  std::string_view connection);
@@ -186,8 +191,10 @@ private:
     std::vector<CellRun> grid_;
     std::vector<LayerCells> layerCells_;  // by layer id
     std::vector<Line> wireLines_, leadLines_, blindLines_;
-    // The lines' vertices, read on the walk while their tags are at hand.
-    std::vector<zvdb::Point3> vertices_;
+    // The lines' vertices, read on the walk while their tags are at hand; shared with the
+    // index of the wires by layer, which outlives the finder.
+    std::shared_ptr<std::vector<zvdb::Point3>> vertices_ =
+        std::make_shared<std::vector<zvdb::Point3>>();
 };
 
 inline Touch ConnectionTable::touch(std::size_t k) const {

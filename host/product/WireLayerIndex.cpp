@@ -40,11 +40,11 @@ void WireLayerIndex::eachOn(zvdb::Database& database, const std::string& layer,
                             const Visit& visit) {
     const std::vector<std::uint64_t>& handles = polylinesOn(database, layer);
     auto kept = vertices_.find(layer);
-    if (kept != vertices_.end() && kept->second.starts.size() == handles.size() + 1) {
-        const LayerVertices& v = kept->second;
+    if (kept != vertices_.end() && kept->second.starts.size() == handles.size()) {
         for (std::size_t k = 0; k < handles.size(); ++k)
-            visit(handles[k],
-                  std::span(v.points).subspan(v.starts[k], v.starts[k + 1] - v.starts[k]));
+            visit(handles[k], kept->second.of(k));
+        // A reader keeps what it read of a layer: the walk's vertices go with the last layer.
+        vertices_.erase(kept);
         return;
     }
     for (const std::uint64_t handle : handles) {

@@ -30,9 +30,16 @@ public:
     // With `vertices`, the vertices of each as well, from the same walk.
     void adopt(const zvdb::Database& database, ByLayer byLayer, VerticesByLayer vertices = {});
     // The polylinesOn(layer), each with its vertices as Polyline::vertices gives them: those
-    // handed over with the index, else read now.
+    // handed over with the index the first time, else read now.
     using Visit = std::function<void(std::uint64_t handle, std::span<const zvdb::Point3>)>;
     void eachOn(zvdb::Database& database, const std::string& layer, const Visit& visit);
+
+    // Whether vertices handed over are held.
+    bool holdsVertices() const { return !vertices_.empty(); }
+    // Lets go of the vertices handed over once the drawing changed: nobody asks for them.
+    void releaseStaleVertices(const zvdb::Database& database) {
+        if (!vertices_.empty() && !current(database)) vertices_.clear();
+    }
 
 private:
     void rebuild(zvdb::Database& database);

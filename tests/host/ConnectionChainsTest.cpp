@@ -6,6 +6,7 @@
 #include "app/ConnectionChains.h"
 #include "app/DocumentLisp.h"
 #include "app/LispChains.h"
+#include "drawing/BlockRecord.h"
 #include "drawing/Database.h"
 #include "drawing/LayerRecord.h"
 #include "drawing/Polyline.h"
@@ -237,6 +238,7 @@ TEST_F(ConnectionChainsTest, APagesWiresWithTheirVerticesAreTheChainsPolylinesAs
     // a LISP edit moves a vertex of a wire the connections' walk read
     invoked("getConexoesTodosFios");
     const std::string before = given(page);
+    EXPECT_EQ(given(page), before);  // asked again, read from the drawing
     const std::string first = before.substr(0, before.find(' '));
     lisp().interpreter().evalText(QString("(setq d (entget (handent \"%1\")))"
                                           "(entmod (subst (list 10 -7.25 3.5) (assoc 10 d) d))")
@@ -328,6 +330,17 @@ TEST(ConnectionChainIndex, KeptForTheCablesRightAfterTheWiresAndLetGoAtAnyOtherC
     EXPECT_TRUE(answers->keepsIndex());
     invoke("getFiosPorLayer", "ESQ$0001$A");
     EXPECT_FALSE(answers->keepsIndex());
+    // the wires' vertices are held for the pages while the drawing stays as it was read
+    EXPECT_TRUE(answers->wireLayers().holdsVertices());
+    invoke("NO SUCH FUNCTION");
+    EXPECT_TRUE(answers->wireLayers().holdsVertices());
+    for (zvdb::Entity* entity : drawing->modelSpace()->entities())
+        if (auto* polyline = dynamic_cast<zvdb::Polyline*>(entity)) {
+            polyline->setVertices(polyline->vertices());
+            break;
+        }
+    invoke("NO SUCH FUNCTION");
+    EXPECT_FALSE(answers->wireLayers().holdsVertices());
 }
 
 TEST(ResultBufferBlocks, BlocksGoWithTheirLastNodeInAnyOrderAndFromAnyThread) {
