@@ -353,9 +353,13 @@ std::uint64_t ConnectionFinder::cellKey(long long x, long long y) const {
 
 void ConnectionFinder::addSpot(std::uint32_t symbol, std::int32_t layer, const zvdb::Point3& p,
                                std::string_view connection) {
+    spots_.push_back({p, connection, symbol, layer});
+}
+
+std::uint64_t ConnectionFinder::cellOf(const zvdb::Point3& p) const {
     const auto cx = static_cast<long long>(std::floor(p.x / cell_));
     const auto cy = static_cast<long long>(std::floor(p.y / cell_));
-    spots_.push_back({cellKey(cx, cy), p, connection, symbol, layer});
+    return cellKey(cx, cy);
 }
 
 // The symbols (KVR_ZV or KVR_ZV_EQUIPO references) and the polylines of the wires, the
@@ -511,12 +515,13 @@ void ConnectionFinder::buildGrid() {
     std::vector<std::uint32_t> slots(spots_.size());
     for (std::size_t i = 0; i < spots_.size(); ++i) {
         const Spot& spot = spots_[i];
+        const std::uint64_t cell = cellOf(spot.point);
         const LayerCells& table = layerCells_[static_cast<std::size_t>(spot.layer)];
-        std::size_t slot = slotOf(spot.cell) & table.mask;
-        while (grid_[table.first + slot].end != 0 && grid_[table.first + slot].cell != spot.cell)
+        std::size_t slot = slotOf(cell) & table.mask;
+        while (grid_[table.first + slot].end != 0 && grid_[table.first + slot].cell != cell)
             slot = (slot + 1) & table.mask;
         CellRun& run = grid_[table.first + slot];
-        run.cell = spot.cell;
+        run.cell = cell;
         ++run.end;
         slots[i] = static_cast<std::uint32_t>(table.first + slot);
     }

@@ -117,8 +117,8 @@ private:
         std::uint64_t handle;
         std::string_view block;
     };
+    // Its cell is worked out from its point where the grid is built, not kept with it.
     struct Spot {
-        std::uint64_t cell;
         zvdb::Point3 point;
         std::string_view connection;  // in the drawing's storage: the spots sort cheaply
         std::uint32_t symbol;
@@ -164,6 +164,7 @@ private:
     void addSpot(std::uint32_t symbol, std::int32_t layer, const zvdb::Point3& p,
                  std::string_view connection);
     std::uint64_t cellKey(long long x, long long y) const;
+    std::uint64_t cellOf(const zvdb::Point3& p) const;
     static std::size_t slotOf(std::uint64_t cell);
     const CellRun* run(std::int32_t layer, std::uint64_t cell) const;
     void buildGrid();
