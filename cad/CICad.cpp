@@ -194,6 +194,12 @@ bool CICad::zvInvokeConexoes(const QString& funcao, zvsdk::ConnectionReceiver& r
     return lisp && lisp->lispInvokeConnections(funcao, receptor) != zvsdk::RTNONE;
 }
 
+bool CICad::zvInvokePolilinhas(const QString& funcao, const QString& argumento,
+                               zvsdk::PolylineReceiver& receptor) {
+    zvsdk::LispInterface* lisp = LispDe(nullptr);
+    return lisp && lisp->lispInvokePolylines(funcao, argumento, receptor) != zvsdk::RTNONE;
+}
+
 void CICad::zvInvokeVoid(const QString& funcao, const QStringList& args) {
     zvsdk::releaseChain(zvInvokeLista(funcao, args));
 }

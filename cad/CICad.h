@@ -18,6 +18,7 @@
 namespace zvsdk {
 class ConnectionReceiver;
 class Document;
+class PolylineReceiver;
 }  // namespace zvsdk
 namespace zv {
 class CEAtributo;
@@ -431,6 +432,10 @@ public:
     // its answer given to `receptor` without the chain; false when the host does not answer
     // it so, and the chain of zvInvokeLista is the way.
     static bool zvInvokeConexoes(const QString& funcao, zvsdk::ConnectionReceiver& receptor);
+    // A function of one text that answers polyline handles, each given to `receptor` with the
+    // vertices the host has of it; false when the host does not answer it so.
+    static bool zvInvokePolilinhas(const QString& funcao, const QString& argumento,
+                                   zvsdk::PolylineReceiver& receptor);
     static int zvInvokeInt(const QString& funcao, const QStringList& args = {});
     static bool zvInvokeBool(const QString& funcao, const QStringList& args = {});
     static QString zvInvokeString(const QString& funcao, const QStringList& args = {});

@@ -4,6 +4,7 @@
 #include "CEListaAtributos.h"
 #include "Descarte.h"
 #include "cad/CELayoutRotasFios.h"
+#include "host/sdk/LispInterface.h"
 #include "lists/CETemplate.h"
 #include "settings/CIMensagens.h"
 
@@ -178,6 +179,17 @@ struct CCDataReader::FiosDoLayer {
     // in the few arrays of its page, not in a table of every wire read.
     std::vector<std::pair<OdDbObjectId, CEPonto>> primeiros;
 
+    // The polyline whose vertices were appended from `antes` on: a wire of two or more.
+    void Fecha(const OdDbObjectId& fio, std::size_t antes) {
+        if (pontos.size() > antes) primeiros.emplace_back(fio, pontos[antes]);
+        if (pontos.size() < antes + 2) {
+            pontos.resize(antes);
+            return;
+        }
+        fios.push_back(fio);
+        inicios.push_back(std::uint32_t(pontos.size()));
+    }
+
     std::size_t Celula(double v, double origem, std::size_t n) const {
         const double c = std::floor((v - origem) / passo);
         if (!(c > 0)) return 0;
@@ -200,6 +212,25 @@ struct CCDataReader::FiosDoLayer {
     }
 };
 
+// Takes a layer's wires with their vertices, as the host hands them over, into its index,
+// and their handles for a later reading of the layer.
+class CCDataReader::ReceptorFios final : public zvsdk::PolylineReceiver {
+public:
+    ReceptorFios(FiosDoLayer& fios, std::vector<std::uint64_t>& handles)
+        : fios_(fios), handles_(handles) {}
+    void polyline(std::uint64_t handle, const double* xyz, std::size_t n) override {
+        handles_.push_back(handle);
+        const std::size_t antes = fios_.pontos.size();
+        for (std::size_t i = 0; i < n; ++i)
+            fios_.pontos.push_back({xyz[3 * i], xyz[3 * i + 1], xyz[3 * i + 2]});
+        fios_.Fecha(CICad::IdDoHandleNumero(handle), antes);
+    }
+
+private:
+    FiosDoLayer& fios_;
+    std::vector<std::uint64_t>& handles_;
+};
+
 const CCDataReader::FiosDoLayer& CCDataReader::IndiceFios(const QString& layer) {
     if (indiceAtual_ && versaoIndices_ == CICad::VersaoDesenho() && layer == layerIndice_)
         return *indiceAtual_;
@@ -218,32 +249,36 @@ const CCDataReader::FiosDoLayer& CCDataReader::LeIndiceFios(const QString& layer
     std::unique_ptr<FiosDoLayer>& indice = indicesFios_[layer];
     if (indice) return *indice;
     indice = std::make_unique<FiosDoLayer>();
+    FiosDoLayer& f = *indice;
     auto it = fiosPorLayer_.constFind(layer);
     if (it == fiosPorLayer_.constEnd()) {
-        // The answer's handles as numbers: each opens its wire without a text kept for it.
+        // The host hands the wires over with the vertices it read of them, if it can.
         std::vector<std::uint64_t> handles;
+        ReceptorFios receptor(f, handles);
+        if (CICad::zvInvokePolilinhas("getFiosPorLayer", layer, receptor)) {
+            fiosPorLayer_.insert(layer, std::move(handles));
+            return FechaIndiceFios(f);
+        }
+        // The answer's handles as numbers: each opens its wire without a text kept for it.
         ResultBuffer* resposta = CICad::zvInvokeLista("getFiosPorLayer", {layer});
         for (const ResultBuffer* no = resposta; no; no = no->rbnext)
             if (no->restype == zvsdk::RTSTR) handles.push_back(ZVString(no->rstring).ParaHandle());
         CICad::LiberaLista(resposta);
         it = fiosPorLayer_.insert(layer, std::move(handles));
     }
-    FiosDoLayer& f = *indice;
     // The layer's name as the drawing holds it: each wire's is compared without a copy.
     const QByteArray nomeLayer = layer.toUtf8();
     const std::string_view nome(nomeLayer.constData(), std::size_t(nomeLayer.size()));
     for (const std::uint64_t handle : *it) {
         const OdDbObjectId fio = CICad::IdDoHandleNumero(handle);
         const std::size_t antes = f.pontos.size();
-        const std::size_t vertices = CICad::AcrescentaVertices(fio, nome, f.pontos);
-        if (vertices > 0) f.primeiros.emplace_back(fio, f.pontos[antes]);
-        if (vertices < 2) {
-            f.pontos.resize(antes);
-            continue;
-        }
-        f.fios.push_back(fio);
-        f.inicios.push_back(std::uint32_t(f.pontos.size()));
+        CICad::AcrescentaVertices(fio, nome, f.pontos);
+        f.Fecha(fio, antes);
     }
+    return FechaIndiceFios(f);
+}
+
+CCDataReader::FiosDoLayer& CCDataReader::FechaIndiceFios(FiosDoLayer& f) {
     // The answer gives them in handle order, most often.
     const auto porHandle = [](const auto& a, const auto& b) {
         return a.first.handle() < b.first.handle();

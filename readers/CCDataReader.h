@@ -238,6 +238,9 @@ private:
     struct FiosDoLayer;
     const FiosDoLayer& IndiceFios(const QString& layer);
     const FiosDoLayer& LeIndiceFios(const QString& layer);
+    // The grid of the wires read into the index.
+    FiosDoLayer& FechaIndiceFios(FiosDoLayer& f);
+    class ReceptorFios;
     // The index asked for last and its layer: a terminal's sides ask for one layer in turn.
     QString layerIndice_;
     const FiosDoLayer* indiceAtual_ = nullptr;

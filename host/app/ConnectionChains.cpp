@@ -153,12 +153,33 @@ void ConnectionChains::install(DocumentLisp& lisp, const zvproduct::ProductConte
             *chain = handleChain(handles);
             return true;
         });
+    // The same with each polyline's vertices, which the reader reads next.
+    lisp.addPolylineAnswer(
+        "getFiosPorLayer", [context, answers](zvlisp::Interpreter&, const QString& layer,
+                                              zvsdk::PolylineReceiver& receiver) {
+            zvdb::Database* database = context.database ? context.database() : nullptr;
+            if (!database) return false;
+            std::vector<double> xyz;
+            answers->wireLayersOf(*database).eachOn(
+                *database, layer.toStdString(),
+                [&](std::uint64_t handle, std::span<const zvdb::Point3> points) {
+                    xyz.clear();
+                    for (const zvdb::Point3& p : points)
+                        xyz.insert(xyz.end(), {p.x, p.y, p.z});
+                    receiver.polyline(handle, xyz.data(), points.size());
+                });
+            return true;
+        });
     // A reader asks for the cables right after the wires or not at all: a call of anything
     // else lets the kept index go, so that it does not weigh on the rest of the run.
-    lisp.addInvokeListener([answers](const QString& function) {
+    // The wires' vertices serve the pages read after them while the drawing stays the same.
+    lisp.addInvokeListener([answers, context](const QString& function) {
         if (answers->keepsIndex() && function != QLatin1String("getConexoesTodosFios") &&
             function != QLatin1String("getConexoesTodosCabos"))
             answers->release();
+        if (!answers->wireLayers().holdsVertices()) return;
+        zvdb::Database* database = context.database ? context.database() : nullptr;
+        if (database) answers->wireLayers().releaseStaleVertices(*database);
     });
 }
 

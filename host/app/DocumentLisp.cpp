@@ -240,13 +240,19 @@ zvsdk::ResultBuffer* DocumentLisp::lispInvoke(const zvsdk::ResultBuffer* call) {
 void DocumentLisp::addChainAnswer(const QString& function, ChainAnswer answer) {
     zvlisp::Symbol* symbol = lisp_.intern(function);
     ChainSource& source = chainAnswers_[function];
-    source = {symbol, symbol->value, std::move(answer), {}, std::move(source.connections)};
+    source = {symbol,
+              symbol->value,
+              std::move(answer),
+              {},
+              std::move(source.connections),
+              std::move(source.polylines)};
 }
 
 void DocumentLisp::addConnectionAnswer(const QString& function, ConnectionAnswer answer) {
     zvlisp::Symbol* symbol = lisp_.intern(function);
     ChainSource& source = chainAnswers_[function];
-    source = {symbol, symbol->value, std::move(source.answer), {}, std::move(answer)};
+    source = {symbol, symbol->value,     std::move(source.answer),
+              {},     std::move(answer), std::move(source.polylines)};
 }
 
 int DocumentLisp::lispInvokeConnections(const QString& function,
@@ -259,6 +265,33 @@ int DocumentLisp::lispInvokeConnections(const QString& function,
         listener(function);
     try {
         return source->connections(lisp_, receiver) ? zvsdk::RTNORM : zvsdk::RTNONE;
+    } catch (zvlisp::LispError& error) {
+        if (!error.handled) lisp_.report(error);
+        return zvsdk::RTERROR;
+    }
+}
+
+void DocumentLisp::addPolylineAnswer(const QString& function, PolylineAnswer answer) {
+    zvlisp::Symbol* symbol = lisp_.intern(function);
+    ChainSource& source = chainAnswers_[function];
+    source = {symbol,
+              symbol->value,
+              std::move(source.answer),
+              std::move(source.call),
+              std::move(source.connections),
+              std::move(answer)};
+}
+
+int DocumentLisp::lispInvokePolylines(const QString& function, const QString& argument,
+                                      zvsdk::PolylineReceiver& receiver) {
+    const ChainSource* source = sourceOf(function);
+    if (!source || !source->polylines) return zvsdk::RTNONE;
+    // what lispInvoke does before any call
+    if (interruptRequested()) return zvsdk::RTERROR;
+    for (const InvokeListener& listener : invokeListeners_)
+        listener(function);
+    try {
+        return source->polylines(lisp_, argument, receiver) ? zvsdk::RTNORM : zvsdk::RTNONE;
     } catch (zvlisp::LispError& error) {
         if (!error.handled) lisp_.report(error);
         return zvsdk::RTERROR;
@@ -279,7 +312,8 @@ void DocumentLisp::addInvokeListener(InvokeListener listener) {
 
 void DocumentLisp::addChainCall(const QString& function, ChainCall call) {
     zvlisp::Symbol* symbol = lisp_.intern(function);
-    chainAnswers_.insert(function, {symbol, symbol->value, {}, std::move(call), {}});
+    ChainSource& source = chainAnswers_[function];
+    source = {symbol, symbol->value, {}, std::move(call), {}, std::move(source.polylines)};
 }
 
 bool DocumentLisp::answerAsChain(const zvsdk::ResultBuffer* call, zvsdk::ResultBuffer** chain) {

@@ -61,6 +61,13 @@ public:
     void addConnectionAnswer(const QString& function, ConnectionAnswer answer);
     int lispInvokeConnections(const QString& function,
                               zvsdk::ConnectionReceiver& receiver) override;
+    // The same for a function of one text argument that answers polyline handles (see
+    // lispInvokePolylines): the handles must be those of the chain the function would give.
+    using PolylineAnswer = std::function<bool(zvlisp::Interpreter&, const QString& argument,
+                                              zvsdk::PolylineReceiver& receiver)>;
+    void addPolylineAnswer(const QString& function, PolylineAnswer answer);
+    int lispInvokePolylines(const QString& function, const QString& argument,
+                            zvsdk::PolylineReceiver& receiver) override;
     // Told the name of every function the module calls, before the call.
     using InvokeListener = std::function<void(const QString& function)>;
     void addInvokeListener(InvokeListener listener);
@@ -72,6 +79,7 @@ private:
         ChainAnswer answer;
         ChainCall call;
         ConnectionAnswer connections;
+        PolylineAnswer polylines;
     };
     // The source of a function's answers while its symbol holds the function it held when
     // the source was added; null otherwise.

@@ -17,8 +17,12 @@ auto ConnectionAnswers::withFinder(zvdb::Database& database, double tolerance, b
     if (fresh) {
         finder.reset();  // before the new one is built: one index at a time
         finder = std::make_unique<ConnectionFinder>(database, tolerance);
-        if (!wireLayers_.current(database))
-            wireLayers_.adopt(database, finder->wiresAndLeadsByLayer());
+        if (!wireLayers_.current(database)) {
+            // The readers read the wires' vertices page by page next: the walk's serve them.
+            WireLayerIndex::VerticesByLayer vertices;
+            WireLayerIndex::ByLayer byLayer = finder->wiresAndLeadsByLayer(&vertices);
+            wireLayers_.adopt(database, std::move(byLayer), std::move(vertices));
+        }
         if (!wireList_.current(database)) wireList_.adopt(database, finder->wireLinesInPageOrder());
     }
     auto asked = ask(*finder);

@@ -295,22 +295,38 @@ ConnectionFinder::ConnectionFinder(zvdb::Database& database, double tolerance)
     sortLines();
 }
 
-std::unordered_map<std::string, std::vector<std::uint64_t>> ConnectionFinder::wiresAndLeadsByLayer()
-    const {
-    std::vector<std::vector<std::uint64_t>> byId(layers_.size());
+std::unordered_map<std::string, std::vector<std::uint64_t>> ConnectionFinder::wiresAndLeadsByLayer(
+    std::unordered_map<std::string, LayerVertices>* vertices) const {
+    std::vector<std::vector<const Line*>> byId(layers_.size());
     for (const std::vector<Line>* lines : {&wireLines_, &leadLines_})
         for (const Line& line : *lines)
-            byId[static_cast<std::size_t>(line.layer)].push_back(line.handle);
+            byId[static_cast<std::size_t>(line.layer)].push_back(&line);
+    const auto byHandle = [](const Line* a, const Line* b) { return a->handle < b->handle; };
+    const auto sameHandle = [](const Line* a, const Line* b) { return a->handle == b->handle; };
     std::unordered_map<std::string, std::vector<std::uint64_t>> byLayer;
     for (const auto& [name, id] : layers_) {
-        std::vector<std::uint64_t>& handles = byId[static_cast<std::size_t>(id)];
-        if (handles.empty()) continue;
+        std::vector<const Line*>& lines = byId[static_cast<std::size_t>(id)];
+        if (lines.empty()) continue;
         // A polyline that is both a wire and a lead came in both lists.
-        std::sort(handles.begin(), handles.end());
-        handles.erase(std::unique(handles.begin(), handles.end()), handles.end());
-        byLayer.emplace(std::string(name), std::move(handles));
+        std::sort(lines.begin(), lines.end(), byHandle);
+        lines.erase(std::unique(lines.begin(), lines.end(), sameHandle), lines.end());
+        std::vector<std::uint64_t>& handles = byLayer[std::string(name)];
+        handles.reserve(lines.size());
+        for (const Line* line : lines)
+            handles.push_back(line->handle);
+        if (vertices) addVertices(lines, (*vertices)[std::string(name)]);
     }
     return byLayer;
+}
+
+void ConnectionFinder::addVertices(std::span<const Line* const> lines, LayerVertices& out) const {
+    out.points = vertices_;
+    out.starts.reserve(lines.size());
+    out.counts.reserve(lines.size());
+    for (const Line* line : lines) {
+        out.starts.push_back(line->firstVertex);
+        out.counts.push_back(line->vertexCount);
+    }
 }
 
 std::vector<WireLine> ConnectionFinder::wireLinesInPageOrder() const {
@@ -337,9 +353,13 @@ std::uint64_t ConnectionFinder::cellKey(long long x, long long y) const {
 
 void ConnectionFinder::addSpot(std::uint32_t symbol, std::int32_t layer, const zvdb::Point3& p,
                                std::string_view connection) {
+    spots_.push_back({p, connection, symbol, layer});
+}
+
+std::uint64_t ConnectionFinder::cellOf(const zvdb::Point3& p) const {
     const auto cx = static_cast<long long>(std::floor(p.x / cell_));
     const auto cy = static_cast<long long>(std::floor(p.y / cell_));
-    spots_.push_back({cellKey(cx, cy), p, connection, symbol, layer});
+    return cellKey(cx, cy);
 }
 
 // The symbols (KVR_ZV or KVR_ZV_EQUIPO references) and the polylines of the wires, the
@@ -352,7 +372,7 @@ void ConnectionFinder::readModelSpace() {
     symbols_.reserve(entities / 2);
     spots_.reserve(entities);
     // about one vertex an entity: the lines have two or three, and most entities are symbols
-    vertices_.reserve(entities);
+    vertices_->reserve(entities);
     database_.modelSpace()->forEachEntity([this](zvdb::Entity& entity) {
         const Roles roles(entity);
         // no kind of reference or polyline derives from their classes: the type tells them
@@ -375,9 +395,9 @@ void ConnectionFinder::readModelSpace() {
 // A polyline of the roles given, with its vertices.
 void ConnectionFinder::addLine(zvdb::Polyline& polyline, std::size_t xdata, bool wire, bool lead,
                                bool blind, std::string_view number) {
-    const auto firstVertex = static_cast<std::uint32_t>(vertices_.size());
-    const std::int32_t layer = layerId(appendVertices(polyline, xdata, vertices_));
-    const auto vertexCount = static_cast<std::uint32_t>(vertices_.size() - firstVertex);
+    const auto firstVertex = static_cast<std::uint32_t>(vertices_->size());
+    const std::int32_t layer = layerId(appendVertices(polyline, xdata, *vertices_));
+    const auto vertexCount = static_cast<std::uint32_t>(vertices_->size() - firstVertex);
     Line line{&polyline, polyline.handle(), 0, layer, {}, firstVertex, vertexCount};
     if (wire) {
         line.number = number;
@@ -389,7 +409,7 @@ void ConnectionFinder::addLine(zvdb::Polyline& polyline, std::size_t xdata, bool
 }
 
 std::span<const zvdb::Point3> ConnectionFinder::verticesOf(const Line& line) const {
-    return {vertices_.data() + line.firstVertex, line.vertexCount};
+    return {vertices_->data() + line.firstVertex, line.vertexCount};
 }
 
 // A project symbol gives its connection attributes' text positions, its insertion point and
@@ -495,12 +515,13 @@ void ConnectionFinder::buildGrid() {
     std::vector<std::uint32_t> slots(spots_.size());
     for (std::size_t i = 0; i < spots_.size(); ++i) {
         const Spot& spot = spots_[i];
+        const std::uint64_t cell = cellOf(spot.point);
         const LayerCells& table = layerCells_[static_cast<std::size_t>(spot.layer)];
-        std::size_t slot = slotOf(spot.cell) & table.mask;
-        while (grid_[table.first + slot].end != 0 && grid_[table.first + slot].cell != spot.cell)
+        std::size_t slot = slotOf(cell) & table.mask;
+        while (grid_[table.first + slot].end != 0 && grid_[table.first + slot].cell != cell)
             slot = (slot + 1) & table.mask;
         CellRun& run = grid_[table.first + slot];
-        run.cell = spot.cell;
+        run.cell = cell;
         ++run.end;
         slots[i] = static_cast<std::uint32_t>(table.first + slot);
     }

@@ -10,6 +10,7 @@
 #include "drawing/Geometry.h"
 
 #include <cstdint>
+#include <memory>
 #include <span>
 #include <string>
 #include <string_view>
@@ -43,6 +44,17 @@ struct WireLine {
     std::uint64_t handle = 0;
     std::string_view number, layer;
     bool operator==(const WireLine&) const = default;
+};
+
+// The vertices of a layer's polylines, in the order of its handles: polyline k's are
+// counts[k] from points[starts[k]] on, as Polyline::vertices gives them.
+struct LayerVertices {
+    std::shared_ptr<const std::vector<zvdb::Point3>> points;  // the walk's, shared
+    std::vector<std::uint32_t> starts, counts;
+
+    std::span<const zvdb::Point3> of(std::size_t k) const {
+        return {points->data() + starts[k], counts[k]};
+    }
 };
 
 class ConnectionFinder;
@@ -79,7 +91,9 @@ public:
     double tolerance() const { return tolerance_; }
     // The wire and lead polylines (KVR_ZV_WIRE or KVR_ZV_CABO) of each layer, each once, in
     // handle order: what the walk above saw, for those who ask by layer.
-    std::unordered_map<std::string, std::vector<std::uint64_t>> wiresAndLeadsByLayer() const;
+    // With `vertices`, their vertices by layer too, from the walk's.
+    std::unordered_map<std::string, std::vector<std::uint64_t>> wiresAndLeadsByLayer(
+        std::unordered_map<std::string, LayerVertices>* vertices = nullptr) const;
     // The KVR_ZV_WIRE polylines as polylinesInPageOrder gives them, with their numbers as
     // wireNumber reads them: what the walk above saw, for the lists of wires.
     std::vector<WireLine> wireLinesInPageOrder() const;
@@ -103,8 +117,8 @@ private:
         std::uint64_t handle;
         std::string_view block;
     };
+    // Its cell is worked out from its point where the grid is built, not kept with it.
     struct Spot {
-        std::uint64_t cell;
         zvdb::Point3 point;
         std::string_view connection;  // in the drawing's storage: the spots sort cheaply
         std::uint32_t symbol;
@@ -145,9 +159,12 @@ private:
     void addLine(zvdb::Polyline& polyline, std::size_t xdata, bool wire, bool lead, bool blind,
                  std::string_view number);
     std::span<const zvdb::Point3> verticesOf(const Line& line) const;
+    // The places of the lines' vertices appended to `out`, in their order.
+    void addVertices(std::span<const Line* const> lines, LayerVertices& out) const;
     void addSpot(std::uint32_t symbol, std::int32_t layer, const zvdb::Point3& p,
                  std::string_view connection);
     std::uint64_t cellKey(long long x, long long y) const;
+    std::uint64_t cellOf(const zvdb::Point3& p) const;
     static std::size_t slotOf(std::uint64_t cell);
     const CellRun* run(std::int32_t layer, std::uint64_t cell) const;
     void buildGrid();
@@ -175,8 +192,10 @@ private:
     std::vector<CellRun> grid_;
     std::vector<LayerCells> layerCells_;  // by layer id
     std::vector<Line> wireLines_, leadLines_, blindLines_;
-    // The lines' vertices, read on the walk while their tags are at hand.
-    std::vector<zvdb::Point3> vertices_;
+    // The lines' vertices, read on the walk while their tags are at hand; shared with the
+    // index of the wires by layer, which outlives the finder.
+    std::shared_ptr<std::vector<zvdb::Point3>> vertices_ =
+        std::make_shared<std::vector<zvdb::Point3>>();
 };
 
 inline Touch ConnectionTable::touch(std::size_t k) const {

@@ -80,4 +80,8 @@ int LispInterface::lispInvokeConnections(const QString&, ConnectionReceiver&) {
     return RTNONE;
 }
 
+int LispInterface::lispInvokePolylines(const QString&, const QString&, PolylineReceiver&) {
+    return RTNONE;
+}
+
 }  // namespace zvsdk

@@ -28,6 +28,16 @@ public:
                              std::string_view block, double x, double y, double z);
 };
 
+// Takes an answer of polyline handles, as a host hands it over with the vertices it has of
+// each (see LispInterface::lispInvokePolylines).
+class PolylineReceiver {
+public:
+    virtual ~PolylineReceiver() = default;
+    // A polyline of the answer, in its order, with its `count` vertices as the drawing holds
+    // them: x, y and z of each in turn in `xyz`.
+    virtual void polyline(std::uint64_t handle, const double* xyz, std::size_t count) = 0;
+};
+
 class LispInterface {
 public:
     virtual ~LispInterface() = default;
@@ -58,6 +68,11 @@ public:
     // lispInvoke's null), RTNONE when the host does not answer the function so (the caller
     // asks lispInvoke). The default answers RTNONE.
     virtual int lispInvokeConnections(const QString& function, ConnectionReceiver& receiver);
+    // The same for a function of one text argument that answers polyline handles (such as
+    // getFiosPorLayer): each goes to `receiver` with its vertices, which a reader would read
+    // next. The default answers RTNONE.
+    virtual int lispInvokePolylines(const QString& function, const QString& argument,
+                                    PolylineReceiver& receiver);
 };
 
 }  // namespace zvsdk

@@ -6,8 +6,10 @@
 #include "app/ConnectionChains.h"
 #include "app/DocumentLisp.h"
 #include "app/LispChains.h"
+#include "drawing/BlockRecord.h"
 #include "drawing/Database.h"
 #include "drawing/LayerRecord.h"
+#include "drawing/Polyline.h"
 #include "product/ConnectionAnswers.h"
 #include "product/ProductContext.h"
 #include "product/ProductLisp.h"
@@ -177,6 +179,82 @@ TEST_F(ConnectionChainsTest, APagesWiresAreTheNodesOfTheLispAnswer) {
     EXPECT_EQ(lisp().lispInvoke(numberCall.head), nullptr);  // the LISP error: no answer
 }
 
+// Writes each polyline it is given with its vertices, one line each.
+class PolylineRecorder : public zvsdk::PolylineReceiver {
+public:
+    void polyline(std::uint64_t handle, const double* xyz, std::size_t count) override {
+        text += std::to_string(handle);
+        for (std::size_t i = 0; i < 3 * count; ++i)
+            text += ' ' + std::to_string(xyz[i]);
+        text += '\n';
+    }
+    std::string text;
+};
+
+// A page's wires with their vertices, as the reader reads them next: the polylines of the
+// chain's handles, in its order, each with the vertices the drawing holds as it stands.
+TEST_F(ConnectionChainsTest, APagesWiresWithTheirVerticesAreTheChainsPolylinesAsTheyStand) {
+    zvdb::Database& database = *project->database();
+    const auto asTheyStand = [&](const std::string& layer) {
+        Chain call(zvsdk::newString("getFiosPorLayer"));
+        call.head->rbnext = zvsdk::newString(QString::fromStdString(layer));
+        Chain chain(lisp().lispInvoke(call.head));
+        PolylineRecorder expected;
+        for (const ResultBuffer* node = chain.head; node; node = node->rbnext) {
+            if (node->restype != zvsdk::RTSTR) continue;
+            const std::uint64_t handle = node->rstring.toULongLong(nullptr, 16);
+            auto* polyline = dynamic_cast<zvdb::Polyline*>(database.objectByHandle(handle));
+            std::vector<double> xyz;
+            for (const zvdb::Point3& p : polyline->vertices())
+                xyz.insert(xyz.end(), {p.x, p.y, p.z});
+            expected.polyline(handle, xyz.data(), xyz.size() / 3);
+        }
+        return expected.text;
+    };
+    const auto given = [&](const std::string& layer) {
+        PolylineRecorder recorder;
+        EXPECT_EQ(
+            lisp().lispInvokePolylines("getFiosPorLayer", QString::fromStdString(layer), recorder),
+            zvsdk::RTNORM);
+        return recorder.text;
+    };
+    std::vector<std::string> layers{"NO SUCH LAYER"};
+    for (zvdb::LayerRecord* layer : database.layers())
+        layers.emplace_back(layer->name());
+    // from the connections' walk, and from a walk of its own
+    std::string page;
+    for (const bool fromConnections : {true, false}) {
+        if (fromConnections) invoked("getConexoesTodosFios");
+        int withWires = 0;
+        for (const std::string& layer : layers) {
+            const std::string wires = given(layer);
+            EXPECT_EQ(wires, asTheyStand(layer)) << layer;
+            withWires += !wires.empty();
+            if (!wires.empty()) page = layer;
+        }
+        EXPECT_GT(withWires, 3);
+        lisp().interpreter().evalText("(entmod (entget (entlast)))");
+    }
+    // a LISP edit moves a vertex of a wire the connections' walk read
+    invoked("getConexoesTodosFios");
+    const std::string before = given(page);
+    EXPECT_EQ(given(page), before);  // asked again, read from the drawing
+    const std::string first = before.substr(0, before.find(' '));
+    lisp().interpreter().evalText(QString("(setq d (entget (handent \"%1\")))"
+                                          "(entmod (subst (list 10 -7.25 3.5) (assoc 10 d) d))")
+                                      .arg(QString::number(std::stoull(first), 16).toUpper()));
+    const std::string after = given(page);
+    EXPECT_EQ(after, asTheyStand(page));
+    EXPECT_NE(after, before);
+    EXPECT_NE(after.find(first + " -7.250000 3.500000"), std::string::npos);
+    // a user's defun takes over: no answer this way
+    lisp().interpreter().evalText("(defun getFiosPorLayer (layer) nil)");
+    PolylineRecorder taken;
+    EXPECT_EQ(lisp().lispInvokePolylines("getFiosPorLayer", QString::fromStdString(page), taken),
+              zvsdk::RTNONE);
+    EXPECT_EQ(taken.text, "");
+}
+
 TEST(ConnectionChainTexts, NamesOutsideAsciiAreReadAsUtf8) {
     const std::string number =
         "F\xC3\x87"
@@ -252,6 +330,17 @@ TEST(ConnectionChainIndex, KeptForTheCablesRightAfterTheWiresAndLetGoAtAnyOtherC
     EXPECT_TRUE(answers->keepsIndex());
     invoke("getFiosPorLayer", "ESQ$0001$A");
     EXPECT_FALSE(answers->keepsIndex());
+    // the wires' vertices are held for the pages while the drawing stays as it was read
+    EXPECT_TRUE(answers->wireLayers().holdsVertices());
+    invoke("NO SUCH FUNCTION");
+    EXPECT_TRUE(answers->wireLayers().holdsVertices());
+    for (zvdb::Entity* entity : drawing->modelSpace()->entities())
+        if (auto* polyline = dynamic_cast<zvdb::Polyline*>(entity)) {
+            polyline->setVertices(polyline->vertices());
+            break;
+        }
+    invoke("NO SUCH FUNCTION");
+    EXPECT_FALSE(answers->wireLayers().holdsVertices());
 }
 
 TEST(ResultBufferBlocks, BlocksGoWithTheirLastNodeInAnyOrderAndFromAnyThread) {

@@ -266,6 +266,24 @@ TEST_F(ConnectionQueriesTest, AWireVertexMovedInLispIsSeenByTheNextQuestion) {
     EXPECT_TRUE(r->FioNoPonto(layer, {50, 100, 0}).isNull());
 }
 
+// The host hands a page's wires over with the vertices its connection walk read: a reader
+// made after an edit, with the connections read again, sees the wire where it went.
+TEST_F(ConnectionQueriesTest, AWireMovedInLispAfterTheConnectionsWereReadIsSeenWhereItWent) {
+    const zvdb::Polyline* w = fio({{0, 100, 0}, {100, 100, 0}}, "1");
+    const QString layer = QString::fromStdString(kPagina);
+    CICad::LiberaLista(CICad::zvInvokeLista("getConexoesTodosFios"));
+    auto r = leitor(0.5);
+    EXPECT_EQ(r->FioNoPonto(layer, {50, 100, 0}), id(w));
+    EXPECT_TRUE(r->FioNoPonto(layer, {50, 200, 0}).isNull());
+    ASSERT_TRUE(documento_->lisp()->lispEvaluate("(entmod (list (cons -1 (handent \"" + handle(w) +
+                                                 "\")) '(10 0.0 300.0)))"));
+    EXPECT_EQ(r->FioNoPonto(layer, {50, 200, 0}), id(w));
+    CICad::LiberaLista(CICad::zvInvokeLista("getConexoesTodosFios"));
+    auto depois = leitor(0.5);
+    EXPECT_EQ(depois->FioNoPonto(layer, {50, 200, 0}), id(w));
+    EXPECT_TRUE(depois->FioNoPonto(layer, {50, 100, 0}).isNull());
+}
+
 // A wire's position comes from its first vertex, also after the wire moved.
 TEST_F(ConnectionQueriesTest, AWirePositionFollowsItsFirstVertex) {
     ASSERT_TRUE(documento_->lisp()->lispEvaluate(
