@@ -85,6 +85,10 @@ VetorItens* CCMaterialDataReader::LerDados(zvdb::Database* database,
     vistos_.clear();
     relacoes_.clear();
     conectores_.clear();
+    // A wire's copies ask for what was read for it just before, and nothing later asks
+    // again: a few readings kept are enough (the exports, which read wires' ends all over,
+    // keep theirs).
+    LimitaEntidadesGuardadas(2048);
     progresso.Definir(10);
     simbolos_ = LeSimbolos(modelo);
     // Accessories are expanded from what each symbol's reading kept.
@@ -288,13 +292,13 @@ void CCMaterialDataReader::LeFios(zvdb::Database* database,
         }
         CICad::LiberaLista(lista);
     }
-    std::vector<std::unique_ptr<CEItemLista>> itens;
-    for (const OdDbObjectId& fio : fios)
-        itens.emplace_back(CriaItemFio(fio, modelo));
     static const QString kIni = QStringLiteral("_INI"), kFim = QStringLiteral("_FIM");
     const std::uint32_t campoLista = NumeroCampo<"WIRE_LISTA">();
     QSet<QString> nomes;
-    for (std::unique_ptr<CEItemLista>& item : itens) {
+    // Each wire is made and copied in one go: the readings its copies take were made
+    // just before, and a wire not kept goes at once.
+    for (const OdDbObjectId& fio : fios) {
+        std::unique_ptr<CEItemLista> item(CriaItemFio(fio, modelo));
         if (!item) continue;
         const QString* lista = item->campos.procura(campoLista);
         const bool listado = lista && *lista == QLatin1String("S");

@@ -6,6 +6,10 @@
 #include "module/CIProgress.h"
 #include "readers/CCMaterialDataReader.h"
 
+#include <functional>
+#include <string>
+#include <vector>
+
 namespace {
 
 class MaterialWiresTest : public FioFixture {
@@ -94,6 +98,56 @@ TEST_F(MaterialWiresTest, NoReadingOfAWireOutlivesTheRead) {
     EXPECT_EQ(lidos->at(0)->valorCampo("MARCA_FIM"), "B");
     EXPECT_FALSE(leitor.LeituraGuardada(id(a)));
     EXPECT_FALSE(leitor.LeituraGuardada(id(b)));
+    lidos->destruirItens();
+}
+
+// Notes, as each wire's item is made, which polylines of the wires before it are still kept
+// read.
+class LeitorQueOlha : public CCMaterialDataReader {
+public:
+    std::function<void(const OdDbObjectId&)> aoCriar;
+    void LerLadoIni(CEItemLista& item, const OdDbObjectId& fio, CETemplate& modelo) override {
+        if (aoCriar) aoCriar(fio);
+        CCMaterialDataReader::LerLadoIni(item, fio, modelo);
+    }
+};
+
+TEST_F(MaterialWiresTest, AWiresStretchesAreReadBeforeTheNextWireAndFewReadingsAreKept) {
+    // Enough wires of two stretches that the kept readings turn over more than once.
+    const int n = 2600;
+    std::vector<const zvdb::Polyline*> primeiros, segundos;
+    for (int f = 0; f < n; ++f) {
+        const std::string nome = "FIO\f" + std::to_string(f);
+        const std::string marca = "MARCA\f" + std::to_string(f);
+        primeiros.push_back(trecho(10 + f, {nome, marca + "a"}));
+        segundos.push_back(trecho(10 + f, {nome, marca + "b"}, kPagina2));
+    }
+    LeitorQueOlha leitor;
+    int criados = 0, anteriorLido = 0;
+    leitor.aoCriar = [&](const OdDbObjectId&) {
+        // The wire before this one was copied in full already: its second stretch is read.
+        if (criados > 0 && leitor.LeituraGuardada(id(segundos[std::size_t(criados - 1)])))
+            ++anteriorLido;
+        if (criados == n - 1) {
+            EXPECT_FALSE(leitor.LeituraGuardada(id(primeiros.front())));
+            EXPECT_FALSE(leitor.LeituraGuardada(id(segundos.front())));
+        }
+        ++criados;
+    };
+    CIProgress progresso;
+    std::unique_ptr<VetorItens> lidos(leitor.LerDados(&db(), std::nullopt, modelo_, progresso));
+    EXPECT_EQ(criados, n);
+    EXPECT_EQ(anteriorLido, n - 1);
+    // Every wire still joins its own two stretches, though their readings went since.
+    std::size_t trechos = 0;
+    for (CEItemLista* item : *lidos)
+        for (CEItemLista* m = item; m; m = m->ligado) {
+            const QString inicio = m->valorCampo("MARCA_INI");
+            EXPECT_TRUE(inicio.endsWith('a')) << inicio.toStdString();
+            EXPECT_EQ(m->valorCampo("MARCA_FIM"), inicio.chopped(1) + "b");
+            ++trechos;
+        }
+    EXPECT_EQ(trechos, std::size_t(n));
     lidos->destruirItens();
 }
 
