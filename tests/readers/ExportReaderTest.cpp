@@ -10,6 +10,9 @@
 
 #include <QMap>
 
+#include <algorithm>
+#include <functional>
+
 namespace {
 
 class ExportReaderTest : public FioFixture {
@@ -447,6 +450,20 @@ protected:
             if (item.temCampo(nome)) campos.insert(nome, item.valorCampo(nome));
         return campos;
     }
+    // Two reads of one drawing give, item by item in the same order, the same fields; the
+    // terminals' sides of the second, sorted, each as `lado` puts it.
+    static QStringList mesmosItens(const VetorItens& a, const VetorItens& b,
+                                   const std::function<QString(const CEItemLista&)>& lado) {
+        EXPECT_EQ(a.size(), b.size());
+        QStringList vizinhos;
+        for (size_t i = 0; i < std::min(a.size(), b.size()); ++i) {
+            EXPECT_EQ(a[i]->campos.keys(), b[i]->campos.keys()) << i;
+            EXPECT_EQ(a[i]->campos.values(), b[i]->campos.values()) << i;
+            if (b[i]->valorCampo("ZV_LISTA_TIPO") == "BORNE") vizinhos << lado(*b[i]);
+        }
+        vizinhos.sort();
+        return vizinhos;
+    }
     // One wire runs from -K1 through both points of an equipment's terminal, 2 apart, to
     // -K2: the points alone are too close to tell apart, the connection names are not.
     void equipamento(bool comDados) {
@@ -547,19 +564,12 @@ TEST_F(ExportTerminalSidesTest, WiresAndTerminalsReadApartGiveTheSameSidesAndAre
     }
     EXPECT_TRUE(avulso.LeituraGuardada(id(k1_)));
     // Item by item, in the same order, the same fields.
-    ASSERT_EQ(guardados->size(), avulsos->size());
-    QStringList vizinhos;
-    for (size_t i = 0; i < guardados->size(); ++i) {
-        const CEItemLista& a = *(*guardados)[i];
-        const CEItemLista& b = *(*avulsos)[i];
-        EXPECT_EQ(a.campos.keys(), b.campos.keys());
-        EXPECT_EQ(a.campos.values(), b.campos.values());
-        if (b.valorCampo("ZV_LISTA_TIPO") == "BORNE")
-            vizinhos << b.valorCampo("NUMERO") + ">" + b.valorCampo("RELACAO_FIM") + "/" +
-                            b.valorCampo("FIO_SEGFIM");
-    }
-    vizinhos.sort();
-    EXPECT_EQ(vizinhos, QStringList({"1>X1:2/5", "2>X1:1/5"}));
+    EXPECT_EQ(mesmosItens(*guardados, *avulsos,
+                          [](const CEItemLista& b) -> QString {
+                              return b.valorCampo("NUMERO") + ">" + b.valorCampo("RELACAO_FIM") +
+                                     "/" + b.valorCampo("FIO_SEGFIM");
+                          }),
+              QStringList({"1>X1:2/5", "2>X1:1/5"}));
     guardados->destruirItens();
     avulsos->destruirItens();
 }
@@ -604,19 +614,12 @@ TEST_F(ExportTerminalSidesTest, ComponentsReadAgainForTheSidesGiveTheSameSidesAn
     EXPECT_FALSE(poucos.LeituraGuardada(id(k1_)));
     EXPECT_TRUE(poucos.LeituraGuardada(id(k3)));
     // Item by item, in the same order, the same fields.
-    ASSERT_EQ(inteiros->size(), relidos->size());
-    QStringList vizinhos;
-    for (size_t i = 0; i < inteiros->size(); ++i) {
-        const CEItemLista& a = *(*inteiros)[i];
-        const CEItemLista& b = *(*relidos)[i];
-        EXPECT_EQ(a.campos.keys(), b.campos.keys());
-        EXPECT_EQ(a.campos.values(), b.campos.values());
-        if (b.valorCampo("ZV_LISTA_TIPO") == "BORNE")
-            vizinhos << b.valorCampo("NUMERO") + ">" + b.valorCampo("RELACAO_INI") + "/" +
-                            b.valorCampo("FIO_SEGINI");
-    }
-    vizinhos.sort();
-    EXPECT_EQ(vizinhos, QStringList({"1>-K1:A1/1", "2>-K2:A1/2", "3>-K3:A1/3"}));
+    EXPECT_EQ(mesmosItens(*inteiros, *relidos,
+                          [](const CEItemLista& b) -> QString {
+                              return b.valorCampo("NUMERO") + ">" + b.valorCampo("RELACAO_INI") +
+                                     "/" + b.valorCampo("FIO_SEGINI");
+                          }),
+              QStringList({"1>-K1:A1/1", "2>-K2:A1/2", "3>-K3:A1/3"}));
     inteiros->destruirItens();
     relidos->destruirItens();
 }
@@ -691,19 +694,13 @@ TEST_F(ExportTerminalSidesTest, ASecondWalkOverKeptReadingsGivesTheSameSides) {
     EXPECT_TRUE(leitor.LeituraGuardada(OdDbObjectId(&db(), x1_->handle())));
     std::unique_ptr<VetorItens> segundos(leitor.Le(&db(), nullptr, true, std::nullopt));
     ASSERT_TRUE(segundos);
-    ASSERT_EQ(primeiros->size(), segundos->size());
-    QStringList vizinhos;
-    for (size_t i = 0; i < primeiros->size(); ++i) {
-        const CEItemLista& a = *(*primeiros)[i];
-        const CEItemLista& b = *(*segundos)[i];
-        EXPECT_EQ(a.campos.keys(), b.campos.keys());
-        EXPECT_EQ(a.campos.values(), b.campos.values());
-        if (b.valorCampo("ZV_LISTA_TIPO") == "BORNE")
-            vizinhos << b.valorCampo("NUMERO") + "<" + b.valorCampo("RELACAO_INI") + ">" +
-                            b.valorCampo("RELACAO_FIM") + "/" + b.valorCampo("FIO_SEGFIM");
-    }
-    vizinhos.sort();
-    EXPECT_EQ(vizinhos, QStringList({"1<-K1:A1>X1:2/5", "2<>X1:1/5"}));
+    EXPECT_EQ(mesmosItens(*primeiros, *segundos,
+                          [](const CEItemLista& b) -> QString {
+                              return b.valorCampo("NUMERO") + "<" + b.valorCampo("RELACAO_INI") +
+                                     ">" + b.valorCampo("RELACAO_FIM") + "/" +
+                                     b.valorCampo("FIO_SEGFIM");
+                          }),
+              QStringList({"1<-K1:A1>X1:2/5", "2<>X1:1/5"}));
     primeiros->destruirItens();
     segundos->destruirItens();
 }
