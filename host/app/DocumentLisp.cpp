@@ -255,20 +255,24 @@ void DocumentLisp::addConnectionAnswer(const QString& function, ConnectionAnswer
               {},     std::move(answer), std::move(source.polylines)};
 }
 
-int DocumentLisp::lispInvokeConnections(const QString& function,
-                                        zvsdk::ConnectionReceiver& receiver) {
-    const ChainSource* source = sourceOf(function);
-    if (!source || !source->connections) return zvsdk::RTNONE;
+int DocumentLisp::invokeHostAnswer(const QString& function, const std::function<bool()>& answer) {
     // what lispInvoke does before any call
     if (interruptRequested()) return zvsdk::RTERROR;
     for (const InvokeListener& listener : invokeListeners_)
         listener(function);
     try {
-        return source->connections(lisp_, receiver) ? zvsdk::RTNORM : zvsdk::RTNONE;
+        return answer() ? zvsdk::RTNORM : zvsdk::RTNONE;
     } catch (zvlisp::LispError& error) {
         if (!error.handled) lisp_.report(error);
         return zvsdk::RTERROR;
     }
+}
+
+int DocumentLisp::lispInvokeConnections(const QString& function,
+                                        zvsdk::ConnectionReceiver& receiver) {
+    const ChainSource* source = sourceOf(function);
+    if (!source || !source->connections) return zvsdk::RTNONE;
+    return invokeHostAnswer(function, [&] { return source->connections(lisp_, receiver); });
 }
 
 void DocumentLisp::addPolylineAnswer(const QString& function, PolylineAnswer answer) {
@@ -286,16 +290,7 @@ int DocumentLisp::lispInvokePolylines(const QString& function, const QString& ar
                                       zvsdk::PolylineReceiver& receiver) {
     const ChainSource* source = sourceOf(function);
     if (!source || !source->polylines) return zvsdk::RTNONE;
-    // what lispInvoke does before any call
-    if (interruptRequested()) return zvsdk::RTERROR;
-    for (const InvokeListener& listener : invokeListeners_)
-        listener(function);
-    try {
-        return source->polylines(lisp_, argument, receiver) ? zvsdk::RTNORM : zvsdk::RTNONE;
-    } catch (zvlisp::LispError& error) {
-        if (!error.handled) lisp_.report(error);
-        return zvsdk::RTERROR;
-    }
+    return invokeHostAnswer(function, [&] { return source->polylines(lisp_, argument, receiver); });
 }
 
 const DocumentLisp::ChainSource* DocumentLisp::sourceOf(const QString& function) const {

@@ -84,6 +84,9 @@ private:
     // The source of a function's answers while its symbol holds the function it held when
     // the source was added; null otherwise.
     const ChainSource* sourceOf(const QString& function) const;
+    // Runs a host's own answer to `function` as lispInvoke runs a call: interrupt first, the
+    // listeners told, an error reported; RTNONE when the answer declines.
+    int invokeHostAnswer(const QString& function, const std::function<bool()>& answer);
     // True when a chain answer took the call; `chain` is then its result.
     bool answerAsChain(const zvsdk::ResultBuffer* call, zvsdk::ResultBuffer** chain);
 
