@@ -1,8 +1,10 @@
 #pragma once
 // The objects of a drawing by handle. Handles are given out in sequence from 1, so most of
 // them index a plain table; the few far above the rest (files from other programs) go to a
-// hash map.
+// hash map. The table is kept in pages: objects added to a large drawing take new pages, and
+// the pages there are stay where they are, neither copied nor touched again.
 #include <cstdint>
+#include <memory>
 #include <unordered_map>
 #include <vector>
 
@@ -25,7 +27,11 @@ public:
     void swap(HandleIndex& other) noexcept;
 
 private:
-    std::vector<DbObject*> table_;
+    static constexpr int kPageBits = 12;
+    static constexpr std::uint64_t kPageSize = std::uint64_t(1) << kPageBits;
+    // Handles below this stand in the pages (those of no page yet go to one when added).
+    std::uint64_t tableLimit() const;
+    std::vector<std::unique_ptr<DbObject*[]>> pages_;
     std::unordered_map<std::uint64_t, DbObject*> far_;
     std::size_t count_ = 0;
     std::size_t expected_ = 0;
