@@ -10,11 +10,9 @@ constexpr std::size_t kSpread = 4;
 constexpr std::size_t kMinimumTable = 1 << 16;
 }  // namespace
 
-DbObject* HandleIndex::find(std::uint64_t handle) const {
-    const std::uint64_t page = handle >> kPageBits;
-    if (page < pages_.size() && pages_[page])
-        if (DbObject* object = pages_[page][handle & (kPageSize - 1)]) return object;
-    if (far_.empty()) return nullptr;
+DbObject* const HandleIndex::kNoPage[HandleIndex::kPageSize] = {};
+
+DbObject* HandleIndex::findFar(std::uint64_t handle) const {
     const auto it = far_.find(handle);
     return it == far_.end() ? nullptr : it->second;
 }
@@ -27,33 +25,40 @@ bool HandleIndex::emplace(std::uint64_t handle, DbObject* object) {
     if (handle == 0 || !object || contains(handle)) return false;
     ++count_;
     const std::uint64_t page = handle >> kPageBits;
-    if (page >= pages_.size() || !pages_[page]) {
+    if (page >= made_.size() || !made_[page]) {
         if (handle >= tableLimit()) {
             far_.emplace(handle, object);
             return true;
         }
-        if (page >= pages_.size()) pages_.resize(page + 1);
-        pages_[page] = std::make_unique<DbObject*[]>(kPageSize);
+        if (page >= made_.size()) {
+            made_.resize(page + 1);
+            pages_.resize(page + 1, kNoPage);
+        }
+        made_[page] = std::make_unique<DbObject*[]>(kPageSize);
+        pages_[page] = made_[page].get();
     }
-    pages_[page][handle & (kPageSize - 1)] = object;
+    made_[page][handle & (kPageSize - 1)] = object;
     return true;
 }
 
 void HandleIndex::reserve(std::size_t count) {
     expected_ = std::max(expected_, count);
-    pages_.reserve((count + count / 4) / kPageSize + 1);
+    const std::size_t pages = (count + count / 4) / kPageSize + 1;
+    pages_.reserve(pages);
+    made_.reserve(pages);
 }
 
 std::size_t HandleIndex::bytes() const {
     std::size_t pages = 0;
-    for (const auto& page : pages_)
+    for (const auto& page : made_)
         pages += page ? 1 : 0;
-    return pages * kPageSize * sizeof(DbObject*) + pages_.capacity() * sizeof(void*) +
+    return pages * kPageSize * sizeof(DbObject*) + 2 * pages_.capacity() * sizeof(void*) +
            far_.size() * 32 + far_.bucket_count() * sizeof(void*);
 }
 
 void HandleIndex::swap(HandleIndex& other) noexcept {
     pages_.swap(other.pages_);
+    made_.swap(other.made_);
     far_.swap(other.far_);
     std::swap(count_, other.count_);
     std::swap(expected_, other.expected_);
