@@ -110,7 +110,9 @@ void DxfLoader::run(std::string bytes) {
     for (const Tag& tag : db_.fileTags_)
         objects += tag.code == 0 ? 1 : 0;
     db_.byHandle_.reserve(objects);
-    db_.storage_.reserve(objects);
+    // Room for as many again: a command that adds objects (a list, a strip drawing) does not
+    // copy the whole array to a larger one, and room not written takes no memory.
+    db_.storage_.reserve(2 * objects);
     // Objects made while reading (a missing block record) take handles above all of the file's.
     // ($HANDSEED, a code 5 of the header, is the next free handle, not one in use.)
     const auto& tags = db_.fileTags_;

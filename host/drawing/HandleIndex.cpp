@@ -10,41 +10,55 @@ constexpr std::size_t kSpread = 4;
 constexpr std::size_t kMinimumTable = 1 << 16;
 }  // namespace
 
-DbObject* HandleIndex::find(std::uint64_t handle) const {
-    if (handle < table_.size() && table_[handle]) return table_[handle];
-    if (far_.empty()) return nullptr;
+DbObject* const HandleIndex::kNoPage[HandleIndex::kPageSize] = {};
+
+DbObject* HandleIndex::findFar(std::uint64_t handle) const {
     const auto it = far_.find(handle);
     return it == far_.end() ? nullptr : it->second;
+}
+
+std::uint64_t HandleIndex::tableLimit() const {
+    return std::max(kMinimumTable, kSpread * std::max(count_, expected_));
 }
 
 bool HandleIndex::emplace(std::uint64_t handle, DbObject* object) {
     if (handle == 0 || !object || contains(handle)) return false;
     ++count_;
-    if (handle >= table_.size()) {
-        const std::size_t limit = std::max(kMinimumTable, kSpread * std::max(count_, expected_));
-        if (handle >= limit) {
+    const std::uint64_t page = handle >> kPageBits;
+    if (page >= made_.size() || !made_[page]) {
+        if (handle >= tableLimit()) {
             far_.emplace(handle, object);
             return true;
         }
-        const std::size_t grown = std::max<std::size_t>(handle + 1, table_.size() * 3 / 2);
-        table_.resize(std::min(grown, limit));
+        if (page >= made_.size()) {
+            made_.resize(page + 1);
+            pages_.resize(page + 1, kNoPage);
+        }
+        made_[page] = std::make_unique<DbObject*[]>(kPageSize);
+        pages_[page] = made_[page].get();
     }
-    table_[handle] = object;
+    made_[page][handle & (kPageSize - 1)] = object;
     return true;
 }
 
 void HandleIndex::reserve(std::size_t count) {
     expected_ = std::max(expected_, count);
-    table_.reserve(count + count / 4);
+    const std::size_t pages = (count + count / 4) / kPageSize + 1;
+    pages_.reserve(pages);
+    made_.reserve(pages);
 }
 
 std::size_t HandleIndex::bytes() const {
-    return table_.capacity() * sizeof(DbObject*) + far_.size() * 32 +
-           far_.bucket_count() * sizeof(void*);
+    std::size_t pages = 0;
+    for (const auto& page : made_)
+        pages += page ? 1 : 0;
+    return pages * kPageSize * sizeof(DbObject*) + 2 * pages_.capacity() * sizeof(void*) +
+           far_.size() * 32 + far_.bucket_count() * sizeof(void*);
 }
 
 void HandleIndex::swap(HandleIndex& other) noexcept {
-    table_.swap(other.table_);
+    pages_.swap(other.pages_);
+    made_.swap(other.made_);
     far_.swap(other.far_);
     std::swap(count_, other.count_);
     std::swap(expected_, other.expected_);

@@ -649,6 +649,23 @@ TEST(HandleIndexTable, SequentialAndFarHandlesAreFoundAndTheFirstStays) {
     EXPECT_EQ(other.find(0xFFFFFFFFFFull), objects.at(60));
 }
 
+TEST(HandleIndexTable, TheTableGrowsByPagesWhereHandlesAre) {
+    FakeObjects objects;
+    HandleIndex index;
+    // Either side of a page's end, and one far up the table with no handle in between.
+    const std::uint64_t handles[] = {1, 4095, 4096, 4097, 40000};
+    for (std::size_t i = 0; i < std::size(handles); ++i)
+        ASSERT_TRUE(index.emplace(handles[i], objects.at(i)));
+    for (std::size_t i = 0; i < std::size(handles); ++i)
+        EXPECT_EQ(index.find(handles[i]), objects.at(i)) << handles[i];
+    for (const std::uint64_t absent : {2u, 4094u, 4098u, 8192u, 20000u, 39999u, 40001u, 50000u})
+        EXPECT_EQ(index.find(absent), nullptr) << absent;
+    EXPECT_FALSE(index.emplace(4096, objects.at(9))) << "the first of a handle stays";
+    EXPECT_EQ(index.find(4096), objects.at(2));
+    // Three pages of 4096 handles, not a table as long as the highest handle.
+    EXPECT_LT(index.bytes(), 40000u * sizeof(void*) / 2);
+}
+
 TEST(HandleIndexTable, ADrawingWithAFarHandleFindsEveryObject) {
     std::string text(kTwoTexts);
     text.replace(text.find("5\n101\n"), 6, "5\nFFFFFFFFF0\n");
