@@ -103,6 +103,21 @@ protected:
         QSqlDatabase::removeDatabase("sheet-grid-test");
     }
 
+    // Two grids in language 1: group key 7 has columns A;B and rows X;Y, key 8 columns 1;2;3
+    // and row R.
+    void makeTwoGrids() {
+        makeCatalogue("own.db",
+                      {"create table BDPAGE (ERASED SMALLINT, PAGE_KEY INTEGER, COL_LABEL "
+                       "varchar(200), COL_INT varchar(200), ROW_LABEL varchar(200), ROW_INT "
+                       "varchar(200))",
+                       "create table BDGROUP (ERASED SMALLINT, GROUP_KEY INTEGER, LANG INTEGER, "
+                       "PAGE INTEGER)",
+                       "insert into BDPAGE values (0, 1, 'A;B', '210', 'X;Y', '100'), "
+                       "(0, 2, '1;2;3', '10;20', 'R', '297')",
+                       "insert into BDGROUP values (0, 7, 1, 1), (0, 8, 1, 2)"});
+        writeSettings("own.db", "1");
+    }
+
     std::string position(const char* group, double x, double y) {
         return show(QString("(BuscarCoordenadas nil \"%1\" \"0001\" %2 %3)")
                         .arg(group)
@@ -203,16 +218,7 @@ TEST_F(SheetGridCatalogueTest, LanguageRowsErasedRowsAndOneCatalogueReadPerDocum
 }
 
 TEST_F(SheetGridCatalogueTest, OneTextAskedAgainFollowsTheRegistryAndOtherGroups) {
-    makeCatalogue("own.db",
-                  {"create table BDPAGE (ERASED SMALLINT, PAGE_KEY INTEGER, COL_LABEL "
-                   "varchar(200), COL_INT varchar(200), ROW_LABEL varchar(200), ROW_INT "
-                   "varchar(200))",
-                   "create table BDGROUP (ERASED SMALLINT, GROUP_KEY INTEGER, LANG INTEGER, "
-                   "PAGE INTEGER)",
-                   "insert into BDPAGE values (0, 1, 'A;B', '210', 'X;Y', '100'), "
-                   "(0, 2, '1;2;3', '10;20', 'R', '297')",
-                   "insert into BDGROUP values (0, 7, 1, 1), (0, 8, 1, 2)"});
-    writeSettings("own.db", "1");
+    makeTwoGrids();
     addGroup("G7", 7, {"G7$0001$A"});
     addGroup("G8", 8, {"G8$0001$A"});
     SheetGridIndex index;
@@ -237,16 +243,7 @@ TEST_F(SheetGridCatalogueTest, OneTextAskedAgainFollowsTheRegistryAndOtherGroups
 // A list that swaps pages freezes and thaws layers between its questions: the grid of a
 // group stays, and a change of the registry after such edits is still seen.
 TEST_F(SheetGridCatalogueTest, LayerEditsKeepTheGroupsGridAndLaterRegistryChangesAreSeen) {
-    makeCatalogue("own.db",
-                  {"create table BDPAGE (ERASED SMALLINT, PAGE_KEY INTEGER, COL_LABEL "
-                   "varchar(200), COL_INT varchar(200), ROW_LABEL varchar(200), ROW_INT "
-                   "varchar(200))",
-                   "create table BDGROUP (ERASED SMALLINT, GROUP_KEY INTEGER, LANG INTEGER, "
-                   "PAGE INTEGER)",
-                   "insert into BDPAGE values (0, 1, 'A;B', '210', 'X;Y', '100'), "
-                   "(0, 2, '1;2;3', '10;20', 'R', '297')",
-                   "insert into BDGROUP values (0, 7, 1, 1), (0, 8, 1, 2)"});
-    writeSettings("own.db", "1");
+    makeTwoGrids();
     addGroup("G7", 7, {"G7$0001$A", "G7$0002$A"});
     SheetGridIndex index;
     const QString g7 = QString::fromUtf8("G7");
