@@ -12,6 +12,7 @@
 
 #include <algorithm>
 #include <functional>
+#include <utility>
 
 namespace {
 
@@ -464,6 +465,15 @@ protected:
         vizinhos.sort();
         return vizinhos;
     }
+    // X1:1 has -K1 at its cut point (wire 1) and X1:2 at its insertion point (wire 5): those
+    // two wires.
+    std::pair<const zvdb::Polyline*, const zvdb::Polyline*> duasBornesLigadas() {
+        x1_ = borne("X1", "1", {20, 200, 0});
+        x2_ = borne("X1", "2", {60, 200, 0});
+        k1_ = componente("-K1", {{"A1", {20, 100, 0}}});
+        const zvdb::Polyline* um = fio({{20, 190, 0}, {20, 100, 0}}, "1");
+        return {um, fio({{20, 200, 0}, {20, 220, 0}, {60, 220, 0}, {60, 200, 0}}, "5")};
+    }
     // One wire runs from -K1 through both points of an equipment's terminal, 2 apart, to
     // -K2: the points alone are too close to tell apart, the connection names are not.
     void equipamento(bool comDados) {
@@ -513,11 +523,7 @@ TEST_F(ExportTerminalSidesTest, ATerminalCarriesTheElementsAndWiresAtItsTwoPoint
 }
 
 TEST_F(ExportTerminalSidesTest, ComponentsAndTerminalsKeepNoSpareRoomOnceRead) {
-    x1_ = borne("X1", "1", {20, 200, 0});
-    x2_ = borne("X1", "2", {60, 200, 0});
-    k1_ = componente("-K1", {{"A1", {20, 100, 0}}});
-    fio({{20, 190, 0}, {20, 100, 0}}, "1");
-    fio({{20, 200, 0}, {20, 220, 0}, {60, 220, 0}, {60, 200, 0}}, "5");
+    duasBornesLigadas();
     le(3);
     ASSERT_TRUE(borneLido("1") && borneLido("2"));
     // A large project holds hundreds of thousands of these: their arrays are as long as
@@ -534,12 +540,7 @@ TEST_F(ExportTerminalSidesTest, ComponentsAndTerminalsKeepNoSpareRoomOnceRead) {
 // keeping one gives: the wire between two terminals is read once for each, and each of those
 // terminals again as the other's neighbour. The components' readings stay kept.
 TEST_F(ExportTerminalSidesTest, WiresAndTerminalsReadApartGiveTheSameSidesAndAreNotKept) {
-    x1_ = borne("X1", "1", {20, 200, 0});
-    x2_ = borne("X1", "2", {60, 200, 0});
-    k1_ = componente("-K1", {{"A1", {20, 100, 0}}});
-    const zvdb::Polyline* um = fio({{20, 190, 0}, {20, 100, 0}}, "1");
-    const zvdb::Polyline* ponte =
-        fio({{20, 200, 0}, {20, 220, 0}, {60, 220, 0}, {60, 200, 0}}, "5");
+    const auto [um, ponte] = duasBornesLigadas();
     ASSERT_TRUE(lisp("(setq EXPORTA 3)"));
     struct Avulso : CCExportDataReader {
         Avulso() {
@@ -628,11 +629,7 @@ TEST_F(ExportTerminalSidesTest, ComponentsReadAgainForTheSidesGiveTheSameSidesAn
 // are read: the sides read the drawing's objects, not those items, so each item is the one a
 // full read gives, less what was dropped.
 TEST_F(ExportTerminalSidesTest, FieldsDroppedAsItemsAreMadeLeaveTheOthersAsAFullReadGivesThem) {
-    x1_ = borne("X1", "1", {20, 200, 0});
-    x2_ = borne("X1", "2", {60, 200, 0});
-    k1_ = componente("-K1", {{"A1", {20, 100, 0}}});
-    fio({{20, 190, 0}, {20, 100, 0}}, "1");
-    fio({{20, 200, 0}, {20, 220, 0}, {60, 220, 0}, {60, 200, 0}}, "5");
+    duasBornesLigadas();
     ASSERT_TRUE(lisp("(setq EXPORTA 3)"));
     static const auto fica = [](const QString& nome) {
         return nome == "ZV_LISTA_TIPO" || nome == "NUMERO" || nome.startsWith("RELACAO");
@@ -682,11 +679,7 @@ TEST_F(ExportTerminalSidesTest, FieldsDroppedAsItemsAreMadeLeaveTheOthersAsAFull
 // The terminals' places and layers come from their readings as the walk makes them; a second
 // walk finds the readings kept and asks the references: the sides are the same.
 TEST_F(ExportTerminalSidesTest, ASecondWalkOverKeptReadingsGivesTheSameSides) {
-    x1_ = borne("X1", "1", {20, 200, 0});
-    x2_ = borne("X1", "2", {60, 200, 0});
-    k1_ = componente("-K1", {{"A1", {20, 100, 0}}});
-    fio({{20, 190, 0}, {20, 100, 0}}, "1");
-    fio({{20, 200, 0}, {20, 220, 0}, {60, 220, 0}, {60, 200, 0}}, "5");
+    duasBornesLigadas();
     ASSERT_TRUE(lisp("(setq EXPORTA 3)"));
     CCExportDataReader leitor;
     std::unique_ptr<VetorItens> primeiros(leitor.Le(&db(), nullptr, true, std::nullopt));
