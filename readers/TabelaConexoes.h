@@ -1,10 +1,10 @@
 #pragma once
 // The wires' (and cables') connections as the LISP answers give them, in flat arrays: one
 // record a wire, its entries side by side in arrays shared by all wires, and the wire
-// numbers in an open-addressed index of record places. The entries' texts are the answer's
-// own (shared, not copied) where the whole texts are kept; an element's text (the part before
-// the first "#") is cut from its whole text once, when first asked for as a QString. A few
-// arrays are freed at once, not a hash node, two lists and two vectors per wire.
+// numbers in an open-addressed index of record places. The numbers and the entries' texts
+// lie one after the other in a few large blocks that never move, not in a string each: a
+// large answer is a few allocations, freed at once, and a view of a text holds while the
+// table lives. A text asked for as a QString is made once, when first asked for.
 #include "cad/CICad.h"
 
 #include <QString>
@@ -13,8 +13,10 @@
 
 #include <cstdint>
 #include <cstring>
+#include <memory>
 #include <optional>
 #include <span>
+#include <string_view>
 #include <vector>
 
 class TabelaConexoes {
@@ -83,30 +85,58 @@ public:
 
 private:
     struct Fio {
-        QString numero;
+        const char16_t* numero = nullptr;  // in the blocks
+        std::uint32_t tamanhoNumero = 0;
         std::uint32_t primeiro = 0;  // its entries
         std::uint32_t total = 0;
         std::uint32_t primeiraCompleta = 0;  // its whole texts (another wire's: see Carrega)
         std::uint32_t completas = 0;
         bool inteiros = false;  // the element is the whole text
+        QStringView Numero() const { return {numero, qsizetype(tamanhoNumero)}; }
     };
-    const Fio* Procura(const QString& numero) const;
+    // An entry's text in the blocks; its element is its first `corte` units.
+    struct Texto {
+        const char16_t* inicio = nullptr;
+        std::int32_t tamanho = 0;
+        std::int32_t corte = 0;
+    };
+    // Room for `unidades` code units in the blocks, where the last one ends or in a new one.
+    char16_t* Espaco(std::size_t unidades);
+    // A copy of the text in the blocks.
+    QStringView Guarda(QStringView texto);
+    // The same for a UTF-8 text, which is ASCII nearly always.
+    QStringView Guarda(std::string_view utf8);
+    // The QString of entry k, its whole text or its element, made once.
+    QString Feito(std::size_t k, bool inteiro) const;
+    const Fio* Procura(QStringView numero) const;
     void Indexa(std::uint32_t lugar);
     void Reserva(std::size_t fios);
     // Both ways of loading go through these: a wire opened, its entries, the wire closed.
     class Receptor;
-    void ReservaResposta(std::size_t fios, std::size_t entradas);
-    Fio AbreFio(QString numero, bool detalhes) const;
+    // `unidades`: about how many code units the answer's texts take.
+    void ReservaResposta(std::size_t fios, std::size_t entradas, std::size_t unidades);
+    // `numero` is in the blocks.
+    Fio AbreFio(QStringView numero, bool detalhes) const;
     // Its point is pontos_.back(), the origin until the answer's reals come.
-    void Entrada(QString texto, bool detalhes, bool completas);
-    // The same for a text whose element's length and handle are known.
-    void Entrada(QString texto, int corte, std::uint64_t handle);
+    void Entrada(QStringView texto, bool detalhes, bool completas);
+    // The same for a text in the blocks whose element's length and handle are known.
+    void Entrada(QStringView texto, int corte, std::uint64_t handle);
+    // The entry of a symbol: its handle's digits, then "#CONNECTION#BLOCK" for `inteiro`
+    // (ASCII names), written straight into the blocks.
+    void EntradaDeSimbolo(std::uint64_t handle, int digitos, bool inteiro, std::string_view conexao,
+                          std::string_view bloco);
     void FechaFio(Fio&& fio, bool detalhes, bool completas);
 
+    struct Bloco {
+        std::unique_ptr<char16_t[]> dados;
+        std::size_t usado = 0, tamanho = 0;
+    };
+    std::vector<Bloco> blocos_;
+    std::size_t proximoBloco_ = 0;  // the size of the next block, when one is needed
     std::vector<Fio> fios_;
-    std::vector<QString> textos_;
-    std::vector<std::int32_t> cortes_;        // an element's length in its text
-    mutable std::vector<QString> elementos_;  // the elements cut from their texts so far
+    std::vector<Texto> textos_;
+    // The QStrings made so far, by entry: of the whole texts and of the elements.
+    mutable std::vector<QString> inteirosFeitos_, partesFeitos_;
     std::vector<CEPonto> pontos_;
     std::vector<std::uint64_t> handles_;
     // The numbers' hashes keep most compares off the texts.
@@ -125,7 +155,6 @@ inline std::uint64_t TabelaConexoes::Textos::handle(int i) const {
 
 inline QStringView TabelaConexoes::Textos::vista(int i) const {
     if (i < 0 || i >= total_) return {};
-    const std::size_t k = primeiro_ + std::size_t(i);
-    const QStringView texto(tabela_->textos_[k]);
-    return inteiros_ ? texto : texto.left(tabela_->cortes_[k]);
+    const Texto& texto = tabela_->textos_[primeiro_ + std::size_t(i)];
+    return {texto.inicio, qsizetype(inteiros_ ? texto.tamanho : texto.corte)};
 }

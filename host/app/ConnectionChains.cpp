@@ -95,7 +95,7 @@ void ConnectionChains::deliver(const zvproduct::ConnectionTable& table, bool det
     receiver.begin(table.numbers.size(), table.entries.size());
     std::size_t touch = 0;
     for (std::size_t w = 0; w < table.numbers.size(); ++w) {
-        receiver.wire(qText(table.numbers[w]));
+        receiver.wireNumber(table.numbers[w]);
         for (; touch < table.ends[w]; ++touch) {
             const zvproduct::Touch entry = table.touch(touch);
             receiver.symbolEntry(entry.symbol, details, entry.connection, entry.block,

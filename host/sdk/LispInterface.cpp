@@ -36,6 +36,10 @@ QString symbolEntryText(std::uint64_t handle, bool details, std::string_view con
     return QString::fromUtf8(bytes.data(), static_cast<int>(bytes.size()));
 }
 
+void ConnectionReceiver::wireNumber(std::string_view number) {
+    wire(QString::fromUtf8(number.data(), static_cast<int>(number.size())));
+}
+
 void ConnectionReceiver::symbolEntry(std::uint64_t handle, bool details,
                                      std::string_view connection, std::string_view block, double x,
                                      double y, double z) {

@@ -21,6 +21,9 @@ public:
     virtual void begin(std::size_t wires, std::size_t entries) = 0;
     // A wire, its entries after it.
     virtual void wire(QString number) = 0;
+    // The same for a number in UTF-8, as the host holds it: a receiver that keeps its own
+    // copy makes no QString. The default makes the QString for wire().
+    virtual void wireNumber(std::string_view number);
     virtual void entry(QString text, double x, double y, double z) = 0;
     // An entry whose text is symbolEntryText's, in its parts: a receiver that keeps less than
     // the whole text makes only what it keeps. The default makes the text for entry().

@@ -278,6 +278,25 @@ TEST(ConnectionChainTexts, NamesOutsideAsciiAreReadAsUtf8) {
     EXPECT_EQ(cables.head->rbnext->rbnext->rbnext->rbnext->rstring, "1F");
 }
 
+// A receiver that takes the numbers only as QStrings gets them from the host's UTF-8 texts.
+TEST(ConnectionChainTexts, AWiresNumberInUtf8ReachesAReceiverOfTextsDecoded) {
+    struct Numbers : zvsdk::ConnectionReceiver {
+        void begin(std::size_t, std::size_t) override {}
+        void wire(QString number) override { numbers << number; }
+        void entry(QString, double, double, double) override {}
+        QStringList numbers;
+    } receiver;
+    receiver.wireNumber(
+        "F\xC3\x87"
+        "1");
+    receiver.wireNumber("7");
+    receiver.wireNumber({});
+    EXPECT_EQ(receiver.numbers, QStringList({QString::fromUtf8("F\xC3\x87"
+                                                               "1"),
+                                             "7", ""}));
+    EXPECT_EQ(receiver.numbers[0].size(), 3);
+}
+
 TEST_F(ConnectionChainsTest, AUsersDefunOfTheFunctionTakesOver) {
     lisp().interpreter().evalText(
         "(defun getConexoesTodosFios () '((\"X\" (\"1A#2#B\" 1.5 2.0 3.0))))");

@@ -3,6 +3,9 @@
 // answers the host gives without their chains.
 #include "cad/CICad.h"
 #include "cad/FacadeFixture.h"
+#include "drawing/Attribute.h"
+#include "drawing/BlockRecord.h"
+#include "drawing/BlockReference.h"
 #include "drawing/Polyline.h"
 #include "readers/CCBorneDataReader.h"
 #include "readers/LeitorBase.h"
@@ -10,6 +13,9 @@
 #include "readers/ZVString.h"
 #include "sample/ProjectGenerator.h"
 #include "sdk/NodeChains.h"
+
+#include <algorithm>
+#include <typeinfo>
 
 namespace {
 
@@ -150,9 +156,11 @@ TEST_F(ConnectionLoadTest, EveryNumberOfALargeAnswerFindsItsOwnEntries) {
     CICad::AvaliaLisp(cabos + "))");
     LeitorBase leitor;
     leitor.CarregaConexoesFios();
-    // an element asked for before the cables come is the same after
+    // an element asked for before the cables come is the same after, and so is a view of it
     EXPECT_EQ(leitor.ListaConexoes("5")->value(0), "15");
+    const QStringView vista = leitor.ListaConexoes("6")->vista(0);
     leitor.CarregaConexoesCabos();
+    EXPECT_EQ(vista.toString(), "16");
     for (int i = 0; i < kFios; ++i) {
         const QString numero = QString::number(i);
         const auto elementos = leitor.ListaConexoes(numero);
@@ -229,33 +237,74 @@ protected:
         zvsample::ProjectGenerator gerador({3, 120, 6});
         documento_ = app_->openDocument(arquivo("gerado.dxf"), gerador.generate());
     }
+    // The wires then the cables, as a reader loads them, with and without the whole texts,
+    // and each read with and without the details: the same table from the chains as from
+    // the answers without them.
+    void MesmaTabelaSemCadeia() {
+        for (const auto& [completas, detalhesFios] :
+             {std::pair{true, true}, std::pair{false, true}, std::pair{true, false},
+              std::pair{false, false}}) {
+            SCOPED_TRACE(std::to_string(completas) + " " + std::to_string(detalhesFios));
+            TabelaConexoes semCadeia, pelaCadeia;
+            QStringList numeros;
+            for (const auto& [funcao, detalhes] :
+                 {std::pair{"getConexoesTodosFios", detalhesFios},
+                  std::pair{"getConexoesTodosCabos", !detalhesFios}}) {
+                ASSERT_TRUE(semCadeia.CarregaSemCadeia(funcao, detalhes, completas)) << funcao;
+                zvsdk::ResultBuffer* cadeia = CICad::zvInvokeLista(funcao);
+                ASSERT_NE(cadeia, nullptr);
+                numeros << NumerosDaCadeia(cadeia);
+                pelaCadeia.Carrega(cadeia, detalhes, completas);
+                CICad::LiberaLista(cadeia);
+            }
+            EXPECT_GT(numeros.size(), 20);
+            EXPECT_EQ(semCadeia.Fios(), pelaCadeia.Fios());
+            const std::string esperado = Conteudo(pelaCadeia, numeros);
+            EXPECT_EQ(esperado.find("missing"), std::string::npos);
+            EXPECT_EQ(Conteudo(semCadeia, numeros), esperado);
+        }
+    }
 };
 
-// The wires then the cables, as a reader loads them, with and without the whole texts, and
-// each read with and without the details: the same table from the chains as from the answers
-// without them.
 TEST_F(ProductConnectionLoadTest, TheAnswersWithoutTheirChainsMakeTheSameTable) {
-    for (const auto& [completas, detalhesFios] :
-         {std::pair{true, true}, std::pair{false, true}, std::pair{true, false},
-          std::pair{false, false}}) {
-        SCOPED_TRACE(std::to_string(completas) + " " + std::to_string(detalhesFios));
-        TabelaConexoes semCadeia, pelaCadeia;
-        QStringList numeros;
-        for (const auto& [funcao, detalhes] : {std::pair{"getConexoesTodosFios", detalhesFios},
-                                               std::pair{"getConexoesTodosCabos", !detalhesFios}}) {
-            ASSERT_TRUE(semCadeia.CarregaSemCadeia(funcao, detalhes, completas)) << funcao;
-            zvsdk::ResultBuffer* cadeia = CICad::zvInvokeLista(funcao);
-            ASSERT_NE(cadeia, nullptr);
-            numeros << NumerosDaCadeia(cadeia);
-            pelaCadeia.Carrega(cadeia, detalhes, completas);
-            CICad::LiberaLista(cadeia);
+    MesmaTabelaSemCadeia();
+}
+
+// A wire's number and a connection's name beyond ASCII are decoded from UTF-8 as the
+// chain's texts are.
+TEST_F(ProductConnectionLoadTest, NamesBeyondAsciiMakeTheSameTable) {
+    bool fio = false;
+    int ligacoes = 0;
+    std::vector<std::string> guardados;  // the values outlive the edits that copy them
+    db().modelSpace()->forEachEntity([&](zvdb::Entity& entidade) {
+        std::vector<zvdb::Tag> itens = entidade.xdata("KVR_ZV_WIRE");
+        for (std::size_t i = 2; !fio && i < itens.size(); ++i) {
+            if (!itens[i].value.starts_with("FIO\f")) continue;
+            guardados.push_back("FIO\fN\xc2\xba" + std::string(itens[i].value.substr(4)));
+            itens[i].value = guardados.back();
+            entidade.setXData("KVR_ZV_WIRE", itens);
+            fio = true;
         }
-        EXPECT_GT(numeros.size(), 20);
-        EXPECT_EQ(semCadeia.Fios(), pelaCadeia.Fios());
-        const std::string esperado = Conteudo(pelaCadeia, numeros);
-        EXPECT_EQ(esperado.find("missing"), std::string::npos);
-        EXPECT_EQ(Conteudo(semCadeia, numeros), esperado);
-    }
+        if (typeid(entidade) != typeid(zvdb::BlockReference)) return;
+        for (zvdb::Entity* sub : entidade.subEntities()) {
+            auto* atributo = dynamic_cast<zvdb::Attribute*>(sub);
+            if (!atributo || !atributo->tag().starts_with("LIGACAO")) continue;
+            atributo->setTextValue("\xc3\x87" + std::string(atributo->textValue()));
+            ++ligacoes;
+        }
+    });
+    ASSERT_TRUE(fio);
+    ASSERT_GT(ligacoes, 0);
+    MesmaTabelaSemCadeia();
+    // the edits reached the answers
+    TabelaConexoes tabela;
+    ASSERT_TRUE(tabela.CarregaSemCadeia("getConexoesTodosFios", true, true));
+    zvsdk::ResultBuffer* cadeia = CICad::zvInvokeLista("getConexoesTodosFios");
+    const QStringList numeros = NumerosDaCadeia(cadeia);
+    CICad::LiberaLista(cadeia);
+    EXPECT_TRUE(std::any_of(numeros.begin(), numeros.end(),
+                            [](const QString& n) { return n.startsWith(u"N\u00ba"); }));
+    EXPECT_NE(Conteudo(tabela, numeros).find("#\xc3\x87"), std::string::npos);
 }
 
 // A user's function has no answer without a chain: the reader loads it from its chain.
