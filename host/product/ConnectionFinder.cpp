@@ -42,6 +42,11 @@ bool isConnectionTag(std::string_view tag) {
            startsWithNoCase(tag, "CONEXION");
 }
 
+// TagValues::toReal. A flat drawing's z are all "0.0": they are not parsed.
+double real(std::string_view text) {
+    return text == "0.0" ? 0.0 : zvdb::TagValues::toReal(text);
+}
+
 double distance(const zvdb::Point3& a, const zvdb::Point3& b) {
     const zvdb::Point3 d = a - b;
     return std::sqrt(d.x * d.x + d.y * d.y + d.z * d.z);
@@ -150,6 +155,7 @@ struct Roles {
 // of one walk each; the walk stops when the codes `wanted` are found.
 struct FirstTags {
     enum Code : unsigned { Value = 1, Name = 2, Layer = 4, Point = 8 };
+    static constexpr std::uint64_t kCodes = 1u << 1 | 1u << 2 | 1u << 8 | 1u << 10;
     std::span<const zvdb::Tag> all;
     int value = -1, name = -1, layer = -1, point = -1;
 
@@ -160,6 +166,9 @@ struct FirstTags {
         unsigned found = 0;
         for (std::size_t i = 1; i < end; ++i) {
             const zvdb::Tag& tag = all[i];
+            // most tags have none of the codes looked at: one test passes them
+            const auto number = static_cast<std::uint16_t>(tag.code);
+            if (number < 64 ? ((kCodes >> number) & 1) == 0 : number != 102) continue;
             if (tag.code == 102) {
                 if (zvdb::TagList::opensGroup(tag)) inGroup = true;
                 if (zvdb::TagList::closesGroup(tag)) inGroup = false;
@@ -196,9 +205,9 @@ struct FirstTags {
     zvdb::Point3 position() const {
         if (point < 0) return {};
         auto k = static_cast<std::size_t>(point);
-        zvdb::Point3 p{zvdb::TagValues::toReal(all[k++].value), 0.0, 0.0};
-        if (k < all.size() && all[k].code == 20) p.y = zvdb::TagValues::toReal(all[k++].value);
-        if (k < all.size() && all[k].code == 30) p.z = zvdb::TagValues::toReal(all[k].value);
+        zvdb::Point3 p{real(all[k++].value), 0.0, 0.0};
+        if (k < all.size() && all[k].code == 20) p.y = real(all[k++].value);
+        if (k < all.size() && all[k].code == 30) p.z = real(all[k].value);
         return p;
     }
 };
@@ -277,7 +286,7 @@ std::string_view appendVertices(const zvdb::Polyline& polyline, std::size_t end,
         }
     }
     if (elevation >= 0) {
-        const double z = zvdb::TagValues::toReal(all[static_cast<std::size_t>(elevation)].value);
+        const double z = real(all[static_cast<std::size_t>(elevation)].value);
         for (std::size_t k = first; k < out.size(); ++k)
             out[k].z = z;
     }
@@ -440,9 +449,7 @@ void ConnectionFinder::indexSymbol(const zvdb::BlockReference& reference, std::s
     int points = 0;
     for (std::size_t i = cutBegin; cutEnd > 0 && i + 2 < cutEnd; ++i)
         if (all[i].code == 1010 && ++points == 2) {
-            ends[1] = {zvdb::TagValues::toReal(all[i].value),
-                       zvdb::TagValues::toReal(all[i + 1].value),
-                       zvdb::TagValues::toReal(all[i + 2].value)};
+            ends[1] = {real(all[i].value), real(all[i + 1].value), real(all[i + 2].value)};
             endCount = 2;
             break;
         }
