@@ -481,29 +481,11 @@ const ConnectionFinder::CellRun* ConnectionFinder::run(std::int32_t layer,
     }
 }
 
-// Spot i goes to where `from` takes it from: spots_[i] becomes spots_[from[i]], one cycle of
-// the permutation at a time (a place taking its own spot is done).
-void ConnectionFinder::placeSpots(std::vector<std::uint32_t>& from) {
-    for (std::uint32_t i = 0; i < from.size(); ++i) {
-        if (from[i] == i) continue;
-        const Spot held = spots_[i];
-        std::uint32_t at = i;
-        for (;;) {
-            const std::uint32_t next = std::exchange(from[at], at);
-            if (next == i) {
-                spots_[at] = held;
-                break;
-            }
-            spots_[at] = spots_[next];
-            at = next;
-        }
-    }
-}
-
 // Each layer's table has room for twice its spots, more than its cells. The spots are counted
 // into the slots of their cells, each cell's run follows the one before in the slots' order,
-// and the spots go to their runs in the order they came: a vertex then finds its cells' spots
-// in a run each, without a sort. The spots are moved in place, without a second array of them.
+// and the spots' places go to their runs in the order they came: a vertex then finds its
+// cells' spots in a run each, without a sort. The spots stay in the drawing's order, in which
+// the answers read them: a wire's symbols lie near each other there.
 void ConnectionFinder::buildGrid() {
     std::vector<std::uint32_t> counts(layers_.size(), 0);
     for (const Spot& spot : spots_)
@@ -539,11 +521,9 @@ void ConnectionFinder::buildGrid() {
         run.begin = run.end = next;  // `end` is where its next spot goes, for now
         next += count;
     }
-    std::vector<std::uint32_t> from(spots_.size());
+    members_.resize(spots_.size());
     for (std::uint32_t i = 0; i < spots_.size(); ++i)
-        from[grid_[slots[i]].end++] = i;
-    slots = {};
-    placeSpots(from);
+        members_[grid_[slots[i]].end++] = i;
 }
 
 // Each role's polylines by registry page order, then by handle.
@@ -593,8 +573,10 @@ void ConnectionFinder::touchesAt(std::int32_t layer, const zvdb::Point3& p, doub
         for (long long cy = y0; cy <= y1; ++cy) {
             const CellRun* cell = run(layer, cellKey(cx, cy));
             if (!cell) continue;
-            for (std::uint32_t i = cell->begin; i < cell->end; ++i)
-                if (distance(spots_[i].point, p) <= radius) near.push_back(&spots_[i]);
+            for (std::uint32_t i = cell->begin; i < cell->end; ++i) {
+                const Spot& spot = spots_[members_[i]];
+                if (distance(spot.point, p) <= radius) near.push_back(&spot);
+            }
         }
     if (near.empty()) return;
     // Equals stay in the order they were found. A vertex touches a few spots: they are

@@ -120,7 +120,7 @@ private:
     // Its cell is worked out from its point where the grid is built, not kept with it.
     struct Spot {
         zvdb::Point3 point;
-        std::string_view connection;  // in the drawing's storage: the spots sort cheaply
+        std::string_view connection;  // in the drawing's storage
         std::uint32_t symbol;
         std::int32_t layer;
     };
@@ -133,8 +133,8 @@ private:
         std::string_view number;  // a wire's number, read with its roles; empty otherwise
         std::uint32_t firstVertex, vertexCount;  // its vertices in vertices_
     };
-    // The run of the spots of one layer's cell in spots_ (in the order they came), in an
-    // open-addressed table: a vertex asks nine cells, most of them empty.
+    // The run of the places of one layer's cell's spots in members_ (in the order they came),
+    // in an open-addressed table: a vertex asks nine cells, most of them empty.
     struct CellRun {
         std::uint64_t cell;
         std::uint32_t begin, end;  // end 0: a free slot
@@ -168,7 +168,6 @@ private:
     static std::size_t slotOf(std::uint64_t cell);
     const CellRun* run(std::int32_t layer, std::uint64_t cell) const;
     void buildGrid();
-    void placeSpots(std::vector<std::uint32_t>& from);
     void sortLines();
     // The places in spots_ of the touches, appended to `out`.
     void touchesAt(std::int32_t layer, const zvdb::Point3& p, double radius,
@@ -190,6 +189,7 @@ private:
     std::vector<Symbol> symbols_;
     std::vector<Spot> spots_;
     std::vector<CellRun> grid_;
+    std::vector<std::uint32_t> members_;  // places in spots_, cell run by cell run
     std::vector<LayerCells> layerCells_;  // by layer id
     std::vector<Line> wireLines_, leadLines_, blindLines_;
     // The lines' vertices, read on the walk while their tags are at hand; shared with the
