@@ -107,21 +107,22 @@ struct Roles {
     std::size_t xdata = 0;
 
     // Every entity of model space passes here with all its applications: the names are
-    // told apart by their length first.
+    // told apart by their length first, and compared as they are nearly always written.
     static int appOf(std::string_view name) {
-        if (name.size() < 6 || !sameUpper(name.substr(0, 6), "KVR_ZV")) return -1;
-        const std::string_view rest = name.substr(6);
+        auto is = [name](std::string_view upperName) {
+            return name == upperName || sameUpper(name, upperName);
+        };
         switch (name.size()) {
             case 6:
-                return Symbol;
+                return is("KVR_ZV") ? Symbol : -1;
             case 11:
-                return sameUpper(rest, "_WIRE") ? Wire : sameUpper(rest, "_CABO") ? Cable : -1;
+                return is("KVR_ZV_WIRE") ? Wire : is("KVR_ZV_CABO") ? Cable : -1;
             case 13:
-                return sameUpper(rest, "_EQUIPO") ? Equipment : -1;
+                return is("KVR_ZV_EQUIPO") ? Equipment : -1;
             case 16:
-                return sameUpper(rest, "_PTS_CORTE") ? CutPoints : -1;
+                return is("KVR_ZV_PTS_CORTE") ? CutPoints : -1;
             case 18:
-                return sameUpper(rest, "_CONEX_BLIND") ? Blind : -1;
+                return is("KVR_ZV_CONEX_BLIND") ? Blind : -1;
             default:
                 return -1;
         }
