@@ -9,6 +9,8 @@
 #include "drawing/DxfLoader.h"
 #include "drawing/DxfWriter.h"
 
+#include <array>
+#include <cmath>
 #include <sstream>
 
 namespace zvproduct::testing {
@@ -567,6 +569,60 @@ TEST_F(ConnectionsTest, ConnectionAttributesAreReadAsTheDrawingReadsThem) {
     attributes[1]->erase();
     EXPECT_EQ(entries(),
               "((\"" + h + "##NA-1\" 150.0 200.0 0.0) (\"" + h + "##NA-1\" 150.0 190.0 0.0))");
+}
+
+// The points of the connections and the vertices of the wires are the reals the drawing
+// reads, however their texts are written.
+TEST_F(ConnectionsTest, PointsAreTheRealsTheDrawingReadsOfAnyText) {
+    auto* element = contact("ESQ$0001$A", {150, 200, 0});
+    auto* line = wire("ESQ$0001$A", {{150, 200, 0}, {150, 190, 0}}, "601");
+    zvdb::Attribute* attribute = element->attributes()[0];
+    const auto setText = [this](zvdb::DbObject& object, int code, const char* text) {
+        for (zvdb::Tag& tag : object.editTags())
+            if (tag.code == code) {
+                tag.value = database->store(text);
+                return;
+            }
+    };
+    // an x, a z and a wire's y, each spelled in many ways
+    const std::vector<std::array<const char*, 3>> texts = {
+        {"150", "0", "200"},
+        {"150.0", "0.0", "200.0"},
+        {"150.0625", "-0.0", "199.9375"},
+        {"+150.0", "+0.0", "+200.0"},
+        {" 150.0", " 0.0", " 200.0"},
+        {"150.0 ", "0.0 ", "200.0\r"},
+        {"150.", "0.", "200."},
+        {"0150.000", ".0", "0200.0"},
+        {"150.00000000000001", "0.00000000000000001", "200.00000000000001"},
+        {"150000000000000e-12", "1e-300", "2e2"},
+        {"150.0x", "-", "200.0abc"},
+    };
+    for (const auto& [x, z, y] : texts) {
+        SCOPED_TRACE(std::string(x) + "|" + z + "|" + y);
+        setText(*attribute, 10, x);
+        setText(*attribute, 30, z);
+        setText(*line, 20, y);
+        const ConnectionFinder finder(*database, 1.0);
+        const std::vector<WireConnections> wires = finder.wires();
+        ASSERT_EQ(wires.size(), 1u);
+        const zvdb::Point3 read = attribute->position();
+        int found = 0;
+        for (const Touch& touch : wires[0].touches) {
+            if (touch.connection != "13") continue;
+            ++found;
+            EXPECT_EQ(touch.point.x, read.x);
+            EXPECT_EQ(touch.point.z, read.z);
+            EXPECT_EQ(std::signbit(touch.point.z), std::signbit(read.z));
+        }
+        EXPECT_EQ(found, 1);
+        WireLayerIndex::VerticesByLayer byLayer;
+        finder.wiresAndLeadsByLayer(&byLayer);
+        const std::span<const zvdb::Point3> walked = byLayer.at("ESQ$0001$A").of(0);
+        ASSERT_FALSE(walked.empty());
+        EXPECT_EQ(walked[0].y, line->vertices()[0].y);
+        EXPECT_EQ(std::signbit(walked[0].y), std::signbit(line->vertices()[0].y));
+    }
 }
 
 TEST_F(ConnectionsTest, AWiresElevationIsTheZOfItsVertices) {
