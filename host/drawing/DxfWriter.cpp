@@ -166,10 +166,32 @@ void DxfWriter::writePatterned(const DbObject& object, const TagPattern::Values&
 
 namespace {
 
-// The text at `at`; its end. An empty value may have no memory at all.
-char* putText(char* at, std::string_view text) {
-    if (!text.empty()) std::memcpy(at, text.data(), text.size());
-    return at + text.size();
+// The text at `at`; its end. An empty value may have no memory at all. The runs and values
+// of a patterned object are mostly a few bytes: those are copied in two overlapping words,
+// without a call.
+[[gnu::always_inline]] inline char* putText(char* at, std::string_view text) {
+    const std::size_t n = text.size();
+    const char* from = text.data();
+    if (n > 16) {
+        std::memcpy(at, from, n);
+    } else if (n >= 8) {
+        std::uint64_t head, tail;
+        std::memcpy(&head, from, 8);
+        std::memcpy(&tail, from + n - 8, 8);
+        std::memcpy(at, &head, 8);
+        std::memcpy(at + n - 8, &tail, 8);
+    } else if (n >= 4) {
+        std::uint32_t head, tail;
+        std::memcpy(&head, from, 4);
+        std::memcpy(&tail, from + n - 4, 4);
+        std::memcpy(at, &head, 4);
+        std::memcpy(at + n - 4, &tail, 4);
+    } else if (n > 0) {
+        at[0] = from[0];
+        at[n / 2] = from[n / 2];
+        at[n - 1] = from[n - 1];
+    }
+    return at + n;
 }
 
 // Upper-case hexadecimal as TagPattern::hexText gives it, at `at`; its end.
@@ -184,23 +206,22 @@ char* putHex(char* at, std::uint64_t value) {
 
 // The object's text and its extended data put in place at once, their size known
 // beforehand: one growth of the text and plain copies instead of an append, with its checks,
-// for each run and value. False, with nothing written, when a value needs the code page or
-// the pattern has more values than are kept here.
+// for each run and value. A value is looked up again as it is copied rather than kept: the
+// look-up is a few loads, cheaper than an array of views made for every object. False, with
+// nothing written, when a value needs the code page.
 bool DxfWriter::writeWhole(const DbObject& object, const TagPattern::Values& values,
                            const PatternText& rendered) {
-    constexpr std::size_t kMaxPieces = 32;
     constexpr std::size_t kHexDigits = 16;
+    const PatternText::Piece* const pieces = rendered.pieces.data();
     const std::size_t count = rendered.pieces.size();
-    if (count > kMaxPieces) return false;
-    std::string_view own[kMaxPieces];
     const TagPattern& pattern = *values.pattern;
     std::size_t size = rendered.text.size() + count;
     for (std::size_t i = 0; i < count; ++i) {
-        const PatternText::Piece& piece = rendered.pieces[i];
+        const PatternText::Piece& piece = pieces[i];
         if (piece.value == TagPattern::Kind::Hole) {
-            own[i] = pattern.holeValue(values, piece.hole);
-            if (legacyEncoding_ && !TextCodec::isAscii(own[i])) return false;
-            size += own[i].size();
+            const std::string_view own = pattern.holeValue(values, piece.hole);
+            if (legacyEncoding_ && !TextCodec::isAscii(own)) return false;
+            size += own.size();
         } else if (piece.value != TagPattern::Kind::Fixed) {
             size += kHexDigits;
         }
@@ -217,21 +238,20 @@ bool DxfWriter::writeWhole(const DbObject& object, const TagPattern::Values& val
     char* at = out_.data() + start;
     const char* text = rendered.text.data();
     for (std::size_t i = 0; i < count; ++i) {
-        const PatternText::Piece& piece = rendered.pieces[i];
-        std::memcpy(at, text + piece.begin, piece.size);
-        at += piece.size;
+        const PatternText::Piece& piece = pieces[i];
+        at = putText(at, {text + piece.begin, piece.size});
         switch (piece.value) {
             case TagPattern::Kind::Fixed:
                 continue;
             case TagPattern::Kind::Hole:
-                at = putText(at, own[i]);
+                at = putText(at, pattern.holeValue(values, piece.hole));
                 break;
             case TagPattern::Kind::Handle:
-            case TagPattern::Kind::Owner: {
-                const bool handle = piece.value == TagPattern::Kind::Handle;
-                at = putHex(at, handle ? object.handle() : object.ownerHandle());
+                at = putHex(at, object.handle());
                 break;
-            }
+            case TagPattern::Kind::Owner:
+                at = putHex(at, object.ownerHandle());
+                break;
         }
         *at++ = '\n';
     }
