@@ -125,7 +125,13 @@ TEST(PatternedObjects, ValuesAndExtendedDataOfEveryLengthAreWrittenWhole) {
     Database db;
     BlockRecord* block = sampleBlock(db);
     std::vector<std::string> values;
-    for (std::size_t n = 0; n <= 40; ++n) {
+    // And values that make an object longer than the room it is first put in.
+    std::vector<std::size_t> lengths;
+    for (std::size_t n = 0; n <= 40; ++n)
+        lengths.push_back(n);
+    for (const std::size_t n : {900, 1000, 1023, 1024, 1100, 5000})
+        lengths.push_back(n);
+    for (const std::size_t n : lengths) {
         std::string value;
         for (std::size_t i = 0; i < n; ++i)
             value += char('a' + (n + i) % 26);
