@@ -41,7 +41,8 @@ bool Difere(const CEItemLista* a, const CEItemLista* b, const std::vector<std::u
 template <NomeLiteral a, NomeLiteral b, NomeLiteral c>
 const QString& PrimeiroDe(const CEItemLista& item) {
     static const QString kVazio;
-    for (const std::uint32_t numero : {NumeroCampo<a>(), NumeroCampo<b>(), NumeroCampo<c>()})
+    static const std::uint32_t numeros[] = {NumeroCampo<a>(), NumeroCampo<b>(), NumeroCampo<c>()};
+    for (const std::uint32_t numero : numeros)
         if (const QString* valor = item.campos.procura(numero); valor && !valor->isEmpty())
             return *valor;
     return kVazio;
