@@ -181,11 +181,11 @@ bool CEModeloReguas::LeCampoDoSimbolo(const QString& nome) {
 }
 
 CEBorneDwg* CEModeloReguas::Borne(const QString& regua, const QString& numero) const {
-    return bornesPorChave.value(ChaveDoItem{&regua, &numero});
+    return bornesPorChave.value(ChaveDoItem{regua, numero});
 }
 
 CESimboloDwg* CEModeloReguas::Simbolo(const QString& handle) const {
-    return simbolosPorHandle.value(TextoDoItem{&handle});
+    return simbolosPorHandle.value(TextoDoItem{handle});
 }
 
 void CEModeloReguas::Monta(const VetorItens& itens, const Parametros& p) {
@@ -217,7 +217,7 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
         CESimboloDwg& simbolo = simbolos.emplace_back(item);
         // The first symbol of a handle keeps it.
         const QString* handle = item->campos.procura(NumeroCampo<"HANDLE">());
-        CESimboloDwg*& primeiro = simbolosPorHandle[TextoDoItem{handle ? handle : &kSemValor}];
+        CESimboloDwg*& primeiro = simbolosPorHandle[TextoDoItem{handle ? *handle : kSemValor}];
         if (!primeiro) primeiro = &simbolo;
     }
     // By strip, then number, in the three languages; Spanish shares the Portuguese number
@@ -241,7 +241,7 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
     for (CEItemLista* item : terminais) {
         const QString& nome = ReguaDe(*item);
         // The first of a strip and number wins.
-        CEBorneDwg*& doNumero = bornesPorChave[ChaveDoItem{&nome, &NumeroDe(*item)}];
+        CEBorneDwg*& doNumero = bornesPorChave[ChaveDoItem{nome, NumeroDe(*item)}];
         if (doNumero) continue;
         CEBorneDwg* const borne = &bornes.emplace_back(item);
         doNumero = borne;

@@ -12,6 +12,7 @@
 
 #include <QHash>
 #include <QStringList>
+#include <QStringView>
 
 #include <cstdint>
 #include <deque>
@@ -57,24 +58,25 @@ public:
     // The first symbol of the handle, or null.
     CESimboloDwg* Simbolo(const QString& handle) const;
 
-    // Texts the items hold, as keys: compared and hashed by their text, which stays in the
-    // item. A table so keyed copies no text, and writes nothing into a text's memory (a
-    // copy counts itself there) for each terminal and symbol of the drawing.
+    // Texts the items hold, as keys: views of the text, which stays in the item. A table so
+    // keyed copies no text, and writes nothing into a text's memory (a copy counts itself
+    // there) for each terminal and symbol of the drawing; two keys of other lengths differ
+    // without a look at their texts.
     struct TextoDoItem {
-        const QString* texto;
-        bool operator==(const TextoDoItem& outro) const { return *texto == *outro.texto; }
+        QStringView texto;
+        bool operator==(const TextoDoItem& outro) const { return texto == outro.texto; }
         friend uint qHash(const TextoDoItem& chave, uint semente = 0) {
-            return qHash(*chave.texto, semente);
+            return qHash(chave.texto, semente);
         }
     };
     struct ChaveDoItem {
-        const QString* regua;
-        const QString* numero;
+        QStringView regua;
+        QStringView numero;
         bool operator==(const ChaveDoItem& outro) const {
-            return *numero == *outro.numero && *regua == *outro.regua;
+            return numero == outro.numero && regua == outro.regua;
         }
         friend uint qHash(const ChaveDoItem& chave, uint semente = 0) {
-            return qHash(*chave.regua, semente) ^ (qHash(*chave.numero, semente) * 31u);
+            return qHash(chave.regua, semente) ^ (qHash(chave.numero, semente) * 31u);
         }
     };
 
