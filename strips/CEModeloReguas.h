@@ -75,8 +75,10 @@ public:
         bool operator==(const ChaveDoItem& outro) const {
             return numero == outro.numero && regua == outro.regua;
         }
+        // The strip's hash seeds the number's, as for CCBorneDataReader::ChaveBorne: a seed
+        // takes Qt's better hash, and a strip's numbers spread over the whole table.
         friend uint qHash(const ChaveDoItem& chave, uint semente = 0) {
-            return qHash(chave.regua, semente) ^ (qHash(chave.numero, semente) * 31u);
+            return qHash(chave.numero, qHash(chave.regua, semente));
         }
     };
 
