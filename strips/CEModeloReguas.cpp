@@ -36,6 +36,61 @@ bool Difere(const CEItemLista* a, const CEItemLista* b, const std::vector<std::u
     return false;
 }
 
+// The first value that is not empty among the fields, where the item holds it; an empty
+// text when none: what CCBorneDataReader::Regua and Numero give, without a copy.
+template <NomeLiteral a, NomeLiteral b, NomeLiteral c>
+const QString& PrimeiroDe(const CEItemLista& item) {
+    static const QString kVazio;
+    static const std::uint32_t numeros[] = {NumeroCampo<a>(), NumeroCampo<b>(), NumeroCampo<c>()};
+    for (const std::uint32_t numero : numeros)
+        if (const QString* valor = item.campos.procura(numero); valor && !valor->isEmpty())
+            return *valor;
+    return kVazio;
+}
+
+// A terminal's strip and number, in the three languages; Spanish shares the Portuguese
+// number field.
+const QString& ReguaDe(const CEItemLista& item) {
+    return PrimeiroDe<"REGUA", "STRIP", "REGLETA">(item);
+}
+const QString& NumeroDe(const CEItemLista& item) {
+    return PrimeiroDe<"NUMERO", "NUMBER", "NUMERO">(item);
+}
+
+// The fields of items met one after another, each item's values read once: a pass over a
+// strip compares each terminal with the one before it, and reads each terminal once instead
+// of twice.
+class Vizinhos {
+public:
+    explicit Vizinhos(const std::vector<std::uint32_t>& campos) : campos_(campos) {
+        antes_.resize(campos.size());
+        agora_.resize(campos.size());
+    }
+    // Reads the item's fields, forgetting the one before.
+    void Primeiro(const CEItemLista* item) { Le(item, antes_); }
+    // Reads the item's fields; whether one of them differs from the item read before. The
+    // item becomes the one before.
+    bool Difere(const CEItemLista* item) {
+        Le(item, agora_);
+        std::swap(antes_, agora_);
+        for (size_t i = 0; i < campos_.size(); ++i)
+            if (*antes_[i] != *agora_[i]) return true;
+        return false;
+    }
+
+private:
+    void Le(const CEItemLista* item, std::vector<const QString*>& valores) const {
+        static const QString kVazio;
+        for (size_t i = 0; i < campos_.size(); ++i) {
+            const QString* valor =
+                campos_[i] == CamposItem::kSemNome ? nullptr : item->campos.procura(campos_[i]);
+            valores[i] = valor ? valor : &kVazio;
+        }
+    }
+    const std::vector<std::uint32_t>& campos_;
+    std::vector<const QString*> antes_, agora_;
+};
+
 // Does the terminal have a symbol of this label?
 bool TemRotulo(const CEBorneDwg* borne, const QString& rotulo) {
     for (const CEItemDwg* ligado : borne->ligados)
@@ -126,7 +181,11 @@ bool CEModeloReguas::LeCampoDoSimbolo(const QString& nome) {
 }
 
 CEBorneDwg* CEModeloReguas::Borne(const QString& regua, const QString& numero) const {
-    return bornesPorChave.value(ChaveBorne{regua, numero});
+    return bornesPorChave.value(ChaveDoItem{regua, numero});
+}
+
+CESimboloDwg* CEModeloReguas::Simbolo(const QString& handle) const {
+    return simbolosPorHandle.value(TextoDoItem{handle});
 }
 
 void CEModeloReguas::Monta(const VetorItens& itens, const Parametros& p) {
@@ -158,8 +217,7 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
         CESimboloDwg& simbolo = simbolos.emplace_back(item);
         // The first symbol of a handle keeps it.
         const QString* handle = item->campos.procura(NumeroCampo<"HANDLE">());
-        const QString& texto = handle ? *handle : kSemValor;
-        CESimboloDwg*& primeiro = simbolosPorHandle[texto];
+        CESimboloDwg*& primeiro = simbolosPorHandle[TextoDoItem{handle ? *handle : kSemValor}];
         if (!primeiro) primeiro = &simbolo;
     }
     // By strip, then number, in the three languages; Spanish shares the Portuguese number
@@ -181,9 +239,9 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
     CEReguaDwg* ultima = nullptr;
     bornesPorChave.reserve(terminais.size());
     for (CEItemLista* item : terminais) {
-        const QString nome = CCBorneDataReader::Regua(*item);
+        const QString& nome = ReguaDe(*item);
         // The first of a strip and number wins.
-        CEBorneDwg*& doNumero = bornesPorChave[ChaveBorne{nome, CCBorneDataReader::Numero(*item)}];
+        CEBorneDwg*& doNumero = bornesPorChave[ChaveDoItem{nome, NumeroDe(*item)}];
         if (doNumero) continue;
         CEBorneDwg* const borne = &bornes.emplace_back(item);
         doNumero = borne;
@@ -209,7 +267,7 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
             const QString* relacao = item->campos.procura(rel);
             if (!relacao || relacao->isEmpty()) continue;
             const QString* deQuem = item->campos.procura(handle);
-            if (CESimboloDwg* simbolo = simbolosPorHandle.value(deQuem ? *deQuem : kSemValor))
+            if (CESimboloDwg* simbolo = Simbolo(deQuem ? *deQuem : kSemValor))
                 doLado[nLados++] = simbolo;
         }
         borne->ligados.reserve(size_t(nLados));
@@ -227,7 +285,7 @@ void CEModeloReguas::Constroi(const VetorItens& itens) {
     auto busca = [this](const CEItemLista* ligado, CEBorneDwg* vizinho) -> CEBorneDwg* {
         if (!ligado) return nullptr;
         if (vizinho && vizinho->item == ligado) return vizinho;
-        return Borne(CCBorneDataReader::Regua(*ligado), CCBorneDataReader::Numero(*ligado));
+        return Borne(ReguaDe(*ligado), NumeroDe(*ligado));
     };
     CEBorneDwg* antes = nullptr;
     for (auto borne = bornes.begin(); borne != bornes.end(); ++borne) {
@@ -378,8 +436,10 @@ size_t CEModeloReguas::Corte(const CEReguaDwg& regua, int limite,
     // Without a limit the strip is cut only where a break field changes.
     const size_t ultimoQueCabe = limite > 0 ? size_t(limite) - 1 : n - 1;
     size_t corte = ultimoQueCabe + 1;  // the piece is [0, corte)
+    Vizinhos vizinhos(chaves);
+    vizinhos.Primeiro(lista[0]->item);
     for (size_t i = 1; i <= std::min(ultimoQueCabe, n - 1); ++i)
-        if (Difere(lista[i]->item, lista[i - 1]->item, chaves)) {
+        if (vizinhos.Difere(lista[i]->item)) {
             corte = i;
             quebra = true;
             break;
@@ -460,12 +520,14 @@ void CEModeloReguas::CalculaPontos(double distancia, double refX, double refY) {
 
 void CEModeloReguas::CalculaDetalhes(const QStringList& camposDetalhe) {
     const std::vector<std::uint32_t> campos = Numeros(camposDetalhe);
+    Vizinhos vizinhos(campos);
     for (const auto& regua : reguas) {
         regua->detalhes.clear();
         const auto& lista = regua->bornes;
+        if (!lista.empty()) vizinhos.Primeiro(lista.front()->item);
         std::int32_t desde = 0;
         for (size_t i = 1; i <= lista.size(); ++i) {
-            if (i < lista.size() && !Difere(lista[i]->item, lista[i - 1]->item, campos)) continue;
+            if (i < lista.size() && !vizinhos.Difere(lista[i]->item)) continue;
             regua->detalhes.emplace_back(std::int32_t(i) - desde, lista[i - 1]->item);
             desde = std::int32_t(i);
         }

@@ -12,6 +12,7 @@
 
 #include <QHash>
 #include <QStringList>
+#include <QStringView>
 
 #include <cstdint>
 #include <deque>
@@ -54,13 +55,39 @@ public:
     std::vector<CESimboloDwg*> SimbolosSemBorne();
     using ChaveBorne = CCBorneDataReader::ChaveBorne;
     CEBorneDwg* Borne(const QString& regua, const QString& numero) const;
+    // The first symbol of the handle, or null.
+    CESimboloDwg* Simbolo(const QString& handle) const;
+
+    // Texts the items hold, as keys: views of the text, which stays in the item. A table so
+    // keyed copies no text, and writes nothing into a text's memory (a copy counts itself
+    // there) for each terminal and symbol of the drawing; two keys of other lengths differ
+    // without a look at their texts.
+    struct TextoDoItem {
+        QStringView texto;
+        bool operator==(const TextoDoItem& outro) const { return texto == outro.texto; }
+        friend uint qHash(const TextoDoItem& chave, uint semente = 0) {
+            return qHash(chave.texto, semente);
+        }
+    };
+    struct ChaveDoItem {
+        QStringView regua;
+        QStringView numero;
+        bool operator==(const ChaveDoItem& outro) const {
+            return numero == outro.numero && regua == outro.regua;
+        }
+        // The strip's hash seeds the number's, as for CCBorneDataReader::ChaveBorne: a seed
+        // takes Qt's better hash, and a strip's numbers spread over the whole table.
+        friend uint qHash(const ChaveDoItem& chave, uint semente = 0) {
+            return qHash(chave.numero, qHash(chave.regua, semente));
+        }
+    };
 
     // The terminals and symbols live in blocks of a few, in the order they were made, and
     // stay where they are as more are added: no allocation of their own.
     std::deque<CEBorneDwg> bornes;
-    TabelaChaves<ChaveBorne, CEBorneDwg*> bornesPorChave;
+    TabelaChaves<ChaveDoItem, CEBorneDwg*> bornesPorChave;
     std::deque<CESimboloDwg> simbolos;
-    TabelaChaves<QString, CESimboloDwg*> simbolosPorHandle;
+    TabelaChaves<TextoDoItem, CESimboloDwg*> simbolosPorHandle;
     std::vector<std::unique_ptr<CEPaginaDwg>> paginas;
     std::vector<std::unique_ptr<CEReguaDwg>> reguas;
 

@@ -166,10 +166,32 @@ void DxfWriter::writePatterned(const DbObject& object, const TagPattern::Values&
 
 namespace {
 
-// The text at `at`; its end. An empty value may have no memory at all.
-char* putText(char* at, std::string_view text) {
-    if (!text.empty()) std::memcpy(at, text.data(), text.size());
-    return at + text.size();
+// The text at `at`; its end. An empty value may have no memory at all. The runs and values
+// of a patterned object are mostly a few bytes: those are copied in two overlapping words,
+// without a call.
+[[gnu::always_inline]] inline char* putText(char* at, std::string_view text) {
+    const std::size_t n = text.size();
+    const char* from = text.data();
+    if (n > 16) {
+        std::memcpy(at, from, n);
+    } else if (n >= 8) {
+        std::uint64_t head, tail;
+        std::memcpy(&head, from, 8);
+        std::memcpy(&tail, from + n - 8, 8);
+        std::memcpy(at, &head, 8);
+        std::memcpy(at + n - 8, &tail, 8);
+    } else if (n >= 4) {
+        std::uint32_t head, tail;
+        std::memcpy(&head, from, 4);
+        std::memcpy(&tail, from + n - 4, 4);
+        std::memcpy(at, &head, 4);
+        std::memcpy(at + n - 4, &tail, 4);
+    } else if (n > 0) {
+        at[0] = from[0];
+        at[n / 2] = from[n / 2];
+        at[n - 1] = from[n - 1];
+    }
+    return at + n;
 }
 
 // Upper-case hexadecimal as TagPattern::hexText gives it, at `at`; its end.
@@ -182,64 +204,91 @@ char* putHex(char* at, std::uint64_t value) {
 
 }  // namespace
 
-// The object's text and its extended data put in place at once, their size known
-// beforehand: one growth of the text and plain copies instead of an append, with its checks,
-// for each run and value. False, with nothing written, when a value needs the code page or
-// the pattern has more values than are kept here.
+// An object's text goes first to a room on the stack, in one pass over its runs and values,
+// then to the file's text in one append: no growth of the text by its size worked out
+// beforehand (which fills it with zeros first). An object too long for the room takes that
+// way all the same. False, with nothing written, when a value needs the code page.
 bool DxfWriter::writeWhole(const DbObject& object, const TagPattern::Values& values,
                            const PatternText& rendered) {
-    constexpr std::size_t kMaxPieces = 32;
-    constexpr std::size_t kHexDigits = 16;
-    const std::size_t count = rendered.pieces.size();
-    if (count > kMaxPieces) return false;
-    std::string_view own[kMaxPieces];
+    char room[4096];
+    if (const char* end = putObject(room, room + sizeof room, object, values, rendered)) {
+        out_.append(room, static_cast<std::size_t>(end - room));
+        return true;
+    }
+    return writeSized(object, values, rendered);
+}
+
+namespace {
+// A handle takes at most sixteen digits; a code at most six characters and its line end.
+constexpr std::size_t kHexDigits = 16;
+constexpr std::size_t kCodeLine = 7;
+}  // namespace
+
+char* DxfWriter::putObject(char* at, const char* end, const DbObject& object,
+                           const TagPattern::Values& values, const PatternText& rendered) const {
     const TagPattern& pattern = *values.pattern;
-    std::size_t size = rendered.text.size() + count;
-    for (std::size_t i = 0; i < count; ++i) {
-        const PatternText::Piece& piece = rendered.pieces[i];
-        if (piece.value == TagPattern::Kind::Hole) {
-            own[i] = pattern.holeValue(values, piece.hole);
-            if (legacyEncoding_ && !TextCodec::isAscii(own[i])) return false;
-            size += own[i].size();
-        } else if (piece.value != TagPattern::Kind::Fixed) {
-            size += kHexDigits;
-        }
-    }
-    // A code takes at most six characters and its line end.
-    constexpr std::size_t kCodeLine = 7;
-    const std::span<const Tag> xdata = values.xdata();
-    for (const Tag& item : xdata) {
-        if (legacyEncoding_ && !TextCodec::isAscii(item.value)) return false;
-        size += kCodeLine + item.value.size() + 1;
-    }
-    const std::size_t start = out_.size();
-    out_.resize(start + size);
-    char* at = out_.data() + start;
     const char* text = rendered.text.data();
-    for (std::size_t i = 0; i < count; ++i) {
-        const PatternText::Piece& piece = rendered.pieces[i];
-        std::memcpy(at, text + piece.begin, piece.size);
-        at += piece.size;
+    for (const PatternText::Piece& piece : rendered.pieces) {
+        std::string_view own;
+        if (piece.value == TagPattern::Kind::Hole) {
+            own = pattern.holeValue(values, piece.hole);
+            if (legacyEncoding_ && !TextCodec::isAscii(own)) return nullptr;
+        }
+        if (static_cast<std::size_t>(end - at) < piece.size + own.size() + kHexDigits + 1)
+            return nullptr;
+        at = putText(at, {text + piece.begin, piece.size});
         switch (piece.value) {
             case TagPattern::Kind::Fixed:
                 continue;
             case TagPattern::Kind::Hole:
-                at = putText(at, own[i]);
+                at = putText(at, own);
                 break;
             case TagPattern::Kind::Handle:
-            case TagPattern::Kind::Owner: {
-                const bool handle = piece.value == TagPattern::Kind::Handle;
-                at = putHex(at, handle ? object.handle() : object.ownerHandle());
+                at = putHex(at, object.handle());
                 break;
-            }
+            case TagPattern::Kind::Owner:
+                at = putHex(at, object.ownerHandle());
+                break;
         }
         *at++ = '\n';
     }
-    for (const Tag& item : xdata) {
+    for (const Tag& item : values.xdata()) {
+        if (legacyEncoding_ && !TextCodec::isAscii(item.value)) return nullptr;
+        if (static_cast<std::size_t>(end - at) < kCodeLine + item.value.size() + 1) return nullptr;
         at = putText(putCode(at, item.code), item.value);
         *at++ = '\n';
     }
-    out_.resize(static_cast<std::size_t>(at - out_.data()));
+    return at;
+}
+
+// The same straight into the file's text, its size known beforehand: one growth of the text
+// and plain copies. A value is looked up again as it is copied rather than kept: the look-up
+// is a few loads, cheaper than an array of views made for every object.
+bool DxfWriter::writeSized(const DbObject& object, const TagPattern::Values& values,
+                           const PatternText& rendered) {
+    const TagPattern& pattern = *values.pattern;
+    std::size_t size = rendered.text.size() + rendered.pieces.size();
+    for (const PatternText::Piece& piece : rendered.pieces) {
+        if (piece.value == TagPattern::Kind::Hole) {
+            const std::string_view own = pattern.holeValue(values, piece.hole);
+            if (legacyEncoding_ && !TextCodec::isAscii(own)) return false;
+            size += own.size();
+        } else if (piece.value != TagPattern::Kind::Fixed) {
+            size += kHexDigits;
+        }
+    }
+    for (const Tag& item : values.xdata()) {
+        if (legacyEncoding_ && !TextCodec::isAscii(item.value)) return false;
+        size += kCodeLine + item.value.size() + 1;
+    }
+    // putObject asks for room for a handle and a line end more than a run and its value
+    // take: that much more, so that the exact size passes its checks.
+    size += kHexDigits + 1;
+    const std::size_t start = out_.size();
+    out_.resize(start + size);
+    char* const begin = out_.data() + start;
+    const char* end = putObject(begin, begin + size, object, values, rendered);
+    out_.resize(static_cast<std::size_t>(end - out_.data()));
     return true;
 }
 

@@ -58,6 +58,12 @@ private:
     void writePatterned(const DbObject& object, const TagPattern::Values& values);
     bool writeWhole(const DbObject& object, const TagPattern::Values& values,
                     const PatternText& rendered);
+    bool writeSized(const DbObject& object, const TagPattern::Values& values,
+                    const PatternText& rendered);
+    // The object's text from `at` on; its end, or null when it would pass `end` or a value
+    // needs the code page.
+    char* putObject(char* at, const char* end, const DbObject& object,
+                    const TagPattern::Values& values, const PatternText& rendered) const;
     void writePieces(const DbObject& object, const TagPattern::Values& values,
                      const PatternText& rendered);
     void flush();

@@ -2,8 +2,11 @@
 
 #include "StringArena.h"
 
+#include <algorithm>
 #include <charconv>
 #include <cmath>
+#include <cstdlib>
+#include <iterator>
 
 namespace zvdb {
 
@@ -79,8 +82,100 @@ std::uint64_t TagValues::toHandle(std::string_view text) {
     return result.ec == std::errc() && result.ptr == text.data() + text.size() ? value : 0;
 }
 
+namespace {
+
+// The digits of a positive integer at `at`; their end.
+char* putDigits(char* at, std::uint64_t value, int count) {
+    for (int i = count - 1; i >= 0; --i, value /= 10)
+        at[i] = char('0' + value % 10);
+    return at + count;
+}
+
+int digitCount(std::uint64_t value) {
+    int count = 1;
+    for (; value >= 10; value /= 10)
+        ++count;
+    return count;
+}
+
+// A real of at most six decimals and fifteen digits (the coordinates and sizes a drawing is
+// made of) as to_chars's shortest form writes it, found without its search: the fewest
+// decimals whose number reads back as the value are its digits, and the form is fixed unless
+// the scientific one is shorter. False for any other value, to_chars's own then.
+bool shortReal(double value, char (&buffer)[40], std::size_t& length) {
+    static constexpr double kScales[] = {1, 1e1, 1e2, 1e3, 1e4, 1e5, 1e6};
+    // A double below 1e15 is within a fifth of a unit of the number it rounds to.
+    constexpr double kLimit = 1e15;
+    if (value == 0 || !(std::fabs(value) < kLimit)) return false;
+    int decimals = 0;
+    double scaled = 0;
+    for (;; ++decimals) {
+        if (decimals == int(std::size(kScales))) return false;
+        scaled = std::fabs(value) * kScales[decimals];
+        if (!(scaled < kLimit)) return false;
+        if (std::nearbyint(scaled) / kScales[decimals] == std::fabs(value)) break;
+    }
+    const auto number = static_cast<std::uint64_t>(std::nearbyint(scaled));
+    const int digits = digitCount(number);
+    // The significant digits, without the zeros an integer ends in, and the exponent of the
+    // first.
+    std::uint64_t significant = number;
+    int kept = digits;
+    while (significant % 10 == 0) {
+        significant /= 10;
+        --kept;
+    }
+    const int exponent = digits - 1 - decimals;
+    const int exponentDigits = std::max(2, digitCount(std::uint64_t(std::abs(exponent))));
+    const int fixedLength =
+        decimals == 0 ? digits : (digits > decimals ? digits + 1 : decimals + 2);
+    const int scientificLength = kept + (kept > 1 ? 1 : 0) + 2 + exponentDigits;
+    char* at = buffer;
+    if (value < 0) *at++ = '-';
+    if (fixedLength <= scientificLength) {
+        if (decimals == 0) {
+            at = putDigits(at, number, digits);
+            *at++ = '.';
+            *at++ = '0';
+        } else if (digits > decimals) {
+            std::uint64_t whole = number, fraction = 0, scale = 1;
+            for (int i = 0; i < decimals; ++i, scale *= 10) {
+                fraction += (whole % 10) * scale;
+                whole /= 10;
+            }
+            at = putDigits(at, whole, digits - decimals);
+            *at++ = '.';
+            at = putDigits(at, fraction, decimals);
+        } else {
+            *at++ = '0';
+            *at++ = '.';
+            for (int i = digits; i < decimals; ++i)
+                *at++ = '0';
+            at = putDigits(at, number, digits);
+        }
+    } else {
+        char mantissa[20] = {};
+        putDigits(mantissa, significant, kept);
+        *at++ = mantissa[0];
+        if (kept > 1) {
+            *at++ = '.';
+            for (int i = 1; i < kept; ++i)
+                *at++ = mantissa[i];
+        }
+        *at++ = 'e';
+        *at++ = exponent < 0 ? '-' : '+';
+        at = putDigits(at, std::uint64_t(std::abs(exponent)), exponentDigits);
+    }
+    length = std::size_t(at - buffer);
+    return true;
+}
+
+}  // namespace
+
 std::string TagValues::fromReal(double value) {
     char buffer[40];
+    std::size_t length = 0;
+    if (shortReal(value, buffer, length)) return std::string(buffer, length);
     const auto result = std::to_chars(buffer, buffer + sizeof buffer, value);
     std::string text(buffer, result.ptr);
     if (text.find_first_of(".en") == std::string::npos) text += ".0";

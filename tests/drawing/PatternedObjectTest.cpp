@@ -119,6 +119,40 @@ TEST(PatternedObjects, TheWriterGivesTheSameTextAsTheWholeTags) {
     EXPECT_EQ(DxfWriter::toText(db), patterned);
 }
 
+TEST(PatternedObjects, ValuesAndExtendedDataOfEveryLengthAreWrittenWhole) {
+    // The writer copies short runs and values by words of its own and long ones at once:
+    // each length up to well past a word goes out as the whole tags write it.
+    Database db;
+    BlockRecord* block = sampleBlock(db);
+    std::vector<std::string> values;
+    // And values that make an object longer than the room it is first put in.
+    std::vector<std::size_t> lengths;
+    for (std::size_t n = 0; n <= 40; ++n)
+        lengths.push_back(n);
+    for (const std::size_t n : {900, 1000, 1023, 1024, 1100, 5000})
+        lengths.push_back(n);
+    for (const std::size_t n : lengths) {
+        std::string value;
+        for (std::size_t i = 0; i < n; ++i)
+            value += char('a' + (n + i) % 26);
+        values.push_back(value);
+    }
+    for (std::size_t n = 0; n < values.size(); ++n) {
+        const std::string_view value = values[n];
+        const Made made = insert(db, *block, {double(n), 0.5 * double(n), 0}, {1, 1, 1}, 0, false,
+                                 {value, value, value, value});
+        const std::string_view texts[] = {value, "x"};
+        made.reference->setXDataTexts("ZV_LENGTHS", texts);
+    }
+    const std::string patterned = DxfWriter::toText(db);
+    for (const std::string& value : values)
+        EXPECT_NE(patterned.find("\n  1\n" + value + "\n"), std::string::npos) << value;
+    EXPECT_GT(patternedCount(db), values.size());
+    expandAll(db);
+    EXPECT_EQ(patternedCount(db), 0u);
+    EXPECT_EQ(DxfWriter::toText(db), patterned);
+}
+
 TEST(PatternedObjects, TheWriterGivesTheSameTextAsTheWholeTagsInEitherEncoding) {
     // An older file writes texts outside ASCII in its code page: fixed tags (a tag name) and
     // values given or taken from the definition, in the pattern's text and beside it.

@@ -6,7 +6,9 @@
 
 #include <bit>
 #include <charconv>
+#include <cmath>
 #include <cstdint>
+#include <iterator>
 #include <random>
 #include <string>
 #include <vector>
@@ -82,6 +84,81 @@ TEST(TagValuesReals, ShortDecimalsAreTheDoublesFromCharsGives) {
     EXPECT_EQ(bits(TagValues::toReal("-0")), bits(-0.0));
     EXPECT_EQ(TagValues::toReal("0.1"), 0.1);
     EXPECT_EQ(TagValues::toReal("-12.5"), -12.5);
+}
+
+// A real as tags write it: to_chars's shortest form, ".0" behind a whole number.
+std::string written(double value) {
+    char buffer[40];
+    const auto result = std::to_chars(buffer, buffer + sizeof buffer, value);
+    std::string text(buffer, result.ptr);
+    if (text.find_first_of(".en") == std::string::npos) text += ".0";
+    return text;
+}
+
+TEST(TagValuesReals, AShortRealIsWrittenAsToCharsWritesIt) {
+    // Coordinates and sizes of few decimals take a way of their own: each must come out as
+    // the general one writes it, in its fixed or its scientific form, and so must any
+    // other value.
+    std::mt19937_64 random(48);
+    std::vector<double> values = {0.0,
+                                  -0.0,
+                                  1.0,
+                                  -1.0,
+                                  0.5,
+                                  0.1,
+                                  0.3,
+                                  1e-5,
+                                  1e-6,
+                                  1e-7,
+                                  1.5e-5,
+                                  1e-4,
+                                  0.0001,
+                                  0.00012,
+                                  1e4,
+                                  1e5,
+                                  1.2e5,
+                                  1e6,
+                                  1e14,
+                                  1e15,
+                                  1e16,
+                                  123e12,
+                                  999999999999999.0,
+                                  0.1 + 0.2,
+                                  1.0 / 3,
+                                  2.5e-3,
+                                  6.0 * 0.1,
+                                  -273.15,
+                                  1e300,
+                                  5e-324,
+                                  1e-300};
+    const double scales[] = {1, 1e1, 1e2, 1e3, 1e4, 1e5, 1e6, 1e7};
+    for (int i = -20000; i <= 20000; ++i)
+        for (const double scale : scales)
+            values.push_back(i / scale);
+    for (int i = 0; i < 300000; ++i) {
+        const auto integer =
+            static_cast<std::int64_t>(random() % 2000000000000000ull) - 1000000000000000;
+        const double scale = scales[random() % std::size(scales)];
+        values.push_back(double(integer % (std::int64_t(1) << (random() % 54))) / scale);
+        values.push_back(double(integer) * std::pow(10.0, double(random() % 40) - 20.0));
+        values.push_back(std::bit_cast<double>(random()));
+    }
+    for (int e = -10; e <= 17; ++e)
+        for (const double m : {1.0, 1.5, 2.0, 9.0, 9.5, 12.0, 99.0, 120.0})
+            for (const double sign : {1.0, -1.0})
+                values.push_back(sign * m * std::pow(10.0, e));
+    int differ = 0;
+    for (const double value : values) {
+        const std::string text = TagValues::fromReal(value);
+        if (text != written(value) && ++differ < 10)
+            ADD_FAILURE() << written(value) << " written as " << text;
+    }
+    EXPECT_EQ(differ, 0);
+    EXPECT_EQ(TagValues::fromReal(150), "150.0");
+    EXPECT_EQ(TagValues::fromReal(-12.5), "-12.5");
+    EXPECT_EQ(TagValues::fromReal(100000), "1e+05");
+    EXPECT_EQ(TagValues::fromReal(0.0001), "1e-04");
+    EXPECT_EQ(TagValues::fromReal(0.001), "0.001");
 }
 
 TEST(TagValuesReals, BlanksAPlusSignAndTextThatIsNoNumber) {

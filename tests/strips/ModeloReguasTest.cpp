@@ -119,7 +119,7 @@ TEST_F(ModeloReguasTest, ManyTerminalsStayWhereTheStripsAndSymbolsPointAtThem) {
         }
     EXPECT_EQ(vistos, feitos.size());
     for (int s = 0; s < 400; ++s) {
-        const CESimboloDwg* simbolo = modelo.simbolosPorHandle.value("S" + QString::number(s));
+        const CESimboloDwg* simbolo = modelo.Simbolo("S" + QString::number(s));
         ASSERT_NE(simbolo, nullptr);
         ASSERT_EQ(simbolo->ligados.size(), 1u);
         EXPECT_EQ(simbolo->Ligado(0)->item, feitos[size_t(s) * 5]);
@@ -149,7 +149,7 @@ TEST_F(ModeloReguasTest, SymbolsAreJoinedToTheTerminalsWiredToThem) {
     x1[2]->definirCampo("HANDLE_INI", "A1");
     CEModeloReguas& modelo = Modelo();
     ASSERT_EQ(modelo.simbolos.size(), 2u);
-    const CESimboloDwg* simbolo = modelo.simbolosPorHandle.value("A1");
+    const CESimboloDwg* simbolo = modelo.Simbolo("A1");
     ASSERT_NE(simbolo, nullptr);
     ASSERT_EQ(simbolo->ligados.size(), 2u);
     EXPECT_EQ(simbolo->Ligado(0), modelo.Borne("X1", "1"));
@@ -531,6 +531,45 @@ TEST_F(ModeloReguasTest, DetailRunsCloseWhereAFieldChangesWithTheLastTerminalsFi
     EXPECT_EQ(modelo.reguas[0]->detalhes[0].quantidade, 6);
 }
 
+TEST_F(ModeloReguasTest, RunsAndCutsReadAFieldATerminalLacksAsEmptyAndANameNoneHasAsEqual) {
+    auto x1 = itens_.Regua("X1", 7);
+    // The fifth lacks the field: as empty as the fourth's and the sixth's.
+    const char* lados[] = {"K1", "K1", "K2", "", nullptr, "", "K1"};
+    const char* locais[] = {"+A", "+A", "+A", "+A", "+A", "+B", "+B"};
+    for (size_t i = 0; i < x1.size(); ++i) {
+        if (lados[i]) x1[i]->definirCampo("RELACAO_INI", lados[i]);
+        x1[i]->definirCampo("LOCAL", locais[i]);
+    }
+    CEModeloReguas& modelo = Modelo();
+    modelo.CalculaDetalhes({"NENHUM_ITEM_TEM", "RELACAO_INI", "LOCAL"});
+    QStringList runs;
+    for (const CEDetalheReguaDwg& d : modelo.reguas[0]->detalhes)
+        runs << QString::number(d.quantidade) + "/" + d.ultimo->valorCampo("NUMERO");
+    EXPECT_EQ(runs, QStringList({"2/2", "1/3", "2/5", "1/6", "1/7"}));
+    // Cuts at the limit or where a break field changes, whichever field it is.
+    modelo.CortaReguas(3, {"NENHUM_ITEM_TEM", "LOCAL", "RELACAO_INI"});
+    EXPECT_EQ(Reguas(modelo),
+              QStringList({"X1: 1 2 |", "X1: 3 |", "X1: 4 5 |", "X1: 6 |", "X1: 7"}));
+}
+
+TEST_F(ModeloReguasTest, ASideThatNamesNoHandleJoinsTheFirstSymbolWithoutOne) {
+    CEItemLista* sem = itens_.Simbolo("", "K1", {"1"});
+    itens_.Simbolo("", "K2", {"1"});
+    CEItemLista* com = itens_.Simbolo("A3", "K3", {"1"});
+    auto x1 = itens_.Regua("X1", 3);
+    x1[0]->definirCampo("REL_INI", "K1:1");
+    ItensRegua::Liga(x1[1], "FIM", com, "1");
+    x1[2]->definirCampo("REL_INI", "K9:1");
+    x1[2]->definirCampo("HANDLE_INI", "B9");
+    CEModeloReguas& modelo = Modelo();
+    ASSERT_NE(modelo.Simbolo(""), nullptr);
+    EXPECT_EQ(modelo.Simbolo("")->item, sem);
+    EXPECT_EQ(modelo.Borne("X1", "1")->PrimeiroSimbolo(), modelo.Simbolo(""));
+    EXPECT_EQ(modelo.Borne("X1", "2")->PrimeiroSimbolo(), modelo.Simbolo("A3"));
+    EXPECT_EQ(modelo.Borne("X1", "3")->PrimeiroSimbolo(), nullptr);
+    EXPECT_EQ(modelo.Simbolo("B9"), nullptr);
+}
+
 TEST_F(ModeloReguasTest, ASymbolSpanningTerminalsStandsUnderTheFirstOfThem) {
     CEItemLista* k1 = itens_.Simbolo("A1", "K1", {"1", "2", "3"});
     CEItemLista* k2 = itens_.Simbolo("A2", "K2", {"1"});
@@ -541,10 +580,10 @@ TEST_F(ModeloReguasTest, ASymbolSpanningTerminalsStandsUnderTheFirstOfThem) {
     CEModeloReguas& modelo = Modelo();
     const auto simbolos = modelo.reguas[0]->Simbolos();
     ASSERT_EQ(simbolos.size(), 5u);
-    EXPECT_EQ(simbolos[0], modelo.simbolosPorHandle.value("A1"));
+    EXPECT_EQ(simbolos[0], modelo.Simbolo("A1"));
     EXPECT_EQ(simbolos[1], nullptr);
     EXPECT_EQ(simbolos[2], nullptr);
-    EXPECT_EQ(simbolos[3], modelo.simbolosPorHandle.value("A2"));
+    EXPECT_EQ(simbolos[3], modelo.Simbolo("A2"));
     EXPECT_EQ(simbolos[4], nullptr);
 }
 
