@@ -343,9 +343,8 @@ void CCDataReader::FazLote(const QString& s, const CamposItem& campos,
     const auto quer = [this, lidos](std::uint32_t nome) {
         return lidos ? nome < lidos->size() && (*lidos)[nome] : Quer(nome);
     };
-    // A reading for the sides leaves blank what none of them keeps.
     auto poe = [this, &quer](std::uint32_t nome, const QString& valor) {
-        if (quer(nome)) lote_.push_back({nome, Vale(nome) ? valor : QString()});
+        if (quer(nome)) lote_.push_back({nome, valor});
     };
     for (const auto& [nome, valor] : catalogo.campos)
         poe(CamposItem::numeroComSufixo(nome, s), valor);
@@ -359,6 +358,8 @@ void CCDataReader::FazLote(const QString& s, const CamposItem& campos,
             tag.numero = CamposItem::numero(tag.texto);
         const std::uint32_t nome = s.isEmpty() ? tag.numero : CamposItem::numero(tag.texto + s);
         if (!tag.ligacao && !quer(nome)) continue;
+        // A reading for the sides leaves blank what none of them keeps: the values that cost
+        // a look-up or a call are not worked out.
         if (!tag.ligacao && !Vale(nome)) {
             lote_.push_back({nome, QString()});
             continue;
