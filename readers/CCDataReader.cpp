@@ -1131,7 +1131,7 @@ bool CCDataReader::TiraLote(const std::vector<std::uint64_t>& ordem, std::uint32
 const CCDataReader::EntidadeLida& CCDataReader::EntidadeGuardada(const OdDbObjectId& id,
                                                                  CETemplate* modelo) {
     // A reading made for the sides serves none but their copies.
-    const bool lados = CopiaDosLados();
+    const bool lados = !sufixosLados_.empty() && CopiaDosLados();
     const auto le = [&] {
         lendoLados_ = lados;
         EntidadeLida lida = LeEntidadeGuardada(id, modelo);
