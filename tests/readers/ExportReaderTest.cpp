@@ -857,6 +857,58 @@ TEST_F(ExportTerminalSidesTest, AContactOnATerminalNamesItsComponent) {
     EXPECT_EQ(um->valorCampo("REL_INI"), "-K1");
 }
 
+// Two contacts of one component, each on a terminal: both sides take the component's fields.
+// A reader whose sides keep few names reads the component for them with only the values they
+// keep (and no position), and gives them what a reader of whole readings gives.
+TEST_F(ExportTerminalSidesTest, AComponentOfTwoContactsGivesBothSidesWhatAWholeReadingGives) {
+    k1_ = componente("-K1", {{"A1", {200, 100, 0}}});
+    x1_ = borne("X1", "1", {20, 200, 0});
+    x2_ = borne("X1", "2", {60, 200, 0});
+    componente("-K1", {{"13", {20, 100, 0}}}, "NA-1");
+    componente("-K1", {{"21", {60, 100, 0}}}, "NF-1");
+    fio({{20, 190, 0}, {20, 100, 0}}, "1");
+    fio({{60, 190, 0}, {60, 100, 0}}, "2");
+    ASSERT_TRUE(
+        lisp("(progn (setq EXPORTA 3 chamadas 0) (defun BuscarCoordenadas (e g p x y) "
+             "(setq chamadas (1+ chamadas)) \"B2\"))"));
+    static const auto fica = [](const QString& nome) {
+        return nome.startsWith(QLatin1String("RELACAO_")) ||
+               nome.startsWith(QLatin1String("HANDLE_")) ||
+               nome.startsWith(QLatin1String("REL_")) || nome.startsWith(QLatin1String("LIG_")) ||
+               nome.startsWith(QLatin1String("FIO_"));
+    };
+    struct Filtrado : CCExportDataReader {
+        explicit Filtrado(bool lados) {
+            GuardaSimbolos = false;
+            FiltraSufixos(fica);
+            if (!lados) CopiasDosLados({});
+        }
+    };
+    const auto chamadas = [] { return CICad::GetIntLisp("chamadas", -1); };
+    Filtrado cheio(false);
+    std::unique_ptr<VetorItens> cheios(cheio.Le(&db(), nullptr, true, std::nullopt));
+    const int chamadasCheio = chamadas();
+    ASSERT_TRUE(lisp("(setq chamadas 0)"));
+    Filtrado poucos(true);
+    std::unique_ptr<VetorItens> lidos(poucos.Le(&db(), nullptr, true, std::nullopt));
+    ASSERT_TRUE(cheios && lidos);
+    // Full readings ask for the positions of the component, once for both sides, and of the
+    // two wires; the walk's five symbols ask in both reads.
+    EXPECT_EQ(chamadas(), 5);
+    EXPECT_EQ(chamadasCheio, chamadas() + 3);
+    EXPECT_TRUE(poucos.LeituraGuardada(OdDbObjectId(&db(), k1_->handle())));
+    const QString k1 = handle(k1_);
+    EXPECT_EQ(mesmosItens(*cheios, *lidos,
+                          [&k1](const CEItemLista& b) -> QString {
+                              return b.valorCampo("NUMERO") + "<" + b.valorCampo("RELACAO_INI") +
+                                     (b.valorCampo("HANDLE_INI") == k1 ? "=K1" : "") + "/" +
+                                     b.valorCampo("FIO_SEGINI");
+                          }),
+              QStringList({"1<-K1:13=K1/1", "2<-K1:21=K1/2"}));
+    cheios->destruirItens();
+    lidos->destruirItens();
+}
+
 // The reader names a contact's component while it keeps its readings; once it gave them back,
 // the contact stands for itself.
 TEST_F(ExportTerminalSidesTest, TheComponentsRelationsGoWithTheReadings) {
