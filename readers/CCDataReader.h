@@ -183,9 +183,9 @@ protected:
     // terminals); set it before the read with FiltraSufixos.
     void FiltraSufixos(std::function<bool(const QString& nome)> fica);
     // The suffixes a reader's sides copy their neighbours and wires under. While FiltraSufixos
-    // is set, a reading made for such a copy works out only the values some copy under them
-    // keeps and leaves the others blank (their names stay, in a full reading's order); a copy
-    // under another suffix reads the entity again in full.
+    // is set, a reading made for such a copy leaves blank the values no copy under them keeps
+    // that cost a look-up or a call (their names stay, in a full reading's order); a copy under
+    // another suffix reads the entity again in full.
     void CopiasDosLados(std::vector<QString> sufixos);
     // The whole texts of the wires' entries ("HANDLE#CONNECTION#BLOCK") are kept for the
     // readers that ask for them; one that never does leaves them to the answer.
@@ -319,7 +319,7 @@ private:
         bool rotas = false;
         bool fio = false;    // a polyline's reading
         bool borne = false;  // a terminal's
-        bool lados = false;  // made for the sides' copies: blank where none of them keeps
+        bool lados = false;  // made for the sides' copies: see CopiasDosLados
     };
     // Those asked for since the last turn, and those of the turn before, which move back when
     // asked for again and go at the next turn.
