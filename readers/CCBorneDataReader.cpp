@@ -107,6 +107,11 @@ bool CCBorneDataReader::Invertido(const CEItemLista& borne) {
     return valor->toUpper() == QLatin1String("S");
 }
 
+std::vector<QString> CCBorneDataReader::SufixosDosLados() {
+    return {QStringLiteral("_INI"), QStringLiteral("_FIM"), QStringLiteral("_SEGINI"),
+            QStringLiteral("_SEGFIM")};
+}
+
 QString CCBorneDataReader::SufixoElemento(const CEItemLista& borne, bool insercao) {
     return insercao != Invertido(borne) ? QStringLiteral("_FIM") : QStringLiteral("_INI");
 }

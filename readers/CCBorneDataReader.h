@@ -20,7 +20,11 @@ public:
     CCBorneDataReader() {
         GuardaCompletas = false;
         LimitaEntidadesGuardadas(2048);
+        CopiasDosLados(SufixosDosLados());
     }
+    // The suffixes the sides copy their neighbours (_INI, _FIM) and wires (_SEGINI, _SEGFIM)
+    // under.
+    static std::vector<QString> SufixosDosLados();
     void LerLadoIni(CEItemLista& item, const OdDbObjectId& borne, CETemplate& modelo) override;
     void LerLadoFim(CEItemLista& item, const OdDbObjectId& borne, CETemplate& modelo) override;
     // Reads every page of the database; the page list is not used.

@@ -897,20 +897,27 @@ bool CCDataReader::LoteFio(const QString& s, const CamposItem& campos,
                 s.isEmpty()
                     ? NumeroDoNomeFio(nome)
                     : CamposItem::numero(QString::fromUtf8(nome.data(), int(nome.size())) + s);
-            lote_.push_back({numero, QString::fromUtf8(valor.data(), int(valor.size()))});
+            lote_.push_back({numero, Vale(numero)
+                                         ? QString::fromUtf8(valor.data(), int(valor.size()))
+                                         : QString()});
         }
     }
     const auto& [lista, descricao] = ListaDescricaoFioDe(*chave);
     lote_.push_back({NumeroCampo<"WIRE_LISTA">(s), lista});
     lote_.push_back({NumeroCampo<"DESCRICAO">(s), descricao});
     lote_.push_back({NumeroCampo<"TP_DESCRI">(s), descricao});
-    const LayerLido& layer = LayerDoNome(CICad::NomeLayerUtf8(polilinha));
-    lote_.push_back({NumeroCampo<"POSICAO">(s), !GuardaFios && PosicaoDescartada()
-                                                    ? QString()
-                                                    : PosicaoNoLayer(polilinha, layer)});
-    lote_.push_back({NumeroCampo<"LAYER">(s), layer.nome});
-    lote_.push_back({NumeroCampo<"GRUPO">(s), layer.grupo});
-    lote_.push_back({NumeroCampo<"PAGINA">(s), layer.pagina});
+    const std::uint32_t posicao = NumeroCampo<"POSICAO">(s);
+    const bool semPosicao = (!GuardaFios && PosicaoDescartada()) || !Vale(posicao);
+    const std::uint32_t nomeLayer = NumeroCampo<"LAYER">(s), grupo = NumeroCampo<"GRUPO">(s),
+                        pagina = NumeroCampo<"PAGINA">(s);
+    // The layer's name is looked up only when a value asks for it.
+    static const LayerLido kSemLayer;
+    const bool comLayer = !semPosicao || Vale(nomeLayer) || Vale(grupo) || Vale(pagina);
+    const LayerLido& layer = comLayer ? LayerDoNome(CICad::NomeLayerUtf8(polilinha)) : kSemLayer;
+    lote_.push_back({posicao, semPosicao ? QString() : PosicaoNoLayer(polilinha, layer)});
+    lote_.push_back({nomeLayer, Vale(nomeLayer) ? layer.nome : QString()});
+    lote_.push_back({grupo, Vale(grupo) ? layer.grupo : QString()});
+    lote_.push_back({pagina, Vale(pagina) ? layer.pagina : QString()});
     // QTD as the item has it so far: the last written here, or the item's own.
     const std::uint32_t qtd = NumeroCampo<"QTD">(s);
     const QString* valorQtd = nullptr;
@@ -977,6 +984,41 @@ void CCDataReader::FiltraSufixos(std::function<bool(const QString& nome)> fica) 
     // The names under each suffix were put in order for the filter before.
     for (auto& [nomes, forma] : formas_)
         forma->sufixos.clear();
+    posicoesDescartadas_.clear();
+    // What the sides keep is the filter's: readings made for them under another may lack it.
+    valeNosLados_.clear();
+    if (!sufixosLados_.empty()) {
+        entidadesLidas_.libera();
+        entidadesAntigas_.libera();
+    }
+}
+
+void CCDataReader::CopiasDosLados(std::vector<QString> sufixos) {
+    sufixosLados_ = std::move(sufixos);
+    valeNosLados_.clear();
+    entidadesLidas_.libera();
+    entidadesAntigas_.libera();
+}
+
+bool CCDataReader::CopiaDosLados() const {
+    if (!copiaAvulsa_ || !ficaComSufixo_) return false;
+    return std::any_of(sufixosLados_.begin(), sufixosLados_.end(), [this](const QString& s) {
+        return s.isSharedWith(*copiaAvulsa_) || s == *copiaAvulsa_;
+    });
+}
+
+bool CCDataReader::ValeNosLados(std::uint32_t nome) {
+    if (nome >= valeNosLados_.size()) valeNosLados_.resize(size_t(nome) + 1, 0);
+    char& vale = valeNosLados_[nome];
+    if (!vale) {
+        // QTD always: whether the reading has one decides where a copy puts its "1".
+        const QString& texto = CamposItem::nome(nome);
+        const bool algum = texto == QLatin1String("QTD") ||
+                           std::any_of(sufixosLados_.begin(), sufixosLados_.end(),
+                                       [&](const QString& s) { return ficaComSufixo_(texto + s); });
+        vale = algum ? 1 : 2;
+    }
+    return vale == 1;
 }
 
 CCDataReader::FormaCampos::ComSufixo& CCDataReader::FormaCampos::Com(
@@ -1088,10 +1130,23 @@ bool CCDataReader::TiraLote(const std::vector<std::uint64_t>& ordem, std::uint32
 
 const CCDataReader::EntidadeLida& CCDataReader::EntidadeGuardada(const OdDbObjectId& id,
                                                                  CETemplate* modelo) {
-    if (const EntidadeLida* achado = entidadesLidas_.procura(id)) return *achado;
+    // A reading made for the sides serves none but their copies.
+    const bool lados = !sufixosLados_.empty() && CopiaDosLados();
+    const auto le = [&] {
+        lendoLados_ = lados;
+        EntidadeLida lida = LeEntidadeGuardada(id, modelo);
+        lendoLados_ = false;
+        lida.lados = lados;
+        return lida;
+    };
+    if (const EntidadeLida* achado = entidadesLidas_.procura(id)) {
+        if (lados || !achado->lados) return *achado;
+        avulsa_ = le();
+        return avulsa_;
+    }
     EntidadeLida lida;
-    if (!entidadesAntigas_.retira(id, lida)) {
-        lida = LeEntidadeGuardada(id, modelo);
+    if (!entidadesAntigas_.retira(id, lida) || (lida.lados && !lados)) {
+        lida = le();
         if ((lida.fio && !GuardaFios) || (lida.borne && !GuardaBornes)) {
             avulsa_ = std::move(lida);
             return avulsa_;
@@ -1109,7 +1164,12 @@ const CCDataReader::EntidadeLida& CCDataReader::EntidadeGuardada(const OdDbObjec
 bool CCDataReader::PosicaoDescartada() const {
     // Only a wire's reading that serves one copy, under a suffix whose filter drops it.
     if (!copiaAvulsa_ || GuardaFios || !ficaComSufixo_ || copiaAvulsa_->isEmpty()) return false;
-    return !ficaComSufixo_(CamposItem::nome(NumeroCampo<"POSICAO">(*copiaAvulsa_)));
+    for (const auto& [sufixo, descartada] : posicoesDescartadas_)
+        if (sufixo.isSharedWith(*copiaAvulsa_) || sufixo == *copiaAvulsa_) return descartada;
+    const bool descartada =
+        !ficaComSufixo_(CamposItem::nome(NumeroCampo<"POSICAO">(*copiaAvulsa_)));
+    posicoesDescartadas_.emplace_back(*copiaAvulsa_, descartada);
+    return descartada;
 }
 
 void CCDataReader::CopiaEntidade(const QString& sufixo, CEItemLista& item, const OdDbObjectId& id,

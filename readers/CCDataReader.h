@@ -182,6 +182,11 @@ protected:
     // reader whose items are asked for few of their neighbours' fields (the strip drawing's
     // terminals); set it before the read with FiltraSufixos.
     void FiltraSufixos(std::function<bool(const QString& nome)> fica);
+    // The suffixes a reader's sides copy their neighbours and wires under. While FiltraSufixos
+    // is set, a reading made for such a copy leaves blank the values no copy under them keeps
+    // that cost a look-up or a call (their names stay, in a full reading's order); a copy under
+    // another suffix reads the entity again in full.
+    void CopiasDosLados(std::vector<QString> sufixos);
     // The whole texts of the wires' entries ("HANDLE#CONNECTION#BLOCK") are kept for the
     // readers that ask for them; one that never does leaves them to the answer.
     bool GuardaCompletas = true;
@@ -314,6 +319,7 @@ private:
         bool rotas = false;
         bool fio = false;    // a polyline's reading
         bool borne = false;  // a terminal's
+        bool lados = false;  // made for the sides' copies: see CopiasDosLados
     };
     // Those asked for since the last turn, and those of the turn before, which move back when
     // asked for again and go at the next turn.
@@ -334,6 +340,23 @@ private:
     // drops it.
     const QString* copiaAvulsa_ = nullptr;
     bool PosicaoDescartada() const;
+    // PosicaoDescartada's answers by suffix: every wire of a side asks, under a few suffixes.
+    mutable std::vector<std::pair<QString, bool>> posicoesDescartadas_;
+    // What CopiasDosLados set, and by name number without suffix whether a copy under one of
+    // those suffixes keeps it: 0 not asked yet, 1 kept, 2 not.
+    std::vector<QString> sufixosLados_;
+    std::vector<char> valeNosLados_;
+    // Whether the copy being made is one of the sides' under the filter.
+    bool CopiaDosLados() const;
+    // While a reading for the sides is made, whether the value of the name (without suffix) is
+    // worked out; always outside one.
+    bool lendoLados_ = false;
+    bool Vale(std::uint32_t nome) {
+        if (!lendoLados_) return true;
+        const char vale = nome < valeNosLados_.size() ? valeNosLados_[nome] : 0;
+        return vale ? vale == 1 : ValeNosLados(nome);
+    }
+    bool ValeNosLados(std::uint32_t nome);
     // The entity read apart into the form CopiaEntidade keeps.
     EntidadeLida LeEntidadeGuardada(const OdDbObjectId& id, CETemplate* modelo);
     // The item each reading is made in and the names it gave: their arrays serve the next.

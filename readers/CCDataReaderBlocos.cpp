@@ -358,6 +358,12 @@ void CCDataReader::FazLote(const QString& s, const CamposItem& campos,
             tag.numero = CamposItem::numero(tag.texto);
         const std::uint32_t nome = s.isEmpty() ? tag.numero : CamposItem::numero(tag.texto + s);
         if (!tag.ligacao && !quer(nome)) continue;
+        // A reading for the sides leaves blank what none of them keeps: the values that cost
+        // a look-up or a call are not worked out.
+        if (!tag.ligacao && !Vale(nome)) {
+            lote_.push_back({nome, QString()});
+            continue;
+        }
         const QString& valor = ValorDoTexto(atributo.valor);
         poe(nome, valor);
         if (tag.ligacao) ligacoesLidas_.push_back({tag.texto, valor, atributo.id});
@@ -374,10 +380,13 @@ void CCDataReader::FazLote(const QString& s, const CamposItem& campos,
         }
     }
     const NomesDoLote& nomes = NomesDoLoteCom(s);
-    poe(nomes.handle, ZVString::DeHandle(referencia.handle()));
+    poe(nomes.handle, Vale(nomes.handle) ? ZVString::DeHandle(referencia.handle()) : QString());
     // PAINEL and LOCAL hold the same value: templates use either name.
     if (quer(nomes.painel) || quer(nomes.local) || quer(nomes.circuito)) {
-        const Circuito& circuito = CircuitoDe(lido.temCircuito, lido.circuito);
+        static const Circuito kSemCircuito;
+        const bool vale = Vale(nomes.painel) || Vale(nomes.local) || Vale(nomes.circuito);
+        const Circuito& circuito =
+            vale ? CircuitoDe(lido.temCircuito, lido.circuito) : kSemCircuito;
         poe(nomes.painel, circuito.painel);
         poe(nomes.local, circuito.painel);
         poe(nomes.circuito, circuito.circuito);
@@ -389,7 +398,8 @@ void CCDataReader::FazLote(const QString& s, const CamposItem& campos,
     const LayerLido& layer = LayerDoNome(lido.layer);
     // A reference's position is its insertion point; anything else is asked the long way.
     if (quer(nomes.posicao))
-        poe(nomes.posicao, !lido.referencia        ? Posicao(referencia)
+        poe(nomes.posicao, !Vale(nomes.posicao)    ? QString()
+                           : !lido.referencia      ? Posicao(referencia)
                            : layer.grupo.isEmpty() ? QStringLiteral("??")
                                                    : PosicaoNoPonto(referencia, layer.grupo,
                                                                     layer.pagina, lido.posicao));

@@ -17,6 +17,7 @@ public:
     CCExportDataReader() {
         GuardaSimbolos = true;
         PreveCampos = false;
+        CopiasDosLados(CCBorneDataReader::SufixosDosLados());
     }
     // A terminal's two sides are the hooks on the terminal itself: what is wired at its
     // insertion point, and at its cut point.

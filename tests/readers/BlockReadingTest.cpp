@@ -314,6 +314,12 @@ public:
     void Filtra(std::function<bool(const QString&)> fica) { FiltraSufixos(std::move(fica)); }
 };
 
+// A reader whose sides copy their neighbours under _INI and _FIM, as a terminal's do.
+class LeitorDosLados : public LeitorFiltrado {
+public:
+    LeitorDosLados() { CopiasDosLados({QStringLiteral("_INI"), QStringLiteral("_FIM")}); }
+};
+
 // A reader whose items of symbols are copies of kept readings, as the exports' are.
 class LeitorQueCopia : public LeitorBase {
 public:
@@ -362,6 +368,53 @@ TEST_F(BlockReadingTest, ACopyUnderASuffixKeepsOnlyTheNamesItsReaderAsksFor) {
     const CEItemLista fim = copia(leitor, "_FIM", k);
     EXPECT_EQ(fim.campos.keys(), cheio.campos.keys());
     EXPECT_EQ(fim.campos.values(), cheio.campos.values());
+}
+
+// A symbol read for the sides' copies works out only the values those keep (no position asked
+// when none keeps it) and is kept for them; a copy under another suffix, or none, reads it again
+// whole.
+TEST_F(BlockReadingTest, AReadingForTheSidesWorksOutWhatTheyKeepAndServesNoOtherCopy) {
+    ASSERT_TRUE(
+        lisp("(progn (setq chamadas 0) (defun BuscarCoordenadas (e g p x y) "
+             "(setq chamadas (1+ chamadas)) \"B2\"))"));
+    const auto chamadas = [] { return CICad::GetIntLisp("chamadas", -1); };
+    const OdDbObjectId k = Simbolo("NA-1", "A1", "ESQ$0001$A",
+                                   {{"REGUA", "X1"}, {"NUMERO", "5"}, {"BITOLA", "2,5"}}, 40);
+    LeitorBase todos;
+    LeitorDosLados leitor;
+    leitor.Filtra([](const QString& nome) {
+        return nome == "REGUA_INI" || nome == "HANDLE_INI" || nome == "NUMERO_FIM" ||
+               nome == "QTD_FIM" || nome == "POSICAO_ZQ" || nome == "BITOLA_ZQ";
+    });
+    const auto copia = [&k](CCDataReader& r, const QString& sufixo) {
+        CEItemLista item;
+        r.CopiaEntidade(sufixo, item, k, nullptr);
+        return item;
+    };
+    for (int vez = 0; vez < 2; ++vez) {  // the second time from the kept reading
+        const CEItemLista ini = copia(leitor, "_INI");
+        EXPECT_EQ(ini.campos.keys(), QStringList({"REGUA_INI", "HANDLE_INI"}));
+        EXPECT_EQ(ini.valorCampo("REGUA_INI"), "X1");
+        EXPECT_EQ(ini.valorCampo("HANDLE_INI"), handle(k));
+        const CEItemLista fim = copia(leitor, "_FIM");
+        EXPECT_EQ(fim.valorCampo("NUMERO_FIM"), "5");
+        EXPECT_EQ(fim.valorCampo("QTD_FIM"), "1");
+        EXPECT_EQ(fim.campos.size(), 2);
+    }
+    EXPECT_TRUE(leitor.LeituraGuardada(k));
+    EXPECT_EQ(chamadas(), 0);
+    // The values the sides left out are there for a copy under another suffix.
+    const CEItemLista zq = copia(leitor, "_ZQ");
+    EXPECT_EQ(zq.valorCampo("POSICAO_ZQ"), "B2");
+    EXPECT_EQ(zq.valorCampo("BITOLA_ZQ"), "2,5");
+    EXPECT_EQ(chamadas(), 1);
+    const CEItemLista inteiro = copia(leitor, QString());
+    const CEItemLista cheio = copia(todos, QString());
+    EXPECT_EQ(inteiro.campos.keys(), cheio.campos.keys());
+    EXPECT_EQ(inteiro.campos.values(), cheio.campos.values());
+    EXPECT_EQ(inteiro.valorCampo("DESCRICAO"), "Owner");
+    // And the sides' copies go on as before.
+    EXPECT_EQ(copia(leitor, "_INI").valorCampo("REGUA_INI"), "X1");
 }
 
 // The key read to tell whether a symbol makes an item is the start of the kept reading made

@@ -349,6 +349,20 @@ TEST_F(ConnectionQueriesTest, AWireReadForOneCopyLeavesOutThePositionItsCopyDrop
     EXPECT_EQ(chamadas(), 1);
     EXPECT_EQ(copia(true, "LAYER_SEGINI"), "2 7 ");
     EXPECT_EQ(chamadas(), 2);
+    // One reader asks its filter once per suffix: each suffix keeps its own answer.
+    Leitor leitor(false);
+    leitor.Filtra([](const QString& nome) {
+        return nome == "FIO_SEGINI" || nome == "FIO_SEGFIM" || nome == "POSICAO_SEGINI";
+    });
+    QStringList posicoes;
+    for (const char* sufixo : {"_SEGINI", "_SEGFIM", "_SEGINI", "_SEGFIM"}) {
+        CEItemLista item;
+        leitor.CopiaEntidade(sufixo, item, id(w), nullptr);
+        posicoes << item.valorCampo(QLatin1String("FIO") + sufixo) + "@" +
+                        item.valorCampo(QLatin1String("POSICAO") + sufixo);
+    }
+    EXPECT_EQ(posicoes, QStringList({"7@B2", "7@", "7@B2", "7@"}));
+    EXPECT_EQ(chamadas(), 4);
 }
 
 // ---- neighbours along a wire

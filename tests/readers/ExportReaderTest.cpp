@@ -625,6 +625,78 @@ TEST_F(ExportTerminalSidesTest, ComponentsReadAgainForTheSidesGiveTheSameSidesAn
     relidos->destruirItens();
 }
 
+// A reader whose sides keep few names (as the strip drawing's) reads their neighbours and wires
+// with only the values those keep: it asks for no position the sides drop, and its items are a
+// full read's, less the names dropped under the sides' suffixes.
+TEST_F(ExportTerminalSidesTest, NeighboursReadForFewNamesGiveTheSidesAFullReadGives) {
+    const auto [um, ponte] = duasBornesLigadas();
+    Q_UNUSED(um);
+    Q_UNUSED(ponte);
+    componente("-K2", {{"A1", {60, 100, 0}}});
+    fio({{60, 190, 0}, {60, 100, 0}}, "2");
+    ASSERT_TRUE(
+        lisp("(progn (setq EXPORTA 3 chamadas 0) (defun BuscarCoordenadas (e g p x y) "
+             "(setq chamadas (1+ chamadas)) \"B2\"))"));
+    static const auto doLado = [](const QString& nome) {
+        for (const char* sufixo : {"_INI", "_FIM", "_SEGINI", "_SEGFIM"})
+            if (nome.endsWith(QLatin1String(sufixo))) return true;
+        return false;
+    };
+    static const auto fica = [](const QString& nome) {
+        for (const char* base : {"RELACAO", "TAG", "ETIQUETA", "REGUA", "STRIP", "REGLETA",
+                                 "NUMERO", "NUMBER", "HANDLE", "REL", "LIG", "FIO", "DESCRICAO"})
+            for (const char* sufixo : {"_INI", "_FIM", "_SEGINI", "_SEGFIM"})
+                if (nome == QLatin1String(base) + QLatin1String(sufixo)) return true;
+        return nome.startsWith(QLatin1String("LIG_"));
+    };
+    struct Filtrado : CCExportDataReader {
+        explicit Filtrado(bool lados) {
+            GuardaFios = false;
+            GuardaBornes = false;
+            GuardaSimbolos = false;
+            LimitaEntidadesGuardadas(1);
+            FiltraSufixos(fica);
+            if (!lados) CopiasDosLados({});
+        }
+    };
+    const auto chamadas = [] { return CICad::GetIntLisp("chamadas", -1); };
+    CCExportDataReader inteiro;
+    std::unique_ptr<VetorItens> inteiros(inteiro.Le(&db(), nullptr, true, std::nullopt));
+    ASSERT_TRUE(lisp("(setq chamadas 0)"));
+    Filtrado cheios(false);
+    std::unique_ptr<VetorItens> lidosCheios(cheios.Le(&db(), nullptr, true, std::nullopt));
+    const int chamadasCheios = chamadas();
+    ASSERT_TRUE(lisp("(setq chamadas 0)"));
+    Filtrado poucos(true);
+    std::unique_ptr<VetorItens> lidosPoucos(poucos.Le(&db(), nullptr, true, std::nullopt));
+    ASSERT_TRUE(inteiros && lidosCheios && lidosPoucos);
+    // The walk asks for the position of each symbol it reads; the sides' full readings of the
+    // two components, and of the two terminals as each other's neighbour, ask again.
+    EXPECT_EQ(chamadasCheios, chamadas() + 4);
+    EXPECT_EQ(mesmosItens(*lidosCheios, *lidosPoucos,
+                          [](const CEItemLista& b) -> QString {
+                              return b.valorCampo("NUMERO") + "<" + b.valorCampo("RELACAO_INI") +
+                                     ">" + b.valorCampo("RELACAO_FIM") + "/" +
+                                     b.valorCampo("FIO_SEGINI") + "/" + b.valorCampo("FIO_SEGFIM") +
+                                     (b.valorCampo("DESCRICAO_INI").isEmpty() ? "" : "/D");
+                          }),
+              QStringList({"1<-K1:A1>X1:2/1/5/D", "2<-K2:A1>X1:1/2/5/D"}));
+    ASSERT_EQ(inteiros->size(), lidosPoucos->size());
+    for (size_t i = 0; i < inteiros->size(); ++i) {
+        QMap<QString, QString> esperados, vistos;
+        for (auto it = (*inteiros)[i]->campos.constBegin(); it != (*inteiros)[i]->campos.constEnd();
+             ++it)
+            if (!doLado(it.key()) || fica(it.key())) esperados.insert(it.key(), it.value());
+        for (auto it = (*lidosPoucos)[i]->campos.constBegin();
+             it != (*lidosPoucos)[i]->campos.constEnd(); ++it)
+            vistos.insert(it.key(), it.value());
+        EXPECT_EQ(vistos, esperados) << i;
+    }
+    inteiros->destruirItens();
+    lidosCheios->destruirItens();
+    lidosPoucos->destruirItens();
+}
+
 // A reader may drop a component's fields as the walk makes it, and a terminal's once its sides
 // are read: the sides read the drawing's objects, not those items, so each item is the one a
 // full read gives, less what was dropped.
@@ -783,6 +855,58 @@ TEST_F(ExportTerminalSidesTest, AContactOnATerminalNamesItsComponent) {
     // The contact's connection, the component's relation.
     EXPECT_EQ(um->valorCampo("RELACAO_INI"), "-K1:13");
     EXPECT_EQ(um->valorCampo("REL_INI"), "-K1");
+}
+
+// Two contacts of one component, each on a terminal: both sides take the component's fields.
+// A reader whose sides keep few names reads the component for them with only the values they
+// keep (and no position), and gives them what a reader of whole readings gives.
+TEST_F(ExportTerminalSidesTest, AComponentOfTwoContactsGivesBothSidesWhatAWholeReadingGives) {
+    k1_ = componente("-K1", {{"A1", {200, 100, 0}}});
+    x1_ = borne("X1", "1", {20, 200, 0});
+    x2_ = borne("X1", "2", {60, 200, 0});
+    componente("-K1", {{"13", {20, 100, 0}}}, "NA-1");
+    componente("-K1", {{"21", {60, 100, 0}}}, "NF-1");
+    fio({{20, 190, 0}, {20, 100, 0}}, "1");
+    fio({{60, 190, 0}, {60, 100, 0}}, "2");
+    ASSERT_TRUE(
+        lisp("(progn (setq EXPORTA 3 chamadas 0) (defun BuscarCoordenadas (e g p x y) "
+             "(setq chamadas (1+ chamadas)) \"B2\"))"));
+    static const auto fica = [](const QString& nome) {
+        return nome.startsWith(QLatin1String("RELACAO_")) ||
+               nome.startsWith(QLatin1String("HANDLE_")) ||
+               nome.startsWith(QLatin1String("REL_")) || nome.startsWith(QLatin1String("LIG_")) ||
+               nome.startsWith(QLatin1String("FIO_"));
+    };
+    struct Filtrado : CCExportDataReader {
+        explicit Filtrado(bool lados) {
+            GuardaSimbolos = false;
+            FiltraSufixos(fica);
+            if (!lados) CopiasDosLados({});
+        }
+    };
+    const auto chamadas = [] { return CICad::GetIntLisp("chamadas", -1); };
+    Filtrado cheio(false);
+    std::unique_ptr<VetorItens> cheios(cheio.Le(&db(), nullptr, true, std::nullopt));
+    const int chamadasCheio = chamadas();
+    ASSERT_TRUE(lisp("(setq chamadas 0)"));
+    Filtrado poucos(true);
+    std::unique_ptr<VetorItens> lidos(poucos.Le(&db(), nullptr, true, std::nullopt));
+    ASSERT_TRUE(cheios && lidos);
+    // Full readings ask for the positions of the component, once for both sides, and of the
+    // two wires; the walk's five symbols ask in both reads.
+    EXPECT_EQ(chamadas(), 5);
+    EXPECT_EQ(chamadasCheio, chamadas() + 3);
+    EXPECT_TRUE(poucos.LeituraGuardada(OdDbObjectId(&db(), k1_->handle())));
+    const QString k1 = handle(k1_);
+    EXPECT_EQ(mesmosItens(*cheios, *lidos,
+                          [&k1](const CEItemLista& b) -> QString {
+                              return b.valorCampo("NUMERO") + "<" + b.valorCampo("RELACAO_INI") +
+                                     (b.valorCampo("HANDLE_INI") == k1 ? "=K1" : "") + "/" +
+                                     b.valorCampo("FIO_SEGINI");
+                          }),
+              QStringList({"1<-K1:13=K1/1", "2<-K1:21=K1/2"}));
+    cheios->destruirItens();
+    lidos->destruirItens();
 }
 
 // The reader names a contact's component while it keeps its readings; once it gave them back,
