@@ -1175,7 +1175,7 @@ CEItemLista* CCDataReader::CriaItemBloco(const OdDbObjectId& referencia, CETempl
         chaveLidaDe_ = OdDbObjectId();
     } else {
         CICad::CompletaLeituraSimbolo(referencia, simbolo_);
-        LeSimboloLido(QString(), *item, referencia);
+        LeSimboloCortado(*item, referencia);
     }
     if (lida) lidaAgora_ = referencia;
     LerLadoIni(*item, referencia, modelo);

@@ -300,6 +300,20 @@ void CCDataReader::LeSimboloLido(const QString& s, CEItemLista& item,
     JuntaLote(item);
 }
 
+void CCDataReader::LeSimboloCortado(CEItemLista& item, const OdDbObjectId& referencia) {
+    CamposDoSimbolo* campos =
+        simbolo_.referencia
+            ? CamposDaLeitura(simbolo_.bloco, ChaveDoTexto(simbolo_.textoChave).chave)
+            : nullptr;
+    camposDaLeitura_ = campos;
+    LeSimboloLido(QString(), item, referencia);
+    camposDaLeitura_ = nullptr;
+    if (!campos || !campos->Inteiro(item)) return;
+    // The reader wants this one whole after all: `simbolo_` still holds its reading.
+    item.campos.clear();
+    LeSimboloLido(QString(), item, referencia);
+}
+
 const CCDataReader::NomesDoLote& CCDataReader::NomesDoLoteCom(const QString& s) {
     for (const NomesDoLote& feitos : nomesDoLote_)
         if (feitos.feitos && feitos.sufixo.isSharedWith(s)) return feitos;
@@ -339,8 +353,10 @@ void CCDataReader::FazLote(const QString& s, const CamposItem& campos,
     chave.catalogo = &catalogo;
     lote_.clear();
     const std::vector<char>* lidos = CamposLidos;
+    CamposDoSimbolo* doSimbolo = camposDaLeitura_;
     // A value no field will hold is not worked out: its name is still numbered in turn.
-    const auto quer = [this, lidos](std::uint32_t nome) {
+    const auto quer = [this, lidos, doSimbolo](std::uint32_t nome) {
+        if (doSimbolo) return doSimbolo->Quer(nome);
         return lidos ? nome < lidos->size() && (*lidos)[nome] : Quer(nome);
     };
     auto poe = [this, &quer](std::uint32_t nome, const QString& valor) {
