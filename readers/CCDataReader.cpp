@@ -90,6 +90,7 @@ void CCDataReader::LiberaLeiturasDeEntidades() {
     versaoIndices_ = 0;
     indiceAtual_ = nullptr;
     layerDoUltimo_ = nullptr;
+    ultimoLayer_ = nullptr;
     ultimaOrdem_ = nullptr;
     rotasLidas_ = false;
     corteDe_ = OdDbObjectId();

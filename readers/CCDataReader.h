@@ -455,6 +455,8 @@ private:
         QString nome, grupo, pagina;
     };
     mutable PorTexto<LayerLido> layers_;
+    // The entry LayerDoNome gave last.
+    mutable const std::pair<const std::string, LayerLido>* ultimoLayer_ = nullptr;
     // Per cable record, by its handle's text as the core holds it: its CABO or CABLE
     // attribute, shared by its cores.
     mutable PorTexto<std::optional<QString>> numerosCabos_;

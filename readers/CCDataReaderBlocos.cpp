@@ -99,14 +99,19 @@ const QString& CCDataReader::ValorDoTexto(std::string_view valor) const {
 }
 
 const CCDataReader::LayerLido& CCDataReader::LayerDoNome(std::string_view nome) const {
+    // A block's symbols come page by page: most ask for the layer the one before asked for.
+    if (ultimoLayer_ && ultimoLayer_->first == nome) return ultimoLayer_->second;
     auto it = layers_.find(nome);
-    if (it != layers_.end()) return it->second;
-    LayerLido lido;
-    lido.nome = Texto(nome);
-    const std::pair<QString, QString>& partes = GrupoPagina(lido.nome);
-    lido.grupo = partes.first;
-    lido.pagina = partes.second;
-    return layers_.emplace(std::string(nome), std::move(lido)).first->second;
+    if (it == layers_.end()) {
+        LayerLido lido;
+        lido.nome = Texto(nome);
+        const std::pair<QString, QString>& partes = GrupoPagina(lido.nome);
+        lido.grupo = partes.first;
+        lido.pagina = partes.second;
+        it = layers_.emplace(std::string(nome), std::move(lido)).first;
+    }
+    ultimoLayer_ = &*it;
+    return it->second;
 }
 
 const QString& CCDataReader::LayerDe(const OdDbObjectId& entidade) const {

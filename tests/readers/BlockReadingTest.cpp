@@ -489,3 +489,28 @@ TEST_F(BlockReadingTest, ASymbolCutByItsKeyGetsOnlyTheNamesItsReaderAsksFor) {
     EXPECT_EQ(refeito->campos.keys(), todoO.campos.keys());
     EXPECT_EQ(refeito->campos.values(), todoO.campos.values());
 }
+
+// Symbols of one layer in a row, another's between them, and the reads given back between
+// two of the same layer: each gets its own layer, group and page.
+TEST_F(BlockReadingTest, SymbolsOfLayersInTurnEachGetTheirOwnLayer) {
+    const OdDbObjectId a1 = Simbolo("NA-1", "A1", "ESQ$0001$A", {}, 0);
+    const OdDbObjectId a2 = Simbolo("NA-1", "A1", "ESQ$0001$A", {}, 10);
+    const OdDbObjectId b = Simbolo("NA-1", "A1", "MEC$0007$B", {}, 20);
+    const OdDbObjectId c = Simbolo("NA-1", "A1", "SOLTO", {}, 30);
+    LeitorBase leitor;
+    const auto layer = [&](const OdDbObjectId& id) -> QString {
+        const CEItemLista item = Le(leitor, id);
+        return item.valorCampo("LAYER") + "|" + item.valorCampo("GRUPO") + "|" +
+               item.valorCampo("PAGINA");
+    };
+    for (int vez = 0; vez < 2; ++vez) {
+        EXPECT_EQ(layer(a1), "ESQ$0001$A|ESQ|0001");
+        EXPECT_EQ(layer(a2), "ESQ$0001$A|ESQ|0001");
+        EXPECT_EQ(layer(b), "MEC$0007$B|MEC|0007");
+        EXPECT_EQ(layer(c), "SOLTO||");
+        EXPECT_EQ(layer(a1), "ESQ$0001$A|ESQ|0001");
+        leitor.LiberaLeituras();
+    }
+    EXPECT_EQ(leitor.LayerDe(b), "MEC$0007$B");
+    EXPECT_EQ(leitor.LayerDe(a2), "ESQ$0001$A");
+}
