@@ -98,10 +98,14 @@ bool Literal(const QString& fatia) {
 
 }  // namespace
 
-std::optional<QSet<QString>> CETemplateLisp::CamposDaExpressao(const QString& expressao) {
+namespace {
+
+// The names an expression looks fields up by, as it writes them, (assoc "NAME" reg), when
+// that is all it reads of the item, among plain functions; none otherwise.
+std::optional<QStringList> NomesDaExpressao(const QString& expressao) {
     QStringList fatias;
     if (!Fatias(expressao, fatias)) return std::nullopt;
-    QSet<QString> nomes;
+    QStringList nomes;
     for (int i = 0; i < fatias.size(); ++i) {
         const QString& fatia = fatias[i];
         if (fatia == "(" || fatia == ")" || Literal(fatia) || Numero(fatia)) continue;
@@ -111,12 +115,59 @@ std::optional<QSet<QString>> CETemplateLisp::CamposDaExpressao(const QString& ex
                                  fatias[i - 2].toLower() == "assoc" && Literal(fatias[i - 1]) &&
                                  fatias[i + 1] == ")";
             if (!porNome) return std::nullopt;
-            nomes << fatias[i - 1].mid(1, fatias[i - 1].size() - 2).toUpper();
+            nomes << fatias[i - 1].mid(1, fatias[i - 1].size() - 2);
         } else if (!Simples(fatia)) {
             return std::nullopt;
         }
     }
     return nomes;
+}
+
+// Answers kept per filter text: a filter over a field of values that never repeat keeps
+// this many at most.
+constexpr int kMaxRespostas = 4096;
+
+}  // namespace
+
+std::optional<QSet<QString>> CETemplateLisp::CamposDaExpressao(const QString& expressao) {
+    const std::optional<QStringList> nomes = NomesDaExpressao(expressao);
+    if (!nomes) return std::nullopt;
+    QSet<QString> campos;
+    for (const QString& nome : *nomes)
+        campos << nome.toUpper();
+    return campos;
+}
+
+void CETemplateLisp::LeFiltro(const QString& filtro) {
+    static const QString simboloResposta("INVOKELISP_LISTAS_TMP");
+    filtroLido_ = filtro;
+    avaliacao_ = "(progn (setq " + simboloResposta + " " + filtro + " ) (princ))";
+    respostas_.clear();
+    nomesDoFiltro_.reset();
+    const std::optional<QStringList> nomes = NomesDaExpressao(filtro);
+    if (!nomes) return;
+    nomesDoFiltro_.emplace();
+    for (const QString& nome : *nomes)
+        nomesDoFiltro_->push_back({nome, CamposItem::kSemNome});
+}
+
+void CETemplateLisp::ChaveDoFiltro(const CEItemLista& item, QString& chave) {
+    chave.clear();
+    for (auto& [nome, numero] : *nomesDoFiltro_) {
+        // A name not numbered yet may be by the next item.
+        if (numero == CamposItem::kSemNome) numero = CamposItem::numeroSeHouver(nome);
+        const QString* valor =
+            numero == CamposItem::kSemNome ? nullptr : item.campos.procura(numero);
+        // Absent, or present with the value's length first: no two keys read alike.
+        if (!valor) {
+            chave += QChar(0);
+            continue;
+        }
+        chave += QChar(1);
+        chave += QChar(ushort(valor->size() & 0xFFFF));
+        chave += QChar(ushort(valor->size() >> 16));
+        chave += *valor;
+    }
 }
 
 bool CETemplateLisp::FiltraItem(const CEItemLista& item) {
@@ -126,14 +177,39 @@ bool CETemplateLisp::FiltraItem(const CEItemLista& item) {
     if (filtro.isEmpty()) return true;
     // The text to evaluate is made again only when the filter changes: the host keeps what
     // it read of the same text.
-    if (filtro != filtroLido_) {
-        filtroLido_ = filtro;
-        avaliacao_ = "(progn (setq " + simboloResposta + " " + filtro + " ) (princ))";
+    if (filtro != filtroLido_) LeFiltro(filtro);
+    // A filter that reads only fields it names answers as it did for the same values, and
+    // leaves in LISP what its evaluation left: its answer and the item's entity.
+    if (nomesDoFiltro_) {
+        ChaveDoFiltro(item, chave_);
+        const auto achada = respostas_.constFind(chave_);
+        if (achada != respostas_.constEnd()) {
+            item.entidadeParaLisp();
+            if (achada->tipo == zvsdk::RTSTR) {
+                CICad::SetStringLisp(simboloResposta, achada->texto);
+            } else if (achada->tipo == zvsdk::RTT) {
+                zvsdk::ResultBuffer t;
+                t.restype = zvsdk::RTT;
+                CICad::SetChainLisp(simboloResposta, &t);
+            } else {
+                CICad::SetNilLisp(simboloResposta);
+            }
+            CEItemLista::limparLisp();
+            return achada->tipo != zvsdk::RTNIL;
+        }
     }
     item.paraLisp();
-    CICad::AvaliaLisp(avaliacao_);
+    const bool avaliou = CICad::AvaliaLisp(avaliacao_);
     const short tipo = CICad::TipoSimboloLisp(simboloResposta);
     CEItemLista::limparLisp();
+    // Only an evaluation that ran is kept: one that failed left an earlier answer.
+    if (nomesDoFiltro_ && avaliou &&
+        (tipo == zvsdk::RTT || tipo == zvsdk::RTNIL || tipo == zvsdk::RTSTR)) {
+        if (respostas_.size() >= kMaxRespostas) respostas_.clear();
+        respostas_.insert(
+            chave_,
+            {tipo, tipo == zvsdk::RTSTR ? CICad::GetStringLisp(simboloResposta) : QString()});
+    }
     // Anything but nil passes, 0 and "" too.
     return tipo != zvsdk::RTNIL && tipo != zvsdk::RTNONE;
 }

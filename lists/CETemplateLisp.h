@@ -2,9 +2,13 @@
 // A template that is a LISP file, loaded by the product's ZVCarregaTemplate.
 #include "CETemplate.h"
 
+#include <QHash>
 #include <QSet>
 
+#include <cstdint>
 #include <optional>
+#include <utility>
+#include <vector>
 
 class CETemplateLisp : public CETemplate {
 public:
@@ -32,4 +36,15 @@ private:
     // The last filter text read and the expression made of it.
     QString filtroLido_;
     QString avaliacao_;
+    // The names the filter looks fields up by, with their numbers once numbered, when that
+    // is all it reads; and its answers by those fields' values: the symbol's type and text.
+    struct Resposta {
+        short tipo;
+        QString texto;
+    };
+    std::optional<std::vector<std::pair<QString, std::uint32_t>>> nomesDoFiltro_;
+    QHash<QString, Resposta> respostas_;
+    QString chave_;  // the item's values of those fields, as the answers are found by
+    void LeFiltro(const QString& filtro);
+    void ChaveDoFiltro(const CEItemLista& item, QString& chave);
 };

@@ -90,6 +90,7 @@ void CCDataReader::LiberaLeiturasDeEntidades() {
     versaoIndices_ = 0;
     indiceAtual_ = nullptr;
     layerDoUltimo_ = nullptr;
+    ultimoLayer_ = nullptr;
     ultimaOrdem_ = nullptr;
     rotasLidas_ = false;
     corteDe_ = OdDbObjectId();
@@ -1235,7 +1236,7 @@ CEItemLista* CCDataReader::CriaItemBloco(const OdDbObjectId& referencia, CETempl
         chaveLidaDe_ = OdDbObjectId();
     } else {
         CICad::CompletaLeituraSimbolo(referencia, simbolo_);
-        LeSimboloLido(QString(), *item, referencia);
+        LeSimboloCortado(*item, referencia);
     }
     if (lida) lidaAgora_ = referencia;
     LerLadoIni(*item, referencia, modelo);

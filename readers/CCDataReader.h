@@ -178,6 +178,25 @@ protected:
     // reader that knows the names it keeps before they are numbered. Setting it forgets the
     // readings kept. Unset: every field.
     void LeSoCampos(std::function<bool(const QString& nome)> quer);
+    // The fields of one symbol's reading, as its reader tells them by the symbol's block and
+    // key (CamposDaLeitura).
+    class CamposDoSimbolo {
+    public:
+        virtual ~CamposDoSimbolo() = default;
+        // Whether the reading writes the field of the name's number.
+        virtual bool Quer(std::uint32_t nome) = 0;
+        // Whether the item read so is to be read again whole: what the reading wrote may tell
+        // the reader that the symbol is not of the kind it cut for.
+        virtual bool Inteiro(const CEItemLista& item) = 0;
+    };
+    // Asked by CriaItemBloco of a block reference read for its item alone (not from a kept
+    // reading), once its block and key are read: the fields the reading writes; null, those
+    // CamposLidos or LeSoCampos tell. The names left out are numbered all the same.
+    virtual CamposDoSimbolo* CamposDaLeitura(std::string_view bloco, const QString& chave) {
+        Q_UNUSED(bloco);
+        Q_UNUSED(chave);
+        return nullptr;
+    }
     // Which names, under a suffix, a copy under that suffix writes; unset: every name. For a
     // reader whose items are asked for few of their neighbours' fields (the strip drawing's
     // terminals); set it before the read with FiltraSufixos.
@@ -264,6 +283,10 @@ private:
     bool LeChaveDoSimbolo(const OdDbObjectId& referencia);
     // LeBloco's work on the symbol read into `simbolo_`.
     void LeSimboloLido(const QString& s, CEItemLista& item, const OdDbObjectId& referencia);
+    // The same without a suffix, for the fields CamposDaLeitura tells.
+    void LeSimboloCortado(CEItemLista& item, const OdDbObjectId& referencia);
+    // While LeSimboloCortado reads: what CamposDaLeitura told.
+    CamposDoSimbolo* camposDaLeitura_ = nullptr;
 
     // Local circuits by number: the LISP side is asked once per circuit and run.
     struct Circuito {
@@ -455,6 +478,8 @@ private:
         QString nome, grupo, pagina;
     };
     mutable PorTexto<LayerLido> layers_;
+    // The entry LayerDoNome gave last.
+    mutable const std::pair<const std::string, LayerLido>* ultimoLayer_ = nullptr;
     // Per cable record, by its handle's text as the core holds it: its CABO or CABLE
     // attribute, shared by its cores.
     mutable PorTexto<std::optional<QString>> numerosCabos_;

@@ -99,14 +99,19 @@ const QString& CCDataReader::ValorDoTexto(std::string_view valor) const {
 }
 
 const CCDataReader::LayerLido& CCDataReader::LayerDoNome(std::string_view nome) const {
+    // A block's symbols come page by page: most ask for the layer the one before asked for.
+    if (ultimoLayer_ && ultimoLayer_->first == nome) return ultimoLayer_->second;
     auto it = layers_.find(nome);
-    if (it != layers_.end()) return it->second;
-    LayerLido lido;
-    lido.nome = Texto(nome);
-    const std::pair<QString, QString>& partes = GrupoPagina(lido.nome);
-    lido.grupo = partes.first;
-    lido.pagina = partes.second;
-    return layers_.emplace(std::string(nome), std::move(lido)).first->second;
+    if (it == layers_.end()) {
+        LayerLido lido;
+        lido.nome = Texto(nome);
+        const std::pair<QString, QString>& partes = GrupoPagina(lido.nome);
+        lido.grupo = partes.first;
+        lido.pagina = partes.second;
+        it = layers_.emplace(std::string(nome), std::move(lido)).first;
+    }
+    ultimoLayer_ = &*it;
+    return it->second;
 }
 
 const QString& CCDataReader::LayerDe(const OdDbObjectId& entidade) const {
@@ -300,6 +305,20 @@ void CCDataReader::LeSimboloLido(const QString& s, CEItemLista& item,
     JuntaLote(item);
 }
 
+void CCDataReader::LeSimboloCortado(CEItemLista& item, const OdDbObjectId& referencia) {
+    CamposDoSimbolo* campos =
+        simbolo_.referencia
+            ? CamposDaLeitura(simbolo_.bloco, ChaveDoTexto(simbolo_.textoChave).chave)
+            : nullptr;
+    camposDaLeitura_ = campos;
+    LeSimboloLido(QString(), item, referencia);
+    camposDaLeitura_ = nullptr;
+    if (!campos || !campos->Inteiro(item)) return;
+    // The reader wants this one whole after all: `simbolo_` still holds its reading.
+    item.campos.clear();
+    LeSimboloLido(QString(), item, referencia);
+}
+
 const CCDataReader::NomesDoLote& CCDataReader::NomesDoLoteCom(const QString& s) {
     for (const NomesDoLote& feitos : nomesDoLote_)
         if (feitos.feitos && feitos.sufixo.isSharedWith(s)) return feitos;
@@ -339,8 +358,10 @@ void CCDataReader::FazLote(const QString& s, const CamposItem& campos,
     chave.catalogo = &catalogo;
     lote_.clear();
     const std::vector<char>* lidos = CamposLidos;
+    CamposDoSimbolo* doSimbolo = camposDaLeitura_;
     // A value no field will hold is not worked out: its name is still numbered in turn.
-    const auto quer = [this, lidos](std::uint32_t nome) {
+    const auto quer = [this, lidos, doSimbolo](std::uint32_t nome) {
+        if (doSimbolo) return doSimbolo->Quer(nome);
         return lidos ? nome < lidos->size() && (*lidos)[nome] : Quer(nome);
     };
     auto poe = [this, &quer](std::uint32_t nome, const QString& valor) {

@@ -45,13 +45,9 @@ bool ComecaCom(std::string_view nome, std::string_view prefixo) {
     return true;
 }
 
-// A terminal's reference: its block is BORNE... or BOR-...
-bool EhNomeDeBorne(std::string_view nome) {
-    return ComecaCom(nome, "BORNE") || ComecaCom(nome, "BOR-");
-}
-
+// A terminal's reference.
 bool EhBorne(const OdDbObjectId& id) {
-    return EhNomeDeBorne(CICad::NomeBlocoUtf8(id));
+    return CCExportDataReader::EhNomeDeBorne(CICad::NomeBlocoUtf8(id));
 }
 
 // The exports read without a template: the readers they borrow ask it for separators,
@@ -84,6 +80,10 @@ void Junta(VetorItens& destino, VetorItens* origem) {
 }
 
 }  // namespace
+
+bool CCExportDataReader::EhNomeDeBorne(std::string_view nome) {
+    return ComecaCom(nome, "BORNE") || ComecaCom(nome, "BOR-");
+}
 
 void CCExportDataReader::LiberaLeituras() {
     CCDataReader::LiberaLeituras();

@@ -9,6 +9,7 @@
 
 #include <cstddef>
 #include <optional>
+#include <string_view>
 
 class CEExportacao;
 
@@ -41,6 +42,10 @@ public:
         Q_UNUSED(campos);
         return 0;
     }
+
+    // Whether a block, by its name as the drawing holds it, is a terminal's: BORNE... or
+    // BOR-..., in any case.
+    static bool EhNomeDeBorne(std::string_view nome);
 
     // The export this reader reads for; null for the topographic diagram.
     CEExportacao* Exportacao = nullptr;

@@ -209,6 +209,7 @@ void CCMaterialDataReader::LeBlocos(zvdb::Database* database,
                     delete item;
                     continue;
                 }
+                SimboloGuardado(*item);
                 if (simbolos_.vinculos == 2) AdicionaAcessorios(*item, modelo);
             } else {
                 if (simbolos_.aceOrfaos && simbolos_.vinculos != 0)

@@ -62,6 +62,8 @@ protected:
     // The gathering is given back when a read ends.
     void LiberaReferencias();
 
+    // A symbol the walk of the blocks keeps, as soon as it is kept.
+    virtual void SimboloGuardado(const CEItemLista& item) { Q_UNUSED(item); }
     // A listed item: a bus bar whose RELACAO was seen already is dropped; true if kept.
     bool Adiciona(CEItemLista* item, bool barramento);
     void Guarda(CEItemLista* item);

@@ -53,6 +53,10 @@ void CEItemLista::paraLisp() const {
     for (const CamposItem::Campo& campo : campos.todos())
         pares.push_back({nomes[campo.nome], &campo.valor});
     CICad::SetParesLisp(NomeReg(), pares);
+    entidadeParaLisp();
+}
+
+void CEItemLista::entidadeParaLisp() const {
     if (ids.empty()) return;
     static const QString nomeEname("ename");
     zvsdk::ResultBuffer ename;

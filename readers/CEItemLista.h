@@ -38,6 +38,8 @@ public:
     // Publishes the item to LISP: `reg` the fields as an association list, `ename` the
     // first object (left as it was when the item has none).
     void paraLisp() const;
+    // `ename` alone, as paraLisp sets it.
+    void entidadeParaLisp() const;
     static void limparLisp();
     // All field names, each followed by one blank.
     QString textoCampos() const;

@@ -57,8 +57,11 @@ std::function<bool(const QString&)> CamposDoBorne(std::function<bool(const QStri
 }  // namespace
 
 // While a read runs, what the drawing and the template's filter read of the components: the
-// layout's fields, the filter's and those of each key's symbol block.
-struct CCBorneDwgDataReader::Cortes {
+// layout's fields, the filter's and those of each key's symbol block. A component of a key
+// known already is read for those fields alone.
+struct CCBorneDwgDataReader::Cortes : CCDataReader::CamposDoSimbolo {
+    Cortes(QSet<QString> filtro, CETemplate& m, CCBorneDwgWriter& e)
+        : doFiltro(std::move(filtro)), modelo(m), escritor(e) {}
     QSet<QString> doFiltro;
     CETemplate& modelo;
     CCBorneDwgWriter& escritor;
@@ -67,7 +70,20 @@ struct CCBorneDwgDataReader::Cortes {
         std::vector<char> fica;              // by name number: 0 not asked yet, 1 kept, 2 not
     };
     QHash<QString, DaChave> porChave;
+    DaChave* lida = nullptr;  // the key of the component being read
 
+    static QString Chave(const CEItemLista& item) {
+        const QString* campo = item.campos.procura(NumeroCampo<"ZV_KEY">());
+        return campo ? *campo : QString();
+    }
+    // What the writer reads of the component's key, asked once per key.
+    DaChave& Da(const CEItemLista& item) {
+        const QString chave = Chave(item);
+        auto achado = porChave.find(chave);
+        if (achado == porChave.end())
+            achado = porChave.insert(chave, {escritor.CamposDoSimbolo(item, modelo), {}});
+        return achado.value();
+    }
     bool Fica(DaChave& daChave, std::uint32_t nome) const {
         if (nome >= daChave.fica.size()) daChave.fica.resize(size_t(nome) + 1, 0);
         char& resposta = daChave.fica[nome];
@@ -79,6 +95,12 @@ struct CCBorneDwgDataReader::Cortes {
             resposta = lido ? 1 : 2;
         }
         return resposta == 1;
+    }
+    bool Quer(std::uint32_t nome) override { return Fica(*lida, nome); }
+    // A kind of its own other than a component's: the export reader keeps it whole.
+    bool Inteiro(const CEItemLista& item) override {
+        const QString* tipo = item.campos.procura(NumeroCampo<"ZV_LISTA_TIPO">());
+        return tipo && !tipo->isEmpty() && *tipo != QLatin1String("COMP");
     }
 };
 
@@ -94,16 +116,31 @@ CCBorneDwgDataReader::~CCBorneDwgDataReader() = default;
 
 void CCBorneDwgDataReader::ComponenteLido(CEItemLista& item) {
     if (!cortes_) return;
-    const QString* campo = item.campos.procura(NumeroCampo<"ZV_KEY">());
-    const QString chave = campo ? *campo : QString();
-    auto achado = cortes_->porChave.find(chave);
-    if (achado == cortes_->porChave.end())
-        achado = cortes_->porChave.insert(
-            chave, {cortes_->escritor.CamposDoSimbolo(item, cortes_->modelo), {}});
-    Cortes::DaChave& daChave = achado.value();
+    Cortes::DaChave& daChave = cortes_->Da(item);
     if (!daChave.nomes) return;
     item.campos.reter([&](std::uint32_t nome) { return cortes_->Fica(daChave, nome); });
     item.campos.compactar();
+}
+
+void CCBorneDwgDataReader::SimboloGuardado(const CEItemLista& item) {
+    if (!cortes_ || item.ids.empty() || cortes_->porChave.contains(Cortes::Chave(item))) return;
+    // The first kept component of a key tells its key's fields, as ComponenteLido would ask
+    // after the walk: terminals, and what keeps a kind of its own, are not cut there.
+    const QString* tipo = item.campos.procura(NumeroCampo<"ZV_LISTA_TIPO">());
+    const bool componente = tipo && !tipo->isEmpty()
+                                ? *tipo == QLatin1String("COMP")
+                                : !EhNomeDeBorne(CICad::NomeBlocoUtf8(item.ids.front()));
+    if (componente) cortes_->Da(item);
+}
+
+CCDataReader::CamposDoSimbolo* CCBorneDwgDataReader::CamposDaLeitura(std::string_view bloco,
+                                                                     const QString& chave) {
+    // A terminal's fields stay for its sides.
+    if (!cortes_ || EhNomeDeBorne(bloco)) return nullptr;
+    const auto achado = cortes_->porChave.find(chave);
+    if (achado == cortes_->porChave.end() || !achado->nomes) return nullptr;
+    cortes_->lida = &achado.value();
+    return cortes_.get();
 }
 
 void CCBorneDwgDataReader::LadosLidos(CEItemLista& borne) {
@@ -171,7 +208,7 @@ VetorItens* CCBorneDwgDataReader::LerDados(zvdb::Database* database,
     std::optional<QSet<QString>> doFiltro =
         CETemplateLisp::CamposDaExpressao(modelo.LerTexto("*FILTRO_TEMPLATE*").trimmed());
     if (doFiltro) *doFiltro << QStringLiteral("ZV_LISTA");
-    cortes_.reset(doFiltro && Escritor ? new Cortes{std::move(*doFiltro), modelo, *Escritor, {}}
+    cortes_.reset(doFiltro && Escritor ? new Cortes(std::move(*doFiltro), modelo, *Escritor)
                                        : nullptr);
     struct FimDosCortes {
         CCBorneDwgDataReader& leitor;

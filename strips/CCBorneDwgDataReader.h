@@ -10,6 +10,7 @@
 #include <cstdint>
 #include <functional>
 #include <memory>
+#include <string_view>
 #include <vector>
 
 class CCBorneDwgWriter;
@@ -47,6 +48,10 @@ public:
 protected:
     // Keeps of the component the fields the drawing or the template's filter may read.
     void ComponenteLido(CEItemLista& item) override;
+    // The first component of a key tells what those of its key keep: the later ones are read
+    // for that alone.
+    void SimboloGuardado(const CEItemLista& item) override;
+    CamposDoSimbolo* CamposDaLeitura(std::string_view bloco, const QString& chave) override;
     // Keeps of the terminal the fields the drawing may read.
     void LadosLidos(CEItemLista& borne) override;
 

@@ -175,3 +175,82 @@ TEST_F(LispPublishingTest, TheFilterSeesEachItemsOwnFieldsByName) {
     EXPECT_TRUE(modelo.FiltraItem(componente));
     EXPECT_EQ(CICad::GetStringLisp("visto"), comoLista(componente));
 }
+
+// A filter that reads the item only through fields it names answers alike for the same values
+// of those fields, and leaves in LISP what an evaluation leaves: its answer and the item's
+// entity, with `reg` cleared. Absent and empty fields, and values that join alike, are apart;
+// a name first met after the filter was read counts; a failing filter fails each time.
+TEST_F(LispPublishingTest, AFilterOverNamedFieldsAnswersAlikeForTheSameValues) {
+    CETemplateLisp modelo(arquivo("lista.grt"));
+    const auto entidade = [this](double x) {
+        return OdDbObjectId(&db(), db().modelSpace()->addLine({x, 0, 0}, {x, 5, 0})->handle());
+    };
+    CEItemLista a = item("X1", 1, "a"), b = item("X2", 1, "b"), c = item("X1", 1, "c");
+    a.ids.push_back(entidade(1));
+    b.ids.push_back(entidade(2));
+    c.ids.push_back(entidade(3));
+    const auto deixado = [this](const CEItemLista& i) {
+        EXPECT_EQ(valor("reg"), "nil");
+        EXPECT_EQ(valor("(cdr (assoc -1 (entget ename)))"),
+                  valor("(handent \"" + QString::number(i.ids.front().handle(), 16) + "\")"));
+    };
+    CICad::SetStringLisp("*FILTRO_TEMPLATE*", "(= (cdr (assoc \"REGUA\" reg)) \"X1\")");
+    for (int vez = 0; vez < 2; ++vez) {
+        EXPECT_TRUE(modelo.FiltraItem(a));
+        EXPECT_EQ(valor("INVOKELISP_LISTAS_TMP"), "T");
+        deixado(a);
+        EXPECT_FALSE(modelo.FiltraItem(b));
+        EXPECT_EQ(valor("INVOKELISP_LISTAS_TMP"), "nil");
+        deixado(b);
+        EXPECT_TRUE(modelo.FiltraItem(c));  // the same REGUA as a, the rest apart
+        EXPECT_EQ(valor("INVOKELISP_LISTAS_TMP"), "T");
+        deixado(c);
+    }
+    // A text answer.
+    CICad::SetStringLisp("*FILTRO_TEMPLATE*", "(cdr (assoc \"REGUA\" reg))");
+    for (int vez = 0; vez < 2; ++vez) {
+        EXPECT_TRUE(modelo.FiltraItem(b));
+        EXPECT_EQ(valor("INVOKELISP_LISTAS_TMP"), "\"X2\"");
+        EXPECT_TRUE(modelo.FiltraItem(a));
+        EXPECT_EQ(valor("INVOKELISP_LISTAS_TMP"), "\"X1\"");
+    }
+    // An empty field is no absent one.
+    CEItemLista vazio, sem;
+    vazio.definirCampo("REGUA", "");
+    sem.definirCampo("OUTRO", "");
+    CICad::SetStringLisp("*FILTRO_TEMPLATE*", "(null (assoc \"REGUA\" reg))");
+    for (int vez = 0; vez < 2; ++vez) {
+        EXPECT_FALSE(modelo.FiltraItem(vazio));
+        EXPECT_TRUE(modelo.FiltraItem(sem));
+    }
+    // Two fields whose values join alike, whatever marks the key puts between them.
+    CEItemLista ab, a_b;
+    ab.definirCampo("PF_P", QString("A") + QChar(1));
+    ab.definirCampo("PF_Q", "B");
+    a_b.definirCampo("PF_P", "A");
+    a_b.definirCampo("PF_Q", QString(QChar(1)) + "B");
+    CICad::SetStringLisp("*FILTRO_TEMPLATE*",
+                         "(and (assoc \"PF_P\" reg) (= (cdr (assoc \"PF_Q\" reg)) \"B\"))");
+    for (int vez = 0; vez < 2; ++vez) {
+        EXPECT_TRUE(modelo.FiltraItem(ab));
+        EXPECT_FALSE(modelo.FiltraItem(a_b));
+    }
+    // A name no item had when the filter was read.
+    const QString novo = "PF_NOVO_" + QString::number(quintptr(this), 16);
+    ASSERT_EQ(CamposItem::numeroSeHouver(novo), CamposItem::kSemNome);
+    CICad::SetStringLisp("*FILTRO_TEMPLATE*", "(assoc \"" + novo + "\" reg)");
+    EXPECT_FALSE(modelo.FiltraItem(a));
+    CEItemLista comNovo = a;
+    comNovo.definirCampo(novo, "1");
+    EXPECT_TRUE(modelo.FiltraItem(comNovo));
+    EXPECT_FALSE(modelo.FiltraItem(a));
+    // A failing filter is evaluated, and reported, each time.
+    CICad::SetStringLisp("*FILTRO_TEMPLATE*", "(car (cdr (assoc \"REGUA\" reg)))");
+    const QString erro = "; error: bad argument type: consp \"X1\"\n";
+    const int antes = saida().count(erro);
+    lisp("(setq INVOKELISP_LISTAS_TMP nil)");
+    EXPECT_FALSE(modelo.FiltraItem(a));
+    lisp("(setq INVOKELISP_LISTAS_TMP T)");
+    EXPECT_TRUE(modelo.FiltraItem(a));
+    EXPECT_EQ(saida().count(erro), antes + 2);
+}

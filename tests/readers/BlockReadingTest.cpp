@@ -8,8 +8,11 @@
 #include "readers/ZVString.h"
 #include "sample/XDataItems.h"
 
+#include <QSet>
+
 #include <functional>
 #include <memory>
+#include <string_view>
 
 namespace {
 
@@ -452,4 +455,115 @@ TEST_F(BlockReadingTest, AnItemCopiedFromAKeptReadingIsItsOwnSymbolsWholeReading
     confere(a, *novo);
     CICad::SetXData(b, "KVR_ZV", {{1000, ""}});
     EXPECT_EQ(std::unique_ptr<CEItemLista>(leitor.CriaItemBloco(b, modelo)), nullptr);
+}
+
+namespace {
+
+// A reader that cuts the symbols of key A1 to the names the test gives, and asks for a whole
+// reading of those whose ZV_LISTA_TIPO it does not cut for, as the strip drawing's reader
+// cuts its components.
+class LeitorQueCorta : public LeitorBase {
+public:
+    QSet<QString> nomes;
+    QStringList perguntas;  // "block:key" of each symbol asked about
+    int inteiros = 0;
+
+protected:
+    CamposDoSimbolo* CamposDaLeitura(std::string_view bloco, const QString& chave) override {
+        perguntas << QString::fromUtf8(bloco.data(), int(bloco.size())) + ":" + chave;
+        return chave == "A1" ? &corte_ : nullptr;
+    }
+
+private:
+    struct Corte : CamposDoSimbolo {
+        LeitorQueCorta& leitor;
+        explicit Corte(LeitorQueCorta& l) : leitor(l) {}
+        bool Quer(std::uint32_t nome) override {
+            return leitor.nomes.contains(CamposItem::nome(nome));
+        }
+        bool Inteiro(const CEItemLista& item) override {
+            const bool inteiro = item.valorCampo("ZV_LISTA_TIPO") == "OUTRO";
+            leitor.inteiros += inteiro;
+            return inteiro;
+        }
+    } corte_{*this};
+};
+
+}  // namespace
+
+// A symbol read for the names its reader tells by its block and key gets those fields of the
+// whole reading alone, and what no kept field shows (its position, a call of the LISP side)
+// is not worked out; the names left out are numbered all the same. A symbol the reader wants
+// whole after all is read again whole.
+TEST_F(BlockReadingTest, ASymbolCutByItsKeyGetsOnlyTheNamesItsReaderAsksFor) {
+    ASSERT_TRUE(
+        lisp("(setq perguntas 0)"
+             "(defun BuscarCoordenadas (e g p x y) (setq perguntas (1+ perguntas)) \"P\")"));
+    const auto perguntas = [] { return CICad::GetIntLisp("perguntas", -1); };
+    const OdDbObjectId a = Simbolo("NA-1", "A1", "ESQ$0001$A",
+                                   {{"REGUA", " X1 "}, {"NUMERO", "5"}, {"ZQ_SO_AQUI", "z"}}, 10);
+    const OdDbObjectId s = Simbolo("NA-2", "SO", "ESQ$0001$A", {{"REGUA", "X2"}}, 20);
+    const OdDbObjectId o =
+        Simbolo("NA-1", "A1", "ESQ$0001$A", {{"REGUA", "X3"}, {"ZV_LISTA_TIPO", "OUTRO"}}, 30);
+    LeitorBase todos;
+    LeitorQueCorta leitor;
+    leitor.nomes = {"REGUA", "ZV_KEY", "HANDLE", "ZV_LISTA_TIPO"};
+    TemplateDouble modelo;
+    EXPECT_EQ(CamposItem::numeroSeHouver("ZQ_SO_AQUI"), CamposItem::kSemNome);
+    const int antes = perguntas();
+    const std::unique_ptr<CEItemLista> cortado(leitor.CriaItemBloco(a, modelo));
+    ASSERT_NE(cortado, nullptr);
+    EXPECT_EQ(perguntas(), antes);
+    EXPECT_EQ(leitor.perguntas, QStringList({"NA-1:A1"}));
+    // The same values as the whole reading, in its order.
+    const CEItemLista inteiro = Le(todos, a);
+    EXPECT_EQ(perguntas(), antes + 1);
+    QStringList esperados;
+    for (auto it = inteiro.campos.begin(); it != inteiro.campos.end(); ++it)
+        if (leitor.nomes.contains(it.key())) esperados << it.key();
+    EXPECT_EQ(esperados.size(), 3);
+    EXPECT_EQ(cortado->campos.keys(), esperados);
+    for (const QString& nome : esperados)
+        EXPECT_EQ(cortado->valorCampo(nome), inteiro.valorCampo(nome)) << nome.toStdString();
+    EXPECT_EQ(cortado->valorCampo("REGUA"), "X1");
+    EXPECT_NE(CamposItem::numeroSeHouver("ZQ_SO_AQUI"), CamposItem::kSemNome);
+    // Another key is read whole.
+    const std::unique_ptr<CEItemLista> outraChave(leitor.CriaItemBloco(s, modelo));
+    ASSERT_NE(outraChave, nullptr);
+    EXPECT_EQ(leitor.perguntas.last(), "NA-2:SO");
+    EXPECT_EQ(outraChave->campos.keys(), Le(todos, s).campos.keys());
+    EXPECT_EQ(outraChave->valorCampo("POSICAO"), "P");
+    // A symbol the reader wants whole after all: its whole reading, once.
+    EXPECT_EQ(leitor.inteiros, 0);
+    const std::unique_ptr<CEItemLista> refeito(leitor.CriaItemBloco(o, modelo));
+    ASSERT_NE(refeito, nullptr);
+    EXPECT_EQ(leitor.inteiros, 1);
+    const CEItemLista todoO = Le(todos, o);
+    EXPECT_EQ(refeito->campos.keys(), todoO.campos.keys());
+    EXPECT_EQ(refeito->campos.values(), todoO.campos.values());
+}
+
+// Symbols of one layer in a row, another's between them, and the reads given back between
+// two of the same layer: each gets its own layer, group and page.
+TEST_F(BlockReadingTest, SymbolsOfLayersInTurnEachGetTheirOwnLayer) {
+    const OdDbObjectId a1 = Simbolo("NA-1", "A1", "ESQ$0001$A", {}, 0);
+    const OdDbObjectId a2 = Simbolo("NA-1", "A1", "ESQ$0001$A", {}, 10);
+    const OdDbObjectId b = Simbolo("NA-1", "A1", "MEC$0007$B", {}, 20);
+    const OdDbObjectId c = Simbolo("NA-1", "A1", "SOLTO", {}, 30);
+    LeitorBase leitor;
+    const auto layer = [&](const OdDbObjectId& id) -> QString {
+        const CEItemLista item = Le(leitor, id);
+        return item.valorCampo("LAYER") + "|" + item.valorCampo("GRUPO") + "|" +
+               item.valorCampo("PAGINA");
+    };
+    for (int vez = 0; vez < 2; ++vez) {
+        EXPECT_EQ(layer(a1), "ESQ$0001$A|ESQ|0001");
+        EXPECT_EQ(layer(a2), "ESQ$0001$A|ESQ|0001");
+        EXPECT_EQ(layer(b), "MEC$0007$B|MEC|0007");
+        EXPECT_EQ(layer(c), "SOLTO||");
+        EXPECT_EQ(layer(a1), "ESQ$0001$A|ESQ|0001");
+        leitor.LiberaLeituras();
+    }
+    EXPECT_EQ(leitor.LayerDe(b), "MEC$0007$B");
+    EXPECT_EQ(leitor.LayerDe(a2), "ESQ$0001$A");
 }

@@ -540,4 +540,46 @@ TEST_F(ComandoReguasTest, SymbolCellsShowTheComponentsFieldsAsWhenEveryFieldIsKe
     }
 }
 
+// The components of a key known already are read for the fields the drawing keeps of them;
+// one whose own ZV_LISTA_TIPO makes it a terminal is read whole, and drawn in its strip.
+TEST_F(ComandoReguasTest, AComponentBlockOfATerminalsKindIsDrawnWithItsWholeFields) {
+    const QString normal = pasta_->path("tipo-normal.dxf");
+    ASSERT_EQ(Desenha(pasta_->project(), normal, QString()).status, 0);
+    // A component drawn under the strips: its key is listed and cut.
+    std::string handle;
+    {
+        const auto db = zvdb::DxfLoader::loadFile(normal.toStdString());
+        for (zvdb::Entity* e : db->modelSpace()->entities())
+            if (auto* ref = dynamic_cast<zvdb::BlockReference*>(e))
+                if (ref->layer().starts_with("REGUAS$") && handle.empty()) {
+                    const auto itens = ref->xdataItems("KVR_ZV_REPRESENTACAO");
+                    if (!itens.empty()) handle = std::string(itens.back().value);
+                }
+    }
+    ASSERT_FALSE(handle.empty());
+    auto db = zvdb::DxfLoader::loadFile(pasta_->project().toStdString());
+    auto* componente =
+        dynamic_cast<zvdb::BlockReference*>(db->objectByHandle(std::stoull(handle, nullptr, 16)));
+    ASSERT_TRUE(componente);
+    zvdb::BlockRecord* bloco = db->block(std::string(componente->blockName()));
+    ASSERT_TRUE(bloco);
+    const std::vector<zvdb::Tag> chave = componente->xdata("KVR_ZV");
+    ASSERT_FALSE(chave.empty());
+    // One more of its key and block, after it, of a terminal's kind by its own attribute.
+    zvdb::BlockReference* ref = db->modelSpace()->addBlockReference(
+        *bloco, {9000, 9000, 0}, {1, 1, 1}, 0, std::string(componente->layer()));
+    ref->setXData("KVR_ZV", chave);
+    ref->addAttribute("ZV_LISTA_TIPO", "BORNE", {9000, 8990, 0}, 1.0);
+    ref->addAttribute("REGUA", "ZK", {9000, 8987, 0}, 1.0);
+    ref->addAttribute("NUMERO", "7", {9000, 8984, 0}, 1.0);
+    const QString projeto = pasta_->path("tipo-borne.dxf");
+    zvdb::DxfWriter::saveFile(*db, projeto.toStdString());
+    const QString saida = pasta_->path("tipo-borne-reguas.dxf");
+    ASSERT_EQ(
+        Desenha(projeto, saida, Modelo("reguas-tipo", "(setq *BORNES_SEM_LIG_GRX* T)")).status, 0);
+    const auto linhas = Linhas(saida);
+    ASSERT_EQ(linhas.count("ZK"), 1u);
+    EXPECT_EQ(linhas.find("ZK")->second.numeros, QStringList({"7"}));
+}
+
 }  // namespace
