@@ -12,6 +12,8 @@
 #include "drawing/DxfWriter.h"
 #include "drawing/Polyline.h"
 
+#include "TagLines.h"
+
 #include <gtest/gtest.h>
 
 #include <memory>
@@ -81,13 +83,6 @@ void expectFamily(const Entity& parent, std::size_t children, const BlockRecord*
         EXPECT_EQ(child->block(), block);
         EXPECT_EQ(child->ownerHandle(), parent.handle());
     }
-}
-
-std::vector<std::string> lines(const DbObject& object) {
-    std::vector<std::string> all;
-    for (const Tag& tag : object.tags())
-        all.push_back(std::to_string(tag.code) + " " + std::string(tag.value));
-    return all;
 }
 
 }  // namespace

@@ -13,6 +13,8 @@
 #include "drawing/TagPattern.h"
 #include "drawing/TagValues.h"
 
+#include "TagLines.h"
+
 #include <gtest/gtest.h>
 
 #include <bit>
@@ -44,13 +46,6 @@ std::vector<std::uint64_t> bits(const Transform& t) {
         all.push_back(std::bit_cast<std::uint64_t>(entry));
     for (const double entry : {t.move.x, t.move.y, t.move.z})
         all.push_back(std::bit_cast<std::uint64_t>(entry));
-    return all;
-}
-
-std::vector<std::string> lines(const DbObject& object) {
-    std::vector<std::string> all;
-    for (const Tag& item : object.tags())
-        all.push_back(std::to_string(item.code) + " " + std::string(item.value));
     return all;
 }
 

@@ -103,18 +103,24 @@ protected:
         QSqlDatabase::removeDatabase("sheet-grid-test");
     }
 
+    // "own.db" with the page and group tables, and these statements' rows in them.
+    void makeGridCatalogue(const QStringList& rows) {
+        makeCatalogue("own.db",
+                      QStringList{"create table BDPAGE (ERASED SMALLINT, PAGE_KEY INTEGER, "
+                                  "COL_LABEL varchar(200), COL_INT varchar(200), ROW_LABEL "
+                                  "varchar(200), ROW_INT varchar(200))",
+                                  "create table BDGROUP (ERASED SMALLINT, GROUP_KEY INTEGER, "
+                                  "LANG INTEGER, PAGE INTEGER)"} +
+                          rows);
+    }
+
     // Two grids in language 1: group key 7 has columns A;B and rows X;Y, key 8 columns 1;2;3
     // and row R.
     void makeTwoGrids() {
-        makeCatalogue("own.db",
-                      {"create table BDPAGE (ERASED SMALLINT, PAGE_KEY INTEGER, COL_LABEL "
-                       "varchar(200), COL_INT varchar(200), ROW_LABEL varchar(200), ROW_INT "
-                       "varchar(200))",
-                       "create table BDGROUP (ERASED SMALLINT, GROUP_KEY INTEGER, LANG INTEGER, "
-                       "PAGE INTEGER)",
-                       "insert into BDPAGE values (0, 1, 'A;B', '210', 'X;Y', '100'), "
-                       "(0, 2, '1;2;3', '10;20', 'R', '297')",
-                       "insert into BDGROUP values (0, 7, 1, 1), (0, 8, 1, 2)"});
+        makeGridCatalogue(
+            {"insert into BDPAGE values (0, 1, 'A;B', '210', 'X;Y', '100'), "
+             "(0, 2, '1;2;3', '10;20', 'R', '297')",
+             "insert into BDGROUP values (0, 7, 1, 1), (0, 8, 1, 2)"});
         writeSettings("own.db", "1");
     }
 
@@ -169,16 +175,11 @@ TEST_F(SheetGridCatalogueTest, DemoCatalogueGivesEachGroupItsPageModelGrid) {
 }
 
 TEST_F(SheetGridCatalogueTest, LanguageRowsErasedRowsAndOneCatalogueReadPerDocument) {
-    makeCatalogue("own.db",
-                  {"create table BDPAGE (ERASED SMALLINT, PAGE_KEY INTEGER, COL_LABEL "
-                   "varchar(200), COL_INT varchar(200), ROW_LABEL varchar(200), ROW_INT "
-                   "varchar(200))",
-                   "create table BDGROUP (ERASED SMALLINT, GROUP_KEY INTEGER, LANG INTEGER, "
-                   "PAGE INTEGER)",
-                   "insert into BDPAGE values (0, 1, 'A;B', '210', 'X;Y', '100'), "
-                   "(0, 2, '1;2;3', '10;20', 'R', '297'), (1, 3, 'Z', '420', 'Z', '297')",
-                   "insert into BDGROUP values (0, 7, 1, 1), (0, 7, 2, 2), (1, 8, 2, 1), "
-                   "(0, 8, 3, 3), (0, 9, 3, 1), (0, 9, 1, 2)"});
+    makeGridCatalogue(
+        {"insert into BDPAGE values (0, 1, 'A;B', '210', 'X;Y', '100'), "
+         "(0, 2, '1;2;3', '10;20', 'R', '297'), (1, 3, 'Z', '420', 'Z', '297')",
+         "insert into BDGROUP values (0, 7, 1, 1), (0, 7, 2, 2), (1, 8, 2, 1), "
+         "(0, 8, 3, 3), (0, 9, 3, 1), (0, 9, 1, 2)"});
     writeSettings("own.db", "2");
     addGroup("G7", 7, {"G7$0001$A"});
     addGroup("G8", 8, {"G8$0001$A"});

@@ -443,6 +443,7 @@ protected:
                 return item;
         return nullptr;
     }
+    OdDbObjectId id(const zvdb::DbObject* objeto) { return OdDbObjectId(&db(), objeto->handle()); }
     // The side fields of an item, by name.
     static QMap<QString, QString> lados(const CEItemLista& item) {
         QMap<QString, QString> campos;
@@ -555,9 +556,6 @@ TEST_F(ExportTerminalSidesTest, WiresAndTerminalsReadApartGiveTheSameSidesAndAre
     std::unique_ptr<VetorItens> guardados(guarda.Le(&db(), nullptr, true, std::nullopt));
     std::unique_ptr<VetorItens> avulsos(avulso.Le(&db(), nullptr, true, std::nullopt));
     ASSERT_TRUE(guardados && avulsos);
-    const auto id = [this](const zvdb::DbObject* objeto) {
-        return OdDbObjectId(&db(), objeto->handle());
-    };
     for (const zvdb::DbObject* objeto :
          std::initializer_list<const zvdb::DbObject*>{ponte, um, x1_, x2_}) {
         EXPECT_TRUE(guarda.LeituraGuardada(id(objeto)));
@@ -604,9 +602,6 @@ TEST_F(ExportTerminalSidesTest, ComponentsReadAgainForTheSidesGiveTheSameSidesAn
     std::unique_ptr<VetorItens> inteiros(todos.Le(&db(), nullptr, true, std::nullopt));
     std::unique_ptr<VetorItens> relidos(poucos.Le(&db(), nullptr, true, std::nullopt));
     ASSERT_TRUE(inteiros && relidos);
-    const auto id = [this](const zvdb::DbObject* objeto) {
-        return OdDbObjectId(&db(), objeto->handle());
-    };
     for (const zvdb::DbObject* objeto :
          std::initializer_list<const zvdb::DbObject*>{k1_, k2, k3, solto})
         EXPECT_TRUE(todos.LeituraGuardada(id(objeto)));
@@ -756,7 +751,7 @@ TEST_F(ExportTerminalSidesTest, ASecondWalkOverKeptReadingsGivesTheSameSides) {
     CCExportDataReader leitor;
     std::unique_ptr<VetorItens> primeiros(leitor.Le(&db(), nullptr, true, std::nullopt));
     ASSERT_TRUE(primeiros);
-    EXPECT_TRUE(leitor.LeituraGuardada(OdDbObjectId(&db(), x1_->handle())));
+    EXPECT_TRUE(leitor.LeituraGuardada(id(x1_)));
     std::unique_ptr<VetorItens> segundos(leitor.Le(&db(), nullptr, true, std::nullopt));
     ASSERT_TRUE(segundos);
     EXPECT_EQ(mesmosItens(*primeiros, *segundos,
@@ -896,7 +891,7 @@ TEST_F(ExportTerminalSidesTest, AComponentOfTwoContactsGivesBothSidesWhatAWholeR
     // two wires; the walk's five symbols ask in both reads.
     EXPECT_EQ(chamadas(), 5);
     EXPECT_EQ(chamadasCheio, chamadas() + 3);
-    EXPECT_TRUE(poucos.LeituraGuardada(OdDbObjectId(&db(), k1_->handle())));
+    EXPECT_TRUE(poucos.LeituraGuardada(id(k1_)));
     const QString k1 = handle(k1_);
     EXPECT_EQ(mesmosItens(*cheios, *lidos,
                           [&k1](const CEItemLista& b) -> QString {
