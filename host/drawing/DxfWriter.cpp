@@ -166,6 +166,16 @@ void DxfWriter::writePatterned(const DbObject& object, const TagPattern::Values&
 
 namespace {
 
+// n bytes, sizeof(Word) <= n <= 2 * sizeof(Word), as a first and a last word that overlap.
+template <class Word>
+[[gnu::always_inline]] inline void putWords(char* at, const char* from, std::size_t n) {
+    Word head, tail;
+    std::memcpy(&head, from, sizeof(Word));
+    std::memcpy(&tail, from + n - sizeof(Word), sizeof(Word));
+    std::memcpy(at, &head, sizeof(Word));
+    std::memcpy(at + n - sizeof(Word), &tail, sizeof(Word));
+}
+
 // The text at `at`; its end. An empty value may have no memory at all. The runs and values
 // of a patterned object are mostly a few bytes: those are copied in two overlapping words,
 // without a call.
@@ -175,17 +185,9 @@ namespace {
     if (n > 16) {
         std::memcpy(at, from, n);
     } else if (n >= 8) {
-        std::uint64_t head, tail;
-        std::memcpy(&head, from, 8);
-        std::memcpy(&tail, from + n - 8, 8);
-        std::memcpy(at, &head, 8);
-        std::memcpy(at + n - 8, &tail, 8);
+        putWords<std::uint64_t>(at, from, n);
     } else if (n >= 4) {
-        std::uint32_t head, tail;
-        std::memcpy(&head, from, 4);
-        std::memcpy(&tail, from + n - 4, 4);
-        std::memcpy(at, &head, 4);
-        std::memcpy(at + n - 4, &tail, 4);
+        putWords<std::uint32_t>(at, from, n);
     } else if (n > 0) {
         at[0] = from[0];
         at[n / 2] = from[n / 2];
