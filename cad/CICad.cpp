@@ -194,6 +194,11 @@ bool CICad::zvInvokeConexoes(const QString& funcao, zvsdk::ConnectionReceiver& r
     return lisp && lisp->lispInvokeConnections(funcao, receptor) != zvsdk::RTNONE;
 }
 
+bool CICad::zvPreparaConexoes(const QString& funcao) {
+    zvsdk::LispInterface* lisp = LispDe(nullptr);
+    return lisp && lisp->lispPrepareConnections(funcao);
+}
+
 bool CICad::zvInvokePolilinhas(const QString& funcao, const QString& argumento,
                                zvsdk::PolylineReceiver& receptor) {
     zvsdk::LispInterface* lisp = LispDe(nullptr);

@@ -432,6 +432,10 @@ public:
     // its answer given to `receptor` without the chain; false when the host does not answer
     // it so, and the chain of zvInvokeLista is the way.
     static bool zvInvokeConexoes(const QString& funcao, zvsdk::ConnectionReceiver& receptor);
+    // Tells the host that zvInvokeConexoes(funcao) comes later, after a read that leaves the
+    // drawing as it is; true when the host is working the answer out meanwhile, and the
+    // call is best made as late as it can be.
+    static bool zvPreparaConexoes(const QString& funcao);
     // A function of one text that answers polyline handles, each given to `receptor` with the
     // vertices the host has of it; false when the host does not answer it so.
     static bool zvInvokePolilinhas(const QString& funcao, const QString& argumento,

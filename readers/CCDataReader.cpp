@@ -104,20 +104,19 @@ void CCDataReader::LiberaLeiturasDeEntidades() {
 
 // ---- connections
 
-void CCDataReader::CarregaConexoesFios() {
-    CarregaConexoes("getConexoesTodosFios", true);
+void CCDataReader::CarregaConexoesFios(bool adiante) {
+    CarregaConexoes("getConexoesTodosFios", true, adiante);
 }
 
-void CCDataReader::CarregaConexoesCabos() {
-    CarregaConexoes("getConexoesTodosCabos", false);
+void CCDataReader::CarregaConexoesCabos(bool adiante) {
+    CarregaConexoes("getConexoesTodosCabos", false, adiante);
 }
 
-void CCDataReader::CarregaConexoes(const QString& funcao, bool detalhes) {
-    // The whole drawing's answer: without a chain of nodes when the host can.
-    if (conexoes_.CarregaSemCadeia(funcao, detalhes, GuardaCompletas)) return;
-    ResultBuffer* resposta = CICad::zvInvokeLista(funcao);
-    conexoes_.Carrega(resposta, detalhes, GuardaCompletas);
-    CICad::LiberaLista(resposta);
+void CCDataReader::CarregaConexoes(const QString& funcao, bool detalhes, bool adiante) {
+    // The whole drawing's answer, without a chain of nodes when the host can; when the host
+    // can work it out while the reader reads on, it is taken at the first look-up.
+    if (adiante && conexoes_.Adia(funcao, detalhes, GuardaCompletas)) return;
+    conexoes_.CarregaDe(funcao, detalhes, GuardaCompletas);
 }
 
 std::optional<TabelaConexoes::Textos> CCDataReader::ListaConexoes(const QString& fio) const {

@@ -63,8 +63,10 @@ public:
     void LiberaLeiturasDeEntidades();
 
     // ---- connections
-    void CarregaConexoesFios();
-    void CarregaConexoesCabos();
+    // With `adiante`, a reader that reads on for a while before it first looks at the
+    // connections lets the host work them out meanwhile (TabelaConexoes::Adia).
+    void CarregaConexoesFios(bool adiante = false);
+    void CarregaConexoesCabos(bool adiante = false);
     // Views into the loaded table: they hold until the reads are freed.
     std::optional<TabelaConexoes::Textos> ListaConexoes(const QString& fio) const;
     std::optional<TabelaConexoes::Textos> ListaConexoesCompletas(const QString& fio) const;
@@ -255,7 +257,7 @@ protected:
                    const QString*& layer) const;
 
 private:
-    void CarregaConexoes(const QString& funcao, bool detalhes);
+    void CarregaConexoes(const QString& funcao, bool detalhes, bool adiante);
     bool FioSobPonto(std::span<const CEPonto> vertices, const CEPonto& ponto) const;
     // The wires of a layer with their vertices, read once, and a grid of their segments that
     // answers the wire-at-point question from the few wires near the point.

@@ -147,10 +147,11 @@ VetorItens* CCExportDataReader::Le(zvdb::Database* database, CETemplate* modelo,
     // or the component kinds need them; a reader built on this one finds them loaded.
     const bool componentes = tipo == 3 || tipo == 4 || tipo == 5 || tipo == 7;
     const bool fios = tipo == 2 || tipo == 4 || tipo == 5 || tipo == 7;
-    if (componentes || fios) CarregaConexoesFios();
+    // The walk of the components reads no connection: the host works them out meanwhile.
+    if (componentes || fios) CarregaConexoesFios(componentes);
     if (tipo == 1) LeBornes(database, usado, *itens);
     if (componentes) {
-        CarregaConexoesCabos();
+        CarregaConexoesCabos(true);
         LeComponentes(database, usado, *itens);
     }
     if (fios) {

@@ -142,6 +142,7 @@ void TabelaConexoes::Indexa(std::uint32_t lugar) {
 }
 
 const TabelaConexoes::Fio* TabelaConexoes::Procura(QStringView numero) const {
+    Completa();
     if (indice_.empty()) return nullptr;
     const std::size_t mascara = indice_.size() - 1;
     const std::uint32_t hash = HashDe(numero);
@@ -322,6 +323,31 @@ bool TabelaConexoes::CarregaSemCadeia(const QString& funcao, bool detalhes, bool
     if (!CICad::zvInvokeConexoes(funcao, receptor)) return false;
     receptor.Fecha();
     return true;
+}
+
+void TabelaConexoes::CarregaDe(const QString& funcao, bool detalhes, bool completas) {
+    if (CarregaSemCadeia(funcao, detalhes, completas)) return;
+    zvsdk::ResultBuffer* resposta = CICad::zvInvokeLista(funcao);
+    Carrega(resposta, detalhes, completas);
+    CICad::LiberaLista(resposta);
+}
+
+bool TabelaConexoes::Adia(const QString& funcao, bool detalhes, bool completas) {
+    if (CICad::zvPreparaConexoes(funcao)) {
+        adiadas_.push_back({funcao, detalhes, completas});
+        return true;
+    }
+    // The answers add up in the order they were asked: what was put off comes first.
+    Completa();
+    return false;
+}
+
+void TabelaConexoes::CarregaAdiadas() {
+    // Taken out first: loading looks the table up.
+    const std::vector<Adiada> adiadas = std::move(adiadas_);
+    adiadas_.clear();
+    for (const Adiada& a : adiadas)
+        CarregaDe(a.funcao, a.detalhes, a.completas);
 }
 
 std::optional<TabelaConexoes::Textos> TabelaConexoes::Elementos(const QString& fio) const {

@@ -62,6 +62,12 @@ public:
     // host gives it without its chain (CICad::zvInvokeConexoes); false when it does not,
     // and nothing was added.
     bool CarregaSemCadeia(const QString& funcao, bool detalhes, bool completas);
+    // The answer of `funcao` by the first of the two ways the host gives.
+    void CarregaDe(const QString& funcao, bool detalhes, bool completas);
+    // The same, put off until the table is first looked at when the host works the answer
+    // out meanwhile (CICad::zvPreparaConexoes); true then. The drawing is read, not changed,
+    // until the look-up: the host waits for its work before any change.
+    bool Adia(const QString& funcao, bool detalhes, bool completas);
 
     // Null when the wire is not there.
     std::optional<Textos> Elementos(const QString& fio) const;
@@ -81,7 +87,10 @@ public:
         return a.size() == b.size() &&
                (a.empty() || std::memcmp(a.data(), b.data(), std::size_t(a.size()) * 2) == 0);
     }
-    int Fios() const { return int(fios_.size()); }
+    int Fios() const {
+        Completa();
+        return int(fios_.size());
+    }
 
 private:
     struct Fio {
@@ -109,6 +118,17 @@ private:
     // The QString of entry k, its whole text or its element, made once.
     QString Feito(std::size_t k, bool inteiro) const;
     const Fio* Procura(QStringView numero) const;
+    // Loads what was put off (Adia), in the order it was asked. Looking at the table is no
+    // change to it: the answers were asked for already.
+    void Completa() const {
+        if (!adiadas_.empty()) const_cast<TabelaConexoes*>(this)->CarregaAdiadas();
+    }
+    void CarregaAdiadas();
+    struct Adiada {
+        QString funcao;
+        bool detalhes, completas;
+    };
+    std::vector<Adiada> adiadas_;
     void Indexa(std::uint32_t lugar);
     void Reserva(std::size_t fios);
     // Both ways of loading go through these: a wire opened, its entries, the wire closed.

@@ -127,15 +127,20 @@ void ConnectionChains::install(DocumentLisp& lisp, const zvproduct::ProductConte
             *chain = toChain(answers->answer(in, context, kind, true), details);
             return true;
         });
-        lisp.addConnectionAnswer(function, [context, answers, kind, details, hasDrawing](
-                                               zvlisp::Interpreter& in,
-                                               zvsdk::ConnectionReceiver& receiver) {
-            if (!hasDrawing()) return false;
-            answers->table(in, context, kind, true, [&](const zvproduct::ConnectionTable& table) {
-                deliver(table, details, receiver);
+        lisp.addConnectionAnswer(
+            function,
+            [context, answers, kind, details, hasDrawing](zvlisp::Interpreter& in,
+                                                          zvsdk::ConnectionReceiver& receiver) {
+                if (!hasDrawing()) return false;
+                answers->table(in, context, kind, true,
+                               [&](const zvproduct::ConnectionTable& table) {
+                                   deliver(table, details, receiver);
+                               });
+                return true;
+            },
+            [context, answers, kind](zvlisp::Interpreter& in) {
+                return answers->prepare(in, context, kind);
             });
-            return true;
-        });
     };
     add("getConexoesTodosFios", ConnectionAnswers::Kind::Wires, true);
     add("getConexoesTodosCabos", ConnectionAnswers::Kind::Cables, false);

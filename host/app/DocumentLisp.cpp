@@ -245,14 +245,32 @@ void DocumentLisp::addChainAnswer(const QString& function, ChainAnswer answer) {
               std::move(answer),
               {},
               std::move(source.connections),
-              std::move(source.polylines)};
+              std::move(source.polylines),
+              std::move(source.prepare)};
 }
 
-void DocumentLisp::addConnectionAnswer(const QString& function, ConnectionAnswer answer) {
+void DocumentLisp::addConnectionAnswer(const QString& function, ConnectionAnswer answer,
+                                       ConnectionPreparer prepare) {
     zvlisp::Symbol* symbol = lisp_.intern(function);
     ChainSource& source = chainAnswers_[function];
-    source = {symbol, symbol->value,     std::move(source.answer),
-              {},     std::move(answer), std::move(source.polylines)};
+    source = {symbol,
+              symbol->value,
+              std::move(source.answer),
+              {},
+              std::move(answer),
+              std::move(source.polylines),
+              std::move(prepare)};
+}
+
+bool DocumentLisp::lispPrepareConnections(const QString& function) {
+    const ChainSource* source = sourceOf(function);
+    if (!source || !source->connections || !source->prepare) return false;
+    try {
+        return source->prepare(lisp_);
+    } catch (zvlisp::LispError&) {
+        // the call itself fails the same way, and reports it then
+        return false;
+    }
 }
 
 int DocumentLisp::invokeHostAnswer(const QString& function, const std::function<bool()>& answer) {
@@ -283,7 +301,8 @@ void DocumentLisp::addPolylineAnswer(const QString& function, PolylineAnswer ans
               std::move(source.answer),
               std::move(source.call),
               std::move(source.connections),
-              std::move(answer)};
+              std::move(answer),
+              std::move(source.prepare)};
 }
 
 int DocumentLisp::lispInvokePolylines(const QString& function, const QString& argument,
@@ -308,7 +327,7 @@ void DocumentLisp::addInvokeListener(InvokeListener listener) {
 void DocumentLisp::addChainCall(const QString& function, ChainCall call) {
     zvlisp::Symbol* symbol = lisp_.intern(function);
     ChainSource& source = chainAnswers_[function];
-    source = {symbol, symbol->value, {}, std::move(call), {}, std::move(source.polylines)};
+    source = {symbol, symbol->value, {}, std::move(call), {}, std::move(source.polylines), {}};
 }
 
 bool DocumentLisp::answerAsChain(const zvsdk::ResultBuffer* call, zvsdk::ResultBuffer** chain) {

@@ -58,9 +58,13 @@ public:
     // lispInvoke.
     using ConnectionAnswer =
         std::function<bool(zvlisp::Interpreter&, zvsdk::ConnectionReceiver& receiver)>;
-    void addConnectionAnswer(const QString& function, ConnectionAnswer answer);
+    // `prepare`, when given, starts working the answer out ahead (lispPrepareConnections).
+    using ConnectionPreparer = std::function<bool(zvlisp::Interpreter&)>;
+    void addConnectionAnswer(const QString& function, ConnectionAnswer answer,
+                             ConnectionPreparer prepare = {});
     int lispInvokeConnections(const QString& function,
                               zvsdk::ConnectionReceiver& receiver) override;
+    bool lispPrepareConnections(const QString& function) override;
     // The same for a function of one text argument that answers polyline handles (see
     // lispInvokePolylines): the handles must be those of the chain the function would give.
     using PolylineAnswer = std::function<bool(zvlisp::Interpreter&, const QString& argument,
@@ -80,6 +84,7 @@ private:
         ChainCall call;
         ConnectionAnswer connections;
         PolylineAnswer polylines;
+        ConnectionPreparer prepare;
     };
     // The source of a function's answers while its symbol holds the function it held when
     // the source was added; null otherwise.

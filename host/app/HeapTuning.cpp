@@ -17,4 +17,11 @@ bool keepFreedHeapBlocks() {
            mallopt(M_TRIM_THRESHOLD, kHeapTrimBytes) == 1;
 }
 
+bool shareOneHeap() {
+    if (qgetenv("GLIBC_TUNABLES").contains("glibc.malloc.arena_max") ||
+        qEnvironmentVariableIsSet("MALLOC_ARENA_MAX"))
+        return false;
+    return mallopt(M_ARENA_MAX, 1) == 1;
+}
+
 }  // namespace zvhost

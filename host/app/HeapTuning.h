@@ -19,4 +19,11 @@ inline constexpr int kHeapTrimBytes = 1 << 30;
 // there stands). Returns whether they were set.
 bool keepFreedHeapBlocks();
 
+// Keeps every thread on the main heap (one arena), unless GLIBC_TUNABLES or
+// MALLOC_ARENA_MAX chooses: the threads that work for the main thread (an index worked out
+// ahead, the freeing of a list's items) give what they free back where the main thread
+// takes its next blocks, instead of to a heap of their own while the main thread maps new
+// pages. Call it before any thread starts. Returns whether it was set.
+bool shareOneHeap();
+
 }  // namespace zvhost

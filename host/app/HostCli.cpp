@@ -189,6 +189,7 @@ int commandStatus(const QString& command, zvsdk::CommandResult result, QTextStre
 int runDrawing(const Options& options, QTextStream& out, QTextStream& err) {
     restartWithHugePages(options.drawing);
     keepFreedHeapBlocks();
+    shareOneHeap();
     const bool terminal = !options.quiet && isatty(STDOUT_FILENO);
     auto ui = std::make_unique<ConsoleUserInterface>(out, err, terminal);
     for (const QString& answer : options.answers)

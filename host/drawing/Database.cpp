@@ -25,7 +25,9 @@ Database::Database() : Database(Blank{}) {
     DxfLoader::loadInto(*this, DrawingSkeleton::text());
 }
 
-Database::~Database() = default;
+Database::~Database() {
+    runSettles();
+}
 
 std::string_view Database::version() const {
     return header_.text("$ACADVER", "AC1009");
@@ -66,11 +68,30 @@ void Database::noteChange() {
 }
 
 void Database::shapeAboutToChange() {
+    runSettles();
     if (!beforeShapeChange_) return;
     // Taken out first: what the hook reads must not run it again.
     const std::function<void()> hook = std::move(beforeShapeChange_);
     beforeShapeChange_ = nullptr;
     hook();
+}
+
+void Database::settleBeforeChange(const void* owner, std::function<void()> settle) {
+    forgetSettle(owner);
+    settles_.emplace_back(owner, std::move(settle));
+}
+
+void Database::forgetSettle(const void* owner) {
+    std::erase_if(settles_, [owner](const auto& entry) { return entry.first == owner; });
+}
+
+void Database::runSettles() {
+    if (settles_.empty()) return;
+    // Taken out first: a settle that changes the drawing must not run again.
+    const auto settles = std::move(settles_);
+    settles_.clear();
+    for (const auto& entry : settles)
+        entry.second();
 }
 
 void Database::noteLayerEdit(const DbObject& record) {
@@ -101,6 +122,7 @@ void Database::swapContents(Database& other) {
     warnings_.swap(other.warnings_);
     std::swap(namedObjects_, other.namedObjects_);
     layouts_.swap(other.layouts_);
+    std::swap(patternedObjects_, other.patternedObjects_);
     modelSpace_ = KnownSpace{};
     other.modelSpace_ = KnownSpace{};
     lastReference_ = LastReference{};
@@ -126,6 +148,7 @@ void Database::swapContents(Database& other) {
 DbObject* Database::adopt(std::unique_ptr<DbObject> object) {
     DbObject* raw = object.get();
     noteChange();
+    if (raw->isPatterned()) ++patternedObjects_;
     storage_.push_back(std::move(object));
     if (raw->handle() != 0) {
         byHandle_.emplace(raw->handle(), raw);

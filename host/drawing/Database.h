@@ -80,6 +80,14 @@ public:
     // replaces it, an empty one takes it back. Work put off until it is needed (the view a
     // zoom asked for) is done there when the drawing would change under it.
     void beforeShapeChange(std::function<void()> hook) { beforeShapeChange_ = std::move(hook); }
+    // Runs `settle` once, just before the next change that moves shapeCount or when the
+    // drawing goes, whichever comes first: work reading the drawing on another thread ends
+    // there, before anything it reads moves. Kept under `owner`, which can take it back.
+    void settleBeforeChange(const void* owner, std::function<void()> settle);
+    void forgetSettle(const void* owner);
+    // Whether an object made since the drawing was read puts its tags together when first
+    // asked for them (see DbObject::tags): reading those is not free of changes.
+    bool hasPatternedObjects() const { return patternedObjects_ != 0; }
     // Trades the whole content with another database, this object staying where it is:
     // what holds a Database& goes on working and sees the other drawing (undo, reload).
     void swapContents(Database& other);
@@ -276,6 +284,9 @@ private:
     std::vector<const DbObject*> layerEdits_;
     std::uint64_t layerEditsEpoch_ = 0;
     std::function<void()> beforeShapeChange_;
+    std::vector<std::pair<const void*, std::function<void()>>> settles_;
+    std::size_t patternedObjects_ = 0;
+    void runSettles();
     // Bounds of block definitions Extents worked out, by block handle and nesting depth;
     // good while the change count is `boundsAt_`.
     struct BoundsKey {

@@ -6,6 +6,9 @@
 // count, see DrawingStamp) and the tolerance are the same, and the next call drops it in
 // any case: nothing big stays behind between commands. A host that sees the caller go on
 // to other things (see ConnectionChains) lets it go at once.
+//
+// A reader that asks later may announce its call (prepare): the index is then worked out on
+// another thread while the reader goes on reading the drawing, and the call waits for it.
 #include "ConnectionFinder.h"
 #include "DrawingStamp.h"
 #include "WireLayerIndex.h"
@@ -27,6 +30,25 @@ struct ProductContext;
 class ConnectionAnswers {
 public:
     enum class Kind { Wires, Cables };
+
+    ConnectionAnswers();
+    ~ConnectionAnswers();
+    ConnectionAnswers(const ConnectionAnswers&) = delete;
+    ConnectionAnswers& operator=(const ConnectionAnswers&) = delete;
+
+    // Starts working out, on another thread, the index the next two calls on the drawing
+    // will use; true when it did. It does not when an index for the drawing as it stands is
+    // kept already, when the drawing holds objects whose reading changes them, or when no
+    // thread could be had: the calls then work it out themselves. The drawing must not
+    // change meanwhile: its next change (Database::settleBeforeChange) waits for the thread
+    // and drops what it made, which the drawing's change makes stale anyway.
+    // The answer of `kind` is worked out there too when the thread comes to it.
+    bool prepare(zvdb::Database& database, double tolerance, Kind kind);
+    // The same for the context's drawing, at the tolerance of a LISP call; false without a
+    // drawing.
+    bool prepare(zvlisp::Interpreter& lisp, const ProductContext& context, Kind kind);
+    // Whether an index is being worked out, or was and waits for its calls.
+    bool isPrepared() const { return prepared_ != nullptr; }
 
     // `keepOther` keeps the index for a call of the other kind.
     std::vector<WireConnections> answer(zvdb::Database& database, double tolerance, Kind kind,
@@ -73,6 +95,17 @@ private:
     static zvdb::Database& databaseOf(zvlisp::Interpreter& lisp, const ProductContext& context);
     void readWires(zvdb::Database& database);
 
+    // The index prepare works out, when it is for `database` as it stands at `tolerance`;
+    // null otherwise. What was prepared goes in any case.
+    std::unique_ptr<ConnectionFinder> takePrepared(zvdb::Database& database, double tolerance);
+    // The same left in place, once its thread is done; what does not serve goes.
+    ConnectionFinder* readyPrepared(zvdb::Database& database);
+    void dropPrepared();
+    // Gives the wire indexes what the walk of `finder` saw, where they are stale.
+    void handOver(const ConnectionFinder& finder, zvdb::Database& database);
+
+    struct Prepared;
+    std::unique_ptr<Prepared> prepared_;
     DrawingStamp stamp_;
     double tolerance_ = 0;
     std::unique_ptr<ConnectionFinder> kept_;

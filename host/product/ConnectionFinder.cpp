@@ -297,12 +297,20 @@ std::string_view appendVertices(const zvdb::Polyline& polyline, std::size_t end,
 }  // namespace
 
 ConnectionFinder::ConnectionFinder(zvdb::Database& database, double tolerance)
+    : ConnectionFinder(database, tolerance, pagesInOrder(database)) {}
+
+ConnectionFinder::ConnectionFinder(zvdb::Database& database, double tolerance,
+                                   std::vector<std::string> pages)
     : database_(database),
       tolerance_(tolerance > 0 ? tolerance : 0.1),
       cell_(std::max({tolerance_, kLeadTolerance, 1.0})) {
     readModelSpace();
     buildGrid();
-    sortLines();
+    sortLines(pages);
+}
+
+std::vector<std::string> ConnectionFinder::pagesInOrder(zvdb::Database& database) {
+    return PageRegistry(database).pages();
 }
 
 std::unordered_map<std::string, std::vector<std::uint64_t>> ConnectionFinder::wiresAndLeadsByLayer(
@@ -528,13 +536,11 @@ void ConnectionFinder::buildGrid() {
 }
 
 // Each role's polylines by registry page order, then by handle.
-void ConnectionFinder::sortLines() {
+void ConnectionFinder::sortLines(const std::vector<std::string>& pages) {
     std::unordered_map<std::string_view, std::int32_t> order;
-    const PageRegistry registry(database_);
     std::int32_t index = 0;
-    for (const PageGroup& group : registry.groups())
-        for (const std::string& page : group.pages)
-            order.emplace(page, index++);
+    for (const std::string& page : pages)
+        order.emplace(page, index++);
     std::vector<std::int32_t> rankOf(layers_.size(), INT_MAX);
     for (const auto& [name, id] : layers_) {
         auto page = order.find(name);
@@ -866,15 +872,21 @@ std::vector<WireConnections> ConnectionFinder::cables() const {
 }
 
 ConnectionTable ConnectionFinder::wireTable() const {
+    if (std::optional<ConnectionTable>& ahead = ahead_[0]) return *std::exchange(ahead, {});
     ConnectionTable table = wiresWith(MakeTable{});
     table.finder = this;
     return table;
 }
 
 ConnectionTable ConnectionFinder::cableTable() const {
+    if (std::optional<ConnectionTable>& ahead = ahead_[1]) return *std::exchange(ahead, {});
     ConnectionTable table = cablesWith(MakeTable{});
     table.finder = this;
     return table;
+}
+
+void ConnectionFinder::tableAhead(bool cables) {
+    ahead_[cables ? 1 : 0] = cables ? cableTable() : wireTable();
 }
 
 std::string ConnectionFinder::cableNumber(const zvdb::Polyline& lead) const {

@@ -11,6 +11,7 @@
 
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <span>
 #include <string>
 #include <string_view>
@@ -77,6 +78,10 @@ struct ConnectionTable {
 class ConnectionFinder {
 public:
     ConnectionFinder(zvdb::Database& database, double tolerance);
+    // The same with the registry's pages in order (pagesInOrder) read beforehand: the walk
+    // then reads model space alone, which another thread may do while nothing changes it.
+    ConnectionFinder(zvdb::Database& database, double tolerance, std::vector<std::string> pages);
+    static std::vector<std::string> pagesInOrder(zvdb::Database& database);
 
     // Wires (KVR_ZV_WIRE), in the order their first polyline comes in page order.
     std::vector<WireConnections> wires() const;
@@ -86,6 +91,9 @@ public:
     // The same as tables, without the polylines: no arrays per wire.
     ConnectionTable wireTable() const;
     ConnectionTable cableTable() const;
+    // Works out the wires' (or the cables') table now, on the thread that made the finder:
+    // the next wireTable (cableTable) hands it over.
+    void tableAhead(bool cables);
     // The touch at a place of a table's entries.
     Touch touchAt(std::uint32_t place) const;
     double tolerance() const { return tolerance_; }
@@ -113,6 +121,7 @@ public:
                           std::unordered_map<std::string, std::vector<std::uint64_t>>& byLayer);
 
 private:
+    mutable std::optional<ConnectionTable> ahead_[2];
     struct Symbol {
         std::uint64_t handle;
         std::string_view block;
@@ -168,7 +177,7 @@ private:
     static std::size_t slotOf(std::uint64_t cell);
     const CellRun* run(std::int32_t layer, std::uint64_t cell) const;
     void buildGrid();
-    void sortLines();
+    void sortLines(const std::vector<std::string>& pages);
     // The places in spots_ of the touches, appended to `out`.
     void touchesAt(std::int32_t layer, const zvdb::Point3& p, double radius,
                    std::vector<std::uint32_t>& out, Scratch& scratch) const;

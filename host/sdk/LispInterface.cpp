@@ -84,6 +84,10 @@ int LispInterface::lispInvokeConnections(const QString&, ConnectionReceiver&) {
     return RTNONE;
 }
 
+bool LispInterface::lispPrepareConnections(const QString&) {
+    return false;
+}
+
 int LispInterface::lispInvokePolylines(const QString&, const QString&, PolylineReceiver&) {
     return RTNONE;
 }

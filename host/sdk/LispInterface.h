@@ -71,6 +71,12 @@ public:
     // lispInvoke's null), RTNONE when the host does not answer the function so (the caller
     // asks lispInvoke). The default answers RTNONE.
     virtual int lispInvokeConnections(const QString& function, ConnectionReceiver& receiver);
+    // Tells the host that the caller will call `function` so later, after reading the
+    // drawing for a while without changing it: the host may start working out the answer
+    // meanwhile, on another thread. True when it did, and the call should then come as late
+    // as the caller can make it; false when it did not, and nothing is gained by waiting.
+    // The default answers false.
+    virtual bool lispPrepareConnections(const QString& function);
     // The same for a function of one text argument that answers polyline handles (such as
     // getFiosPorLayer): each goes to `receiver` with its vertices, which a reader would read
     // next. The default answers RTNONE.

@@ -329,6 +329,40 @@ TEST_F(DatabaseApi, ChangeCountMovesOnEveryChangeAndOnlyThen) {
     EXPECT_NE(other.changeCount(), db.changeCount()) << "two drawings never share a count";
 }
 
+// What reads the drawing on another thread is settled before anything it reads moves.
+TEST_F(DatabaseApi, ASettleRunsOnceBeforeTheNextChangeOrWhenTheDrawingGoes) {
+    Entity* line = db.modelSpace()->addLine({0, 0, 0}, {1, 0, 0});
+    std::vector<std::string> runs;
+    auto settle = [&runs](const char* who) { return [&runs, who] { runs.emplace_back(who); }; };
+    const int first = 0, second = 0, dropped = 0;
+    db.settleBeforeChange(&first, settle("first"));
+    db.settleBeforeChange(&second, settle("old second"));
+    db.settleBeforeChange(&second, settle("second"));  // takes the place of the one before
+    db.settleBeforeChange(&dropped, settle("dropped"));
+    db.forgetSettle(&dropped);
+    (void)line->layer();
+    (void)db.modelSpace()->entities();
+    EXPECT_TRUE(runs.empty()) << "reading settles nothing";
+    std::uint64_t countSeen = 0;
+    db.settleBeforeChange(&first, [&] {
+        runs.emplace_back("first");
+        countSeen = db.changeCount();
+    });
+    const std::uint64_t before = db.changeCount();
+    line->setLayer("OTHER");
+    EXPECT_EQ(runs, (std::vector<std::string>{"second", "first"}));
+    EXPECT_EQ(countSeen, before) << "settled on the drawing as it was";
+    line->setLayer("THIRD");
+    EXPECT_EQ(runs.size(), 2u) << "once";
+    // an erasure and the drawing's end settle too
+    db.settleBeforeChange(&first, settle("erase"));
+    line->erase();
+    auto other = std::make_unique<Database>();
+    other->settleBeforeChange(&first, settle("end"));
+    other.reset();
+    EXPECT_EQ(runs, (std::vector<std::string>{"second", "first", "erase", "end"}));
+}
+
 TEST_F(DatabaseApi, SavingChangesNothingAndCountsEachTableAsItStands) {
     const std::uint64_t layersBefore = db.table("LAYER")->size();
     for (const char* name : {"A", "B", "C"})

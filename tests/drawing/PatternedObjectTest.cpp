@@ -237,7 +237,9 @@ TEST(PatternedObjects, TagsAreThoseOfTheStepByStepAttribute) {
 TEST(PatternedObjects, ChangesAfterMakingAreWrittenAndReadBack) {
     Database db;
     BlockRecord* block = sampleBlock(db);
+    EXPECT_FALSE(db.hasPatternedObjects());
     const Made made = insert(db, *block, {10, 10, 0}, {1, 1, 1}, 0, false, {"A", "B", "C", "D"});
+    EXPECT_TRUE(db.hasPatternedObjects()) << "another thread may not read the drawing now";
     const Made other = insert(db, *block, {10, 20, 0}, {1, 1, 1}, 0, false, {"E", "F", "G", "H"});
     made.attributes[0]->setTextValue("-K9");
     made.attributes[1]->setPosition({7, 8, 0});
@@ -249,6 +251,7 @@ TEST(PatternedObjects, ChangesAfterMakingAreWrittenAndReadBack) {
     EXPECT_TRUE(other.attributes[0]->isPatterned());
 
     auto copy = DxfLoader::load(DxfWriter::toText(db));
+    EXPECT_FALSE(copy->hasPatternedObjects()) << "a drawing read from its file holds none";
     EXPECT_NE(copy->table("APPID")->find("ZV_PATTERN_TEST"), nullptr)
         << "extended data on a patterned object is registered";
     auto* again = dynamic_cast<BlockReference*>(copy->entityByHandle(made.reference->handle()));

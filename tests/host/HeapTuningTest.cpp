@@ -8,8 +8,10 @@
 #include <gtest/gtest.h>
 
 #include <malloc.h>
+#include <cstdint>
 #include <cstdlib>
 #include <cstring>
+#include <thread>
 
 namespace {
 
@@ -42,6 +44,40 @@ TEST(HeapTuning, LargeBlocksComeFromTheHeapAndStayInItWhenFreed) {
     const struct mallinfo2 freed = mallinfo2();
     EXPECT_EQ(freed.arena, taken.arena) << "the heap gave the block's room back";
     EXPECT_GE(freed.fordblks, kSize) << "the room is free for the next request";
+}
+
+// Run in a process of its own: a thread's arena, once it has one, stays.
+TEST(HeapTuningDeathTest, ABlockAThreadFreesServesTheMainThreadNext) {
+    GTEST_FLAG_SET(death_test_style, "threadsafe");
+    qunsetenv("GLIBC_TUNABLES");
+    qunsetenv("MALLOC_ARENA_MAX");
+    auto reused = [] {
+        zvhost::keepFreedHeapBlocks();
+        if (!zvhost::shareOneHeap()) std::_Exit(2);
+        constexpr std::size_t kSize = 4u << 20;
+        void* theirs = nullptr;
+        std::thread([&theirs] {
+            theirs = std::malloc(kSize);
+            Touch(theirs, kSize);
+            std::free(theirs);
+        }).join();
+        // Where the thread's block was, give or take the small blocks freed around it; a
+        // heap of the thread's own lies elsewhere, mapped apart from the main heap.
+        void* mine = std::malloc(kSize);
+        const auto apart =
+            reinterpret_cast<std::intptr_t>(mine) - reinterpret_cast<std::intptr_t>(theirs);
+        std::_Exit(std::abs(apart) < std::intptr_t(kSize) ? 0 : 1);
+    };
+    EXPECT_EXIT(reused(), testing::ExitedWithCode(0), "");
+}
+
+TEST(HeapTuning, AnArenaChoiceInTheEnvironmentStands) {
+    qputenv("MALLOC_ARENA_MAX", "4");
+    EXPECT_FALSE(zvhost::shareOneHeap());
+    qunsetenv("MALLOC_ARENA_MAX");
+    qputenv("GLIBC_TUNABLES", "glibc.malloc.arena_max=2");
+    EXPECT_FALSE(zvhost::shareOneHeap());
+    qunsetenv("GLIBC_TUNABLES");
 }
 
 }  // namespace

@@ -3,8 +3,14 @@
 // tolerance or of the drawing itself.
 #include "ProductFixture.h"
 
+#include "drawing/BlockRecord.h"
+#include "drawing/DxfLoader.h"
+#include "drawing/DxfWriter.h"
+#include "drawing/Polyline.h"
 #include "product/ConnectionAnswers.h"
 #include "sample/ProjectGenerator.h"
+
+#include <typeinfo>
 
 namespace zvproduct::testing {
 namespace {
@@ -153,6 +159,126 @@ TEST_F(ConnectionAnswersTest, TwoDrawingsAndAnUndoSwapDoNotShareAnswers) {
     answers.answer(*database, 0.1, ConnectionAnswers::Kind::Cables);
     EXPECT_EQ(summary(answers.answer(*database, 0.1, ConnectionAnswers::Kind::Wires)),
               summary(ConnectionFinder(*database, 0.1).wires()));
+}
+
+// A table's numbers and touches, one line a wire.
+std::string summary(const ConnectionTable& table) {
+    std::vector<WireConnections> wires(table.numbers.size());
+    std::size_t k = 0;
+    for (std::size_t w = 0; w < wires.size(); ++w) {
+        wires[w].number = table.numbers[w];
+        for (; k < table.ends[w]; ++k)
+            wires[w].touches.push_back(table.touch(k));
+    }
+    return summary(wires);
+}
+
+// An index announced ahead is worked out on another thread from a drawing read from its
+// file, while nothing changes it.
+class PreparedAnswersTest : public ConnectionAnswersTest {
+protected:
+    using Kind = ConnectionAnswers::Kind;
+    PreparedAnswersTest() : drawing(readBack()) {}
+    // The generator's drawing as its file reads back: the generator makes patterned objects.
+    static std::unique_ptr<zvdb::Database> readBack() {
+        const std::unique_ptr<zvdb::Database> made =
+            zvsample::ProjectGenerator({7, 60, 4}).generate();
+        return zvdb::DxfLoader::load(zvdb::DxfWriter::toText(*made));
+    }
+    void SetUp() override { ASSERT_FALSE(drawing->hasPatternedObjects()); }
+
+    std::string alone(Kind kind, double tolerance = 0.1) {
+        const ConnectionFinder finder(*drawing, tolerance);
+        return summary(kind == Kind::Wires ? finder.wires() : finder.cables());
+    }
+    std::string table(Kind kind, double tolerance = 0.1) {
+        std::string text;
+        answers.table(*drawing, tolerance, kind, true,
+                      [&](const ConnectionTable& made) { text = summary(made); });
+        return text;
+    }
+    zvdb::Polyline* firstWire() {
+        zvdb::Polyline* found = nullptr;
+        drawing->modelSpace()->forEachEntity([&](zvdb::Entity& entity) {
+            if (!found && typeid(entity) == typeid(zvdb::Polyline) &&
+                !entity.xdata("KVR_ZV_WIRE").empty())
+                found = static_cast<zvdb::Polyline*>(&entity);
+        });
+        return found;
+    }
+
+    std::unique_ptr<zvdb::Database> drawing;
+};
+
+TEST_F(PreparedAnswersTest, ThePreparedIndexServesBothCallsWithTheAnswersWorkedOutAlone) {
+    const std::string wires = alone(Kind::Wires), cables = alone(Kind::Cables);
+    ASSERT_NE(wires, cables);
+    for (const bool tables : {false, true}) {
+        SCOPED_TRACE(tables ? "tables" : "answers");
+        ASSERT_TRUE(answers.prepare(*drawing, 0.1, Kind::Wires));
+        EXPECT_TRUE(answers.prepare(*drawing, 0.1, Kind::Cables)) << "one index serves both";
+        EXPECT_TRUE(answers.isPrepared());
+        EXPECT_FALSE(answers.keepsIndex());
+        EXPECT_EQ(tables ? table(Kind::Wires) : summary(answers.answer(*drawing, 0.1, Kind::Wires)),
+                  wires);
+        EXPECT_FALSE(answers.isPrepared());
+        EXPECT_TRUE(answers.keepsIndex()) << "kept for the second call, as one built then";
+        EXPECT_EQ(
+            tables ? table(Kind::Cables) : summary(answers.answer(*drawing, 0.1, Kind::Cables)),
+            cables);
+        EXPECT_FALSE(answers.keepsIndex());
+    }
+    // the tables the thread made ahead are those of the index, given once
+    ASSERT_TRUE(answers.prepare(*drawing, 0.1, Kind::Cables));
+    EXPECT_EQ(table(Kind::Cables), cables);
+    // a kept index of the drawing as it stands serves without another thread
+    EXPECT_FALSE(answers.prepare(*drawing, 0.1, Kind::Wires));
+    EXPECT_EQ(table(Kind::Cables), cables);
+}
+
+TEST_F(PreparedAnswersTest, AChangeDropsThePreparedIndexAndTheCallSeesTheChange) {
+    const std::string before = alone(Kind::Wires);
+    ASSERT_TRUE(answers.prepare(*drawing, 0.1, Kind::Wires));
+    zvdb::Polyline* wire = firstWire();
+    ASSERT_NE(wire, nullptr);
+    wire->erase();
+    EXPECT_FALSE(answers.isPrepared()) << "the change waited for the thread and dropped it";
+    const std::string after = summary(answers.answer(*drawing, 0.1, Kind::Wires));
+    EXPECT_NE(after, before);
+    EXPECT_EQ(after, alone(Kind::Wires));
+}
+
+TEST_F(PreparedAnswersTest, AnotherToleranceOrDrawingIsWorkedOutForTheCall) {
+    ASSERT_TRUE(answers.prepare(*drawing, 0.1, Kind::Wires));
+    EXPECT_EQ(summary(answers.answer(*drawing, 25.0, Kind::Wires)), alone(Kind::Wires, 25.0));
+    ASSERT_NE(alone(Kind::Wires, 25.0), alone(Kind::Wires));
+    ASSERT_TRUE(answers.prepare(*drawing, 0.1, Kind::Wires));
+    EXPECT_EQ(summary(answers.answer(*database, 0.1, Kind::Wires)),
+              summary(ConnectionFinder(*database, 0.1).wires()));
+    EXPECT_FALSE(answers.isPrepared());
+}
+
+TEST_F(PreparedAnswersTest, ADrawingWhoseReadingChangesItIsNotReadOnAnotherThread) {
+    // the fixture's symbols were inserted with attributes made from their layouts
+    ASSERT_TRUE(database->hasPatternedObjects());
+    EXPECT_FALSE(answers.prepare(*database, 0.1, Kind::Wires));
+    EXPECT_FALSE(answers.isPrepared());
+}
+
+TEST_F(PreparedAnswersTest, TheDrawingOrTheAnswersMayGoWhileTheThreadWorks) {
+    ASSERT_TRUE(answers.prepare(*drawing, 0.1, Kind::Wires));
+    drawing.reset();
+    EXPECT_FALSE(answers.isPrepared());
+    drawing = readBack();
+    {
+        ConnectionAnswers own;
+        ASSERT_TRUE(own.prepare(*drawing, 0.1, Kind::Cables));
+    }
+    // nothing of the answers that went is left to settle
+    zvdb::Polyline* wire = firstWire();
+    ASSERT_NE(wire, nullptr);
+    wire->erase();
+    EXPECT_EQ(summary(answers.answer(*drawing, 0.1, Kind::Cables)), alone(Kind::Cables));
 }
 
 TEST_F(ConnectionAnswersTest, EntryTextsInUpperCaseHexadecimalWithTheirDetails) {

@@ -6,6 +6,8 @@
 #include "drawing/Attribute.h"
 #include "drawing/BlockRecord.h"
 #include "drawing/BlockReference.h"
+#include "drawing/DxfLoader.h"
+#include "drawing/DxfWriter.h"
 #include "drawing/Polyline.h"
 #include "readers/CCBorneDataReader.h"
 #include "readers/LeitorBase.h"
@@ -234,8 +236,12 @@ class ProductConnectionLoadTest : public ConnectionLoadTest {
 protected:
     void SetUp() override {
         ConnectionLoadTest::SetUp();
+        // As a file reads back: the generator's own objects put their tags together when
+        // first read, and the host then reads the drawing on one thread only.
         zvsample::ProjectGenerator gerador({3, 120, 6});
-        documento_ = app_->openDocument(arquivo("gerado.dxf"), gerador.generate());
+        documento_ =
+            app_->openDocument(arquivo("gerado.dxf"),
+                               zvdb::DxfLoader::load(zvdb::DxfWriter::toText(*gerador.generate())));
     }
     // The wires then the cables, as a reader loads them, with and without the whole texts,
     // and each read with and without the details: the same table from the chains as from
@@ -305,6 +311,69 @@ TEST_F(ProductConnectionLoadTest, NamesBeyondAsciiMakeTheSameTable) {
     EXPECT_TRUE(std::any_of(numeros.begin(), numeros.end(),
                             [](const QString& n) { return n.startsWith(u"N\u00ba"); }));
     EXPECT_NE(Conteudo(tabela, numeros).find("#\xc3\x87"), std::string::npos);
+}
+
+// The numbers of the product's answers, the wires' then the cables'. Asking both leaves the
+// host no index kept for another call.
+QStringList NumerosDoProduto() {
+    QStringList numeros;
+    for (const char* funcao : {"getConexoesTodosFios", "getConexoesTodosCabos"}) {
+        zvsdk::ResultBuffer* cadeia = CICad::zvInvokeLista(funcao);
+        numeros << NumerosDaCadeia(cadeia);
+        CICad::LiberaLista(cadeia);
+    }
+    return numeros;
+}
+
+// The host works a put-off answer out while the reader reads on; the table takes it at
+// its first look-up, the same as an answer loaded at once.
+TEST_F(ProductConnectionLoadTest, AnAnswerPutOffMakesTheSameTableAsOneLoadedAtOnce) {
+    const QStringList numeros = NumerosDoProduto();
+    ASSERT_GT(numeros.size(), 20);
+    for (const bool completas : {true, false}) {
+        SCOPED_TRACE(completas);
+        TabelaConexoes adiada, agora;
+        ASSERT_TRUE(adiada.Adia("getConexoesTodosFios", true, completas));
+        ASSERT_TRUE(adiada.Adia("getConexoesTodosCabos", false, completas));
+        agora.CarregaDe("getConexoesTodosFios", true, completas);
+        agora.CarregaDe("getConexoesTodosCabos", false, completas);
+        EXPECT_EQ(Conteudo(adiada, numeros), Conteudo(agora, numeros));
+        EXPECT_EQ(adiada.Fios(), agora.Fios());
+    }
+}
+
+TEST_F(ProductConnectionLoadTest, AnAnswerPutOffSeesTheDrawingAsItStandsAtTheFirstLookUp) {
+    const QStringList numeros = NumerosDoProduto();
+    TabelaConexoes antes, adiada, depois;
+    antes.CarregaDe("getConexoesTodosFios", true, true);
+    antes.CarregaDe("getConexoesTodosCabos", false, true);
+    ASSERT_TRUE(adiada.Adia("getConexoesTodosFios", true, true));
+    // a wire goes while the answer is worked out
+    zvdb::Entity* fio = nullptr;
+    db().modelSpace()->forEachEntity([&](zvdb::Entity& entidade) {
+        if (!fio && !entidade.xdata("KVR_ZV_WIRE").empty()) fio = &entidade;
+    });
+    ASSERT_NE(fio, nullptr);
+    fio->erase();
+    depois.CarregaDe("getConexoesTodosFios", true, true);
+    EXPECT_NE(Conteudo(adiada, numeros), Conteudo(antes, numeros));
+    EXPECT_EQ(Conteudo(adiada, numeros), Conteudo(depois, numeros));
+}
+
+// A function the host does not work out ahead is loaded when asked, after what was put off:
+// the answers add up in the order they were asked.
+TEST_F(ProductConnectionLoadTest, AUsersFunctionIsNotPutOffAndComesAfterWhatWas) {
+    const QString numero = NumerosDoProduto().front();
+    CICad::AvaliaLisp(
+        QString("(defun getConexoesTodosCabos () '((\"%1\" (\"3C\" 4.0 5.0 6.0))))").arg(numero));
+    TabelaConexoes tabela;
+    ASSERT_TRUE(tabela.Adia("getConexoesTodosFios", true, true));
+    EXPECT_FALSE(tabela.Adia("getConexoesTodosCabos", false, true));
+    tabela.CarregaDe("getConexoesTodosCabos", false, true);
+    const auto fio = tabela.DoFio(numero);
+    ASSERT_TRUE(fio);
+    EXPECT_EQ(fio->elementos.ParaLista(), QStringList({"3C"}));
+    EXPECT_GT(fio->completas.size(), 0) << "the wire's whole texts, kept by the cable";
 }
 
 // A user's function has no answer without a chain: the reader loads it from its chain.
