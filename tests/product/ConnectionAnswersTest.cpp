@@ -236,6 +236,27 @@ TEST_F(PreparedAnswersTest, ThePreparedIndexServesBothCallsWithTheAnswersWorkedO
     EXPECT_EQ(table(Kind::Cables), cables);
 }
 
+// A reader reads the drawing meanwhile as the components' walk does, through the same
+// questions; a build with the thread sanitizer checks that the two threads only read.
+TEST_F(PreparedAnswersTest, TheDrawingIsReadOnBothThreadsAtOnce) {
+    const std::string wires = alone(Kind::Wires), cables = alone(Kind::Cables);
+    ASSERT_TRUE(answers.prepare(*drawing, 0.1, Kind::Wires));
+    ASSERT_TRUE(answers.prepare(*drawing, 0.1, Kind::Cables));
+    std::size_t read = 0;
+    for (int pass = 0; pass < 3; ++pass)
+        drawing->modelSpace()->forEachEntity([&](zvdb::Entity& entity) {
+            read += entity.layer().size() + entity.xdataItems("KVR_ZV").size();
+            read += drawing->entityByHandle(entity.handle()) == &entity ? 1 : 0;
+            for (zvdb::Entity* sub : entity.subEntities())
+                read += sub->text(2).size() + sub->text(1).size();
+            if (typeid(entity) == typeid(zvdb::Polyline))
+                read += static_cast<zvdb::Polyline&>(entity).vertices().size();
+        });
+    EXPECT_GT(read, 0u);
+    EXPECT_EQ(table(Kind::Wires), wires);
+    EXPECT_EQ(table(Kind::Cables), cables);
+}
+
 TEST_F(PreparedAnswersTest, AChangeDropsThePreparedIndexAndTheCallSeesTheChange) {
     const std::string before = alone(Kind::Wires);
     ASSERT_TRUE(answers.prepare(*drawing, 0.1, Kind::Wires));
