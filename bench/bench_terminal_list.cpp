@@ -13,8 +13,10 @@
 // the program's own (user) and the kernel's (system), with the page faults; on a virtual machine
 // first touches of memory can cost more in the kernel than the program spends itself, so the
 // user time ratio shows the program apart from that. Each pair (open-and-save, then the list) runs
-// `--runs` times (3 unless given), one pair after the other; the figures kept are each side's
-// fastest run, as load from elsewhere only ever adds time, and the highest peak memory of its runs.
+// `--runs` times (3 unless given), one pair after the other, taking the sizes in turn: a load
+// that comes and goes falls alike on every size, not on the largest alone. The figures kept are
+// each side's fastest run, as load from elsewhere only ever adds time, and the highest peak
+// memory of its runs.
 #include <QCoreApplication>
 #include <QDir>
 #include <QProcess>
@@ -178,42 +180,50 @@ int main(int argc, char** argv) {
              env, folder.path())
              .ok)
         return 1;
-    std::vector<Linha> linhas;
+    // Every project first: the runs then take the sizes in turn.
+    std::vector<QString> projetos;
     for (const QString& size : sizes) {
-        const QString project = folder.filePath("p" + size + ".dxf");
+        projetos.push_back(folder.filePath("p" + size + ".dxf"));
         // Numbers run on through the project, so that the jumpers are linked.
-        if (!run({"generate", "--out", project, "--seed", "7", "--terminals", size, "--numbers",
-                  "project", "--data", product},
+        if (!run({"generate", "--out", projetos.back(), "--seed", "7", "--terminals", size,
+                  "--numbers", "project", "--data", product},
                  env, folder.path())
                  .ok)
             return 1;
-        const QString saida = folder.filePath("out.dxf");
-        for (const QString& comando : comandos) {
-            Linha l{comando, size.toInt(), {}, {}};
-            std::vector<Medida> bases, listas;
-            for (int vez = 1; vez <= vezes; ++vez) {
-                // Back to back, so that both see the same load on the machine.
-                bases.push_back(run({"--quiet", project, "-o", saida}, env, folder.path()));
-                listas.push_back(run({"--quiet", "--load", product + "config/zvconfig.lsp", project,
-                                      "-o", saida, comando},
-                                     env, folder.path()));
-                if (!bases.back().ok || !listas.back().ok) return 1;
-                const Medida& a = listas.back();
-                const Medida& b = bases.back();
+    }
+    const QString saida = folder.filePath("out.dxf");
+    std::vector<Linha> linhas;
+    for (const QString& comando : comandos) {
+        std::vector<std::vector<Medida>> bases(sizes.size()), listas(sizes.size());
+        for (int vez = 1; vez <= vezes; ++vez) {
+            for (std::size_t t = 0; t < projetos.size(); ++t) {
+                // Back to back, so that both see the same load on the machine; the sizes in
+                // turn, so that a change of that load falls alike on each size.
+                bases[t].push_back(run({"--quiet", projetos[t], "-o", saida}, env, folder.path()));
+                listas[t].push_back(run({"--quiet", "--load", product + "config/zvconfig.lsp",
+                                         projetos[t], "-o", saida, comando},
+                                        env, folder.path()));
+                if (!bases[t].back().ok || !listas[t].back().ok) return 1;
+                const Medida& a = listas[t].back();
+                const Medida& b = bases[t].back();
                 std::printf(
                     "%s, %s terminals, run %d: %.2f s (user %.2f, sys %.2f, %ldk faults), "
                     "open+save %.2f s (user %.2f, sys %.2f, %ldk faults)\n",
-                    qPrintable(comando), qPrintable(size), vez, a.wall, a.user, a.system,
-                    a.faults / 1000, b.wall, b.user, b.system, b.faults / 1000);
+                    qPrintable(comando), qPrintable(sizes[qsizetype(t)]), vez, a.wall, a.user,
+                    a.system, a.faults / 1000, b.wall, b.user, b.system, b.faults / 1000);
                 std::fflush(stdout);
             }
-            l.base = Melhor(bases);
-            l.lista = Melhor(listas);
-            linhas.push_back(l);
         }
-        QFile::remove(project);
-        QFile::remove(saida);
+        for (std::size_t t = 0; t < projetos.size(); ++t)
+            linhas.push_back(
+                {comando, sizes[qsizetype(t)].toInt(), Melhor(listas[t]), Melhor(bases[t])});
     }
+    for (const QString& projeto : projetos)
+        QFile::remove(projeto);
+    QFile::remove(saida);
+    // The table by size, then by command.
+    std::stable_sort(linhas.begin(), linhas.end(),
+                     [](const Linha& a, const Linha& b) { return a.terminais < b.terminais; });
 
     std::printf("\n%-22s %6s %7s %7s %6s %7s %7s %6s %6s %6s %8s %8s %6s %6s %5s\n", "command",
                 "terms", "list s", "o+s s", "ratio", "list us", "o+s us", "us rat", "lst sy",
