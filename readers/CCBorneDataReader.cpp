@@ -288,9 +288,10 @@ VetorItens* CCBorneDataReader::LerDados(zvdb::Database* database,
     Q_UNUSED(paginas);
     concatenacao_ = {};  // the template's texts are read again for each run
     if (CamposDaLista) FiltraSufixos(DosLados(CamposDaLista(modelo)));
-    CarregaConexoesFios();
+    // Worked out by the host while the blocks and their references are listed below.
+    CarregaConexoesFios(true);
     progresso.Definir(10);
-    CarregaConexoesCabos();
+    CarregaConexoesCabos(true);
     progresso.Definir(20);
 
     auto* itens = new VetorItens;
