@@ -13,10 +13,10 @@
 // the program's own (user) and the kernel's (system), with the page faults; on a virtual machine
 // first touches of memory can cost more in the kernel than the program spends itself, so the
 // user time ratio shows the program apart from that. Each pair (open-and-save, then the list) runs
-// `--runs` times (3 unless given), one pair after the other, taking the sizes in turn: a load
-// that comes and goes falls alike on every size, not on the largest alone. The figures kept are
-// each side's fastest run, as load from elsewhere only ever adds time, and the highest peak
-// memory of its runs.
+// `--runs` times (3 unless given), in rounds that take every command and size in turn: a load
+// that comes and goes falls on one run of several commands and sizes, not on every run of one.
+// The figures kept are each side's fastest run, as load from elsewhere only ever adds time,
+// and the highest peak memory of its runs.
 #include <QCoreApplication>
 #include <QDir>
 #include <QProcess>
@@ -192,32 +192,38 @@ int main(int argc, char** argv) {
             return 1;
     }
     const QString saida = folder.filePath("out.dxf");
-    std::vector<Linha> linhas;
-    for (const QString& comando : comandos) {
-        std::vector<std::vector<Medida>> bases(sizes.size()), listas(sizes.size());
-        for (int vez = 1; vez <= vezes; ++vez) {
+    // Runs by rounds: each round takes every command and every size in turn, so that a spell
+    // of load on the machine falls on one run of many commands, not on every run of one.
+    const std::size_t n = std::size_t(comandos.size()) * projetos.size();
+    std::vector<std::vector<Medida>> bases(n), listas(n);
+    for (int vez = 1; vez <= vezes; ++vez) {
+        for (qsizetype c = 0; c < comandos.size(); ++c) {
             for (std::size_t t = 0; t < projetos.size(); ++t) {
-                // Back to back, so that both see the same load on the machine; the sizes in
-                // turn, so that a change of that load falls alike on each size.
-                bases[t].push_back(run({"--quiet", projetos[t], "-o", saida}, env, folder.path()));
-                listas[t].push_back(run({"--quiet", "--load", product + "config/zvconfig.lsp",
-                                         projetos[t], "-o", saida, comando},
+                const std::size_t k = std::size_t(c) * projetos.size() + t;
+                // Back to back, so that both see the same load on the machine.
+                bases[k].push_back(run({"--quiet", projetos[t], "-o", saida}, env, folder.path()));
+                listas[k].push_back(run({"--quiet", "--load", product + "config/zvconfig.lsp",
+                                         projetos[t], "-o", saida, comandos[c]},
                                         env, folder.path()));
-                if (!bases[t].back().ok || !listas[t].back().ok) return 1;
-                const Medida& a = listas[t].back();
-                const Medida& b = bases[t].back();
+                if (!bases[k].back().ok || !listas[k].back().ok) return 1;
+                const Medida& a = listas[k].back();
+                const Medida& b = bases[k].back();
                 std::printf(
                     "%s, %s terminals, run %d: %.2f s (user %.2f, sys %.2f, %ldk faults), "
                     "open+save %.2f s (user %.2f, sys %.2f, %ldk faults)\n",
-                    qPrintable(comando), qPrintable(sizes[qsizetype(t)]), vez, a.wall, a.user,
+                    qPrintable(comandos[c]), qPrintable(sizes[qsizetype(t)]), vez, a.wall, a.user,
                     a.system, a.faults / 1000, b.wall, b.user, b.system, b.faults / 1000);
                 std::fflush(stdout);
             }
         }
-        for (std::size_t t = 0; t < projetos.size(); ++t)
-            linhas.push_back(
-                {comando, sizes[qsizetype(t)].toInt(), Melhor(listas[t]), Melhor(bases[t])});
     }
+    std::vector<Linha> linhas;
+    for (qsizetype c = 0; c < comandos.size(); ++c)
+        for (std::size_t t = 0; t < projetos.size(); ++t) {
+            const std::size_t k = std::size_t(c) * projetos.size() + t;
+            linhas.push_back(
+                {comandos[c], sizes[qsizetype(t)].toInt(), Melhor(listas[k]), Melhor(bases[k])});
+        }
     for (const QString& projeto : projetos)
         QFile::remove(projeto);
     QFile::remove(saida);
