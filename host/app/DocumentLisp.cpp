@@ -237,29 +237,26 @@ zvsdk::ResultBuffer* DocumentLisp::lispInvoke(const zvsdk::ResultBuffer* call) {
     return chain;
 }
 
-void DocumentLisp::addChainAnswer(const QString& function, ChainAnswer answer) {
+DocumentLisp::ChainSource& DocumentLisp::sourceFor(const QString& function) {
     zvlisp::Symbol* symbol = lisp_.intern(function);
     ChainSource& source = chainAnswers_[function];
-    source = {symbol,
-              symbol->value,
-              std::move(answer),
-              {},
-              std::move(source.connections),
-              std::move(source.polylines),
-              std::move(source.prepare)};
+    source.symbol = symbol;
+    source.function = symbol->value;
+    return source;
+}
+
+void DocumentLisp::addChainAnswer(const QString& function, ChainAnswer answer) {
+    ChainSource& source = sourceFor(function);
+    source.answer = std::move(answer);
+    source.call = {};
 }
 
 void DocumentLisp::addConnectionAnswer(const QString& function, ConnectionAnswer answer,
                                        ConnectionPreparer prepare) {
-    zvlisp::Symbol* symbol = lisp_.intern(function);
-    ChainSource& source = chainAnswers_[function];
-    source = {symbol,
-              symbol->value,
-              std::move(source.answer),
-              {},
-              std::move(answer),
-              std::move(source.polylines),
-              std::move(prepare)};
+    ChainSource& source = sourceFor(function);
+    source.call = {};
+    source.connections = std::move(answer);
+    source.prepare = std::move(prepare);
 }
 
 bool DocumentLisp::lispPrepareConnections(const QString& function) {
@@ -294,15 +291,7 @@ int DocumentLisp::lispInvokeConnections(const QString& function,
 }
 
 void DocumentLisp::addPolylineAnswer(const QString& function, PolylineAnswer answer) {
-    zvlisp::Symbol* symbol = lisp_.intern(function);
-    ChainSource& source = chainAnswers_[function];
-    source = {symbol,
-              symbol->value,
-              std::move(source.answer),
-              std::move(source.call),
-              std::move(source.connections),
-              std::move(answer),
-              std::move(source.prepare)};
+    sourceFor(function).polylines = std::move(answer);
 }
 
 int DocumentLisp::lispInvokePolylines(const QString& function, const QString& argument,
@@ -325,9 +314,12 @@ void DocumentLisp::addInvokeListener(InvokeListener listener) {
 }
 
 void DocumentLisp::addChainCall(const QString& function, ChainCall call) {
-    zvlisp::Symbol* symbol = lisp_.intern(function);
-    ChainSource& source = chainAnswers_[function];
-    source = {symbol, symbol->value, {}, std::move(call), {}, std::move(source.polylines), {}};
+    // A call takes the place of the answers without arguments.
+    ChainSource& source = sourceFor(function);
+    source.answer = {};
+    source.call = std::move(call);
+    source.connections = {};
+    source.prepare = {};
 }
 
 bool DocumentLisp::answerAsChain(const zvsdk::ResultBuffer* call, zvsdk::ResultBuffer** chain) {

@@ -78,7 +78,7 @@ public:
 
 private:
     struct ChainSource {
-        zvlisp::Symbol* symbol;
+        zvlisp::Symbol* symbol = nullptr;
         zvlisp::Value function;
         ChainAnswer answer;
         ChainCall call;
@@ -89,6 +89,9 @@ private:
     // The source of a function's answers while its symbol holds the function it held when
     // the source was added; null otherwise.
     const ChainSource* sourceOf(const QString& function) const;
+    // The entry of `function`, made if new, tied to the function its symbol holds now; the
+    // answers already there stay.
+    ChainSource& sourceFor(const QString& function);
     // Runs a host's own answer to `function` as lispInvoke runs a call: interrupt first, the
     // listeners told, an error reported; RTNONE when the answer declines.
     int invokeHostAnswer(const QString& function, const std::function<bool()>& answer);

@@ -26,6 +26,14 @@ protected:
                  "(rtos x 2 1) \";\" (rtos y 2 1)))"));
     }
     bool lisp(const QString& texto) { return CICad::AvaliaLisp(texto); }
+    // Positions answer `resposta` and are counted from now: the function tells how many.
+    std::function<int()> ContaPosicoes(const QString& resposta) {
+        EXPECT_TRUE(
+            lisp("(progn (setq posicoes 0) (defun BuscarCoordenadas (e g p x y) "
+                 "(setq posicoes (1+ posicoes)) \"" +
+                 resposta + "\"))"));
+        return [] { return CICad::GetIntLisp("posicoes", -1); };
+    }
     QString handle(const OdDbObjectId& id) { return ZVString::DeHandle(id.handle()); }
     zvdb::BlockReference* ref(const OdDbObjectId& id) {
         return dynamic_cast<zvdb::BlockReference*>(db().objectByHandle(id.handle()));
@@ -377,10 +385,7 @@ TEST_F(BlockReadingTest, ACopyUnderASuffixKeepsOnlyTheNamesItsReaderAsksFor) {
 // when none keeps it) and is kept for them; a copy under another suffix, or none, reads it again
 // whole.
 TEST_F(BlockReadingTest, AReadingForTheSidesWorksOutWhatTheyKeepAndServesNoOtherCopy) {
-    ASSERT_TRUE(
-        lisp("(progn (setq chamadas 0) (defun BuscarCoordenadas (e g p x y) "
-             "(setq chamadas (1+ chamadas)) \"B2\"))"));
-    const auto chamadas = [] { return CICad::GetIntLisp("chamadas", -1); };
+    const auto chamadas = ContaPosicoes("B2");
     const OdDbObjectId k = Simbolo("NA-1", "A1", "ESQ$0001$A",
                                    {{"REGUA", "X1"}, {"NUMERO", "5"}, {"BITOLA", "2,5"}}, 40);
     LeitorBase todos;
@@ -496,10 +501,7 @@ private:
 // is not worked out; the names left out are numbered all the same. A symbol the reader wants
 // whole after all is read again whole.
 TEST_F(BlockReadingTest, ASymbolCutByItsKeyGetsOnlyTheNamesItsReaderAsksFor) {
-    ASSERT_TRUE(
-        lisp("(setq perguntas 0)"
-             "(defun BuscarCoordenadas (e g p x y) (setq perguntas (1+ perguntas)) \"P\")"));
-    const auto perguntas = [] { return CICad::GetIntLisp("perguntas", -1); };
+    const auto perguntas = ContaPosicoes("P");
     const OdDbObjectId a = Simbolo("NA-1", "A1", "ESQ$0001$A",
                                    {{"REGUA", " X1 "}, {"NUMERO", "5"}, {"ZQ_SO_AQUI", "z"}}, 10);
     const OdDbObjectId s = Simbolo("NA-2", "SO", "ESQ$0001$A", {{"REGUA", "X2"}}, 20);

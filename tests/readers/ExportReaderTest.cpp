@@ -444,6 +444,14 @@ protected:
         return nullptr;
     }
     OdDbObjectId id(const zvdb::DbObject* objeto) { return OdDbObjectId(&db(), objeto->handle()); }
+    // What `leitor` reads, and how many positions it asked the LISP side for.
+    std::pair<std::unique_ptr<VetorItens>, int> LeContando(CCExportDataReader& leitor) {
+        EXPECT_TRUE(
+            lisp("(progn (setq chamadas 0) (defun BuscarCoordenadas (e g p x y) "
+                 "(setq chamadas (1+ chamadas)) \"B2\"))"));
+        std::unique_ptr<VetorItens> itens(leitor.Le(&db(), nullptr, true, std::nullopt));
+        return {std::move(itens), CICad::GetIntLisp("chamadas", -1)};
+    }
     // The side fields of an item, by name.
     static QMap<QString, QString> lados(const CEItemLista& item) {
         QMap<QString, QString> campos;
@@ -629,9 +637,7 @@ TEST_F(ExportTerminalSidesTest, NeighboursReadForFewNamesGiveTheSidesAFullReadGi
     Q_UNUSED(ponte);
     componente("-K2", {{"A1", {60, 100, 0}}});
     fio({{60, 190, 0}, {60, 100, 0}}, "2");
-    ASSERT_TRUE(
-        lisp("(progn (setq EXPORTA 3 chamadas 0) (defun BuscarCoordenadas (e g p x y) "
-             "(setq chamadas (1+ chamadas)) \"B2\"))"));
+    ASSERT_TRUE(lisp("(setq EXPORTA 3)"));
     static const auto doLado = [](const QString& nome) {
         for (const char* sufixo : {"_INI", "_FIM", "_SEGINI", "_SEGFIM"})
             if (nome.endsWith(QLatin1String(sufixo))) return true;
@@ -654,20 +660,16 @@ TEST_F(ExportTerminalSidesTest, NeighboursReadForFewNamesGiveTheSidesAFullReadGi
             if (!lados) CopiasDosLados({});
         }
     };
-    const auto chamadas = [] { return CICad::GetIntLisp("chamadas", -1); };
     CCExportDataReader inteiro;
-    std::unique_ptr<VetorItens> inteiros(inteiro.Le(&db(), nullptr, true, std::nullopt));
-    ASSERT_TRUE(lisp("(setq chamadas 0)"));
+    const std::unique_ptr<VetorItens> inteiros = LeContando(inteiro).first;
     Filtrado cheios(false);
-    std::unique_ptr<VetorItens> lidosCheios(cheios.Le(&db(), nullptr, true, std::nullopt));
-    const int chamadasCheios = chamadas();
-    ASSERT_TRUE(lisp("(setq chamadas 0)"));
+    const auto [lidosCheios, chamadasCheios] = LeContando(cheios);
     Filtrado poucos(true);
-    std::unique_ptr<VetorItens> lidosPoucos(poucos.Le(&db(), nullptr, true, std::nullopt));
+    const auto [lidosPoucos, chamadasPoucos] = LeContando(poucos);
     ASSERT_TRUE(inteiros && lidosCheios && lidosPoucos);
     // The walk asks for the position of each symbol it reads; the sides' full readings of the
     // two components, and of the two terminals as each other's neighbour, ask again.
-    EXPECT_EQ(chamadasCheios, chamadas() + 4);
+    EXPECT_EQ(chamadasCheios, chamadasPoucos + 4);
     EXPECT_EQ(mesmosItens(*lidosCheios, *lidosPoucos,
                           [](const CEItemLista& b) -> QString {
                               return b.valorCampo("NUMERO") + "<" + b.valorCampo("RELACAO_INI") +
@@ -863,9 +865,7 @@ TEST_F(ExportTerminalSidesTest, AComponentOfTwoContactsGivesBothSidesWhatAWholeR
     componente("-K1", {{"21", {60, 100, 0}}}, "NF-1");
     fio({{20, 190, 0}, {20, 100, 0}}, "1");
     fio({{60, 190, 0}, {60, 100, 0}}, "2");
-    ASSERT_TRUE(
-        lisp("(progn (setq EXPORTA 3 chamadas 0) (defun BuscarCoordenadas (e g p x y) "
-             "(setq chamadas (1+ chamadas)) \"B2\"))"));
+    ASSERT_TRUE(lisp("(setq EXPORTA 3)"));
     static const auto fica = [](const QString& nome) {
         return nome.startsWith(QLatin1String("RELACAO_")) ||
                nome.startsWith(QLatin1String("HANDLE_")) ||
@@ -879,18 +879,15 @@ TEST_F(ExportTerminalSidesTest, AComponentOfTwoContactsGivesBothSidesWhatAWholeR
             if (!lados) CopiasDosLados({});
         }
     };
-    const auto chamadas = [] { return CICad::GetIntLisp("chamadas", -1); };
     Filtrado cheio(false);
-    std::unique_ptr<VetorItens> cheios(cheio.Le(&db(), nullptr, true, std::nullopt));
-    const int chamadasCheio = chamadas();
-    ASSERT_TRUE(lisp("(setq chamadas 0)"));
+    const auto [cheios, chamadasCheio] = LeContando(cheio);
     Filtrado poucos(true);
-    std::unique_ptr<VetorItens> lidos(poucos.Le(&db(), nullptr, true, std::nullopt));
+    const auto [lidos, chamadasPoucos] = LeContando(poucos);
     ASSERT_TRUE(cheios && lidos);
     // Full readings ask for the positions of the component, once for both sides, and of the
     // two wires; the walk's five symbols ask in both reads.
-    EXPECT_EQ(chamadas(), 5);
-    EXPECT_EQ(chamadasCheio, chamadas() + 3);
+    EXPECT_EQ(chamadasPoucos, 5);
+    EXPECT_EQ(chamadasCheio, chamadasPoucos + 3);
     EXPECT_TRUE(poucos.LeituraGuardada(id(k1_)));
     const QString k1 = handle(k1_);
     EXPECT_EQ(mesmosItens(*cheios, *lidos,
